@@ -1,0 +1,11 @@
+# What every target of the project is compiled with.
+add_library(lexicor_flags INTERFACE)
+target_compile_options(lexicor_flags INTERFACE -Wall -Wextra -Wconversion -Wshadow)
+if(LEXICOR_WERROR)
+  target_compile_options(lexicor_flags INTERFACE -Werror)
+endif()
+if(LEXICOR_SANITIZE)
+  target_compile_options(lexicor_flags INTERFACE -fsanitize=${LEXICOR_SANITIZE} -fno-sanitize-recover=all
+                                                 -fno-omit-frame-pointer)
+  target_link_options(lexicor_flags INTERFACE -fsanitize=${LEXICOR_SANITIZE})
+endif()

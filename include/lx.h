@@ -1,0 +1,40 @@
+/* Lexicor: national-language support behind a C interface.
+ *
+ * A locale joins a language, a territory, a codepage and a sort order. Call LXInit, get a locale with
+ * LXGetLocale, hand it to the functions of the family headers below, and end with LXReleaseLocale and
+ * LXTerm.
+ *
+ * Conventions:
+ *  1. Null locale. A null LXLocale means the default locale, set by LXSetLocale.
+ *  2. Errors. Each function that takes a locale leaves its return code there; LXGetError reads it.
+ *     A call before LXInit or after the last LXTerm is refused and touches nothing.
+ *  3. Forms. No suffix: a byte string in the locale's codepage. W: packed codes (LXWChar). U: 16-bit
+ *     Unicode (LXUChar). Ex: a byte string of a shift-sensitive codepage with a shift state. S: takes a
+ *     shift state in place of the lead byte's length.
+ *  4. W is not Unicode: a packed code holds the bytes of one character of the codepage.
+ *  5. Lengths are signed 32-bit; below 0 means null-terminated. LX_CHARACTERS makes lengths and sizes
+ *     count characters in place of bytes.
+ *  6. Characters are never cut: output ends on a whole character, and a character cut by the end of
+ *     the input is not entered.
+ *  7. Termination. Output is terminated where a function says so; LX_TERMINATE asks for it and keeps
+ *     one unit of the buffer for the null.
+ *  8. Ownership. Handles are released by the function named beside the one that creates them. Data
+ *     objects belong to the library.
+ *  9. Memory comes from the hooks given to LXInit. Short texts are worked on without allocating.
+ * 10. Threads. Data objects are shared and read-only. A handle is used by one thread at a time. The
+ *     first LXInit, and LXSetLocale, must not race with other calls.
+ * 11. Unicode is 16-bit: characters beyond U+FFFF become U+FFFD. */
+#ifndef LX_H
+#define LX_H
+
+#define LX_VERSION "1.0.0"
+
+#include "lx/base.h"
+#include "lx/codepage.h"
+#include "lx/convert.h"
+#include "lx/file.h"
+#include "lx/init.h"
+#include "lx/locale.h"
+#include "lx/object.h"
+
+#endif

@@ -1,0 +1,160 @@
+// A codepage as the code works with it: tables that derive_codepage() lays flat when the object is loaded, and
+// the operations on single characters that everything else is built from. All of them trust the tables, which
+// validate_codepage() has checked.
+#pragma once
+
+#include "core/lxbytes.h"
+#include "core/lxformat.h"
+#include "core/lxobjman.h"
+
+namespace lx {
+
+inline constexpr uint16_t kNoUnicode = 0xFFFD;
+inline constexpr size_t kMaxCharBytes = 4;
+
+/// Derived data of a codepage object, one block with the arrays behind it.
+///
+/// Towards Unicode: `unicode` for single bytes; for longer characters `rows`, one row of 256 values a trie
+/// node. A leaf's row holds Unicode values, another node's row the numbers of the next nodes, 0 for none (node
+/// 0 is the root, which is nobody's child). From Unicode: `codes16` or, where a character has more than two
+/// bytes, `codes32`: row page_row[u >> 8] holds for every low byte the bytes to store, packed; unmapped values
+/// hold the substitution byte.
+struct Codepage {
+  const uint8_t* payload;
+  const uint8_t* low_array;
+  const uint8_t* high_array;
+  const uint16_t* rows;  // null: no multibyte characters
+  const uint8_t* leaf;   // by node
+  const uint16_t* codes16;
+  const uint32_t* codes32;
+  uint16_t unicode[256];
+  uint16_t page_row[256];
+  uint8_t width;  // of a character in bytes: the longest, or that of the double-byte state
+  uint8_t substitution;
+  uint8_t shift_out;
+  uint8_t shift_in;
+  bool single_byte;
+  bool shift_sensitive;
+  bool utf8;               // conversion is computed
+  bool one_byte_codes;     // every Unicode value becomes one byte
+  bool ascii_transparent;  // bytes below 0x80 are U+0000 to U+007F, both ways, wherever they begin a character
+
+  uint8_t length(uint8_t first_byte) const { return payload[format::codepage::kLengths + first_byte]; }
+  bool is_shift(uint8_t byte) const { return byte == shift_out || byte == shift_in; }
+  uint8_t width_in(LXShiftState state) const { return state == LX_SHIFT_DOUBLE ? width : 1; }
+  uint32_t type(uint8_t byte) const { return le32(payload + format::codepage::kTypes + 4 * byte); }
+};
+
+/// The derived data of a loaded codepage object.
+inline const Codepage& codepage_of(const LXObject& object) {
+  return *static_cast<const Codepage*>(object.derived);
+}
+
+inline const uint8_t* bytes_of(const char* text) {
+  return reinterpret_cast<const uint8_t*>(text);
+}
+inline uint8_t* bytes_of(char* text) {
+  return reinterpret_cast<uint8_t*>(text);
+}
+
+/// The number of bytes that a packed code takes.
+inline size_t code_bytes(uint32_t code) {
+  return 1u + (code > 0xFF) + (code > 0xFFFF) + (code > 0xFFFFFF);
+}
+
+inline uint32_t pack(const uint8_t* p, size_t count) {
+  uint32_t code = 0;
+  for (size_t i = 0; i < count; ++i) code = code << 8 | p[i];
+  return code;
+}
+
+/// Stores the low `count` bytes of a packed code, first byte most significant.
+inline void store_code(uint8_t* p, uint32_t code, size_t count) {
+  for (size_t i = count; i-- > 0; code >>= 8) p[i] = static_cast<uint8_t>(code);
+}
+
+/// The code whose bytes are those that storing `code` leaves: a zero byte behind the first one is not stored,
+/// since the lengths of the encodings carry none.
+inline uint32_t without_zero_bytes(uint32_t code) {
+  uint32_t kept = 0;
+  for (int shift = 24; shift > 0; shift -= 8)
+    if ((code >> shift & 0xFF) != 0) kept = kept << 8 | (code >> shift & 0xFF);
+  return kept << 8 | (code & 0xFF);
+}
+
+/// UTF-8 of 16-bit values, by formula: nothing is checked and surrogates are values like any other.
+inline uint16_t utf8_unicode(const uint8_t* p) {
+  if (p[0] > 0xDF) return static_cast<uint16_t>((p[0] & 0x0F) << 12 | (p[1] & 0x3F) << 6 | (p[2] & 0x3F));
+  return static_cast<uint16_t>((p[0] & 0x1F) << 6 | (p[1] & 0x3F));
+}
+inline size_t utf8_bytes(uint16_t u) {
+  return 1u + (u >= 0x80) + (u >= 0x800);
+}
+inline void store_utf8(uint8_t* p, uint16_t u, size_t count) {
+  if (count == 1) {
+    p[0] = static_cast<uint8_t>(u);
+  } else if (count == 2) {
+    p[0] = static_cast<uint8_t>(0xC0 | u >> 6);
+    p[1] = static_cast<uint8_t>(0x80 | (u & 0x3F));
+  } else {
+    p[0] = static_cast<uint8_t>(0xE0 | u >> 12);
+    p[1] = static_cast<uint8_t>(0x80 | (u >> 6 & 0x3F));
+    p[2] = static_cast<uint8_t>(0x80 | (u & 0x3F));
+  }
+}
+
+/// Walks the rows for the character at `p`.
+inline uint16_t row_unicode(const Codepage& cp, const uint8_t* p) {
+  if (cp.rows == nullptr) return kNoUnicode;
+  size_t node = 0;
+  while (cp.leaf[node] == 0) {
+    node = cp.rows[node << 8 | *p++];
+    if (node == 0) return kNoUnicode;
+  }
+  return cp.rows[node << 8 | *p];
+}
+
+/// The Unicode value of a character of two or more bytes.
+inline uint16_t multibyte_unicode(const Codepage& cp, const uint8_t* p) {
+  return cp.utf8 ? utf8_unicode(p) : row_unicode(cp, p);
+}
+
+/// The bytes to store for a Unicode value, packed; not for UTF-8.
+inline uint32_t row_code(const Codepage& cp, uint16_t u) {
+  const size_t index = static_cast<size_t>(cp.page_row[u >> 8]) << 8 | (u & 0xFF);
+  return cp.codes32 != nullptr ? cp.codes32[index] : cp.codes16[index];
+}
+
+/// The packed code of a Unicode value as the page table gives it: a zero byte inside it is still there.
+uint32_t page_code(const Codepage& cp, uint16_t u);
+
+/// The packed code of a Unicode value, or the substitution byte.
+uint32_t unicode_to_code(const Codepage& cp, uint16_t u);
+
+/// The Unicode value of a packed code of any length.
+uint16_t code_to_unicode(const Codepage& cp, uint32_t code);
+
+/// Stores the character of a Unicode value, or the substitution byte: the bytes written.
+inline size_t store_unicode(const Codepage& cp, uint16_t u, uint8_t* p) {
+  const uint32_t code = cp.utf8 ? 0 : row_code(cp, u);
+  const size_t count = cp.utf8 ? utf8_bytes(u) : code_bytes(code);
+  if (cp.utf8)
+    store_utf8(p, u, count);
+  else
+    store_code(p, code, count);
+  return count;
+}
+
+/// The bytes that `chars` characters take, without a check for an end, and the whole characters in `bytes`.
+size_t bytes_of_chars(const Codepage& cp, const uint8_t* text, LXShiftState state, int32_t chars);
+int32_t chars_in_bytes(const Codepage& cp, const uint8_t* text, LXShiftState state, size_t bytes);
+
+/// Consumes a shift byte at `*p`, if there is one: true, and the state is set.
+inline bool take_shift(const Codepage& cp, const uint8_t** p, LXShiftState* state) {
+  if (!cp.is_shift(**p)) return false;
+  *state = **p == cp.shift_out ? LX_SHIFT_DOUBLE : LX_SHIFT_SINGLE;
+  ++*p;
+  return true;
+}
+
+}  // namespace lx

@@ -1,0 +1,330 @@
+// Conversion of whole strings: between two codepages, to and from packed codes, to and from Unicode. One flow
+// for all of them over a reader and a writer; the doors below say what they read and write.
+#include <string.h>
+
+#include "codepage/lxtext.h"
+#include "core/lxcall.h"
+
+namespace {
+
+using lx::bytes_of;
+using lx::Call;
+using lx::Codepage;
+using lx::codepage_of;
+using lx::Form;
+
+RAS1_Unit unit = RAS1_UNIT("lxconvert");
+
+size_t terminated_units(const uint8_t* text) {
+  return strlen(reinterpret_cast<const char*>(text));
+}
+template <class Unit>
+size_t terminated_units(const Unit* text) {
+  size_t n = 0;
+  while (text[n] != 0) ++n;
+  return n;
+}
+
+/// What the size, length and flags arguments of a conversion ask for.
+struct Request {
+  bool valid;            // no undefined flag
+  bool characters;       // LX_CHARACTERS
+  bool terminate;        // LX_TERMINATE
+  bool null_terminated;  // the length was negative
+  bool nothing;          // length or size 0 and no terminator wanted: the result is 0
+  size_t size;           // of the output, without the unit that LX_TERMINATE reserves
+  size_t length;         // of the input in units
+
+  template <class Unit>
+  Request(int32_t size_given, const Unit* input, int32_t length_given, int32_t flags, int32_t allowed_flags)
+      : valid((flags & ~allowed_flags) == 0),
+        characters((flags & LX_CHARACTERS) != 0),
+        terminate((flags & LX_TERMINATE) != 0),
+        null_terminated(length_given < 0),
+        nothing((length_given == 0 || size_given <= 0) && (!terminate || size_given <= 0)),
+        size(size_given > 0 ? static_cast<size_t>(size_given) - (terminate ? 1 : 0) : 0),
+        length(!valid || nothing  ? 0
+               : length_given < 0 ? terminated_units(input)
+                                  : static_cast<size_t>(length_given)) {}
+
+  /// In character mode a length that was given counts characters: turns it into bytes.
+  void count_bytes(const Codepage& cp, const uint8_t* input, LXShiftState state) {
+    if (characters && !null_terminated)
+      length = lx::bytes_of_chars(cp, input, state, static_cast<int32_t>(length));
+  }
+};
+
+constexpr int32_t kStringFlags = LX_TERMINATE | LX_CHARACTERS;
+constexpr int32_t kWideFlags = LX_CHARACTERS;
+
+/// Only byte output can be limited in characters: in the other forms a unit is one.
+template <class Writer>
+bool limits_characters(const Request& request) {
+  return request.characters && sizeof(typename Writer::Unit) == 1;
+}
+
+/// Returns to the single-byte state before a null. A double-byte character is taken back when the Shift-In does
+/// not fit, and a double-byte run that this leaves empty vanishes with its Shift-Out; with no room for both
+/// bytes the null stands alone.
+template <class Writer>
+void close_state(Writer&, const uint8_t*, const Request&) {}
+void close_state(lx::ShiftWriter& out, const uint8_t* start, const Request& request) {
+  if (out.state != LX_SHIFT_DOUBLE) return;
+  constexpr size_t kClosing = 2;
+  const size_t size = request.size + (request.terminate ? 1 : 0);
+  const auto written = [&] { return static_cast<size_t>(out.p - start); };
+  const auto closing_fits = [&] { return request.characters || written() + kClosing <= size; };
+  if (!closing_fits() && written() >= out.cp.width) out.p -= out.cp.width;
+  if (written() > 0 && out.p[-1] == out.cp.shift_out)
+    --out.p;
+  else if (closing_fits())
+    *out.p++ = out.cp.shift_in;
+}
+
+/// Converts, ends the output, and returns the units or characters written.
+template <class Value, class Reader, class Writer>
+int32_t convert(Reader in, Writer out, const Request& request) {
+  typename Writer::Unit* const start = out.p;
+  const bool by_chars = limits_characters<Writer>(request);
+  const auto moved = lx::transfer<Value>(in, out, by_chars ? request.size : SIZE_MAX);
+  const size_t used = by_chars ? moved.chars : static_cast<size_t>(out.p - start);
+  const bool all = moved.stop == lx::Stop::kInputEnd;
+  const bool end = request.terminate || (request.null_terminated && all && used < request.size);
+  if (end) {
+    close_state(out, reinterpret_cast<const uint8_t*>(start), request);
+    *out.p++ = 0;
+  }
+  return static_cast<int32_t>(by_chars ? moved.chars + end : static_cast<size_t>(out.p - start));
+}
+
+/// The end of an output of `size` units; a size in characters says nothing about its bytes.
+uint8_t* end_of(uint8_t* output, const Request& request) {
+  return request.characters ? lx::no_end<uint8_t>() : output + request.size;
+}
+
+int32_t convert_bytes(LXLocale* target, char* output, LXShiftState target_state, int32_t size, LXLocale* source,
+                      const char* input, LXShiftState source_state, int32_t length, int32_t flags, Form form) {
+  Call call(unit, target);
+  const LXLocale* from = lx::locale_of(source);
+  if (!call || from == nullptr) return call.fail(LX_E_NOT_INITIALIZED, -1);
+  Request request(size, bytes_of(input), length, flags, kStringFlags);
+  if (!request.valid) return call.fail(LX_E_INVALID, request.characters ? 0 : -1);
+  if (request.nothing) return call.exit(0);
+  const Codepage& in_cp = codepage_of(*from->codepage);
+  const Codepage& out_cp = codepage_of(call.codepage());
+  request.count_bytes(in_cp, bytes_of(input), source_state);
+  uint8_t* const out = bytes_of(output);
+  return call.exit(lx::read_bytes(in_cp, form, source_state, bytes_of(input), request.length, [&](auto reader) {
+    return lx::write_bytes(out_cp, form, target_state, out, end_of(out, request),
+                           [&](auto writer) { return convert<LXUChar>(reader, writer, request); });
+  }));
+}
+
+int32_t to_unicode(LXUChar* output, int32_t size, LXLocale* locale, const char* input, LXShiftState state,
+                   int32_t length, int32_t flags, Form form) {
+  Call call(unit, locale);
+  if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
+  Request request(size, bytes_of(input), length, flags, kStringFlags);
+  if (!request.valid) return call.fail(LX_E_INVALID, -1);
+  if (request.nothing) return call.exit(0);
+  const Codepage& cp = codepage_of(call.codepage());
+  request.count_bytes(cp, bytes_of(input), state);
+  return call.exit(lx::read_bytes(cp, form, state, bytes_of(input), request.length, [&](auto reader) {
+    return convert<LXUChar>(reader, lx::UnicodeWriter{output, output + request.size}, request);
+  }));
+}
+
+int32_t from_unicode(LXLocale* locale, char* output, LXShiftState state, int32_t size, const LXUChar* input,
+                     int32_t length, int32_t flags, Form form) {
+  Call call(unit, locale);
+  if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
+  const Request request(size, input, length, flags, kStringFlags);
+  if (!request.valid) return call.fail(LX_E_INVALID, -1);
+  if (request.nothing) return call.exit(0);
+  uint8_t* const out = bytes_of(output);
+  return call.exit(
+      lx::write_bytes(codepage_of(call.codepage()), form, state, out, end_of(out, request), [&](auto writer) {
+        return convert<LXUChar>(lx::UnicodeReader{input, input + request.length}, writer, request);
+      }));
+}
+
+/// Bytes to packed codes. The terminating null of a text without a length is a character of it.
+int32_t to_wide(LXLocale* locale, LXWChar* output, int32_t size, const char* input, LXShiftState state,
+                int32_t length, int32_t flags, Form form) {
+  Call call(unit, locale);
+  if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
+  Request request(size, bytes_of(input), length, flags, kWideFlags);
+  if (!request.valid) return call.fail(LX_E_INVALID, -1);
+  if (request.nothing) return call.exit(0);
+  const Codepage& cp = codepage_of(call.codepage());
+  request.count_bytes(cp, bytes_of(input), state);
+  if (request.null_terminated) ++request.length;
+  request.null_terminated = false;
+  return call.exit(lx::read_bytes(cp, form, state, bytes_of(input), request.length, [&](auto reader) {
+    return convert<LXWChar>(reader, lx::CodeWriter{cp, output, output + request.size}, request);
+  }));
+}
+
+/// Packed codes to bytes; the zero that ends codes without a length is one of them.
+int32_t from_wide(LXLocale* locale, char* output, LXShiftState state, int32_t size, const LXWChar* input,
+                  int32_t length, int32_t flags, Form form) {
+  Call call(unit, locale);
+  if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
+  Request request(size, input, length, flags, kWideFlags);
+  if (!request.valid) return call.fail(LX_E_INVALID, -1);
+  if (request.nothing) return call.exit(0);
+  if (request.null_terminated) ++request.length;
+  request.null_terminated = false;
+  const Codepage& cp = codepage_of(call.codepage());
+  uint8_t* const out = bytes_of(output);
+  return call.exit(lx::write_bytes(cp, form, state, out, end_of(out, request), [&](auto writer) {
+    return convert<LXWChar>(lx::CodeReader{cp, input, input + request.length}, writer, request);
+  }));
+}
+
+/// The object of the common codepage, or null.
+const LXObject* common_codepage() {
+  int32_t rc = LX_OK;
+  return lx::object_by_id(LX_CODEPAGE, lx::format::codepage::kCommonId, &rc);
+}
+
+/// How far a unit-by-unit conversion goes: up to a null, or the length.
+bool at_end(int32_t position, int32_t length, bool null) {
+  return null || (length >= 0 && position >= length);
+}
+
+}  // namespace
+
+extern "C" {
+
+int32_t LXConvertString(LXLocale* target, char* output, int32_t size, LXLocale* source, const char* input,
+                        int32_t length, int32_t flags) {
+  return convert_bytes(target, output, LX_SHIFT_SINGLE, size, source, input, LX_SHIFT_SINGLE, length, flags,
+                       Form::kPlain);
+}
+
+int32_t LXConvertStringEx(LXLocale* target, char* output, LXShiftState target_state, int32_t size,
+                          LXLocale* source, const char* input, LXShiftState source_state, int32_t length,
+                          int32_t flags) {
+  return convert_bytes(target, output, target_state, size, source, input, source_state, length, flags,
+                       Form::kEx);
+}
+
+int32_t LXConvertStringW(LXLocale* target, LXWChar* output, int32_t size, LXLocale* source,
+                         const LXWChar* input, int32_t length, int32_t flags) {
+  Call call(unit, target);
+  const LXLocale* from = lx::locale_of(source);
+  if (!call || from == nullptr) return call.fail(LX_E_NOT_INITIALIZED, -1);
+  const Request request(size, input, length, flags, kStringFlags);
+  if (!request.valid) return call.fail(LX_E_INVALID, request.characters ? 0 : -1);
+  if (request.nothing) return call.exit(0);
+  return call.exit(convert<LXUChar>(lx::CodeReader{codepage_of(*from->codepage), input, input + request.length},
+                                    lx::CodeWriter{codepage_of(call.codepage()), output, output + request.size},
+                                    request));
+}
+
+int32_t LXMbToWide(LXLocale* locale, LXWChar* output, int32_t size, const char* input, int32_t length,
+                   int32_t flags) {
+  return to_wide(locale, output, size, input, LX_SHIFT_SINGLE, length, flags, Form::kPlain);
+}
+
+int32_t LXMbToWideEx(LXLocale* locale, LXWChar* output, int32_t size, const char* input, LXShiftState state,
+                     int32_t length, int32_t flags) {
+  return to_wide(locale, output, size, input, state, length, flags, Form::kEx);
+}
+
+int32_t LXWideToMb(LXLocale* locale, char* output, int32_t size, const LXWChar* input, int32_t length,
+                   int32_t flags) {
+  return from_wide(locale, output, LX_SHIFT_SINGLE, size, input, length, flags, Form::kPlain);
+}
+
+int32_t LXWideToMbEx(LXLocale* locale, char* output, LXShiftState state, int32_t size, const LXWChar* input,
+                     int32_t length, int32_t flags) {
+  return from_wide(locale, output, state, size, input, length, flags, Form::kEx);
+}
+
+int32_t LXStringToUnicode(LXUChar* output, int32_t size, LXLocale* locale, const char* input, int32_t length,
+                          int32_t flags) {
+  return to_unicode(output, size, locale, input, LX_SHIFT_SINGLE, length, flags, Form::kPlain);
+}
+
+int32_t LXStringToUnicodeEx(LXUChar* output, int32_t size, LXLocale* locale, const char* input,
+                            LXShiftState state, int32_t length, int32_t flags) {
+  return to_unicode(output, size, locale, input, state, length, flags, Form::kEx);
+}
+
+int32_t LXStringToUnicodeW(LXUChar* output, int32_t size, LXLocale* locale, const LXWChar* input,
+                           int32_t length, int32_t flags) {
+  Call call(unit, locale);
+  if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
+  const Request request(size, input, length, flags, kStringFlags);
+  if (!request.valid) return call.fail(LX_E_INVALID, -1);
+  if (request.nothing) return call.exit(0);
+  return call.exit(convert<LXUChar>(lx::CodeReader{codepage_of(call.codepage()), input, input + request.length},
+                                    lx::UnicodeWriter{output, output + request.size}, request));
+}
+
+int32_t LXUnicodeToString(LXLocale* locale, char* output, int32_t size, const LXUChar* input, int32_t length,
+                          int32_t flags) {
+  return from_unicode(locale, output, LX_SHIFT_SINGLE, size, input, length, flags, Form::kPlain);
+}
+
+int32_t LXUnicodeToStringEx(LXLocale* locale, char* output, LXShiftState state, int32_t size,
+                            const LXUChar* input, int32_t length, int32_t flags) {
+  return from_unicode(locale, output, state, size, input, length, flags, Form::kEx);
+}
+
+int32_t LXUnicodeToStringW(LXLocale* locale, LXWChar* output, int32_t size, const LXUChar* input,
+                           int32_t length, int32_t flags) {
+  Call call(unit, locale);
+  if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
+  const Request request(size, input, length, flags, kStringFlags);
+  if (!request.valid) return call.fail(LX_E_INVALID, -1);
+  if (request.nothing) return call.exit(0);
+  return call.exit(convert<LXUChar>(lx::UnicodeReader{input, input + request.length},
+                                    lx::CodeWriter{codepage_of(call.codepage()), output, output + request.size},
+                                    request));
+}
+
+int32_t LXCpStrToUnicode(const LXObject* codepage, const char* input, int32_t length, LXUChar* output) {
+  const size_t bytes = length < 0 ? strlen(input) : strnlen(input, static_cast<size_t>(length));
+  if (length < 0 && bytes == 0) return -1;
+  return lx::read_bytes(codepage_of(*codepage), Form::kEx, LX_SHIFT_SINGLE, bytes_of(input), bytes,
+                        [&](auto reader) {
+                          lx::UnicodeWriter writer{output, lx::no_end<LXUChar>()};
+                          lx::transfer<LXUChar>(reader, writer, SIZE_MAX);
+                          return static_cast<int32_t>(writer.p - output);
+                        });
+}
+
+int32_t LXCpUnicodeToStr(const LXObject* codepage, const LXUChar* input, LXShiftState state, int32_t length,
+                         char* output) {
+  const size_t units = length < 0 ? terminated_units(input) : static_cast<size_t>(length);
+  return lx::write_bytes(codepage_of(*codepage), Form::kEx, state, bytes_of(output), lx::no_end<uint8_t>(),
+                         [&](auto writer) {
+                           lx::UnicodeReader reader{input, input + units};
+                           lx::transfer<LXUChar>(reader, writer, SIZE_MAX);
+                           return static_cast<int32_t>(writer.p - bytes_of(output));
+                         });
+}
+
+int32_t LXComStrToUnicode(const char* input, int32_t length, LXUChar* output) {
+  const LXObject* common = common_codepage();
+  int32_t n = 0;
+  for (; common != nullptr && !at_end(n, length, input[n] == '\0'); ++n)
+    output[n] = codepage_of(*common).unicode[bytes_of(input)[n]];
+  output[n] = 0;
+  return n != 0 ? n : -1;
+}
+
+int32_t LXComUnicodeToStr(const LXUChar* input, int32_t length, char* output) {
+  const LXObject* common = common_codepage();
+  uint8_t* out = bytes_of(output);
+  int32_t n = 0;
+  for (; common != nullptr && !at_end(n, length, input[n] == 0); ++n)
+    out += lx::store_unicode(codepage_of(*common), input[n], out);
+  *out = 0;
+  return n != 0 ? n : -1;
+}
+
+}  // extern "C"

@@ -1,0 +1,413 @@
+// Characters of a codepage: how long they are, where the next and the previous one start, how many there are,
+// packing, types, and the language's special case mappings. Per-character primitives: no trace.
+#include <string.h>
+
+#include "codepage/lxcodepage.h"
+#include "codepage/lxunicode.h"
+
+namespace {
+
+namespace fmt = lx::format::codepage;
+using lx::bytes_of;
+using lx::Codepage;
+
+/// What a primitive works in: the locale given, or the default, with its last error set to 0.
+class Primitive {
+ public:
+  explicit Primitive(LXLocale* given) : locale_(lx::locale_of(given)) {
+    if (locale_ != nullptr) locale_->last_error = LX_OK;
+  }
+  explicit operator bool() const { return locale_ != nullptr; }
+  const Codepage& cp() const { return lx::codepage_of(*locale_->codepage); }
+  bool single_byte() const { return (locale_->flags & lx::kLocaleSingleByte) != 0; }
+  bool shift_sensitive() const { return (locale_->flags & lx::kLocaleShift) != 0; }
+  void fail(int32_t code) const { locale_->last_error = code; }
+
+ private:
+  LXLocale* locale_;
+};
+
+char* same(const char* text) {
+  return const_cast<char*>(text);
+}
+
+/// The field of a type word that a selector asks for; any other selector gives the classification.
+uint32_t type_field(const Primitive& in, uint32_t word, uint32_t selector) {
+  switch (selector) {
+    case LX_CTYPE1:
+      return word & 0x3FF;
+    case LX_CTYPE2:
+      return (word & 0x3FFC00) >> 10;
+    case LX_CTYPE3:
+      return word >> 22;
+    default:
+      in.fail(LX_E_INVALID);
+      return word & 0x3FF;
+  }
+}
+
+/// Walks the type trie. There is no range check: the trie covers every byte sequence.
+const uint8_t* type_record(const Codepage& cp, const uint8_t* p) {
+  if (cp.single_byte) return nullptr;
+  const uint8_t* root = cp.payload + lx::le16(cp.payload + fmt::kTypeTrie);
+  const uint8_t* node = root;
+  while (node[0] == 0) node = root + fmt::kTypeNodeBytes * (lx::le16(node + 2) + (node[1] & *p++));
+  const size_t index = lx::le16(node + 2) + (node[1] & *p);
+  return cp.payload + lx::le16(cp.payload + fmt::kTypeRecords) + fmt::kTypeRecordBytes * index;
+}
+
+const uint8_t* type_record_of_code(const Codepage& cp, LXWChar code) {
+  uint8_t bytes[lx::kMaxCharBytes] = {};
+  const uint32_t stored = lx::without_zero_bytes(code);
+  lx::store_code(bytes, stored, lx::code_bytes(stored));
+  return type_record(cp, bytes);
+}
+
+/// Steps over whole characters of `bytes` bytes by lead-byte lengths, at most `limit` of them.
+struct Walk {
+  size_t position = 0;
+  int32_t chars = 0;
+};
+Walk walk(const Codepage& cp, const uint8_t* text, size_t bytes) {
+  Walk at;
+  while (at.position < bytes) {
+    const size_t length = cp.length(text[at.position]);
+    if (length > bytes - at.position) break;
+    at.position += length;
+    ++at.chars;
+  }
+  return at;
+}
+
+size_t length_of(const char* text, int32_t bytes) {
+  return bytes < 0 ? strlen(text) : static_cast<size_t>(bytes);
+}
+
+int32_t valid_bytes(const char* text, size_t length) {
+  return static_cast<int32_t>(strnlen(text, length));
+}
+
+}  // namespace
+
+namespace lx {
+
+uint32_t unicode_to_code(const Codepage& cp, uint16_t u) {
+  if (!cp.utf8) return page_code(cp, u);
+  uint8_t bytes[kMaxCharBytes];
+  const size_t count = utf8_bytes(u);
+  store_utf8(bytes, u, count);
+  return pack(bytes, count);
+}
+
+uint16_t code_to_unicode(const Codepage& cp, uint32_t code) {
+  if (code <= 0xFF) return cp.unicode[code];
+  uint8_t bytes[kMaxCharBytes] = {};
+  const uint32_t stored = without_zero_bytes(code);
+  store_code(bytes, stored, code_bytes(stored));
+  return multibyte_unicode(cp, bytes);
+}
+
+size_t bytes_of_chars(const Codepage& cp, const uint8_t* text, LXShiftState state, int32_t chars) {
+  const uint8_t* p = text;
+  for (; chars > 0; --chars) {
+    if (!cp.shift_sensitive) {
+      p += cp.length(*p);
+      continue;
+    }
+    take_shift(cp, &p, &state);
+    p += cp.width_in(state);
+    take_shift(cp, &p, &state);
+  }
+  return static_cast<size_t>(p - text);
+}
+
+int32_t chars_in_bytes(const Codepage& cp, const uint8_t* text, LXShiftState state, size_t bytes) {
+  if (!cp.shift_sensitive) return walk(cp, text, bytes).chars;
+  const uint8_t* p = text;
+  const uint8_t* const end = text + bytes;
+  int32_t chars = 0;
+  while (p < end) {
+    if (take_shift(cp, &p, &state) && p == end) break;
+    if (cp.width_in(state) > end - p) break;
+    p += cp.width_in(state);
+    ++chars;
+  }
+  return chars;
+}
+
+}  // namespace lx
+
+extern "C" {
+
+LXWChar LXGetChar(LXLocale* locale, const char* text) {
+  const Primitive in(locale);
+  return in ? lx::pack(bytes_of(text), in.cp().length(bytes_of(text)[0])) : 0;
+}
+
+LXWChar LXGetCharEx(LXLocale* locale, const char* text, LXShiftState state) {
+  const Primitive in(locale);
+  if (!in) return 0;
+  const uint8_t* p = bytes_of(text);
+  if (!in.shift_sensitive()) return lx::pack(p, in.cp().length(*p));
+  lx::take_shift(in.cp(), &p, &state);
+  return lx::pack(p, in.cp().width_in(state));
+}
+
+int32_t LXPutChar(LXLocale* locale, char* text, LXWChar code) {
+  const Primitive in(locale);
+  if (in) LXWToMb(text, code);
+  return 0;
+}
+
+void LXPutCharEx(LXLocale* locale, char* text, LXShiftState state, LXWChar code) {
+  const Primitive in(locale);
+  if (!in) return;
+  const LXShiftState needed = code > 0xFF ? LX_SHIFT_DOUBLE : LX_SHIFT_SINGLE;
+  if (in.shift_sensitive() && needed != state)
+    *text++ = static_cast<char>(needed == LX_SHIFT_DOUBLE ? in.cp().shift_out : in.cp().shift_in);
+  LXWToMb(text, code);
+}
+
+char* LXNextChar(LXLocale* locale, const char* text) {
+  const Primitive in(locale);
+  return in ? same(text + in.cp().length(bytes_of(text)[0])) : same(text);
+}
+
+char* LXNextCharEx(LXLocale* locale, const char* text, LXShiftState state, LXShiftState* new_state, int32_t) {
+  const Primitive in(locale);
+  const uint8_t* p = bytes_of(text);
+  if (in && in.shift_sensitive()) {
+    lx::take_shift(in.cp(), &p, &state);
+    p += in.cp().width_in(state);
+    lx::take_shift(in.cp(), &p, &state);
+  } else if (in) {
+    p += in.cp().length(*p);
+  }
+  *new_state = state;
+  return same(text + (p - bytes_of(text)));
+}
+
+char* LXPrevChar(LXLocale* locale, const char* start, const char* current) {
+  const Primitive in(locale);
+  if (!in) return same(current);
+  if (in.single_byte()) return same(current - 1);
+  // Lead bytes can only be told from the front.
+  const char* p = start;
+  while (p + in.cp().length(bytes_of(p)[0]) < current) p += in.cp().length(bytes_of(p)[0]);
+  return same(p);
+}
+
+char* LXPrevCharEx(LXLocale* locale, const char* start, const char* current, LXShiftState state,
+                   LXShiftState* new_state) {
+  const Primitive in(locale);
+  *new_state = state;
+  if (!in || !in.shift_sensitive()) return LXPrevChar(locale, start, current);
+  const Codepage& cp = in.cp();
+  const char* p = current;
+  if (p > start && cp.is_shift(bytes_of(p)[-1])) {
+    // The shift byte tells the state of what stands before it: before a Shift-In it is double-byte.
+    --p;
+    state = bytes_of(p)[0] == cp.shift_in ? LX_SHIFT_DOUBLE : LX_SHIFT_SINGLE;
+  }
+  const ptrdiff_t step = cp.width_in(state);
+  p = p - start > step ? p - step : start;
+  *new_state = state;
+  return same(p);
+}
+
+int32_t LXNumChars(LXLocale* locale, const char* text, int32_t bytes) {
+  const Primitive in(locale);
+  if (!in) return 0;
+  const size_t length = length_of(text, bytes);
+  return in.single_byte() ? static_cast<int32_t>(length) : walk(in.cp(), bytes_of(text), length).chars;
+}
+
+int32_t LXNumCharsEx(LXLocale* locale, const char* text, LXShiftState state, int32_t bytes) {
+  const Primitive in(locale);
+  if (!in) return 0;
+  if (!in.shift_sensitive()) return LXNumChars(locale, text, bytes);
+  return lx::chars_in_bytes(in.cp(), bytes_of(text), state, length_of(text, bytes));
+}
+
+char* LXMoveStringPointer(LXLocale* locale, const char* text, int32_t length, int32_t flags) {
+  const Primitive in(locale);
+  if (!in || length <= 0) return same(text);
+  size_t bytes = static_cast<size_t>(length);
+  if ((flags & LX_CHARACTERS) != 0)
+    bytes = lx::bytes_of_chars(in.cp(), bytes_of(text), LX_SHIFT_SINGLE, length);
+  if (in.single_byte()) return same(text + bytes);
+  return same(text + walk(in.cp(), bytes_of(text), bytes).position);
+}
+
+char* LXMoveStringPointerEx(LXLocale* locale, const char* text, LXShiftState state, int32_t length,
+                            LXShiftState* new_state, int32_t flags) {
+  const Primitive in(locale);
+  if (in && !in.shift_sensitive()) *new_state = state;
+  if (!in || !in.shift_sensitive()) return LXMoveStringPointer(locale, text, length, flags);
+  if (length <= 0) return same(text);
+  const Codepage& cp = in.cp();
+  size_t bytes = static_cast<size_t>(length);
+  if ((flags & LX_CHARACTERS) != 0) bytes = lx::bytes_of_chars(cp, bytes_of(text), state, length);
+  const uint8_t* p = bytes_of(text);
+  const uint8_t* const end = p + bytes;
+  while (p < end) {
+    lx::take_shift(cp, &p, &state);
+    if (cp.width_in(state) > end - p) break;
+    p += cp.width_in(state);
+  }
+  *new_state = state;
+  return same(text + (p - bytes_of(text)));
+}
+
+int32_t LXValidChar(LXLocale* locale, const char* text) {
+  const Primitive in(locale);
+  return in ? valid_bytes(text, in.cp().length(bytes_of(text)[0])) : 0;
+}
+
+int32_t LXValidCharEx(LXLocale* locale, const char* text, LXShiftState state) {
+  const Primitive in(locale);
+  if (!in) return 0;
+  if (!in.shift_sensitive()) return LXValidChar(locale, text);
+  return valid_bytes(text, state != LX_SHIFT_SINGLE ? in.cp().width : 1);
+}
+
+int32_t LXByteLength(LXLocale* locale, const char* text) {
+  const Primitive in(locale);
+  return in ? in.cp().length(bytes_of(text)[0]) : 0;
+}
+
+int32_t LXByteLengthW(LXLocale* locale, LXWChar code) {
+  const Primitive in(locale);
+  return in ? LXStrByteLength(code) : 0;
+}
+
+int32_t LXByteLengthEx(LXLocale* locale, const char* text, LXShiftState state) {
+  const Primitive in(locale);
+  if (!in) return 0;
+  const uint8_t* p = bytes_of(text);
+  if (!in.shift_sensitive()) return in.cp().length(*p);
+  lx::take_shift(in.cp(), &p, &state);
+  return in.cp().width_in(state);
+}
+
+int32_t LXStrByteLength(LXWChar code) {
+  return static_cast<int32_t>(lx::code_bytes(code));
+}
+
+void LXStrBigEndian(char* buffer, int32_t bytes) {
+  for (int32_t i = 0; i + 1 < bytes; i += 2) {
+    const char first = buffer[i];
+    buffer[i] = buffer[i + 1];
+    buffer[i + 1] = first;
+  }
+}
+
+void LXInitState(LXLocale* locale, LXShiftState* state) {
+  const Primitive in(locale);
+  *state = LX_SHIFT_SINGLE;
+}
+
+uint32_t LXGetCharType(LXLocale* locale, const char* text, uint32_t selector) {
+  const Primitive in(locale);
+  if (!in) return 0;
+  const uint8_t* p = bytes_of(text);
+  const bool single = in.single_byte() || in.cp().length(*p) == 1;
+  return type_field(in, single ? in.cp().type(*p) : lx::le32(type_record(in.cp(), p)), selector);
+}
+
+uint32_t LXGetCharTypeW(LXLocale* locale, LXWChar code, uint32_t selector) {
+  const Primitive in(locale);
+  if (!in) return 0;
+  const bool single = in.single_byte() || code <= 0xFF;
+  return type_field(
+      in, single ? in.cp().type(static_cast<uint8_t>(code)) : lx::le32(type_record_of_code(in.cp(), code)),
+      selector);
+}
+
+uint32_t LXGetCharTypeU(LXLocale* locale, LXUChar unicode, uint32_t selector) {
+  const Primitive in(locale);
+  return in ? type_field(in, lx::unicode_type(unicode), selector) : 0;
+}
+
+uint32_t LXGetCharTypeEx(LXLocale* locale, const char* text, LXShiftState state, uint32_t selector) {
+  const Primitive in(locale);
+  if (!in) return 0;
+  if (in.single_byte() || !in.shift_sensitive()) return LXGetCharType(locale, text, selector);
+  const uint8_t* p = bytes_of(text);
+  lx::take_shift(in.cp(), &p, &state);
+  const bool single = state != LX_SHIFT_DOUBLE;
+  return type_field(in, single ? in.cp().type(*p) : lx::le32(type_record(in.cp(), p)), selector);
+}
+
+const uint8_t* LXGetMbCtype(const LXObject* codepage, const char* text) {
+  return type_record(lx::codepage_of(*codepage), bytes_of(text));
+}
+
+const uint8_t* LXGetMbCtypeW(const LXObject* codepage, LXWChar code) {
+  return type_record_of_code(lx::codepage_of(*codepage), code);
+}
+
+LXWChar LXMbToW(const LXObject* codepage, const char* text) {
+  return lx::pack(bytes_of(text), lx::codepage_of(*codepage).length(bytes_of(text)[0]));
+}
+
+LXWChar LXMbToWS(const LXObject* codepage, const char* text, LXShiftState state) {
+  return lx::pack(bytes_of(text), lx::codepage_of(*codepage).width_in(state));
+}
+
+int32_t LXWToMb(char* text, LXWChar code) {
+  const uint32_t stored = lx::without_zero_bytes(code);
+  const size_t count = lx::code_bytes(stored);
+  lx::store_code(bytes_of(text), stored, count);
+  return static_cast<int32_t>(count);
+}
+
+LXUChar LXCpMbToUnicode(const LXObject* codepage, const char* text) {
+  return lx::multibyte_unicode(lx::codepage_of(*codepage), bytes_of(text));
+}
+
+LXUChar LXCpMbToUnicodeW(const LXObject* codepage, LXWChar code) {
+  char text[lx::kMaxCharBytes] = {};
+  LXWToMb(text, code);
+  return LXCpMbToUnicode(codepage, text);
+}
+
+int32_t LXCpUnicodeToChar(const LXObject* codepage, LXUChar unicode, char* text) {
+  return static_cast<int32_t>(lx::store_unicode(lx::codepage_of(*codepage), unicode, bytes_of(text)));
+}
+
+LXWChar LXCpUnicodeToCharW(const LXObject* codepage, LXUChar unicode) {
+  return lx::unicode_to_code(lx::codepage_of(*codepage), unicode);
+}
+
+int32_t LXCpStrCharToByteLen(const LXObject* codepage, const char* text, LXShiftState state, int32_t chars) {
+  return static_cast<int32_t>(lx::bytes_of_chars(lx::codepage_of(*codepage), bytes_of(text), state, chars));
+}
+
+int32_t LXCpStrByteToCharLen(const LXObject* codepage, const char* text, LXShiftState state, int32_t bytes) {
+  if (bytes == 0) return 0;
+  const Codepage& cp = lx::codepage_of(*codepage);
+  const size_t length = length_of(text, bytes);
+  if (cp.single_byte) return static_cast<int32_t>(length);
+  return lx::chars_in_bytes(cp, bytes_of(text), state, length);
+}
+
+int32_t LXLangGetSpecial(const LXObject* language, LXUChar first, LXUChar second, LXUChar* result1,
+                         LXUChar* result2, int32_t selector) {
+  namespace words = lx::format::language;
+  constexpr int32_t kUpperSelector = 44;
+  const uint8_t* payload = lx::payload_of(*language);
+  const bool upper = selector == kUpperSelector;
+  const size_t count = lx::le16(payload + 2 * (upper ? words::kUpperSpecials : words::kLowerSpecials));
+  const uint8_t* entry =
+      payload + lx::le16(payload + 2 * (upper ? words::kUpperSpecialTable : words::kLowerSpecialTable));
+  for (size_t i = 0; i < count; ++i, entry += words::kSpecialBytes) {
+    if (lx::le16(entry) != first || lx::le16(entry + 2) != second) continue;
+    *result1 = lx::le16(entry + 4);
+    *result2 = lx::le16(entry + 6);
+    return *result2 == 0 ? 1 : 2;
+  }
+  return 0;
+}
+
+}  // extern "C"

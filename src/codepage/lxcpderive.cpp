@@ -1,0 +1,197 @@
+// Derived data of a codepage: its tries and pages laid flat when it is loaded, so that a character costs two
+// table loads.
+#include <string.h>
+
+#include "codepage/lxcodepage.h"
+#include "core/lxmemory.h"
+#include "core/lxobjtypes.h"
+
+namespace {
+
+namespace fmt = lx::format::codepage;
+using lx::Codepage;
+
+constexpr size_t kRow = 256;
+
+/// The nodes of the multibyte-to-Unicode trie that can be reached, in the order in which they are found.
+class ReachableNodes {
+ public:
+  explicit ReachableNodes(lx::Bytes trie)
+      : trie_(trie),
+        known_(trie.size / fmt::kNodeBytes),
+        block_(static_cast<uint16_t*>(known_ != 0 ? lx::hook_allocate_zeroed(2 * known_ * sizeof(uint16_t))
+                                                  : nullptr)) {
+    if (!block_) return;
+    add(0);
+    for (size_t i = 0; i < count_; ++i) add_children(node(i));
+  }
+
+  bool out_of_memory() const { return known_ != 0 && !block_; }
+  size_t count() const { return count_; }
+  const uint8_t* node(size_t i) const { return trie_.data + order()[i] * fmt::kNodeBytes; }
+  /// The place in the order of the node with this index in the file.
+  uint16_t place(size_t index) const { return static_cast<uint16_t>(block_.get()[index] - 1); }
+
+ private:
+  uint16_t* order() const { return block_.get() + known_; }
+  void add(size_t index) {
+    if (block_.get()[index] != 0) return;
+    order()[count_++] = static_cast<uint16_t>(index);
+    block_.get()[index] = static_cast<uint16_t>(count_);
+  }
+  void add_children(const uint8_t* node) {
+    if (node[0] != 0) return;
+    for (unsigned byte = node[2]; byte <= node[3]; ++byte) add(lx::le16(node + 4) + (node[1] & byte));
+  }
+
+  lx::Bytes trie_;
+  size_t known_;                 // nodes that the section has room for
+  lx::HookPtr<uint16_t> block_;  // place + 1 by index, then indexes by place
+  size_t count_ = 0;
+};
+
+/// Where the arrays stand in the block: behind the record, 32-bit codes first.
+struct Layout {
+  size_t codes;
+  size_t rows;
+  size_t leaf;
+  size_t bytes;
+
+  Layout(size_t code_rows, bool wide, size_t nodes)
+      : codes(sizeof(Codepage)),
+        rows(codes + code_rows * kRow * (wide ? sizeof(uint32_t) : sizeof(uint16_t))),
+        leaf(rows + nodes * kRow * sizeof(uint16_t)),
+        bytes(leaf + nodes) {}
+};
+
+bool page_maps(const uint8_t* payload, size_t page) {
+  const uint8_t* entry = payload + fmt::kPages + page * fmt::kPageBytes;
+  return entry[2] <= entry[3];
+}
+
+void fill_scalars(Codepage* cp, uint16_t id, const lx::Sections& sections) {
+  const uint8_t* payload = sections.section[0].data;
+  cp->payload = payload;
+  cp->low_array = sections.section[2].data;
+  cp->high_array = sections.section[3].data;
+  cp->width = payload[fmt::kWidth];
+  cp->substitution = payload[fmt::kSubstitution];
+  cp->shift_out = payload[fmt::kShiftOut];
+  cp->shift_in = payload[fmt::kShiftIn];
+  cp->single_byte = cp->width == 1;
+  cp->shift_sensitive = (lx::le16(payload + fmt::kFlags) & fmt::kFlagShift) != 0;
+  cp->utf8 = id == fmt::kUtf8Id;
+  for (size_t b = 0; b < kRow; ++b) cp->unicode[b] = lx::le16(payload + fmt::kUnicode + 2 * b);
+}
+
+void fill_rows(const ReachableNodes& nodes, lx::Bytes trie, const uint8_t* payload, uint16_t* rows,
+               uint8_t* leaf) {
+  const uint8_t* values = trie.data + lx::le16(payload + fmt::kUnicodeValues);
+  for (size_t i = 0; i < nodes.count(); ++i) {
+    const uint8_t* node = nodes.node(i);
+    leaf[i] = node[0] != 0;
+    uint16_t* row = rows + i * kRow;
+    for (size_t b = 0; b < kRow; ++b) row[b] = leaf[i] != 0 ? lx::kNoUnicode : 0;
+    for (unsigned b = node[2]; b <= node[3]; ++b) {
+      const size_t index = lx::le16(node + 4) + (node[1] & b);
+      row[b] = leaf[i] != 0 ? lx::le16(values + 2 * index) : nodes.place(index);
+    }
+  }
+}
+
+template <class Code>
+void fill_codes(const Codepage& cp, Code* codes) {
+  for (size_t low = 0; low < kRow; ++low) codes[low] = cp.substitution;  // row 0: a page that maps nothing
+  for (size_t page = 0; page < kRow; ++page) {
+    if (cp.page_row[page] == 0) continue;
+    Code* row = codes + cp.page_row[page] * kRow;
+    for (size_t low = 0; low < kRow; ++low)
+      row[low] =
+          static_cast<Code>(lx::without_zero_bytes(lx::page_code(cp, static_cast<uint16_t>(page << 8 | low))));
+  }
+}
+
+uint32_t largest_code(const Codepage& cp) {
+  uint32_t largest = cp.substitution;
+  for (uint32_t u = 0; u <= 0xFFFF; ++u) {
+    const uint32_t code = lx::page_code(cp, static_cast<uint16_t>(u));
+    if (code > largest) largest = code;
+  }
+  return largest;
+}
+
+bool is_ascii_transparent(const Codepage& cp) {
+  if (cp.shift_sensitive) return false;
+  for (uint8_t b = 0; b < 0x80; ++b) {
+    if (cp.unicode[b] != b || (!cp.single_byte && cp.length(b) != 1)) return false;
+    if (!cp.utf8 && lx::row_code(cp, b) != b) return false;
+  }
+  return true;
+}
+
+}  // namespace
+
+namespace lx {
+
+void* derive_codepage(uint16_t id, const Sections& sections) {
+  Codepage scalars{};
+  fill_scalars(&scalars, id, sections);
+  const bool has_trie = !scalars.utf8 && !scalars.single_byte;
+  const Bytes trie = has_trie ? sections.section[1] : Bytes{};
+  const ReachableNodes nodes(trie);
+  if (nodes.out_of_memory()) return nullptr;
+  uint16_t code_rows = 1;
+  for (size_t page = 0; page < kRow; ++page)
+    if (!scalars.utf8 && page_maps(scalars.payload, page)) scalars.page_row[page] = code_rows++;
+  const uint32_t largest = scalars.utf8 ? 0 : largest_code(scalars);
+  const bool wide = largest > 0xFFFF;
+  scalars.one_byte_codes = !scalars.utf8 && largest <= 0xFF;
+  const Layout layout(code_rows, wide, nodes.count());
+
+  uint8_t* block = static_cast<uint8_t*>(hook_allocate(layout.bytes));
+  if (block == nullptr) return nullptr;
+  Codepage* cp = reinterpret_cast<Codepage*>(block);
+  memcpy(cp, &scalars, sizeof(scalars));
+  if (wide) {
+    uint32_t* codes = reinterpret_cast<uint32_t*>(block + layout.codes);
+    fill_codes(*cp, codes);
+    cp->codes32 = codes;
+  } else {
+    uint16_t* codes = reinterpret_cast<uint16_t*>(block + layout.codes);
+    fill_codes(*cp, codes);
+    cp->codes16 = codes;
+  }
+  if (nodes.count() != 0) {
+    uint16_t* rows = reinterpret_cast<uint16_t*>(block + layout.rows);
+    fill_rows(nodes, trie, cp->payload, rows, block + layout.leaf);
+    cp->rows = rows;
+    cp->leaf = block + layout.leaf;
+  }
+  cp->ascii_transparent = is_ascii_transparent(*cp);
+  return block;
+}
+
+uint32_t page_code(const Codepage& cp, uint16_t u) {
+  const uint8_t* entry = cp.payload + fmt::kPages + (u >> 8) * fmt::kPageBytes;
+  const uint8_t low_byte = static_cast<uint8_t>(u);
+  if (low_byte < entry[2] || low_byte > entry[3]) return cp.substitution;
+  const size_t index = low_byte & entry[1];
+  const size_t low = le16(entry + 4) + index;
+  const size_t high = le16(entry + 6) + index;
+  switch (entry[0]) {
+    case fmt::kKindByte:
+      return cp.low_array[low];
+    case fmt::kKindWord:
+      return le16(cp.low_array + 2 * low);
+    case fmt::kKindByteWord:
+      return static_cast<uint32_t>(cp.high_array[high]) << 16 | le16(cp.low_array + 2 * low);
+    case fmt::kKindWordWord:
+      return static_cast<uint32_t>(le16(cp.high_array + 2 * high)) << 16 | le16(cp.low_array + 2 * low);
+    case fmt::kKindByteByte:
+      return static_cast<uint32_t>(cp.high_array[high]) << 8 | cp.low_array[low];
+    default:
+      return 0;
+  }
+}
+
+}  // namespace lx

@@ -1,0 +1,180 @@
+// Validation of a codepage when it is loaded: afterwards every look-up, for whatever bytes or Unicode value,
+// stays inside its section, and no walk reads beyond the character it stands on. Nothing else is refused.
+#include "codepage/lxcodepage.h"
+#include "core/lxmemory.h"
+#include "core/lxobjtypes.h"
+
+namespace {
+
+namespace fmt = lx::format::codepage;
+
+constexpr unsigned kAnyByte = 256;
+
+/// One trie of a codepage: the nodes of the type trie have no byte range, so theirs is all bytes.
+struct Trie {
+  lx::Bytes nodes;    // from the root to the end of the section
+  size_t node_bytes;  // fmt::kNodeBytes or fmt::kTypeNodeBytes
+  lx::Bytes entries;  // what leaves index
+  size_t entry_bytes;
+
+  bool ranged() const { return node_bytes == fmt::kNodeBytes; }
+  bool has_node(size_t index) const { return nodes.holds(index * node_bytes, node_bytes); }
+  const uint8_t* node(size_t index) const { return nodes.data + index * node_bytes; }
+  bool leaf(const uint8_t* node) const { return node[0] != 0; }
+  unsigned lowest(const uint8_t* node) const { return ranged() ? node[2] : 0; }
+  unsigned highest(const uint8_t* node) const { return ranged() ? node[3] : kAnyByte - 1; }
+  size_t target(const uint8_t* node, unsigned byte) const {
+    return lx::le16(node + node_bytes - 2) + (node[1] & byte);
+  }
+};
+
+/// Measures how many bytes a walk from each node takes.
+class TrieCheck {
+ public:
+  explicit TrieCheck(const Trie& trie) : trie_(trie), known_(trie.nodes.size / trie.node_bytes) {
+    if (known_ != 0) heights_ = static_cast<uint8_t*>(lx::hook_allocate_zeroed(known_));
+  }
+  ~TrieCheck() { lx::hook_free(heights_); }
+  TrieCheck(const TrieCheck&) = delete;
+  TrieCheck& operator=(const TrieCheck&) = delete;
+
+  bool out_of_memory() const { return known_ != 0 && heights_ == nullptr; }
+
+  /// The most bytes that a walk from the root takes when it begins with `byte`; 0 when one leaves the section
+  /// or takes more than `limit`.
+  size_t walk_bytes(unsigned byte, size_t limit) {
+    if (!trie_.has_node(0)) return 0;
+    const uint8_t* root = trie_.node(0);
+    if (byte < trie_.lowest(root) || byte > trie_.highest(root)) return 1;
+    if (trie_.leaf(root)) return entry_exists(root, byte) ? 1 : 0;
+    if (limit < 2) return 0;
+    const size_t rest = height(trie_.target(root, byte), limit - 1);
+    return rest == 0 || rest + 1 > limit ? 0 : rest + 1;
+  }
+
+ private:
+  bool entry_exists(const uint8_t* node, unsigned byte) const {
+    return trie_.entries.holds(trie_.target(node, byte) * trie_.entry_bytes, trie_.entry_bytes);
+  }
+
+  /// As walk_bytes, from any node. Heights are kept, so each node is looked at once.
+  size_t height(size_t index, size_t limit) {
+    if (limit == 0 || !trie_.has_node(index)) return 0;
+    if (heights_[index] != 0) return heights_[index];
+    const uint8_t* node = trie_.node(index);
+    size_t tallest = 1;
+    for (unsigned byte = trie_.lowest(node); byte <= trie_.highest(node); ++byte) {
+      if (trie_.leaf(node)) {
+        if (!entry_exists(node, byte)) return 0;
+        continue;
+      }
+      const size_t rest = height(trie_.target(node, byte), limit - 1);
+      if (rest == 0) return 0;
+      if (rest + 1 > tallest) tallest = rest + 1;
+    }
+    // A node whose range is empty maps nothing and costs the byte that is compared.
+    heights_[index] = static_cast<uint8_t>(tallest);
+    return tallest;
+  }
+
+  const Trie& trie_;
+  size_t known_;
+  uint8_t* heights_ = nullptr;  // by node; 0: not measured
+};
+
+class Validator {
+ public:
+  Validator(uint16_t id, const lx::Sections& sections)
+      : sections_(sections), payload_(sections.section[0]), utf8_(id == fmt::kUtf8Id) {}
+
+  int32_t run() {
+    if (!payload_.holds(0, fmt::kFixedBytes)) return LX_E_CORRUPT;
+    width_ = payload_.data[fmt::kWidth];
+    shift_ = (word(fmt::kFlags) & fmt::kFlagShift) != 0;
+    if (!lengths_fit() || !width_tables_fit()) return LX_E_CORRUPT;
+    if (!utf8_ && !pages_fit()) return LX_E_CORRUPT;
+    if (width_ == 1) return LX_OK;
+    const int32_t rc = check_trie(type_trie());
+    if (rc != LX_OK || utf8_) return rc;
+    return check_trie(unicode_trie());
+  }
+
+ private:
+  size_t word(size_t offset) const { return lx::le16(payload_.data + offset); }
+  uint8_t length(unsigned byte) const { return payload_.data[fmt::kLengths + byte]; }
+
+  /// Lengths are 1 to the width; where UTF-8 is computed, as long as the bytes that the formula reads.
+  bool lengths_fit() const {
+    if (width_ < 1 || width_ > lx::kMaxCharBytes) return false;
+    for (unsigned byte = 0; byte < kAnyByte; ++byte) {
+      if (length(byte) < 1 || length(byte) > width_) return false;
+      if (utf8_ && length(byte) == 2 && byte > 0xDF) return false;
+    }
+    return true;
+  }
+
+  bool width_tables_fit() const {
+    return payload_.holds(word(fmt::kFullWidth), fmt::kFullWidthBytes) &&
+           payload_.holds(word(fmt::kPairs), word(fmt::kPairCount) * fmt::kPairBytes);
+  }
+
+  bool pages_fit() const {
+    for (size_t page = 0; page < kAnyByte; ++page)
+      if (!page_fits(payload_.data + fmt::kPages + page * fmt::kPageBytes)) return false;
+    return true;
+  }
+
+  bool page_fits(const uint8_t* entry) const {
+    const size_t low_width = entry[0] == fmt::kKindByte || entry[0] == fmt::kKindByteByte ? 1 : 2;
+    const size_t high_width = entry[0] == fmt::kKindWordWord                                     ? 2
+                              : entry[0] == fmt::kKindByteWord || entry[0] == fmt::kKindByteByte ? 1
+                                                                                                 : 0;
+    if (entry[0] > fmt::kKindByteByte) return true;
+    for (unsigned byte = entry[2]; byte <= entry[3]; ++byte) {
+      const size_t index = byte & entry[1];
+      if (!sections_.section[2].holds((lx::le16(entry + 4) + index) * low_width, low_width)) return false;
+      if (high_width != 0 &&
+          !sections_.section[3].holds((lx::le16(entry + 6) + index) * high_width, high_width))
+        return false;
+    }
+    return true;
+  }
+
+  lx::Bytes rest_of(lx::Bytes section, size_t offset) const {
+    return offset <= section.size ? lx::Bytes{section.data + offset, section.size - offset} : lx::Bytes{};
+  }
+  Trie type_trie() const {
+    return {rest_of(payload_, word(fmt::kTypeTrie)), fmt::kTypeNodeBytes,
+            rest_of(payload_, word(fmt::kTypeRecords)), fmt::kTypeRecordBytes};
+  }
+  Trie unicode_trie() const {
+    return {sections_.section[1], fmt::kNodeBytes, rest_of(sections_.section[1], word(fmt::kUnicodeValues)), 2};
+  }
+
+  /// A walk may take as many bytes as the character that begins with its first byte has.
+  int32_t check_trie(const Trie& trie) const {
+    TrieCheck check(trie);
+    if (check.out_of_memory()) return LX_E_MEMORY;
+    for (unsigned byte = 0; byte < kAnyByte; ++byte) {
+      const size_t limit = shift_ || length(byte) < 2 ? width_ : length(byte);
+      if (check.walk_bytes(byte, limit) == 0) return LX_E_CORRUPT;
+    }
+    return LX_OK;
+  }
+
+  const lx::Sections& sections_;
+  lx::Bytes payload_;
+  bool utf8_;
+  bool shift_ = false;
+  uint8_t width_ = 0;
+};
+
+}  // namespace
+
+namespace lx {
+
+int32_t validate_codepage(uint16_t id, const Sections& sections) {
+  return Validator(id, sections).run();
+}
+
+}  // namespace lx

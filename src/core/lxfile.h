@@ -1,0 +1,27 @@
+// Files: what the other rooms use beyond the exported functions.
+#pragma once
+
+#include "core/lxrecords.h"
+
+namespace lx {
+
+/// Opens for reading through the global area's file context.
+inline LXFile* open_for_reading(const char* path, int32_t* rc) {
+  return LXOpenFile(globals.area->file_context, path, LX_READ, 0, rc);
+}
+
+/// Closes a file when its scope ends.
+class FileCloser {
+ public:
+  explicit FileCloser(LXFile* file) : file_(file) {}
+  ~FileCloser() {
+    if (file_ != nullptr) LXCloseFile(file_, 0);
+  }
+  FileCloser(const FileCloser&) = delete;
+  FileCloser& operator=(const FileCloser&) = delete;
+
+ private:
+  LXFile* file_;
+};
+
+}  // namespace lx

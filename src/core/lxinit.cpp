@@ -1,0 +1,152 @@
+// Initialisation: the global area, its lock and reference count, the hooks, the environment and the last
+// error.
+#include <cstdlib>
+#include <cstring>
+
+#include "core/lxlock.h"
+#include "core/lxmemory.h"
+#include "core/lxobjman.h"
+#include "core/lxtrace.h"
+
+namespace {
+
+RAS1_Unit unit = RAS1_UNIT("lxinit");
+
+constexpr uint32_t kTableAlignment = 4;
+
+void drop_area() {
+  lx::GlobalArea* area = lx::globals.area;
+  const LXFreeHook release = lx::globals.release;
+  lx::globals = lx::Globals{};
+  release(area->context, area);
+}
+
+/// Creates the area, or takes the one that a failed initialisation left, unless other hooks own that one.
+bool create_area(LXAllocHook allocate, LXFreeHook release, void* context) {
+  if (lx::globals.area != nullptr) {
+    if (lx::globals.allocate == allocate && lx::globals.release == release &&
+        lx::globals.area->context == context)
+      return true;
+    drop_area();
+  }
+  LX_TRACE(unit, RAS1_LEVEL_DETAIL, "Creating global area");
+  void* block = allocate(context, sizeof(lx::GlobalArea));
+  if (block == nullptr) {
+    LX_TRACE(unit, RAS1_LEVEL_ERRORS, "Unable to allocate %d bytes for globals",
+             static_cast<int>(sizeof(lx::GlobalArea)));
+    return false;
+  }
+  memset(block, 0, sizeof(lx::GlobalArea));
+  lx::globals = lx::Globals{static_cast<lx::GlobalArea*>(block), allocate, release, nullptr};
+  lx::globals.area->context = context;
+  return true;
+}
+
+}  // namespace
+
+namespace lx {
+
+Globals globals;
+
+void* hook_allocate_zeroed(size_t bytes) {
+  void* block = hook_allocate(bytes);
+  if (block != nullptr) memset(block, 0, bytes);
+  return block;
+}
+
+}  // namespace lx
+
+extern "C" {
+
+void* LXDefAlloc(void*, size_t bytes) {
+  return malloc(bytes);
+}
+
+int32_t LXDefFree(void*, void* block) {
+  free(block);
+  return 1;
+}
+
+int32_t LXInit(const char* directory, LXAllocHook allocate, LXFreeHook release, void* context,
+               uint32_t options) {
+  lx::Events events(unit);
+  if (lx::initialized()) {
+    lx::GlobalLock lock;
+    ++lx::globals.area->init_count;
+    LX_TRACE(unit, RAS1_LEVEL_DETAIL, "Lexicor init count = %d", lx::globals.area->init_count);
+    return events.exit(LX_OK);
+  }
+  if (allocate == nullptr) allocate = LXDefAlloc;
+  if (release == nullptr) release = LXDefFree;
+  if (!create_area(allocate, release, context)) return events.exit(LX_E_MEMORY);
+
+  lx::GlobalArea* area = lx::globals.area;
+  LX_TRACE(unit, RAS1_LEVEL_DETAIL, "Lexicor init count = %d", area->init_count);
+  BSS1_InitializeLock(&area->lock);
+  int32_t result = LX_OK;
+  {
+    lx::GlobalLock lock;
+    memcpy(area->directory_separator, "/", 2);
+    memcpy(area->name_separator, "_", 2);
+    area->table_alignment = kTableAlignment;
+    area->file_context = 1;
+    int32_t rc = LX_OK;
+    LXObjManager* manager = lx::create_manager(directory, options, &rc);
+    if (manager != nullptr) {
+      if (rc != LX_OK) result = LX_W_DEFAULTS;
+      area->manager = manager;
+      ++area->init_count;
+    } else {
+      area->file_context = 0;
+      result = LX_E_NOT_INITIALIZED;
+    }
+  }
+  if (result == LX_E_NOT_INITIALIZED) BSS1_DestroyLock(&area->lock);
+  return events.exit(result);
+}
+
+int32_t LXTerm(void) {
+  lx::Events events(unit);
+  if (!lx::initialized()) {
+    if (lx::globals.area != nullptr) drop_area();  // left by an initialisation that failed
+    return events.exit(LX_E_NOT_INITIALIZED);
+  }
+  lx::GlobalArea* area = lx::globals.area;
+  {
+    lx::GlobalLock lock;
+    if (area->init_count > 1) {
+      --area->init_count;
+      return events.exit(LX_OK);
+    }
+  }
+  // The count stays 1 while the default locale and the manager are released through the library itself.
+  int32_t result = LX_OK;
+  if (LXLocale* locale = lx::globals.default_locale) {
+    lx::globals.default_locale = nullptr;
+    result = LXReleaseLocale(locale);
+  }
+  LXObjManager* manager = area->manager;
+  area->manager = nullptr;
+  const int32_t rc = LXTermObjManager(manager);
+  if (result == LX_OK) result = rc;
+  area->file_context = 0;
+  area->init_count = 0;
+  BSS1_DestroyLock(&area->lock);
+  drop_area();
+  return events.exit(result);
+}
+
+int32_t LXGetError(const LXLocale* locale) {
+  const LXLocale* used = lx::locale_of(const_cast<LXLocale*>(locale));
+  return used != nullptr ? used->last_error : LX_E_NOT_INITIALIZED;
+}
+
+int32_t LXGetEnv(const char* name, char* buffer, int32_t size) {
+  const char* value = BSS1_GetEnv(name);
+  if (value == nullptr) return 0;
+  const size_t bytes = strlen(value) + 1;
+  if (size > 0 && bytes <= static_cast<size_t>(size)) memcpy(buffer, value, bytes);
+  return static_cast<int32_t>(bytes);
+}
+
+}  // extern "C"

@@ -1,0 +1,299 @@
+// Locale handles: created by name, shared by nobody, released by their owner. Also the default locale, the
+// enumeration of what a locale can be made of, and the operating system's name of a locale.
+#include <string.h>
+
+#include "codepage/lxcodepage.h"
+#include "core/lxcall.h"
+#include "core/lxmemory.h"
+#include "core/lxobjman.h"
+
+namespace {
+
+using lx::Events;
+
+RAS1_Unit unit = RAS1_UNIT("lxlocale");
+
+constexpr char kDefaultLanguage[] = "English";
+constexpr char kUserVariable[] = "LX_LANG";
+constexpr size_t kUserNameBytes = 132;  // no more of the variable is read
+constexpr int32_t kCreateFlags = LX_USER_LOCALE | LX_FALLBACK;
+
+/// A part of a locale name.
+template <class Unit>
+struct Part {
+  const Unit* text = nullptr;
+  int32_t length = 0;
+  bool named = false;
+};
+
+template <class Unit>
+struct LocaleName {
+  Part<Unit> language, territory, codepage, sort;
+
+  /// language, then optionally "_" territory, "." codepage, "@" sort, in this order. `units` bounds the name.
+  LocaleName(const Unit* name, size_t units) : p_(name), end_(name + units) {
+    language = take('_', '.', '@');
+    language.named = language.length != 0;
+    if (follows('_')) territory = take('.', '.', '@');
+    if (follows('.')) codepage = take('@', '@', '@');
+    if (follows('@')) sort = take('\0', '\0', '\0');
+  }
+
+ private:
+  bool at_end() const { return p_ == end_ || *p_ == 0; }
+  bool follows(char mark) {
+    if (at_end() || *p_ != static_cast<Unit>(mark)) return false;
+    ++p_;
+    return true;
+  }
+  Part<Unit> take(char mark1, char mark2, char mark3) {
+    Part<Unit> part;
+    part.text = p_;
+    part.named = true;
+    while (!at_end() && *p_ != static_cast<Unit>(mark1) && *p_ != static_cast<Unit>(mark2) &&
+           *p_ != static_cast<Unit>(mark3))
+      ++p_;
+    part.length = static_cast<int32_t>(p_ - part.text);
+    return part;
+  }
+
+  const Unit* p_;
+  const Unit* end_;
+};
+
+LXObject* find(int32_t type, const Part<char>& part, int32_t* rc) {
+  return LXGetObjFromName(nullptr, type, part.text, part.length, LX_FIND_AND_LOAD, rc);
+}
+LXObject* find(int32_t type, const Part<LXWChar>& part, int32_t* rc) {
+  return LXGetObjFromNameW(nullptr, type, part.text, part.length, LX_FIND_AND_LOAD, rc);
+}
+
+/// A named object; one that is not named, or is missing where a fallback is asked for, is the language's
+/// default.
+template <class Unit>
+LXObject* find_or_default(int32_t type, const Part<Unit>& part, const LXObject& language, size_t default_word,
+                          int32_t flags, int32_t* rc) {
+  if (part.named) {
+    LXObject* object = find(type, part, rc);
+    if (*rc != LX_E_NOT_FOUND || (flags & LX_FALLBACK) == 0) return object;
+  }
+  return lx::object_by_id(type, lx::le16(lx::payload_of(language) + 2 * default_word), rc);
+}
+
+/// The result of a look-up as a code of locale creation: an object may come with a code when built-in data took
+/// the place of its file, and a sort may be null for binary order.
+int32_t lookup_code(const LXObject* object, int32_t rc, int32_t not_found) {
+  if (object != nullptr || rc == LX_OK) return LX_OK;
+  if (rc == LX_E_NOT_FOUND) return not_found;
+  return rc == LX_E_MEMORY ? LX_E_MEMORY : LX_E_NOT_INITIALIZED;
+}
+
+/// Finds the four objects of a locale.
+template <class Unit>
+int32_t find_objects(LXLocale* locale, const LocaleName<Unit>& name, int32_t flags) {
+  namespace words = lx::format::language;
+  int32_t rc = LX_E_NOT_FOUND;
+  const bool is_default = !name.language.named;
+  if (!is_default) locale->language = find(LX_LANGUAGE, name.language, &rc);
+  if (is_default || (rc == LX_E_NOT_FOUND && (flags & LX_FALLBACK) != 0)) {
+    const Part<char> english{kDefaultLanguage, static_cast<int32_t>(strlen(kDefaultLanguage)), true};
+    locale->language = find(LX_LANGUAGE, english, &rc);
+  }
+  if (const int32_t code = lookup_code(locale->language, rc, LX_E_NO_LANGUAGE)) {
+    LX_TRACE(unit, RAS1_LEVEL_ERRORS, "Unable to locate language, rc = %d", rc);
+    return code;
+  }
+  const LXObject& language = *locale->language;
+  locale->territory =
+      find_or_default(LX_TERRITORY, name.territory, language, words::kDefaultTerritory, flags, &rc);
+  if (const int32_t code = lookup_code(locale->territory, rc, LX_E_NO_TERRITORY)) {
+    LX_TRACE(unit, RAS1_LEVEL_ERRORS, "Unable to locate territory, rc = %d", rc);
+    return code;
+  }
+  locale->codepage = find_or_default(LX_CODEPAGE, name.codepage, language, words::kDefaultCodepage, flags, &rc);
+  if (const int32_t code = lookup_code(locale->codepage, rc, LX_E_NO_CODEPAGE)) {
+    LX_TRACE(unit, RAS1_LEVEL_ERRORS, "Unable to locate code page, rc = %d", rc);
+    return code;
+  }
+  locale->sort = find_or_default(LX_SORT, name.sort, language, words::kDefaultSort, flags, &rc);
+  const int32_t code = lookup_code(locale->sort, rc, LX_E_NO_SORT);
+  if (code != LX_OK) LX_TRACE(unit, RAS1_LEVEL_ERRORS, "Unable to locate sort, rc = %d", rc);
+  return code;
+}
+
+void set_flags(LXLocale* locale) {
+  const lx::Codepage& cp = lx::codepage_of(*locale->codepage);
+  if (cp.single_byte) locale->flags |= lx::kLocaleSingleByte;
+  if (cp.shift_sensitive) locale->flags |= lx::kLocaleShift;
+  if (locale->sort == nullptr) locale->flags |= lx::kLocaleBinarySort;
+}
+
+/// Creates a locale; null with a code.
+template <class Unit>
+LXLocale* create(const Unit* name, size_t units, int32_t flags, int32_t* rc) {
+  lx::HookPtr<LXLocale> locale(static_cast<LXLocale*>(lx::hook_allocate_zeroed(sizeof(LXLocale))));
+  *rc = LX_E_MEMORY;
+  if (!locale) return nullptr;
+  *rc = find_objects(locale.get(), LocaleName<Unit>(name, units), flags);
+  if (*rc != LX_OK) return nullptr;
+  set_flags(locale.get());
+  return locale.detach();
+}
+
+LXLocale* create_from_bytes(const char* name, int32_t flags, int32_t* rc) {
+  *rc = LX_E_NOT_INITIALIZED;
+  if (!lx::initialized()) return nullptr;
+  *rc = LX_E_INVALID;
+  if ((flags & ~kCreateFlags) != 0) return nullptr;
+  if ((flags & LX_USER_LOCALE) == 0)
+    return create(name != nullptr ? name : "", name != nullptr ? strlen(name) : 0, flags, rc);
+  const char* user = BSS1_GetEnv(kUserVariable);
+  *rc = LX_E_NO_NATIVE;
+  if (user == nullptr) return nullptr;
+  return create(user, strnlen(user, kUserNameBytes), flags, rc);
+}
+
+/// Creates a locale and installs it as the default in place of the previous one.
+template <class Create>
+int32_t install(Create create_locale) {
+  Events events(unit);
+  int32_t rc = LX_OK;
+  LXLocale* locale = create_locale(&rc);
+  if (locale == nullptr) return events.exit(rc);
+  LXLocale* previous = lx::globals.default_locale;
+  lx::globals.default_locale = locale;
+  if (previous != nullptr) LXReleaseLocale(previous);
+  return events.exit(LX_OK);
+}
+
+/// Gives each object of the library's manager to `visit(entry)` until that returns 0.
+template <class Visit>
+int32_t enumerate(Visit visit) {
+  Events events(unit);
+  const LXObjManager* manager = lx::manager_of(nullptr);
+  if (manager == nullptr) return events.exit(LX_OK);
+  for (uint16_t i = 0; i < manager->count; ++i)
+    if (visit(manager->entries[i].disk) == 0) break;
+  return events.exit(LX_OK);
+}
+
+/// The operating system's names of locales, the most specific search key first.
+struct NativeName {
+  uint16_t ids[4];  // language, territory, codepage, sort
+  const char* name;
+};
+constexpr NativeName kNativeNames[] = {{{1, 840, 367, 0}, "C"}};
+constexpr size_t kNativeKeys = 4;
+
+/// Narrows the table step by step: the name of the most specific row reached, and how many keys it matches.
+const char* nearest_native_name(const uint16_t ids[kNativeKeys], size_t* matched) {
+  size_t row = 0;
+  *matched = 0;
+  for (size_t i = 0; i < sizeof(kNativeNames) / sizeof(kNativeNames[0]); ++i) {
+    size_t keys = 0;
+    while (keys < kNativeKeys && kNativeNames[i].ids[keys] == ids[keys]) ++keys;
+    if (keys > *matched) {
+      *matched = keys;
+      row = i;
+    }
+  }
+  return kNativeNames[row].name;
+}
+
+}  // namespace
+
+extern "C" {
+
+LXLocale* LXGetLocale(const char* name, int32_t flags, int32_t* rc) {
+  Events events(unit);
+  int32_t code = LX_OK;
+  LXLocale* locale = create_from_bytes(name, flags, &code);
+  if (rc != nullptr) *rc = code;
+  return events.exit(locale);
+}
+
+LXLocale* LXGetLocaleW(const LXWChar* name, int32_t flags, int32_t* rc) {
+  if ((flags & LX_USER_LOCALE) != 0 || name == nullptr) return LXGetLocale(nullptr, flags, rc);
+  Events events(unit);
+  int32_t code = lx::initialized() ? LX_E_INVALID : LX_E_NOT_INITIALIZED;
+  LXLocale* locale = nullptr;
+  if (lx::initialized() && (flags & ~kCreateFlags) == 0) {
+    size_t units = 0;
+    while (name[units] != 0) ++units;
+    locale = create(name, units, flags, &code);
+  }
+  if (rc != nullptr) *rc = code;
+  return events.exit(locale);
+}
+
+LXLocale* LXGetLocaleU(const LXUChar* name, int32_t flags, int32_t* rc) {
+  Events events(unit);
+  if (!lx::initialized() || name == nullptr) return events.exit(LXGetLocale(nullptr, flags, rc));
+  size_t units = 0;
+  while (name[units] != 0) ++units;
+  const lx::WorkBuffer narrow(units * lx::kMaxCharBytes + 1);
+  if (!narrow) {
+    if (rc != nullptr) *rc = LX_E_MEMORY;
+    return events.exit(static_cast<LXLocale*>(nullptr));
+  }
+  LXComUnicodeToStr(name, -1, narrow.as<char>());
+  return events.exit(LXGetLocale(narrow.as<char>(), flags, rc));
+}
+
+int32_t LXReleaseLocale(LXLocale* locale) {
+  Events events(unit);
+  if (!lx::initialized()) return events.exit(1);
+  if (locale == nullptr) return events.exit(LX_OK);
+  bool freed = lx::hook_free(locale->grouping);
+  for (char* text : locale->texts) freed &= lx::hook_free(text);
+  for (LXUChar* text : locale->texts_unicode) freed &= lx::hook_free(text);
+  freed &= lx::hook_free(locale);
+  return events.exit(freed ? LX_OK : 1);
+}
+
+int32_t LXSetLocale(const char* name, int32_t flags) {
+  return install([&](int32_t* rc) { return LXGetLocale(name, flags, rc); });
+}
+int32_t LXSetLocaleW(const LXWChar* name, int32_t flags) {
+  return install([&](int32_t* rc) { return LXGetLocaleW(name, flags, rc); });
+}
+int32_t LXSetLocaleU(const LXUChar* name, int32_t flags) {
+  return install([&](int32_t* rc) { return LXGetLocaleU(name, flags, rc); });
+}
+
+int32_t LXConvertLocale(LXLocale* given, char* buffer, int32_t flags) {
+  lx::Call call(unit, given);
+  if (!call) return call.fail(LX_E_NOT_INITIALIZED, 0);
+  if ((flags & ~(LX_TERRITORY_VALUES | LX_FALLBACK)) != 0) return call.fail(LX_E_INVALID, 0);
+  const LXLocale* locale = call.locale();
+  const uint16_t ids[kNativeKeys] = {locale->language->disk.id, locale->territory->disk.id,
+                                     locale->codepage->disk.id,
+                                     locale->sort != nullptr ? locale->sort->disk.id : uint16_t{0}};
+  size_t matched = 0;
+  const char* name = nearest_native_name(ids, &matched);
+  if (matched != kNativeKeys && (flags & LX_FALLBACK) == 0) return call.fail(LX_E_NO_NATIVE, 0);
+  strcpy(buffer, name);
+  return call.exit(1);
+}
+
+int32_t LXEnumLocales(LXLocaleCallback callback, void* user) {
+  return enumerate([&](const LXObjDisk& disk) { return callback(user, disk.type, disk.name); });
+}
+
+int32_t LXEnumLocalesW(LXLocaleCallbackW callback, void* user) {
+  return enumerate([&](const LXObjDisk& disk) {
+    LXWChar name[sizeof(disk.name)];
+    for (size_t i = 0; i < sizeof(disk.name); ++i) name[i] = static_cast<unsigned char>(disk.name[i]);
+    return callback(user, disk.type, name);
+  });
+}
+
+int32_t LXEnumLocalesU(LXLocaleCallbackU callback, void* user) {
+  return enumerate([&](const LXObjDisk& disk) {
+    LXUChar name[sizeof(disk.name)];
+    LXComStrToUnicode(disk.name, -1, name);
+    return callback(user, disk.type, name);
+  });
+}
+
+}  // extern "C"

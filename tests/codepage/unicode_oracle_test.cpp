@@ -1,0 +1,255 @@
+// Types, case, width and digits of all 65,536 values against ICU, which takes them from the same version of
+// Unicode by another way. What the library does differently stands here as rules, each with its reason.
+#include <gtest/gtest.h>
+#include <unicode/uchar.h>
+#include <unicode/unorm2.h>
+#include <unicode/uscript.h>
+
+#include <cstdio>
+#include <string>
+
+#include "codepage/lxunicode.h"
+#include "lx/codepage.h"
+
+namespace {
+
+struct Span {
+  uint32_t first, last;
+};
+
+template <size_t kSpans>
+bool in(const Span (&spans)[kSpans], uint32_t u) {
+  for (const Span& span : spans)
+    if (span.first <= u && u <= span.last) return true;
+  return false;
+}
+
+/// Counts the values that differ and prints the first of them.
+class Differences {
+ public:
+  explicit Differences(const char* what) : what_(what) {}
+  ~Differences() { EXPECT_EQ(count_, 0) << what_ << ":" << text_; }
+  void check(uint32_t u, uint32_t got, uint32_t expected) {
+    if (got == expected || ++count_ > 20) return;
+    char line[64];
+    snprintf(line, sizeof line, "\n  U+%04X: %03X instead of %03X", u, got, expected);
+    text_ += line;
+  }
+
+ private:
+  const char* what_;
+  std::string text_;
+  int32_t count_ = 0;
+};
+
+// Whole blocks without types: those that Unicode filled later, and scripts that the tables never covered. Among
+// them are also surrogates and the private use area.
+constexpr Span kWithoutTypes[] = {{0x06FA, 0x0900}, {0x0EDE, 0x109F}, {0x11FA, 0x1DFF}, {0x27BF, 0x2FFF},
+                                  {0x33FF, 0x4DFF}, {0x9FA6, 0xABFF}, {0xD7A4, 0xF8FF}, {0xFA2E, 0xFAFF}};
+
+bool has_type(uint32_t u) {
+  const bool exception = u == 0xFBE9 || u == 0xFCE1;  // letters that callers know as unassigned
+  return u_isdefined(static_cast<UChar32>(u)) && !in(kWithoutTypes, u) && !exception;
+}
+
+bool is(uint32_t u, UProperty property) {
+  return u_hasBinaryProperty(static_cast<UChar32>(u), property);
+}
+
+int32_t value(uint32_t u, UProperty property) {
+  return u_getIntPropertyValue(static_cast<UChar32>(u), property);
+}
+
+bool is_mapped_digit(uint32_t u) {
+  const int32_t decomposition = value(u, UCHAR_DECOMPOSITION_TYPE);
+  if (decomposition == U_DT_SUPER || decomposition == U_DT_SUB)
+    return value(u, UCHAR_NUMERIC_TYPE) == U_NT_DIGIT;
+  UVersionInfo age;
+  u_charAge(static_cast<UChar32>(u), age);
+  // Digits of scripts that came after Unicode 2.0 have no ASCII digit.
+  return u_charType(static_cast<UChar32>(u)) == U_DECIMAL_DIGIT_NUMBER &&
+         (age[0] < 2 || (age[0] == 2 && !age[1]));
+}
+
+uint32_t classification(uint32_t u) {
+  const auto c = static_cast<UChar32>(u);
+  const uint32_t mask = U_MASK(u_charType(c));
+  const bool alphabetic = is(u, UCHAR_ALPHABETIC);  // circled letters and many vowel signs included
+  // The soft hyphen and the number signs of Arabic are format characters that show.
+  const bool visible_format = u == 0x00AD || is(u, UCHAR_PREPENDED_CONCATENATION_MARK);
+  uint32_t bits = u < 0x80 ? LX_C1_ASCII : 0;
+  if (alphabetic) bits |= LX_C1_ALPHA;
+  if (is(u, UCHAR_UPPERCASE)) bits |= LX_C1_UPPER;
+  if (is(u, UCHAR_LOWERCASE)) bits |= LX_C1_LOWER;
+  if (is_mapped_digit(u))
+    bits |= LX_C1_DIGIT;
+  else if (!alphabetic && (mask & (U_GC_P_MASK | U_GC_S_MASK | U_GC_N_MASK)))
+    bits |= LX_C1_PUNCT;
+  if (is(u, UCHAR_HEX_DIGIT)) bits |= LX_C1_XDIGIT;
+  if (is(u, UCHAR_WHITE_SPACE)) bits |= LX_C1_SPACE;
+  if (u_isblank(c)) bits |= LX_C1_BLANK;
+  if (visible_format) bits |= LX_C1_PUNCT;
+  if ((mask & (U_GC_CC_MASK | U_GC_CF_MASK | U_GC_ZL_MASK | U_GC_ZP_MASK)) && !visible_format)
+    bits |= LX_C1_CNTRL;
+  return bits;
+}
+
+uint32_t bidi_category(uint32_t u) {
+  // The assignment in which the solidus separates numbers, and plus and minus end them.
+  if (u == '/' || u == 0xFF0F) return LX_C2_EUROPEAN_SEPARATOR;
+  switch (u_charDirection(static_cast<UChar32>(u))) {
+    case U_LEFT_TO_RIGHT:
+      return LX_C2_LEFT_TO_RIGHT;
+    case U_RIGHT_TO_LEFT:
+    case U_RIGHT_TO_LEFT_ARABIC:
+      return LX_C2_RIGHT_TO_LEFT;
+    case U_EUROPEAN_NUMBER:
+      return LX_C2_EUROPEAN_NUMBER;
+    case U_EUROPEAN_NUMBER_SEPARATOR:
+    case U_EUROPEAN_NUMBER_TERMINATOR:
+      return LX_C2_EUROPEAN_TERMINATOR;
+    case U_ARABIC_NUMBER:
+      return LX_C2_ARABIC_NUMBER;
+    case U_COMMON_NUMBER_SEPARATOR:
+      return LX_C2_COMMON_SEPARATOR;
+    case U_BLOCK_SEPARATOR:
+      return LX_C2_BLOCK_SEPARATOR;
+    case U_SEGMENT_SEPARATOR:
+      return LX_C2_SEGMENT_SEPARATOR;
+    case U_WHITE_SPACE_NEUTRAL:
+      return LX_C2_WHITE_SPACE;
+    case U_OTHER_NEUTRAL:
+    case U_DIR_NON_SPACING_MARK:  // no category of their own: marks and isolates act as neutrals
+    case U_FIRST_STRONG_ISOLATE:
+    case U_LEFT_TO_RIGHT_ISOLATE:
+    case U_RIGHT_TO_LEFT_ISOLATE:
+    case U_POP_DIRECTIONAL_ISOLATE:
+      return LX_C2_OTHER_NEUTRAL;
+    default:  // embeddings, overrides and boundary neutrals
+      return LX_C2_NONE;
+  }
+}
+
+/// Whether the canonical decomposition of a letter holds a mark.
+bool is_accented_letter(uint32_t u) {
+  if (!u_isalpha(static_cast<UChar32>(u))) return false;
+  UErrorCode error = U_ZERO_ERROR;
+  UChar parts[16];
+  const int32_t units =
+      unorm2_getDecomposition(unorm2_getNFDInstance(&error), static_cast<UChar32>(u), parts, 16, &error);
+  for (int32_t n = 0; n < units; ++n)
+    if (U_MASK(u_charType(parts[n])) & (U_GC_MN_MASK | U_GC_ME_MASK)) return true;
+  return false;
+}
+
+bool is_vowel_mark(uint32_t u) {
+  const uint8_t ccc = u_getCombiningClass(static_cast<UChar32>(u));
+  return value(u, UCHAR_INDIC_SYLLABIC_CATEGORY) == U_INSC_VOWEL_DEPENDENT ||
+         (10 <= ccc && ccc <= 20) ||                          // Hebrew sheva to qubuts
+         (27 <= ccc && ccc <= 32) || ccc == 34 || ccc == 35;  // Arabic, without shadda (33)
+}
+
+/// The bits of the kana scripts, for characters that are used with nothing else.
+uint32_t kana(uint32_t u) {
+  UErrorCode error = U_ZERO_ERROR;
+  UScriptCode scripts[32];
+  const int32_t count = uscript_getScriptExtensions(static_cast<UChar32>(u), scripts, 32, &error);
+  uint32_t bits = 0;
+  for (int32_t n = 0; n < count; ++n) {
+    if (scripts[n] == USCRIPT_KATAKANA)
+      bits |= LX_C3_KATAKANA;
+    else if (scripts[n] == USCRIPT_HIRAGANA)
+      bits |= LX_C3_HIRAGANA;
+    else
+      return 0;
+  }
+  return bits;
+}
+
+uint32_t text_properties(uint32_t u) {
+  const uint32_t mask = U_MASK(u_charType(static_cast<UChar32>(u)));
+  const int32_t width = value(u, UCHAR_EAST_ASIAN_WIDTH);
+  const bool ascii_accent = u == '^' || u == '`' || u == 0xFF3E || u == 0xFF40;  // plain punctuation
+  uint32_t bits = kana(u);
+  if ((mask & (U_GC_MN_MASK | U_GC_ME_MASK)) || is_accented_letter(u))
+    bits |= LX_C3_NON_SPACING | LX_C3_DIACRITIC;
+  if (is(u, UCHAR_DIACRITIC) && !ascii_accent) bits |= LX_C3_DIACRITIC;
+  if (is_vowel_mark(u)) bits |= LX_C3_VOWEL_MARK;
+  // Infinity is the one operator that programs do not find among the symbols.
+  if ((classification(u) & LX_C1_PUNCT || mask & U_GC_ZS_MASK) && u != 0x221E) bits |= LX_C3_SYMBOL;
+  if (width == U_EA_NARROW || width == U_EA_HALFWIDTH) bits |= LX_C3_HALF_WIDTH;
+  if (width == U_EA_FULLWIDTH) bits |= LX_C3_FULL_WIDTH;
+  if (is(u, UCHAR_IDEOGRAPHIC)) bits |= LX_C3_IDEOGRAPH;
+  if (u == 0x0640) bits |= LX_C3_KASHIDA;
+  return bits;
+}
+
+TEST(UnicodeOracle, VersionIsTheSame) {
+  UVersionInfo version;
+  u_getUnicodeVersion(version);
+  ASSERT_EQ(version[0], 15) << "the tables and ICU follow different versions of Unicode";
+}
+
+TEST(UnicodeOracle, Types) {
+  Differences type1("classification"), type2("bidirectional category"), type3("text properties");
+  for (uint32_t u = 0; u <= 0xFFFF; ++u) {
+    const uint32_t word = lx::unicode_type(static_cast<uint16_t>(u));
+    const bool known = has_type(u);
+    type1.check(u, word & 0x3FF, known ? classification(u) : 0);
+    type2.check(u, word >> 10 & 0xFFF, known ? bidi_category(u) : uint32_t{LX_C2_NONE});
+    type3.check(u, word >> 22, known ? text_properties(u) : 0);
+  }
+}
+
+TEST(UnicodeOracle, Case) {
+  // Outside these ranges nothing has a case: neither alphabets that got one later nor letter-like signs.
+  const Span lowered[] = {{0x0041, 0x005A}, {0x00C0, 0x0275}, {0x0386, 0x03EE}, {0x0401, 0x04F8},
+                          {0x0531, 0x0556}, {0x1E00, 0x1EF8}, {0x1F08, 0x1FFC}, {0x2160, 0x216F},
+                          {0x24B6, 0x24CF}, {0xFF21, 0xFF3A}};
+  const Span raised[] = {{0x0061, 0x007A}, {0x00E0, 0x0292}, {0x03AC, 0x03F1}, {0x0430, 0x04F9},
+                         {0x0561, 0x0586}, {0x1E01, 0x1EF9}, {0x1F00, 0x1FF3}, {0x2170, 0x217F},
+                         {0x24D0, 0x24E9}, {0xFF41, 0xFF5A}};
+  // Old Georgian capitals go to the modern letters; ICU sends them to the small letters of their own kind.
+  const Span georgian[] = {{0x10A0, 0x10C5}};
+  Differences lower("lower case"), upper("upper case");
+  for (uint32_t u = 0; u <= 0xFFFF; ++u) {
+    const auto c = static_cast<UChar32>(u);
+    UChar32 expected = in(lowered, u) ? u_tolower(c) : c;
+    if (in(georgian, u)) expected = c + 0x30;
+    lower.check(u, lx::unicode_lower(static_cast<uint16_t>(u)), static_cast<uint32_t>(expected));
+    expected = in(raised, u) ? u_toupper(c) : c;
+    upper.check(u, lx::unicode_upper(static_cast<uint16_t>(u)), static_cast<uint32_t>(expected));
+  }
+}
+
+TEST(UnicodeOracle, Width) {
+  UErrorCode error = U_ZERO_ERROR;
+  const UNormalizer2* nfkc = unorm2_getNFKCInstance(&error);
+  ASSERT_TRUE(U_SUCCESS(error));
+  static uint32_t to_full[0x10000], to_half[0x10000];
+  for (uint32_t u = 0; u <= 0xFFFF; ++u) to_full[u] = to_half[u] = u;
+  for (uint32_t u = 0; u <= 0xFFFF; ++u) {
+    if (u == 0xFF5F || u == 0xFF60) continue;  // white parentheses: their other form came later
+    UChar other[4];
+    const int32_t type = value(u, UCHAR_DECOMPOSITION_TYPE);
+    if (type != U_DT_WIDE && type != U_DT_NARROW) continue;
+    ASSERT_EQ(unorm2_getRawDecomposition(nfkc, static_cast<UChar32>(u), other, 4, &error), 1);
+    to_full[type == U_DT_WIDE ? other[0] : u] = type == U_DT_WIDE ? u : other[0];
+    to_half[type == U_DT_WIDE ? u : other[0]] = type == U_DT_WIDE ? other[0] : u;
+  }
+  Differences half_to_full("half to full width"), full_to_half("full to half width");
+  for (uint32_t u = 0; u <= 0xFFFF; ++u) {
+    half_to_full.check(u, lx::unicode_half_to_full(static_cast<uint16_t>(u)), to_full[u]);
+    full_to_half.check(u, lx::unicode_full_to_half(static_cast<uint16_t>(u)), to_half[u]);
+  }
+}
+
+TEST(UnicodeOracle, Digits) {
+  Differences digits("digits");
+  for (uint32_t u = 0; u <= 0xFFFF; ++u) {
+    const auto number = static_cast<uint32_t>(u_getNumericValue(static_cast<UChar32>(u)));
+    digits.check(u, lx::unicode_digit(static_cast<uint16_t>(u)), is_mapped_digit(u) ? '0' + number : 0);
+  }
+}
+
+}  // namespace

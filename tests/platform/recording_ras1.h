@@ -1,0 +1,34 @@
+// A trace that keeps what it is told: linked in place of the standalone one, it lets a test read the events,
+// messages and dumps that the library issued.
+#pragma once
+
+#include <cstdint>
+#include <string>
+#include <vector>
+
+namespace lx::test {
+
+struct TraceRecord {
+  enum Kind { kEntry, kExitValue, kExit, kMessage, kDump };
+
+  Kind kind;
+  std::string unit;
+  int line;
+  uint32_t level;              // the level that was set when the record was made
+  intptr_t value;              // kExitValue
+  std::string text;            // kMessage: as formatted; kDump: the label
+  std::string format;          // kMessage: before formatting
+  std::vector<uint8_t> bytes;  // kDump
+};
+
+/// The one trace of the process; safe to use from every thread.
+class RecordingTrace {
+ public:
+  /// Sets the level of all units (sum of the RAS1_LEVEL bits; 0, as at the start: trace nothing).
+  static void set_level(uint32_t level);
+
+  /// Returns the records in the order in which they were made, and forgets them.
+  static std::vector<TraceRecord> take();
+};
+
+}  // namespace lx::test
