@@ -1,0 +1,78 @@
+// Any bytes as the data file of a codepage: refused, or every function is safe with it.
+#include <cstring>
+#include <vector>
+
+#include "core/lxbytes.h"
+#include "core/lxformat.h"
+#include "lx.h"
+#include "scratch.h"
+
+namespace {
+
+namespace format = lx::format;
+
+constexpr uint16_t kId = 819;
+
+/// The control file: one codepage, so that the language and territory are the built-in ones.
+std::vector<uint8_t> control() {
+  std::vector<uint8_t> file(format::kHeaderBytes + 3 * format::kRecordBytes);
+  lx::put_le32(file.data(), format::kMagic);
+  lx::put_le16(file.data() + format::kHeaderSections, 1);
+  lx::put_le16(file.data() + format::header_section_size(0), 3 * format::kRecordBytes);
+  lx::put_le32(file.data() + format::header_section_offset(0), format::kHeaderBytes);
+  const char* names[] = {"English", "UnitedStates", "Fuzz"};
+  for (uint8_t type = 0; type < 3; ++type) {
+    uint8_t* record = file.data() + format::kHeaderBytes + type * format::kRecordBytes;
+    lx::put_le16(record + format::kRecordId, type == LX_CODEPAGE ? kId : 1);
+    record[format::kRecordType] = type;
+    strcpy(reinterpret_cast<char*>(record) + format::kRecordName, names[type]);
+  }
+  return file;
+}
+
+/// Every pair of bytes and every Unicode value, through the forms.
+void exercise(LXLocale* locale) {
+  static LXUChar units[0x10000];
+  static char bytes[0x10000 * 5 + 8];
+  for (unsigned first = 0; first < 0x100; ++first) {
+    char text[256 * 4];
+    for (unsigned i = 0; i < 256; ++i) {
+      text[4 * i] = static_cast<char>(first);
+      text[4 * i + 1] = static_cast<char>(i);
+      text[4 * i + 2] = static_cast<char>(i + first);
+      text[4 * i + 3] = static_cast<char>(i ^ first);
+    }
+    LXStringToUnicode(units, 0x10000, locale, text, sizeof(text), 0);
+    LXStringToUnicodeEx(units, 0x10000, locale, text, LX_SHIFT_DOUBLE, sizeof(text), 0);
+    LXNumChars(locale, text, sizeof(text));
+    LXNumCharsEx(locale, text, LX_SHIFT_DOUBLE, sizeof(text));
+    for (unsigned i = 0; i < 200; ++i) {
+      LXGetCharType(locale, text + i, LX_CTYPE1);
+      LXGetCharTypeEx(locale, text + i, LX_SHIFT_DOUBLE, LX_CTYPE2);
+      LXGetCharTypeW(locale, first << 24 | i << 16 | i << 8 | first, LX_CTYPE3);
+    }
+  }
+  for (unsigned u = 0; u < 0x10000; ++u) units[u] = static_cast<LXUChar>(u);
+  LXUnicodeToString(locale, bytes, sizeof(bytes), units, 0x10000, LX_TERMINATE);
+  LXUnicodeToStringEx(locale, bytes, LX_SHIFT_SINGLE, sizeof(bytes), units, 0x10000, LX_TERMINATE);
+  static LXWChar codes[0x10000];
+  LXUnicodeToStringW(locale, codes, 0x10000, units, 0x10000, 0);
+  LXStringToUnicodeW(units, 0x10000, locale, codes, 0x10000, 0);
+}
+
+}  // namespace
+
+extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
+  static const fuzz::Scratch scratch;
+  static const std::vector<uint8_t> control_file = control();
+  scratch.write("control.nls", control_file.data(), control_file.size());
+  scratch.write("cp_00819.nls", data, size);
+  if (LXInit(scratch.path().c_str(), nullptr, nullptr, nullptr, 0) != LX_OK) abort();
+  int32_t rc = LX_OK;
+  LXLocale* locale = LXGetLocale("English_UnitedStates.Fuzz", 0, &rc);
+  if (locale == nullptr) abort();  // the built-in codepage takes the place of one that is refused
+  exercise(locale);
+  LXReleaseLocale(locale);
+  if (LXTerm() != LX_OK) abort();
+  return 0;
+}

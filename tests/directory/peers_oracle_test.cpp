@@ -1,0 +1,330 @@
+// Every shipped codepage against ICU's converter of the same name in the source, and against iconv where glibc
+// has the charset: all characters of up to four bytes, and all 65,536 Unicode values. What differs is counted
+// by codepage, direction and kind, and must be what peer_differences.txt lists, each line with its reason.
+//
+// LEXICOR_WRITE_DIFFERENCES=FILE writes the lines that the test found, without reasons.
+#include <gtest/gtest.h>
+#include <iconv.h>
+#include <unicode/ucnv.h>
+
+#include <cstdlib>
+#include <fstream>
+#include <functional>
+#include <map>
+#include <memory>
+#include <set>
+#include <sstream>
+#include <string>
+#include <vector>
+
+#include "directory/directory_codepages.h"
+#include "support/library.h"
+
+namespace lx::test {
+namespace {
+
+constexpr uint32_t kNone = 0xFFFFFFFF;
+
+/// A converter, character by character: kNone and an empty text where there is no mapping.
+class Peer {
+ public:
+  virtual ~Peer() = default;
+  virtual uint32_t to_unicode(const std::string& text) = 0;
+  virtual std::string from_unicode(uint16_t u) = 0;
+};
+
+class IcuPeer : public Peer {
+ public:
+  explicit IcuPeer(const std::string& name) {
+    UErrorCode status = U_ZERO_ERROR;
+    converter_.reset(ucnv_open(name.c_str(), &status));
+    if (U_FAILURE(status)) return;
+    ucnv_setFallback(converter_.get(), 1);
+    ucnv_setToUCallBack(converter_.get(), UCNV_TO_U_CALLBACK_STOP, nullptr, nullptr, nullptr, &status);
+    ucnv_setFromUCallBack(converter_.get(), UCNV_FROM_U_CALLBACK_STOP, nullptr, nullptr, nullptr, &status);
+  }
+  bool usable() const { return converter_ != nullptr; }
+
+  uint32_t to_unicode(const std::string& text) override {
+    UErrorCode status = U_ZERO_ERROR;
+    UChar units[8];
+    ucnv_resetToUnicode(converter_.get());
+    const int32_t n =
+        ucnv_toUChars(converter_.get(), units, 8, text.data(), static_cast<int32_t>(text.size()), &status);
+    if (U_FAILURE(status) || n == 0) return kNone;
+    return n == 1 && units[0] != 0xFFFD ? units[0] : kNone;
+  }
+
+  std::string from_unicode(uint16_t u) override {
+    UErrorCode status = U_ZERO_ERROR;
+    char bytes[16];
+    const UChar unit = u;
+    ucnv_resetFromUnicode(converter_.get());
+    const int32_t n = ucnv_fromUChars(converter_.get(), bytes, sizeof(bytes), &unit, 1, &status);
+    return U_SUCCESS(status) ? std::string(bytes, static_cast<size_t>(n)) : std::string();
+  }
+
+ private:
+  struct Closer {
+    void operator()(UConverter* converter) const { ucnv_close(converter); }
+  };
+  std::unique_ptr<UConverter, Closer> converter_;
+};
+
+class IconvPeer : public Peer {
+ public:
+  explicit IconvPeer(const std::string& name)
+      : to_(iconv_open("UCS-2LE", name.c_str())), from_(iconv_open(name.c_str(), "UCS-2LE")) {}
+  ~IconvPeer() override {
+    if (to_ != kBad) iconv_close(to_);
+    if (from_ != kBad) iconv_close(from_);
+  }
+  bool usable() const { return to_ != kBad && from_ != kBad; }
+
+  uint32_t to_unicode(const std::string& text) override {
+    const std::string units = run(to_, text);
+    if (units.size() != 2) return kNone;
+    const uint32_t u = static_cast<uint8_t>(units[0]) | static_cast<uint32_t>(static_cast<uint8_t>(units[1]))
+                                                            << 8;
+    return u != 0xFFFD ? u : kNone;
+  }
+  std::string from_unicode(uint16_t u) override {
+    return run(from_, {static_cast<char>(u), static_cast<char>(u >> 8)});
+  }
+
+ private:
+  static inline const iconv_t kBad = reinterpret_cast<iconv_t>(-1);
+
+  static std::string run(iconv_t converter, std::string text) {
+    char out[32];
+    char* in_pointer = text.data();
+    char* out_pointer = out;
+    size_t in_left = text.size();
+    size_t out_left = sizeof(out);
+    iconv(converter, nullptr, nullptr, nullptr, nullptr);
+    if (iconv(converter, &in_pointer, &in_left, &out_pointer, &out_left) != 0 || in_left != 0) return {};
+    iconv(converter, nullptr, nullptr, &out_pointer, &out_left);
+    return std::string(out, out_pointer);
+  }
+
+  iconv_t to_;
+  iconv_t from_;
+};
+
+/// The library's own conversion, in the same shape.
+class Library16 : public Peer {
+ public:
+  explicit Library16(const ShippedCodepage& codepage)
+      : locale_(locale_with(codepage.source.name)),
+        substitution_(1, static_cast<char>(codepage.source.substitution)) {
+    if (codepage.source.utf8) substitutes_for_.insert(codepage.source.substitution);
+    for (const lexicor_data::Mapping& mapping : codepage.source.mappings)
+      if (mapping.precision != 3 && mapping.bytes == 1 && mapping.code == codepage.source.substitution)
+        substitutes_for_.insert(mapping.unicode);
+  }
+
+  uint32_t to_unicode(const std::string& text) override {
+    LXUChar units[8];
+    const int32_t n = LXStringToUnicodeEx(units, 8, locale_.get(), text.data(), LX_SHIFT_SINGLE,
+                                          static_cast<int32_t>(text.size()), 0);
+    return n == 1 && units[0] != 0xFFFD ? units[0] : kNone;
+  }
+  std::string from_unicode(uint16_t u) override {
+    char bytes[16];
+    const int32_t n =
+        LXUnicodeToStringEx(locale_.get(), bytes, LX_SHIFT_SINGLE, sizeof(bytes), &u, 1, LX_TERMINATE);
+    std::string text(bytes, static_cast<size_t>(n) - 1);
+    return text == substitution_ && substitutes_for_.count(u) == 0 ? std::string() : text;
+  }
+
+ private:
+  LocalePtr locale_;
+  std::string substitution_;
+  std::set<uint32_t> substitutes_for_;
+};
+
+bool is_private(uint32_t u) {
+  return u >= 0xE000 && u <= 0xF8FF;
+}
+
+std::string hex_of(const std::string& text) {
+  std::string hex;
+  char digits[3];
+  for (char c : text) {
+    snprintf(digits, sizeof(digits), "%02X", static_cast<uint8_t>(c));
+    hex += digits;
+  }
+  return hex.empty() ? "none" : hex;
+}
+
+std::string hex_of(uint32_t u) {
+  char digits[12];
+  snprintf(digits, sizeof(digits), "U+%04X", u);
+  return u == kNone ? "none" : digits;
+}
+
+/// Counts of differences by "peer codepage direction kind", with examples of each.
+class Differences {
+ public:
+  static constexpr size_t kExamples = 6;
+
+  template <class Value>
+  void add(const std::string& line, const std::string& character, const Value& ours, const Value& theirs) {
+    Group& group = groups_[line];
+    if (group.count++ < kExamples) group.examples += " " + character + ":" + hex_of(ours) + "/" + hex_of(theirs);
+  }
+  struct Group {
+    size_t count = 0;
+    std::string examples;  // "character:ours/theirs"
+  };
+  const std::map<std::string, Group>& groups() const { return groups_; }
+
+ private:
+  std::map<std::string, Group> groups_;
+};
+
+/// Calls `visit(text)` for every character that the codepage's bytes can form: the first bytes of longer
+/// characters with all second bytes, and of those that are longer still the ones that the source maps.
+void for_each_text(const ShippedCodepage& codepage, const std::function<void(const std::string&)>& visit) {
+  const auto byte = [](uint32_t b) { return static_cast<char>(b); };
+  for (uint32_t b = 0; b <= 0xFF; ++b) {
+    const bool shift_byte = codepage.shift() && (b == lexicor_data::kShiftOut || b == lexicor_data::kShiftIn);
+    if (codepage.source.leads[b] == 1 && !shift_byte) visit(std::string(1, byte(b)));
+    const bool leads = codepage.shift() ? b >= 0x40 && b <= 0xFE : codepage.source.leads[b] == 2;
+    if (!leads) continue;
+    for (uint32_t c = codepage.shift() ? 0x40 : 0; c <= 0xFF; ++c) visit(text_of_code(codepage, b << 8 | c, 2));
+  }
+  for (const lexicor_data::Mapping& mapping : codepage.source.mappings)
+    if (mapping.bytes > 2 && mapping.precision != 1 && mapping.unicode <= 0xFFFF)
+      visit(text_of_code(codepage, mapping.code, mapping.bytes));
+}
+
+void compare(const ShippedCodepage& codepage, const std::string& peer_name, Peer& peer,
+             Differences* differences) {
+  Library16 library(codepage);
+  const std::string head = peer_name + " " + codepage.source.name + " ";
+  for_each_text(codepage, [&](const std::string& text) {
+    const uint32_t ours = library.to_unicode(text);
+    const uint32_t theirs = peer.to_unicode(text);
+    if (ours == theirs) return;
+    const char* kind = is_private(ours) || is_private(theirs) ? "private-use"
+                       : ours == kNone                        ? "only-theirs"
+                       : theirs == kNone                      ? "only-ours"
+                                                              : "other-value";
+    differences->add(head + "to-unicode " + kind, hex_of(text), ours, theirs);
+  });
+  for (uint32_t u = 0; u <= 0xFFFF; ++u) {
+    if (u >= 0xD800 && u <= 0xDFFF) continue;
+    const std::string ours = library.from_unicode(static_cast<uint16_t>(u));
+    const std::string theirs = peer.from_unicode(static_cast<uint16_t>(u));
+    if (ours == theirs) continue;
+    const char* kind = is_private(u)    ? "private-use"
+                       : ours.empty()   ? "only-theirs"
+                       : theirs.empty() ? "only-ours"
+                                        : "other-bytes";
+    differences->add(head + "from-unicode " + kind, hex_of(u), ours, theirs);
+  }
+}
+
+/// ICU's converter that a source was taken from: "ICU 72.1 NAME; ...".
+std::string icu_name(const ShippedCodepage& codepage) {
+  std::istringstream words(codepage.source.source);
+  std::string icu, version, name;
+  words >> icu >> version >> name;
+  while (!name.empty() && name.back() == ';') name.pop_back();
+  return icu == "ICU" ? name : std::string();
+}
+
+/// glibc's charset for a codepage: the IBM ones by number, the others by their customary names.
+std::string iconv_name(const ShippedCodepage& codepage) {
+  static const std::map<std::string, std::string> names = {
+      {"US-ASCII", "ANSI_X3.4-1968"},
+      {"Latin1", "ISO-8859-1"},
+      {"MS874", "CP874"},
+      {"MS932", "CP932"},
+      {"MS936", "CP936"},
+      {"MS949", "UHC"},
+      {"MS950", "BIG5"},
+      {"JapanEUC", "EUC-JP"},
+      {"EUC-TW", "EUC-TW"},
+      {"EUC-KR", "EUC-KR"},
+      {"EUC-CN", "EUC-CN"},
+      {"Big5-HKSCS", "BIG5-HKSCS"},
+      {"KOI8-R", "KOI8-R"},
+      {"KOI8-U", "KOI8-U"},
+      {"TIS-620", "TIS-620"},
+      {"UTF-8", "UTF-8"},
+  };
+  const std::string& name = codepage.source.name;
+  const auto known = names.find(name);
+  if (known != names.end()) return known->second;
+  if (name.rfind("ISO-8859-", 0) == 0 || name.rfind("IBM", 0) == 0) return name;
+  if (name.rfind("MS", 0) == 0) return "CP" + name.substr(2);
+  return {};
+}
+
+/// peer_differences.txt: "peer codepage direction kind count reason...", '#' comments.
+std::map<std::string, size_t> expected_differences(const std::string& peer) {
+  std::map<std::string, size_t> expected;
+  std::ifstream in(LEXICOR_PEER_DIFFERENCES);
+  EXPECT_TRUE(in) << LEXICOR_PEER_DIFFERENCES;
+  std::string line;
+  while (std::getline(in, line)) {
+    std::istringstream words(line);
+    std::string name, codepage, direction, kind, reason;
+    size_t count = 0;
+    if (line.empty() || line[0] == '#' || !(words >> name >> codepage >> direction >> kind >> count)) continue;
+    EXPECT_TRUE(words >> reason) << "no reason: " << line;
+    if (name == peer) expected[name + " " + codepage + " " + direction + " " + kind] = count;
+  }
+  return expected;
+}
+
+void expect_listed(const std::string& peer, const Differences& differences) {
+  if (const char* file = getenv("LEXICOR_WRITE_DIFFERENCES")) {
+    std::ofstream out(file, std::ios::app);
+    for (const auto& [line, group] : differences.groups())
+      out << line << ' ' << group.count << " #" << group.examples << '\n';
+  }
+  std::map<std::string, size_t> expected = expected_differences(peer);
+  for (const auto& [line, group] : differences.groups()) {
+    EXPECT_EQ(group.count, expected[line]) << line << ", for example" << group.examples;
+    expected.erase(line);
+  }
+  for (const auto& [line, count] : expected) ADD_FAILURE() << "listed and not found: " << line << " " << count;
+}
+
+TEST(Peers, CodepagesConvertAsInIcu) {
+  const Library library(LEXICOR_LOCALE_DIR);
+  Differences differences;
+  size_t compared = 0;
+  for (const ShippedCodepage& codepage : shipped_codepages()) {
+    const std::string name = codepage.source.utf8 ? "UTF-8" : icu_name(codepage);
+    if (name.empty()) continue;  // taken from glibc
+    IcuPeer peer(name);
+    ASSERT_TRUE(peer.usable()) << codepage.source.name << ": no converter " << name;
+    compare(codepage, "icu", peer, &differences);
+    ++compared;
+  }
+  EXPECT_GE(compared, 140u);
+  expect_listed("icu", differences);
+}
+
+TEST(Peers, CodepagesConvertAsInIconv) {
+  const Library library(LEXICOR_LOCALE_DIR);
+  Differences differences;
+  size_t compared = 0;
+  for (const ShippedCodepage& codepage : shipped_codepages()) {
+    const std::string name = iconv_name(codepage);
+    if (name.empty()) continue;
+    IconvPeer peer(name);
+    if (!peer.usable()) continue;
+    compare(codepage, "iconv", peer, &differences);
+    ++compared;
+  }
+  EXPECT_GE(compared, 90u) << "glibc has fewer charsets than when this was written";
+  expect_listed("iconv", differences);
+}
+
+}  // namespace
+}  // namespace lx::test

@@ -1,0 +1,39 @@
+// A codepage's source from another system's converter.
+//
+// The mapping is enumerated both ways: from every sequence of bytes that the converter takes for one character,
+// and from every code point up to U+10FFFF, fallbacks allowed. A pair found both ways has precision |0, one
+// found only from Unicode |1, one found only to Unicode |3. Which bytes lead, and how long their characters
+// are, is seen on what the converter calls cut.
+//
+// Left out, and counted: sequences of bytes that mean several code points, shift bytes, and codes whose length
+// does not agree with their lead.
+//
+// Line ends: byte 1 is the code of line feed and byte 2 that of carriage return. In an ASCII-based codepage
+// bytes 3 and 4 repeat the line feed, 0A 0D 0A 0A. In EBCDIC byte 3 is the code of the next-line control, which
+// its text files are made of: 25 0D 15 25.
+//
+// The substitution is the converter's own where it is one byte, else "?" of the codepage's family, 3F or 6F.
+//
+// Controls: tables of the DOS family put U+001A, U+001C and U+007F at each other's bytes, after the controls of
+// a terminal. In every ASCII-based source 00 to 1F and 7F stand for themselves, as in all other systems'
+// tables; the substitution moves along with its character.
+//
+// Overrides, by words: "sub=HH" sets the substitution; "HH=XXXX" maps a byte and a code point to each other and
+// to nothing else; "HH=none" takes the byte's mappings out; "XXXX>HH.." maps a code point one way to a code;
+// "HH-HH>HH" writes characters by their codes that begin with the last byte instead of those in the range.
+#pragma once
+
+#include <map>
+#include <string>
+
+#include "converter.h"
+#include "ucm.h"
+
+namespace lexicor_import {
+
+using Counts = std::map<std::string, size_t>;  ///< by reason
+
+/// Imports one codepage. Throws std::runtime_error when the converter cannot be brought into the source's form.
+lexicor_data::CodepageSource import_codepage(const Codepage& codepage, Counts& left_out);
+
+}  // namespace lexicor_import

@@ -1,0 +1,115 @@
+// lexicor-data: compiles the sources of a locale directory, dumps objects as sources, and checks directories.
+// Exit codes: 0 done, 1 an error in the data, 2 a wrong command line.
+#include <CLI/CLI.hpp>
+#include <cstdio>
+#include <exception>
+#include <filesystem>
+#include <fstream>
+#include <iostream>
+#include <string>
+
+#include "check.h"
+#include "compile.h"
+#include "control_source.h"
+#include "core/lxformat.h"
+#include "ucm.h"
+
+namespace {
+
+using namespace lexicor_data;
+namespace fs = std::filesystem;
+
+constexpr int kDone = 0, kDataError = 1, kUsageError = 2;
+
+Control read_control_file(const std::string& path) {
+  return unpack_control(read_object(read_file(path), path).sections[0], path);
+}
+
+/// The type and identifier that an object's file name says; a SourceError when it says nothing.
+ObjectName parse_object_file_name(const std::string& path) {
+  const std::string file = fs::path(path).filename().string();
+  for (size_t type = 0; type < lx::format::kTypes; ++type) {
+    unsigned id = 0;
+    int end = 0;
+    const std::string pattern =
+        std::string(lx::format::kTypePrefix[type]) + "_%5u" + lx::format::kDataExtension + "%n";
+    if (std::sscanf(file.c_str(), pattern.c_str(), &id, &end) != 1 || static_cast<size_t>(end) != file.size())
+      continue;
+    if (id > 65535) continue;
+    return {static_cast<ObjectType>(type), static_cast<uint16_t>(id), fs::path(path).stem().string(), 0};
+  }
+  throw SourceError(path, 0, 0, "the file name is not that of an object, such as cp_00819.nls");
+}
+
+/// Prints the source of an object, or of the control file. Names come from the given control file, else from
+/// the one beside the object, else the file's own name stands for the object's.
+void dump(const std::string& path, std::string control_file) {
+  if (fs::path(path).filename() == lx::format::kControlFile) {
+    write_control(std::cout, read_control_file(path));
+    return;
+  }
+  ObjectName name = parse_object_file_name(path);
+  const fs::path beside = fs::path(path).parent_path() / lx::format::kControlFile;
+  if (control_file.empty() && fs::exists(beside)) control_file = beside.string();
+  Control control;
+  if (!control_file.empty()) {
+    control = read_control_file(control_file);
+    const ObjectName* listed = control.find(name.type, name.id);
+    if (listed != nullptr) name = *listed;
+  }
+  const ObjectFile object = read_object(read_file(path), path);
+  std::cout << dump_object(object, name, control_file.empty() ? nullptr : &control, path);
+}
+
+int check(const std::string& directory) {
+  const bool compiled = fs::exists(fs::path(directory) / lx::format::kControlFile);
+  const bool source = fs::exists(fs::path(directory) / "control.txt");
+  if (!compiled && !source) throw SourceError(directory, 0, 0, "holds neither control.nls nor control.txt");
+  std::vector<std::string> faults;
+  if (compiled) faults = check_compiled_directory(directory);
+  if (source) {
+    for (const std::string& fault : check_source_directory(directory)) faults.push_back(fault);
+  }
+  for (const std::string& fault : faults) std::cerr << fault << '\n';
+  return faults.empty() ? kDone : kDataError;
+}
+
+}  // namespace
+
+int main(int argc, char** argv) {
+  CLI::App app("Compiles, dumps and checks Lexicor locale data.");
+  app.require_subcommand(1);
+  std::string source, out, file, control_file, directory;
+  CompileOptions options;
+
+  CLI::App* compile_command =
+      app.add_subcommand("compile", "Compile a source directory into a locale directory");
+  compile_command->add_option("SRC", source, "the directory with control.txt")->required();
+  compile_command->add_option("OUT", out, "the locale directory")->required();
+  compile_command->add_flag("--verbose", options.verbose, "list section sizes and each character left out");
+  compile_command->add_option("--report", options.report_file, "a file for the list of characters left out");
+
+  CLI::App* dump_command = app.add_subcommand("dump", "Print the source of an object or of a control file");
+  dump_command->add_option("FILE", file, "an object, such as cp_00819.nls, or control.nls")->required();
+  dump_command->add_option("--control", control_file, "the control file that names objects");
+
+  CLI::App* check_command = app.add_subcommand("check", "Check a compiled or a source directory");
+  check_command->add_option("DIR", directory, "the directory")->required();
+
+  try {
+    app.parse(argc, argv);
+  } catch (const CLI::ParseError& error) {
+    return app.exit(error) == 0 ? kDone : kUsageError;
+  }
+  try {
+    if (*compile_command) compile_directory(source, out, options, std::cerr);
+    if (*dump_command) dump(file, control_file);
+    if (*check_command) return check(directory);
+    std::cout.flush();
+    if (!std::cout) throw SourceError("standard output", 0, 0, "cannot be written");
+  } catch (const std::exception& error) {
+    std::cerr << error.what() << '\n';
+    return kDataError;
+  }
+  return kDone;
+}

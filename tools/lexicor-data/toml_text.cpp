@@ -1,0 +1,169 @@
+// Reading and writing of TOML values; texts are UTF-8 in the file and 16-bit units in memory.
+#include "toml_text.h"
+
+#include <cstdio>
+#include <istream>
+#include <iterator>
+
+#include "ucm.h"
+
+namespace lexicor_data {
+namespace {
+
+/// UTF-8 that the TOML parser has checked, as 16-bit units.
+std::u16string to_units(const std::string& text) {
+  std::u16string units;
+  for (size_t i = 0; i < text.size();) {
+    const auto lead = static_cast<uint8_t>(text[i]);
+    const size_t length = lead < 0x80 ? 1 : lead < 0xE0 ? 2 : lead < 0xF0 ? 3 : 4;
+    uint32_t value = length == 1 ? lead : lead & (0x7F >> length);
+    for (size_t k = 1; k < length; ++k) value = value << 6 | (static_cast<uint8_t>(text.at(i + k)) & 0x3F);
+    i += length;
+    if (value > 0xFFFF) {
+      units.push_back(static_cast<char16_t>(0xD7C0 + (value >> 10)));
+      units.push_back(static_cast<char16_t>(0xDC00 | (value & 0x3FF)));
+    } else {
+      units.push_back(static_cast<char16_t>(value));
+    }
+  }
+  return units;
+}
+
+void append_utf8(std::string& out, uint32_t value) {
+  if (value < 0x80) {
+    out += static_cast<char>(value);
+    return;
+  }
+  const int trails = value < 0x800 ? 1 : value < 0x10000 ? 2 : 3;
+  out += static_cast<char>((0xFF00 >> (trails + 1) & 0xFF) | value >> (6 * trails));
+  for (int i = trails - 1; i >= 0; --i) out += static_cast<char>(0x80 | (value >> (6 * i) & 0x3F));
+}
+
+bool is_high_surrogate(uint32_t unit) {
+  return unit >= 0xD800 && unit <= 0xDBFF;
+}
+bool is_low_surrogate(uint32_t unit) {
+  return unit >= 0xDC00 && unit <= 0xDFFF;
+}
+
+}  // namespace
+
+void TomlTable::fail(const toml::node& at, const std::string& what) const {
+  throw SourceError(file_name_, static_cast<int>(at.source().begin.line),
+                    static_cast<int>(at.source().begin.column), what);
+}
+
+const toml::node& TomlTable::node(const std::string& key) {
+  asked_.insert(key);
+  const toml::node* found = table_.get(key);
+  if (found == nullptr) fail(table_, "the key " + key + " is missing");
+  return *found;
+}
+
+std::u16string TomlTable::text_of(const toml::node& node) const {
+  if (!node.is_string()) fail(node, "expected a text");
+  const std::u16string units = to_units(node.as_string()->get());
+  if (units.find(u'\0') != std::u16string::npos) fail(node, "a text cannot hold U+0000");
+  return units;
+}
+
+std::u16string TomlTable::text(const std::string& key) {
+  return text_of(node(key));
+}
+
+char16_t TomlTable::character(const std::string& key) {
+  const toml::node& at = node(key);
+  const std::u16string units = text_of(at);
+  if (units.size() != 1) fail(at, "expected one character up to U+FFFF");
+  return units[0];
+}
+
+uint16_t TomlTable::number(const std::string& key, int64_t highest) {
+  const toml::node& at = node(key);
+  const auto value = at.is_integer() ? at.as_integer()->get() : -1;
+  if (value < 0 || value > highest) fail(at, "expected a number from 0 to " + std::to_string(highest));
+  return static_cast<uint16_t>(value);
+}
+
+bool TomlTable::flag(const std::string& key) {
+  const toml::node& at = node(key);
+  if (!at.is_boolean()) fail(at, "expected true or false");
+  return at.as_boolean()->get();
+}
+
+std::vector<std::u16string> TomlTable::texts(const std::string& key, size_t fewest, size_t most) {
+  const toml::node& at = node(key);
+  const toml::array* list = at.as_array();
+  if (list == nullptr || list->size() < fewest || list->size() > most) {
+    fail(at, "expected a list of " + std::to_string(fewest) +
+                 (most == fewest ? "" : " to " + std::to_string(most)) + " texts");
+  }
+  std::vector<std::u16string> texts;
+  for (const toml::node& item : *list) texts.push_back(text_of(item));
+  return texts;
+}
+
+TomlTable TomlTable::table(const std::string& key) {
+  const toml::node& at = node(key);
+  if (!at.is_table()) fail(at, "expected a table");
+  return TomlTable(*at.as_table(), file_name_);
+}
+
+std::vector<TomlTable> TomlTable::tables(const std::string& key) {
+  const toml::node& at = node(key);
+  const toml::array* list = at.as_array();
+  if (list == nullptr) fail(at, "expected a list of tables");
+  std::vector<TomlTable> tables;
+  for (const toml::node& item : *list) {
+    if (!item.is_table()) fail(item, "expected a table");
+    tables.emplace_back(*item.as_table(), file_name_);
+  }
+  return tables;
+}
+
+void TomlTable::finish() const {
+  for (const auto& [key, value] : table_) {
+    if (asked_.count(std::string(key.str())) == 0) fail(value, "unknown key " + std::string(key.str()));
+  }
+}
+
+toml::table parse_toml(std::istream& in, const std::string& file_name) {
+  const std::string text{std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>()};
+  try {
+    return toml::parse(text, file_name);
+  } catch (const toml::parse_error& error) {
+    throw SourceError(file_name, static_cast<int>(error.source().begin.line),
+                      static_cast<int>(error.source().begin.column), std::string(error.description()));
+  }
+}
+
+std::string toml_quote(const std::u16string& text) {
+  std::string out = "\"";
+  for (size_t i = 0; i < text.size(); ++i) {
+    uint32_t value = text[i];
+    if (is_high_surrogate(value) && i + 1 < text.size() && is_low_surrogate(text[i + 1])) {
+      value = ((value - 0xD7C0) << 10) | (text[++i] & 0x3FF);
+    }
+    if (value == '"' || value == '\\') {
+      out += '\\';
+      out += static_cast<char>(value);
+    } else if (value < 0x20 || (value >= 0x7F && value <= 0xA0) || (value >= 0x2000 && value <= 0x200F) ||
+               value == 0xFEFF) {
+      // Characters that an editor does not show.
+      char escape[8];
+      std::snprintf(escape, sizeof escape, "\\u%04X", static_cast<unsigned>(value));
+      out += escape;
+    } else {
+      append_utf8(out, value);
+    }
+  }
+  return out + '"';
+}
+
+std::string toml_list(const std::u16string* texts, size_t count) {
+  std::string out = "[";
+  for (size_t i = 0; i < count; ++i) out += (i == 0 ? "" : ", ") + toml_quote(texts[i]);
+  return out + "]";
+}
+
+}  // namespace lexicor_data

@@ -1,0 +1,105 @@
+// Reads the catalogue through the enumerating functions, and finds near names by edit distance.
+#include "catalogue.h"
+
+#include <lx.h>
+#include <strings.h>
+
+#include <algorithm>
+
+namespace lexicor_cli {
+
+namespace {
+
+int32_t add_object(void* user, int32_t type, const char* name) {
+  int32_t code = LX_OK;
+  const std::string text = name;
+  LXObject* object =
+      LXGetObjFromName(nullptr, type, name, static_cast<int32_t>(text.size()), LX_FIND_ONLY, &code);
+  const unsigned id = object != nullptr ? reinterpret_cast<const LXObjDisk*>(object)->id : 0;
+  static_cast<Catalogue*>(user)->objects.push_back({type, id, text});
+  return 1;
+}
+
+int32_t add_alias(void* user, const char* codepage, const char* alias) {
+  static_cast<Catalogue*>(user)->aliases.push_back({codepage, alias});
+  return 1;
+}
+
+char lower(char c) {
+  return c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c;
+}
+
+/// Levenshtein distance of two names, without regard to case.
+size_t edit_distance(const std::string& a, const std::string& b) {
+  std::vector<size_t> row(b.size() + 1);
+  for (size_t j = 0; j <= b.size(); ++j) row[j] = j;
+  for (size_t i = 1; i <= a.size(); ++i) {
+    size_t diagonal = row[0];
+    row[0] = i;
+    for (size_t j = 1; j <= b.size(); ++j) {
+      const size_t replaced = diagonal + (lower(a[i - 1]) != lower(b[j - 1]));
+      diagonal = row[j];
+      row[j] = std::min({replaced, row[j] + 1, row[j - 1] + 1});
+    }
+  }
+  return row[b.size()];
+}
+
+}  // namespace
+
+std::vector<std::string> Catalogue::aliases_of(const std::string& codepage) const {
+  std::vector<std::string> found;
+  for (const CatalogueAlias& row : aliases) {
+    if (same_name(row.codepage, codepage)) found.push_back(row.alias);
+  }
+  return found;
+}
+
+std::string Catalogue::first_name(int type) const {
+  for (const CatalogueObject& object : objects) {
+    if (object.type == type) return object.name;
+  }
+  return {};
+}
+
+Catalogue read_catalogue() {
+  Catalogue catalogue;
+  LXEnumLocales(add_object, &catalogue);
+  LXEnumAliases(nullptr, add_alias, &catalogue);
+  return catalogue;
+}
+
+bool same_name(const std::string& a, const std::string& b) {
+  return strcasecmp(a.c_str(), b.c_str()) == 0;
+}
+
+std::vector<std::string> nearest_codepages(const Catalogue& catalogue, const std::string& name, size_t limit) {
+  struct Near {
+    size_t distance;
+    std::string text;
+    std::string codepage;
+  };
+  std::vector<Near> found;
+  const size_t farthest = std::max<size_t>(2, name.size() / 3);
+  const auto consider = [&](const std::string& text, const std::string& codepage) {
+    const size_t distance = edit_distance(name, text);
+    if (distance <= farthest && distance < text.size()) found.push_back({distance, text, codepage});
+  };
+  for (const CatalogueObject& object : catalogue.objects) {
+    if (object.type == LX_CODEPAGE) consider(object.name, object.name);
+  }
+  for (const CatalogueAlias& row : catalogue.aliases) consider(row.alias, row.codepage);
+  // Names stand before aliases, so that of equally near ones a name comes first.
+  std::stable_sort(found.begin(), found.end(),
+                   [](const Near& a, const Near& b) { return a.distance < b.distance; });
+  std::vector<std::string> names, codepages;
+  for (const Near& near : found) {
+    if (names.size() == limit) break;
+    if (std::find(codepages.begin(), codepages.end(), near.codepage) != codepages.end()) continue;
+    codepages.push_back(near.codepage);
+    names.push_back(near.text);
+  }
+  return names;
+}
+
+}  // namespace lexicor_cli

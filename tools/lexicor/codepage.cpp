@@ -1,0 +1,87 @@
+// Looks codepages up by name, identifier and alias, and opens a locale on the one that is found.
+#include "codepage.h"
+
+#include <cctype>
+#include <cstdlib>
+
+namespace lexicor_cli {
+
+namespace {
+
+bool is_decimal(const std::string& text) {
+  if (text.empty() || text.size() > 9) return false;
+  for (const char c : text) {
+    if (std::isdigit(static_cast<unsigned char>(c)) == 0) return false;
+  }
+  return true;
+}
+
+/// The object name of a codepage, or an empty string. A name stands before an identifier, and that before an
+/// alias.
+std::string find_codepage(const Catalogue& catalogue, const std::string& text) {
+  for (const CatalogueObject& object : catalogue.objects) {
+    if (object.type == LX_CODEPAGE && same_name(object.name, text)) return object.name;
+  }
+  if (is_decimal(text)) {
+    const auto id = static_cast<unsigned>(std::strtoul(text.c_str(), nullptr, 10));
+    for (const CatalogueObject& object : catalogue.objects) {
+      if (object.type == LX_CODEPAGE && object.id == id) return object.name;
+    }
+  }
+  const char* name = LXGetCodepageFromAlias(nullptr, text.c_str());
+  return name != nullptr ? name : "";
+}
+
+[[noreturn]] void throw_unknown(const Session& session, const Catalogue& catalogue, const std::string& text) {
+  if (session.built_in_only())
+    throw Failure(kDataError, "codepage '" + text + "' is not there without a locale directory");
+  std::string message = "unknown codepage '" + text + "'";
+  const std::vector<std::string> near = nearest_codepages(catalogue, text, 3);
+  for (size_t i = 0; i < near.size(); ++i)
+    message += (i == 0 ? "; did you mean " : i + 1 < near.size() ? ", " : " or ") + near[i];
+  message += near.empty() ? "; 'lexicor list codepages' shows those there are" : "?";
+  throw Failure(kUsageError, message);
+}
+
+}  // namespace
+
+Codepage::Codepage(const Session& session, const Catalogue& catalogue, const std::string& name)
+    : name_(find_codepage(catalogue, name)) {
+  if (name_.empty()) throw_unknown(session, catalogue, name);
+  int32_t code = LX_OK;
+  const auto bytes = static_cast<int32_t>(name_.size());
+  object_ = LXGetObjFromName(nullptr, LX_CODEPAGE, name_.c_str(), bytes, LX_FIND_AND_LOAD, &code);
+  // With an error code the object holds US-ASCII in place of its own data.
+  if (object_ == nullptr || code != LX_OK)
+    throw Failure(kDataError, "codepage " + name_ + " cannot be loaded: " + describe_code(code));
+  id_ = reinterpret_cast<const LXObjDisk*>(object_)->id;
+  // Conversion looks at the locale's codepage only; any language and territory will do.
+  const std::string locale_name =
+      catalogue.first_name(LX_LANGUAGE) + "_" + catalogue.first_name(LX_TERRITORY) + "." + name_ + "@BINARY";
+  locale_ = LXGetLocale(locale_name.c_str(), 0, &code);
+  if (locale_ == nullptr) throw Failure(kDataError, "no locale " + locale_name + ": " + describe_code(code));
+  learn_shift_bytes();
+}
+
+Codepage::~Codepage() {
+  LXReleaseLocale(locale_);
+}
+
+void Codepage::learn_shift_bytes() {
+  // A character stored in the other state gets a shift byte before it, in shift-sensitive codepages only.
+  char out[8] = {}, in[8] = {};
+  LXPutCharEx(locale_, out, LX_SHIFT_SINGLE, 0x4141);
+  LXPutCharEx(locale_, in, LX_SHIFT_DOUBLE, 0x41);
+  shift_sensitive_ = in[1] != 0;
+  if (!shift_sensitive_) return;
+  shift_out_ = out[0];
+  shift_in_ = in[0];
+  double_bytes_ = LXByteLengthEx(locale_, "\x41", LX_SHIFT_DOUBLE);
+}
+
+int32_t Codepage::char_bytes(const char* text, LXShiftState state) const {
+  if (shift_sensitive_) return state == LX_SHIFT_DOUBLE ? double_bytes_ : 1;
+  return LXByteLength(locale_, text);
+}
+
+}  // namespace lexicor_cli

@@ -1,0 +1,52 @@
+// A codepage that the user named, with a locale on it and what the public functions tell about its shift bytes.
+#pragma once
+
+#include <lx.h>
+
+#include <cstdint>
+#include <string>
+
+#include "catalogue.h"
+#include "session.h"
+
+namespace lexicor_cli {
+
+class Codepage {
+ public:
+  /// `name` is an object name, a decimal identifier or an alias, in any letter case. Throws a Failure that
+  /// names the nearest codepages when there is none, or that says why its file could not be loaded.
+  Codepage(const Session& session, const Catalogue& catalogue, const std::string& name);
+  ~Codepage();
+  Codepage(const Codepage&) = delete;
+  Codepage& operator=(const Codepage&) = delete;
+
+  LXLocale* locale() const { return locale_; }
+  const LXObject* object() const { return object_; }
+  const std::string& name() const { return name_; }
+  bool utf8() const { return id_ == kUtf8Id; }
+
+  bool shift_sensitive() const { return shift_sensitive_; }
+  /// Whether a byte is Shift-Out or Shift-In.
+  bool is_shift(char byte) const { return shift_sensitive_ && (byte == shift_out_ || byte == shift_in_); }
+  LXShiftState state_after(char shift_byte) const {
+    return shift_byte == shift_out_ ? LX_SHIFT_DOUBLE : LX_SHIFT_SINGLE;
+  }
+  /// Bytes of the character at `text`, which is no shift byte.
+  int32_t char_bytes(const char* text, LXShiftState state) const;
+
+ private:
+  static constexpr unsigned kUtf8Id = 57352;
+
+  void learn_shift_bytes();
+
+  std::string name_;
+  unsigned id_ = 0;
+  const LXObject* object_ = nullptr;
+  LXLocale* locale_ = nullptr;
+  bool shift_sensitive_ = false;
+  char shift_out_ = 0;
+  char shift_in_ = 0;
+  int32_t double_bytes_ = 1;  // of a character in the double-byte state
+};
+
+}  // namespace lexicor_cli

@@ -1,0 +1,74 @@
+#!/bin/bash
+# The conversion part of the demo: converts each sample to the codepages that its language lives in, and back, and
+# compares byte for byte. Argument: the build directory. Exit 1 when any text comes back different.
+set -u
+here=$(cd "$(dirname "${BASH_SOURCE[0]}")" && pwd)
+build=${1:?usage: demo.sh BUILD_DIR}
+lexicor=$build/bin/lexicor
+samples=$here/../../data/samples
+work=$(mktemp -d) || exit 1
+trap 'rm -rf "$work"' EXIT
+# Text is cut and padded by what it takes on the screen: wide characters two columns, combining ones none.
+export LC_ALL=C.UTF-8
+
+good= bad= plain=
+if [ -t 1 ] && [ -z "${NO_COLOR:-}" ]; then
+  good=$'\033[32m' bad=$'\033[1;31m' plain=$'\033[0m'
+fi
+
+columns() { printf '%s\n' "$1" | wc -L; }
+
+# fit TEXT WIDTH: as much of the text as fits, padded.
+fit() {
+  local text=${1:0:$((2 * $2))} width
+  width=$(columns "$text")
+  while [ "$width" -gt "$2" ]; do
+    # Half of what is too much is safe to take off at once: no character takes more than two columns.
+    text=${text:0:$((${#text} - (width - $2 + 1) / 2))}
+    width=$(columns "$text")
+  done
+  printf '%s%*s' "$text" $(($2 - width)) ''
+}
+
+total=0 failed=0
+# trip LANGUAGE SAMPLE CODEPAGE...: one line for each codepage.
+trip() {
+  local language=$1 sample=$samples/$2 codepage there=$work/there back=$work/back hex text verdict
+  shift 2
+  for codepage in "$@"; do
+    total=$((total + 1))
+    rm -f "$there" "$back"
+    if "$lexicor" convert --from UTF-8 --to "$codepage" --strict -o "$there" "$sample" &&
+      "$lexicor" convert --from "$codepage" --to UTF-8 --strict -o "$back" "$there" &&
+      cmp -s "$sample" "$back"; then
+      verdict=${good}OK$plain
+    else
+      failed=$((failed + 1))
+      verdict=${bad}DIFFERENT$plain
+    fi
+    touch "$there" "$back"
+    hex=$(head -c 8 "$there" | od -An -tx1 | tr -d '\n' | tr a-f A-F)
+    IFS= read -r text <"$back" || true
+    printf '%-20s  %-10s  %4d >%4d  %-24s  %s  %s\n' "$language" "$codepage" \
+      "$(stat -c %s "$sample")" "$(stat -c %s "$there")" "$hex" "$(fit "$text" 25)" "$verdict"
+  done
+}
+
+printf '%-20s  %-10s  %-10s   %-23s  %s\n' 'Text' 'Codepage' 'UTF-8 > CP' 'First bytes' 'Read back'
+trip 'Japanese' japanese.txt MS932 JapanEUC IBM930 IBM939
+trip 'Chinese, simplified' chinese-simplified.txt MS936 IBM935
+trip 'Chinese, traditional' chinese-traditional.txt MS950 EUC-TW IBM937
+trip 'Korean' korean.txt MS949 IBM933
+trip 'Greek' greek.txt ISO-8859-7
+trip 'Russian' russian.txt MS1251 KOI8-R IBM1025
+trip 'Hebrew' hebrew.txt ISO-8859-8 MS1255
+trip 'Thai' thai.txt MS874
+trip 'Czech' czech.txt ISO-8859-2 IBM870
+trip 'German' german.txt IBM273 IBM1141
+trip 'English' english.txt IBM037 IBM500 IBM1047
+
+if [ "$failed" -gt 0 ]; then
+  echo "$bad$failed of $total conversions came back different.$plain"
+  exit 1
+fi
+echo "All $total conversions came back byte for byte."

@@ -1,0 +1,79 @@
+// Reading by file descriptor, so that every failure has its reason and a terminal or a pipe reads as it comes.
+#include "input.h"
+
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <cstring>
+#include <utility>
+
+#include "command.h"
+
+namespace lexicor_cli {
+
+Input::Input(std::vector<std::string> names) : names_(std::move(names)) {
+  if (names_.empty()) names_.push_back("-");
+}
+
+Input::~Input() {
+  if (fd_ > STDERR_FILENO) close(fd_);
+}
+
+size_t Input::read(char* buffer, size_t bytes) {
+  size_t got = 0;
+  while (got < bytes) {
+    if (fd_ < 0 && !open_next()) break;
+    const ssize_t n = ::read(fd_, buffer + got, bytes - got);
+    if (n < 0 && errno == EINTR) continue;
+    if (n < 0) fail(next_file_ - 1);
+    if (n == 0) {
+      if (fd_ != STDIN_FILENO) close(fd_);
+      fd_ = -1;
+    }
+    got += static_cast<size_t>(n);
+    offset_ += static_cast<uint64_t>(n);
+  }
+  return got;
+}
+
+bool Input::open_next() {
+  if (next_file_ == names_.size()) return false;
+  const std::string& name = names_[next_file_];
+  fd_ = name == "-" ? STDIN_FILENO : open(name.c_str(), O_RDONLY | O_CLOEXEC);
+  if (fd_ < 0) fail(next_file_);
+  starts_.push_back({offset_, next_file_});
+  ++next_file_;
+  return true;
+}
+
+uint64_t Input::total_bytes() const {
+  uint64_t total = 0;
+  for (const std::string& name : names_) {
+    struct stat status;
+    const int result = name == "-" ? fstat(STDIN_FILENO, &status) : stat(name.c_str(), &status);
+    if (result != 0 || !S_ISREG(status.st_mode)) return 0;
+    total += static_cast<uint64_t>(status.st_size);
+  }
+  return total;
+}
+
+std::string Input::locate(uint64_t offset) const {
+  if (names_.size() == 1) return "byte " + std::to_string(offset);
+  Start start{0, 0};
+  for (const Start& candidate : starts_) {
+    if (candidate.offset <= offset) start = candidate;
+  }
+  return title(start.file) + ", byte " + std::to_string(offset - start.offset);
+}
+
+void Input::fail(size_t file) const {
+  throw Failure(kDataError, title(file) + ": " + std::strerror(errno));
+}
+
+std::string Input::title(size_t file) const {
+  return names_[file] == "-" ? "standard input" : names_[file];
+}
+
+}  // namespace lexicor_cli

@@ -1,0 +1,46 @@
+// The input of a subcommand: files and standard input, one behind the other, as one text.
+#pragma once
+
+#include <cstdint>
+#include <string>
+#include <vector>
+
+namespace lexicor_cli {
+
+class Input {
+ public:
+  /// No names, or "-", is standard input.
+  explicit Input(std::vector<std::string> names);
+  ~Input();
+  Input(const Input&) = delete;
+  Input& operator=(const Input&) = delete;
+
+  /// Reads until `bytes` bytes are there or the input ends; 0 at the end. Throws a Failure with the file's name
+  /// and the reason.
+  size_t read(char* buffer, size_t bytes);
+
+  /// The size of all files together; 0 when one of them is no regular file.
+  uint64_t total_bytes() const;
+
+  /// Where a byte of the whole text stands: "byte 12", or "FILE, byte 12" when there are several files.
+  std::string locate(uint64_t offset) const;
+
+ private:
+  struct Start {
+    uint64_t offset;  // in the whole text
+    size_t file;
+  };
+
+  /// Opens the next file; false when there is none left.
+  bool open_next();
+  [[noreturn]] void fail(size_t file) const;
+  std::string title(size_t file) const;
+
+  std::vector<std::string> names_;
+  size_t next_file_ = 0;
+  int fd_ = -1;
+  uint64_t offset_ = 0;
+  std::vector<Start> starts_;
+};
+
+}  // namespace lexicor_cli

@@ -1,0 +1,178 @@
+// A piece of text is turned into Unicode as a whole and its values are looked up in a bit set; only a piece
+// that may have lost something is walked character by character.
+#include "loss.h"
+
+#include <algorithm>
+#include <cstdio>
+#include <cstring>
+
+namespace lexicor_cli {
+
+namespace {
+
+constexpr LXUChar kReplacement = 0xFFFD;
+
+/// The Unicode values of a codepage's single bytes; U+FFFD for one that is not a character.
+std::vector<LXUChar> single_byte_values(const Codepage& codepage) {
+  std::vector<LXUChar> values(256, kReplacement);
+  for (int byte = 0; byte < 256; ++byte) {
+    const char text = static_cast<char>(byte);
+    LXUChar unit;
+    if (LXStringToUnicodeEx(&unit, 1, codepage.locale(), &text, LX_SHIFT_SINGLE, 1, 0) == 1)
+      values[static_cast<size_t>(byte)] = unit;
+  }
+  return values;
+}
+
+/// Tells the substitution byte from the character that a Unicode value maps to.
+class Substitution {
+ public:
+  explicit Substitution(const Codepage& codepage) : codepage_(codepage), single_(single_byte_values(codepage)) {
+    // Values that stand for no character: the first one that the codepage does not encode gives the byte away.
+    constexpr LXUChar kProbes[] = {0xFFFF, 0xFFFE, 0xFDD0, 0xD800};
+    for (const LXUChar probe : kProbes) {
+      const LXWChar code = LXCpUnicodeToCharW(codepage.object(), probe);
+      if (code > 0xFF || single_[code] == probe) continue;
+      byte_ = code;
+      known_ = true;
+      break;
+    }
+  }
+
+  bool stands_for(LXUChar unicode, LXWChar code) const {
+    if (code > 0xFF || single_[code] == unicode) return false;
+    // A page of a codepage that maps nothing may give the null byte in place of the substitution byte.
+    return code == 0 || (known_ && code == byte_);
+  }
+
+ private:
+  const Codepage& codepage_;
+  std::vector<LXUChar> single_;
+  LXWChar byte_ = 0;
+  bool known_ = false;
+};
+
+std::string hex_bytes(const char* text, int32_t bytes) {
+  std::string result;
+  for (int32_t i = 0; i < bytes; ++i) {
+    char hex[8];
+    std::snprintf(hex, sizeof hex, " %02X", static_cast<unsigned>(static_cast<unsigned char>(text[i])));
+    result += hex;
+  }
+  return result;
+}
+
+/// The code point of a well-formed four-byte UTF-8 character, else 0.
+uint32_t long_utf8_code_point(const char* text, int32_t bytes) {
+  if (bytes != 4) return 0;
+  uint32_t code_point = static_cast<unsigned char>(text[0]) & 0x07u;
+  for (int i = 1; i < 4; ++i) {
+    const auto byte = static_cast<unsigned char>(text[i]);
+    if ((byte & 0xC0) != 0x80) return 0;
+    code_point = code_point << 6 | (byte & 0x3Fu);
+  }
+  return code_point >= 0x10000 && code_point <= 0x10FFFF ? code_point : 0;
+}
+
+std::string code_point_name(uint32_t code_point) {
+  char name[16];
+  std::snprintf(name, sizeof name, "U+%04X", static_cast<unsigned>(code_point));
+  return name;
+}
+
+}  // namespace
+
+LossFinder::LossFinder(const Codepage& source, const Codepage& target) : source_(source), target_(target) {
+  find_lacking(target);
+  replacement_ = LXCpUnicodeToCharW(source.object(), kReplacement);
+  has_replacement_ = !Substitution(source).stands_for(kReplacement, replacement_);
+}
+
+void LossFinder::find_lacking(const Codepage& target) {
+  const Substitution substitution(target);
+  for (uint32_t unicode = 0; unicode < 0x10000; ++unicode) {
+    const auto unit = static_cast<LXUChar>(unicode);
+    lacking_[unicode] = substitution.stands_for(unit, LXCpUnicodeToCharW(target.object(), unit));
+  }
+}
+
+void LossFinder::take(const char* data, size_t bytes) {
+  text_.append(data, bytes);
+  const auto length = static_cast<int32_t>(text_.size());
+  if (length == 0) return;
+  const LXShiftState state = state_;
+  const char* const text = text_.data();
+  const char* const end = LXMoveStringPointerEx(source_.locale(), text, state, length, &state_, 0);
+  const auto whole = static_cast<int32_t>(end - text);
+  units_.resize(text_.size());
+  const int32_t unit_count =
+      LXStringToUnicodeEx(units_.data(), length, source_.locale(), text, state, whole, 0);
+
+  uint64_t replacements = 0, lacking = 0;
+  for (int32_t i = 0; i < unit_count; ++i) {
+    const LXUChar unicode = units_[static_cast<size_t>(i)];
+    if (unicode == kReplacement)
+      ++replacements;
+    else
+      lacking += lacking_[unicode];
+  }
+  const bool clear = (replacements == 0 || !has_replacement_) && first_.size() == kReported &&
+                     is_own_encoding(text, whole, unit_count);
+  const bool clean = replacements + lacking == 0 && is_own_encoding(text, whole, unit_count);
+  if (clear)
+    count_ += replacements + lacking;  // each of them is lost, and none needs its place
+  else if (!clean)
+    look_at_chars(text, end, state);
+  offset_ += static_cast<uint64_t>(whole);
+  text_.erase(0, static_cast<size_t>(whole));
+}
+
+/// Whether UTF-8 text is what its Unicode values are encoded as: malformed characters are not. True of any
+/// other codepage, where two characters may well have one Unicode value.
+bool LossFinder::is_own_encoding(const char* text, int32_t bytes, int32_t unit_count) {
+  if (!source_.utf8()) return true;
+  encoded_.resize(static_cast<size_t>(unit_count) * 3 + 1);
+  const int32_t encoded = LXUnicodeToString(
+      source_.locale(), encoded_.data(), static_cast<int32_t>(encoded_.size()), units_.data(), unit_count, 0);
+  return encoded == bytes && std::memcmp(encoded_.data(), text, static_cast<size_t>(bytes)) == 0;
+}
+
+void LossFinder::look_at_chars(const char* text, const char* end, LXShiftState state) {
+  uint64_t offset = offset_;
+  for (size_t i = 0; text < end; ++i) {
+    if (source_.is_shift(*text)) {
+      state = source_.state_after(*text++);
+      ++offset;
+      if (text == end) break;
+    }
+    const int32_t bytes = source_.char_bytes(text, state);
+    LXWChar code = 0;
+    for (int32_t k = 0; k < bytes; ++k) code = code << 8 | static_cast<unsigned char>(text[k]);
+    const Kind kind = kind_of(code, units_[i]);
+    if (kind != Kind::kNone) record(text, bytes, offset, units_[i], kind);
+    text += bytes;
+    offset += static_cast<uint64_t>(bytes);
+  }
+}
+
+LossFinder::Kind LossFinder::kind_of(LXWChar code, LXUChar unicode) const {
+  if (unicode == kReplacement && !(has_replacement_ && code == replacement_)) return Kind::kNoUnicode;
+  if (source_.utf8() && LXCpUnicodeToCharW(source_.object(), unicode) != code) return Kind::kNoUnicode;
+  return lacking_[unicode] ? Kind::kNotInTarget : Kind::kNone;
+}
+
+void LossFinder::record(const char* text, int32_t bytes, uint64_t offset, LXUChar unicode, Kind kind) {
+  ++count_;
+  if (first_.size() == kReported) return;
+  std::string message;
+  const uint32_t code_point = source_.utf8() ? long_utf8_code_point(text, bytes) : 0;
+  if (kind == Kind::kNotInTarget)
+    message = code_point_name(unicode) + ", which " + target_.name() + " lacks";
+  else if (code_point != 0)
+    message = code_point_name(code_point) + ", which has no 16-bit Unicode value";
+  else
+    message = (bytes == 1 ? "byte" : "bytes") + hex_bytes(text, bytes) + ", no character in " + source_.name();
+  first_.push_back({offset, message});
+}
+
+}  // namespace lexicor_cli

@@ -1,0 +1,85 @@
+// lexicor: conversion between codepages and a look into a locale directory, from the command line.
+// Exit codes: 0 done, 1 an error in the data or the files, 2 a wrong command line.
+#include <lx.h>
+
+#include <csignal>
+#include <iostream>
+#include <new>
+#include <sstream>
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "command.h"
+#include "output.h"
+
+namespace {
+
+using namespace lexicor_cli;
+
+constexpr Subcommand kSubcommands[] = {
+    {"convert", "Convert text from one codepage to another", declare_convert},
+    {"list", "List the objects of the locale directory", declare_list},
+};
+
+constexpr char kFooter[] =
+    "Examples:\n"
+    "  lexicor list codepages\n"
+    "  lexicor convert --from MS932 --to UTF-8 -o letter.utf8 letter.sjis\n"
+    "  lexicor convert --from UTF-8 --to IBM930 --strict < letter.utf8 > letter.host\n"
+    "  lexicor convert --help";
+
+/// A wrong command line, a question for help or the version: prints it and returns the exit code.
+int answer_parse(const CLI::App& app, const CLI::ParseError& error) {
+  std::ostringstream out, err;
+  const int code = app.exit(error, out, err);
+  std::string text = out.str();
+  if (!text.empty() && text.back() != '\n') text += '\n';
+  Output().write(text);
+  std::cerr << err.str();
+  return code == 0 ? kDone : kUsageError;
+}
+
+int run(int argc, char** argv) {
+  CLI::App app("Lexicor: national-language support. Codepage conversion and locale data.", "lexicor");
+  CommonOptions common;
+  app.set_version_flag("--version", "lexicor " LX_VERSION);
+  app.add_option("--locale-dir", common.locale_dir,
+                 "locale directory; else LX_LOCALEDIR, else the one beside the program")
+      ->type_name("DIR");
+  app.require_subcommand(1);
+  app.footer(kFooter);
+  std::vector<std::pair<const CLI::App*, Run>> runs;
+  for (const Subcommand& subcommand : kSubcommands) {
+    CLI::App* command = app.add_subcommand(subcommand.name, subcommand.summary);
+    command->fallthrough();
+    runs.emplace_back(command, subcommand.declare(*command, common));
+  }
+  try {
+    app.parse(argc, argv);
+  } catch (const CLI::ParseError& error) {
+    return answer_parse(app, error);
+  }
+  for (const auto& [command, action] : runs) {
+    if (*command) return action();
+  }
+  return kUsageError;
+}
+
+}  // namespace
+
+int main(int argc, char** argv) {
+  std::signal(SIGPIPE, SIG_IGN);
+  try {
+    return run(argc, argv);
+  } catch (const Failure& failure) {
+    std::cerr << "lexicor: " << failure.what() << '\n';
+    return failure.code();
+  } catch (const BrokenPipe&) {
+    // Ends as a program does that a closed pipe kills, also where the signal was ignored from the start.
+    return 128 + SIGPIPE;
+  } catch (const std::bad_alloc&) {
+    std::cerr << "lexicor: out of memory\n";
+    return kDataError;
+  }
+}
