@@ -172,10 +172,12 @@ bool is_binary_sort(int32_t type, const char* name, int32_t length) {
          LXmemicmp(kBinarySort, name, static_cast<size_t>(length)) == 0;
 }
 
+/// In a control file that is not grouped by type a range holds entries of other types too; they do not match.
 LXObject* find_by_name(const LXObjManager* manager, int32_t type, const char* name, int32_t length) {
   const Range range = range_of(manager, type);
   for (uint16_t i = range.begin; i < range.end; ++i)
-    if (name_matches(manager->entries[i].disk, name, length)) return &manager->entries[i];
+    if (manager->entries[i].disk.type == type && name_matches(manager->entries[i].disk, name, length))
+      return &manager->entries[i];
   return nullptr;
 }
 

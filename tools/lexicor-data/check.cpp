@@ -12,6 +12,7 @@
 #include "control_source.h"
 #include "core/lxbytes.h"
 #include "core/lxformat.h"
+#include "lx.h"
 #include "structure.h"
 
 namespace lexicor_data {
@@ -87,6 +88,28 @@ void check_object(const std::string& path, const ObjectName& name, const Control
   }
 }
 
+/// Loads every object as a program does, so that the library's own validation has its say.
+void check_loading(const std::string& directory, const Control& control, Faults& faults) {
+  const std::string control_file = directory + '/' + format::kControlFile;
+  int32_t rc = LXInit(directory.c_str(), nullptr, nullptr, nullptr, LX_NO_DEFAULTS);
+  LXObjManager* manager = LXInitObjManager(directory.c_str(), LX_NO_DEFAULTS, &rc);
+  faults.attempt([&] {
+    if (rc != LX_OK) throw SourceError(control_file, 0, 0, "the library cannot read it: code " + std::to_string(rc));
+  });
+  for (const ObjectName& name : control.objects) {
+    faults.attempt([&] {
+      const LXObject* object =
+          LXGetObjFromID(manager, static_cast<int32_t>(name.type), name.id, LX_FIND_AND_LOAD, &rc);
+      if (object == nullptr || rc != LX_OK) {
+        throw SourceError(directory + '/' + object_file_name(name), 0, 0,
+                          "the library cannot load it: code " + std::to_string(rc));
+      }
+    });
+  }
+  LXTermObjManager(manager);
+  LXTerm();
+}
+
 std::ifstream open(const std::string& path) {
   std::ifstream in(path, std::ios::binary);
   if (!in) throw SourceError(path, 0, 0, "cannot be opened");
@@ -111,6 +134,7 @@ std::vector<std::string> check_compiled_directory(const std::string& directory) 
   for (const ObjectName& name : control.objects) {
     faults.attempt([&] { check_object(directory + '/' + object_file_name(name), name, control); });
   }
+  if (faults.messages.empty()) check_loading(directory, control, faults);
   const std::string alias_file = directory + '/' + format::kAliasFile;
   faults.attempt([&] {
     std::ifstream in = open(alias_file);
