@@ -116,7 +116,8 @@ LX_API uint32_t LXGetCharTypeW(LXLocale* locale, LXWChar code, uint32_t selector
 LX_API uint32_t LXGetCharTypeU(LXLocale* locale, LXUChar unicode, uint32_t selector);
 LX_API uint32_t LXGetCharTypeEx(LXLocale* locale, const char* text, LXShiftState state, uint32_t selector);
 
-/* The functions below take a codepage object that is loaded. */
+/* The functions below take a codepage object that is loaded. When the library is not initialised they touch
+ * nothing and return null, 0, or 0xFFFD as a Unicode value. */
 
 /* A multibyte character's type record: 8 bytes, little-endian: type word, case delta. Null in a
  * codepage without multibyte characters. */

@@ -23,9 +23,9 @@ LX_API int32_t LXCloseConversion(LXConversion* conversion);
  *   53  the input ended inside a character, whose bytes are kept: call again with more input.
  * The target's double-byte state is left open at the end.
  *
- * Give at least 8 bytes of output room a call. Pending bytes that do not fit the room of the next
- * call either are moved up one byte too few when fewer than half are taken: a character of three or
- * more bytes that is handed out one byte at a time comes out damaged. */
+ * Give at least 8 bytes of output room a call: pending bytes are then taken at once. Of pending bytes that
+ * are taken in several pieces, those that stay do not all move up, so that a character of three or more
+ * bytes that is handed out one byte at a time comes out damaged. */
 LX_API int32_t LXConvertBuffer(LXConversion* conversion, char** output, int32_t* output_left,
                                const char** input, int32_t* input_left);
 

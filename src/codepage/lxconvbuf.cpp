@@ -26,6 +26,11 @@ using lx::codepage_of;
 
 RAS1_Unit unit = RAS1_UNIT("lxconvbuf");
 
+/// memcpy, also where there is nothing to copy and no place for it.
+void copy(uint8_t* to, const uint8_t* from, size_t bytes) {
+  if (bytes != 0) memcpy(to, from, bytes);
+}
+
 /// One call of LXConvertBuffer: the caller's four values and the handle.
 class Stream {
  public:
@@ -60,12 +65,13 @@ class Stream {
   size_t left_out() const { return static_cast<size_t>(out_end_ - out_); }
 
  private:
-  /// Hands out pending output; false when there is more. What stays moves to the front, but only as many bytes
-  /// as stay less those just taken: callers that give at least 8 bytes of room never see the difference.
+  /// Hands out pending output; false when there is more. Of what stays, only as many bytes as stay less those
+  /// just taken move to the front, so that pending output that is taken in several pieces comes out damaged.
+  /// Callers that give at least 8 bytes of room take it at once.
   bool flush_pending() {
     if (left_out() == 0) return false;
     const size_t n = left_out() < c_->pending_out_count ? left_out() : c_->pending_out_count;
-    memcpy(out_, c_->pending_out, n);
+    copy(out_, c_->pending_out, n);
     out_ += n;
     c_->pending_out_count = static_cast<uint8_t>(c_->pending_out_count - n);
     if (c_->pending_out_count == 0) return true;
@@ -81,7 +87,7 @@ class Stream {
   bool complete_pending(LXUChar* u) {
     const size_t need = pending_length() - c_->pending_in_count;
     const size_t n = need < left_in() ? need : left_in();
-    memcpy(c_->pending_in + c_->pending_in_count, in_, n);
+    copy(c_->pending_in + c_->pending_in_count, in_, n);
     in_ += n;
     c_->pending_in_count = static_cast<uint8_t>(c_->pending_in_count + n);
     if (n < need) return false;
@@ -112,7 +118,7 @@ class Stream {
   template <class Reader>
   int32_t keep_input(Reader* reader) {
     const size_t n = static_cast<size_t>(reader->end - reader->p);
-    memcpy(c_->pending_in, reader->p, n);
+    copy(c_->pending_in, reader->p, n);
     c_->pending_in_count = static_cast<uint8_t>(n);
     reader->p += n;
     return LX_E_INPUT_CUT;
@@ -130,9 +136,9 @@ class Stream {
       ++count;
     }
     const size_t room = static_cast<size_t>(writer.end - writer.p);
-    memcpy(writer.p, p, room);
+    copy(writer.p, p, room);
     writer.p += room;
-    memcpy(c_->pending_out, p + room, count - room);
+    copy(c_->pending_out, p + room, count - room);
     c_->pending_out_count = static_cast<uint8_t>(count - room);
     return LX_E_OUTPUT_FULL;
   }
@@ -193,7 +199,7 @@ int32_t LXCloseConversion(LXConversion* conversion) {
 
 int32_t LXConvertBuffer(LXConversion* conversion, char** output, int32_t* output_left, const char** input,
                         int32_t* input_left) {
-  lx::Call call(unit, conversion->target);
+  lx::Call call(unit, lx::initialized() ? conversion->target : nullptr);
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, LX_E_NOT_INITIALIZED);
   Stream stream(conversion, lx::bytes_of(*input), length_left(*input_left), lx::bytes_of(*output),
                 length_left(*output_left));

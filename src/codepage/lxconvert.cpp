@@ -188,9 +188,12 @@ const LXObject* common_codepage() {
   return lx::object_by_id(LX_CODEPAGE, lx::format::codepage::kCommonId, &rc);
 }
 
-/// How far a unit-by-unit conversion goes: up to a null, or the length.
-bool at_end(int32_t position, int32_t length, bool null) {
-  return null || (length >= 0 && position >= length);
+/// The units of a text up to a null, or its length where one is given.
+template <class Unit>
+int32_t units_before_null(const Unit* text, int32_t length) {
+  int32_t n = 0;
+  while ((length < 0 || n < length) && text[n] != 0) ++n;
+  return n;
 }
 
 }  // namespace
@@ -287,6 +290,7 @@ int32_t LXUnicodeToStringW(LXLocale* locale, LXWChar* output, int32_t size, cons
 }
 
 int32_t LXCpStrToUnicode(const LXObject* codepage, const char* input, int32_t length, LXUChar* output) {
+  if (!lx::initialized()) return -1;
   const size_t bytes = length < 0 ? strlen(input) : strnlen(input, static_cast<size_t>(length));
   if (length < 0 && bytes == 0) return -1;
   return lx::read_bytes(codepage_of(*codepage), Form::kEx, LX_SHIFT_SINGLE, bytes_of(input), bytes,
@@ -299,6 +303,7 @@ int32_t LXCpStrToUnicode(const LXObject* codepage, const char* input, int32_t le
 
 int32_t LXCpUnicodeToStr(const LXObject* codepage, const LXUChar* input, LXShiftState state, int32_t length,
                          char* output) {
+  if (!lx::initialized()) return 0;
   const size_t units = length < 0 ? terminated_units(input) : static_cast<size_t>(length);
   return lx::write_bytes(codepage_of(*codepage), Form::kEx, state, bytes_of(output), lx::no_end<uint8_t>(),
                          [&](auto writer) {
@@ -310,19 +315,17 @@ int32_t LXCpUnicodeToStr(const LXObject* codepage, const LXUChar* input, LXShift
 
 int32_t LXComStrToUnicode(const char* input, int32_t length, LXUChar* output) {
   const LXObject* common = common_codepage();
-  int32_t n = 0;
-  for (; common != nullptr && !at_end(n, length, input[n] == '\0'); ++n)
-    output[n] = codepage_of(*common).unicode[bytes_of(input)[n]];
+  const int32_t n = common != nullptr ? units_before_null(input, length) : 0;
+  for (int32_t i = 0; i < n; ++i) output[i] = codepage_of(*common).unicode[bytes_of(input)[i]];
   output[n] = 0;
   return n != 0 ? n : -1;
 }
 
 int32_t LXComUnicodeToStr(const LXUChar* input, int32_t length, char* output) {
   const LXObject* common = common_codepage();
+  const int32_t n = common != nullptr ? units_before_null(input, length) : 0;
   uint8_t* out = bytes_of(output);
-  int32_t n = 0;
-  for (; common != nullptr && !at_end(n, length, input[n] == 0); ++n)
-    out += lx::store_unicode(codepage_of(*common), input[n], out);
+  for (int32_t i = 0; i < n; ++i) out += lx::store_unicode(codepage_of(*common), input[i], out);
   *out = 0;
   return n != 0 ? n : -1;
 }

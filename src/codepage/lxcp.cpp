@@ -340,19 +340,20 @@ uint32_t LXGetCharTypeEx(LXLocale* locale, const char* text, LXShiftState state,
 }
 
 const uint8_t* LXGetMbCtype(const LXObject* codepage, const char* text) {
-  return type_record(lx::codepage_of(*codepage), bytes_of(text));
+  return lx::initialized() ? type_record(lx::codepage_of(*codepage), bytes_of(text)) : nullptr;
 }
 
 const uint8_t* LXGetMbCtypeW(const LXObject* codepage, LXWChar code) {
-  return type_record_of_code(lx::codepage_of(*codepage), code);
+  return lx::initialized() ? type_record_of_code(lx::codepage_of(*codepage), code) : nullptr;
 }
 
 LXWChar LXMbToW(const LXObject* codepage, const char* text) {
+  if (!lx::initialized()) return 0;
   return lx::pack(bytes_of(text), lx::codepage_of(*codepage).length(bytes_of(text)[0]));
 }
 
 LXWChar LXMbToWS(const LXObject* codepage, const char* text, LXShiftState state) {
-  return lx::pack(bytes_of(text), lx::codepage_of(*codepage).width_in(state));
+  return lx::initialized() ? lx::pack(bytes_of(text), lx::codepage_of(*codepage).width_in(state)) : 0;
 }
 
 int32_t LXWToMb(char* text, LXWChar code) {
@@ -363,6 +364,7 @@ int32_t LXWToMb(char* text, LXWChar code) {
 }
 
 LXUChar LXCpMbToUnicode(const LXObject* codepage, const char* text) {
+  if (!lx::initialized()) return lx::kNoUnicode;
   return lx::multibyte_unicode(lx::codepage_of(*codepage), bytes_of(text));
 }
 
@@ -373,19 +375,21 @@ LXUChar LXCpMbToUnicodeW(const LXObject* codepage, LXWChar code) {
 }
 
 int32_t LXCpUnicodeToChar(const LXObject* codepage, LXUChar unicode, char* text) {
+  if (!lx::initialized()) return 0;
   return static_cast<int32_t>(lx::store_unicode(lx::codepage_of(*codepage), unicode, bytes_of(text)));
 }
 
 LXWChar LXCpUnicodeToCharW(const LXObject* codepage, LXUChar unicode) {
-  return lx::unicode_to_code(lx::codepage_of(*codepage), unicode);
+  return lx::initialized() ? lx::unicode_to_code(lx::codepage_of(*codepage), unicode) : 0;
 }
 
 int32_t LXCpStrCharToByteLen(const LXObject* codepage, const char* text, LXShiftState state, int32_t chars) {
+  if (!lx::initialized()) return 0;
   return static_cast<int32_t>(lx::bytes_of_chars(lx::codepage_of(*codepage), bytes_of(text), state, chars));
 }
 
 int32_t LXCpStrByteToCharLen(const LXObject* codepage, const char* text, LXShiftState state, int32_t bytes) {
-  if (bytes == 0) return 0;
+  if (!lx::initialized() || bytes == 0) return 0;
   const Codepage& cp = lx::codepage_of(*codepage);
   const size_t length = length_of(text, bytes);
   if (cp.single_byte) return static_cast<int32_t>(length);
@@ -396,6 +400,7 @@ int32_t LXLangGetSpecial(const LXObject* language, LXUChar first, LXUChar second
                          LXUChar* result2, int32_t selector) {
   namespace words = lx::format::language;
   constexpr int32_t kUpperSelector = 44;
+  if (!lx::initialized()) return 0;
   const uint8_t* payload = lx::payload_of(*language);
   const bool upper = selector == kUpperSelector;
   const size_t count = lx::le16(payload + 2 * (upper ? words::kUpperSpecials : words::kLowerSpecials));

@@ -115,7 +115,7 @@ extern "C" void* LXCpV1toV2(const void* payload, int32_t payload_bytes, const vo
   lx::Events events(unit);
   *new_section = nullptr;
   void* const none = nullptr;
-  if (lx::globals.area == nullptr || payload_bytes < 0 || section_bytes < 0) return events.exit(none);
+  if (!lx::initialized() || payload_bytes < 0 || section_bytes < 0) return events.exit(none);
   lx::Sections version1;
   version1.section[0] = {static_cast<const uint8_t*>(payload), static_cast<size_t>(payload_bytes)};
   version1.section[1] = {static_cast<const uint8_t*>(section), static_cast<size_t>(section_bytes)};

@@ -103,9 +103,11 @@ class Validator {
   size_t word(size_t offset) const { return lx::le16(payload_.data + offset); }
   uint8_t length(unsigned byte) const { return payload_.data[fmt::kLengths + byte]; }
 
-  /// Lengths are 1 to the width; where UTF-8 is computed, as long as the bytes that the formula reads.
+  /// Lengths are 1 to the width; where UTF-8 is computed, as long as the bytes that the formula reads, which is
+  /// three in a double-byte state.
   bool lengths_fit() const {
     if (width_ < 1 || width_ > lx::kMaxCharBytes) return false;
+    if (utf8_ && shift_ && width_ < 3) return false;
     for (unsigned byte = 0; byte < kAnyByte; ++byte) {
       if (length(byte) < 1 || length(byte) > width_) return false;
       if (utf8_ && length(byte) == 2 && byte > 0xDF) return false;

@@ -307,7 +307,7 @@ template <class Body>
 auto write_bytes(const Codepage& cp, Form form, LXShiftState state, uint8_t* p, uint8_t* end, Body&& body) {
   if (form == Form::kEx && cp.shift_sensitive) return body(ShiftWriter{cp, p, end, state});
   if (cp.utf8) return body(Utf8Writer{cp, p, end});
-  if (cp.one_byte_codes) return body(SingleByteWriter{cp, p, end});
+  if (cp.single_byte && cp.one_byte_codes) return body(SingleByteWriter{cp, p, end});
   return body(MultiByteWriter{cp, p, end});
 }
 

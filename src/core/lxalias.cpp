@@ -65,9 +65,11 @@ class AliasReader {
  private:
   bool read_line(Span line) {
     if (line.bytes() == 0 || *line.begin == '#') return true;
-    const bool continued = is_separator(*line.begin);
-    if (!continued) {
-      if (!start_codepage(take_token(&line))) return false;
+    // Only a blank in column 1 continues; a tab there, say, comes before the name of a new codepage.
+    if (*line.begin != ' ') {
+      const Span name = take_token(&line);
+      if (name.bytes() == 0) return true;
+      if (!start_codepage(name)) return false;
     }
     for (Span alias = take_token(&line); alias.bytes() != 0; alias = take_token(&line)) {
       if (codepage_.bytes() == 0) {

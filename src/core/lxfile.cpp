@@ -95,7 +95,7 @@ extern "C" {
 LXFile* LXOpenFile(int32_t, const char* path, int32_t mode, int32_t no_temporary, int32_t* rc) {
   lx::Events events(unit);
   *rc = LX_E_NOT_INITIALIZED;
-  if (lx::globals.area == nullptr) return events.exit(static_cast<LXFile*>(nullptr));
+  if (!lx::files_usable()) return events.exit(static_cast<LXFile*>(nullptr));
   LX_TRACE(unit, RAS1_LEVEL_INPUT, "Opening file %s", path);
   *rc = LX_E_MEMORY;
   lx::HookPtr<LXFile> file(static_cast<LXFile*>(lx::hook_allocate_zeroed(sizeof(LXFile))));
@@ -116,7 +116,7 @@ LXFile* LXOpenFile(int32_t, const char* path, int32_t mode, int32_t no_temporary
 
 int32_t LXCloseFile(LXFile* file, int32_t discard) {
   lx::Events events(unit);
-  if (file == nullptr || lx::globals.area == nullptr) return events.exit(LX_E_INVALID);
+  if (file == nullptr || !lx::files_usable()) return events.exit(LX_E_INVALID);
   int32_t result = close(file->descriptor);
   if (file->temporary != 0) {
     char temporary_name[kFullNameBytes];
@@ -146,6 +146,8 @@ int32_t LXSeekFile(LXFile* file, int32_t offset, int32_t origin) {
 void* LXLoadFile(LXFile* file, uint32_t offset, int32_t bytes, int32_t* rc) {
   lx::Events events(unit);
   void* const none = nullptr;
+  *rc = LX_E_NOT_INITIALIZED;
+  if (!lx::files_usable()) return events.exit(none);
   *rc = LX_OK;
   if (bytes == 0) return events.exit(none);
   *rc = LX_E_FILE_MODE;
@@ -164,7 +166,7 @@ void* LXLoadFile(LXFile* file, uint32_t offset, int32_t bytes, int32_t* rc) {
 }
 
 int32_t LXUnloadFile(void* block) {
-  if (block != nullptr && lx::globals.area != nullptr) lx::hook_free(block);
+  if (lx::files_usable()) lx::hook_free(block);
   return LX_OK;
 }
 

@@ -165,7 +165,7 @@ int32_t LXUnloadObj(LXObjManager*, LXObject* entry) {
     else if (!lx::hook_free(section))
       result = LX_E_FREE;
   }
-  if ((entry->disk.flags & lx::kObjectBuiltIn) == 0 && !lx::hook_free(entry->derived)) result = LX_E_FREE;
+  if ((entry->disk.flags & lx::kObjectBuiltIn) == 0) lx::hook_free(entry->derived);
   entry->derived = nullptr;
   if (entry->file != nullptr) LXCloseFile(entry->file, 0);
   entry->file = nullptr;

@@ -261,7 +261,7 @@ LXObjManager* LXInitObjManager(const char* directory, uint32_t options, int32_t*
 
 int32_t LXTermObjManager(LXObjManager* manager) {
   lx::Events events(unit);
-  if (manager == nullptr || lx::globals.area == nullptr) return events.exit(LX_E_INVALID);
+  if (manager == nullptr || !lx::initialized()) return events.exit(LX_E_INVALID);
   LXDestroyAliasList(manager);
   int32_t result = LX_OK;
   for (uint16_t i = 0; i < manager->count; ++i) {
@@ -291,6 +291,8 @@ LXObject* LXGetObjFromName(LXObjManager* given, int32_t type, const char* name, 
 
 LXObject* LXGetObjFromNameW(LXObjManager* given, int32_t type, const LXWChar* name, int32_t length,
                             int32_t mode, int32_t* rc) {
+  *rc = LX_E_NOT_INITIALIZED;
+  if (!lx::initialized()) return nullptr;
   // Names are single bytes: a name with a longer character, or too long for any record, is not found.
   char narrow[sizeof(LXObjDisk::name)];
   const int32_t size = sizeof(narrow);
@@ -300,7 +302,7 @@ LXObject* LXGetObjFromNameW(LXObjManager* given, int32_t type, const LXWChar* na
     ++n;
   }
   if (n == length) return LXGetObjFromName(given, type, narrow, length, mode, rc);
-  *rc = lx::initialized() ? LX_E_NOT_FOUND : LX_E_NOT_INITIALIZED;
+  *rc = LX_E_NOT_FOUND;
   return nullptr;
 }
 

@@ -105,6 +105,11 @@ inline bool initialized() {
   return area != nullptr && area->init_count != 0;
 }
 
+/// Whether files may be opened: also by the initialisation itself.
+inline bool files_usable() {
+  return globals.area != nullptr && globals.area->file_context == 1;
+}
+
 /// The locale that a call works in: the one given, or the default; null when there is none or the library is
 /// not initialised, in which case nothing of `given` may be touched.
 inline LXLocale* locale_of(LXLocale* given) {

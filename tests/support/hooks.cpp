@@ -21,7 +21,8 @@ void* Hooks::allocate(void* context, size_t bytes) {
   Hooks& self = *static_cast<Hooks*>(context);
   const std::lock_guard<std::mutex> lock(self.mutex_);
   ++self.calls_;
-  if (self.fail_at_ != 0 && (self.calls_ == self.fail_at_ || (self.from_then_on_ && self.calls_ > self.fail_at_))) {
+  if (self.fail_at_ != 0 &&
+      (self.calls_ == self.fail_at_ || (self.from_then_on_ && self.calls_ > self.fail_at_))) {
     self.failed_ = true;
     return nullptr;
   }

@@ -11,16 +11,17 @@ namespace lx::test {
 /// Give `Hooks::allocate`, `Hooks::release` and the object's address to LXInit.
 class Hooks {
  public:
-  /// The allocation that fails, 1 for the first one; 0: none. Every later one fails too when `from_then_on` is set.
+  /// The allocation that fails, 1 for the first one; 0: none. Every later one fails too when `from_then_on` is
+  /// set.
   void fail_at(size_t call, bool from_then_on = false);
   /// Makes every free report failure; the block is given back all the same.
   void fail_frees(bool fail) { fail_frees_ = fail; }
 
-  size_t calls() const { return calls_; }                // allocations asked for
-  size_t live_blocks() const { return live_.size(); }    // not yet freed
+  size_t calls() const { return calls_; }              // allocations asked for
+  size_t live_blocks() const { return live_.size(); }  // not yet freed
   size_t live_bytes() const;
-  size_t wrong_frees() const { return wrong_frees_; }    // of blocks that were not out
-  bool failed() const { return failed_; }                // whether an allocation was refused
+  size_t wrong_frees() const { return wrong_frees_; }  // of blocks that were not out
+  bool failed() const { return failed_; }              // whether an allocation was refused
 
   static void* allocate(void* context, size_t bytes);
   static int32_t release(void* context, void* block);

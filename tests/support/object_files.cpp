@@ -15,7 +15,9 @@
 namespace lx::test {
 namespace {
 
-ByteString copy(Bytes bytes) { return ByteString(bytes.data, bytes.data + bytes.size); }
+ByteString copy(Bytes bytes) {
+  return ByteString(bytes.data, bytes.data + bytes.size);
+}
 
 }  // namespace
 
@@ -70,7 +72,9 @@ ByteString ScratchDirectory::read(const std::string& name) const {
   return ByteString(std::istreambuf_iterator<char>(in), {});
 }
 
-bool ScratchDirectory::exists(const std::string& name) const { return access(file(name).c_str(), F_OK) == 0; }
+bool ScratchDirectory::exists(const std::string& name) const {
+  return access(file(name).c_str(), F_OK) == 0;
+}
 
 void ScratchDirectory::write_locale(const std::vector<Codepage>& codepages) const {
   ByteString language = copy(kBuiltInLanguage.sections.section[0]);

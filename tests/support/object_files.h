@@ -9,8 +9,8 @@ namespace lx::test {
 
 using ByteString = std::vector<uint8_t>;
 
-/// An object or control file: header and up to four sections, sections[0] being the payload. `sections` behind the
-/// last one are not counted in the header.
+/// An object or control file: header and up to four sections, sections[0] being the payload. `sections` behind
+/// the last one are not counted in the header.
 ByteString object_file(const std::vector<ByteString>& sections, uint32_t version = 2);
 
 struct ControlRecord {
@@ -49,7 +49,8 @@ class ScratchDirectory {
   std::string path_;
 };
 
-/// Payload and low array of a single-byte codepage that is US-ASCII in its first half; a base to change in tests.
+/// Payload and low array of a single-byte codepage that is US-ASCII in its first half; a base to change in
+/// tests.
 std::vector<ByteString> ascii_codepage();
 
 }  // namespace lx::test

@@ -152,6 +152,7 @@ int convert(const ConvertOptions& options, const CommonOptions& common) {
     }
   }
   const bool whole = converter.finish();
+  if (losses && whole) losses->finish();
   const bool kept = !losses || report_losses(*losses, input, options);
   if (!whole)
     throw Failure(kDataError,

@@ -1,6 +1,7 @@
 // lexicor list: the objects and aliases of the locale directory, as tables or as JSON.
 #include <lx.h>
 
+#include <algorithm>
 #include <memory>
 #include <nlohmann/json.hpp>
 #include <sstream>

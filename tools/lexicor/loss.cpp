@@ -62,16 +62,38 @@ std::string hex_bytes(const char* text, int32_t bytes) {
   return result;
 }
 
-/// The code point of a well-formed four-byte UTF-8 character, else 0.
-uint32_t long_utf8_code_point(const char* text, int32_t bytes) {
-  if (bytes != 4) return 0;
-  uint32_t code_point = static_cast<unsigned char>(text[0]) & 0x07u;
-  for (int i = 1; i < 4; ++i) {
-    const auto byte = static_cast<unsigned char>(text[i]);
-    if ((byte & 0xC0) != 0x80) return 0;
-    code_point = code_point << 6 | (byte & 0x3Fu);
+// A UTF-8 character of four bytes lies beyond 16-bit Unicode: the library takes it as four bytes without a
+// value, the report as the one character that its writer meant.
+constexpr size_t kLongUtf8Bytes = 4;
+
+bool is_long_utf8_lead(char c) {
+  const auto byte = static_cast<unsigned char>(c);
+  return byte >= 0xF0 && byte <= 0xF4;
+}
+
+bool is_utf8_trail(char c) {
+  return (static_cast<unsigned char>(c) & 0xC0) == 0x80;
+}
+
+/// The code point of the four-byte UTF-8 character at `text`, or 0.
+uint32_t long_utf8_code_point(const char* text, const char* end) {
+  if (static_cast<size_t>(end - text) < kLongUtf8Bytes || !is_long_utf8_lead(*text)) return 0;
+  uint32_t code_point = static_cast<unsigned char>(*text) & 0x07u;
+  for (size_t i = 1; i < kLongUtf8Bytes; ++i) {
+    if (!is_utf8_trail(text[i])) return 0;
+    code_point = code_point << 6 | (static_cast<unsigned char>(text[i]) & 0x3Fu);
   }
   return code_point >= 0x10000 && code_point <= 0x10FFFF ? code_point : 0;
+}
+
+/// The bytes at the end of the text that may be the first ones of a four-byte UTF-8 character.
+size_t long_utf8_beginning(const std::string& text) {
+  for (size_t bytes = 1; bytes < kLongUtf8Bytes && bytes <= text.size(); ++bytes) {
+    const char c = text[text.size() - bytes];
+    if (is_long_utf8_lead(c)) return bytes;
+    if (!is_utf8_trail(c)) return 0;
+  }
+  return 0;
 }
 
 std::string code_point_name(uint32_t code_point) {
@@ -98,13 +120,18 @@ void LossFinder::find_lacking(const Codepage& target) {
 
 void LossFinder::take(const char* data, size_t bytes) {
   text_.append(data, bytes);
-  const auto length = static_cast<int32_t>(text_.size());
-  if (length == 0) return;
+  look_at(text_.size() - (source_.utf8() ? long_utf8_beginning(text_) : 0));
+}
+
+/// Looks at the whole characters in the first bytes of text_, and takes them off.
+void LossFinder::look_at(size_t bytes) {
+  if (bytes == 0) return;
+  const auto length = static_cast<int32_t>(bytes);
   const LXShiftState state = state_;
   const char* const text = text_.data();
   const char* const end = LXMoveStringPointerEx(source_.locale(), text, state, length, &state_, 0);
   const auto whole = static_cast<int32_t>(end - text);
-  units_.resize(text_.size());
+  units_.resize(bytes);
   const int32_t unit_count =
       LXStringToUnicodeEx(units_.data(), length, source_.locale(), text, state, whole, 0);
 
@@ -116,12 +143,13 @@ void LossFinder::take(const char* data, size_t bytes) {
     else
       lacking += lacking_[unicode];
   }
-  const bool clear = (replacements == 0 || !has_replacement_) && first_.size() == kReported &&
-                     is_own_encoding(text, whole, unit_count);
-  const bool clean = replacements + lacking == 0 && is_own_encoding(text, whole, unit_count);
-  if (clear)
-    count_ += replacements + lacking;  // each of them is lost, and none needs its place
-  else if (!clean)
+  const bool own_encoding = is_own_encoding(text, whole, unit_count);
+  // Without a character for U+FFFD every one of its values is a loss; no place is wanted beyond the first
+  // losses.
+  const bool counted = own_encoding && first_.size() == kReported && (replacements == 0 || !has_replacement_);
+  if (counted)
+    count_ += replacements + lacking;
+  else if (!own_encoding || replacements + lacking > 0)
     look_at_chars(text, end, state);
   offset_ += static_cast<uint64_t>(whole);
   text_.erase(0, static_cast<size_t>(whole));
@@ -145,11 +173,18 @@ void LossFinder::look_at_chars(const char* text, const char* end, LXShiftState s
       ++offset;
       if (text == end) break;
     }
-    const int32_t bytes = source_.char_bytes(text, state);
-    LXWChar code = 0;
-    for (int32_t k = 0; k < bytes; ++k) code = code << 8 | static_cast<unsigned char>(text[k]);
-    const Kind kind = kind_of(code, units_[i]);
-    if (kind != Kind::kNone) record(text, bytes, offset, units_[i], kind);
+    const uint32_t code_point = source_.utf8() ? long_utf8_code_point(text, end) : 0;
+    int32_t bytes = source_.char_bytes(text, state);
+    if (code_point != 0) {
+      record(offset, code_point_name(code_point) + ", which has no 16-bit Unicode value");
+      bytes = kLongUtf8Bytes;
+      i += kLongUtf8Bytes - 1;
+    } else {
+      LXWChar code = 0;
+      for (int32_t k = 0; k < bytes; ++k) code = code << 8 | static_cast<unsigned char>(text[k]);
+      const Kind kind = kind_of(code, units_[i]);
+      if (kind != Kind::kNone) record(offset, describe(text, bytes, units_[i], kind));
+    }
     text += bytes;
     offset += static_cast<uint64_t>(bytes);
   }
@@ -161,18 +196,14 @@ LossFinder::Kind LossFinder::kind_of(LXWChar code, LXUChar unicode) const {
   return lacking_[unicode] ? Kind::kNotInTarget : Kind::kNone;
 }
 
-void LossFinder::record(const char* text, int32_t bytes, uint64_t offset, LXUChar unicode, Kind kind) {
+std::string LossFinder::describe(const char* text, int32_t bytes, LXUChar unicode, Kind kind) const {
+  if (kind == Kind::kNotInTarget) return code_point_name(unicode) + ", which " + target_.name() + " lacks";
+  return (bytes == 1 ? "byte" : "bytes") + hex_bytes(text, bytes) + ", no character in " + source_.name();
+}
+
+void LossFinder::record(uint64_t offset, const std::string& message) {
   ++count_;
-  if (first_.size() == kReported) return;
-  std::string message;
-  const uint32_t code_point = source_.utf8() ? long_utf8_code_point(text, bytes) : 0;
-  if (kind == Kind::kNotInTarget)
-    message = code_point_name(unicode) + ", which " + target_.name() + " lacks";
-  else if (code_point != 0)
-    message = code_point_name(code_point) + ", which has no 16-bit Unicode value";
-  else
-    message = (bytes == 1 ? "byte" : "bytes") + hex_bytes(text, bytes) + ", no character in " + source_.name();
-  first_.push_back({offset, message});
+  if (first_.size() < kReported) first_.push_back({offset, message});
 }
 
 }  // namespace lexicor_cli

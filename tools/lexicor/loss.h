@@ -25,6 +25,8 @@ class LossFinder {
 
   /// Looks at the next bytes of the input. A character that they cut is looked at with the bytes that follow.
   void take(const char* data, size_t bytes);
+  /// Looks at what take() has held back; call it when the input has ended on a whole character.
+  void finish() { look_at(text_.size()); }
 
   uint64_t count() const { return count_; }
   /// The first of them, at most kReported.
@@ -36,9 +38,11 @@ class LossFinder {
   enum class Kind { kNone, kNoUnicode, kNotInTarget };
 
   void find_lacking(const Codepage& target);
+  void look_at(size_t bytes);
   void look_at_chars(const char* text, const char* end, LXShiftState state);
   Kind kind_of(LXWChar code, LXUChar unicode) const;
-  void record(const char* text, int32_t bytes, uint64_t offset, LXUChar unicode, Kind kind);
+  std::string describe(const char* text, int32_t bytes, LXUChar unicode, Kind kind) const;
+  void record(uint64_t offset, const std::string& message);
   bool is_own_encoding(const char* text, int32_t bytes, int32_t unit_count);
 
   const Codepage& source_;
@@ -47,7 +51,7 @@ class LossFinder {
   bool has_replacement_ = false;  // the source has a character for U+FFFD
   LXWChar replacement_ = 0;       // its packed code
 
-  std::string text_;  // bytes of a cut character, then those of this call
+  std::string text_;  // bytes not looked at: of a cut character, then those of this call
   LXShiftState state_ = LX_SHIFT_SINGLE;
   uint64_t offset_ = 0;  // of text_ in the input
   std::vector<LXUChar> units_;

@@ -1,0 +1,14 @@
+// The table of ratios.
+#pragma once
+
+#include <cstdio>
+#include <vector>
+
+#include "rows.h"
+
+namespace bench {
+
+/// Measures the rows and prints the table: the number of rows in which ICU or iconv is faster.
+int print_ratios(const std::vector<Row>& rows, std::FILE* out);
+
+}  // namespace bench

@@ -1,0 +1,187 @@
+// Character types through the doors, the type records, and the tables of the built-in codepage.
+#include <gtest/gtest.h>
+
+#include <cstring>
+
+#include "codepage/lxcodepage.h"
+#include "codepage/lxunicode.h"
+#include "core/lxmemory.h"
+#include "core/lxobjtypes.h"
+#include "support/tiny_codepages.h"
+
+namespace {
+
+using lx::test::TinyCharacter;
+using lx::test::TinyCodepage;
+using lx::test::TinyLibrary;
+
+struct Selected {
+  uint32_t selector;
+  uint32_t (*field)(uint32_t word);
+  int32_t error;
+};
+constexpr Selected kSelectors[] = {
+    {0x80000010, [](uint32_t w) { return w & 0x3FF; }, LX_OK},
+    {0x80000011, [](uint32_t w) { return w >> 10 & 0xFFF; }, LX_OK},
+    {0x80000012, [](uint32_t w) { return w >> 22; }, LX_OK},
+    {0x80000013, [](uint32_t w) { return w & 0x3FF; }, LX_E_INVALID},
+    {0x12345, [](uint32_t w) { return w & 0x3FF; }, LX_E_INVALID},
+    {0, [](uint32_t w) { return w & 0x3FF; }, LX_E_INVALID},
+};
+
+class Types : public testing::Test {
+ protected:
+  void TearDown() override { EXPECT_TRUE(library_.close()); }
+  TinyLibrary library_;
+};
+
+TEST_F(Types, EveryCharacterInEveryForm) {
+  for (const TinyCodepage& cp : lx::test::tiny_codepages()) {
+    SCOPED_TRACE(cp.file.name);
+    LXLocale* locale = library_.locale(cp);
+    for (const TinyCharacter& c : cp.characters) {
+      const uint32_t word = lx::unicode_type(c.unicode);
+      const std::vector<char> text(c.bytes.begin(), c.bytes.end());
+      const LXShiftState state = cp.shift && text.size() > 1 ? LX_SHIFT_DOUBLE : LX_SHIFT_SINGLE;
+      for (const Selected& s : kSelectors) {
+        EXPECT_EQ(LXGetCharTypeEx(locale, text.data(), state, s.selector), s.field(word)) << std::hex << c.code;
+        EXPECT_EQ(LXGetError(locale), s.error);
+        EXPECT_EQ(LXGetCharTypeW(locale, c.code, s.selector), s.field(word)) << std::hex << c.code;
+        EXPECT_EQ(LXGetError(locale), s.error);
+        EXPECT_EQ(LXGetCharTypeU(locale, c.unicode, s.selector), s.field(word)) << std::hex << c.code;
+        EXPECT_EQ(LXGetError(locale), s.error);
+        if (state == LX_SHIFT_DOUBLE) continue;
+        EXPECT_EQ(LXGetCharType(locale, text.data(), s.selector), s.field(word)) << std::hex << c.code;
+        EXPECT_EQ(LXGetError(locale), s.error);
+      }
+    }
+  }
+}
+
+TEST_F(Types, RecordsOfMultibyteCharacters) {
+  for (const TinyCodepage& cp : lx::test::tiny_codepages()) {
+    const LXObject* object = library_.object(cp);
+    for (const TinyCharacter& c : cp.characters) {
+      if (c.bytes.size() == 1) continue;
+      const std::vector<char> text(c.bytes.begin(), c.bytes.end());
+      const uint8_t* record = LXGetMbCtype(object, text.data());
+      ASSERT_NE(record, nullptr);
+      EXPECT_EQ(lx::le32(record), lx::unicode_type(c.unicode)) << std::hex << c.code;
+      EXPECT_EQ(lx::le32(record + 4), c.unicode) << "the case delta";
+      EXPECT_EQ(LXGetMbCtypeW(object, c.code), record);
+    }
+  }
+  // A zero byte inside a packed code is not walked.
+  const TinyCodepage sjis = lx::test::tiny_shift_jis();
+  EXPECT_EQ(LXGetMbCtypeW(library_.object(sjis), 0x8200A0), LXGetMbCtype(library_.object(sjis), "\x82\xA0"));
+  EXPECT_EQ(LXGetMbCtype(library_.object(lx::test::tiny_single()), "A"), nullptr);
+}
+
+TEST_F(Types, BytesWithoutACharacterAndShiftBytes) {
+  LXLocale* single = library_.locale(lx::test::tiny_single());
+  EXPECT_EQ(LXGetCharType(single, "\x80", LX_CTYPE1), 0u);
+  EXPECT_EQ(LXGetCharTypeW(single, 0x80, LX_CTYPE2), 0u);
+  // A lead byte on its own is a single byte when it comes as a code.
+  LXLocale* sjis = library_.locale(lx::test::tiny_shift_jis());
+  EXPECT_EQ(LXGetCharTypeW(sjis, 0x82, LX_CTYPE1), 0u);
+  EXPECT_EQ(LXGetCharType(sjis, "\x82\x20", LX_CTYPE2), LX_C2_NONE) << "a pair without a character";
+
+  LXLocale* shift = library_.locale(lx::test::tiny_shift());
+  const uint32_t hiragana = lx::unicode_type(0x3041) >> 22;
+  const uint32_t latin = lx::unicode_type('A') >> 22;
+  struct Row {
+    const char* text;
+    LXShiftState state;
+    uint32_t type3;
+  };
+  const Row rows[] = {
+      {"\x44\x47", 1, hiragana}, {"\x0E\x44\x47", 0, hiragana}, {"\x0E\x44\x47", 1, hiragana},
+      {"\xC1", 0, latin},        {"\x0F\xC1", 1, latin},        {"\x0F\xC1", 0, latin},
+  };
+  for (const Row& row : rows) EXPECT_EQ(LXGetCharTypeEx(shift, row.text, row.state, LX_CTYPE3), row.type3);
+  EXPECT_EQ(LXGetCharTypeEx(single, "A", 1, LX_CTYPE1), 0x213u);
+}
+
+TEST_F(Types, UnicodeValues) {
+  LXLocale* locale = library_.locale(lx::test::tiny_single());
+  EXPECT_EQ(LXGetCharTypeU(locale, 'A', LX_CTYPE1), 0x213u);
+  EXPECT_EQ(LXGetCharTypeU(locale, 'A', LX_CTYPE2), 0x002u);
+  EXPECT_EQ(LXGetCharTypeU(locale, 'A', LX_CTYPE3), 0x040u);
+  EXPECT_EQ(LXGetCharTypeU(locale, 'A', 0x12345), 0x213u);
+  EXPECT_EQ(LXGetError(locale), LX_E_INVALID);
+  // Letters of the Arabic presentation forms, and one of them that is not.
+  EXPECT_EQ(LXGetCharTypeU(locale, 0xFBE8, LX_CTYPE1), static_cast<uint32_t>(LX_C1_ALPHA));
+  EXPECT_EQ(LXGetCharTypeU(locale, 0xFBE9, LX_CTYPE1), 0u);
+  EXPECT_EQ(LXGetCharTypeU(locale, 0xFBE9, LX_CTYPE2), static_cast<uint32_t>(LX_C2_NONE));
+}
+
+TEST(BuiltInCodepage, Payload) {
+  const lx::Sections& sections = lx::kBuiltInCodepage.sections;
+  ASSERT_EQ(sections.section[0].size, 4376u);
+  const uint8_t* p = sections.section[0].data;
+  const uint8_t head[] = {0x3F, 0x0A, 0x0D, 0x0A, 0x0A, 1, 0, 0, 0, 0};
+  EXPECT_EQ(memcmp(p, head, sizeof(head)), 0);
+  for (unsigned b = 0; b < 256; ++b) {
+    const bool ascii = b < 0x80;
+    EXPECT_EQ(p[10 + b], 1);
+    EXPECT_EQ(p[266 + b], ascii ? lx::unicode_upper(static_cast<uint16_t>(b)) : b);
+    EXPECT_EQ(p[522 + b], ascii ? lx::unicode_lower(static_cast<uint16_t>(b)) : b);
+    EXPECT_EQ(lx::le16(p + 778 + 2 * b), ascii ? b : 0xFFFDu);
+    EXPECT_EQ(lx::le32(p + 1292 + 4 * b), ascii ? lx::unicode_type(static_cast<uint16_t>(b)) : 0u);
+    const uint8_t first[] = {0, 0xFF, 0x00, 0xFF, 0, 0, 0, 0};
+    const uint8_t other[] = {0, 0, 2, 1, 0, 0, 0, 0};
+    EXPECT_EQ(memcmp(p + 2316 + 8 * b, b == 0 ? first : other, 8), 0) << b;
+  }
+  const uint8_t tail[] = {1, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0};
+  EXPECT_EQ(memcmp(p + 4364, tail, sizeof(tail)), 0);
+
+  ASSERT_EQ(sections.section[2].size, 259u);
+  const uint8_t* low = sections.section[2].data;
+  for (unsigned b = 0; b < 256; ++b) EXPECT_EQ(low[b], b < 0x80 ? b : 0x3F);
+  EXPECT_EQ(low[256], 0x0A);
+  EXPECT_EQ(low[257], 0x0A);
+  EXPECT_EQ(low[258], 0x3F);
+}
+
+/// In force when there is no directory; its derived data are compiled in and must be what loading would derive.
+TEST(BuiltInCodepage, InForceWithoutADirectory) {
+  lx::test::Hooks hooks;
+  ASSERT_EQ(LXInit("/nonexistent", lx::test::Hooks::allocate, lx::test::Hooks::release, &hooks, 0),
+            LX_W_DEFAULTS);
+  const lx::Sections& sections = lx::kBuiltInCodepage.sections;
+  EXPECT_EQ(lx::validate_codepage(1, sections), LX_OK);
+  void* block = lx::derive_codepage(1, sections);
+  ASSERT_NE(block, nullptr);
+  const auto& derived = *static_cast<const lx::Codepage*>(block);
+  const auto& built_in = *static_cast<const lx::Codepage*>(lx::kBuiltInCodepage.derived);
+  EXPECT_EQ(memcmp(derived.unicode, built_in.unicode, sizeof(derived.unicode)), 0);
+  EXPECT_EQ(memcmp(derived.page_row, built_in.page_row, sizeof(derived.page_row)), 0);
+  EXPECT_EQ(memcmp(derived.codes16, built_in.codes16, 512 * sizeof(uint16_t)), 0);
+  EXPECT_EQ(derived.rows, nullptr);
+  EXPECT_EQ(derived.codes32, nullptr);
+  EXPECT_EQ(derived.width, built_in.width);
+  EXPECT_EQ(derived.substitution, built_in.substitution);
+  EXPECT_EQ(derived.shift_out, built_in.shift_out);
+  EXPECT_EQ(derived.shift_in, built_in.shift_in);
+  EXPECT_EQ(derived.single_byte, built_in.single_byte);
+  EXPECT_EQ(derived.shift_sensitive, built_in.shift_sensitive);
+  EXPECT_EQ(derived.utf8, built_in.utf8);
+  EXPECT_EQ(derived.one_byte_codes, built_in.one_byte_codes);
+  EXPECT_EQ(derived.ascii_transparent, built_in.ascii_transparent);
+  EXPECT_TRUE(lx::hook_free(block));
+
+  int32_t rc = LX_OK;
+  const LXObject* object = LXGetObjFromID(nullptr, LX_CODEPAGE, 1, LX_FIND_AND_LOAD, &rc);
+  ASSERT_NE(object, nullptr);
+  for (uint32_t u = 0; u <= 0xFFFF; ++u) {
+    const uint32_t expected = u < 0x80 ? u : '?';
+    char byte = 0;
+    ASSERT_EQ(LXCpUnicodeToChar(object, static_cast<uint16_t>(u), &byte), 1) << u;
+    ASSERT_EQ(static_cast<uint8_t>(byte), expected) << u;
+    ASSERT_EQ(LXCpUnicodeToCharW(object, static_cast<uint16_t>(u)), expected) << u;
+  }
+  EXPECT_EQ(LXTerm(), LX_OK);
+  EXPECT_EQ(hooks.live_blocks(), 0u);
+}
+
+}  // namespace

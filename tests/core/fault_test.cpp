@@ -1,0 +1,404 @@
+// Faults: every allocation failing, once and from then on, through whole lives of the library; every truncation
+// of the files of a locale directory and every byte of them changed. Each fault gives a documented code or is
+// harmless, and nothing is left behind. The file sweeps find their errors under the sanitizers.
+#include <cstring>
+#include <filesystem>
+#include <fstream>
+#include <memory>
+#include <set>
+
+#include "core/library_fixture.h"
+#include "core/lxformat.h"
+#include "core/lxobjtypes.h"
+#include "core/small_codepages.h"
+
+namespace lx::test {
+namespace {
+
+constexpr char kName[] = "English_UnitedStates.Under test@BINARY";
+constexpr uint16_t kTestedId = 900;
+
+/// A copy in a block of exactly its size, so that a sanitizer sees a byte read behind it.
+struct ExactText {
+  explicit ExactText(const std::string& text)
+      : bytes(static_cast<int32_t>(text.size())), data(new char[text.size()]) {
+    memcpy(data.get(), text.data(), text.size());
+  }
+  const char* end() const { return data.get() + bytes; }
+  int32_t bytes;
+  std::unique_ptr<char[]> data;
+};
+
+std::string all_bytes() {
+  std::string text;
+  for (int round = 0; round < 2; ++round)
+    for (int b = 0; b < 256; ++b) text.push_back(static_cast<char>(round == 0 ? b : 255 - b));
+  return text;
+}
+
+/// Walks and converts a text that ends anywhere, in every form.
+void use_text(LXLocale* locale, const std::string& text) {
+  const ExactText exact(text);
+  const char* const data = exact.data.get();
+  LXUChar unicode[1100];
+  LXWChar codes[1100];
+  char bytes[5200];
+  LXShiftState end_state = LX_SHIFT_SINGLE;
+  EXPECT_LE(LXMoveStringPointer(locale, data, exact.bytes, 0), exact.end());
+  const int32_t units = LXStringToUnicode(unicode, 1100, locale, data, exact.bytes, 0);
+  ASSERT_GE(units, 0);
+  EXPECT_LE(units, exact.bytes);
+  const int32_t wide = LXMbToWide(locale, codes, 1100, data, exact.bytes, 0);
+  EXPECT_EQ(wide, LXNumChars(locale, data, exact.bytes));
+  EXPECT_GE(LXWideToMb(locale, bytes, sizeof(bytes), codes, wide, 0), 0);
+  for (LXShiftState state : {LX_SHIFT_SINGLE, LX_SHIFT_DOUBLE}) {
+    EXPECT_LE(LXMoveStringPointerEx(locale, data, state, exact.bytes, &end_state, 0), exact.end());
+    EXPECT_GE(LXStringToUnicodeEx(unicode, 1100, locale, data, state, exact.bytes, 0), 0);
+    EXPECT_GE(LXMbToWideEx(locale, codes, 1100, data, state, exact.bytes, 0), 0);
+    EXPECT_GE(LXUnicodeToStringEx(locale, bytes, state, sizeof(bytes), unicode, units, LX_TERMINATE), 0);
+    EXPECT_GE(LXConvertStringEx(locale, bytes, state, 300, locale, data, state, exact.bytes, LX_TERMINATE), 0);
+  }
+}
+
+void use_stream(LXLocale* locale, const std::string& text) {
+  LXConversion* conversion = LXOpenConversion(locale, locale);
+  ASSERT_NE(conversion, nullptr);
+  size_t at = 0;
+  for (int steps = 0; at < text.size(); ++steps) {
+    ASSERT_LT(steps, 5000) << "the stream stands still";
+    const ExactText piece(text.substr(at, 5));
+    const char* input = piece.data.get();
+    char out[8];
+    char* output = out;
+    int32_t input_left = piece.bytes, output_left = sizeof(out);
+    LXConvertBuffer(conversion, &output, &output_left, &input, &input_left);
+    at += static_cast<size_t>(piece.bytes - input_left);
+  }
+  EXPECT_EQ(LXCloseConversion(conversion), 0);
+}
+
+/// Everything that a codepage's tables answer, for every first byte and a sample of every Unicode page.
+void use_locale(LXLocale* locale, bool thorough) {
+  const std::string text = all_bytes();
+  // With what follows cut at every length that a character may have.
+  for (size_t cut = 0; cut < (thorough ? 4u : 1u); ++cut) use_text(locale, text.substr(0, text.size() - cut));
+  use_stream(locale, text);
+  for (int first = 1; first < 256; ++first) {
+    const std::string start(1, static_cast<char>(first));
+    // The last character of a text, as long as its first byte or its state says.
+    for (const char* second : {"\x40", "\x42", "\xFF"}) {
+      const std::string character = start + std::string(3, *second);
+      const int32_t length = LXByteLength(locale, character.c_str());
+      ASSERT_GE(length, 1);
+      ASSERT_LE(length, 4);
+      const ExactText last(character.substr(0, static_cast<size_t>(length)));
+      LXGetCharType(locale, last.data.get(), LX_CTYPE1);
+      LXUChar unit;
+      EXPECT_LE(LXStringToUnicode(&unit, 1, locale, last.data.get(), last.bytes, 0), 1);
+      LXGetCharTypeW(locale, LXGetChar(locale, last.data.get()), LX_CTYPE1);
+      LXGetCharTypeW(locale, static_cast<LXWChar>(first << 8 | static_cast<unsigned char>(*second)), LX_CTYPE2);
+      const std::string wide =
+          start + character.substr(0, locale->codepage->section[0][format::codepage::kWidth]);
+      const ExactText shifted(wide.substr(0, wide.size() - 1));
+      EXPECT_GE(LXStringToUnicodeEx(&unit, 1, locale, shifted.data.get(), 1, shifted.bytes, 0), 0);
+    }
+  }
+  LXUChar units[512];
+  for (int i = 0; i < 512; ++i)
+    units[i] = static_cast<LXUChar>(i / 2 << 8 | (i % 2 == 0 ? i * 7 & 0xFF : 0x40 + i % 8));
+  char bytes[5 * 512 + 8];
+  LXWChar codes[512];
+  EXPECT_GE(LXUnicodeToString(locale, bytes, sizeof(bytes), units, 512, 0), 0);
+  EXPECT_EQ(LXUnicodeToStringW(locale, codes, 512, units, 512, 0), 512);
+}
+
+class FaultTest : public LibraryTest {
+ protected:
+  void write_directory(const std::vector<ByteString>& tested = small_double_byte_codepage(),
+                       uint16_t id = kTestedId) {
+    directory.write_locale(
+        {{id, "Under test", tested}, {static_cast<uint16_t>(id + 1), "Old", version1_ascii_codepage(), 1}});
+    directory.write_text("alias.txt", "Under test one two\nOld three\n");
+  }
+
+  /// A whole life of the library: documented codes, and nothing is left at its end.
+  void live();
+  void use_locales();
+  void expect_created(LXLocale* locale, int32_t rc);
+
+  /// Changes one file in every way, and uses what can still be used.
+  void sweep(const std::string& file, bool refused_when_cut);
+  void cut_everywhere(const std::string& file, bool refused);
+  void change_everywhere(const std::string& file);
+  void use_damaged_directory();
+};
+
+void FaultTest::expect_created(LXLocale* locale, int32_t rc) {
+  EXPECT_EQ(locale != nullptr, rc == LX_OK) << rc;
+  if (locale == nullptr) {
+    EXPECT_EQ(rc, LX_E_MEMORY);
+    EXPECT_TRUE(hooks.failed());
+    return;
+  }
+  const size_t before = hooks.live_blocks();
+  LXConversion* conversion = LXOpenConversion(locale, locale);
+  if (conversion != nullptr) {
+    EXPECT_EQ(LXCloseConversion(conversion), 0);
+  } else {
+    EXPECT_EQ(LXGetError(locale), LX_E_MEMORY);
+  }
+  char bytes[8];
+  EXPECT_EQ(LXConvertString(locale, bytes, 8, locale, "abc", 3, 0), 3);
+  EXPECT_EQ(hooks.live_blocks(), before);
+  EXPECT_EQ(LXReleaseLocale(locale), 0);
+}
+
+void FaultTest::use_locales() {
+  const std::string name = kName;
+  const std::vector<LXWChar> wide(name.c_str(), name.c_str() + name.size() + 1);
+  const std::vector<LXUChar> unicode(name.c_str(), name.c_str() + name.size() + 1);
+  int32_t rc = -1;
+  LXLocale* locale = LXGetLocale(name.c_str(), 0, &rc);
+  expect_created(locale, rc);
+  locale = LXGetLocaleW(wide.data(), LX_FALLBACK, &rc);
+  expect_created(locale, rc);
+  locale = LXGetLocaleU(unicode.data(), 0, &rc);
+  expect_created(locale, rc);
+  locale = LXGetLocaleU(std::vector<LXUChar>(300, 0).data(), 0, &rc);
+  expect_created(locale, rc);
+  locale = LXGetLocale("English.Old", 0, &rc);
+  expect_created(locale, rc);
+  locale = LXGetLocale(nullptr, LX_USER_LOCALE, &rc);
+  expect_created(locale, rc);
+  for (int32_t code : {LXSetLocale("", 0), LXSetLocaleW(wide.data(), 0), LXSetLocaleU(unicode.data(), 0)})
+    EXPECT_TRUE(code == LX_OK || (code == LX_E_MEMORY && hooks.failed())) << code;
+  LXObjManager* own = LXInitObjManager(directory.path().c_str(), 0, &rc);
+  EXPECT_EQ(own != nullptr, rc == LX_OK);
+  if (own != nullptr) {
+    EXPECT_EQ(LXTermObjManager(own), LX_OK);
+  } else {
+    EXPECT_EQ(rc, LX_E_MEMORY);
+  }
+}
+
+void FaultTest::live() {
+  const int32_t code = init();
+  if (code == LX_OK) {
+    use_locales();
+    EXPECT_EQ(LXTerm(), LX_OK);
+  } else {
+    EXPECT_TRUE(code == LX_E_MEMORY || code == LX_E_NOT_INITIALIZED) << code;
+    EXPECT_TRUE(hooks.failed());
+    EXPECT_EQ(LXTerm(), LX_E_NOT_INITIALIZED);
+  }
+  EXPECT_EQ(hooks.live_blocks(), 0u);
+  EXPECT_EQ(hooks.wrong_frees(), 0u);
+}
+
+TEST_F(FaultTest, EveryAllocationFails) {
+  write_directory();
+  setenv("LX_LANG", kName, 1);
+  for (bool from_then_on : {false, true}) {
+    size_t n = 1;
+    do {
+      SCOPED_TRACE(std::string(from_then_on ? "from allocation " : "allocation ") + std::to_string(n));
+      hooks.fail_at(n++, from_then_on);
+      live();
+      ASSERT_FALSE(HasFailure());
+    } while (hooks.failed());
+    EXPECT_GT(n, 40u);
+  }
+}
+
+// Memory that is short for a moment must not leave built-in data in the place of an object.
+TEST_F(FaultTest, AFailedAllocationLeavesNoTraceInLaterLocales) {
+  write_directory();
+  bool failed = true;
+  for (size_t n = 1; failed; ++n) {
+    SCOPED_TRACE(n);
+    ASSERT_EQ(init(), LX_OK);
+    hooks.fail_at(n);
+    LXReleaseLocale(LXGetLocale(kName, 0, nullptr));
+    failed = hooks.failed();
+    hooks.fail_at(0);
+    LXLocale* locale = LXGetLocale(kName, 0, nullptr);
+    ASSERT_NE(locale, nullptr);
+    for (const LXObject* object : {locale->language, locale->territory, locale->codepage})
+      EXPECT_EQ(object->disk.flags, 0);
+    EXPECT_EQ(locale->flags & 0x1C0, 0x080);
+    EXPECT_EQ(LXReleaseLocale(locale), 0);
+    EXPECT_EQ(LXTerm(), LX_OK);
+  }
+}
+
+void FaultTest::use_damaged_directory() {
+  const int32_t code = init();
+  ASSERT_TRUE(code == LX_OK || code == LX_W_DEFAULTS) << code;
+  LXEnumLocales([](void*, int32_t, const char* name) { return strlen(name) <= 33 ? 1 : 0; }, nullptr);
+  LXGetCodepageFromAlias(nullptr, "TWO");
+  int32_t rc = -1;
+  LXLocale* locale = LXGetLocale(kName, 0, &rc);
+  static const std::set<int32_t> documented = {
+      LX_OK, LX_E_NOT_INITIALIZED, LX_E_NO_LANGUAGE, LX_E_NO_CODEPAGE, LX_E_NO_TERRITORY, LX_E_NO_SORT};
+  EXPECT_EQ(documented.count(rc), 1u) << rc;
+  EXPECT_EQ(locale != nullptr, rc == LX_OK);
+  if (locale != nullptr) {
+    // The built-in codepage is sound, whatever the file was.
+    if ((locale->codepage->disk.flags & kObjectBuiltIn) == 0) use_locale(locale, false);
+    EXPECT_EQ(LXReleaseLocale(locale), 0);
+  }
+  locale = LXGetLocale("", LX_FALLBACK, &rc);
+  if (locale != nullptr) LXReleaseLocale(locale);
+  EXPECT_EQ(LXTerm(), LX_OK);
+  EXPECT_EQ(hooks.live_blocks(), 0u);
+}
+
+void FaultTest::cut_everywhere(const std::string& file, bool refused) {
+  const std::string path = directory.file(file);
+  for (size_t bytes = directory.read(file).size(); bytes-- > 0;) {
+    SCOPED_TRACE(file + " cut to " + std::to_string(bytes));
+    std::filesystem::resize_file(path, bytes);
+    if (refused) {
+      ASSERT_EQ(init(directory.path().c_str(), LX_NO_DEFAULTS), file == "control.nls" ? LX_W_DEFAULTS : LX_OK);
+      EXPECT_EQ(LXGetLocale(kName, 0, nullptr), nullptr);
+      EXPECT_EQ(LXTerm(), LX_OK);
+      EXPECT_EQ(hooks.live_blocks(), 0u);
+    } else {
+      use_damaged_directory();
+    }
+    ASSERT_FALSE(HasFailure());
+  }
+}
+
+void FaultTest::change_everywhere(const std::string& file) {
+  const ByteString whole = directory.read(file);
+  std::fstream stream(directory.file(file), std::ios::binary | std::ios::in | std::ios::out);
+  const auto put = [&](size_t at, uint8_t value) {
+    stream.seekp(static_cast<std::streamoff>(at));
+    stream.put(static_cast<char>(value)).flush();
+  };
+  for (size_t at = 0; at < whole.size(); ++at) {
+    const std::set<uint8_t> values = {static_cast<uint8_t>(whole[at] ^ 0x01), 0, 0xFF};
+    for (uint8_t value : values) {
+      if (value == whole[at]) continue;
+      SCOPED_TRACE(file + " with " + std::to_string(value) + " at " + std::to_string(at));
+      put(at, value);
+      use_damaged_directory();
+      ASSERT_FALSE(HasFailure());
+    }
+    put(at, whole[at]);
+  }
+}
+
+void FaultTest::sweep(const std::string& file, bool refused_when_cut) {
+  const ByteString whole = directory.read(file);
+  ASSERT_FALSE(whole.empty());
+  ASSERT_NO_FATAL_FAILURE(cut_everywhere(file, refused_when_cut));
+  directory.write(file, whole);
+  ASSERT_NO_FATAL_FAILURE(change_everywhere(file));
+  ASSERT_EQ(init(), LX_OK);
+  LXLocale* locale = LXGetLocale(kName, 0, nullptr);
+  ASSERT_NE(locale, nullptr) << "the file is sound when nothing is changed";
+  EXPECT_EQ(locale->codepage->disk.flags, 0);
+  use_locale(locale, true);
+  EXPECT_EQ(LXReleaseLocale(locale), 0);
+}
+
+TEST_F(FaultTest, ControlFile) {
+  write_directory();
+  sweep("control.nls", true);
+}
+TEST_F(FaultTest, AliasFile) {
+  write_directory();
+  sweep("alias.txt", false);
+}
+TEST_F(FaultTest, Language) {
+  write_directory();
+  sweep("la_00001.nls", true);
+}
+TEST_F(FaultTest, Territory) {
+  write_directory();
+  sweep("te_00840.nls", true);
+}
+TEST_F(FaultTest, SingleByteCodepage) {
+  write_directory(ascii_codepage());
+  sweep("cp_00900.nls", true);
+}
+TEST_F(FaultTest, DoubleByteCodepage) {
+  write_directory();
+  sweep("cp_00900.nls", true);
+}
+TEST_F(FaultTest, ShiftCodepage) {
+  write_directory(small_shift_codepage());
+  sweep("cp_00900.nls", true);
+}
+TEST_F(FaultTest, Version1Codepage) {
+  write_directory();
+  directory.write("cp_00900.nls", object_file(version1_ascii_codepage(), 1));
+  cut_everywhere("cp_00900.nls", true);
+}
+
+// Tables that a single changed byte does not make: each is refused, or reads no byte behind its text.
+TEST_F(FaultTest, CraftedCodepages) {
+  namespace cp = lx::format::codepage;
+  struct Case {
+    const char* what;
+    uint16_t id;
+    std::vector<ByteString> sections;
+  };
+  std::vector<Case> cases;
+
+  // A character of two bytes whose walk takes three, where the double-byte state is three bytes wide.
+  std::vector<ByteString> sections = small_double_byte_codepage(0x41);
+  sections[0][cp::kWidth] = 3;
+  put_le16(sections[0].data() + cp::kFlags, cp::kFlagAscii | cp::kFlagShift);
+  sections[1].clear();
+  SectionWriter trie(sections[1]);
+  trie.node(false, 0x00, 0x00, 0xFF, 1);
+  trie.node(false, 0x00, 0x00, 0xFF, 2);
+  trie.node(true, 0x00, 0x00, 0xFF, 0);
+  put_le16(sections[0].data() + cp::kUnicodeValues, static_cast<uint16_t>(trie.size()));
+  trie.word(0x3040);
+  cases.push_back({"a walk longer than the character", 900, sections});
+
+  // The same in the type trie.
+  sections = small_double_byte_codepage(0x41);
+  sections[0][cp::kWidth] = 3;
+  put_le16(sections[0].data() + cp::kFlags, cp::kFlagAscii | cp::kFlagShift);
+  put_le16(sections[0].data() + cp::kTypeTrie, static_cast<uint16_t>(sections[0].size()));
+  SectionWriter types(sections[0]);
+  types.type_node(false, 0, 1);
+  types.type_node(false, 0, 2);
+  types.type_node(true, 0, 0);
+  put_le16(sections[0].data() + cp::kTypeRecords, static_cast<uint16_t>(types.size()));
+  types.dword(1);
+  types.dword(0);
+  cases.push_back({"a type walk longer than the character", 900, sections});
+
+  // The formula of UTF-8 reads up to three bytes, whatever the double-byte state's width is.
+  for (uint8_t width : {uint8_t{1}, uint8_t{2}}) {
+    sections = width == 1 ? ascii_codepage() : small_shift_codepage();
+    put_le16(sections[0].data() + cp::kFlags, cp::kFlagAscii | cp::kFlagShift);
+    cases.push_back({"UTF-8 with a shift state", cp::kUtf8Id, sections});
+  }
+
+  // Tries that loop.
+  sections = small_double_byte_codepage();
+  put_le16(sections[1].data() + 6 + 4, 0);
+  sections[1][6] = 0;
+  cases.push_back({"a trie that loops", 900, sections});
+
+  for (const Case& c : cases) {
+    SCOPED_TRACE(c.what);
+    write_directory(c.sections, c.id);
+    ASSERT_EQ(init(), LX_OK);
+    LXLocale* locale = LXGetLocale(kName, 0, nullptr);
+    ASSERT_NE(locale, nullptr);
+    expect_in_child(c.what, [locale] { use_locale(locale, true); });
+    EXPECT_EQ(LXReleaseLocale(locale), 0);
+    EXPECT_EQ(LXTerm(), LX_OK);
+  }
+}
+
+}  // namespace
+}  // namespace lx::test

@@ -1,0 +1,105 @@
+// What most tests of the core start from: a scratch locale directory, hooks that know every block, an
+// environment without the library's variables, and a check at the end that nothing is left behind.
+#pragma once
+
+#include <gtest/gtest-spi.h>
+#include <gtest/gtest.h>
+#include <unistd.h>
+
+#include <cstdio>
+#include <cstdlib>
+#include <functional>
+#include <string>
+#include <vector>
+
+#include "core/lxrecords.h"
+#include "lx.h"
+#include "platform/ras1.h"
+#include "platform/recording_ras1.h"
+#include "support/hooks.h"
+#include "support/object_files.h"
+
+namespace lx::test {
+
+/// Runs `action` with its assertions in a process of its own, so that a crash, or the end that a sanitizer
+/// makes, is one failure.
+inline void expect_in_child(const char* what, const std::function<void()>& action) {
+  SCOPED_TRACE(what);
+  const auto run = [&] {
+    ::testing::TestPartResultArray failures;
+    {
+      ::testing::ScopedFakeTestPartResultReporter reporter(
+          ::testing::ScopedFakeTestPartResultReporter::INTERCEPT_ALL_THREADS, &failures);
+      action();
+    }
+    for (int i = 0; i < failures.size(); ++i) fprintf(stderr, "%s\n", failures.GetTestPartResult(i).message());
+    return failures.size();
+  };
+  EXPECT_EXIT(_exit(run() == 0 ? 0 : 3), ::testing::ExitedWithCode(0), "");
+}
+
+class LibraryTest : public ::testing::Test {
+ protected:
+  void SetUp() override { clear_environment(); }
+
+  void TearDown() override {
+    terminate();
+    EXPECT_EQ(hooks.live_blocks(), 0u);
+    EXPECT_EQ(hooks.wrong_frees(), 0u);
+    clear_environment();
+    RecordingTrace::set_level(0);
+    RecordingTrace::take();
+  }
+
+  int32_t init(const char* path, uint32_t options = 0) {
+    return LXInit(path, Hooks::allocate, Hooks::release, &hooks, options);
+  }
+  int32_t init() { return init(directory.path().c_str()); }
+
+  /// English, UnitedStates and one codepage, the common one.
+  int32_t init_with_locale() {
+    directory.write_locale({{367, "US-ASCII", ascii_codepage()}});
+    return init();
+  }
+
+  static void terminate() {
+    while (LXTerm() != LX_E_NOT_INITIALIZED) {
+    }
+  }
+
+  static LXObjManager* manager() { return lx::globals.area->manager; }
+
+  /// The texts of the messages that `action` causes while the level is `level`.
+  static std::vector<std::string> messages(uint32_t level, const std::function<void()>& action) {
+    RecordingTrace::take();
+    RecordingTrace::set_level(level);
+    action();
+    RecordingTrace::set_level(0);
+    std::vector<std::string> texts;
+    for (const TraceRecord& record : RecordingTrace::take())
+      if (record.kind == TraceRecord::kMessage) texts.push_back(record.text);
+    return texts;
+  }
+
+  /// The paths that `action` opens, in order.
+  static std::vector<std::string> opened(const std::function<void()>& action) {
+    const std::string prefix = "Opening file ";
+    std::vector<std::string> paths;
+    for (const std::string& text : messages(RAS1_LEVEL_INPUT, action))
+      if (text.rfind(prefix, 0) == 0) paths.push_back(text.substr(prefix.size()));
+    return paths;
+  }
+
+  Hooks hooks;
+  ScratchDirectory directory;
+
+ private:
+  static void clear_environment() {
+    unsetenv("LX_LOCALEDIR");
+    unsetenv("LX_LANG");
+  }
+};
+
+inline constexpr char kDefaultControl[] = "/Tessarin/locale/control.nls";
+
+}  // namespace lx::test

@@ -1,0 +1,505 @@
+// Locale handles: names in all three forms, defaults and fallback, the default locale, enumeration, the
+// operating system's name, release.
+#include <algorithm>
+#include <cstring>
+#include <type_traits>
+
+#include "core/library_fixture.h"
+#include "core/lxformat.h"
+#include "core/lxobjtypes.h"
+#include "core/small_codepages.h"
+
+namespace lx::test {
+namespace {
+
+namespace words = lx::format::language;
+
+class LocaleTest : public LibraryTest {
+ protected:
+  static constexpr uint16_t kShiftId = 930;
+  static constexpr uint16_t kSortId = 5;
+
+  /// The built-in language with other defaults.
+  static ByteString language(uint16_t territory, uint16_t codepage, uint16_t sort) {
+    const Bytes built_in = kBuiltInLanguage.sections.section[0];
+    ByteString payload(built_in.data, built_in.data + built_in.size);
+    put_le16(payload.data() + 2 * words::kDefaultTerritory, territory);
+    put_le16(payload.data() + 2 * words::kDefaultCodepage, codepage);
+    put_le16(payload.data() + 2 * words::kDefaultSort, sort);
+    return object_file({payload});
+  }
+
+  // English: 840, 367, binary. French: 250, 850, sort 5. Odd: defaults that are not there, although objects of
+  // other types stand where they would be.
+  void write_directory() {
+    const Bytes territory = kBuiltInTerritory.sections.section[0];
+    const ByteString territory_file =
+        object_file({ByteString(territory.data, territory.data + territory.size)});
+    directory.write("la_00001.nls", language(840, 367, 0));
+    directory.write("la_00002.nls", language(250, 850, kSortId));
+    directory.write("la_00003.nls", language(9999, 367, 0));
+    directory.write("la_00004.nls", language(840, 9999, 0));
+    directory.write("la_00005.nls", language(840, 367, 9999));
+    directory.write("te_00250.nls", territory_file);
+    directory.write("te_00840.nls", territory_file);
+    directory.write("cp_00367.nls", object_file(ascii_codepage()));
+    directory.write("cp_00850.nls", object_file(small_double_byte_codepage()));
+    directory.write("cp_00930.nls", object_file(small_shift_codepage()));
+    directory.write("so_00005.nls", object_file({{1, 2, 3, 4}}));
+    directory.write("control.nls", control_file({{1, LX_LANGUAGE, "English"},
+                                                 {2, LX_LANGUAGE, "French"},
+                                                 {3, LX_LANGUAGE, "NoTerritory"},
+                                                 {4, LX_LANGUAGE, "NoCodepage"},
+                                                 {5, LX_LANGUAGE, "NoSort"},
+                                                 {250, LX_TERRITORY, "France"},
+                                                 {840, LX_TERRITORY, "UnitedStates"},
+                                                 {367, LX_CODEPAGE, "US-ASCII"},
+                                                 {850, LX_CODEPAGE, "Tiny"},
+                                                 {kShiftId, LX_CODEPAGE, "Shift"},
+                                                 {kSortId, LX_SORT, "Default"}}));
+  }
+  void init_directory() {
+    write_directory();
+    ASSERT_EQ(init(), LX_OK);
+  }
+
+  /// The identifiers of a locale's four objects, and its flags.
+  static std::string describe(const LXLocale* locale) {
+    if (locale == nullptr) return "none";
+    std::string text;
+    for (const LXObject* object : {locale->language, locale->territory, locale->codepage, locale->sort})
+      text += (object != nullptr ? std::to_string(object->disk.id) : "-") + " ";
+    char flags[16];
+    snprintf(flags, sizeof(flags), "%X", locale->flags & 0x1C0u);
+    return text + flags;
+  }
+
+  enum Form { kBytes, kWide, kUnicode, kForms };
+  static LXLocale* create(Form form, const std::string& name, int32_t flags, int32_t* rc) {
+    const std::vector<LXWChar> wide(name.c_str(), name.c_str() + name.size() + 1);
+    const std::vector<LXUChar> unicode(name.c_str(), name.c_str() + name.size() + 1);
+    switch (form) {
+      case kBytes:
+        return LXGetLocale(name.c_str(), flags, rc);
+      case kWide:
+        return LXGetLocaleW(wide.data(), flags, rc);
+      default:
+        return LXGetLocaleU(unicode.data(), flags, rc);
+    }
+  }
+};
+
+TEST_F(LocaleTest, Names) {
+  init_directory();
+  struct Case {
+    const char* name;
+    int32_t flags;
+    const char* objects;  // language, territory, codepage, sort, flags
+    int32_t code;
+  };
+  const char kFrench[] = "2 250 850 5 0";
+  const char kEnglish[] = "1 840 367 - C0";
+  const Case cases[] = {
+      {"", 0, kEnglish, LX_OK},
+      {"English", 0, kEnglish, LX_OK},
+      {"French", 0, kFrench, LX_OK},
+      {"fRENCH_france.TINY@default", 0, kFrench, LX_OK},
+      {"English_UnitedStates.US-ASCII@BINARY", 0, kEnglish, LX_OK},
+      {"French_UnitedStates", 0, "2 840 850 5 0", LX_OK},
+      {"French.US-ASCII", 0, "2 250 367 5 40", LX_OK},
+      {"French@Binary", 0, "2 250 850 - 80", LX_OK},
+      {"French_UnitedStates@binary", 0, "2 840 850 - 80", LX_OK},
+      {"French.Shift", 0, "2 250 930 5 100", LX_OK},
+      {"_France", 0, "1 250 367 - C0", LX_OK},
+      {".Tiny", 0, "1 840 850 - 80", LX_OK},
+      {"@Default", 0, "1 840 367 5 40", LX_OK},
+      {"_France.Tiny@Default", 0, "1 250 850 5 0", LX_OK},
+      // Nothing is found under these names.
+      {"German", 0, "none", LX_E_NO_LANGUAGE},
+      {"France", 0, "none", LX_E_NO_LANGUAGE},
+      {"Eng", 0, "none", LX_E_NO_LANGUAGE},
+      {"German_Nowhere.None@None", 0, "none", LX_E_NO_LANGUAGE},
+      {"French_Nowhere.None@None", 0, "none", LX_E_NO_TERRITORY},
+      {"French_France.None@None", 0, "none", LX_E_NO_CODEPAGE},
+      {"French_France.Tiny@None", 0, "none", LX_E_NO_SORT},
+      {"French@Default.Tiny", 0, "none", LX_E_NO_SORT},
+      {"French_France@Default.Tiny", 0, "none", LX_E_NO_SORT},
+      {"French.Tiny_France", 0, "none", LX_E_NO_CODEPAGE},
+      {"French@Default@", 0, "none", LX_E_NO_SORT},
+      // Fallback: English, and the defaults of the language.
+      {"German", LX_FALLBACK, kEnglish, LX_OK},
+      {"French_Nowhere", LX_FALLBACK, kFrench, LX_OK},
+      {"French_UnitedStates.None", LX_FALLBACK, "2 840 850 5 0", LX_OK},
+      {"French@None", LX_FALLBACK, kFrench, LX_OK},
+      {"German_France.Tiny@Default", LX_FALLBACK, "1 250 850 5 0", LX_OK},
+      {"French_Nowhere.None@None", LX_FALLBACK, kFrench, LX_OK},
+      {"French_France.US-ASCII@BINARY", LX_FALLBACK, "2 250 367 - C0", LX_OK},
+      // Defaults that are not there; an object of another type does not count.
+      {"NoTerritory", 0, "none", LX_E_NO_TERRITORY},
+      {"NoTerritory", LX_FALLBACK, "none", LX_E_NO_TERRITORY},
+      {"NoTerritory_France", 0, "3 250 367 - C0", LX_OK},
+      {"NoCodepage", LX_FALLBACK, "none", LX_E_NO_CODEPAGE},
+      {"NoCodepage.Tiny", 0, "4 840 850 - 80", LX_OK},
+      {"NoSort", LX_FALLBACK, "none", LX_E_NO_SORT},
+      {"NoSort@BINARY", 0, "5 840 367 - C0", LX_OK},
+      // Undefined flags.
+      {"English", 0x1, "none", LX_E_INVALID},
+      {"English", 0x8 | LX_FALLBACK, "none", LX_E_INVALID},
+      {"English", INT32_MIN, "none", LX_E_INVALID},
+  };
+  for (const Case& c : cases) {
+    for (int form = kBytes; form < kForms; ++form) {
+      SCOPED_TRACE(std::string(c.name) + ", flags " + std::to_string(c.flags) + ", form " +
+                   std::to_string(form));
+      const size_t blocks = hooks.live_blocks();
+      int32_t rc = -1;
+      LXLocale* locale = create(static_cast<Form>(form), c.name, c.flags, &rc);
+      EXPECT_EQ(describe(locale), c.objects);
+      EXPECT_EQ(rc, c.code);
+      if (locale != nullptr) {
+        EXPECT_EQ(LXGetError(locale), LX_OK);
+        EXPECT_EQ(locale->changed, 0u);
+        EXPECT_EQ(locale->changed_unicode, 0);
+        EXPECT_EQ(LXReleaseLocale(locale), 0);
+      } else if (c.code == LX_E_INVALID) {
+        EXPECT_EQ(hooks.live_blocks(), blocks);
+      }
+    }
+  }
+  EXPECT_EQ(LXGetLocale("German", 0, nullptr), nullptr) << "the code is not wanted";
+  EXPECT_EQ(LXReleaseLocale(LXGetLocale(nullptr, 0, nullptr)), 0);
+}
+
+// A default that exists only as an object of another type, next to the empty range, is not found.
+TEST_F(LocaleTest, AnObjectOfAnotherTypeIsNotFound) {
+  struct Case {
+    const char* what;
+    uint16_t territory, codepage, sort;
+    std::vector<ControlRecord> records;
+    int32_t code;
+  };
+  const Case cases[] = {
+      {"territory",
+       7,
+       367,
+       0,
+       {{7, LX_LANGUAGE, "English"}, {367, LX_CODEPAGE, "US-ASCII"}},
+       LX_E_NO_TERRITORY},
+      {"codepage",
+       840,
+       840,
+       0,
+       {{7, LX_LANGUAGE, "English"}, {840, LX_TERRITORY, "UnitedStates"}},
+       LX_E_NO_CODEPAGE},
+      {"sort",
+       840,
+       367,
+       367,
+       {{7, LX_LANGUAGE, "English"}, {840, LX_TERRITORY, "UnitedStates"}, {367, LX_CODEPAGE, "US-ASCII"}},
+       LX_E_NO_SORT},
+  };
+  write_directory();
+  for (const Case& c : cases) {
+    SCOPED_TRACE(c.what);
+    directory.write("la_00007.nls", language(c.territory, c.codepage, c.sort));
+    directory.write("control.nls", control_file(c.records));
+    ASSERT_EQ(init(), LX_OK);
+    for (int32_t flags : {0, int32_t{LX_FALLBACK}}) {
+      int32_t rc = -1;
+      EXPECT_EQ(LXGetLocale("English", flags, &rc), nullptr);
+      EXPECT_EQ(rc, c.code);
+    }
+    EXPECT_EQ(LXTerm(), LX_OK);
+  }
+}
+
+TEST_F(LocaleTest, ObjectsAreShared) {
+  init_directory();
+  LXLocale* one = LXGetLocale("French", 0, nullptr);
+  LXLocale* two = LXGetLocale("French", 0, nullptr);
+  ASSERT_NE(one, nullptr);
+  ASSERT_NE(two, nullptr);
+  EXPECT_NE(one, two);
+  EXPECT_EQ(one->codepage, two->codepage);
+  EXPECT_EQ(LXReleaseLocale(one), 0);
+  EXPECT_EQ(LXNumChars(two, "\x81\x40x", -1), 2);
+  EXPECT_EQ(LXReleaseLocale(two), 0);
+}
+
+TEST_F(LocaleTest, OtherCodesOfLookUps) {
+  write_directory();
+  struct Case {
+    const char* file;
+    bool stands_in;
+  };
+  for (const Case& c : {Case{"te_00250.nls", true}, Case{"cp_00850.nls", true}, Case{"so_00005.nls", false}}) {
+    SCOPED_TRACE(c.file);
+    const ByteString content = directory.read(c.file);
+    directory.write(c.file, {});
+    for (uint32_t options : {0u, LX_NO_DEFAULTS}) {
+      ASSERT_EQ(init(directory.path().c_str(), options), LX_OK);
+      const bool created = c.stands_in && options == 0;
+      for (int32_t flags : {0, int32_t{LX_FALLBACK}}) {
+        int32_t rc = -1;
+        LXLocale* locale = LXGetLocale("French_France.Tiny@Default", flags, &rc);
+        EXPECT_EQ(locale != nullptr, created);
+        EXPECT_EQ(rc, created ? LX_OK : LX_E_NOT_INITIALIZED)
+            << "built-in data are no failure, other codes are 11";
+        if (locale != nullptr) LXReleaseLocale(locale);
+      }
+      EXPECT_EQ(LXTerm(), LX_OK);
+    }
+    directory.write(c.file, content);
+  }
+}
+
+TEST_F(LocaleTest, UserLocale) {
+  init_directory();
+  for (int form = kBytes; form < kForms; ++form) {
+    SCOPED_TRACE(form);
+    const auto user = [&](int32_t flags, int32_t* rc) {
+      LXLocale* locale = create(static_cast<Form>(form), "English", LX_USER_LOCALE | flags, rc);
+      const std::string text = describe(locale);
+      LXReleaseLocale(locale);
+      return text;
+    };
+    int32_t rc = -1;
+    unsetenv("LX_LANG");
+    EXPECT_EQ(user(0, &rc), "none");
+    EXPECT_EQ(rc, LX_E_NO_NATIVE);
+    setenv("LX_LANG", "French_UnitedStates", 1);
+    EXPECT_EQ(user(0, &rc), "2 840 850 5 0");
+    EXPECT_EQ(rc, LX_OK);
+    setenv("LX_LANG", "German_France", 1);
+    EXPECT_EQ(user(0, &rc), "none");
+    EXPECT_EQ(rc, LX_E_NO_LANGUAGE);
+    EXPECT_EQ(user(LX_FALLBACK, &rc), "1 250 367 - C0");
+    EXPECT_EQ(user(0x10, &rc), "none");
+    EXPECT_EQ(rc, LX_E_INVALID);
+    setenv("LX_LANG", ("French@" + std::string(500, 'x')).c_str(), 1);
+    EXPECT_EQ(user(0, &rc), "none");
+    EXPECT_EQ(rc, LX_E_NO_SORT);
+  }
+}
+
+// The 16-bit name goes through the common codepage; where there is none, the name is empty.
+TEST_F(LocaleTest, UnicodeNamesNeedTheCommonCodepage) {
+  write_directory();
+  directory.write("la_00001.nls", language(840, 850, 0));
+  directory.write("control.nls", control_file({{1, LX_LANGUAGE, "English"},
+                                               {2, LX_LANGUAGE, "French"},
+                                               {250, LX_TERRITORY, "France"},
+                                               {840, LX_TERRITORY, "UnitedStates"},
+                                               {850, LX_CODEPAGE, "Tiny"},
+                                               {kSortId, LX_SORT, "Default"}}));
+  ASSERT_EQ(init(), LX_OK);
+  int32_t rc = -1;
+  LXLocale* locale = create(kUnicode, "French", 0, &rc);
+  EXPECT_EQ(describe(locale), "1 840 850 - 80");
+  EXPECT_EQ(rc, LX_OK);
+  LXReleaseLocale(locale);
+}
+
+TEST_F(LocaleTest, LongNames) {
+  init_directory();
+  const std::string name = "French@" + std::string(100000, 'x');
+  for (int form = kBytes; form < kForms; ++form) {
+    int32_t rc = -1;
+    EXPECT_EQ(create(static_cast<Form>(form), name, 0, &rc), nullptr);
+    EXPECT_EQ(rc, LX_E_NO_SORT);
+    LXLocale* locale = create(static_cast<Form>(form), name, LX_FALLBACK, &rc);
+    EXPECT_EQ(describe(locale), "2 250 850 5 0");
+    LXReleaseLocale(locale);
+  }
+}
+
+TEST_F(LocaleTest, WideNamesAreNotCutToBytes) {
+  init_directory();
+  const LXWChar name[] = {'F' + 0x100, 'r', 'e', 'n', 'c', 'h', 0};
+  const LXWChar marks[] = {'F', 'r', 'e', 'n', 'c', 'h', '_' + 0x10000, 'x', 0};
+  for (const LXWChar* wide : {name, marks}) {
+    int32_t rc = -1;
+    EXPECT_EQ(LXGetLocaleW(wide, 0, &rc), nullptr);
+    EXPECT_EQ(rc, LX_E_NO_LANGUAGE);
+  }
+}
+
+TEST_F(LocaleTest, DefaultLocale) {
+  init_directory();
+  const LXWChar wide[] = {'F', 'r', 'e', 'n', 'c', 'h', 0};
+  const LXUChar unicode[] = {'F', 'r', 'e', 'n', 'c', 'h', '.', 'S', 'h', 'i', 'f', 't', 0};
+  const auto current = [] { return describe(lx::globals.default_locale); };
+
+  EXPECT_EQ(LXSetLocale("German", 0), LX_E_NO_LANGUAGE);
+  EXPECT_EQ(current(), "none");
+  EXPECT_EQ(LXSetLocale("English", 0), LX_OK);
+  EXPECT_EQ(current(), "1 840 367 - C0");
+  const size_t blocks = hooks.live_blocks();
+  struct Case {
+    int32_t result;
+    int32_t code;
+  };
+  const LXWChar wide_unknown[] = {'X', 0};
+  const LXUChar unicode_unknown[] = {'X', 0};
+  const Case failures[] = {
+      {LXSetLocale("English", 0x40), LX_E_INVALID},
+      {LXSetLocale("English_X", 0), LX_E_NO_TERRITORY},
+      {LXSetLocaleW(wide_unknown, 0), LX_E_NO_LANGUAGE},
+      {LXSetLocaleU(unicode_unknown, 0), LX_E_NO_LANGUAGE},
+      {LXSetLocale(nullptr, LX_USER_LOCALE), LX_E_NO_NATIVE},
+  };
+  for (const Case& c : failures) EXPECT_EQ(c.result, c.code);
+  EXPECT_EQ(current(), "1 840 367 - C0") << "the previous one stays";
+  EXPECT_EQ(LXNumChars(nullptr, "abc", -1), 3);
+
+  EXPECT_EQ(LXSetLocaleW(wide, 0), LX_OK);
+  EXPECT_EQ(current(), "2 250 850 5 0");
+  EXPECT_EQ(LXSetLocaleU(unicode, 0), LX_OK);
+  EXPECT_EQ(current(), "2 250 930 5 100");
+  EXPECT_EQ(LXSetLocale("German", LX_FALLBACK), LX_OK);
+  EXPECT_EQ(current(), "1 840 367 - C0");
+  // Beside the objects loaded meanwhile there is one locale, as before.
+  EXPECT_EQ(LXSetLocale("English", 0), LX_OK);
+  const size_t after = hooks.live_blocks();
+  EXPECT_EQ(LXSetLocale("English", 0), LX_OK);
+  EXPECT_EQ(hooks.live_blocks(), after);
+  EXPECT_GT(after, blocks);
+}
+
+TEST_F(LocaleTest, ReleaseReportsAnyFailingFree) {
+  init_directory();
+  EXPECT_EQ(LXReleaseLocale(nullptr), 0);
+  for (bool with_texts : {false, true}) {
+    LXLocale* locale = LXGetLocale("French", 0, nullptr);
+    ASSERT_NE(locale, nullptr);
+    if (with_texts) {
+      const auto replace = [&](auto** text) {
+        if (*text != nullptr) Hooks::release(&hooks, *text);
+        *text = static_cast<std::remove_reference_t<decltype(*text)>>(Hooks::allocate(&hooks, 4));
+      };
+      replace(&locale->grouping);
+      for (char*& text : locale->texts) replace(&text);
+      for (LXUChar*& text : locale->texts_unicode) replace(&text);
+    }
+    hooks.fail_frees(true);
+    EXPECT_EQ(LXReleaseLocale(locale), 1);
+    hooks.fail_frees(false);
+  }
+  // The new default is in force all the same when the previous one cannot be given back.
+  ASSERT_EQ(LXSetLocale("French", 0), LX_OK);
+  hooks.fail_frees(true);
+  EXPECT_EQ(LXSetLocale("English", 0), LX_OK);
+  hooks.fail_frees(false);
+  EXPECT_EQ(describe(lx::globals.default_locale), "1 840 367 - C0");
+}
+
+TEST_F(LocaleTest, OperatingSystemName) {
+  init_directory();
+  struct Case {
+    const char* name;
+    int32_t flags;
+    int32_t result;
+    int32_t code;
+  };
+  const Case cases[] = {
+      {"English_UnitedStates.US-ASCII@BINARY", 0, 1, LX_OK},
+      {"English_UnitedStates.US-ASCII@BINARY", LX_TERRITORY_VALUES, 1, LX_OK},
+      {"English_UnitedStates.US-ASCII@BINARY", LX_FALLBACK, 1, LX_OK},
+      {"English_UnitedStates.US-ASCII@BINARY", 0x2, 0, LX_E_INVALID},
+      {"English_UnitedStates.US-ASCII@BINARY", 0x8 | LX_FALLBACK, 0, LX_E_INVALID},
+      {"French_UnitedStates.US-ASCII@BINARY", 0, 0, LX_E_NO_NATIVE},
+      {"English_France.US-ASCII@BINARY", 0, 0, LX_E_NO_NATIVE},
+      {"English_UnitedStates.Tiny@BINARY", 0, 0, LX_E_NO_NATIVE},
+      {"English_UnitedStates.US-ASCII@Default", 0, 0, LX_E_NO_NATIVE},
+      {"French_France.Tiny@Default", LX_FALLBACK, 1, LX_OK},
+      {"English_France.Tiny", LX_FALLBACK | LX_TERRITORY_VALUES, 1, LX_OK},
+  };
+  for (const Case& c : cases) {
+    SCOPED_TRACE(c.name);
+    LXLocale* locale = LXGetLocale(c.name, 0, nullptr);
+    ASSERT_NE(locale, nullptr);
+    char buffer[12] = "#";
+    EXPECT_EQ(LXConvertLocale(locale, buffer, c.flags), c.result);
+    EXPECT_STREQ(buffer, c.result != 0 ? "C" : "#");
+    EXPECT_EQ(LXGetError(locale), c.code);
+    LXReleaseLocale(locale);
+  }
+  char buffer[12] = "#";
+  EXPECT_EQ(LXConvertLocale(nullptr, buffer, 0), 0) << "there is no default locale";
+  EXPECT_STREQ(buffer, "#");
+  ASSERT_EQ(LXSetLocale("English", 0), LX_OK);
+  EXPECT_EQ(LXConvertLocale(nullptr, buffer, 0), 1);
+}
+
+struct Listing {
+  std::vector<std::string> lines;
+  size_t limit = SIZE_MAX;
+
+  template <class Unit>
+  int32_t add(int32_t type, const Unit* name) {
+    std::string text = std::to_string(type) + " ";
+    while (*name != 0) text += static_cast<char>(*name++);
+    lines.push_back(text);
+    return lines.size() < limit ? 7 : 0;
+  }
+};
+template <class Unit>
+int32_t add_line(void* user, int32_t type, const Unit* name) {
+  return static_cast<Listing*>(user)->add(type, name);
+}
+
+TEST_F(LocaleTest, Enumeration) {
+  init_directory();
+  const std::vector<std::string> all = {"0 English", "0 French", "0 NoTerritory",  "0 NoCodepage",
+                                        "0 NoSort",  "1 France", "1 UnitedStates", "2 US-ASCII",
+                                        "2 Tiny",    "2 Shift",  "3 Default"};
+  for (size_t limit : {SIZE_MAX, size_t{1}, size_t{4}}) {
+    const std::vector<std::string> expected(all.begin(),
+                                            all.begin() + static_cast<ptrdiff_t>(std::min(limit, all.size())));
+    Listing bytes{{}, limit}, wide{{}, limit}, unicode{{}, limit};
+    EXPECT_EQ(LXEnumLocales(add_line<char>, &bytes), 0);
+    EXPECT_EQ(LXEnumLocalesW(add_line<LXWChar>, &wide), 0);
+    EXPECT_EQ(LXEnumLocalesU(add_line<LXUChar>, &unicode), 0);
+    EXPECT_EQ(bytes.lines, expected);
+    EXPECT_EQ(wide.lines, expected);
+    EXPECT_EQ(unicode.lines, expected);
+  }
+}
+
+TEST_F(LocaleTest, EnumerationOfNamesBeyondAscii) {
+  const std::string longest = "\xE9" + std::string(32, 'x');
+  directory.write("cp_00367.nls", object_file(ascii_codepage()));
+  directory.write("control.nls", control_file({{367, LX_CODEPAGE, longest}}));
+  ASSERT_EQ(init(), LX_OK);
+  std::vector<LXWChar> wide;
+  EXPECT_EQ(LXEnumLocalesW(
+                [](void* user, int32_t, const LXWChar* name) {
+                  static_cast<std::vector<LXWChar>*>(user)->assign(name, name + 34);
+                  return 1;
+                },
+                &wide),
+            0);
+  EXPECT_EQ(wide[0], 0xE9u) << "widened byte by byte, without a sign";
+  EXPECT_EQ(wide[33], 0u);
+  std::vector<LXUChar> unicode;
+  EXPECT_EQ(LXEnumLocalesU(
+                [](void* user, int32_t, const LXUChar* name) {
+                  static_cast<std::vector<LXUChar>*>(user)->assign(name, name + 34);
+                  return 1;
+                },
+                &unicode),
+            0);
+  EXPECT_EQ(unicode[0], 0xFFFD) << "through the common codepage";
+  EXPECT_EQ(unicode[32], 'x');
+  EXPECT_EQ(unicode[33], 0);
+}
+
+TEST_F(LocaleTest, EnumerationOfBuiltInObjects) {
+  ASSERT_EQ(init(), LX_W_DEFAULTS);
+  Listing list;
+  EXPECT_EQ(LXEnumLocales(add_line<char>, &list), 0);
+  EXPECT_EQ(list.lines, (std::vector<std::string>{"0 English", "1 UnitedStates", "2 US-ASCII"}));
+}
+
+}  // namespace
+}  // namespace lx::test

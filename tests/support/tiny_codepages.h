@@ -1,0 +1,137 @@
+// Small codepages built in memory, one of every kind of text, and a library that runs on a directory of them.
+// Together they use all five kinds of Unicode pages, masks of every width and nodes that are never reached.
+#pragma once
+
+#include <cstdint>
+#include <map>
+#include <string>
+#include <vector>
+
+#include "core/lxrecords.h"
+#include "support/hooks.h"
+#include "support/object_files.h"
+
+namespace lx::test {
+
+struct TinyCharacter {
+  std::string bytes;
+  uint32_t code;  // packed
+  uint16_t unicode;
+};
+
+/// A codepage and what a test may expect of it.
+struct TinyCodepage {
+  ScratchDirectory::Codepage file;
+  uint8_t width;
+  bool shift;  // shift-sensitive, with `shift_out` and `shift_in`
+  char shift_out, shift_in;
+  uint8_t substitution;
+  std::vector<uint8_t> lengths;           // by first byte
+  std::vector<TinyCharacter> characters;  // mapped both ways, by packed code
+
+  /// The bytes of a text; in a shift-sensitive codepage with the shift bytes that it needs from `*state` on,
+  /// which is left as the text leaves it.
+  std::string encode(const std::vector<uint16_t>& text, LXShiftState* state = nullptr) const;
+  const TinyCharacter* find(uint16_t unicode) const;
+};
+
+/// Makes the sections of a version-2 codepage from its mappings.
+class CodepageBuilder {
+ public:
+  CodepageBuilder(uint16_t id, std::string name, uint8_t width);
+  /// Bytes that begin characters of `length` bytes.
+  CodepageBuilder& lead(uint8_t first, uint8_t last, uint8_t length);
+  /// `count` characters from this packed code and this Unicode value on, both ways.
+  CodepageBuilder& map(uint32_t code, uint16_t unicode, unsigned count = 1);
+  CodepageBuilder& ascii() { return map(0, 0, 0x80); }
+  CodepageBuilder& shift(uint8_t out, uint8_t in);
+  CodepageBuilder& substitution(uint8_t byte);
+  /// Pages of two-byte characters are split into two arrays of bytes.
+  CodepageBuilder& two_arrays();
+  TinyCodepage build() const;
+
+ private:
+  struct Node {
+    std::map<uint8_t, Node> next;
+    bool has_value = false;
+    uint16_t unicode = 0;
+  };
+  Node tree() const;
+  void add_payload_tables(ByteString* payload) const;
+  void add_type_trie(ByteString* payload, const Node& root) const;
+  ByteString unicode_trie(ByteString* payload, const Node& root) const;
+  void add_pages(ByteString* payload, ByteString* low, ByteString* high) const;
+
+  uint16_t id_;
+  std::string name_;
+  uint8_t width_;
+  uint8_t substitution_ = '?';
+  uint8_t shift_out_ = 0, shift_in_ = 0;
+  bool shift_ = false;
+  bool two_arrays_ = false;
+  std::vector<uint8_t> lengths_;
+  std::map<uint32_t, uint16_t> to_unicode_;
+  std::map<uint16_t, uint32_t> to_code_;
+};
+
+/// ASCII and U+00A0 to U+00FF, with the euro sign in place of U+00A4.
+TinyCodepage tiny_single();
+/// One and two bytes; second bytes that are ASCII letters; single-byte katakana.
+TinyCodepage tiny_shift_jis();
+/// One to three bytes; 0x5C is the yen sign, so that ASCII is not copied as it is.
+TinyCodepage tiny_euc();
+/// One, two and four bytes.
+TinyCodepage tiny_four();
+/// EBCDIC with two-byte characters between 0x0E and 0x0F.
+TinyCodepage tiny_shift();
+/// UTF-8, computed; one to three bytes.
+TinyCodepage tiny_utf8();
+/// All of these, and US-ASCII with the identifier 367.
+std::vector<TinyCodepage> tiny_codepages();
+
+/// The library on a scratch directory. Bad files are refused, not replaced by the built-in codepage.
+class TinyLibrary {
+ public:
+  explicit TinyLibrary(const std::vector<TinyCodepage>& codepages = tiny_codepages());
+  ~TinyLibrary() { close(); }
+  TinyLibrary(const TinyLibrary&) = delete;
+  TinyLibrary& operator=(const TinyLibrary&) = delete;
+
+  /// Releases everything: whether each block came back, once.
+  bool close();
+  Hooks& hooks() { return hooks_; }
+
+  /// A locale of this codepage, kept to the end; throws when there is none.
+  LXLocale* locale(const TinyCodepage& codepage);
+  /// The loaded codepage, or null with the code.
+  const LXObject* object(uint16_t id, int32_t* rc);
+  const LXObject* object(const TinyCodepage& codepage);
+
+ private:
+  ScratchDirectory directory_;
+  Hooks hooks_;
+  std::map<std::string, LXLocale*> locales_;
+  bool open_ = false;
+};
+
+/// A codepage object and a locale of it without a file: the sections in blocks of their exact sizes, validated
+/// and derived as loading does. The library must be initialised.
+class CodepageObject {
+ public:
+  CodepageObject(uint16_t id, const std::vector<ByteString>& sections);
+  ~CodepageObject();
+  CodepageObject(const CodepageObject&) = delete;
+  CodepageObject& operator=(const CodepageObject&) = delete;
+
+  int32_t code() const { return code_; }  // of the validation; there is no object unless it is 0
+  const LXObject* object() const { return &object_; }
+  LXLocale* locale() { return &locale_; }
+
+ private:
+  std::vector<ByteString> sections_;
+  LXObject object_{};
+  LXLocale locale_{};
+  int32_t code_;
+};
+
+}  // namespace lx::test
