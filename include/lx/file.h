@@ -21,7 +21,8 @@ enum { LX_FROM_START = 10, LX_FROM_HERE = 11, LX_FROM_END = 12 };
 LX_API LXFile* LXOpenFile(int32_t context, const char* path, int32_t mode, int32_t no_temporary, int32_t* rc);
 
 /* Closes the file and frees the handle. A temporary file replaces its target, or is removed when
- * `discard` is 1. Returns 0, or non-zero when closing or replacing failed. */
+ * `discard` is 1. Returns 0, -1 when closing failed, or 21 when the free hook failed; a target that could
+ * not be replaced stays as it was and is reported in the trace only. */
 LX_API int32_t LXCloseFile(LXFile* file, int32_t discard);
 
 /* Reads up to `bytes` bytes into `buffer`. Returns the number read, 0 at the end of the file and on

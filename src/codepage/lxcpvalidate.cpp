@@ -153,12 +153,13 @@ class Validator {
     return {sections_.section[1], fmt::kNodeBytes, rest_of(sections_.section[1], word(fmt::kUnicodeValues)), 2};
   }
 
-  /// A walk may take as many bytes as the character that begins with its first byte has.
+  /// A walk may take as many bytes as the character that begins with its first byte has. One-byte characters
+  /// are walked in the double-byte state only, where they begin one of the width.
   int32_t check_trie(const Trie& trie) const {
     TrieCheck check(trie);
     if (check.out_of_memory()) return LX_E_MEMORY;
     for (unsigned byte = 0; byte < kAnyByte; ++byte) {
-      const size_t limit = shift_ || length(byte) < 2 ? width_ : length(byte);
+      const size_t limit = length(byte) < 2 ? width_ : length(byte);
       if (check.walk_bytes(byte, limit) == 0) return LX_E_CORRUPT;
     }
     return LX_OK;

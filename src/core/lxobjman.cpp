@@ -103,7 +103,7 @@ uint8_t* read_records(LXFile* file, size_t* bytes, int32_t* rc) {
 }
 
 /// Fills the entry table and the type ranges. Types without entries get the index of the next type that has
-/// some. A record of a type that does not exist belongs to no range.
+/// some. A record of an unknown type stands in a range of another one, where look-ups by name pass it over.
 void fill_entries(LXObjManager* manager, const uint8_t* records) {
   LX_TRACE(unit, RAS1_LEVEL_DETAIL, "LXObjDisk size = %d", static_cast<int>(format::kRecordBytes));
   size_t next_type = 0;
