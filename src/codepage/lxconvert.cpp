@@ -52,10 +52,13 @@ struct Request {
     if (characters && !null_terminated)
       length = lx::bytes_of_chars(cp, input, state, static_cast<int32_t>(length));
   }
-};
 
-constexpr int32_t kStringFlags = LX_TERMINATE | LX_CHARACTERS;
-constexpr int32_t kWideFlags = LX_CHARACTERS;
+  /// Makes the terminator of a text without a length one of its characters.
+  void take_terminator() {
+    if (null_terminated) ++length;
+    null_terminated = false;
+  }
+};
 
 /// Only byte output can be limited in characters: in the other forms a unit is one.
 template <class Writer>
@@ -102,84 +105,94 @@ uint8_t* end_of(uint8_t* output, const Request& request) {
   return request.characters ? lx::no_end<uint8_t>() : output + request.size;
 }
 
+/// Which flags a conversion knows, and what it returns for others when LX_CHARACTERS is among them.
+struct Rules {
+  int32_t flags;
+  int32_t invalid_in_characters;
+};
+constexpr Rules kBetweenLocales = {LX_TERMINATE | LX_CHARACTERS, 0};
+constexpr Rules kUnicode = {LX_TERMINATE | LX_CHARACTERS, -1};
+constexpr Rules kPacked = {LX_CHARACTERS, -1};
+
+/// What every conversion begins and ends with. `body` converts, given the codepage of the locale that keeps the
+/// error and the request. `other` is the second locale, or null where it is missing.
+template <class Unit, class Body>
+int32_t carry_out(LXLocale* locale, const LXLocale* other, int32_t size, const Unit* input, int32_t length,
+                  int32_t flags, const Rules& rules, Body body) {
+  Call call(unit, locale);
+  if (!call || other == nullptr) return call.fail(LX_E_NOT_INITIALIZED, -1);
+  Request request(size, input, length, flags, rules.flags);
+  if (!request.valid) return call.fail(LX_E_INVALID, request.characters ? rules.invalid_in_characters : -1);
+  if (request.nothing) return call.exit(0);
+  return call.exit(body(codepage_of(call.codepage()), request));
+}
+
 int32_t convert_bytes(LXLocale* target, char* output, LXShiftState target_state, int32_t size, LXLocale* source,
                       const char* input, LXShiftState source_state, int32_t length, int32_t flags, Form form) {
-  Call call(unit, target);
   const LXLocale* from = lx::locale_of(source);
-  if (!call || from == nullptr) return call.fail(LX_E_NOT_INITIALIZED, -1);
-  Request request(size, bytes_of(input), length, flags, kStringFlags);
-  if (!request.valid) return call.fail(LX_E_INVALID, request.characters ? 0 : -1);
-  if (request.nothing) return call.exit(0);
-  const Codepage& in_cp = codepage_of(*from->codepage);
-  const Codepage& out_cp = codepage_of(call.codepage());
-  request.count_bytes(in_cp, bytes_of(input), source_state);
-  uint8_t* const out = bytes_of(output);
-  return call.exit(lx::read_bytes(in_cp, form, source_state, bytes_of(input), request.length, [&](auto reader) {
-    return lx::write_bytes(out_cp, form, target_state, out, end_of(out, request),
-                           [&](auto writer) { return convert<LXUChar>(reader, writer, request); });
-  }));
+  return carry_out(
+      target, from, size, bytes_of(input), length, flags, kBetweenLocales,
+      [&](const Codepage& out_cp, Request& request) {
+        const Codepage& in_cp = codepage_of(*from->codepage);
+        request.count_bytes(in_cp, bytes_of(input), source_state);
+        uint8_t* const out = bytes_of(output);
+        return lx::read_bytes(in_cp, form, source_state, bytes_of(input), request.length, [&](auto reader) {
+          return lx::write_bytes(out_cp, form, target_state, out, end_of(out, request),
+                                 [&](auto writer) { return convert<LXUChar>(reader, writer, request); });
+        });
+      });
 }
 
 int32_t to_unicode(LXUChar* output, int32_t size, LXLocale* locale, const char* input, LXShiftState state,
                    int32_t length, int32_t flags, Form form) {
-  Call call(unit, locale);
-  if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
-  Request request(size, bytes_of(input), length, flags, kStringFlags);
-  if (!request.valid) return call.fail(LX_E_INVALID, -1);
-  if (request.nothing) return call.exit(0);
-  const Codepage& cp = codepage_of(call.codepage());
-  request.count_bytes(cp, bytes_of(input), state);
-  return call.exit(lx::read_bytes(cp, form, state, bytes_of(input), request.length, [&](auto reader) {
-    return convert<LXUChar>(reader, lx::UnicodeWriter{output, output + request.size}, request);
-  }));
+  return carry_out(locale, lx::locale_of(locale), size, bytes_of(input), length, flags, kUnicode,
+                   [&](const Codepage& cp, Request& request) {
+                     request.count_bytes(cp, bytes_of(input), state);
+                     const lx::UnicodeWriter writer{output, output + request.size};
+                     return lx::read_bytes(cp, form, state, bytes_of(input), request.length, [&](auto reader) {
+                       return convert<LXUChar>(reader, writer, request);
+                     });
+                   });
 }
 
 int32_t from_unicode(LXLocale* locale, char* output, LXShiftState state, int32_t size, const LXUChar* input,
                      int32_t length, int32_t flags, Form form) {
-  Call call(unit, locale);
-  if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
-  const Request request(size, input, length, flags, kStringFlags);
-  if (!request.valid) return call.fail(LX_E_INVALID, -1);
-  if (request.nothing) return call.exit(0);
-  uint8_t* const out = bytes_of(output);
-  return call.exit(
-      lx::write_bytes(codepage_of(call.codepage()), form, state, out, end_of(out, request), [&](auto writer) {
-        return convert<LXUChar>(lx::UnicodeReader{input, input + request.length}, writer, request);
-      }));
+  return carry_out(locale, lx::locale_of(locale), size, input, length, flags, kUnicode,
+                   [&](const Codepage& cp, Request& request) {
+                     const lx::UnicodeReader reader{input, input + request.length};
+                     uint8_t* const out = bytes_of(output);
+                     return lx::write_bytes(cp, form, state, out, end_of(out, request), [&](auto writer) {
+                       return convert<LXUChar>(reader, writer, request);
+                     });
+                   });
 }
 
 /// Bytes to packed codes. The terminating null of a text without a length is a character of it.
 int32_t to_wide(LXLocale* locale, LXWChar* output, int32_t size, const char* input, LXShiftState state,
                 int32_t length, int32_t flags, Form form) {
-  Call call(unit, locale);
-  if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
-  Request request(size, bytes_of(input), length, flags, kWideFlags);
-  if (!request.valid) return call.fail(LX_E_INVALID, -1);
-  if (request.nothing) return call.exit(0);
-  const Codepage& cp = codepage_of(call.codepage());
-  request.count_bytes(cp, bytes_of(input), state);
-  if (request.null_terminated) ++request.length;
-  request.null_terminated = false;
-  return call.exit(lx::read_bytes(cp, form, state, bytes_of(input), request.length, [&](auto reader) {
-    return convert<LXWChar>(reader, lx::CodeWriter{cp, output, output + request.size}, request);
-  }));
+  return carry_out(locale, lx::locale_of(locale), size, bytes_of(input), length, flags, kPacked,
+                   [&](const Codepage& cp, Request& request) {
+                     request.count_bytes(cp, bytes_of(input), state);
+                     request.take_terminator();
+                     const lx::CodeWriter writer{cp, output, output + request.size};
+                     return lx::read_bytes(cp, form, state, bytes_of(input), request.length, [&](auto reader) {
+                       return convert<LXWChar>(reader, writer, request);
+                     });
+                   });
 }
 
 /// Packed codes to bytes; the zero that ends codes without a length is one of them.
 int32_t from_wide(LXLocale* locale, char* output, LXShiftState state, int32_t size, const LXWChar* input,
                   int32_t length, int32_t flags, Form form) {
-  Call call(unit, locale);
-  if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
-  Request request(size, input, length, flags, kWideFlags);
-  if (!request.valid) return call.fail(LX_E_INVALID, -1);
-  if (request.nothing) return call.exit(0);
-  if (request.null_terminated) ++request.length;
-  request.null_terminated = false;
-  const Codepage& cp = codepage_of(call.codepage());
-  uint8_t* const out = bytes_of(output);
-  return call.exit(lx::write_bytes(cp, form, state, out, end_of(out, request), [&](auto writer) {
-    return convert<LXWChar>(lx::CodeReader{cp, input, input + request.length}, writer, request);
-  }));
+  return carry_out(locale, lx::locale_of(locale), size, input, length, flags, kPacked,
+                   [&](const Codepage& cp, Request& request) {
+                     request.take_terminator();
+                     const lx::CodeReader reader{cp, input, input + request.length};
+                     uint8_t* const out = bytes_of(output);
+                     return lx::write_bytes(cp, form, state, out, end_of(out, request), [&](auto writer) {
+                       return convert<LXWChar>(reader, writer, request);
+                     });
+                   });
 }
 
 /// The object of the common codepage, or null.
@@ -215,15 +228,13 @@ int32_t LXConvertStringEx(LXLocale* target, char* output, LXShiftState target_st
 
 int32_t LXConvertStringW(LXLocale* target, LXWChar* output, int32_t size, LXLocale* source,
                          const LXWChar* input, int32_t length, int32_t flags) {
-  Call call(unit, target);
   const LXLocale* from = lx::locale_of(source);
-  if (!call || from == nullptr) return call.fail(LX_E_NOT_INITIALIZED, -1);
-  const Request request(size, input, length, flags, kStringFlags);
-  if (!request.valid) return call.fail(LX_E_INVALID, request.characters ? 0 : -1);
-  if (request.nothing) return call.exit(0);
-  return call.exit(convert<LXUChar>(lx::CodeReader{codepage_of(*from->codepage), input, input + request.length},
-                                    lx::CodeWriter{codepage_of(call.codepage()), output, output + request.size},
-                                    request));
+  return carry_out(
+      target, from, size, input, length, flags, kBetweenLocales,
+      [&](const Codepage& cp, const Request& request) {
+        const lx::CodeReader reader{codepage_of(*from->codepage), input, input + request.length};
+        return convert<LXUChar>(reader, lx::CodeWriter{cp, output, output + request.size}, request);
+      });
 }
 
 int32_t LXMbToWide(LXLocale* locale, LXWChar* output, int32_t size, const char* input, int32_t length,
@@ -258,13 +269,11 @@ int32_t LXStringToUnicodeEx(LXUChar* output, int32_t size, LXLocale* locale, con
 
 int32_t LXStringToUnicodeW(LXUChar* output, int32_t size, LXLocale* locale, const LXWChar* input,
                            int32_t length, int32_t flags) {
-  Call call(unit, locale);
-  if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
-  const Request request(size, input, length, flags, kStringFlags);
-  if (!request.valid) return call.fail(LX_E_INVALID, -1);
-  if (request.nothing) return call.exit(0);
-  return call.exit(convert<LXUChar>(lx::CodeReader{codepage_of(call.codepage()), input, input + request.length},
-                                    lx::UnicodeWriter{output, output + request.size}, request));
+  return carry_out(locale, lx::locale_of(locale), size, input, length, flags, kUnicode,
+                   [&](const Codepage& cp, const Request& request) {
+                     const lx::CodeReader reader{cp, input, input + request.length};
+                     return convert<LXUChar>(reader, lx::UnicodeWriter{output, output + request.size}, request);
+                   });
 }
 
 int32_t LXUnicodeToString(LXLocale* locale, char* output, int32_t size, const LXUChar* input, int32_t length,
@@ -279,14 +288,12 @@ int32_t LXUnicodeToStringEx(LXLocale* locale, char* output, LXShiftState state, 
 
 int32_t LXUnicodeToStringW(LXLocale* locale, LXWChar* output, int32_t size, const LXUChar* input,
                            int32_t length, int32_t flags) {
-  Call call(unit, locale);
-  if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
-  const Request request(size, input, length, flags, kStringFlags);
-  if (!request.valid) return call.fail(LX_E_INVALID, -1);
-  if (request.nothing) return call.exit(0);
-  return call.exit(convert<LXUChar>(lx::UnicodeReader{input, input + request.length},
-                                    lx::CodeWriter{codepage_of(call.codepage()), output, output + request.size},
-                                    request));
+  return carry_out(
+      locale, lx::locale_of(locale), size, input, length, flags, kUnicode,
+      [&](const Codepage& cp, const Request& request) {
+        const lx::UnicodeReader reader{input, input + request.length};
+        return convert<LXUChar>(reader, lx::CodeWriter{cp, output, output + request.size}, request);
+      });
 }
 
 int32_t LXCpStrToUnicode(const LXObject* codepage, const char* input, int32_t length, LXUChar* output) {
