@@ -17,8 +17,8 @@ inline constexpr size_t kMaxCharBytes = 4;
 /// Towards Unicode: `unicode` for single bytes; for longer characters `rows`, one row of 256 values a trie
 /// node. A leaf's row holds Unicode values, another node's row the numbers of the next nodes, 0 for none (node
 /// 0 is the root, which is nobody's child). From Unicode: `codes16` or, where a character has more than two
-/// bytes, `codes32`: row page_row[u >> 8] holds for every low byte the bytes to store, packed; unmapped values
-/// hold the substitution byte.
+/// bytes, `codes32`: from page_start[u >> 8] on they hold for every low byte the bytes to store, packed;
+/// unmapped values hold the substitution byte.
 struct Codepage {
   const uint8_t* payload;
   const uint8_t* low_array;
@@ -28,16 +28,20 @@ struct Codepage {
   const uint16_t* codes16;
   const uint32_t* codes32;
   uint16_t unicode[256];
-  uint16_t page_row[256];
+  uint32_t page_start[256];
   uint8_t width;  // of a character in bytes: the longest, or that of the double-byte state
   uint8_t substitution;
   uint8_t shift_out;
   uint8_t shift_in;
   bool single_byte;
   bool shift_sensitive;
-  bool utf8;               // conversion is computed
-  bool one_byte_codes;     // every Unicode value becomes one byte
-  bool ascii_transparent;  // bytes below 0x80 are U+0000 to U+007F, both ways, wherever they begin a character
+  bool utf8;            // conversion is computed
+  bool plain_utf8;      // ... and bytes have the lengths of UTF-8, up to 3
+  bool one_byte_codes;  // every Unicode value becomes one byte
+  bool two_level_rows;  // the root's children are leaves
+  // Bytes below this are the Unicode values of the same number, both ways, wherever they begin a character:
+  // 0x100 for ISO 8859-1, 0x80 where ASCII is, else 0.
+  uint16_t same_below;
 
   uint8_t length(uint8_t first_byte) const { return payload[format::codepage::kLengths + first_byte]; }
   bool is_shift(uint8_t byte) const { return byte == shift_out || byte == shift_in; }
@@ -121,7 +125,7 @@ inline uint16_t multibyte_unicode(const Codepage& cp, const uint8_t* p) {
 
 /// The bytes to store for a Unicode value, packed; not for UTF-8.
 inline uint32_t row_code(const Codepage& cp, uint16_t u) {
-  const size_t index = static_cast<size_t>(cp.page_row[u >> 8]) << 8 | (u & 0xFF);
+  const uint32_t index = cp.page_start[u >> 8] + (u & 0xFFu);
   return cp.codes32 != nullptr ? cp.codes32[index] : cp.codes16[index];
 }
 

@@ -9,7 +9,7 @@ namespace {
 namespace fmt = lx::format::codepage;
 using lx::Codepage;
 
-constexpr size_t kRow = 256;
+constexpr uint32_t kRow = 256;
 constexpr size_t kDefaultLowBytes = 259;
 constexpr uint8_t kQuestionMark = 0x3F;
 
@@ -79,12 +79,12 @@ constexpr Codepage make_default_codepage() {
   cp.low_array = LXDefCp3.bytes;
   cp.codes16 = kDefaultCodes.rows[0];
   for (size_t b = 0; b < kRow; ++b) cp.unicode[b] = lx::le16(LXDefCp.bytes + fmt::kUnicode + 2 * b);
-  cp.page_row[0] = 1;
+  cp.page_start[0] = kRow;
   cp.width = 1;
   cp.substitution = kQuestionMark;
   cp.single_byte = true;
   cp.one_byte_codes = true;
-  cp.ascii_transparent = true;
+  cp.same_below = 0x80;
   return cp;
 }
 

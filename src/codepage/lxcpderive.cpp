@@ -11,7 +11,7 @@ namespace {
 namespace fmt = lx::format::codepage;
 using lx::Codepage;
 
-constexpr size_t kRow = 256;
+constexpr uint32_t kRow = 256;
 
 /// The nodes of the multibyte-to-Unicode trie that can be reached, in the order in which they are found.
 class ReachableNodes {
@@ -103,8 +103,8 @@ template <class Code>
 void fill_codes(const Codepage& cp, Code* codes) {
   for (size_t low = 0; low < kRow; ++low) codes[low] = cp.substitution;  // row 0: a page that maps nothing
   for (size_t page = 0; page < kRow; ++page) {
-    if (cp.page_row[page] == 0) continue;
-    Code* row = codes + cp.page_row[page] * kRow;
+    if (cp.page_start[page] == 0) continue;
+    Code* row = codes + cp.page_start[page];
     for (size_t low = 0; low < kRow; ++low)
       row[low] =
           static_cast<Code>(lx::without_zero_bytes(lx::page_code(cp, static_cast<uint16_t>(page << 8 | low))));
@@ -120,12 +120,28 @@ uint32_t largest_code(const Codepage& cp) {
   return largest;
 }
 
-bool is_ascii_transparent(const Codepage& cp) {
-  if (cp.shift_sensitive) return false;
-  for (uint8_t b = 0; b < 0x80; ++b) {
-    if (cp.unicode[b] != b || (!cp.single_byte && cp.length(b) != 1)) return false;
-    if (!cp.utf8 && lx::row_code(cp, b) != b) return false;
+uint16_t same_below(const Codepage& cp) {
+  if (cp.shift_sensitive) return 0;
+  unsigned below = 0;
+  for (; below < (cp.utf8 ? 0x80u : 0x100u); ++below) {
+    const uint8_t b = static_cast<uint8_t>(below);
+    if (cp.unicode[b] != b || (!cp.single_byte && cp.length(b) != 1)) break;
+    if (!cp.utf8 && lx::row_code(cp, b) != b) break;
   }
+  return static_cast<uint16_t>(below & 0x180);
+}
+
+bool is_plain_utf8(const Codepage& cp) {
+  if (!cp.utf8 || cp.same_below == 0) return false;
+  for (unsigned b = 0xC2; b <= 0xEF; ++b)
+    if (cp.length(static_cast<uint8_t>(b)) != (b < 0xE0 ? 2 : 3)) return false;
+  return true;
+}
+
+bool has_two_level_rows(const Codepage& cp, size_t nodes) {
+  if (nodes == 0 || cp.leaf[0] != 0) return false;
+  for (size_t i = 1; i < nodes; ++i)
+    if (cp.leaf[i] == 0) return false;
   return true;
 }
 
@@ -140,9 +156,9 @@ void* derive_codepage(uint16_t id, const Sections& sections) {
   const Bytes trie = has_trie ? sections.section[1] : Bytes{};
   const ReachableNodes nodes(trie);
   if (nodes.out_of_memory()) return nullptr;
-  uint16_t code_rows = 1;
+  uint32_t code_rows = 1;
   for (size_t page = 0; page < kRow; ++page)
-    if (!scalars.utf8 && page_maps(scalars.payload, page)) scalars.page_row[page] = code_rows++;
+    if (!scalars.utf8 && page_maps(scalars.payload, page)) scalars.page_start[page] = kRow * code_rows++;
   const uint32_t largest = scalars.utf8 ? 0 : largest_code(scalars);
   const bool wide = largest > 0xFFFF;
   scalars.one_byte_codes = !scalars.utf8 && largest <= 0xFF;
@@ -167,7 +183,9 @@ void* derive_codepage(uint16_t id, const Sections& sections) {
     cp->rows = rows;
     cp->leaf = block + layout.leaf;
   }
-  cp->ascii_transparent = is_ascii_transparent(*cp);
+  cp->two_level_rows = has_two_level_rows(*cp, nodes.count());
+  cp->same_below = same_below(*cp);
+  cp->plain_utf8 = is_plain_utf8(*cp);
   return block;
 }
 

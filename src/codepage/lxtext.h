@@ -7,6 +7,7 @@
 #pragma once
 
 #include <cstring>
+#include <type_traits>
 
 #include "codepage/lxascii.h"
 #include "codepage/lxcodepage.h"
@@ -25,20 +26,36 @@ inline size_t room(const Unit* p, const Unit* end) {
   return (reinterpret_cast<uintptr_t>(end) - reinterpret_cast<uintptr_t>(p)) / sizeof(Unit);
 }
 
+inline size_t least(size_t a, size_t b) {
+  return a < b ? a : b;
+}
+inline size_t least(size_t a, size_t b, size_t c) {
+  return least(least(a, b), c);
+}
+
+inline constexpr unsigned kAnySame = 0x10000;  // same_below() of 16-bit Unicode
+inline constexpr size_t kRunChars = 128;       // moved at a time through a buffer on the stack
+inline constexpr size_t kRunUnits = 48;        // of shorter texts the characters are moved one by one
+
 // Readers. next() is false at the end of the text, with p == end, and before a character that the end cuts,
 // with p < end. kOneUnit: every unit is a character, so that next() fails only at the end.
+//
+// kRuns: read_run() gives the Unicode values of many characters at once, the ones that next() would give. It
+// stops before a block of characters below `below` (0: never), because those are copied. When it returns 0,
+// next() decides what stands there.
 
 struct SingleByteReader {
   using Unit = uint8_t;
   static constexpr bool kOneUnit = true;
-  static constexpr bool kAsciiRuns = true;
+  static constexpr bool kRuns = true;
   const Codepage& cp;
   const uint8_t* p;
   const uint8_t* end;
 
-  bool ascii() const { return cp.ascii_transparent; }
+  unsigned same_below() const { return cp.same_below; }
   void decode(Unit unit, LXUChar* u) const { *u = cp.unicode[unit]; }
   void decode(Unit unit, LXWChar* code) const { *code = unit; }
+  size_t read_run(LXUChar* values, size_t most, unsigned below);
   template <class Value>
   bool next(Value* value) {
     if (p == end) return false;
@@ -47,17 +64,22 @@ struct SingleByteReader {
   }
 };
 
-struct Utf8Reader {
+/// Multibyte text by lead-byte lengths; where UTF-8 is computed, by its formula.
+template <bool kUtf8>
+struct LeadByteReader {
   using Unit = uint8_t;
   static constexpr bool kOneUnit = false;
-  static constexpr bool kAsciiRuns = true;
+  static constexpr bool kRuns = true;
   const Codepage& cp;
   const uint8_t* p;
   const uint8_t* end;
 
-  bool ascii() const { return cp.ascii_transparent; }
-  void decode(size_t length, LXUChar* u) const { *u = length == 1 ? cp.unicode[*p] : utf8_unicode(p); }
+  unsigned same_below() const { return cp.same_below; }
+  void decode(size_t length, LXUChar* u) const {
+    *u = length == 1 ? cp.unicode[*p] : kUtf8 ? utf8_unicode(p) : row_unicode(cp, p);
+  }
   void decode(size_t length, LXWChar* code) const { *code = pack(p, length); }
+  size_t read_run(LXUChar* values, size_t most, unsigned below);
   template <class Value>
   bool next(Value* value) {
     if (p == end) return false;
@@ -68,42 +90,28 @@ struct Utf8Reader {
     return true;
   }
 };
-
-struct MultiByteReader {
-  using Unit = uint8_t;
-  static constexpr bool kOneUnit = false;
-  static constexpr bool kAsciiRuns = true;
-  const Codepage& cp;
-  const uint8_t* p;
-  const uint8_t* end;
-
-  bool ascii() const { return cp.ascii_transparent; }
-  void decode(size_t length, LXUChar* u) const { *u = length == 1 ? cp.unicode[*p] : row_unicode(cp, p); }
-  void decode(size_t length, LXWChar* code) const { *code = pack(p, length); }
-  template <class Value>
-  bool next(Value* value) {
-    if (p == end) return false;
-    const size_t length = cp.length(*p);
-    if (length > static_cast<size_t>(end - p)) return false;
-    decode(length, value);
-    p += length;
-    return true;
-  }
-};
+using Utf8Reader = LeadByteReader<true>;
+using MultiByteReader = LeadByteReader<false>;
+template <>
+size_t Utf8Reader::read_run(LXUChar* values, size_t most, unsigned below);
+template <>
+size_t MultiByteReader::read_run(LXUChar* values, size_t most, unsigned below);
 
 /// One shift byte before a character is eaten; a second one in a row is a character. A shift byte at the very
 /// end ends the text.
 struct ShiftReader {
   using Unit = uint8_t;
   static constexpr bool kOneUnit = false;
-  static constexpr bool kAsciiRuns = false;
+  static constexpr bool kRuns = true;
   const Codepage& cp;
   const uint8_t* p;
   const uint8_t* end;
   LXShiftState state;
 
+  unsigned same_below() const { return 0; }
   void decode(LXUChar* u) const { *u = state == LX_SHIFT_DOUBLE ? multibyte_unicode(cp, p) : cp.unicode[*p]; }
   void decode(LXWChar* code) const { *code = pack(p, cp.width_in(state)); }
+  size_t read_run(LXUChar* values, size_t most, unsigned below);
   template <class Value>
   bool next(Value* value) {
     if (p == end) return false;
@@ -119,7 +127,7 @@ struct ShiftReader {
 struct CodeReader {
   using Unit = LXWChar;
   static constexpr bool kOneUnit = true;
-  static constexpr bool kAsciiRuns = false;
+  static constexpr bool kRuns = false;
   const Codepage& cp;
   const LXWChar* p;
   const LXWChar* end;
@@ -137,12 +145,18 @@ struct CodeReader {
 struct UnicodeReader {
   using Unit = LXUChar;
   static constexpr bool kOneUnit = true;
-  static constexpr bool kAsciiRuns = true;
+  static constexpr bool kRuns = true;
   const LXUChar* p;
   const LXUChar* end;
 
-  bool ascii() const { return true; }
+  unsigned same_below() const { return kAnySame; }
   void decode(Unit unit, LXUChar* u) const { *u = unit; }
+  /// How many of `most` units stand before a block of units below `below`.
+  size_t run_units(size_t most, unsigned below) const {
+    size_t n = 0;
+    while (most - n >= kBlock && (n == 0 || below == 0 || !is_same_block(p + n, below))) n += kBlock;
+    return most - n < kBlock ? most : n;
+  }
   bool next(LXUChar* u) {
     if (p == end) return false;
     *u = *p++;
@@ -151,21 +165,22 @@ struct UnicodeReader {
 };
 
 // Writers. put() is false, with nothing written, when the character and the shift byte that is due do not fit.
-// kOneUnit: every character is one unit, encode() of it.
+// kOneUnit: every character is one unit, encode() of it. kRuns: put_run() writes characters that are known to
+// fit, each of at most most_units(), and nothing behind the last one.
 
 struct SingleByteWriter {
   using Unit = uint8_t;
   static constexpr bool kOneUnit = true;
-  static constexpr bool kAsciiRuns = true;
+  static constexpr bool kRuns = true;
   const Codepage& cp;
   uint8_t* p;
   uint8_t* end;
 
-  bool ascii() const { return cp.ascii_transparent; }
-  Unit encode(LXUChar u) const {
-    return static_cast<uint8_t>(cp.codes16[static_cast<size_t>(cp.page_row[u >> 8]) << 8 | (u & 0xFF)]);
-  }
+  unsigned same_below() const { return cp.same_below; }
+  Unit encode(LXUChar u) const { return static_cast<uint8_t>(cp.codes16[cp.page_start[u >> 8] + (u & 0xFFu)]); }
   Unit encode(LXWChar code) const { return static_cast<uint8_t>(code); }
+  size_t most_units() const { return 1; }
+  void put_run(const LXUChar* values, size_t count);
   template <class Value>
   bool put(Value value) {
     if (p == end) return false;
@@ -174,42 +189,27 @@ struct SingleByteWriter {
   }
 };
 
-struct Utf8Writer {
+/// Multibyte text without shift bytes; where UTF-8 is computed, by its formula.
+template <bool kUtf8>
+struct LeadByteWriter {
   using Unit = uint8_t;
   static constexpr bool kOneUnit = false;
-  static constexpr bool kAsciiRuns = true;
+  static constexpr bool kRuns = true;
   const Codepage& cp;
   uint8_t* p;
   uint8_t* end;
 
-  bool ascii() const { return cp.ascii_transparent; }
+  unsigned same_below() const { return cp.same_below; }
+  size_t most_units() const { return kUtf8 ? 3 : cp.codes32 != nullptr ? 4 : 2; }
+  void put_run(const LXUChar* values, size_t count);
   bool put(LXUChar u) {
+    if constexpr (!kUtf8) return store(row_code(cp, u));
     const size_t count = utf8_bytes(u);
     if (count > room(p, end)) return false;
     store_utf8(p, u, count);
     p += count;
     return true;
   }
-  bool put(LXWChar code) {
-    code = without_zero_bytes(code);
-    const size_t count = code_bytes(code);
-    if (count > room(p, end)) return false;
-    store_code(p, code, count);
-    p += count;
-    return true;
-  }
-};
-
-struct MultiByteWriter {
-  using Unit = uint8_t;
-  static constexpr bool kOneUnit = false;
-  static constexpr bool kAsciiRuns = true;
-  const Codepage& cp;
-  uint8_t* p;
-  uint8_t* end;
-
-  bool ascii() const { return cp.ascii_transparent; }
-  bool put(LXUChar u) { return store(row_code(cp, u)); }
   bool put(LXWChar code) { return store(without_zero_bytes(code)); }
 
  private:
@@ -221,15 +221,23 @@ struct MultiByteWriter {
     return true;
   }
 };
+using Utf8Writer = LeadByteWriter<true>;
+using MultiByteWriter = LeadByteWriter<false>;
+template <>
+void Utf8Writer::put_run(const LXUChar* values, size_t count);
+template <>
+void MultiByteWriter::put_run(const LXUChar* values, size_t count);
 
 struct ShiftWriter {
   using Unit = uint8_t;
   static constexpr bool kOneUnit = false;
-  static constexpr bool kAsciiRuns = false;
+  static constexpr bool kRuns = true;
   const Codepage& cp;
   uint8_t* p;
   uint8_t* end;
   LXShiftState state;
+
+  unsigned same_below() const { return 0; }
 
   /// The shift byte that is due before a character of `count` bytes, and the state that it leads to.
   bool shift_due(size_t count) const { return (count == 1) != (state == LX_SHIFT_SINGLE); }
@@ -238,6 +246,8 @@ struct ShiftWriter {
     return state == LX_SHIFT_DOUBLE ? cp.shift_out : cp.shift_in;
   }
 
+  size_t most_units() const { return 1 + (cp.codes32 != nullptr || cp.utf8 ? kMaxCharBytes : 2); }
+  void put_run(const LXUChar* values, size_t count);
   bool put(LXUChar u) { return store(cp.utf8 ? unicode_to_code(cp, u) : row_code(cp, u)); }
   bool put(LXWChar code) { return store(without_zero_bytes(code)); }
 
@@ -256,7 +266,7 @@ struct ShiftWriter {
 struct CodeWriter {
   using Unit = LXWChar;
   static constexpr bool kOneUnit = true;
-  static constexpr bool kAsciiRuns = false;
+  static constexpr bool kRuns = false;
   const Codepage& cp;
   LXWChar* p;
   LXWChar* end;
@@ -274,11 +284,11 @@ struct CodeWriter {
 struct UnicodeWriter {
   using Unit = LXUChar;
   static constexpr bool kOneUnit = true;
-  static constexpr bool kAsciiRuns = true;
+  static constexpr bool kRuns = true;
   LXUChar* p;
   LXUChar* end;
 
-  bool ascii() const { return true; }
+  unsigned same_below() const { return kAnySame; }
   Unit encode(LXUChar u) const { return u; }
   bool put(LXUChar u) {
     if (p == end) return false;
@@ -321,33 +331,86 @@ struct Transfer {
   Value held;    // kOutputFull: the character that was read and did not fit
 };
 
+/// What both sides have the same below.
+template <class Reader, class Writer>
+inline unsigned same_below(const Reader& in, const Writer& out) {
+  return in.same_below() < out.same_below() ? in.same_below() : out.same_below();
+}
+
+/// Moves the characters that fit for certain, as Unicode values: how many they were. Not inline: the loops of
+/// transfer(), which short texts take, stay small.
+template <class Reader, class Writer>
+[[gnu::noinline]] size_t move_runs(Reader& in, Writer& out, size_t count, unsigned below) {
+  size_t left = count;
+  for (;;) {
+    size_t n = 0;
+    if (below != 0) {
+      n = copy_same_blocks(out.p, in.p, least(left, room(in.p, in.end), room(out.p, out.end)), below);
+      in.p += n;
+      out.p += n;
+      left -= n;
+    }
+    if constexpr (std::is_same_v<Writer, UnicodeWriter>) {
+      n = in.read_run(out.p, least(left, room(out.p, out.end)), below);
+      out.p += n;
+    } else if constexpr (std::is_same_v<Reader, UnicodeReader>) {
+      n = least(left, room(in.p, in.end), room(out.p, out.end) / out.most_units());
+      n = in.run_units(least(n, kRunChars), below);
+      out.put_run(in.p, n);
+      in.p += n;
+    } else {
+      LXUChar values[kRunChars];
+      n = in.read_run(values, least(left, kRunChars, room(out.p, out.end) / out.most_units()), below);
+      out.put_run(values, n);
+    }
+    if (n == 0) return count - left;
+    left -= n;
+  }
+}
+
+/// Takes over the place, and the shift state, from a copy that has gone on.
+template <class Text>
+inline void go_on_at(Text& text, const Text& place) {
+  text.p = place.p;
+  if constexpr (std::is_same_v<Text, ShiftReader> || std::is_same_v<Text, ShiftWriter>)
+    text.state = place.state;
+}
+
 /// Moves characters from a reader to a writer, at most `count` of them, as Unicode values or as packed codes.
 template <class Value, class Reader, class Writer>
 inline Transfer<Value> transfer(Reader& in, Writer& out, size_t count) {
+  constexpr bool kRuns = Reader::kRuns && Writer::kRuns;
   size_t left = count;
-  Value value{};
+  unsigned below = 0;
+  if constexpr (kRuns) {
+    below = same_below(in, out);
+    if (room(in.p, in.end) >= kRunUnits) {
+      // On copies: what other functions see in memory cannot stay in registers below.
+      Reader long_in = in;
+      Writer long_out = out;
+      left -= move_runs(long_in, long_out, left, below);
+      go_on_at(in, long_in);
+      go_on_at(out, long_out);
+    }
+  }
   if constexpr (Reader::kOneUnit && Writer::kOneUnit) {
-    size_t n = room(in.p, in.end);
-    if (room(out.p, out.end) < n) n = room(out.p, out.end);
-    if (left < n) n = left;
+    const size_t n = least(left, room(in.p, in.end), room(out.p, out.end));
+    const auto* const from = in.p;
+    auto* const to = out.p;
     for (size_t i = 0; i < n; ++i) {
-      in.decode(in.p[i], &value);
-      out.p[i] = out.encode(value);
+      Value value{};
+      in.decode(from[i], &value);
+      to[i] = out.encode(value);
     }
     in.p += n;
     out.p += n;
     left -= n;
   }
-  constexpr bool kAscii = Reader::kAsciiRuns && Writer::kAsciiRuns && sizeof(Value) == sizeof(LXUChar);
-  bool ascii = false;
-  if constexpr (kAscii) ascii = in.ascii() && out.ascii();
+  Value value{};
   for (;;) {
-    if constexpr (kAscii && !(Reader::kOneUnit && Writer::kOneUnit)) {
-      if (ascii) {
-        size_t n = room(in.p, in.end);
-        if (room(out.p, out.end) < n) n = room(out.p, out.end);
-        if (left < n) n = left;
-        n = copy_ascii(out.p, in.p, n);
+    if constexpr (kRuns && !(Reader::kOneUnit && Writer::kOneUnit)) {
+      if (below != 0) {
+        const size_t n = copy_same(out.p, in.p, least(left, room(in.p, in.end), room(out.p, out.end)), below);
         in.p += n;
         out.p += n;
         left -= n;
@@ -358,7 +421,7 @@ inline Transfer<Value> transfer(Reader& in, Writer& out, size_t count) {
       if (left == 0) return {Stop::kCount, count, value};
       if (!out.put(value)) return {Stop::kOutputFull, count - left, value};
       --left;
-    } while (!ascii || value >= 0x80);
+    } while (value >= below);
   }
 }
 

@@ -155,7 +155,7 @@ TEST(BuiltInCodepage, InForceWithoutADirectory) {
   const auto& derived = *static_cast<const lx::Codepage*>(block);
   const auto& built_in = *static_cast<const lx::Codepage*>(lx::kBuiltInCodepage.derived);
   EXPECT_EQ(memcmp(derived.unicode, built_in.unicode, sizeof(derived.unicode)), 0);
-  EXPECT_EQ(memcmp(derived.page_row, built_in.page_row, sizeof(derived.page_row)), 0);
+  EXPECT_EQ(memcmp(derived.page_start, built_in.page_start, sizeof(derived.page_start)), 0);
   EXPECT_EQ(memcmp(derived.codes16, built_in.codes16, 512 * sizeof(uint16_t)), 0);
   EXPECT_EQ(derived.rows, nullptr);
   EXPECT_EQ(derived.codes32, nullptr);
@@ -167,7 +167,9 @@ TEST(BuiltInCodepage, InForceWithoutADirectory) {
   EXPECT_EQ(derived.shift_sensitive, built_in.shift_sensitive);
   EXPECT_EQ(derived.utf8, built_in.utf8);
   EXPECT_EQ(derived.one_byte_codes, built_in.one_byte_codes);
-  EXPECT_EQ(derived.ascii_transparent, built_in.ascii_transparent);
+  EXPECT_EQ(derived.plain_utf8, built_in.plain_utf8);
+  EXPECT_EQ(derived.two_level_rows, built_in.two_level_rows);
+  EXPECT_EQ(derived.same_below, built_in.same_below);
   EXPECT_TRUE(lx::hook_free(block));
 
   int32_t rc = LX_OK;
