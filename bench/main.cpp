@@ -1,7 +1,7 @@
 // lexicor_bench: conversion beside ICU, iconv and memcpy.
 //
 //   lexicor_bench [--locale=DIRECTORY] [--rows=PART_OF_NAME] [Google Benchmark's own options]
-//   lexicor_bench --ratios ...   prints the table of ratios; the exit code tells whether a row is behind
+//   lexicor_bench --ratios ...   prints the table of ratios
 #include <benchmark/benchmark.h>
 
 #include <algorithm>
@@ -70,8 +70,10 @@ int run(const Options& options) {
   std::vector<char> output(room);
   for (const bench::Row& row : rows)
     for (const bench::Peer& peer : row.peers) register_peer(row, peer, &output);
-  if (options.ratios) return bench::print_ratios(rows, stdout) == 0 ? EXIT_SUCCESS : EXIT_FAILURE;
-  benchmark::RunSpecifiedBenchmarks();
+  if (options.ratios)
+    bench::print_ratios(rows, stdout);
+  else
+    benchmark::RunSpecifiedBenchmarks();
   return EXIT_SUCCESS;
 }
 

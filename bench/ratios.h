@@ -8,7 +8,7 @@
 
 namespace bench {
 
-/// Measures the rows and prints the table: the number of rows in which ICU or iconv is faster.
-int print_ratios(const std::vector<Row>& rows, std::FILE* out);
+/// Measures the rows and prints the table; the last line counts the rows in which ICU or iconv is faster.
+void print_ratios(const std::vector<Row>& rows, std::FILE* out);
 
 }  // namespace bench
