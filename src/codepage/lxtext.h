@@ -36,6 +36,7 @@ inline size_t least(size_t a, size_t b, size_t c) {
 inline constexpr unsigned kAnySame = 0x10000;  // same_below() of 16-bit Unicode
 inline constexpr size_t kRunChars = 128;       // moved at a time through a buffer on the stack
 inline constexpr size_t kRunUnits = 48;        // of shorter texts the characters are moved one by one
+inline constexpr size_t kShiftRunUnits = 16;   // the same where shift states are kept
 
 // Readers. next() is false at the end of the text, with p == end, and before a character that the end cuts,
 // with p < end. kOneUnit: every unit is a character, so that next() fails only at the end.
@@ -384,7 +385,8 @@ inline Transfer<Value> transfer(Reader& in, Writer& out, size_t count) {
   unsigned below = 0;
   if constexpr (kRuns) {
     below = same_below(in, out);
-    if (room(in.p, in.end) >= kRunUnits) {
+    constexpr bool kShift = std::is_same_v<Reader, ShiftReader> || std::is_same_v<Writer, ShiftWriter>;
+    if (room(in.p, in.end) >= (kShift ? kShiftRunUnits : kRunUnits)) {
       // On copies: what other functions see in memory cannot stay in registers below.
       Reader long_in = in;
       Writer long_out = out;

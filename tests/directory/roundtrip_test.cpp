@@ -3,6 +3,7 @@
 #include <gtest/gtest.h>
 
 #include <map>
+#include <random>
 #include <string>
 #include <vector>
 
@@ -159,6 +160,47 @@ TEST_P(EveryCodepage, StreamsToUtf8AndBack) {
   if (both.bytes.size() == back.size() + 1 && codepage().shift())
     back += static_cast<char>(lexicor_data::kShiftIn);
   EXPECT_TRUE(same(back, both.bytes));
+}
+
+/// Long texts are moved in runs, short ones character by character: random bytes and units, well formed or not,
+/// must come out the same both ways.
+TEST_P(EveryCodepage, LongTextsConvertAsTheirCharacters) {
+  const LocalePtr locale = locale_with(codepage().source.name);
+  std::mt19937 random(codepage().id);
+  for (int round = 0; round < 20; ++round) {
+    // Rounds differ in how far bytes and values range, so that runs of all lengths come about.
+    const unsigned reach = round % 4 == 0 ? 0x80 : 0x100;
+    std::string bytes(300, ' ');
+    for (char& byte : bytes)
+      if (random() % 3 != 0 || round % 2 == 0) byte = static_cast<char>(random() % reach);
+    Units units(300, 'a');
+    for (LXUChar& unit : units)
+      if (random() % 5 != 0) unit = static_cast<LXUChar>(random() % (round % 4 == 1 ? 0x600 : 0x10000));
+
+    Units whole(bytes.size()), parts;
+    const auto size = static_cast<int32_t>(bytes.size());
+    whole.resize(
+        static_cast<size_t>(LXStringToUnicode(whole.data(), size, locale.get(), bytes.data(), size, 0)));
+    for (const char *p = bytes.data(), *end = p + bytes.size(); p < end;) {
+      const int32_t length = LXByteLength(locale.get(), p);
+      LXUChar unit = 0;
+      if (length > end - p || LXStringToUnicode(&unit, 1, locale.get(), p, length, 0) != 1) break;
+      parts.push_back(unit);
+      p += length;
+    }
+    ASSERT_TRUE(same(whole, parts)) << "round " << round;
+
+    std::string joined;
+    for (LXUChar unit : units) {
+      char text[8];
+      const int32_t n = LXUnicodeToString(locale.get(), text, sizeof(text), &unit, 1, 0);
+      joined.append(text, static_cast<size_t>(n));
+    }
+    std::string all(units.size() * 4, '\0');
+    all.resize(static_cast<size_t>(LXUnicodeToString(locale.get(), all.data(), static_cast<int32_t>(all.size()),
+                                                     units.data(), static_cast<int32_t>(units.size()), 0)));
+    ASSERT_TRUE(same(all, joined)) << "round " << round;
+  }
 }
 
 /// Every value that the source does not map becomes the substitution byte, and every single byte U+FFFD.
