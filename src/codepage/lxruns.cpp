@@ -32,6 +32,8 @@ class Utf8Block {
   explicit Utf8Block(const uint8_t* p) : bytes_(load_block(p)), high_(byte_mask(bytes_)) {}
 
   bool ascii() const { return high_ == 0; }
+  /// The bytes of ASCII at the start.
+  size_t ascii_bytes() const { return static_cast<size_t>(__builtin_ctz(high_ | 1u << kBlock)); }
 
   /// False when there is none, or one of two bytes has no trailing byte, or the reverse.
   bool find_chars() {
@@ -172,7 +174,14 @@ size_t Utf8Reader::read_run(LXUChar* values, size_t most, [[maybe_unused]] unsig
         q += kBlock;
         continue;
       }
-      if (block.find_chars()) {
+      // Where other letters are few, the ASCII up to the next one is widened at once. The values stored behind
+      // it are overwritten: at least a block of characters follows.
+      constexpr size_t kWorthIt = 4;
+      if (block.ascii_bytes() >= kWorthIt && left >= 4 * kBlock) {
+        copy_block(values + n, q);
+        n += block.ascii_bytes();
+        q += block.ascii_bytes();
+      } else if (block.find_chars()) {
         n += block.store_values(values + n);
         q += block.bytes();
         continue;
