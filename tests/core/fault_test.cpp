@@ -121,79 +121,146 @@ class FaultTest : public LibraryTest {
     directory.write_text("alias.txt", "Under test one two\nOld three\n");
   }
 
+  void expect_created(LXLocale* locale, int32_t rc) {
+    EXPECT_EQ(locale != nullptr, rc == LX_OK) << rc;
+    if (locale == nullptr) {
+      EXPECT_EQ(rc, LX_E_MEMORY);
+      EXPECT_TRUE(hooks.failed());
+      return;
+    }
+    const size_t before = hooks.live_blocks();
+    LXConversion* conversion = LXOpenConversion(locale, locale);
+    if (conversion != nullptr) {
+      EXPECT_EQ(LXCloseConversion(conversion), 0);
+    } else {
+      EXPECT_EQ(LXGetError(locale), LX_E_MEMORY);
+    }
+    char bytes[8];
+    EXPECT_EQ(LXConvertString(locale, bytes, 8, locale, "abc", 3, 0), 3);
+    EXPECT_EQ(hooks.live_blocks(), before);
+    EXPECT_EQ(LXReleaseLocale(locale), 0);
+  }
+
+  void use_locales() {
+    const std::string name = kName;
+    const std::vector<LXWChar> wide(name.c_str(), name.c_str() + name.size() + 1);
+    const std::vector<LXUChar> unicode(name.c_str(), name.c_str() + name.size() + 1);
+    const std::vector<LXUChar> spaces(300, 0);
+    int32_t rc = -1;
+    const std::function<LXLocale*()> creations[] = {
+        [&] { return LXGetLocale(name.c_str(), 0, &rc); },
+        [&] { return LXGetLocaleW(wide.data(), LX_FALLBACK, &rc); },
+        [&] { return LXGetLocaleU(unicode.data(), 0, &rc); },
+        [&] { return LXGetLocaleU(spaces.data(), 0, &rc); },
+        [&] { return LXGetLocale("English.Old", 0, &rc); },
+        [&] { return LXGetLocale(nullptr, LX_USER_LOCALE, &rc); },
+    };
+    for (const auto& create : creations) {
+      LXLocale* locale = create();
+      expect_created(locale, rc);
+    }
+    for (int32_t code : {LXSetLocale("", 0), LXSetLocaleW(wide.data(), 0), LXSetLocaleU(unicode.data(), 0)})
+      EXPECT_TRUE(code == LX_OK || (code == LX_E_MEMORY && hooks.failed())) << code;
+    LXObjManager* own = LXInitObjManager(directory.path().c_str(), 0, &rc);
+    EXPECT_EQ(own != nullptr, rc == LX_OK);
+    if (own != nullptr) {
+      EXPECT_EQ(LXTermObjManager(own), LX_OK);
+    } else {
+      EXPECT_EQ(rc, LX_E_MEMORY);
+    }
+  }
+
   /// A whole life of the library: documented codes, and nothing is left at its end.
-  void live();
-  void use_locales();
-  void expect_created(LXLocale* locale, int32_t rc);
+  void live() {
+    const int32_t code = init();
+    if (code == LX_OK) {
+      use_locales();
+      EXPECT_EQ(LXTerm(), LX_OK);
+    } else {
+      EXPECT_TRUE(code == LX_E_MEMORY || code == LX_E_NOT_INITIALIZED) << code;
+      EXPECT_TRUE(hooks.failed());
+      EXPECT_EQ(LXTerm(), LX_E_NOT_INITIALIZED);
+    }
+    EXPECT_EQ(hooks.live_blocks(), 0u);
+    EXPECT_EQ(hooks.wrong_frees(), 0u);
+  }
+
+  void use_damaged_directory() {
+    const int32_t code = init();
+    ASSERT_TRUE(code == LX_OK || code == LX_W_DEFAULTS) << code;
+    LXEnumLocales([](void*, int32_t, const char* name) { return strlen(name) <= 33 ? 1 : 0; }, nullptr);
+    LXGetCodepageFromAlias(nullptr, "TWO");
+    int32_t rc = -1;
+    LXLocale* locale = LXGetLocale(kName, 0, &rc);
+    static const std::set<int32_t> documented = {
+        LX_OK, LX_E_NOT_INITIALIZED, LX_E_NO_LANGUAGE, LX_E_NO_CODEPAGE, LX_E_NO_TERRITORY, LX_E_NO_SORT};
+    EXPECT_EQ(documented.count(rc), 1u) << rc;
+    EXPECT_EQ(locale != nullptr, rc == LX_OK);
+    if (locale != nullptr) {
+      // The built-in codepage is sound, whatever the file was.
+      if ((locale->codepage->disk.flags & kObjectBuiltIn) == 0) use_locale(locale, false);
+      EXPECT_EQ(LXReleaseLocale(locale), 0);
+    }
+    locale = LXGetLocale("", LX_FALLBACK, &rc);
+    if (locale != nullptr) LXReleaseLocale(locale);
+    EXPECT_EQ(LXTerm(), LX_OK);
+    EXPECT_EQ(hooks.live_blocks(), 0u);
+  }
+
+  void cut_everywhere(const std::string& file, bool refused) {
+    const std::string path = directory.file(file);
+    for (size_t bytes = directory.read(file).size(); bytes-- > 0;) {
+      SCOPED_TRACE(file + " cut to " + std::to_string(bytes));
+      std::filesystem::resize_file(path, bytes);
+      if (refused) {
+        ASSERT_EQ(init(directory.path().c_str(), LX_NO_DEFAULTS),
+                  file == "control.nls" ? LX_W_DEFAULTS : LX_OK);
+        EXPECT_EQ(LXGetLocale(kName, 0, nullptr), nullptr);
+        EXPECT_EQ(LXTerm(), LX_OK);
+        EXPECT_EQ(hooks.live_blocks(), 0u);
+      } else {
+        use_damaged_directory();
+      }
+      ASSERT_FALSE(HasFailure());
+    }
+  }
+
+  void change_everywhere(const std::string& file) {
+    const ByteString whole = directory.read(file);
+    std::fstream stream(directory.file(file), std::ios::binary | std::ios::in | std::ios::out);
+    const auto put = [&](size_t at, uint8_t value) {
+      stream.seekp(static_cast<std::streamoff>(at));
+      stream.put(static_cast<char>(value)).flush();
+    };
+    for (size_t at = 0; at < whole.size(); ++at) {
+      const std::set<uint8_t> values = {static_cast<uint8_t>(whole[at] ^ 0x01), 0, 0xFF};
+      for (uint8_t value : values) {
+        if (value == whole[at]) continue;
+        SCOPED_TRACE(file + " with " + std::to_string(value) + " at " + std::to_string(at));
+        put(at, value);
+        use_damaged_directory();
+        ASSERT_FALSE(HasFailure());
+      }
+      put(at, whole[at]);
+    }
+  }
 
   /// Changes one file in every way, and uses what can still be used.
-  void sweep(const std::string& file, bool refused_when_cut);
-  void cut_everywhere(const std::string& file, bool refused);
-  void change_everywhere(const std::string& file);
-  void use_damaged_directory();
-};
-
-void FaultTest::expect_created(LXLocale* locale, int32_t rc) {
-  EXPECT_EQ(locale != nullptr, rc == LX_OK) << rc;
-  if (locale == nullptr) {
-    EXPECT_EQ(rc, LX_E_MEMORY);
-    EXPECT_TRUE(hooks.failed());
-    return;
-  }
-  const size_t before = hooks.live_blocks();
-  LXConversion* conversion = LXOpenConversion(locale, locale);
-  if (conversion != nullptr) {
-    EXPECT_EQ(LXCloseConversion(conversion), 0);
-  } else {
-    EXPECT_EQ(LXGetError(locale), LX_E_MEMORY);
-  }
-  char bytes[8];
-  EXPECT_EQ(LXConvertString(locale, bytes, 8, locale, "abc", 3, 0), 3);
-  EXPECT_EQ(hooks.live_blocks(), before);
-  EXPECT_EQ(LXReleaseLocale(locale), 0);
-}
-
-void FaultTest::use_locales() {
-  const std::string name = kName;
-  const std::vector<LXWChar> wide(name.c_str(), name.c_str() + name.size() + 1);
-  const std::vector<LXUChar> unicode(name.c_str(), name.c_str() + name.size() + 1);
-  int32_t rc = -1;
-  LXLocale* locale = LXGetLocale(name.c_str(), 0, &rc);
-  expect_created(locale, rc);
-  locale = LXGetLocaleW(wide.data(), LX_FALLBACK, &rc);
-  expect_created(locale, rc);
-  locale = LXGetLocaleU(unicode.data(), 0, &rc);
-  expect_created(locale, rc);
-  locale = LXGetLocaleU(std::vector<LXUChar>(300, 0).data(), 0, &rc);
-  expect_created(locale, rc);
-  locale = LXGetLocale("English.Old", 0, &rc);
-  expect_created(locale, rc);
-  locale = LXGetLocale(nullptr, LX_USER_LOCALE, &rc);
-  expect_created(locale, rc);
-  for (int32_t code : {LXSetLocale("", 0), LXSetLocaleW(wide.data(), 0), LXSetLocaleU(unicode.data(), 0)})
-    EXPECT_TRUE(code == LX_OK || (code == LX_E_MEMORY && hooks.failed())) << code;
-  LXObjManager* own = LXInitObjManager(directory.path().c_str(), 0, &rc);
-  EXPECT_EQ(own != nullptr, rc == LX_OK);
-  if (own != nullptr) {
-    EXPECT_EQ(LXTermObjManager(own), LX_OK);
-  } else {
-    EXPECT_EQ(rc, LX_E_MEMORY);
-  }
-}
-
-void FaultTest::live() {
-  const int32_t code = init();
-  if (code == LX_OK) {
-    use_locales();
+  void sweep(const std::string& file, bool refused_when_cut) {
+    const ByteString whole = directory.read(file);
+    ASSERT_FALSE(whole.empty());
+    ASSERT_NO_FATAL_FAILURE(cut_everywhere(file, refused_when_cut));
+    directory.write(file, whole);
+    ASSERT_NO_FATAL_FAILURE(change_everywhere(file));
+    ASSERT_EQ(init(), LX_OK);
+    LXLocale* locale = LXGetLocale(kName, 0, nullptr);
+    ASSERT_NE(locale, nullptr) << "the file is sound when nothing is changed";
+    EXPECT_EQ(locale->codepage->disk.flags, 0);
+    use_locale(locale, true);
+    EXPECT_EQ(LXReleaseLocale(locale), 0);
     EXPECT_EQ(LXTerm(), LX_OK);
-  } else {
-    EXPECT_TRUE(code == LX_E_MEMORY || code == LX_E_NOT_INITIALIZED) << code;
-    EXPECT_TRUE(hooks.failed());
-    EXPECT_EQ(LXTerm(), LX_E_NOT_INITIALIZED);
   }
-  EXPECT_EQ(hooks.live_blocks(), 0u);
-  EXPECT_EQ(hooks.wrong_frees(), 0u);
-}
+};
 
 TEST_F(FaultTest, EveryAllocationFails) {
   write_directory();
@@ -210,129 +277,15 @@ TEST_F(FaultTest, EveryAllocationFails) {
   }
 }
 
-// Memory that is short for a moment must not leave built-in data in the place of an object.
-TEST_F(FaultTest, AFailedAllocationLeavesNoTraceInLaterLocales) {
-  write_directory();
-  bool failed = true;
-  for (size_t n = 1; failed; ++n) {
-    SCOPED_TRACE(n);
-    ASSERT_EQ(init(), LX_OK);
-    hooks.fail_at(n);
-    LXReleaseLocale(LXGetLocale(kName, 0, nullptr));
-    failed = hooks.failed();
-    hooks.fail_at(0);
-    LXLocale* locale = LXGetLocale(kName, 0, nullptr);
-    ASSERT_NE(locale, nullptr);
-    for (const LXObject* object : {locale->language, locale->territory, locale->codepage})
-      EXPECT_EQ(object->disk.flags, 0);
-    EXPECT_EQ(locale->flags & 0x1C0, 0x080);
-    EXPECT_EQ(LXReleaseLocale(locale), 0);
-    EXPECT_EQ(LXTerm(), LX_OK);
+TEST_F(FaultTest, FilesCutAndChangedAnywhere) {
+  for (const char* file : {"control.nls", "alias.txt", "la_00001.nls", "te_00840.nls"}) {
+    write_directory();
+    ASSERT_NO_FATAL_FAILURE(sweep(file, file != std::string("alias.txt")));
   }
-}
-
-void FaultTest::use_damaged_directory() {
-  const int32_t code = init();
-  ASSERT_TRUE(code == LX_OK || code == LX_W_DEFAULTS) << code;
-  LXEnumLocales([](void*, int32_t, const char* name) { return strlen(name) <= 33 ? 1 : 0; }, nullptr);
-  LXGetCodepageFromAlias(nullptr, "TWO");
-  int32_t rc = -1;
-  LXLocale* locale = LXGetLocale(kName, 0, &rc);
-  static const std::set<int32_t> documented = {
-      LX_OK, LX_E_NOT_INITIALIZED, LX_E_NO_LANGUAGE, LX_E_NO_CODEPAGE, LX_E_NO_TERRITORY, LX_E_NO_SORT};
-  EXPECT_EQ(documented.count(rc), 1u) << rc;
-  EXPECT_EQ(locale != nullptr, rc == LX_OK);
-  if (locale != nullptr) {
-    // The built-in codepage is sound, whatever the file was.
-    if ((locale->codepage->disk.flags & kObjectBuiltIn) == 0) use_locale(locale, false);
-    EXPECT_EQ(LXReleaseLocale(locale), 0);
+  for (const auto& codepage : {ascii_codepage(), small_double_byte_codepage(), small_shift_codepage()}) {
+    write_directory(codepage);
+    ASSERT_NO_FATAL_FAILURE(sweep("cp_00900.nls", true));
   }
-  locale = LXGetLocale("", LX_FALLBACK, &rc);
-  if (locale != nullptr) LXReleaseLocale(locale);
-  EXPECT_EQ(LXTerm(), LX_OK);
-  EXPECT_EQ(hooks.live_blocks(), 0u);
-}
-
-void FaultTest::cut_everywhere(const std::string& file, bool refused) {
-  const std::string path = directory.file(file);
-  for (size_t bytes = directory.read(file).size(); bytes-- > 0;) {
-    SCOPED_TRACE(file + " cut to " + std::to_string(bytes));
-    std::filesystem::resize_file(path, bytes);
-    if (refused) {
-      ASSERT_EQ(init(directory.path().c_str(), LX_NO_DEFAULTS), file == "control.nls" ? LX_W_DEFAULTS : LX_OK);
-      EXPECT_EQ(LXGetLocale(kName, 0, nullptr), nullptr);
-      EXPECT_EQ(LXTerm(), LX_OK);
-      EXPECT_EQ(hooks.live_blocks(), 0u);
-    } else {
-      use_damaged_directory();
-    }
-    ASSERT_FALSE(HasFailure());
-  }
-}
-
-void FaultTest::change_everywhere(const std::string& file) {
-  const ByteString whole = directory.read(file);
-  std::fstream stream(directory.file(file), std::ios::binary | std::ios::in | std::ios::out);
-  const auto put = [&](size_t at, uint8_t value) {
-    stream.seekp(static_cast<std::streamoff>(at));
-    stream.put(static_cast<char>(value)).flush();
-  };
-  for (size_t at = 0; at < whole.size(); ++at) {
-    const std::set<uint8_t> values = {static_cast<uint8_t>(whole[at] ^ 0x01), 0, 0xFF};
-    for (uint8_t value : values) {
-      if (value == whole[at]) continue;
-      SCOPED_TRACE(file + " with " + std::to_string(value) + " at " + std::to_string(at));
-      put(at, value);
-      use_damaged_directory();
-      ASSERT_FALSE(HasFailure());
-    }
-    put(at, whole[at]);
-  }
-}
-
-void FaultTest::sweep(const std::string& file, bool refused_when_cut) {
-  const ByteString whole = directory.read(file);
-  ASSERT_FALSE(whole.empty());
-  ASSERT_NO_FATAL_FAILURE(cut_everywhere(file, refused_when_cut));
-  directory.write(file, whole);
-  ASSERT_NO_FATAL_FAILURE(change_everywhere(file));
-  ASSERT_EQ(init(), LX_OK);
-  LXLocale* locale = LXGetLocale(kName, 0, nullptr);
-  ASSERT_NE(locale, nullptr) << "the file is sound when nothing is changed";
-  EXPECT_EQ(locale->codepage->disk.flags, 0);
-  use_locale(locale, true);
-  EXPECT_EQ(LXReleaseLocale(locale), 0);
-}
-
-TEST_F(FaultTest, ControlFile) {
-  write_directory();
-  sweep("control.nls", true);
-}
-TEST_F(FaultTest, AliasFile) {
-  write_directory();
-  sweep("alias.txt", false);
-}
-TEST_F(FaultTest, Language) {
-  write_directory();
-  sweep("la_00001.nls", true);
-}
-TEST_F(FaultTest, Territory) {
-  write_directory();
-  sweep("te_00840.nls", true);
-}
-TEST_F(FaultTest, SingleByteCodepage) {
-  write_directory(ascii_codepage());
-  sweep("cp_00900.nls", true);
-}
-TEST_F(FaultTest, DoubleByteCodepage) {
-  write_directory();
-  sweep("cp_00900.nls", true);
-}
-TEST_F(FaultTest, ShiftCodepage) {
-  write_directory(small_shift_codepage());
-  sweep("cp_00900.nls", true);
-}
-TEST_F(FaultTest, Version1Codepage) {
   write_directory();
   directory.write("cp_00900.nls", object_file(version1_ascii_codepage(), 1));
   cut_everywhere("cp_00900.nls", true);

@@ -4,9 +4,7 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
-#include <cerrno>
 #include <cstring>
-#include <filesystem>
 
 #include "core/library_fixture.h"
 
@@ -18,13 +16,7 @@ class FileTest : public LibraryTest {
   void SetUp() override {
     LibraryTest::SetUp();
     ASSERT_EQ(init(), LX_W_DEFAULTS);
-    blocks_ = hooks.live_blocks();
   }
-  void TearDown() override {
-    EXPECT_EQ(hooks.live_blocks(), blocks_) << "a handle or buffer is left";
-    LibraryTest::TearDown();
-  }
-
   LXFile* open_file(const std::string& name, int32_t mode, int32_t no_temporary = 0) {
     return LXOpenFile(1, directory.file(name).c_str(), mode, no_temporary, &rc);
   }
@@ -38,9 +30,10 @@ class FileTest : public LibraryTest {
   }
 
   int32_t rc = -1;
-  size_t blocks_ = 0;
 };
 
+// Parts that are too long are empty, and the temporary file and what it replaces are named from the parts that
+// remain.
 TEST_F(FileTest, AnExistingFileIsReplacedOnClose) {
   struct Case {
     const char* name;
@@ -48,50 +41,31 @@ TEST_F(FileTest, AnExistingFileIsReplacedOnClose) {
     const char* final;      // what those parts and the extension name
   };
   const Case cases[] = {
-      {"data.nls", "datatmp", "data.nls"},
       {"plain", "plaintmp", "plain"},
       {"two.dots.txt", "two.dotstmp", "two.dots.txt"},
       {"fourteen-bytes.abc", "fourteen-bytestmp", "fourteen-bytes.abc"},
+      {"fifteen-bytes-x.abc", "tmp", ".abc"},
+      {"name.long", "nametmp", "name"},
   };
   for (const Case& c : cases) {
     SCOPED_TRACE(c.name);
+    directory.write_text(c.final, "old");
     directory.write_text(c.name, "old");
     LXFile* file = open_file(c.name, LX_WRITE);
     put(file, "new");
     EXPECT_EQ(rc, LX_OK);
-    EXPECT_EQ(file->temporary, 1);
     EXPECT_TRUE(directory.exists(c.temporary));
     EXPECT_EQ(text_of(c.name), "old");
     EXPECT_EQ(LXCloseFile(file, 0), 0);
     EXPECT_FALSE(directory.exists(c.temporary));
+    EXPECT_EQ(text_of(c.name), c.name == std::string(c.final) ? "new" : "old");
     EXPECT_EQ(text_of(c.final), "new");
 
-    file = open_file(c.name, LX_WRITE);
-    put(file, "newer");
+    put(file = open_file(c.name, LX_WRITE), "newer");
     EXPECT_EQ(LXCloseFile(file, 1), 0);
     EXPECT_FALSE(directory.exists(c.temporary));
-    EXPECT_EQ(text_of(c.name), "new");
+    EXPECT_EQ(text_of(c.final), "new");
   }
-}
-
-// Parts that are too long are empty, and the temporary file and what it replaces are named from the parts that
-// remain.
-TEST_F(FileTest, LongPartsAreLeftOutOfTheNames) {
-  directory.write_text("fifteen-bytes-x.abc", "old");
-  LXFile* file = open_file("fifteen-bytes-x.abc", LX_WRITE);
-  put(file, "new");
-  EXPECT_TRUE(directory.exists("tmp"));
-  EXPECT_NE(LXCloseFile(file, 1), -1);
-  EXPECT_FALSE(directory.exists("tmp"));
-
-  directory.write_text("name.long", "old");
-  directory.write_text("name", "other");
-  file = open_file("name.long", LX_WRITE);
-  put(file, "new");
-  EXPECT_TRUE(directory.exists("nametmp"));
-  EXPECT_EQ(LXCloseFile(file, 0), 0);
-  EXPECT_EQ(text_of("name.long"), "old");
-  EXPECT_EQ(text_of("name"), "new");
 }
 
 TEST_F(FileTest, NewFilesAndUnprotectedOnesAreWrittenInPlace) {
@@ -99,31 +73,16 @@ TEST_F(FileTest, NewFilesAndUnprotectedOnesAreWrittenInPlace) {
   LXFile* file = open_file("fresh.txt", LX_WRITE);
   umask(mask);
   put(file, "one");
-  EXPECT_EQ(file->temporary, 0);
   EXPECT_EQ(text_of("fresh.txt"), "one");
   struct stat status;
   ASSERT_EQ(stat(directory.file("fresh.txt").c_str(), &status), 0);
   EXPECT_EQ(status.st_mode & 07777, 0644u);
   EXPECT_EQ(LXCloseFile(file, 1), 0) << "there is nothing to discard";
-  EXPECT_EQ(text_of("fresh.txt"), "one");
-
   file = open_file("fresh.txt", LX_WRITE, 1);
   put(file, "2");
-  EXPECT_EQ(file->temporary, 0);
   EXPECT_EQ(text_of("fresh.txt"), "2");
   EXPECT_EQ(LXCloseFile(file, 0), 0);
   EXPECT_FALSE(directory.exists("freshtmp"));
-}
-
-TEST_F(FileTest, AFailedReplacementReturnsTheClosesResult) {
-  directory.write_text("data.nls", "old");
-  LXFile* file = open_file("data.nls", LX_WRITE);
-  put(file, "new");
-  std::filesystem::remove(directory.file("data.nls"));
-  const std::vector<std::string> texts =
-      messages(RAS1_LEVEL_ERRORS, [&] { EXPECT_EQ(LXCloseFile(file, 0), 0); });
-  EXPECT_EQ(texts, std::vector<std::string>{"Close failed, rc = " + std::to_string(ENOENT)});
-  EXPECT_FALSE(directory.exists("data.nls"));
 }
 
 // Creation is checked against 0, not against -1: both are kept.
@@ -134,49 +93,39 @@ TEST_F(FileTest, DescriptorRulesOfCreation) {
   EXPECT_EQ(file->descriptor, -1);
   EXPECT_NE(LXCloseFile(file, 0), 0);
 
-  directory.write_text("there.txt", "text");
   const int saved = dup(0);
   close(0);
-  rc = LX_OK;
-  file = open_file("zero.txt", LX_WRITE, 1);
+  LXFile* const created = open_file("zero.txt", LX_WRITE, 1);
   const int32_t write_code = rc;
-  LXFile* const created = file;
   close(0);
-  file = open_file("there.txt", LX_READ);
+  file = open_file("zero.txt", LX_READ);
   const int32_t read_descriptor = file != nullptr ? file->descriptor : -2;
-  const int32_t read_code = rc;
   if (file != nullptr) LXCloseFile(file, 0);
-  if (saved >= 0) {
-    dup2(saved, 0);
-    close(saved);
-  }
+  dup2(saved, 0);
+  close(saved);
   EXPECT_EQ(created, nullptr);
   EXPECT_EQ(write_code, LX_E_OPEN);
   EXPECT_EQ(read_descriptor, 0) << "reading takes any descriptor";
-  EXPECT_EQ(read_code, LX_OK);
 }
 
 TEST_F(FileTest, OpenCodes) {
   directory.write_text("data.txt", "text");
+  const auto expect_code = [&](const char* name, int32_t mode, int32_t code) {
+    EXPECT_EQ(open_file(name, mode), nullptr) << name;
+    EXPECT_EQ(rc, code) << name;
+    hooks.fail_at(0);
+  };
   for (int32_t mode : {LX_READ, LX_READ_WRITE}) {
-    EXPECT_EQ(open_file("none", mode), nullptr);
-    EXPECT_EQ(rc, LX_E_FILE_NOT_FOUND);
-    EXPECT_EQ(open_file("data.txt/none", mode), nullptr);
-    EXPECT_EQ(rc, LX_E_OPEN);
-    EXPECT_FALSE(directory.exists("none"));
+    expect_code("none", mode, LX_E_FILE_NOT_FOUND);
+    expect_code("data.txt/none", mode, LX_E_OPEN);
   }
-  EXPECT_EQ(open_file(".", LX_READ_WRITE), nullptr);
-  EXPECT_EQ(rc, LX_E_OPEN);
-  EXPECT_EQ(open_file("data.txt", 3), nullptr);
-  EXPECT_EQ(rc, LX_E_OPEN);
-
+  expect_code(".", LX_READ_WRITE, LX_E_OPEN);
+  expect_code("data.txt", 3, LX_E_OPEN);
   hooks.fail_at(1);
-  EXPECT_EQ(open_file("data.txt", LX_READ), nullptr);
-  EXPECT_EQ(rc, LX_E_MEMORY);
+  expect_code("data.txt", LX_READ, LX_E_MEMORY);
   hooks.fail_at(1);
-  EXPECT_EQ(open_file("new.txt", LX_WRITE), nullptr);
-  EXPECT_EQ(rc, LX_E_MEMORY);
-  EXPECT_FALSE(directory.exists("new.txt"));
+  expect_code("none", LX_WRITE, LX_E_MEMORY);
+  EXPECT_FALSE(directory.exists("none"));
 }
 
 TEST_F(FileTest, AccessDenied) {
@@ -198,24 +147,18 @@ TEST_F(FileTest, ReadsAndSeeks) {
   directory.write_text("data.txt", "0123456789");
   LXFile* file = open_file("data.txt", LX_READ);
   ASSERT_NE(file, nullptr);
-  EXPECT_EQ(file->mode, LX_READ);
   EXPECT_EQ(LXFileSize(file), 10);
   struct Case {
-    int32_t offset;
-    int32_t origin;
-    int32_t result;
+    int32_t offset, origin, result;
     char next;
   };
-  const Case cases[] = {
-      {4, LX_FROM_START, 0, '4'},
-      {2, LX_FROM_HERE, 0, '7'},
-      {-3, LX_FROM_END, 0, '7'},
-      {-2, LX_FROM_HERE, 0, '6'},
-      {3, 0, 0, '3'},
-      {5, 13, 0, '5'},
-      {-1, LX_FROM_START, 1, '6'},
-      {-11, LX_FROM_END, 1, '7'},
-  };
+  const Case cases[] = {{4, LX_FROM_START, 0, '4'},
+                        {2, LX_FROM_HERE, 0, '7'},
+                        {-3, LX_FROM_END, 0, '7'},
+                        {3, 0, 0, '3'},
+                        {5, 13, 0, '5'},
+                        {-1, LX_FROM_START, 1, '6'},
+                        {-11, LX_FROM_END, 1, '7'}};
   for (const Case& c : cases) {
     SCOPED_TRACE(c.next);
     EXPECT_EQ(LXSeekFile(file, c.offset, c.origin), c.result);
@@ -231,9 +174,7 @@ TEST_F(FileTest, ReadsAndSeeks) {
   EXPECT_EQ(LXReadFile(file, buffer, 20, &rc), 0);
   EXPECT_EQ(rc, LX_OK) << "the end of the file is no failure";
   EXPECT_EQ(LXCloseFile(file, 0), 0);
-
   file = open_file(".", LX_READ);
-  ASSERT_NE(file, nullptr);
   EXPECT_EQ(LXReadFile(file, buffer, 20, &rc), 0);
   EXPECT_EQ(rc, LX_E_FILE_IO);
   EXPECT_EQ(LXCloseFile(file, 0), 0);
@@ -245,18 +186,12 @@ TEST_F(FileTest, LoadsBytes) {
   ASSERT_NE(file, nullptr);
   struct Case {
     uint32_t offset;
-    int32_t bytes;
-    int32_t code;
+    int32_t bytes, code;
     const char* text;
   };
   const Case cases[] = {
-      {0, 10, LX_OK, "0123456789"},
-      {7, 3, LX_OK, "789"},
-      {7, 4, LX_E_FILE_IO, nullptr},
-      {0xFFFFFFFF, 1, LX_E_FILE_IO, nullptr},
-      {0x80000000, 1, LX_E_FILE_IO, nullptr},
-      {0, 0, LX_OK, nullptr},
-      {99, 0, LX_OK, nullptr},
+      {0, 10, LX_OK, "0123456789"},           {7, 3, LX_OK, "789"},   {7, 4, LX_E_FILE_IO, nullptr},
+      {0xFFFFFFFF, 1, LX_E_FILE_IO, nullptr}, {0, 0, LX_OK, nullptr},
   };
   for (const Case& c : cases) {
     SCOPED_TRACE(c.offset);
@@ -269,6 +204,10 @@ TEST_F(FileTest, LoadsBytes) {
     }
     EXPECT_EQ(LXUnloadFile(block), 0);
   }
+  void* block = LXLoadFile(file, 0, 4, &rc);
+  hooks.fail_frees(true);
+  EXPECT_EQ(LXUnloadFile(block), 0) << "it never fails";
+  hooks.fail_frees(false);
   hooks.fail_at(1);
   EXPECT_EQ(LXLoadFile(file, 0, 10, &rc), nullptr);
   EXPECT_EQ(rc, LX_E_MEMORY);
@@ -276,8 +215,6 @@ TEST_F(FileTest, LoadsBytes) {
   EXPECT_EQ(LXCloseFile(file, 0), 0);
 
   file = open_file("data.txt", LX_WRITE, 1);
-  ASSERT_NE(file, nullptr);
-  EXPECT_EQ(file->write_only, 1);
   char byte;
   EXPECT_EQ(LXReadFile(file, &byte, 1, &rc), 0);
   EXPECT_EQ(rc, LX_E_FILE_MODE);
@@ -286,51 +223,26 @@ TEST_F(FileTest, LoadsBytes) {
   EXPECT_EQ(LXCloseFile(file, 0), 0);
 }
 
-TEST_F(FileTest, UnloadingNeverFails) {
-  directory.write_text("data.txt", "text");
-  LXFile* file = open_file("data.txt", LX_READ);
-  void* block = LXLoadFile(file, 0, 4, &rc);
-  hooks.fail_frees(true);
-  EXPECT_EQ(LXUnloadFile(block), 0);
-  EXPECT_EQ(LXUnloadFile(nullptr), 0);
-  hooks.fail_frees(false);
-  LXCloseFile(file, 0);
-}
-
 TEST(PathTest, Parts) {
   const std::string deep = "/" + std::string(253, 'd') + "/";  // 255 bytes
   struct Case {
-    std::string path;
-    std::string drive, directory, file, extension;
+    std::string path, drive, directory, file, extension;
   };
-  const Case cases[] = {
-      {"", "", "", "", ""},
-      {"name", "", "", "name", ""},
-      {"name.ext", "", "", "name", ".ext"},
-      {"/dir/sub/name.ext", "", "/dir/sub/", "name", ".ext"},
-      {"dir/", "", "dir/", "", ""},
-      {"a:name", "a:", "", "name", ""},
-      {"ab:/dir/name.x", "ab:", "/dir/", "name", ".x"},
-      {":name", ":", "", "name", ""},
-      {"abc:name", "", "", "abc:name", ""},
-      {"a:b:c", "a:", "", "b:c", ""},
-      {".", "", ".", "", "."},
-      {"..", "", "..", "", "."},
-      {"/dir/..", "", "/dir/..", "", "."},
-      {"/dir/.", "", "/dir/.", "", "."},
-      {"a:..", "a:", "..", "", "."},
-      {"/dir/...", "", "/dir/", "..", "."},
-      {"two.dots.txt", "", "", "two.dots", ".txt"},
-      {".rc", "", "", "", ".rc"},
-      {"name.", "", "", "name", "."},
-      {"name.html", "", "", "name", ""},
-      {"fourteen-bytes", "", "", "fourteen-bytes", ""},
-      {"fifteen-bytes-x", "", "", "", ""},
-      {"fifteen-bytes-x.txt", "", "", "", ".txt"},
-      {"/v1.2/name", "", "/v1.2/", "name", ""},
-      {"/v.x/a", "", "/v.x/", "a", ".x/a"},
-      {deep + "n", "", deep, "n", ""},
-  };
+  const Case cases[] = {{"/dir/sub/name.ext", "", "/dir/sub/", "name", ".ext"},
+                        {"ab:/dir/name.x", "ab:", "/dir/", "name", ".x"},
+                        {":name", ":", "", "name", ""},
+                        {"abc:name", "", "", "abc:name", ""},
+                        {".", "", ".", "", "."},
+                        {"/dir/..", "", "/dir/..", "", "."},
+                        {"a:..", "a:", "..", "", "."},
+                        {"/dir/...", "", "/dir/", "..", "."},
+                        {".rc", "", "", "", ".rc"},
+                        {"name.html", "", "", "name", ""},
+                        {"fifteen-bytes-x.txt", "", "", "", ".txt"},
+                        {"/v1.2/name", "", "/v1.2/", "name", ""},
+                        {"/v.x/a", "", "/v.x/", "a", ".x/a"},
+                        {deep + "n", "", deep, "n", ""},
+                        {deep + "d/n", "", "", "n", ""}};
   for (const Case& c : cases) {
     SCOPED_TRACE(c.path);
     char drive[4] = "###", directory[256] = "#", file[15] = "#", extension[5] = "#";
@@ -348,21 +260,9 @@ TEST(PathTest, Parts) {
   }
 }
 
-TEST(PathTest, Joins) {
-  char path[64];
-  MakePath(path, "a:", "/dir/", "name", ".ext");
-  EXPECT_STREQ(path, "a:/dir/name.ext");
-  MakePath(path, "", "dir", "name", "");
-  EXPECT_STREQ(path, "dirname") << "nothing is inserted";
-  MakePath(path, "", "", "", "");
-  EXPECT_STREQ(path, "");
-}
-
 TEST(PathTest, ComparesWithoutCase) {
   EXPECT_EQ(LXmemicmp("BINARY", "binarY", 6), 0);
-  EXPECT_EQ(LXmemicmp("abcX", "ABCY", 3), 0);
   EXPECT_EQ(LXmemicmp("abcX", "ABCy", 4), 'x' - 'y');
-  EXPECT_EQ(LXmemicmp("B", "a", 1), 1);
   EXPECT_EQ(LXmemicmp("_", "A", 1), '_' - 'a') << "the lowered bytes are compared";
   EXPECT_EQ(LXmemicmp("\xFF", "\x01", 1), 0xFE) << "bytes have no sign";
   EXPECT_EQ(LXmemicmp("a\0b", "A\0C", 3), 'b' - 'c') << "a null is a byte like any other";

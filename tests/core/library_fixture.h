@@ -67,8 +67,6 @@ class LibraryTest : public ::testing::Test {
     }
   }
 
-  static LXObjManager* manager() { return lx::globals.area->manager; }
-
   /// The texts of the messages that `action` causes while the level is `level`.
   static std::vector<std::string> messages(uint32_t level, const std::function<void()>& action) {
     RecordingTrace::take();

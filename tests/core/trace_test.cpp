@@ -3,8 +3,8 @@
 #include <unistd.h>
 
 #include <algorithm>
-#include <cstring>
 #include <filesystem>
+#include <regex>
 
 #include "core/library_fixture.h"
 #include "core/lxformat.h"
@@ -26,12 +26,7 @@ class TraceTest : public LibraryTest {
     auto at = texts.begin();
     for (const std::string& text : expected) {
       const auto found = std::find(at, texts.end(), text);
-      if (found == texts.end()) {
-        std::string all;
-        for (const std::string& other : texts) all += "\n  " + other;
-        ADD_FAILURE() << "no message \"" << text << "\" among" << all;
-        break;
-      }
+      ASSERT_NE(found, texts.end()) << "no message " << text << " among " << ::testing::PrintToString(texts);
       at = found + 1;
     }
     const std::vector<std::string> others = messages(kAllLevels & ~level, action);
@@ -49,6 +44,12 @@ class TraceTest : public LibraryTest {
       terminate();
     };
   }
+  void expect_error_at_allocation(size_t n, const std::vector<std::string>& expected) {
+    expect_messages(RAS1_LEVEL_ERRORS, expected, [&] {
+      hooks.fail_at(n);
+      in_library()();
+    });
+  }
   static std::string bytes(size_t count) { return std::to_string(count); }
   void write_table() {
     directory.write("control.nls", control_file({{1, LX_LANGUAGE, "English"},
@@ -65,16 +66,9 @@ TEST_F(TraceTest, Initialisation) {
   expect_messages(RAS1_LEVEL_DETAIL,
                   {"Creating global area", "Lexicor init count = 0", "Lexicor init count = 2"},
                   in_library([this] { init(); }));
-  expect_messages(RAS1_LEVEL_ERRORS,
-                  {"Unable to allocate " + bytes(sizeof(lx::GlobalArea)) + " bytes for globals"}, [&] {
-                    hooks.fail_at(1);
-                    in_library()();
-                  });
-  expect_messages(RAS1_LEVEL_ERRORS,
-                  {"Unable to allocate " + bytes(sizeof(LXObjManager)) + " bytes for object manager"}, [&] {
-                    hooks.fail_at(2);
-                    in_library()();
-                  });
+  expect_error_at_allocation(1, {"Unable to allocate " + bytes(sizeof(lx::GlobalArea)) + " bytes for globals"});
+  expect_error_at_allocation(
+      2, {"Unable to allocate " + bytes(sizeof(LXObjManager)) + " bytes for object manager"});
   expect_messages(RAS1_LEVEL_INPUT, {"directory = " + path + ".", "options = 7"}, in_library([] {}, 7));
   expect_messages(RAS1_LEVEL_INPUT, {"options = -2147483647"}, in_library([] {}, LX_NO_DEFAULTS));
   setenv("LX_LOCALEDIR", path.c_str(), 1);
@@ -95,8 +89,7 @@ TEST_F(TraceTest, ControlFile) {
                     init(long_path.c_str());
                     terminate();
                   });
-  expect_messages(RAS1_LEVEL_INPUT, {"Opening file " + control, std::string("Opening file ") + kDefaultControl},
-                  in_library());
+  expect_messages(RAS1_LEVEL_INPUT, {"Opening file " + control}, in_library());
   expect_messages(RAS1_LEVEL_ERRORS,
                   {"Unable to open " + control + ", err = 1000", "Unable to open control file"}, in_library());
 
@@ -111,11 +104,7 @@ TEST_F(TraceTest, ControlFile) {
                    "Alias list build failed. No aliases supported"},
                   in_library());
   // Area, manager, file, header; then the raw records.
-  expect_messages(RAS1_LEVEL_ERRORS, {"Unable to allocate 114 bytes for control data"}, [&] {
-    hooks.fail_at(5);
-    in_library()();
-  });
-
+  expect_error_at_allocation(5, {"Unable to allocate 114 bytes for control data"});
   const ByteString whole = directory.read("control.nls");
   ByteString content = whole;
   content[0] = 0;
@@ -123,34 +112,18 @@ TEST_F(TraceTest, ControlFile) {
   expect_messages(RAS1_LEVEL_ERRORS, {"Control file header is corrupted"}, in_library());
 
   // The file's address stands in the next two.
-  const auto only_error = [&](const std::string& start, const std::string& end) {
-    bool found = false;
-    for (const std::string& text : messages(RAS1_LEVEL_ERRORS, in_library()))
-      found |= text.rfind(start, 0) == 0 && text.size() > start.size() + end.size() &&
-               text.compare(text.size() - end.size(), end.size(), end) == 0;
-    EXPECT_TRUE(found) << start << "..." << end;
+  const auto expect_error = [&](const std::string& pattern) {
+    directory.write("control.nls", content);
+    const std::vector<std::string> texts = messages(RAS1_LEVEL_ERRORS, in_library());
+    const auto matches = [&](const std::string& text) { return std::regex_match(text, std::regex(pattern)); };
+    EXPECT_TRUE(std::any_of(texts.begin(), texts.end(), matches)) << pattern;
   };
   content = whole;
   put_le32(content.data() + format::header_section_offset(0), 0xFFFFFFFE);
-  directory.write("control.nls", content);
-  only_error("Seek to offset -2 failed for file 0x", "");
+  expect_error("Seek to offset -2 failed for file 0x.+");
   content = whole;
   content.pop_back();
-  directory.write("control.nls", content);
-  only_error("Read of 114 bytes from file 0x", " failed with error 1003");
-}
-
-TEST_F(TraceTest, LookUps) {
-  directory.write_locale({{367, "US-ASCII", ascii_codepage()}});
-  expect_messages(RAS1_LEVEL_INPUT, {"Searching for type 2, name US-ASCII"}, in_library([] {
-                    LXGetObjFromName(nullptr, LX_CODEPAGE, "US-ASCII@x", 8, LX_FIND_ONLY, &ignored);
-                  }));
-  expect_messages(RAS1_LEVEL_INPUT, {"Searching for type 0, name English"}, in_library([] {
-                    const LXWChar name[] = {'E', 'n', 'g', 'l', 'i', 's', 'h', 0};
-                    LXGetObjFromNameW(nullptr, LX_LANGUAGE, name, 8, LX_FIND_ONLY, &ignored);
-                  }));
-  expect_messages(RAS1_LEVEL_INPUT, {"Opening file " + directory.file("cp_00367.nls")},
-                  in_library([] { LXGetObjFromID(nullptr, LX_CODEPAGE, 367, LX_FIND_AND_LOAD, &ignored); }));
+  expect_error("Read of 114 bytes from file 0x.+ failed with error 1003");
 }
 
 TEST_F(TraceTest, Aliases) {
@@ -176,13 +149,9 @@ TEST_F(TraceTest, Aliases) {
   init();
   const size_t calls = hooks.calls();
   terminate();
-  expect_messages(
-      RAS1_LEVEL_ERRORS,
-      {"Unable to allocate " + bytes(sizeof(lx::AliasRecord)) + " bytes for codepage A, alias one", failed},
-      [&] {
-        hooks.fail_at(calls);
-        in_library()();
-      });
+  expect_error_at_allocation(
+      calls,
+      {"Unable to allocate " + bytes(sizeof(lx::AliasRecord)) + " bytes for codepage A, alias one", failed});
   expect_messages(RAS1_LEVEL_INPUT, {"Searching for One."},
                   in_library([] { LXGetCodepageFromAlias(nullptr, "One"); }));
   expect_messages(RAS1_LEVEL_NOTICES, {"One -> A"}, in_library([] { LXGetCodepageFromAlias(nullptr, "One"); }));
@@ -201,7 +170,8 @@ TEST_F(TraceTest, Files) {
     directory.write_text("data.nls", "text");
     LXFile* file = LXOpenFile(0, path.c_str(), LX_WRITE, 0, &ignored);
     std::filesystem::remove(path);
-    LXCloseFile(file, 0);
+    EXPECT_EQ(LXCloseFile(file, 0), 0) << "the result is the close's";
+    EXPECT_FALSE(directory.exists("data.nls"));
   });
   expect_messages(RAS1_LEVEL_DETAIL,
                   {"Original path: a:/d/name.ext\n drive: a:\n directory: /d/\n file: name\n extent: .ext"},
@@ -211,81 +181,54 @@ TEST_F(TraceTest, Files) {
                   });
 }
 
-TEST_F(TraceTest, Locales) {
+TEST_F(TraceTest, LookUpsAndLocales) {
   directory.write_locale({{367, "US-ASCII", ascii_codepage()}});
-  const auto create = [this](const char* name) {
-    return in_library([name] { EXPECT_EQ(LXGetLocale(name, 0, nullptr), nullptr); });
-  };
-  expect_messages(RAS1_LEVEL_ERRORS, {"Unable to locate language, rc = 37"}, create("X"));
-  expect_messages(RAS1_LEVEL_ERRORS, {"Unable to locate territory, rc = 37"}, create("English_X"));
-  expect_messages(RAS1_LEVEL_ERRORS, {"Unable to locate code page, rc = 37"}, create("English.X"));
-  expect_messages(RAS1_LEVEL_ERRORS, {"Unable to locate sort, rc = 37"}, create("English@X"));
+  const char* const cases[][2] = {{"X", "Unable to locate language, rc = 37"},
+                                  {"English_X", "Unable to locate territory, rc = 37"},
+                                  {"English.X", "Unable to locate code page, rc = 37"},
+                                  {"English@X", "Unable to locate sort, rc = 37"}};
+  for (const auto& c : cases)
+    expect_messages(RAS1_LEVEL_ERRORS, {c[1]}, in_library([&c] { LXGetLocale(c[0], 0, nullptr); }));
+  expect_messages(RAS1_LEVEL_INPUT,
+                  {"Searching for type 2, name US-ASCII", "Searching for type 0, name English"}, in_library([] {
+                    LXGetObjFromName(nullptr, LX_CODEPAGE, "US-ASCII@x", 8, LX_FIND_ONLY, &ignored);
+                    const LXWChar name[] = {'E', 'n', 'g', 'l', 'i', 's', 'h', 0};
+                    LXGetObjFromNameW(nullptr, LX_LANGUAGE, name, 8, LX_FIND_ONLY, &ignored);
+                  }));
 }
 
 TEST_F(TraceTest, Events) {
   directory.write_locale({{367, "US-ASCII", ascii_codepage()}});
-  struct Shown {
-    TraceRecord::Kind kind;
-    intptr_t value;
-  };
-  /// The first and the last event of `action`.
-  const auto outer_events = [](const std::function<void()>& action) {
-    RecordingTrace::take();
-    RecordingTrace::set_level(RAS1_LEVEL_EVENTS);
-    action();
-    RecordingTrace::set_level(0);
-    const std::vector<TraceRecord> records = RecordingTrace::take();
-    int depth = 0;
-    for (const TraceRecord& record : records) {
-      EXPECT_NE(record.kind, TraceRecord::kMessage) << record.text;
-      EXPECT_FALSE(record.unit.empty());
-      EXPECT_GT(record.line, 0);
-      depth += record.kind == TraceRecord::kEntry ? 1 : -1;
-      EXPECT_GE(depth, 0);
-    }
-    EXPECT_EQ(depth, 0) << "each entry has its exit";
-    if (records.size() < 2) return Shown{TraceRecord::kMessage, 0};
-    EXPECT_EQ(records.front().kind, TraceRecord::kEntry);
-    return Shown{records.back().kind, records.back().value};
-  };
-  LXLocale* locale = nullptr;
-  const auto expect_value = [&](const char* what, intptr_t value, const std::function<void()>& action) {
-    SCOPED_TRACE(what);
-    const Shown shown = outer_events(action);
-    EXPECT_EQ(shown.kind, TraceRecord::kExitValue);
-    EXPECT_EQ(shown.value, value);
-  };
-  expect_value("LXInit", LX_OK, [this] { init(); });
-  expect_value("LXGetObjFromName", 0, [] { LXGetObjFromName(nullptr, LX_LANGUAGE, "X", 1, 0, &ignored); });
-  LXObject* const entry = LXGetObjFromID(nullptr, LX_CODEPAGE, 367, LX_FIND_ONLY, &ignored);
-  expect_value("LXGetObjFromID", reinterpret_cast<intptr_t>(entry),
-               [] { LXGetObjFromID(nullptr, LX_CODEPAGE, 367, LX_FIND_AND_LOAD, &ignored); });
-  expect_value("LXSetLocale", LX_E_NO_LANGUAGE, [] { LXSetLocale("X", 0); });
-  expect_value("LXGetLocale that fails", 0, [] { LXGetLocale("X", 0, nullptr); });
-  const Shown created = outer_events([&] { locale = LXGetLocale("English", 0, nullptr); });
-  EXPECT_EQ(created.value, reinterpret_cast<intptr_t>(locale));
-  char name[12];
-  expect_value("LXConvertLocale", 1, [&] { LXConvertLocale(locale, name, 0); });
-  expect_value("LXReleaseLocale", 0, [&] { LXReleaseLocale(locale); });
   char drive[4], directory_part[256], file[15], extension[5];
-  EXPECT_EQ(outer_events([&] { SplitPath("/d/name.ext", drive, directory_part, file, extension); }).kind,
-            TraceRecord::kExit);
-  expect_value("LXTerm", LX_OK, [] { LXTerm(); });
-  expect_value("LXTerm once too often", LX_E_NOT_INITIALIZED, [] { LXTerm(); });
-}
-
-TEST_F(TraceTest, OffRecordsNothing) {
-  directory.write_locale({{367, "US-ASCII", ascii_codepage()}});
-  directory.write_text("alias.txt", " wrong\n");
   RecordingTrace::set_level(RAS1_LEVEL_EVENTS);
+  init();
+  LXGetObjFromName(nullptr, LX_LANGUAGE, "X", 1, 0, &ignored);
+  const auto entry = reinterpret_cast<intptr_t>(LXGetObjFromID(nullptr, LX_CODEPAGE, 367, 0, &ignored));
+  LXSetLocale("X", 0);
+  LXGetLocale("X", 0, nullptr);
+  LXLocale* const locale = LXGetLocale("English", 0, nullptr);
+  LXConvertLocale(locale, file, 0);
+  LXReleaseLocale(locale);
+  SplitPath("/d/name.ext", drive, directory_part, file, extension);
+  LXTerm();
+  LXTerm();
   RecordingTrace::set_level(0);
-  RecordingTrace::take();
-  in_library([] {
-    LXSetLocale("X", 0);
-    LXSetLocale("English", 0);
-    LXGetCodepageFromAlias(nullptr, "x");
-  })();
-  EXPECT_TRUE(RecordingTrace::take().empty());
+  std::vector<intptr_t> values;  // of the calls from outside; -1 is an exit without one
+  int depth = 0;
+  for (const TraceRecord& record : RecordingTrace::take()) {
+    EXPECT_NE(record.kind, TraceRecord::kMessage) << record.text;
+    EXPECT_FALSE(record.unit.empty());
+    EXPECT_GT(record.line, 0);
+    depth += record.kind == TraceRecord::kEntry ? 1 : -1;
+    ASSERT_GE(depth, 0);
+    if (depth == 0) values.push_back(record.kind == TraceRecord::kExitValue ? record.value : -1);
+  }
+  EXPECT_EQ(depth, 0) << "each entry has its exit";
+  EXPECT_EQ(values,
+            (std::vector<intptr_t>{LX_OK, 0, entry, LX_E_NO_LANGUAGE, 0, reinterpret_cast<intptr_t>(locale), 1,
+                                   0, -1, LX_OK, LX_E_NOT_INITIALIZED}));
+  in_library([] { LXSetLocale("X", 0); })();
+  EXPECT_TRUE(RecordingTrace::take().empty()) << "the trace is off";
 }
 
 }  // namespace

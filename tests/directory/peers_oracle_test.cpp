@@ -171,7 +171,8 @@ class Differences {
   template <class Value>
   void add(const std::string& line, const std::string& character, const Value& ours, const Value& theirs) {
     Group& group = groups_[line];
-    if (group.count++ < kExamples) group.examples += " " + character + ":" + hex_of(ours) + "/" + hex_of(theirs);
+    if (group.count++ < kExamples)
+      group.examples += " " + character + ":" + hex_of(ours) + "/" + hex_of(theirs);
   }
   struct Group {
     size_t count = 0;

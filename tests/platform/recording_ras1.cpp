@@ -27,15 +27,9 @@ void add(TraceRecord::Kind kind, const RAS1_Unit& unit, int line, TraceRecord re
 }
 
 /// The library may look at errno after a trace call.
-class KeepErrno {
- public:
-  KeepErrno() : saved_(errno) {}
-  ~KeepErrno() { errno = saved_; }
-  KeepErrno(const KeepErrno&) = delete;
-  KeepErrno& operator=(const KeepErrno&) = delete;
-
- private:
-  int saved_;
+struct KeepErrno {
+  const int saved = errno;
+  ~KeepErrno() { errno = saved; }
 };
 
 }  // namespace
@@ -70,41 +64,24 @@ uint32_t RAS1_Sync(RAS1_Unit* unit) {
 void RAS1_Event(RAS1_Unit* unit, int line, int kind, intptr_t value) {
   KeepErrno keep;
   TraceRecord record{};
-  switch (kind) {
-    case RAS1_EVENT_ENTRY:
-      add(TraceRecord::kEntry, *unit, line, std::move(record));
-      break;
-    case RAS1_EVENT_EXIT_VALUE:
-      record.value = value;
-      add(TraceRecord::kExitValue, *unit, line, std::move(record));
-      break;
-    case RAS1_EVENT_EXIT:
-      add(TraceRecord::kExit, *unit, line, std::move(record));
-      break;
-    default:
-      fprintf(stderr, "%s:%d: event kind %d\n", unit->name, line, kind);
-      abort();
-  }
+  if (kind == RAS1_EVENT_EXIT_VALUE) record.value = value;
+  const auto recorded = kind == RAS1_EVENT_ENTRY        ? TraceRecord::kEntry
+                        : kind == RAS1_EVENT_EXIT_VALUE ? TraceRecord::kExitValue
+                                                        : TraceRecord::kExit;
+  if (recorded == TraceRecord::kExit && kind != RAS1_EVENT_EXIT) abort();
+  add(recorded, *unit, line, std::move(record));
 }
 
 void RAS1_Printf(RAS1_Unit* unit, int line, const char* format, ...) {
   KeepErrno keep;
   TraceRecord record{};
-  record.format = format;
+  char text[8192];
   va_list arguments;
   va_start(arguments, format);
-  va_list again;
-  va_copy(again, arguments);
-  const int bytes = vsnprintf(nullptr, 0, format, arguments);
+  const int bytes = vsnprintf(text, sizeof(text), format, arguments);
   va_end(arguments);
-  if (bytes < 0) {
-    fprintf(stderr, "%s:%d: cannot format \"%s\"\n", unit->name, line, format);
-    abort();
-  }
-  record.text.resize(static_cast<size_t>(bytes) + 1);
-  vsnprintf(record.text.data(), record.text.size(), format, again);
-  va_end(again);
-  record.text.pop_back();
+  if (bytes < 0 || static_cast<size_t>(bytes) >= sizeof(text)) abort();
+  record.text = text;
   add(TraceRecord::kMessage, *unit, line, std::move(record));
 }
 

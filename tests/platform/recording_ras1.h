@@ -17,7 +17,6 @@ struct TraceRecord {
   uint32_t level;              // the level that was set when the record was made
   intptr_t value;              // kExitValue
   std::string text;            // kMessage: as formatted; kDump: the label
-  std::string format;          // kMessage: before formatting
   std::vector<uint8_t> bytes;  // kDump
 };
 

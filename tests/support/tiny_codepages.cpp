@@ -79,23 +79,6 @@ CodepageBuilder& CodepageBuilder::map(uint32_t code, uint16_t unicode, unsigned 
   return *this;
 }
 
-CodepageBuilder& CodepageBuilder::shift(uint8_t out, uint8_t in) {
-  shift_out_ = out;
-  shift_in_ = in;
-  shift_ = true;
-  return *this;
-}
-
-CodepageBuilder& CodepageBuilder::substitution(uint8_t byte) {
-  substitution_ = byte;
-  return *this;
-}
-
-CodepageBuilder& CodepageBuilder::two_arrays() {
-  two_arrays_ = true;
-  return *this;
-}
-
 CodepageBuilder::Node CodepageBuilder::tree() const {
   Node root;
   for (const auto& [code, unicode] : to_unicode_) {

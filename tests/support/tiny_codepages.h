@@ -44,10 +44,12 @@ class CodepageBuilder {
   /// `count` characters from this packed code and this Unicode value on, both ways.
   CodepageBuilder& map(uint32_t code, uint16_t unicode, unsigned count = 1);
   CodepageBuilder& ascii() { return map(0, 0, 0x80); }
-  CodepageBuilder& shift(uint8_t out, uint8_t in);
-  CodepageBuilder& substitution(uint8_t byte);
+  CodepageBuilder& shift(uint8_t out, uint8_t in) {
+    return shift_out_ = out, shift_in_ = in, shift_ = true, *this;
+  }
+  CodepageBuilder& substitution(uint8_t byte) { return substitution_ = byte, *this; }
   /// Pages of two-byte characters are split into two arrays of bytes.
-  CodepageBuilder& two_arrays();
+  CodepageBuilder& two_arrays() { return two_arrays_ = true, *this; }
   TinyCodepage build() const;
 
  private:

@@ -2,8 +2,11 @@
 // and where each fault is reported.
 #include <gtest/gtest.h>
 
+#include <cstring>
 #include <fstream>
+#include <functional>
 #include <iterator>
+#include <set>
 #include <sstream>
 
 #include "alias_source.h"
@@ -37,26 +40,21 @@ std::string with(std::string text, const std::string& from, const std::string& t
   return at == std::string::npos ? text : text.replace(at, from.size(), to);
 }
 
-template <typename Step>
-std::string fault_of(Step step) {
+std::string fault_of(const std::function<void()>& step) {
   try {
     step();
   } catch (const SourceError& error) {
     return error.what();
   }
-  return "";
+  return "none";
 }
 
 TEST(Sha256, StandardVectors) {
   auto hex = [](const std::string& text) {
     std::string out;
-    for (uint8_t byte : sha256(text)) {
-      out += "0123456789abcdef"[byte >> 4];
-      out += "0123456789abcdef"[byte & 15];
-    }
+    for (uint8_t byte : sha256(text)) (out += "0123456789abcdef"[byte >> 4]) += "0123456789abcdef"[byte & 15];
     return out;
   };
-  EXPECT_EQ(hex(""), "e3b0c44298fc1c149afbf4c8996fb92427ae41e4649b934ca495991b7852b855");
   EXPECT_EQ(hex("abcdbcdecdefdefgefghfghighijhijkijkljklmklmnlmnomnopnopq"),
             "248d6a61d20638b8e5c026930c3e6039a33ce45964ff2167f6ecedd419db06c1");
   EXPECT_EQ(hex(std::string(1000000, 'a')), "cdc76e5c9914fb9281a1c7e284d73e67f1809a48a497200e046d39ccc7112cd0");
@@ -69,33 +67,31 @@ TEST(RowPacker, RowsStandWhereTheyWerePlaced) {
     random = random * 1664525 + 1013904223;
     return (random >> 16) % limit;
   };
-  for (int round = 0; round < 50; ++round) {
-    RowPacker<uint16_t> packer(0xFFFF);
-    size_t total = 0;
-    for (int turn = 0; turn < 2; ++turn) {
-      std::vector<RowPacker<uint16_t>::Request> requests;
-      for (int i = 0; i < 20; ++i) {
-        RowPacker<uint16_t>::Request request;
-        request.first_index = next(40);
-        for (uint32_t length = 1 + next(30); length > 0; --length) {
-          request.row.push_back(static_cast<uint16_t>(next(2)));
-        }
-        total += request.row.size();
-        requests.push_back(request);
+  RowPacker<uint16_t> packer(0xFFFF);
+  for (int round = 0; round < 100; ++round) {
+    if (round % 2 == 0) packer = RowPacker<uint16_t>(0xFFFF);  // a round adds to an empty or to a filled pool
+    size_t total = packer.pool().size();
+    std::vector<RowPacker<uint16_t>::Request> requests;
+    for (int i = 0; i < 20; ++i) {
+      RowPacker<uint16_t>::Request request;
+      request.first_index = next(40);
+      for (uint32_t length = 1 + next(30); length > 0; --length) {
+        request.row.push_back(static_cast<uint16_t>(next(2)));
       }
-      const auto positions = packer.place(requests);
-      for (size_t i = 0; i < requests.size(); ++i) {
-        ASSERT_GE(positions[i], requests[i].first_index);
-        for (size_t k = 0; k < requests[i].row.size(); ++k) {
-          ASSERT_EQ(packer.pool().at(positions[i] + k), requests[i].row[k]);
-        }
-      }
+      total += request.row.size();
+      requests.push_back(request);
+    }
+    const auto positions = packer.place(requests);
+    for (size_t i = 0; i < requests.size(); ++i) {
+      ASSERT_GE(positions[i], requests[i].first_index);
+      for (size_t k = 0; k < requests[i].row.size(); ++k)
+        ASSERT_EQ(packer.pool().at(positions[i] + k), requests[i].row[k]);
     }
     EXPECT_LT(packer.pool().size(), total + 40);
   }
-  RowPacker<int> packer(0);
-  packer.place({{{1, 2, 3, 4}, 0}, {{2, 3}, 0}, {{4, 5}, 0}, {{1, 2, 3, 4}, 0}});
-  EXPECT_EQ(packer.pool(), (std::vector<int>{1, 2, 3, 4, 5}));
+  RowPacker<int> small(0);
+  small.place({{{1, 2, 3, 4}, 0}, {{2, 3}, 0}, {{4, 5}, 0}, {{1, 2, 3, 4}, 0}});
+  EXPECT_EQ(small.pool(), (std::vector<int>{1, 2, 3, 4, 5}));
 }
 
 // The library's built-in payloads are these values: 578 and 192 bytes.
@@ -104,20 +100,18 @@ TEST(LocaleText, BuiltInValuesHaveTheBuiltInLayout) {
   std::istringstream language_in(language_text), territory_in(shipped("territories/UnitedStates.toml"));
   const ByteVector language = pack_language(read_language(language_in, "e", built_in_control()), "e");
   const ByteVector territory = pack_territory(read_territory(territory_in, "u"), "u");
-  auto word = [](const ByteVector& payload, size_t n) { return lx::le16(&payload[2 * n]); };
+  auto word = [](const ByteVector& payload, int n) { return lx::le16(&payload[static_cast<size_t>(2 * n)]); };
 
   ASSERT_EQ(language.size(), 578U);
-  const std::vector<std::pair<size_t, uint16_t>> language_words = {{0, 1}, {1, 1},   {2, 0},    {3, 0},
-                                                                   {4, 0}, {5, 102}, {49, 578}, {50, 578}};
-  for (const auto& [n, value] : language_words) EXPECT_EQ(word(language, n), value) << n;
+  for (auto [n, value] : {std::pair{0, 1}, {1, 1}, {2, 0}, {3, 0}, {4, 0}, {5, 102}, {49, 578}, {50, 578}})
+    EXPECT_EQ(word(language, n), value) << n;
   EXPECT_EQ(lx::le16(&language[word(language, 33)]), 0) << "the 13th month is empty";
   EXPECT_EQ(lx::le16(&language[word(language, 47)]), 'A');
 
   ASSERT_EQ(territory.size(), 192U);
-  const std::vector<std::pair<size_t, uint16_t>> territory_words = {
-      {0, '.'}, {1, ','}, {2, ','}, {3, '.'},   {4, ','}, {5, 2},   {6, 2},
-      {7, 2},   {8, 3},   {9, 0},   {10, 0x6B}, {11, 46}, {22, 192}};
-  for (const auto& [n, value] : territory_words) EXPECT_EQ(word(territory, n), value) << n;
+  const int words[] = {'.', ',', ',', '.', ',', 2, 2, 2, 3, 0, 0x6B, 46};
+  for (int n = 0; n < 12; ++n) EXPECT_EQ(word(territory, n), words[n]) << n;
+  EXPECT_EQ(word(territory, 22), 192);
   EXPECT_EQ(lx::le16(&territory[word(territory, 17)]), 0) << "no positive sign";
   EXPECT_EQ(lx::le16(&territory[word(territory, 18)]), '-');
 }
@@ -139,9 +133,8 @@ TEST(LocaleText, DumpsReadBack) {
   EXPECT_EQ(lx::le16(&payload[2 * 3]), 1);
   EXPECT_EQ(lx::le16(&payload[2 * 50]), lx::le16(&payload[2 * 49]) + 8);
   const uint8_t* special = &payload[lx::le16(&payload[2 * 49])];
-  EXPECT_EQ((std::vector<int>{lx::le16(special), lx::le16(special + 2), lx::le16(special + 4),
-                              lx::le16(special + 6)}),
-            (std::vector<int>{0xDF, 0, 'S', 'S'}));
+  const uint8_t stored[] = {0xDF, 0, 0, 0, 'S', 0, 'S', 0};
+  EXPECT_EQ(memcmp(special, stored, sizeof(stored)), 0);
   for (const Control* names : {&control, static_cast<const Control*>(nullptr)}) {
     std::stringstream dump;
     write_language(dump, unpack_language(payload), names);
@@ -162,44 +155,7 @@ TEST(LocaleText, DumpsReadBack) {
   }
 }
 
-TEST(LocaleText, FaultsNameTheirPlace) {
-  const std::string language = with(shipped("languages/English.toml"), "\"Latin1\"", "1");
-  const std::string territory = shipped("territories/UnitedStates.toml");
-  const struct {
-    bool is_language;
-    const char *from, *to, *fault;
-  } cases[] = {
-      {true, "name = \"English\"\n", "", "f:1:1: the key name is missing"},
-      {true, "morning", "evening", "f:1:1: the key morning is missing"},
-      {true, "\"Sunday\", ", "", "f:4:8: expected a list of 7 texts"},
-      {true, "\"UnitedStates\"", "\"Atlantis\"", "f:3:25: no territory has the name Atlantis"},
-      {true, "codepage = 1", "codepage = 2", "f:3:52: no codepage has the identifier 2"},
-      {true, "\"Sun\"", "7", "f:5:15: expected a text"},
-      {true, "\"AM\"", "\"A", "f:8:"},
-      {true, "\"AM\"", "\"A\\u0000\"", "f:8:11: a text cannot hold U+0000"},
-      {true, "morning", "evening = 1\nmorning", "f:8:11: unknown key evening"},
-      {true, "morning", "special_upper = [{ from = \"\", to = \"x\" }]\nmorning",
-       "f:8:27: expected one or two characters"},
-      {false, "decimal = \".\"", "decimal = \"..\"", "f:9:11: expected one character up to U+FFFF"},
-      {false, "positive_position = 3", "positive_position = 5", "f:31:21: expected a number from 0 to 4"},
-      {false, "flag58 = true", "flag58 = 1", "f:3:10: expected true or false"},
-      {false, "[placement]", "[other]", "f:1:1: the key placement is missing"},
-  };
-  for (const auto& test : cases) {
-    SCOPED_TRACE(test.to);
-    std::istringstream in(with(test.is_language ? language : territory, test.from, test.to));
-    const std::string fault = fault_of([&] {
-      if (test.is_language) {
-        read_language(in, "f", built_in_control());
-      } else {
-        read_territory(in, "f");
-      }
-    });
-    EXPECT_EQ(fault.substr(0, std::string(test.fault).size()), test.fault) << fault;
-  }
-}
-
-TEST(ObjectList, OrderNamesAndFaults) {
+TEST(ObjectList, OrderAndTable) {
   std::istringstream in("# list\ncodepage 819 Latin1 # comment\n\n  language\t7 B\r\nlanguage 2 A\n");
   const Control control = read_control(in, "c");
   std::ostringstream out;
@@ -210,25 +166,6 @@ TEST(ObjectList, OrderNamesAndFaults) {
   const ByteVector table = pack_control(control);
   ASSERT_EQ(table.size(), 3 * 38U);
   EXPECT_EQ(unpack_control(table, "c").objects[2].name, "Latin1");
-
-  const std::string long_name(34, 'x');
-  const std::pair<std::string, std::string> cases[] = {
-      {"language 1", "c:1:1: expected: type identifier name"},
-      {"tongue 1 A", "c:1:1: unknown type tongue"},
-      {"language 0 A", "c:1:10: the identifier"},
-      {"language 65536 A", "c:1:10: the identifier"},
-      {"language 1 " + long_name, "c:1:12: the name is longer than 33 bytes"},
-      {"language 1 a/b", "c:1:12: the name holds"},
-      {"language 1 ..", "c:1:12: the name begins with a dot"},
-      {"sort 1 binary", "c:1:8: Binary is"},
-      {"language 1 A\nlanguage 1 B", "c:2:1: identifier 1 is used twice"},
-      {"language 1 A\nlanguage 2 a", "c:2:1: name a is used twice"},
-  };
-  for (const auto& [text, fault] : cases) {
-    std::istringstream faulty(text);
-    EXPECT_EQ(fault_of([&] { read_control(faulty, "c"); }).substr(0, fault.size()), fault) << text;
-  }
-
   auto broken = [&](size_t at, uint8_t value) {
     ByteVector bytes = table;
     bytes[at] = value;
@@ -240,22 +177,75 @@ TEST(ObjectList, OrderNamesAndFaults) {
   EXPECT_EQ(broken(2 * 38 + 2, 4), "c: record 2: the type is not 0 to 3");
 }
 
-TEST(AliasFile, FaultsNameTheirPlace) {
+TEST(Sources, FaultsNameTheirPlace) {
+  const std::string language = with(shipped("languages/English.toml"), "\"Latin1\"", "1");
+  const std::string territory = shipped("territories/UnitedStates.toml");
   const Control control = built_in_control();
-  const std::pair<std::string, std::string> cases[] = {
-      {"# none\n\nus-ascii ASCII ascii\n C POSIX\n", ""},
-      {" C\n", "a:1:2: aliases stand before the first codepage name"},
-      {"US-ASCII C\nLatin1 L1\n", "a:2:1: no codepage has the name Latin1"},
-      {"\tUS-ASCII C\n", "a:1:1: a line begins with"},
-      {"US-ASCII " + std::string(64, 'x') + "\n", ""},
-      {"US-ASCII C " + std::string(65, 'x') + "\n", "a:1:12: the alias is longer than 64 bytes"},
-      {"US-ASCII C\r\n", "a:1:11: a carriage return"},
+  using In = std::istream;
+  const std::function<void(In&)> as_language = [&](In&in) { read_language(in, "f", control); },
+                                 as_territory = [&](In&in) { read_territory(in, "f"); },
+                                 as_control = [&](In&in) { read_control(in, "f"); },
+                                 as_aliases = [&](In&in) { check_aliases(in, "f", control); };
+  const struct {
+    const std::function<void(In&)>& read;
+    std::string text;
+    std::string fault;
+  } cases[] = {
+      {as_language, with(language, "name = \"English\"\n", ""), "f:1:1: the key name is missing"},
+      {as_language, with(language, "\"Sunday\", ", ""), "f:4:8: expected a list of 7 texts"},
+      {as_language, with(language, "\"UnitedStates\"", "\"Mu\""), "f:3:25: no territory has the name Mu"},
+      {as_language, with(language, "page = 1", "page = 2"), "f:3:52: no codepage has the identifier 2"},
+      {as_language, with(language, "\"Sun\"", "7"), "f:5:15: expected a text"},
+      {as_language, with(language, "\"AM\"", "\"A"), "f:8:"},
+      {as_language, with(language, "\"AM\"", "\"A\\u0000\""), "f:8:11: a text cannot hold U+0000"},
+      {as_language, with(language, "morning", "evening = 1\nmorning"), "f:8:11: unknown key evening"},
+      {as_language, with(language, "morning", "special_upper = [{ from = \"\", to = \"x\" }]\nmorning"),
+       "f:8:27: expected one or two characters"},
+      {as_territory, with(territory, "= \".\"", "= \"..\""), "f:9:11: expected one character up to U+FFFF"},
+      {as_territory, with(territory, "e_position = 3", "e_position = 5"),
+       "f:31:21: expected a number from 0 to 4"},
+      {as_territory, with(territory, "flag58 = true", "flag58 = 1"), "f:3:10: expected true or false"},
+      {as_control, "language 1", "f:1:1: expected: type identifier name"},
+      {as_control, "tongue 1 A", "f:1:1: unknown type tongue"},
+      {as_control, "language 0 A", "f:1:10: the identifier"},
+      {as_control, "language 65536 A", "f:1:10: the identifier"},
+      {as_control, "language 1 " + std::string(34, 'x'), "f:1:12: the name is longer than 33 bytes"},
+      {as_control, "language 1 a/b", "f:1:12: the name holds"},
+      {as_control, "language 1 ..", "f:1:12: the name begins with a dot"},
+      {as_control, "sort 1 binary", "f:1:8: Binary is"},
+      {as_control, "language 1 A\nlanguage 1 B", "f:2:1: identifier 1 is used twice"},
+      {as_control, "language 1 A\nlanguage 2 a", "f:2:1: name a is used twice"},
+      {as_aliases, "# none\n\nus-ascii ASCII ascii\n C POSIX\n", "none"},
+      {as_aliases, " C\n", "f:1:2: aliases stand before the first codepage name"},
+      {as_aliases, "US-ASCII C\nLatin1 L1\n", "f:2:1: no codepage has the name Latin1"},
+      {as_aliases, "\tUS-ASCII C\n", "f:1:1: a line begins with"},
+      {as_aliases, "US-ASCII " + std::string(64, 'x') + "\n", "none"},
+      {as_aliases, "US-ASCII C " + std::string(65, 'x'), "f:1:12: the alias is longer than 64 bytes"},
+      {as_aliases, "US-ASCII C\r\n", "f:1:11: a carriage return"},
   };
-  for (const auto& [text, fault] : cases) {
-    std::istringstream in(text);
-    const std::string found = fault_of([&] { check_aliases(in, "a", control); });
-    EXPECT_EQ(fault.empty() ? found : found.substr(0, fault.size()), fault) << text;
+  for (const auto& test : cases) {
+    std::istringstream in(test.text);
+    const std::string fault = fault_of([&] { test.read(in); });
+    EXPECT_EQ(fault.substr(0, test.fault.size()), test.fault) << fault;
   }
+}
+
+TEST(ShippedAliases, StandOnceAndNeverHideAnObject) {
+  auto upper = [](std::string text) {
+    for (char& c : text) c = static_cast<char>(toupper(c));
+    return text;
+  };
+  std::set<std::string> objects, headings, names;
+  for (const ObjectName& object : read_source_control(LEXICOR_DATA_DIR).objects)
+    if (object.type == ObjectType::kCodepage) objects.insert(upper(object.name));
+  std::istringstream in(shipped("alias.txt"));
+  for (std::string line, word; std::getline(in, line);) {
+    if (line.empty() || line[0] == '#') continue;
+    std::istringstream words(line);
+    if (line[0] != ' ' && words >> word) headings.insert(upper(word)), words.seekg(0);
+    while (words >> word) EXPECT_TRUE(names.insert(upper(word)).second) << word;
+  }
+  EXPECT_EQ(headings, objects);
 }
 
 }  // namespace

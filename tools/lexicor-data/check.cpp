@@ -94,7 +94,8 @@ void check_loading(const std::string& directory, const Control& control, Faults&
   int32_t rc = LXInit(directory.c_str(), nullptr, nullptr, nullptr, LX_NO_DEFAULTS);
   LXObjManager* manager = LXInitObjManager(directory.c_str(), LX_NO_DEFAULTS, &rc);
   faults.attempt([&] {
-    if (rc != LX_OK) throw SourceError(control_file, 0, 0, "the library cannot read it: code " + std::to_string(rc));
+    if (rc != LX_OK)
+      throw SourceError(control_file, 0, 0, "the library cannot read it: code " + std::to_string(rc));
   });
   for (const ObjectName& name : control.objects) {
     faults.attempt([&] {
