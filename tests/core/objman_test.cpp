@@ -432,5 +432,20 @@ TEST_F(ObjManTest, FileAndDirectoryNames) {
   EXPECT_STREQ(buffer, "/Tessarin/locale");
 }
 
+/// A control file that is not grouped by type: what stands in the codepages' range is no codepage by that
+/// alone.
+TEST_F(ObjManTest, AnotherTypeInTheRangeIsNotFoundByName) {
+  directory.write_locale({{850, "Tiny", ascii_codepage()}});
+  directory.write("te_00841.nls", directory.read("te_00840.nls"));
+  directory.write(
+      "control.nls",
+      control_file({{1, 0, "English"}, {840, 1, "UnitedStates"}, {850, 2, "Tiny"}, {841, 1, "Odd"}}));
+  ASSERT_EQ(init(), LX_OK);
+  EXPECT_EQ(LXGetObjFromName(nullptr, LX_CODEPAGE, "Odd", 3, LX_FIND_ONLY, &rc), nullptr);
+  EXPECT_EQ(rc, LX_E_NOT_FOUND);
+  EXPECT_EQ(LXGetLocale("English_UnitedStates.Odd", 0, &rc), nullptr);
+  EXPECT_EQ(rc, LX_E_NO_CODEPAGE);
+}
+
 }  // namespace
 }  // namespace lx::test
