@@ -31,10 +31,16 @@
 
 #include "lx/base.h"
 #include "lx/codepage.h"
+#include "lx/collate.h"
+#include "lx/compare.h"
 #include "lx/convert.h"
 #include "lx/file.h"
 #include "lx/init.h"
+#include "lx/item.h"
 #include "lx/locale.h"
+#include "lx/map.h"
+#include "lx/native.h"
 #include "lx/object.h"
+#include "lx/string.h"
 
 #endif

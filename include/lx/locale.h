@@ -18,7 +18,8 @@ enum {
  * and a sort, each an object name in any case: English_UnitedStates.US-ASCII@BINARY. An empty
  * language is English; what is not named comes from the language's defaults. Returns the locale,
  * to be released with LXReleaseLocale, or null with `*rc` (may be null) 2, 11, 20, 30, 31, 32, 33
- * or 34. With LX_USER_LOCALE the name is that of the variable LX_LANG; 32 when it is not set. */
+ * or 34. With LX_USER_LOCALE the name is that of LXGetUserLocale (32 when that fails); a locale that the
+ * environment asked for also gets the system's conventions (LXMapNativeInfo). */
 LX_API LXLocale* LXGetLocale(const char* name, int32_t flags, int32_t* rc);
 /* As LXGetLocale; the name is null-terminated packed codes. */
 LX_API LXLocale* LXGetLocaleW(const LXWChar* name, int32_t flags, int32_t* rc);

@@ -153,6 +153,21 @@ inline size_t store_unicode(const Codepage& cp, uint16_t u, uint8_t* p) {
 size_t bytes_of_chars(const Codepage& cp, const uint8_t* text, LXShiftState state, int32_t chars);
 int32_t chars_in_bytes(const Codepage& cp, const uint8_t* text, LXShiftState state, size_t bytes);
 
+/// The type record of the character at `p`: the type word, then what added to its packed code gives the other
+/// case. Null in a single-byte codepage. There is no range check: the trie covers every byte sequence.
+const uint8_t* type_record(const Codepage& cp, const uint8_t* p);
+const uint8_t* type_record_of_code(const Codepage& cp, uint32_t code);
+
+/// A language's special mappings of one direction.
+struct Specials {
+  const uint8_t* entries;
+  size_t count;
+
+  /// Looks for one character (`second` 0) or a pair: the number of results stored, 0 for no mapping.
+  int32_t find(uint16_t first, uint16_t second, uint16_t* result1, uint16_t* result2) const;
+};
+Specials specials_of(const LXObject& language, bool upper);
+
 /// Consumes a shift byte at `*p`, if there is one: true, and the state is set.
 inline bool take_shift(const Codepage& cp, const uint8_t** p, LXShiftState* state) {
   if (!cp.is_shift(**p)) return false;

@@ -46,23 +46,6 @@ uint32_t type_field(const Primitive& in, uint32_t word, uint32_t selector) {
   }
 }
 
-/// Walks the type trie. There is no range check: the trie covers every byte sequence.
-const uint8_t* type_record(const Codepage& cp, const uint8_t* p) {
-  if (cp.single_byte) return nullptr;
-  const uint8_t* root = cp.payload + lx::le16(cp.payload + fmt::kTypeTrie);
-  const uint8_t* node = root;
-  while (node[0] == 0) node = root + fmt::kTypeNodeBytes * (lx::le16(node + 2) + (node[1] & *p++));
-  const size_t index = lx::le16(node + 2) + (node[1] & *p);
-  return cp.payload + lx::le16(cp.payload + fmt::kTypeRecords) + fmt::kTypeRecordBytes * index;
-}
-
-const uint8_t* type_record_of_code(const Codepage& cp, LXWChar code) {
-  uint8_t bytes[lx::kMaxCharBytes] = {};
-  const uint32_t stored = lx::without_zero_bytes(code);
-  lx::store_code(bytes, stored, lx::code_bytes(stored));
-  return type_record(cp, bytes);
-}
-
 /// Steps over whole characters of `bytes` bytes by lead-byte lengths, at most `limit` of them.
 struct Walk {
   size_t position = 0;
@@ -90,6 +73,41 @@ int32_t valid_bytes(const char* text, size_t length) {
 }  // namespace
 
 namespace lx {
+
+const uint8_t* type_record(const Codepage& cp, const uint8_t* p) {
+  if (cp.single_byte) return nullptr;
+  const uint8_t* root = cp.payload + le16(cp.payload + fmt::kTypeTrie);
+  const uint8_t* node = root;
+  while (node[0] == 0) node = root + fmt::kTypeNodeBytes * (le16(node + 2) + (node[1] & *p++));
+  const size_t index = le16(node + 2) + (node[1] & *p);
+  return cp.payload + le16(cp.payload + fmt::kTypeRecords) + fmt::kTypeRecordBytes * index;
+}
+
+const uint8_t* type_record_of_code(const Codepage& cp, uint32_t code) {
+  uint8_t bytes[kMaxCharBytes] = {};
+  const uint32_t stored = without_zero_bytes(code);
+  store_code(bytes, stored, code_bytes(stored));
+  return type_record(cp, bytes);
+}
+
+Specials specials_of(const LXObject& language, bool upper) {
+  namespace words = format::language;
+  const uint8_t* payload = payload_of(language);
+  const size_t count = le16(payload + 2 * (upper ? words::kUpperSpecials : words::kLowerSpecials));
+  const size_t offset = le16(payload + 2 * (upper ? words::kUpperSpecialTable : words::kLowerSpecialTable));
+  return {payload + offset, count};
+}
+
+int32_t Specials::find(uint16_t first, uint16_t second, uint16_t* result1, uint16_t* result2) const {
+  const uint8_t* entry = entries;
+  for (size_t i = 0; i < count; ++i, entry += format::language::kSpecialBytes) {
+    if (le16(entry) != first || le16(entry + 2) != second) continue;
+    *result1 = le16(entry + 4);
+    *result2 = le16(entry + 6);
+    return *result2 == 0 ? 1 : 2;
+  }
+  return 0;
+}
 
 uint32_t unicode_to_code(const Codepage& cp, uint16_t u) {
   if (!cp.utf8) return page_code(cp, u);
@@ -312,7 +330,7 @@ uint32_t LXGetCharType(LXLocale* locale, const char* text, uint32_t selector) {
   if (!in) return 0;
   const uint8_t* p = bytes_of(text);
   const bool single = in.single_byte() || in.cp().length(*p) == 1;
-  return type_field(in, single ? in.cp().type(*p) : lx::le32(type_record(in.cp(), p)), selector);
+  return type_field(in, single ? in.cp().type(*p) : lx::le32(lx::type_record(in.cp(), p)), selector);
 }
 
 uint32_t LXGetCharTypeW(LXLocale* locale, LXWChar code, uint32_t selector) {
@@ -320,7 +338,7 @@ uint32_t LXGetCharTypeW(LXLocale* locale, LXWChar code, uint32_t selector) {
   if (!in) return 0;
   const bool single = in.single_byte() || code <= 0xFF;
   return type_field(
-      in, single ? in.cp().type(static_cast<uint8_t>(code)) : lx::le32(type_record_of_code(in.cp(), code)),
+      in, single ? in.cp().type(static_cast<uint8_t>(code)) : lx::le32(lx::type_record_of_code(in.cp(), code)),
       selector);
 }
 
@@ -336,15 +354,15 @@ uint32_t LXGetCharTypeEx(LXLocale* locale, const char* text, LXShiftState state,
   const uint8_t* p = bytes_of(text);
   lx::take_shift(in.cp(), &p, &state);
   const bool single = state != LX_SHIFT_DOUBLE;
-  return type_field(in, single ? in.cp().type(*p) : lx::le32(type_record(in.cp(), p)), selector);
+  return type_field(in, single ? in.cp().type(*p) : lx::le32(lx::type_record(in.cp(), p)), selector);
 }
 
 const uint8_t* LXGetMbCtype(const LXObject* codepage, const char* text) {
-  return lx::initialized() ? type_record(lx::codepage_of(*codepage), bytes_of(text)) : nullptr;
+  return lx::initialized() ? lx::type_record(lx::codepage_of(*codepage), bytes_of(text)) : nullptr;
 }
 
 const uint8_t* LXGetMbCtypeW(const LXObject* codepage, LXWChar code) {
-  return lx::initialized() ? type_record_of_code(lx::codepage_of(*codepage), code) : nullptr;
+  return lx::initialized() ? lx::type_record_of_code(lx::codepage_of(*codepage), code) : nullptr;
 }
 
 LXWChar LXMbToW(const LXObject* codepage, const char* text) {
@@ -398,21 +416,9 @@ int32_t LXCpStrByteToCharLen(const LXObject* codepage, const char* text, LXShift
 
 int32_t LXLangGetSpecial(const LXObject* language, LXUChar first, LXUChar second, LXUChar* result1,
                          LXUChar* result2, int32_t selector) {
-  namespace words = lx::format::language;
   constexpr int32_t kUpperSelector = 44;
   if (!lx::initialized()) return 0;
-  const uint8_t* payload = lx::payload_of(*language);
-  const bool upper = selector == kUpperSelector;
-  const size_t count = lx::le16(payload + 2 * (upper ? words::kUpperSpecials : words::kLowerSpecials));
-  const uint8_t* entry =
-      payload + lx::le16(payload + 2 * (upper ? words::kUpperSpecialTable : words::kLowerSpecialTable));
-  for (size_t i = 0; i < count; ++i, entry += words::kSpecialBytes) {
-    if (lx::le16(entry) != first || lx::le16(entry + 2) != second) continue;
-    *result1 = lx::le16(entry + 4);
-    *result2 = lx::le16(entry + 6);
-    return *result2 == 0 ? 1 : 2;
-  }
-  return 0;
+  return lx::specials_of(*language, selector == kUpperSelector).find(first, second, result1, result2);
 }
 
 }  // extern "C"

@@ -33,6 +33,24 @@ inline size_t least(size_t a, size_t b, size_t c) {
   return least(least(a, b), c);
 }
 
+/// The units of a text before its null, or the length where one is given.
+template <class Unit>
+inline size_t text_units(const Unit* text, int32_t length) {
+  if (length >= 0) return static_cast<size_t>(length);
+  size_t n = 0;
+  while (text[n] != 0) ++n;
+  return n;
+}
+inline size_t text_units(const char* text, int32_t length) {
+  return length < 0 ? strlen(text) : static_cast<size_t>(length);
+}
+/// The bytes of a text whose length counts bytes, or with LX_CHARACTERS characters.
+inline size_t text_bytes(const Codepage& cp, const char* text, LXShiftState state, int32_t length,
+                         uint32_t flags) {
+  if (length < 0 || (flags & LX_CHARACTERS) == 0) return text_units(text, length);
+  return bytes_of_chars(cp, bytes_of(text), state, length);
+}
+
 inline constexpr unsigned kAnySame = 0x10000;  // same_below() of 16-bit Unicode
 inline constexpr size_t kRunChars = 128;       // moved at a time through a buffer on the stack
 inline constexpr size_t kRunUnits = 48;        // of shorter texts the characters are moved one by one

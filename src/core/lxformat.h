@@ -75,9 +75,46 @@ inline constexpr size_t kSignPositions = 8;
 inline constexpr size_t kValue84 = 9;
 inline constexpr size_t kFlags = 10;
 inline constexpr size_t kFirstText = 11;
+inline constexpr size_t kInternationalCurrency = 16;
 inline constexpr size_t kLastText = 21;
 inline constexpr size_t kPayloadBytes = 22;
 }  // namespace territory
+
+// Sort payload: a fixed part, then the tables that its last three words locate.
+//
+// Page: u8 flags, u8 class of an algorithmic page's characters, u16 base. Weight record: u16 weight, u8
+// secondary, u8 tertiary, u16 flags. Expansion record: u16 code point, two sets of u16 primary, u8 secondary,
+// u8 tertiary, and four bytes that nobody reads. Contraction record: u16 first, u16 second, then as a weight
+// record.
+namespace sort {
+inline constexpr size_t kFixedBytes = 1036;
+inline constexpr size_t kDefaultSecondary = 0;  // u8: trailing ones are left out of keys
+inline constexpr size_t kDefaultTertiary = 1;   // u8
+inline constexpr size_t kExpansionCount = 2;
+inline constexpr size_t kContractionCount = 4;
+inline constexpr size_t kPages = 6;       // 256 x 4, by the high byte
+inline constexpr size_t kWeights = 1030;  // offsets in the payload
+inline constexpr size_t kExpansions = 1032;
+inline constexpr size_t kContractions = 1034;
+
+inline constexpr size_t kPageBytes = 4;
+inline constexpr uint8_t kPageUncovered = 0x01;
+inline constexpr uint8_t kPagePrimary = 0x02;  // primary weight = base + low byte
+inline constexpr uint8_t kPageSpecial = 0x04;  // special weight = base + low byte
+inline constexpr size_t kWeightBytes = 6;      // a table page's character: record base + low byte
+inline constexpr uint16_t kWeightSpecial = 0x8000;
+inline constexpr uint16_t kWeightExpansion = 0x4000;
+inline constexpr uint16_t kWeightClass = 0x3C00;
+inline constexpr int kWeightClassShift = 10;
+inline constexpr size_t kExpansionBytes = 14;
+inline constexpr size_t kContractionBytes = 10;
+
+// Class bits: whether a level's weight is appended, else inserted ahead of the run.
+inline constexpr uint8_t kAppendPrimary = 8;
+inline constexpr uint8_t kAppendSecondary = 4;
+inline constexpr uint8_t kAppendTertiary = 2;
+inline constexpr uint8_t kAppendSpecial = 1;
+}  // namespace sort
 
 // Codepage payload, version 2: a fixed part, then in a multibyte codepage the full-width table, the width
 // pairs, the type trie and the type records. Section 1: multibyte-to-Unicode nodes and values. Sections 2 and

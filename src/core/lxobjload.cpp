@@ -108,13 +108,20 @@ class Loading {
       case LX_CODEPAGE:
         return lx::validate_codepage(disk.id, sections_);
       default:
-        return sections_.section[0].data != nullptr ? LX_OK : LX_E_CORRUPT;
+        return lx::validate_sort(sections_.section[0]);
     }
   }
 
   lx::Sections sections_;
   uint8_t owned_ = 0;
 };
+
+/// Builds the acceleration data of the types that have any; false without memory.
+bool derive(const LXObjDisk& disk, const lx::Sections& sections, void** derived) {
+  if (disk.type == LX_CODEPAGE) *derived = lx::derive_codepage(disk.id, sections);
+  if (disk.type == LX_SORT) *derived = lx::derive_sort(sections.section[0]);
+  return *derived != nullptr || disk.type == LX_LANGUAGE || disk.type == LX_TERRITORY;
+}
 
 /// Loads an entry from its file; the entry stays as it was on failure.
 int32_t load_from_file(const LXObjManager* manager, LXObject* entry) {
@@ -127,10 +134,7 @@ int32_t load_from_file(const LXObjManager* manager, LXObject* entry) {
   Loading loading;
   void* derived = nullptr;
   rc = loading.load(file, entry->disk);
-  if (rc == LX_OK && entry->disk.type == LX_CODEPAGE) {
-    derived = lx::derive_codepage(entry->disk.id, loading.sections());
-    if (derived == nullptr) rc = LX_E_MEMORY;
-  }
+  if (rc == LX_OK && !derive(entry->disk, loading.sections(), &derived)) rc = LX_E_MEMORY;
   if (rc == LX_OK)
     loading.hand_over(entry, file, derived);
   else

@@ -18,6 +18,7 @@ struct Sections {
 int32_t validate_language(Bytes payload);
 int32_t validate_territory(Bytes payload);
 int32_t validate_codepage(uint16_t id, const Sections& sections);
+int32_t validate_sort(Bytes payload);
 
 /// Turns a version-1 codepage into a version-2 one: new blocks for section 0 and, in a multibyte codepage, 1.
 /// `upgraded` receives the new sections; a section that was not replaced stays as it was.
@@ -26,6 +27,7 @@ int32_t upgrade_codepage(const Sections& version1, Sections* upgraded);
 
 /// Builds the derived data of a validated codepage in one block from the allocation hook. Null: no memory.
 void* derive_codepage(uint16_t id, const Sections& sections);
+void* derive_sort(Bytes payload);  // the same for a sort
 
 /// The payloads that are compiled into the library, by type.
 struct BuiltIn {

@@ -63,11 +63,10 @@ struct LXLocale {
   uint16_t flags;             // bits 0-5: items 73-76, 82, 83; then LocaleFlag
   uint8_t sign_positions[2];  // items 77, 78
   uint8_t separators[5];      // items 59, 60, 61, 66, 67, one byte each in the codepage
-  char* grouping;             // item 62
-  char* texts[7];             // items 64, 68, 71, 72, 79, 80, 81
+  char* texts[8];             // items 62, 64, 68, 71, 72, 79, 80, 81, in the codepage
   uint16_t changed_unicode;   // which Unicode copies the caller has set
   LXUChar separators_unicode[5];
-  LXUChar* texts_unicode[8];  // item 62 and the seven texts
+  LXUChar* texts_unicode[8];  // the texts
   int32_t last_error;
 };
 

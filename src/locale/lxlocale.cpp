@@ -1,8 +1,9 @@
 // Locale handles: created by name, shared by nobody, released by their owner. Also the default locale, the
 // enumeration of what a locale can be made of, and the operating system's name of a locale.
+#include "locale/lxlocale.h"
+
 #include <string.h>
 
-#include "codepage/lxcodepage.h"
 #include "core/lxcall.h"
 #include "core/lxmemory.h"
 #include "core/lxobjman.h"
@@ -14,8 +15,6 @@ using lx::Events;
 RAS1_Unit unit = RAS1_UNIT("lxlocale");
 
 constexpr char kDefaultLanguage[] = "English";
-constexpr char kUserVariable[] = "LX_LANG";
-constexpr size_t kUserNameBytes = 132;  // no more of the variable is read
 constexpr int32_t kCreateFlags = LX_USER_LOCALE | LX_FALLBACK;
 
 /// A part of a locale name.
@@ -121,23 +120,41 @@ int32_t find_objects(LXLocale* locale, const LocaleName<Unit>& name, int32_t fla
   return code;
 }
 
-void set_flags(LXLocale* locale) {
-  const lx::Codepage& cp = lx::codepage_of(*locale->codepage);
-  if (cp.single_byte) locale->flags |= lx::kLocaleSingleByte;
-  if (cp.shift_sensitive) locale->flags |= lx::kLocaleShift;
-  if (locale->sort == nullptr) locale->flags |= lx::kLocaleBinarySort;
+/// Finds the objects of a locale and fills its values.
+template <class Unit>
+int32_t build(LXLocale* locale, const LocaleName<Unit>& name, int32_t flags) {
+  if (const int32_t code = find_objects(locale, name, flags)) return code;
+  lx::set_codepage_flags(locale);
+  lx::set_sort(locale, locale->sort);
+  const int32_t code = lx::set_modifiable(locale);
+  if (code != LX_OK) LX_TRACE(unit, RAS1_LEVEL_ERRORS, "Unable to set modifiable values, err = %d", code);
+  return code;
 }
 
 /// Creates a locale; null with a code.
 template <class Unit>
 LXLocale* create(const Unit* name, size_t units, int32_t flags, int32_t* rc) {
-  lx::HookPtr<LXLocale> locale(static_cast<LXLocale*>(lx::hook_allocate_zeroed(sizeof(LXLocale))));
+  auto* locale = static_cast<LXLocale*>(lx::hook_allocate_zeroed(sizeof(LXLocale)));
   *rc = LX_E_MEMORY;
-  if (!locale) return nullptr;
-  *rc = find_objects(locale.get(), LocaleName<Unit>(name, units), flags);
-  if (*rc != LX_OK) return nullptr;
-  set_flags(locale.get());
-  return locale.detach();
+  if (locale == nullptr) return nullptr;
+  *rc = build(locale, LocaleName<Unit>(name, units), flags);
+  if (*rc == LX_OK) return locale;
+  lx::free_locale(locale);
+  return nullptr;
+}
+
+/// Creates the user's locale. One that the system's environment asks for has the system's conventions.
+LXLocale* create_for_user(int32_t flags, int32_t* rc) {
+  char name[lx::kUserNameBytes];
+  const lx::UserLocale from = lx::get_user_locale(name, sizeof(name));
+  *rc = LX_E_NO_NATIVE;
+  if (from == lx::UserLocale::kFailed) return nullptr;
+  LXLocale* locale = create(name, strnlen(name, sizeof(name)), flags, rc);
+  if (locale == nullptr || from == lx::UserLocale::kVariable) return locale;
+  *rc = lx::map_native_info("", locale);
+  if (*rc == LX_OK) return locale;
+  lx::free_locale(locale);
+  return nullptr;
 }
 
 LXLocale* create_from_bytes(const char* name, int32_t flags, int32_t* rc) {
@@ -145,12 +162,8 @@ LXLocale* create_from_bytes(const char* name, int32_t flags, int32_t* rc) {
   if (!lx::initialized()) return nullptr;
   *rc = LX_E_INVALID;
   if ((flags & ~kCreateFlags) != 0) return nullptr;
-  if ((flags & LX_USER_LOCALE) == 0)
-    return create(name != nullptr ? name : "", name != nullptr ? strlen(name) : 0, flags, rc);
-  const char* user = BSS1_GetEnv(kUserVariable);
-  *rc = LX_E_NO_NATIVE;
-  if (user == nullptr) return nullptr;
-  return create(user, strnlen(user, kUserNameBytes), flags, rc);
+  if ((flags & LX_USER_LOCALE) != 0) return create_for_user(flags, rc);
+  return create(name != nullptr ? name : "", name != nullptr ? strlen(name) : 0, flags, rc);
 }
 
 /// Creates a locale and installs it as the default in place of the previous one.
@@ -202,6 +215,18 @@ const char* nearest_native_name(const uint16_t ids[kNativeKeys], size_t* matched
 
 }  // namespace
 
+namespace lx {
+
+bool free_locale(LXLocale* locale) {
+  bool freed = true;
+  for (char* text : locale->texts) freed &= hook_free(text);
+  for (LXUChar* text : locale->texts_unicode) freed &= hook_free(text);
+  freed &= hook_free(locale);
+  return freed;
+}
+
+}  // namespace lx
+
 extern "C" {
 
 LXLocale* LXGetLocale(const char* name, int32_t flags, int32_t* rc) {
@@ -244,11 +269,7 @@ int32_t LXReleaseLocale(LXLocale* locale) {
   Events events(unit);
   if (!lx::initialized()) return events.exit(1);
   if (locale == nullptr) return events.exit(LX_OK);
-  bool freed = lx::hook_free(locale->grouping);
-  for (char* text : locale->texts) freed &= lx::hook_free(text);
-  for (LXUChar* text : locale->texts_unicode) freed &= lx::hook_free(text);
-  freed &= lx::hook_free(locale);
-  return events.exit(freed ? LX_OK : 1);
+  return events.exit(lx::free_locale(locale) ? LX_OK : 1);
 }
 
 int32_t LXSetLocale(const char* name, int32_t flags) {

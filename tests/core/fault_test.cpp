@@ -112,6 +112,21 @@ void use_locale(LXLocale* locale, bool thorough) {
   EXPECT_EQ(LXUnicodeToStringW(locale, codes, 512, units, 512, 0), 512);
 }
 
+/// Reads every item in every form.
+void use_items(LXLocale* locale) {
+  for (int32_t flags : {0, int32_t{LX_TERRITORY_VALUES}})
+    for (int32_t item = 1; item <= LX_ITEM_LOCALE_STRING; ++item) {
+      char bytes[40];
+      LXWChar codes[40];
+      LXUChar units[40];
+      LXGetLocaleNumInfo(locale, item, flags);
+      EXPECT_LE(LXGetLocaleTextInfo(locale, item, bytes, 40, flags), 40);
+      EXPECT_LE(LXGetLocaleTextInfoW(locale, item, codes, 40, flags), 40);
+      EXPECT_LE(LXGetLocaleTextInfoU(locale, item, units, 40, flags), 40);
+      EXPECT_LE(LXGetLocaleTextInfoEx(locale, item, bytes, LX_SHIFT_SINGLE, 40, flags), 40);
+    }
+}
+
 class FaultTest : public LibraryTest {
  protected:
   void write_directory(const std::vector<ByteString>& tested = small_double_byte_codepage(),
@@ -137,6 +152,7 @@ class FaultTest : public LibraryTest {
     }
     char bytes[8];
     EXPECT_EQ(LXConvertString(locale, bytes, 8, locale, "abc", 3, 0), 3);
+    use_items(locale);
     EXPECT_EQ(hooks.live_blocks(), before);
     EXPECT_EQ(LXReleaseLocale(locale), 0);
   }

@@ -13,6 +13,7 @@
 #include "core/lxformat.h"
 #include "core/lxobjtypes.h"
 #include "core/small_codepages.h"
+#include "support/sort_builder.h"
 
 namespace lx::test {
 namespace {
@@ -294,7 +295,7 @@ class LoadFailure : public ObjManTest {
   void write_all() {
     for (const Object& object : objects) std::filesystem::remove(directory.file(object.file));
     directory.write_locale({{850, "Tiny", small_double_byte_codepage()}});
-    directory.write("so_00004.nls", object_file({{1, 2, 3, 4}}));
+    directory.write("so_00004.nls", object_file({SortBuilder{}.payload()}));
     directory.write("control.nls", control_file({{1, LX_LANGUAGE, "English"},
                                                  {840, LX_TERRITORY, "UnitedStates"},
                                                  {850, LX_CODEPAGE, "Tiny"},

@@ -191,11 +191,80 @@ head -c 100 /dev/zero >broken/control.nls
 says 'a damaged control file' 0 'in broken (the file is damaged' "$lexicor" --locale-dir broken list
 grep -q '^ *1  US-ASCII$' out || fault 'the built-in codepage is not listed'
 
+# --- Mapping: the language's own mappings, the codepage, and text that meets the end of a piece everywhere.
+# maps NAME MAPPING INPUT OUTPUT ARGUMENTS...: input and expected output as escapes of printf.
+maps() {
+  bytes "$3" in
+  bytes "$4" expected
+  expect "$1" 0 '' "$lexicor" map "$2" "${@:5}" in
+  same "$1" out expected
+}
+maps 'upper case' upper 'stra\xc3\x9fe \xd1\x8f \xf0\x9f\x98\x80' 'STRA\xc3\x9fE \xd0\xaf \xf0\x9f\x98\x80'
+maps 'upper case in German' upper 'stra\xc3\x9fe' 'STRASSE' --locale German_Austria.IBM930
+maps 'lower case on a host' lower '\xc1\x81' '\x81\x81' --codepage 273
+maps 'digits' digits '\xd9\xa3\xef\xbc\x93x' '33x'
+maps 'full width' full 'A\xb1' '\x82\x60\x83\x41' --codepage MS932
+maps 'half width' half '\x0e\x42\xc1\x42\xc2' '\xc1\xc2\x0e' --codepage IBM930
+maps 'meeting fields in capitals' upper '\x0e\x44\x81\x0f\x0e\x42\x81\x0f\x81' '\x0e\x44\x81\x0f\x0e\x42\xc1\x0f\xc1' \
+  --codepage IBM939
+maps 'meeting fields' half '\x0e\x44\x81\x0f\x0e\x42\xc1\x0f\xc1' '\x0e\x44\x81\x0f\xc1\xc1' --codepage IBM930
+for bytes in $(seq 65530 65537); do
+  { head -c "$bytes" /dev/zero | tr '\0' a && printf '\xce\x91\xce\xa3 \xce\xa3\xce\x91'; } >in
+  { head -c "$bytes" /dev/zero | tr '\0' a && printf '\xce\xb1\xcf\x82 \xcf\x83\xce\xb1'; } >expected
+  expect "a pair behind $bytes bytes" 0 '' "$lexicor" map lower --locale Greek in
+  same "a pair behind $bytes bytes" out expected
+done
+for shift in '' x xx; do
+  { printf '%s' "$shift" && cat text; } | "$lexicor" convert --from utf8 --to IBM939 >large
+  for mapping in half full upper; do
+    name="1 MB mapped to $mapping, ${#shift} before it"
+    "$lexicor" map "$mapping" "$samples/japanese.txt" >sample
+    { printf '%s' "$shift" | "$lexicor" map "$mapping" && yes "$(cat sample)" | head -n "$(wc -l <text)"; } >expected
+    "$lexicor" map "$mapping" -o there --codepage IBM939 large
+    [ "$mapping" != upper ] || [ "$(stat -c %s there)" = "$(stat -c %s large)" ] || fault "$name: size"
+    grep -qaP '[\x0e\x0f]{2}' there && fault "$name: two shift bytes in a row"
+    convert "$name" 0 '' IBM939 UTF-8 --strict there
+    same "$name" out expected
+  done
+done
+bytes 'ab\xe3\x81' cut
+expect 'mapped input cut' 1 'lexicor: the input ends inside the character that begins at byte 2' \
+  "$lexicor" map upper -o old cut
+same 'the output of a cut mapping' old <(printf '\x81\x82\x83')
+says 'no such mapping' 2 'title not in' "$lexicor" map title
+says 'mapping for an unknown locale' 2 "no territory 'Mars'.*lexicor list territories" "$lexicor" map upper --locale English_Mars
+
+# --- Locales: their items, and the operating system's names.
+"$lexicor" info English_UnitedStates.IBM930 >out || fault 'info'
+[ "$(awk '{print $1}' out)" = "$(seq 88)" ] || fault 'info: the 88 items'
+for line in ' 9  codepage_id *930' '22  day_7 *"Saturday"' '42  month_13 *""' '59  decimal *"\."' '87  codepage_shift *1'; do
+  grep -q "^$line\$" out || fault "info: $line"
+done
+expect 'info on the user' 0 '' "$lexicor" info
+grep -q '"English_UnitedStates.US-ASCII@Binary"$' out || fault 'info on the user'
+says "the user's unknown locale" 0 "no territory 'X'" env LX_LANG=English_X "$lexicor" info
+"$lexicor" info --native C --json | python3 -c '
+import json, sys
+items = json.load(sys.stdin)["items"]
+assert [row["item"] for row in items] == list(range(1, 89))
+assert items[63]["name"] == "currency" and items[0] == {"item": 1, "name": "language_id", "value": 1}, items
+' || fault 'info as JSON'
+cp "$2/locale/control.nls" broken
+says 'info on no locale' 2 "no language 'Klingon'" "$lexicor" info Klingon
+says 'info on a damaged codepage' 1 'codepage IBM037 cannot be loaded' "$lexicor" --locale-dir broken info English.IBM037
+says 'an unknown system name' 2 "operating-system locale 'c'" "$lexicor" info --native c
+expect 'a whole system locale' 0 '' "$lexicor" native C
+expect 'an unknown system locale' 1 \
+  "lexicor: unknown operating-system locale 'xx'; 'lexicor list locales' shows those that are known" "$lexicor" native xx
+run 'a system locale with missing objects' 1 "$lexicor" --locale-dir broken native en_US.utf8
+grep -q '^language   English  *there$' out && grep -q '^codepage   UTF-8  *missing: file not found$' out ||
+  fault "a system locale with missing objects: $(cat out)"
+
 # --- Lists.
 "$lexicor" list >out || fault 'list'
 [ "$(grep -c '^[a-z]' out)" = 4 ] || fault 'the tables of the whole list'
 for line in 'codepages 930  IBM930  .*IBM-930.*' 'languages 1  English' 'territories 840  UnitedStates' \
-  'sorts 0  BINARY' 'aliases CP932 *MS932'; do
+  'sorts 0  BINARY' 'aliases CP932 *MS932' 'locales no_NO  *Norwegian_Norway.Latin1@Danish'; do
   "$lexicor" list "${line%% *}" | grep -q "^ *${line#* }\$" || fault "list: $line"
 done
 "$lexicor" list --json | python3 -c '

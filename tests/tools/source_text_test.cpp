@@ -28,8 +28,11 @@ Control built_in_control() {
   return read_control(text, "control.txt");
 }
 
+/// A shipped source without the comment on its first line.
 std::string shipped(const std::string& file) {
   std::ifstream in(std::string(LEXICOR_DATA_DIR) + '/' + file, std::ios::binary);
+  std::string comment;
+  std::getline(in, comment);
   return {std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>()};
 }
 

@@ -13,6 +13,9 @@
 #include "core/lxbytes.h"
 #include "core/lxformat.h"
 #include "lx.h"
+#include "sense.h"
+#include "sort_check.h"
+#include "sort_pack.h"
 #include "structure.h"
 
 namespace lexicor_data {
@@ -71,11 +74,8 @@ void check_defaults(const ByteVector& payload, const Control& control, const std
 
 void check_object(const std::string& path, const ObjectName& name, const Control& control) {
   const ObjectFile object = read_object(read_file(path), path);
-  if (name.type == ObjectType::kSort) {
-    check_container(object, name.type, path);
-    return;
-  }
   const std::string dumped = dump_object(object, name, &control, path);
+  if (name.type == ObjectType::kSort) check_sort(unpack_sort(object.sections[0]), path);
   if (name.type == ObjectType::kLanguage) check_defaults(object.sections[0], control, path);
   if (name.type == ObjectType::kCodepage) {
     if (is_utf8_object(object) != (name.id == format::codepage::kUtf8Id)) {
@@ -163,6 +163,9 @@ std::vector<std::string> check_source_directory(const std::string& directory) {
     faults.attempt([&] {
       std::ifstream in = open(path);
       compile_object(in, path, name, control);
+      in = open(path);
+      if (name.type == ObjectType::kLanguage) check_language_sense(in, path);
+      if (name.type == ObjectType::kTerritory) check_territory_sense(in, path);
     });
   }
   const std::string alias_file = directory + '/' + format::kAliasFile;

@@ -15,6 +15,8 @@
 #include "control_source.h"
 #include "core/lxformat.h"
 #include "language_toml.h"
+#include "sort_pack.h"
+#include "sort_text.h"
 #include "structure.h"
 #include "territory_toml.h"
 
@@ -143,7 +145,9 @@ CompiledObject compile_object(std::istream& in, const std::string& file_name, co
       object = pack_source(read_ucm(in, file_name), name, file_name, result);
       break;
     case ObjectType::kSort:
-      throw SourceError(file_name, 0, 0, "sorts are not compiled by this version");
+      object.sections = {pack_sort(read_sort(in, file_name), file_name)};
+      check_sort_structure(object, file_name);
+      break;
   }
   object.origin = origin_of(dump_object(object, name, &control, file_name));
   result.bytes = write_object(object);
@@ -180,7 +184,9 @@ std::string dump_object(const ObjectFile& object, const ObjectName& name, const 
       write_ucm(out, to_source(unpack_codepage(object, name.name)));
       break;
     case ObjectType::kSort:
-      throw SourceError(file_name, 0, 0, "sorts are not dumped by this version");
+      check_sort_structure(object, file_name);
+      write_sort(out, unpack_sort(object.sections[0]));
+      break;
   }
   return out.str();
 }

@@ -1,4 +1,4 @@
-// Structural checks of the three kinds of objects.
+// Structural checks of the four kinds of objects.
 #include "structure.h"
 
 #include <vector>
@@ -130,7 +130,7 @@ void check_container(const ObjectFile& object, ObjectType type, const std::strin
   if (object.version != format::kFormatVersion) {
     fail(file_name, "the format version is " + std::to_string(object.version) + ", not 2");
   }
-  if (type != ObjectType::kCodepage && type != ObjectType::kSort && object.sections.size() != 1) {
+  if (type != ObjectType::kCodepage && object.sections.size() != 1) {
     fail(file_name, "there is more than one section");
   }
 }
@@ -205,6 +205,45 @@ void check_codepage_structure(const ObjectFile& object, const std::string& file_
   for (unsigned byte = 0; byte < 256; ++byte) {
     const uint8_t length = payload[cp::kLengths + byte];
     if (shift || length > 1) values.check(byte, shift ? width : length);
+  }
+}
+
+void check_sort_structure(const ObjectFile& object, const std::string& file_name) {
+  namespace sort = format::sort;
+  const ByteVector& payload = object.sections[0];
+  if (payload.size() < sort::kFixedBytes) fail(file_name, "the payload is shorter than its fixed part");
+  auto value = [&](size_t field) { return size_t{lx::le16(&payload[field])}; };
+  const lx::Bytes bytes = view(payload);
+  auto check_table = [&](size_t field, size_t count, size_t record_bytes, const std::string& what) {
+    if (count != 0 && (value(field) < sort::kFixedBytes || !bytes.holds(value(field), count * record_bytes)))
+      fail(file_name, "the " + what + " lie outside the payload");
+  };
+  const size_t expansions = value(sort::kExpansionCount), contractions = value(sort::kContractionCount);
+  check_table(sort::kExpansions, expansions, sort::kExpansionBytes, "expansions");
+  check_table(sort::kContractions, contractions, sort::kContractionBytes, "contractions");
+  std::vector<bool> expands(0x10000);
+  for (size_t i = 0; i < expansions; ++i) {
+    const size_t at = value(sort::kExpansions) + i * sort::kExpansionBytes;
+    expands[value(at)] = true;
+    if (i > 0 && value(at) <= value(at - sort::kExpansionBytes))
+      fail(file_name, "the expansions are not sorted");
+  }
+  for (size_t i = 1; i < contractions; ++i) {
+    const size_t at = value(sort::kContractions) + i * sort::kContractionBytes,
+                 before = at - sort::kContractionBytes;
+    if (value(at) < value(before) || (value(at) == value(before) && value(at + 2) <= value(before + 2)))
+      fail(file_name, "the contractions are not sorted");
+  }
+  for (unsigned number = 0; number < 256; ++number) {
+    const size_t page = sort::kPages + number * sort::kPageBytes;
+    if ((payload[page] & (sort::kPageUncovered | sort::kPagePrimary | sort::kPageSpecial)) != 0) continue;
+    check_table(sort::kWeights, value(page + 2) + 256, sort::kWeightBytes,
+                "weights of page " + std::to_string(number));
+    for (size_t low = 0; low < 256; ++low) {
+      const size_t flags = value(sort::kWeights) + (value(page + 2) + low) * sort::kWeightBytes + 4;
+      if ((value(flags) & sort::kWeightExpansion) != 0 && !expands[number << 8 | low])
+        fail(file_name, "character " + std::to_string(number << 8 | low) + " has no expansion");
+    }
   }
 }
 

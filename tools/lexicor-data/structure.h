@@ -19,4 +19,7 @@ void check_territory_structure(const ByteVector& payload, const std::string& fil
 bool is_utf8_object(const ObjectFile& object);
 void check_codepage_structure(const ObjectFile& object, const std::string& file_name);
 
+/// Bounds, and that the tables are in ascending order without an expansion that is missing.
+void check_sort_structure(const ObjectFile& object, const std::string& file_name);
+
 }  // namespace lexicor_data

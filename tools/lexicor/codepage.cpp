@@ -45,7 +45,8 @@ std::string find_codepage(const Catalogue& catalogue, const std::string& text) {
 
 }  // namespace
 
-Codepage::Codepage(const Session& session, const Catalogue& catalogue, const std::string& name)
+Codepage::Codepage(const Session& session, const Catalogue& catalogue, const std::string& name,
+                   const std::string& language_territory)
     : name_(find_codepage(catalogue, name)) {
   if (name_.empty()) throw_unknown(session, catalogue, name);
   int32_t code = LX_OK;
@@ -55,9 +56,10 @@ Codepage::Codepage(const Session& session, const Catalogue& catalogue, const std
   if (object_ == nullptr || code != LX_OK)
     throw Failure(kDataError, "codepage " + name_ + " cannot be loaded: " + describe_code(code));
   id_ = reinterpret_cast<const LXObjDisk*>(object_)->id;
-  // Conversion looks at the locale's codepage only; any language and territory will do.
-  const std::string locale_name =
-      catalogue.first_name(LX_LANGUAGE) + "_" + catalogue.first_name(LX_TERRITORY) + "." + name_ + "@BINARY";
+  const std::string locale_name = (!language_territory.empty() ? language_territory
+                                                               : catalogue.first_name(LX_LANGUAGE) + "_" +
+                                                                     catalogue.first_name(LX_TERRITORY)) +
+                                  "." + name_ + "@BINARY";
   locale_ = LXGetLocale(locale_name.c_str(), 0, &code);
   if (locale_ == nullptr) throw Failure(kDataError, "no locale " + locale_name + ": " + describe_code(code));
   learn_shift_bytes();
@@ -77,6 +79,14 @@ void Codepage::learn_shift_bytes() {
   shift_out_ = out[0];
   shift_in_ = in[0];
   double_bytes_ = LXByteLengthEx(locale_, "\x41", LX_SHIFT_DOUBLE);
+}
+
+size_t Codepage::call_bytes(const char* text, size_t bytes) const {
+  if (!shift_sensitive_) return bytes;
+  for (size_t i = 1; i < bytes; ++i) {
+    if (is_shift(text[i - 1]) && is_shift(text[i])) return i;
+  }
+  return bytes;
 }
 
 int32_t Codepage::char_bytes(const char* text, LXShiftState state) const {

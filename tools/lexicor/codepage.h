@@ -14,8 +14,10 @@ namespace lexicor_cli {
 class Codepage {
  public:
   /// `name` is an object name, a decimal identifier or an alias, in any letter case. Throws a Failure that
-  /// names the nearest codepages when there is none, or that says why its file could not be loaded.
-  Codepage(const Session& session, const Catalogue& catalogue, const std::string& name);
+  /// names the nearest codepages when there is none, or that says why its file could not be loaded. Its locale
+  /// has the given language and territory ("German_Austria"); empty: any will do.
+  Codepage(const Session& session, const Catalogue& catalogue, const std::string& name,
+           const std::string& language_territory = "");
   ~Codepage();
   Codepage(const Codepage&) = delete;
   Codepage& operator=(const Codepage&) = delete;
@@ -31,6 +33,12 @@ class Codepage {
   LXShiftState state_after(char shift_byte) const {
     return shift_byte == shift_out_ ? LX_SHIFT_DOUBLE : LX_SHIFT_SINGLE;
   }
+  /// The shift byte that sets a state.
+  char shift_byte(LXShiftState state) const { return state == LX_SHIFT_DOUBLE ? shift_out_ : shift_in_; }
+  /// Bytes of a text that go to the library at once. A shift byte right behind another one counts as a
+  /// character within a call; host texts have such pairs where two double-byte fields meet, so the call ends
+  /// between them.
+  size_t call_bytes(const char* text, size_t bytes) const;
   /// Bytes of the character at `text`, which is no shift byte.
   int32_t char_bytes(const char* text, LXShiftState state) const;
 

@@ -39,6 +39,9 @@ struct Subcommand {
 };
 
 Run declare_convert(CLI::App& command, const CommonOptions& common);
+Run declare_info(CLI::App& command, const CommonOptions& common);
 Run declare_list(CLI::App& command, const CommonOptions& common);
+Run declare_map(CLI::App& command, const CommonOptions& common);
+Run declare_native(CLI::App& command, const CommonOptions& common);
 
 }  // namespace lexicor_cli

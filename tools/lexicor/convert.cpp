@@ -12,14 +12,13 @@
 #include "input.h"
 #include "loss.h"
 #include "output.h"
-#include "progress.h"
+#include "pieces.h"
 #include "session.h"
 
 namespace lexicor_cli {
 
 namespace {
 
-constexpr size_t kPieceBytes = 64 * 1024;
 // LXConvertBuffer wants at least this much room a call.
 constexpr int32_t kLeastRoomBytes = 8;
 // More than the longest character and a shift byte.
@@ -39,7 +38,7 @@ class Converter {
         target_(target),
         output_(output),
         conversion_(LXOpenConversion(target.locale(), source.locale()), LXCloseConversion),
-        buffer_(kPieceBytes * 4) {
+        buffer_(Pieces::kBytes * 4) {
     if (conversion_ == nullptr)
       throw Failure(kDataError, "no conversion: " + describe_code(LXGetError(target.locale())));
   }
@@ -105,16 +104,6 @@ class Converter {
   uint64_t boundary_ = 0;  // input bytes up to the last whole character
 };
 
-/// Bytes of `data` that go to the library at once. A shift byte right behind another one counts as a character
-/// within a call; host texts have such pairs where two double-byte fields meet, so the call ends between them.
-size_t call_bytes(const Codepage& source, const char* data, size_t bytes) {
-  if (!source.shift_sensitive()) return bytes;
-  for (size_t i = 1; i < bytes; ++i) {
-    if (source.is_shift(data[i - 1]) && source.is_shift(data[i])) return i;
-  }
-  return bytes;
-}
-
 /// Reports what was lost; true when nothing was.
 bool report_losses(const LossFinder& losses, const Input& input, const ConvertOptions& options) {
   const uint64_t count = losses.count();
@@ -133,30 +122,22 @@ int convert(const ConvertOptions& options, const CommonOptions& common) {
   const Codepage source(session, catalogue, options.from);
   const Codepage target(session, catalogue, options.to);
   Input input(options.files);
-  std::vector<char> piece(kPieceBytes);
-  // The first read stands before the output is opened: a missing input leaves no trace.
-  size_t got = input.read(piece.data(), piece.size());
+  Pieces pieces(input);
   Output output(options.output);
   Converter converter(source, target, output);
   std::optional<LossFinder> losses;
   if (options.strict) losses.emplace(source, target);
-  {
-    Progress progress(input.total_bytes(), !output.is_terminal());
-    for (; got > 0; got = input.read(piece.data(), piece.size())) {
-      for (size_t done = 0, bytes; done < got; done += bytes) {
-        bytes = call_bytes(source, piece.data() + done, got - done);
-        converter.take(piece.data() + done, bytes);
-        if (losses) losses->take(piece.data() + done, bytes);
-      }
-      progress.advance(got);
+  pieces.each(!output.is_terminal(), [&](const char* data, size_t got) {
+    for (size_t done = 0, bytes; done < got; done += bytes) {
+      bytes = source.call_bytes(data + done, got - done);
+      converter.take(data + done, bytes);
+      if (losses) losses->take(data + done, bytes);
     }
-  }
+  });
   const bool whole = converter.finish();
   if (losses && whole) losses->finish();
   const bool kept = !losses || report_losses(*losses, input, options);
-  if (!whole)
-    throw Failure(kDataError,
-                  "the input ends inside the character that begins at " + input.locate(converter.boundary()));
+  if (!whole) throw input.cut_at(converter.boundary());
   if (!kept) return kDataError;
   output.commit();
   return kDone;

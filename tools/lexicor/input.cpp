@@ -9,8 +9,6 @@
 #include <cstring>
 #include <utility>
 
-#include "command.h"
-
 namespace lexicor_cli {
 
 Input::Input(std::vector<std::string> names) : names_(std::move(names)) {
@@ -66,6 +64,10 @@ std::string Input::locate(uint64_t offset) const {
     if (candidate.offset <= offset) start = candidate;
   }
   return title(start.file) + ", byte " + std::to_string(offset - start.offset);
+}
+
+Failure Input::cut_at(uint64_t offset) const {
+  return {kDataError, "the input ends inside the character that begins at " + locate(offset)};
 }
 
 void Input::fail(size_t file) const {

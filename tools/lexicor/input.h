@@ -5,6 +5,8 @@
 #include <string>
 #include <vector>
 
+#include "command.h"
+
 namespace lexicor_cli {
 
 class Input {
@@ -24,6 +26,8 @@ class Input {
 
   /// Where a byte of the whole text stands: "byte 12", or "FILE, byte 12" when there are several files.
   std::string locate(uint64_t offset) const;
+  /// What to throw when the input ended inside the character that begins there.
+  Failure cut_at(uint64_t offset) const;
 
  private:
   struct Start {

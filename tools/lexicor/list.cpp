@@ -1,24 +1,23 @@
-// lexicor list: the objects and aliases of the locale directory, as tables or as JSON.
+// lexicor list: the objects and aliases of the locale directory and the operating system's locales, as tables
+// or as JSON.
 #include <lx.h>
 
 #include <algorithm>
 #include <memory>
-#include <nlohmann/json.hpp>
 #include <sstream>
+#include <utility>
 
 #include "catalogue.h"
 #include "command.h"
 #include "output.h"
+#include "report.h"
 #include "session.h"
 
 namespace lexicor_cli {
 
 namespace {
 
-using Json = nlohmann::ordered_json;
-
 constexpr size_t kLineChars = 100;
-constexpr char kAliases[] = "aliases";
 
 /// The kinds of objects, in the order of the tables.
 constexpr struct {
@@ -40,11 +39,6 @@ std::vector<CatalogueObject> objects_of(const Catalogue& catalogue, int type) {
     if (object.type == type) found.push_back(object);
   }
   return found;
-}
-
-std::string padded(const std::string& text, size_t chars, bool to_the_right) {
-  const std::string fill(text.size() < chars ? chars - text.size() : 0, ' ');
-  return to_the_right ? fill + text : text + fill;
 }
 
 /// Words behind a column that ends at `indent`, broken before the line is full.
@@ -72,22 +66,15 @@ void write_objects(std::ostream& out, const Catalogue& catalogue, int type) {
   for (const CatalogueObject& object : objects) {
     const std::vector<std::string> aliases =
         type == LX_CODEPAGE ? catalogue.aliases_of(object.name) : std::vector<std::string>();
-    out << padded(std::to_string(object.id), kIdChars, true) << "  ";
+    out << padded(std::to_string(object.id), kIdChars, Align::kRight) << "  ";
     if (aliases.empty()) {
       out << object.name << '\n';
       continue;
     }
-    out << padded(object.name, name_chars, false) << "  ";
+    out << padded(object.name, name_chars) << "  ";
     write_wrapped(out, aliases, kIdChars + 2 + name_chars + 2);
     out << '\n';
   }
-}
-
-void write_aliases(std::ostream& out, const Catalogue& catalogue) {
-  size_t chars = 0;
-  for (const CatalogueAlias& row : catalogue.aliases) chars = std::max(chars, row.alias.size());
-  for (const CatalogueAlias& row : catalogue.aliases)
-    out << padded(row.alias, chars, false) << "  " << row.codepage << '\n';
 }
 
 Json json_objects(const Catalogue& catalogue, int type) {
@@ -100,11 +87,46 @@ Json json_objects(const Catalogue& catalogue, int type) {
   return rows;
 }
 
-Json json_aliases(const Catalogue& catalogue) {
-  Json rows = Json::array();
-  for (const CatalogueAlias& row : catalogue.aliases)
-    rows.push_back({{"alias", row.alias}, {"codepage", row.codepage}});
+using NameRows = std::vector<std::pair<std::string, std::string>>;
+
+/// A list of names and what each stands for.
+struct NameTable {
+  const char* title;
+  const char* name;  // of the two columns, in JSON
+  const char* meaning;
+  NameRows (*read)(const Catalogue& catalogue);
+};
+
+NameRows alias_rows(const Catalogue& catalogue) {
+  NameRows rows;
+  for (const CatalogueAlias& row : catalogue.aliases) rows.emplace_back(row.alias, row.codepage);
   return rows;
+}
+
+NameRows native_rows(const Catalogue&) {
+  NameRows rows;
+  LXEnumNativeLocales(
+      [](void* user, const char* native, const char* locale) {
+        static_cast<NameRows*>(user)->emplace_back(native, locale);
+        return int32_t{1};
+      },
+      &rows);
+  return rows;
+}
+
+constexpr NameTable kNameTables[] = {{"aliases", "alias", "codepage", alias_rows},
+                                     {"locales", "native", "locale", native_rows}};
+
+void write_names(std::ostream& out, const NameRows& rows) {
+  size_t chars = 0;
+  for (const auto& [name, meaning] : rows) chars = std::max(chars, name.size());
+  for (const auto& [name, meaning] : rows) out << padded(name, chars) << "  " << meaning << '\n';
+}
+
+Json json_names(const NameTable& table, const NameRows& rows) {
+  Json json = Json::array();
+  for (const auto& [name, meaning] : rows) json.push_back({{table.name, name}, {table.meaning, meaning}});
+  return json;
 }
 
 std::string list_text(const ListOptions& options, const Catalogue& catalogue) {
@@ -123,12 +145,15 @@ std::string list_text(const ListOptions& options, const Catalogue& catalogue) {
       write_objects(out, catalogue, kind.type);
     }
   }
-  if (options.json) {
-    // In the whole list the aliases stand with their codepages.
-    if (options.what == kAliases) json[kAliases] = json_aliases(catalogue);
-    return json.dump(2, ' ', false, Json::error_handler_t::replace) + "\n";
+  // The whole list is that of the directory: its aliases stand with their codepages.
+  for (const NameTable& table : kNameTables) {
+    if (options.what != table.title) continue;
+    if (options.json)
+      json[table.title] = json_names(table, table.read(catalogue));
+    else
+      write_names(out, table.read(catalogue));
   }
-  if (options.what == kAliases) write_aliases(out, catalogue);
+  if (options.json) return json_text(json);
   return out.str();
 }
 
@@ -145,12 +170,14 @@ Run declare_list(CLI::App& command, const CommonOptions& common) {
   const auto options = std::make_shared<ListOptions>();
   command
       .add_option("WHAT", options->what,
-                  "codepages, languages, territories, sorts or aliases; all when left out")
+                  "codepages, languages, territories, sorts, aliases or locales; all objects when left out")
       ->type_name("")
-      ->check(CLI::IsMember({"codepages", "languages", "territories", "sorts", "aliases"}));
+      ->check(CLI::IsMember({"codepages", "languages", "territories", "sorts", "aliases", "locales"}));
   command.add_flag("--json", options->json, "print JSON");
   command.footer(
-      "Each line has the identifier, the name and, of a codepage, its aliases.\n"
+      "Each line has the identifier, the name and, of a codepage, its aliases. Locales are the operating "
+      "system's\n"
+      "names, with the locale that each stands for.\n"
       "\n"
       "Examples:\n"
       "  lexicor list codepages\n"

@@ -1,4 +1,4 @@
-// lexicor: conversion between codepages and a look into a locale directory, from the command line.
+// lexicor: conversion and mapping of text and a look into a locale directory, from the command line.
 // Exit codes: 0 done, 1 an error in the data or the files, 2 a wrong command line.
 #include <lx.h>
 
@@ -19,7 +19,10 @@ using namespace lexicor_cli;
 
 constexpr Subcommand kSubcommands[] = {
     {"convert", "Convert text from one codepage to another", declare_convert},
-    {"list", "List the objects of the locale directory", declare_list},
+    {"map", "Map text to another case or width, or to ASCII digits", declare_map},
+    {"info", "Show the items of a locale", declare_info},
+    {"list", "List the objects of the locale directory, or the operating system's locales", declare_list},
+    {"native", "Show what an operating-system name of a locale stands for", declare_native},
 };
 
 constexpr char kFooter[] =
@@ -27,6 +30,8 @@ constexpr char kFooter[] =
     "  lexicor list codepages\n"
     "  lexicor convert --from MS932 --to UTF-8 -o letter.utf8 letter.sjis\n"
     "  lexicor convert --from UTF-8 --to IBM930 --strict < letter.utf8 > letter.host\n"
+    "  lexicor map upper --locale German letter.utf8\n"
+    "  lexicor info German_Austria\n"
     "  lexicor convert --help";
 
 /// A wrong command line, a question for help or the version: prints it and returns the exit code.

@@ -1,16 +1,28 @@
-// lexicor-import OUTDIR: writes the codepage sources of the locale directory (codepages/*.ucm), the codepages'
-// lines of control.txt and alias.txt from what ICU and glibc know. A maintainer's program; the build needs only
-// what it wrote. A second run with the same ICU and glibc changes nothing. It prints what it left out.
+// lexicor-import OUTDIR: writes the sources of the locale directory (languages, territories, codepages, sorts,
+// their lines of control.txt, alias.txt) from what ICU and glibc know. A maintainer's program; the build needs
+// only what it wrote. A second run with the same ICU and glibc changes nothing. It prints what it left out, and
+// what cannot be written in the default codepages.
+#include <unicode/ustring.h>
+
 #include <algorithm>
 #include <cstdio>
 #include <exception>
 #include <filesystem>
 #include <fstream>
+#include <map>
+#include <set>
 #include <sstream>
 #include <stdexcept>
 
 #include "alias_import.h"
 #include "codepage_import.h"
+#include "control_source.h"
+#include "icu_text.h"
+#include "language_toml.h"
+#include "locale_import.h"
+#include "locale_table.h"
+#include "sort_import.h"
+#include "territory_toml.h"
 #include "ucm.h"
 
 namespace lexicor_import {
@@ -22,12 +34,14 @@ constexpr Codepage kCodepages[] = {
 #include "codepages.inc"
 };
 
-constexpr char kNewControl[] =
+using lexicor_data::Control;
+using lexicor_data::ObjectType;
+
+constexpr char kControlHead[] =
     "# The objects of the locale directory: type, identifier, name, by type and identifier. The sources are\n"
-    "# languages/NAME.toml, territories/NAME.toml and codepages/NAME.ucm. lexicor-import writes the "
-    "codepages.\n"
-    "language 1 English\n"
-    "territory 840 UnitedStates\n";
+    "# languages/NAME.toml, territories/NAME.toml, codepages/NAME.ucm and sorts/NAME.txt. lexicor-import "
+    "writes\n"
+    "# all of them.\n";
 
 /// Leaves a file alone that holds the text already.
 void write_file(const fs::path& path, const std::string& text) {
@@ -41,24 +55,15 @@ void write_file(const fs::path& path, const std::string& text) {
   if (!out) throw std::runtime_error("cannot write " + path.string());
 }
 
-/// The control file's text with its codepage lines replaced; all others stay, sorts behind the codepages.
-std::string control_text(const std::string& old, const std::vector<Codepage>& codepages) {
-  std::string lines;
-  for (const Codepage& codepage : codepages) {
-    lines += "codepage " + std::to_string(codepage.id) + " " + codepage.name + "\n";
-  }
-  std::string before, after;
-  std::istringstream in(old);
-  for (std::string line; std::getline(in, line);) {
-    const std::vector<std::string> parts = words(line);
-    if (!parts.empty() && parts[0] == "codepage") continue;
-    if (!after.empty() || (!parts.empty() && parts[0] == "sort")) {
-      after += line + "\n";
-    } else {
-      before += line + "\n";
-    }
-  }
-  return before + lines + after;
+/// The objects that this program writes.
+Control control_list(const fs::path& file, const std::vector<Codepage>& codepages) {
+  std::ostringstream list;
+  for (const Language& row : kLanguages) list << "language " << row.id << ' ' << row.name << '\n';
+  for (const Territory& row : kTerritories) list << "territory " << row.id << ' ' << row.name << '\n';
+  for (const Codepage& row : codepages) list << "codepage " << row.id << ' ' << row.name << '\n';
+  for (const Sort& row : kSorts) list << "sort " << row.id << ' ' << row.name << '\n';
+  std::istringstream in(list.str());
+  return lexicor_data::read_control(in, file.string());
 }
 
 std::string import_text(const Codepage& codepage) {
@@ -74,6 +79,91 @@ std::string import_text(const Codepage& codepage) {
   return out.str();
 }
 
+std::u16string utf16(const std::string& text) {
+  return icu_text("UTF-8", [&](UChar* out, int32_t room, UErrorCode* error) {
+    int32_t units = 0;
+    u_strFromUTF8(out, room, &units, text.data(), static_cast<int32_t>(text.size()), error);
+    return units;
+  });
+}
+
+/// The 16-bit values that a codepage's source maps.
+std::set<char16_t> repertoire(const fs::path& directory, const std::string& codepage) {
+  const std::string file = (directory / "codepages" / (codepage + ".ucm")).string();
+  std::ifstream in(file, std::ios::binary);
+  std::set<char16_t> values;
+  for (const lexicor_data::Mapping& mapping : lexicor_data::read_ucm(in, file).mappings) {
+    if (mapping.precision != 3 && mapping.unicode <= 0xFFFF)
+      values.insert(static_cast<char16_t>(mapping.unicode));
+  }
+  return values;
+}
+
+/// Prints the characters of a source that its codepage does not have.
+void print_unwritable(const fs::path& directory, const std::string& name, const std::string& codepage,
+                      const std::string& text) {
+  if (codepage == "UTF-8") return;
+  const std::set<char16_t> values = repertoire(directory, codepage);
+  std::set<char16_t> missing;
+  for (char16_t unit : utf16(text)) {
+    if (values.count(unit) == 0) missing.insert(unit);
+  }
+  for (char16_t unit : missing) {
+    std::printf("%s: not in %s: U+%04X\n", name.c_str(), codepage.c_str(), static_cast<unsigned>(unit));
+  }
+}
+
+void import_languages(const fs::path& directory, const Control& control) {
+  fs::create_directories(directory / "languages");
+  for (const Language& row : kLanguages) {
+    lexicor_data::LanguageSource language = import_language(row, control);
+    std::ostringstream out, texts;
+    lexicor_data::write_language(out, language, &control);
+    write_file(directory / "languages" / (std::string(row.name) + ".toml"),
+               source_comment(row.locale) + out.str());
+    language.special_upper.clear();
+    language.special_lower.clear();
+    lexicor_data::write_language(texts, language, &control);
+    print_unwritable(directory, row.name, row.codepage, texts.str());
+  }
+}
+
+void import_territories(const fs::path& directory) {
+  std::map<std::string, std::string> codepages;
+  for (const Language& row : kLanguages) codepages[row.name] = row.codepage;
+  fs::create_directories(directory / "territories");
+  for (const Territory& row : kTerritories) {
+    Notes notes;
+    std::ostringstream out;
+    try {
+      lexicor_data::write_territory(out, import_territory(row, notes));
+    } catch (const std::exception& error) {
+      throw std::runtime_error(std::string(row.name) + ": " + error.what());
+    }
+    for (const std::string& note : notes) std::printf("%s: %s\n", row.name, note.c_str());
+    write_file(directory / "territories" / (std::string(row.name) + ".toml"),
+               source_comment(row.locale) + out.str());
+    print_unwritable(directory, row.name, codepages.at(row.language), out.str());
+  }
+}
+
+void import_sorts(const fs::path& directory, const std::vector<Codepage>& codepages) {
+  std::set<char16_t> written;
+  for (const Codepage& codepage : codepages) written.merge(repertoire(directory, codepage.name));
+  fs::create_directories(directory / "sorts");
+  for (const Sort& row : kSorts) {
+    Notes notes;
+    std::ostringstream out;
+    try {
+      lexicor_data::write_sort(out, import_sort(row, written, notes));
+    } catch (const std::exception& error) {
+      throw std::runtime_error(std::string(row.name) + ": " + error.what());
+    }
+    for (const std::string& note : notes) std::printf("%s: %s\n", row.name, note.c_str());
+    write_file(directory / "sorts" / (std::string(row.name) + ".txt"), source_comment(row.locale) + out.str());
+  }
+}
+
 void run(const fs::path& directory) {
   const std::vector<Codepage> codepages = all_codepages();
   fs::create_directories(directory / "codepages");
@@ -84,16 +174,14 @@ void run(const fs::path& directory) {
   write_aliases(aliases, codepages);
   write_file(directory / "alias.txt", aliases.str());
 
-  std::ifstream in(directory / "control.txt", std::ios::binary);
-  std::stringstream control;
-  if (in) {
-    control << in.rdbuf();
-  } else {
-    control << kNewControl;
-  }
-  in.close();
-  write_file(directory / "control.txt", control_text(control.str(), codepages));
-  std::printf("%zu codepages\n", codepages.size());
+  const Control control = control_list(directory / "control.txt", codepages);
+  import_languages(directory, control);
+  import_territories(directory);
+  import_sorts(directory, codepages);
+  std::ostringstream list;
+  lexicor_data::write_control(list, control);
+  write_file(directory / "control.txt", kControlHead + list.str());
+  std::printf("%zu objects\n", control.objects.size());
 }
 
 }  // namespace

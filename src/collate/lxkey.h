@@ -1,0 +1,110 @@
+// Sort keys, and the folding of a text that options ask for, as collation shares them.
+#pragma once
+
+#include "collate/lxlevels.h"
+#include "core/lxrecords.h"
+
+namespace lx {
+
+enum class Fold { kNone, kCase, kWidth };
+
+/// False for options that keys do not know.
+bool fold_of(uint32_t options, Fold* fold);
+
+/// What a character is folded to, and the special mappings that come first.
+struct Folding {
+  const LXObject& codepage;
+  const Codepage& cp;
+  Fold fold;
+  Specials specials;  // none unless case is folded and the language has some
+
+  Folding(const LXLocale& locale, Fold fold);
+
+  uint16_t unicode(LXWChar code) const { return code_to_unicode(cp, code); }
+  uint16_t unicode(LXUChar u) const { return u; }
+  uint16_t folded(LXWChar code) const;
+  uint16_t folded(LXUChar u) const;
+};
+
+/// Reads a text folded: a special mapping of a character, or else of it and its successor, takes their place.
+template <class In>
+struct FoldReader {
+  using Unit = uint8_t;
+  static constexpr bool kOneUnit = false;
+  static constexpr bool kRuns = false;
+  using Char = std::conditional_t<std::is_same_v<In, UnicodeReader>, LXUChar, LXWChar>;
+
+  const Folding& folding;
+  In in;
+  Char ahead = 0;
+  LXUChar second = 0;
+  bool has_ahead = false;
+  bool has_second = false;
+
+  bool next(LXUChar* u) {
+    if (has_second) {
+      has_second = false;
+      *u = second;
+      return true;
+    }
+    Char c = ahead;
+    if (!has_ahead && !in.next(&c)) {
+      in.p = in.end;
+      return false;
+    }
+    has_ahead = false;
+    if (folding.specials.count == 0 || !special(c, u)) *u = folding.folded(c);
+    return true;
+  }
+
+ private:
+  bool special(Char c, LXUChar* u) {
+    const uint16_t value = folding.unicode(c);
+    int32_t results = folding.specials.find(value, 0, u, &second);
+    if (results == 0) {
+      has_ahead = in.next(&ahead);
+      if (!has_ahead) return false;
+      results = folding.specials.find(value, folding.unicode(ahead), u, &second);
+      if (results != 0) has_ahead = false;
+    }
+    has_second = results == 2;
+    return results != 0;
+  }
+};
+
+template <class In>
+bool exhausted(const FoldReader<In>& folded) {
+  return !folded.has_second && !folded.has_ahead && exhausted(folded.in);
+}
+template <class In>
+void drop_rest(FoldReader<In>* folded) {
+  drop_rest(&folded->in);
+}
+
+/// Calls `body` with the reader of the text folded as asked.
+template <class In, class Body>
+auto read_folded(const Folding& folding, const In& in, Body&& body) {
+  if (folding.fold == Fold::kNone) return body(in);
+  return body(FoldReader<In>{folding, in});
+}
+
+/// A key: the levels of a text in their space, and how long it will be.
+class Key {
+ public:
+  template <class Reader>
+  Key(const Sort& sort, const Reader& text, const LevelCounts& counts, uint8_t* space)
+      : levels_(sort, text, counts, space) {
+    trim(sort);
+  }
+
+  size_t bytes() const;
+  void write(uint8_t* output) const;
+
+ private:
+  void trim(const Sort& sort);
+
+  Levels levels_;
+  bool positions_ = true;  // whether the special level has them
+};
+
+}  // namespace lx

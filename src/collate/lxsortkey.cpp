@@ -1,0 +1,260 @@
+// Sort keys: byte strings whose order is that of collation. A key is the weights of a text level by level, a
+// zero byte between two levels; in binary order it is the text, folded as the options ask.
+#include <cstring>
+
+#include "codepage/lxunicode.h"
+#include "collate/lxkey.h"
+#include "core/lxcall.h"
+
+namespace {
+
+using lx::bytes_of;
+using lx::Call;
+using lx::Codepage;
+using lx::codepage_of;
+using lx::Fold;
+using lx::Folding;
+using lx::Form;
+using lx::Key;
+using lx::Sort;
+
+RAS1_Unit unit = RAS1_UNIT("lxsortkey");
+
+constexpr int32_t kEmptyKeyBytes = 3;
+
+/// Where the caller's buffer begins to be used: at a multiple of the alignment unit. Less than the whole size
+/// may be usable, and only that counts when the key is fitted in.
+struct Output {
+  uint8_t* start;
+  size_t size;
+  size_t usable;
+
+  Output(uint8_t* output, int32_t given) : start(output), size(given > 0 ? static_cast<size_t>(given) : 0) {
+    const size_t unit_bytes = lx::globals.area->table_alignment;
+    const size_t shift = (0 - reinterpret_cast<uintptr_t>(output)) & (unit_bytes - 1);
+    usable = size > shift ? size - shift : 0;
+  }
+  bool is_work_area(size_t units) const {
+    constexpr size_t kLevelBytes = 8;  // of a unit: twice 2 + 1 + 1, and as much again for its specials
+    const size_t unit_bytes = lx::globals.area->table_alignment;
+    if (units > SIZE_MAX / (4 * kLevelBytes)) return false;
+    const size_t levels = (units * kLevelBytes + 3 + unit_bytes - 1) & ~(unit_bytes - 1);
+    return usable >= levels + units * kLevelBytes;
+  }
+};
+
+/// Makes the key of a text of at most `units` characters: its bytes, or -1 without memory.
+template <class Reader>
+int32_t make_key(const Sort& sort, const Reader& text, size_t units, const Output& output) {
+  const lx::LevelCounts counts = lx::count_weights(sort, text);
+  const lx::WorkBuffer space(counts.bytes());
+  if (!space) return -1;
+  const Key key(sort, text, counts, space.as<uint8_t>());
+  const size_t bytes = key.bytes();
+  if (bytes > INT32_MAX) return -1;
+  if (bytes <= output.usable) {
+    key.write(output.start);
+    if (output.is_work_area(units)) memset(output.start + bytes, 0, output.size - bytes);
+  }
+  return static_cast<int32_t>(bytes);
+}
+
+int32_t empty_key(uint8_t* output, int32_t size) {
+  if (size <= 0) return 0;
+  memset(output, 0, static_cast<size_t>(size < kEmptyKeyBytes ? size : kEmptyKeyBytes));
+  return kEmptyKeyBytes;
+}
+
+/// In binary order: the text itself where it fits.
+template <class Unit>
+int32_t copy_text(uint8_t* output, int32_t size, const Unit* text, size_t units) {
+  const size_t bytes = units * sizeof(Unit);
+  if (size > 0 && bytes <= static_cast<size_t>(size)) memcpy(output, text, bytes);
+  return static_cast<int32_t>(bytes);
+}
+
+/// In binary order with options: each folded character while it fits. `store(u, p)` writes one and returns its
+/// bytes.
+template <class Reader, class Store>
+int32_t write_folded(Reader text, uint8_t* output, int32_t size, Store store) {
+  size_t total = 0;
+  for (LXUChar u = 0; text.next(&u);) {
+    uint8_t character[sizeof(LXWChar)];
+    const size_t bytes = store(u, character);
+    if (size > 0 && total + bytes <= static_cast<size_t>(size)) memcpy(output + total, character, bytes);
+    total += bytes;
+  }
+  return static_cast<int32_t>(total);
+}
+
+template <class Unit>
+size_t store_unit(Unit value, uint8_t* p) {
+  memcpy(p, &value, sizeof(value));
+  return sizeof(value);
+}
+
+/// How a form stores a folded character in binary order.
+template <class Reader>
+size_t store_character(const Codepage& cp, const Reader&, LXUChar u, uint8_t* p) {
+  return lx::store_unicode(cp, u, p);
+}
+size_t store_character(const Codepage& cp, const lx::CodeReader&, LXUChar u, uint8_t* p) {
+  return store_unit(lx::unicode_to_code(cp, u), p);
+}
+size_t store_character(const Codepage&, const lx::UnicodeReader&, LXUChar u, uint8_t* p) {
+  return store_unit(u, p);
+}
+
+/// The frame of all forms. `units_of(cp)` counts the text; `read(cp, units, body)` calls `body` with its
+/// reader.
+template <class Unit, class UnitsOf, class Read>
+int32_t transform(LXLocale* given, uint8_t* output, int32_t size, const Unit* text, uint32_t options,
+                  UnitsOf units_of, Read read) {
+  Call call(unit, given);
+  if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
+  const LXLocale& locale = *call.locale();
+  const Codepage& cp = codepage_of(*locale.codepage);
+  Fold fold;
+  if (!lx::fold_of(options & ~uint32_t{LX_CHARACTERS}, &fold)) return call.fail(LX_E_INVALID, -1);
+  const size_t units = units_of(cp);
+  if (units == 0) return call.exit(empty_key(output, size));
+  if (units > INT32_MAX / sizeof(Unit)) return call.fail(LX_E_MEMORY, -1);
+  if (locale.sort == nullptr && fold == Fold::kNone) return call.exit(copy_text(output, size, text, units));
+  const Folding folding(locale, fold);
+  const int32_t bytes = read(cp, units, [&](const auto& in) {
+    return lx::read_folded(folding, in, [&](const auto& reader) {
+      if (locale.sort != nullptr)
+        return make_key(lx::sort_of(*locale.sort), reader, units, Output(output, size));
+      return write_folded(reader, output, size,
+                          [&](LXUChar u, uint8_t* p) { return store_character(cp, in, u, p); });
+    });
+  });
+  return bytes < 0 ? call.fail(LX_E_MEMORY, -1) : call.exit(bytes);
+}
+
+int32_t transform_bytes(LXLocale* locale, uint8_t* output, int32_t size, const char* text, LXShiftState state,
+                        int32_t length, uint32_t options, Form form) {
+  return transform(
+      locale, output, size, text, options,
+      [&](const Codepage& cp) { return lx::text_bytes(cp, text, state, length, options); },
+      [&](const Codepage& cp, size_t bytes, auto body) {
+        return lx::read_bytes(cp, form, state, bytes_of(text), bytes, body);
+      });
+}
+
+}  // namespace
+
+namespace lx {
+
+bool fold_of(uint32_t options, Fold* fold) {
+  *fold = options == LX_CASE_INSENSITIVE    ? Fold::kCase
+          : options == LX_WIDTH_INSENSITIVE ? Fold::kWidth
+                                            : Fold::kNone;
+  return options == 0 || *fold != Fold::kNone;
+}
+
+Folding::Folding(const LXLocale& locale, Fold asked)
+    : codepage(*locale.codepage),
+      cp(codepage_of(codepage)),
+      fold(asked),
+      specials(asked == Fold::kCase ? specials_of(*locale.language, true) : Specials{nullptr, 0}) {}
+
+uint16_t Folding::folded(LXWChar code) const {
+  if (code <= 0xFF) {
+    const uint8_t* lower = cp.payload + format::codepage::kLower;
+    return cp.unicode[fold == Fold::kCase ? lower[code] : code];
+  }
+  if (fold == Fold::kCase) return code_to_unicode(cp, LXCpMbCaseConvW(&codepage, code, LX_C1_UPPER));
+  const LXWChar half = LXCpFullToHalfW(&codepage, code);
+  return code_to_unicode(cp, half != 0 ? half : code);
+}
+
+// To upper case, unlike the other forms: existing keys are made so.
+uint16_t Folding::folded(LXUChar u) const {
+  return fold == Fold::kCase ? unicode_upper(u) : unicode_full_to_half(u);
+}
+
+void Key::trim(const Sort& sort) {
+  const auto drop = [](Level<uint8_t>* level, uint8_t weight) {
+    while (level->end != level->begin && level->end[-1] == weight) --level->end;
+  };
+  drop(&levels_.secondaries, sort.default_secondary);
+  drop(&levels_.tertiaries, sort.default_tertiary);
+  positions_ = levels_.primaries.count() + levels_.secondaries.count() + levels_.tertiaries.count() != 0;
+}
+
+size_t Key::bytes() const {
+  constexpr size_t kSeparators = 3;
+  const size_t special_bytes = sizeof(uint16_t) * (positions_ ? 2 : 1);
+  return sizeof(uint16_t) * levels_.primaries.count() + levels_.secondaries.count() +
+         levels_.tertiaries.count() + special_bytes * levels_.specials.count() + kSeparators;
+}
+
+void Key::write(uint8_t* output) const {
+  const auto put = [&](uint16_t weight) {
+    *output++ = static_cast<uint8_t>(weight >> 8);
+    *output++ = static_cast<uint8_t>(weight);
+  };
+  for (const uint16_t* p = levels_.primaries.begin; p != levels_.primaries.end; ++p) put(*p);
+  *output++ = 0;
+  const auto put_level = [&](const Level<uint8_t>& level) {
+    memcpy(output, level.begin, level.count());
+    output += level.count();
+    *output++ = 0;
+  };
+  put_level(levels_.secondaries);
+  put_level(levels_.tertiaries);
+  for (const PlacedSpecial* p = levels_.specials.begin; p != levels_.specials.end; ++p) {
+    if (positions_) put(p->position);
+    put(p->weight);
+  }
+}
+
+}  // namespace lx
+
+extern "C" {
+
+int32_t LXStrxfrm(LXLocale* locale, uint8_t* output, int32_t size, const char* text, int32_t length,
+                  uint32_t options) {
+  return transform_bytes(locale, output, size, text, LX_SHIFT_SINGLE, length, options, Form::kPlain);
+}
+
+int32_t LXStrxfrmEx(LXLocale* locale, uint8_t* output, int32_t size, const char* text, LXShiftState state,
+                    int32_t length, uint32_t options) {
+  return transform_bytes(locale, output, size, text, state, length, options, Form::kEx);
+}
+
+int32_t LXWcsxfrm(LXLocale* locale, uint8_t* output, int32_t size, const LXWChar* text, int32_t length,
+                  uint32_t options) {
+  return transform(
+      locale, output, size, text, options, [&](const Codepage&) { return lx::text_units(text, length); },
+      [&](const Codepage& cp, size_t codes, auto body) {
+        return body(lx::CodeReader{cp, text, text + codes});
+      });
+}
+
+int32_t LXStrxfrmU(LXLocale* locale, uint8_t* output, int32_t size, const LXUChar* text, int32_t length,
+                   uint32_t options) {
+  return transform(
+      locale, output, size, text, options, [&](const Codepage&) { return lx::text_units(text, length); },
+      [&](const Codepage&, size_t units, auto body) {
+        return body(lx::UnicodeReader{text, text + units});
+      });
+}
+
+int32_t LXStrGenSortKey(LXLocale* given, uint8_t* output, int32_t size, const LXUChar* text, int32_t count) {
+  Call call(unit, given);
+  if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
+  const LXLocale& locale = *call.locale();
+  if (locale.sort == nullptr || count < 0) return call.fail(LX_E_INVALID, -1);
+  if (count == 0) {
+    if (size >= kEmptyKeyBytes) memset(output, 0, kEmptyKeyBytes);
+    return call.exit(kEmptyKeyBytes);
+  }
+  const lx::UnicodeReader reader{text, text + count};
+  const int32_t bytes =
+      make_key(lx::sort_of(*locale.sort), reader, static_cast<size_t>(count), Output(output, size));
+  return bytes < 0 ? call.fail(LX_E_MEMORY, -1) : call.exit(bytes);
+}
+
+}  // extern "C"

@@ -1,0 +1,230 @@
+// The values that a locale has of its own: filled from its territory, refilled when it moves to another
+// territory, converted when it moves to another codepage. What the caller has set is never overwritten.
+#include <cstring>
+
+#include "codepage/lxtext.h"
+#include "core/lxcall.h"
+#include "core/lxmemory.h"
+#include "locale/lxlocale.h"
+
+namespace {
+
+using lx::bytes_of;
+using lx::Call;
+using lx::changed_bit;
+using lx::Codepage;
+using lx::codepage_of;
+using lx::Form;
+using lx::ItemKind;
+
+RAS1_Unit unit = RAS1_UNIT("lxmodify");
+
+namespace territory = lx::format::territory;
+
+constexpr size_t kCurrencyText = 1;
+
+/// The 16-bit units of a text with its null.
+size_t units_of(const uint8_t* text) {
+  size_t units = 1;
+  for (; lx::le16(text) != 0; text += 2) ++units;
+  return units;
+}
+
+/// Frees the codepage texts of one record that another does not use.
+void LXLocaleFreeOldText(const LXLocale& kept, LXLocale& dropped) {
+  for (size_t i = 0; i < lx::kTexts; ++i)
+    if (dropped.texts[i] != kept.texts[i]) lx::hook_free(dropped.texts[i]);
+}
+
+/// Converts a text from one codepage to another, shift bytes and null included: the bytes written.
+size_t LXLocaleCnvText(const Codepage& from, const Codepage& to, const char* text, char* output) {
+  return lx::read_bytes(from, Form::kEx, LX_SHIFT_SINGLE, bytes_of(text), strlen(text), [&](auto in) {
+    return lx::write_bytes(to, Form::kEx, LX_SHIFT_SINGLE, bytes_of(output), lx::no_end<uint8_t>(),
+                           [&](auto out) {
+                             lx::transfer<LXUChar>(in, out, SIZE_MAX);
+                             out.put(LXUChar{0});
+                             return static_cast<size_t>(out.p - bytes_of(output));
+                           });
+  });
+}
+
+void fill_numbers(LXLocale* locale, const LXObject& land) {
+  const auto free_to_fill = [&](ItemKind kind, size_t i) {
+    return (locale->changed & changed_bit(kind, i)) == 0;
+  };
+  for (size_t i = 0; i < lx::kNumbers; ++i)
+    if (free_to_fill(ItemKind::kNumber, i))
+      locale->numbers[i] = lx::payload_word(land, territory::kNumbers + i);
+  const unsigned flags = lx::payload_word(land, territory::kFlags) >> 1;
+  for (size_t i = 0; i < lx::kFlags; ++i)
+    if (free_to_fill(ItemKind::kFlag, i))
+      locale->flags = static_cast<uint16_t>((locale->flags & ~(1u << i)) | (flags & 1u << i));
+  for (size_t i = 0; i < lx::kSignPositions; ++i)
+    if (free_to_fill(ItemKind::kSignPosition, i))
+      locale->sign_positions[i] = lx::payload_of(land)[2 * territory::kSignPositions + i];
+}
+
+/// A separator without a single byte in the codepage keeps the byte that it had.
+void fill_separators(LXLocale* locale, const LXObject& land) {
+  const Codepage& cp = codepage_of(*locale->codepage);
+  for (size_t i = 0; i < lx::kSeparators; ++i) {
+    if ((locale->changed & changed_bit(ItemKind::kSeparator, i)) != 0) continue;
+    const LXUChar u = lx::payload_word(land, territory::kSeparators + i);
+    locale->separators_unicode[i] = u;
+    const uint32_t code = lx::unicode_to_code(cp, u);
+    if (code <= 0xFF) locale->separators[i] = static_cast<uint8_t>(code);
+  }
+}
+
+/// Gives the locale one text of its territory in both forms; false without memory.
+bool fill_text(LXLocale* locale, const uint8_t* text, size_t i) {
+  const Codepage& cp = codepage_of(*locale->codepage);
+  const size_t units = units_of(text);
+  const size_t bytes = lx::most_text_bytes(cp, units);
+  lx::HookPtr<char> narrow(static_cast<char*>(lx::hook_allocate(bytes)));
+  if (!narrow)
+    LX_TRACE(unit, RAS1_LEVEL_ERRORS, "Unable to allocate %d bytes, (%d * %d)", static_cast<int>(bytes),
+             static_cast<int>(units), static_cast<int>(bytes / units));
+  lx::HookPtr<LXUChar> wide(narrow ? static_cast<LXUChar*>(lx::hook_allocate(sizeof(LXUChar) * units))
+                                   : nullptr);
+  if (narrow && !wide)
+    LX_TRACE(unit, RAS1_LEVEL_ERRORS, "Unable to allocate %d bytes, (%d * %d)",
+             static_cast<int>(sizeof(LXUChar) * units), static_cast<int>(units),
+             static_cast<int>(sizeof(LXUChar)));
+  if (!wide) return false;
+  lx::store_text(cp, text, bytes_of(narrow.get()));
+  memcpy(wide.get(), text, sizeof(LXUChar) * units);
+  locale->texts[i] = narrow.detach();
+  locale->texts_unicode[i] = wide.detach();
+  if (i == kCurrencyText)
+    LX_TRACE(unit, RAS1_LEVEL_DETAIL, "Setting currency for locale %p to %p", static_cast<void*>(locale),
+             static_cast<void*>(locale->texts[i]));
+  return true;
+}
+
+/// Moves the locale's own values from the old codepage to the one that the record names already.
+int32_t convert_values(LXLocale* locale, const Codepage& from, const LXLocale& saved) {
+  const Codepage& to = codepage_of(*locale->codepage);
+  for (uint8_t& separator : locale->separators) {
+    const uint32_t code = lx::unicode_to_code(to, from.unicode[separator]);
+    if (code > 0xFF) return LX_E_SEPARATOR;
+    separator = static_cast<uint8_t>(code);
+  }
+  for (size_t i = 0; i < lx::kTexts; ++i) {
+    const char* old = saved.texts[i];
+    char* large = static_cast<char*>(lx::hook_allocate(lx::most_text_bytes(to, strlen(old) + 1)));
+    if (large == nullptr) return LX_E_MEMORY;
+    locale->texts[i] = large;
+    const size_t bytes = LXLocaleCnvText(from, to, old, large);
+    // Without memory for the exact copy the larger block stays.
+    char* exact = static_cast<char*>(lx::hook_allocate(bytes));
+    if (exact == nullptr) continue;
+    memcpy(exact, large, bytes);
+    locale->texts[i] = exact;
+    lx::hook_free(large);
+  }
+  return LX_OK;
+}
+
+/// Whether a public function was given a loaded object of the type that it needs.
+bool is_loaded(const LXObject* object, int32_t type) {
+  return object != nullptr && object->disk.type == type && object->section[0] != nullptr;
+}
+
+}  // namespace
+
+namespace lx {
+
+size_t most_text_bytes(const Codepage& cp, size_t units) {
+  const size_t most = cp.single_byte && cp.one_byte_codes ? 1
+                      : cp.codes32 != nullptr             ? kMaxCharBytes
+                      : cp.utf8                           ? 3
+                                                          : 2;
+  return units * (most + cp.shift_sensitive);
+}
+
+void store_text(const Codepage& cp, const uint8_t* text, uint8_t* output) {
+  write_bytes(cp, Form::kEx, LX_SHIFT_SINGLE, output, no_end<uint8_t>(), [&](auto out) {
+    PayloadReader in{text, nullptr};
+    transfer<LXUChar>(in, out, SIZE_MAX);
+    out.put(LXUChar{0});
+  });
+}
+
+void set_codepage_flags(LXLocale* locale) {
+  const Codepage& cp = codepage_of(*locale->codepage);
+  unsigned flags = locale->flags & ~(kLocaleSingleByte | kLocaleShift);
+  if (cp.single_byte) flags |= kLocaleSingleByte;
+  if (cp.shift_sensitive) flags |= kLocaleShift;
+  locale->flags = static_cast<uint16_t>(flags);
+}
+
+int32_t set_modifiable(LXLocale* locale) {
+  const LXObject& land = *locale->territory;
+  fill_numbers(locale, land);
+  fill_separators(locale, land);
+  for (size_t i = 0; i < kTexts; ++i) {
+    if ((locale->changed & changed_bit(ItemKind::kText, i)) != 0) continue;
+    if (!fill_text(locale, payload_text(land, kTextWords[i]), i)) return LX_E_MEMORY;
+  }
+  return LX_OK;
+}
+
+int32_t change_territory(LXLocale* locale, LXObject* land) {
+  LXLocale saved = *locale;
+  locale->territory = land;
+  const int32_t code = set_modifiable(locale);
+  if (code == LX_OK) {
+    // The replaced Unicode texts are not freed; callers rely on their staying where they are.
+    LXLocaleFreeOldText(*locale, saved);
+    return LX_OK;
+  }
+  LXLocaleFreeOldText(saved, *locale);
+  for (size_t i = 0; i < kTexts; ++i)
+    if (locale->texts_unicode[i] != saved.texts_unicode[i]) hook_free(locale->texts_unicode[i]);
+  *locale = saved;
+  return code;
+}
+
+int32_t change_codepage(LXLocale* locale, LXObject* codepage) {
+  LXLocale saved = *locale;
+  locale->codepage = codepage;
+  set_codepage_flags(locale);
+  const int32_t code = convert_values(locale, codepage_of(*saved.codepage), saved);
+  if (code == LX_OK) {
+    LXLocaleFreeOldText(*locale, saved);
+    return LX_OK;
+  }
+  LXLocaleFreeOldText(saved, *locale);
+  *locale = saved;
+  return code;
+}
+
+}  // namespace lx
+
+extern "C" {
+
+int32_t LXLocaleSetModifiable(LXLocale* given) {
+  Call call(unit, given);
+  if (!call) return call.fail(LX_E_NOT_INITIALIZED, LX_E_NOT_INITIALIZED);
+  const int32_t code = lx::set_modifiable(call.locale());
+  return call.fail(code, code);
+}
+
+int32_t LXLocaleChangeTerritory(LXLocale* given, LXObject* land) {
+  Call call(unit, given);
+  if (!call) return call.fail(LX_E_NOT_INITIALIZED, LX_E_NOT_INITIALIZED);
+  if (!is_loaded(land, LX_TERRITORY)) return call.fail(LX_E_NOT_FOUND, LX_E_NOT_FOUND);
+  const int32_t code = lx::change_territory(call.locale(), land);
+  return call.fail(code, code);
+}
+
+int32_t LXLocaleChangeCodePage(LXLocale* given, LXObject* codepage) {
+  Call call(unit, given);
+  if (!call) return call.fail(LX_E_NOT_INITIALIZED, LX_E_NOT_INITIALIZED);
+  if (!is_loaded(codepage, LX_CODEPAGE)) return call.fail(LX_E_NOT_FOUND, LX_E_NOT_FOUND);
+  const int32_t code = lx::change_codepage(call.locale(), codepage);
+  return call.fail(code, code);
+}
+
+}  // extern "C"

@@ -1,0 +1,322 @@
+// Every shipped language and territory, read from the compiled objects through the library, against ICU's own
+// services: names, symbols, currencies, case mapping, and numbers, amounts, dates and times written out. What
+// differs must be what locale_differences.txt lists, each line with its reason.
+//
+// LEXICOR_WRITE_DIFFERENCES=FILE appends the lines that the test found, with both sides in place of the reason.
+#include <gtest/gtest.h>
+#include <unicode/uchar.h>
+#include <unicode/ucurr.h>
+#include <unicode/udat.h>
+#include <unicode/uldnames.h>
+#include <unicode/uloc.h>
+#include <unicode/ulocdata.h>
+#include <unicode/unum.h>
+#include <unicode/uset.h>
+#include <unicode/ustring.h>
+
+#include <algorithm>
+#include <cstdlib>
+#include <ctime>
+#include <fstream>
+#include <map>
+#include <sstream>
+#include <vector>
+
+#include "compile.h"
+#include "import/icu_text.h"
+#include "import/locale_table.h"
+#include "support/library.h"
+
+namespace lx::test {
+namespace {
+
+using lexicor_import::ascii_signs;
+using lexicor_import::IcuPtr;
+using Text = std::u16string;
+
+constexpr tm kDates[] = {{9, 5, 14, 5, 6, 103, 6, 185, 0, 0, nullptr},     // 5 July 2003, a Saturday
+                         {0, 0, 0, 1, 0, 124, 1, 0, 0, 0, nullptr},        // 1 January 2024, midnight
+                         {59, 59, 9, 31, 11, 99, 5, 364, 0, 0, nullptr},   // 31 December 1999
+                         {45, 30, 12, 20, 4, 126, 3, 139, 0, 0, nullptr},  // 20 May 2026, noon
+                         {1, 10, 23, 8, 8, 100, 5, 251, 0, 0, nullptr}};   // 8 September 2000
+
+/// The text of an ICU function that ends in buffer, room and error.
+template <class Function, class... Arguments>
+Text icu(Function function, Arguments... arguments) {
+  return lexicor_import::icu_text("ICU", [&](UChar* out, int32_t room, UErrorCode* error) {
+    return function(arguments..., out, room, error);
+  });
+}
+
+std::string utf8(const Text& text) {
+  std::string out(3 * text.size(), '\0');
+  UErrorCode error = U_ZERO_ERROR;
+  int32_t bytes = 0;
+  u_strToUTF8(out.data(), static_cast<int32_t>(out.size()), &bytes, text.data(),
+              static_cast<int32_t>(text.size()), &error);
+  return out.substr(0, static_cast<size_t>(bytes));
+}
+
+Text widen(const std::string& text) {
+  return Text(text.begin(), text.end());
+}
+
+/// The items of a locale: the territory's own values.
+class Items {
+ public:
+  explicit Items(const std::string& name) : locale_(LXGetLocale((name + ".UTF-8@BINARY").c_str(), 0, nullptr)) {
+    if (!locale_) throw std::runtime_error("no locale " + name);
+  }
+  LXLocale* locale() const { return locale_.get(); }
+  Text text(int32_t item) const {
+    LXUChar units[256];
+    const int32_t count = LXGetLocaleTextInfoU(locale_.get(), item, units, 256, LX_TERRITORY_VALUES);
+    if (count < 1) throw std::runtime_error("no text of item " + std::to_string(item));
+    return Text(units, units + count - 1);
+  }
+  Text texts(int32_t first, int32_t count) const {
+    Text all;
+    for (int32_t i = 0; i < count; ++i) all += text(first + i) + u'|';
+    return all;
+  }
+  int32_t number(int32_t item) const { return LXGetLocaleNumInfo(locale_.get(), item, LX_TERRITORY_VALUES); }
+
+  /// The digits of a whole number in the groups of a grouping text.
+  Text grouped(int64_t value, int32_t separator_item, int32_t grouping_item) const {
+    const Text separator = text(separator_item), grouping = text(grouping_item);
+    std::vector<int> sizes;
+    for (std::istringstream in(utf8(grouping)); in.good(); in.ignore(1, ';')) in >> sizes.emplace_back();
+    Text out = widen(std::to_string(value));
+    size_t at = out.size();
+    for (size_t i = 0; i < sizes.size();) {
+      const auto size = static_cast<size_t>(sizes[i] == 0 && i > 0 ? sizes[i - 1] : sizes[i]);
+      if (size == 0 || at <= size) break;
+      out.insert(at -= size, separator);
+      if (sizes[i] != 0) ++i;
+    }
+    return out;
+  }
+
+  /// A currency amount: c symbol, s sign, n number, _ the space that the locale may have.
+  Text amount(int64_t value, bool negative) const {
+    constexpr const char* kLayouts[][2] = {
+        {"(n_c)", "(c_n)"}, {"sn_c", "sc_n"}, {"n_cs", "c_ns"}, {"n_sc", "sc_n"}, {"n_cs", "cs_n"}};
+    const int32_t position = number(LX_ITEM_POSITIVE_POSITION + negative);
+    const int32_t precedes = number(negative ? LX_ITEM_NEGATIVE_PRECEDES : LX_ITEM_POSITIVE_PRECEDES);
+    const int32_t space = number(negative ? LX_ITEM_NEGATIVE_SPACE : LX_ITEM_POSITIVE_SPACE);
+    const auto digits = static_cast<size_t>(number(LX_ITEM_CURRENCY_DIGITS));
+    Text body = grouped(value, LX_ITEM_MONETARY_THOUSANDS, LX_ITEM_MONETARY_GROUPING);
+    if (digits != 0) body += text(LX_ITEM_MONETARY_DECIMAL) + Text(digits, u'0');
+    Text out;
+    for (const char* part = kLayouts[position][precedes]; *part != '\0'; ++part) {
+      out += *part == 'c'   ? text(LX_ITEM_CURRENCY)
+             : *part == 's' ? text(LX_ITEM_POSITIVE_SIGN + negative)
+             : *part == 'n' ? body
+             : *part == '_' ? Text(space == 1 ? 1 : 0, u' ')
+                            : widen({*part});
+    }
+    return out;
+  }
+
+  /// A format item, expanded.
+  Text expand(int32_t format_item, const tm& date) const {
+    const std::vector<int> values = {date.tm_mday,        date.tm_mon + 1, date.tm_year % 100,
+                                     date.tm_year + 1900, date.tm_hour,    (date.tm_hour + 11) % 12 + 1,
+                                     date.tm_min,         date.tm_sec};
+    const int32_t words[] = {LX_ITEM_SHORT_DAY + date.tm_wday, LX_ITEM_DAY + date.tm_wday,
+                             LX_ITEM_SHORT_MONTH + date.tm_mon, LX_ITEM_MONTH + date.tm_mon,
+                             LX_ITEM_MORNING + date.tm_hour / 12};
+    const std::string word_letters = "aAbBp", number_letters = "dmyYHIMS";
+    const Text format = text(format_item);
+    Text out;
+    for (size_t i = 0; i < format.size(); ++i) {
+      const bool directive = format[i] == '%', blank = directive && format.at(i + 1) == '#';
+      i += directive + blank;
+      const char letter = static_cast<char>(format.at(i));
+      if (!directive || letter == '%') {
+        out += format[i];
+      } else if (word_letters.find(letter) != std::string::npos) {
+        out += text(words[word_letters.find(letter)]);
+      } else {
+        const std::string digits = std::to_string(values.at(number_letters.find(letter)));
+        out += widen(std::string(!blank && digits.size() < 2 ? 1 : 0, '0') + digits);
+      }
+    }
+    return out;
+  }
+
+ private:
+  LocalePtr locale_;
+};
+
+/// The differences found, "object item" with both sides.
+class Differences {
+ public:
+  void compare(const std::string& object, const std::string& item, const Text& ours, const Text& theirs) {
+    ++compared_;
+    if (ours != theirs) found_[object + " " + item] = utf8(ours) + " / " + utf8(theirs);
+  }
+  void expect_listed() const {
+    EXPECT_GT(compared_, 1500U);
+    std::map<std::string, std::string> listed;
+    std::ifstream in(LEXICOR_DATA_DIR "/../tests/directory/locale_differences.txt");
+    for (std::string line, object, item, reason; std::getline(in, line);) {
+      std::istringstream words(line);
+      if (line.empty() || line[0] == '#') continue;
+      words >> object >> item >> std::ws;
+      EXPECT_TRUE(std::getline(words, reason)) << "no reason: " << line;
+      EXPECT_TRUE(listed.emplace(object + " " + item, reason).second) << "listed twice: " << line;
+    }
+    const char* file = getenv("LEXICOR_WRITE_DIFFERENCES");
+    std::ofstream out(file == nullptr ? "/dev/null" : file, std::ios::app);
+    for (const auto& [place, sides] : found_) {
+      out << place << " " << sides << '\n';
+      EXPECT_EQ(listed.erase(place), 1U) << "not listed: " << place << ": " << sides;
+    }
+    for (const auto& [place, reason] : listed)
+      ADD_FAILURE() << "listed and not found: " << place << ": " << reason;
+  }
+
+ private:
+  size_t compared_ = 0;
+  std::map<std::string, std::string> found_;
+};
+
+IcuPtr<UDateFormat, udat_close> open_date(UDateFormatStyle time, UDateFormatStyle date,
+                                          const std::string& locale) {
+  UErrorCode error = U_ZERO_ERROR;
+  return IcuPtr<UDateFormat, udat_close>(udat_open(time, date, locale.c_str(), u"UTC", -1, nullptr, 0, &error));
+}
+
+/// The letters of a language that have case, a blank behind each.
+Text letters_of(const char* locale) {
+  UErrorCode error = U_ZERO_ERROR;
+  const IcuPtr<ULocaleData, ulocdata_close> data(ulocdata_open(locale, &error));
+  const IcuPtr<USet, uset_close> set(
+      ulocdata_getExemplarSet(data.get(), nullptr, USET_ADD_CASE_MAPPINGS, ULOCDATA_ES_STANDARD, &error));
+  Text letters;
+  for (UChar32 value = 0x21; value <= 0xFFFF; ++value) {
+    if (!uset_contains(set.get(), value) || !u_hasBinaryProperty(value, UCHAR_CHANGES_WHEN_CASEMAPPED))
+      continue;
+    (letters += static_cast<char16_t>(value)) += u' ';
+  }
+  return letters;
+}
+
+Text mapped(const Items& items, uint32_t mode, const Text& text) {
+  const std::vector<LXUChar> source(text.begin(), text.end());
+  std::vector<LXUChar> out(2 * text.size());
+  const int32_t units = LXMapStringU(items.locale(), out.data(), static_cast<int32_t>(out.size()),
+                                     source.data(), static_cast<int32_t>(source.size()), mode);
+  return Text(out.begin(), out.begin() + std::max(units, 0));
+}
+
+void compare_language(const lexicor_import::Language& row, Differences* differences) {
+  const Items items(std::string(row.name) + "_" + row.territory);
+  const auto compare = [&](const char* item, const Text& ours, const Text& theirs) {
+    differences->compare(row.name, item, ours, theirs);
+  };
+  const auto format = open_date(UDAT_NONE, UDAT_FULL, lexicor_import::icu_locale(row.locale));
+  const auto symbols = [&](UDateFormatSymbolType type, int32_t first, int32_t count) {
+    Text all;
+    for (int32_t i = first; i < first + count; ++i) all += icu(udat_getSymbols, format.get(), type, i) + u'|';
+    return all;
+  };
+  UErrorCode error = U_ZERO_ERROR;
+  const IcuPtr<ULocaleDisplayNames, uldn_close> names(uldn_open(row.locale, ULDN_DIALECT_NAMES, &error));
+  compare("name", items.text(LX_ITEM_LANGUAGE_NAME), icu(uldn_localeDisplayName, names.get(), row.locale));
+  compare("days", items.texts(LX_ITEM_DAY, 7), symbols(UDAT_WEEKDAYS, 1, 7));
+  compare("short_days", items.texts(LX_ITEM_SHORT_DAY, 7), symbols(UDAT_SHORT_WEEKDAYS, 1, 7));
+  compare("months", items.texts(LX_ITEM_MONTH, 13), symbols(UDAT_MONTHS, 0, 12) + u'|');
+  compare("short_months", items.texts(LX_ITEM_SHORT_MONTH, 13), symbols(UDAT_SHORT_MONTHS, 0, 12) + u'|');
+  compare("markers", items.texts(LX_ITEM_MORNING, 2), symbols(UDAT_AM_PMS, 0, 2));
+
+  const Text text = letters_of(row.locale) + items.texts(LX_ITEM_DAY, 7) + items.texts(LX_ITEM_MONTH, 12);
+  const auto peer = [&](auto function) {
+    const auto units = static_cast<int32_t>(text.size());
+    return icu([&](UChar* out, int32_t room, UErrorCode* status) {
+      return function(out, room, text.data(), units, row.locale, status);
+    });
+  };
+  compare("upper", mapped(items, LX_MAP_UPPER, text), peer(u_strToUpper));
+  compare("lower", mapped(items, LX_MAP_LOWER, text), peer(u_strToLower));
+}
+
+void compare_territory(const lexicor_import::Territory& row, Differences* differences) {
+  const Items items(std::string(row.language) + "_" + row.name);
+  const std::string locale = lexicor_import::icu_locale(row.locale);
+  const auto compare = [&](const char* item, const Text& ours, const Text& theirs) {
+    differences->compare(row.name, item, ours, theirs);
+  };
+  UErrorCode error = U_ZERO_ERROR;
+  using NumberPtr = IcuPtr<UNumberFormat, unum_close>;
+  const NumberPtr numbers(unum_open(UNUM_DECIMAL, nullptr, 0, locale.c_str(), nullptr, &error));
+  const NumberPtr amounts(unum_open(UNUM_CURRENCY, nullptr, 0, locale.c_str(), nullptr, &error));
+  unum_setAttribute(numbers.get(), UNUM_MINIMUM_GROUPING_DIGITS, UNUM_MINIMUM_GROUPING_DIGITS_AUTO);
+  const Text currency = icu(ucurr_forLocale, locale.c_str());
+  const struct {
+    const char* name;
+    int32_t item;
+    Text theirs;
+  } texts[] = {
+      {"abbreviation", LX_ITEM_TERRITORY_ABBREVIATION, widen(uloc_getISO3Country(row.locale))},
+      {"name", LX_ITEM_TERRITORY_NAME, icu(uloc_getDisplayCountry, row.locale, row.locale)},
+      {"decimal", LX_ITEM_DECIMAL, icu(unum_getSymbol, numbers.get(), UNUM_DECIMAL_SEPARATOR_SYMBOL)},
+      {"thousands", LX_ITEM_THOUSANDS, icu(unum_getSymbol, numbers.get(), UNUM_GROUPING_SEPARATOR_SYMBOL)},
+      {"monetary_decimal", LX_ITEM_MONETARY_DECIMAL,
+       icu(unum_getSymbol, amounts.get(), UNUM_MONETARY_SEPARATOR_SYMBOL)},
+      {"monetary_thousands", LX_ITEM_MONETARY_THOUSANDS,
+       icu(unum_getSymbol, amounts.get(), UNUM_MONETARY_GROUPING_SEPARATOR_SYMBOL)},
+      {"negative", LX_ITEM_NEGATIVE_SIGN, icu(unum_getSymbol, amounts.get(), UNUM_MINUS_SIGN_SYMBOL)},
+      {"symbol", LX_ITEM_CURRENCY, icu(unum_getSymbol, amounts.get(), UNUM_CURRENCY_SYMBOL)},
+      {"international", LX_ITEM_INTERNATIONAL_CURRENCY, currency},
+  };
+  for (const auto& text : texts) compare(text.name, items.text(text.item), text.theirs);
+  compare("digits", widen(std::to_string(items.number(LX_ITEM_CURRENCY_DIGITS))),
+          widen(std::to_string(ucurr_getDefaultFractionDigits(currency.c_str(), &error))));
+
+  // Signs and separators are compared above; here it is what is made of them.
+  const auto written = [&](const NumberPtr& format, int64_t value) {
+    return ascii_signs(icu([&](UChar* out, int32_t room, UErrorCode* status) {
+      return unum_formatInt64(format.get(), value, out, room, nullptr, status);
+    }));
+  };
+  for (int64_t value : {1234LL, 1234567890123LL}) {
+    compare(value < 10000 ? "four_digits" : "number", items.grouped(value, LX_ITEM_THOUSANDS, LX_ITEM_GROUPING),
+            written(numbers, value));
+  }
+  compare("amount", items.amount(12345678, false), written(amounts, 12345678));
+  compare("negative_amount", items.amount(12345678, true), written(amounts, -12345678));
+  const auto compare_format = [&](const char* name, int32_t item, UDateFormatStyle time,
+                                  UDateFormatStyle date) {
+    const auto format = open_date(time, date, locale);
+    Text ours, theirs;
+    for (tm when : kDates) {
+      ours += items.expand(item, when) + u'|';
+      const UDate milliseconds = static_cast<UDate>(timegm(&when)) * 1000;
+      theirs += icu([&](UChar* out, int32_t room, UErrorCode* status) {
+                  return udat_format(format.get(), milliseconds, out, room, nullptr, status);
+                }) +
+                u'|';
+    }
+    compare(name, ours, theirs);
+  };
+  compare_format("time", LX_ITEM_TIME_FORMAT, UDAT_MEDIUM, UDAT_NONE);
+  compare_format("short_date", LX_ITEM_SHORT_DATE_FORMAT, UDAT_NONE, UDAT_SHORT);
+  compare_format("long_date", LX_ITEM_LONG_DATE_FORMAT, UDAT_NONE, UDAT_FULL);
+}
+
+TEST(LocalePeers, LanguagesAndTerritoriesAsInIcu) {
+  const Library library(LEXICOR_LOCALE_DIR);
+  Differences differences;
+  size_t compared = 0, shipped = 0;
+  for (const auto& row : lexicor_import::kLanguages) compare_language(row, &differences), ++compared;
+  for (const auto& row : lexicor_import::kTerritories) compare_territory(row, &differences), ++compared;
+  for (const auto& object : lexicor_data::read_source_control(LEXICOR_DATA_DIR).objects)
+    shipped += object.type <= lexicor_data::ObjectType::kTerritory;
+  EXPECT_EQ(compared, shipped);
+  differences.expect_listed();
+}
+
+}  // namespace
+}  // namespace lx::test

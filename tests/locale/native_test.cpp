@@ -1,0 +1,232 @@
+// The operating system's names of locales and its conventions, on a system runtime that the test makes.
+#include <algorithm>
+#include <climits>
+#include <cstring>
+
+#include "core/library_fixture.h"
+#include "support/system_locale.h"
+#include "support/tiny_codepages.h"
+
+namespace lx::test {
+namespace {
+
+using Strings = std::vector<std::string>;
+
+std::string mapped(const std::string& native, int32_t size = 132) {
+  std::vector<char> buffer(static_cast<size_t>(std::max(size, 8)), '#');
+  EXPECT_EQ(LXMapNativeLocale(native.c_str(), buffer.data(), size), buffer.data());
+  return buffer.data();
+}
+
+TEST(NativeNames, TableAndItsOrder) {
+  std::vector<std::pair<std::string, std::string>> rows;
+  const auto note = [](void* user, const char* native, const char* locale) {
+    static_cast<decltype(rows)*>(user)->emplace_back(native, locale);
+    return 1;
+  };
+  EXPECT_EQ(LXEnumNativeLocales(note, &rows), LX_OK);
+  ASSERT_EQ(rows.size(), 107u);
+  for (const auto& [native, locale] : rows) EXPECT_EQ(mapped(native), locale) << "each row is found";
+  const std::pair<size_t, const char*> places[] = {{0, "C"},
+                                                   {1, "ar_SA"},
+                                                   {11, "de_AT@euro"},
+                                                   {56, "iw_IL"},
+                                                   {57, "ja_JP.eucJP"},
+                                                   {60, "ko_KR.euckr"},
+                                                   {74, "POSIX"},
+                                                   {92, "sr_YU@cyril"},
+                                                   {95, "sv_FI@euro"},
+                                                   {105, "zh_TW.euctw"},
+                                                   {106, "zh_TW.utf8"}};
+  for (const auto& [place, native] : places) EXPECT_EQ(rows[place].first, native);
+  int calls = 0;
+  const auto stop = [](void* user, const char*, const char*) { return ++*static_cast<int*>(user), 0; };
+  LXEnumNativeLocales(stop, &calls);
+  EXPECT_EQ(calls, 1);
+}
+
+TEST(NativeNames, Mapping) {
+  const struct {
+    std::string native, locale;
+  } cases[] = {
+      {"C", "English_UnitedStates.US-ASCII@Binary"},
+      {"POSIX", "English_UnitedStates.US-ASCII@Binary"},
+      {"ja_JP.sjis", "Japanese_Japan.MS932@Binary"},
+      {"ja_JP", "Unknown"},
+      {"no_NO", "Norwegian_Norway.Latin1@Danish"},
+      {"sr_YU@cyril", "CyrillicSerbian_Yugoslavia.ISO-8859-5@Default"},
+      {"de_DE@euro", "German_Germany.UTF-8@Default"},
+      {"en_US.UTF-8", "Unknown"},
+      {"EN_us", "Unknown"},
+      {"", "Unknown"},
+      {std::string(70000, 'x'), "Unknown"},
+      {"LC_CTYPE=de_DE.utf8;LC_NUMERIC=fr_FR;LC_TIME=en_US;LC_COLLATE=C;", "English_France.UTF-8@Binary"},
+      {"LC_CTYPE=de_DE.utf8;LC_NUMERIC=fr_FR;LC_TIME=en_US.UTF-8;LC_COLLATE=C", "Unknown_France.UTF-8@Unknown"},
+      {";", "Unknown_Unknown.Unknown@Unknown"},
+  };
+  for (const auto& c : cases) EXPECT_EQ(mapped(c.native), c.locale) << c.native.substr(0, 80);
+  EXPECT_EQ(mapped("de_DE", 12), "German_Germ") << "cut to the buffer";
+  EXPECT_EQ(mapped("de_DE.UTF-8", 1), "Unknown") << "whatever the size";
+}
+
+class NativeTest : public LibraryTest {
+ protected:
+  void SetUp() override {
+    LibraryTest::SetUp();
+    // Latin1 and US-ASCII under the names that the table knows; German is English here.
+    TinyCodepage latin = tiny_single();
+    directory.write_locale({{367, "US-ASCII", ascii_codepage()}, {819, "Latin1", latin.file.sections}});
+    ASSERT_EQ(init(), LX_OK);
+    for (const char* name : {"LC_ALL", "LANG"}) unsetenv(name);
+    german = SystemLocale::nothing();
+    german.frac_digits = 3;
+    german.int_frac_digits = 4;
+    german.p_cs_precedes = german.n_sep_by_space = 1;
+    german.n_cs_precedes = german.p_sep_by_space = 0;
+    german.n_sign_posn = 2;
+    german.grouping = grouping;
+    german.mon_grouping = mon_grouping;
+    german.decimal_point = decimal;
+    german.thousands_sep = thousands;
+    german.mon_decimal_point = two_bytes;
+    german.mon_thousands_sep = apostrophe;
+    german.currency_symbol = euro;
+    german.negative_sign = minus;
+  }
+
+  std::string item(LXLocale* locale, int32_t number) {
+    char text[64];
+    EXPECT_GT(LXGetLocaleTextInfo(locale, number, text, sizeof(text), 0), 0) << number;
+    return text;
+  }
+  static Strings numbers(LXLocale* locale) {
+    Strings values;
+    for (int32_t number : {63, 69, 70, 73, 74, 75, 76, 77, 78})
+      values.push_back(std::to_string(LXGetLocaleNumInfo(locale, number, 0)));
+    return values;
+  }
+
+  char grouping[3] = "\3\3", mon_grouping[4] = {2, 3, CHAR_MAX, 9}, decimal[2] = ",", thousands[2] = ".";
+  char two_bytes[3] = "ab", apostrophe[2] = "'", euro[2] = "\xA4", minus[2] = "~";
+  lconv german;
+  SystemLocale system;
+};
+
+TEST_F(NativeTest, UserLocale) {
+  char buffer[132];
+  system.known["da_DK"] = SystemLocale::nothing();
+  system.current = "da_DK";
+  system.environment = "de_DE";
+  EXPECT_EQ(LXGetUserLocale(buffer, sizeof(buffer)), 2);
+  EXPECT_STREQ(buffer, "German_Germany.Latin1@Default");
+  EXPECT_EQ(system.set, (Strings{"", "da_DK"})) << "adopted, and put back";
+  EXPECT_EQ(system.current, "da_DK");
+
+  // The variables count only where the runtime adopts nothing; an empty one is none.
+  system.environment = "";
+  const auto user = [&] {
+    return LXGetUserLocale(buffer, sizeof(buffer)) == 2 ? std::string(buffer) : "failed";
+  };
+  EXPECT_EQ(user(), "English_UnitedStates.US-ASCII@Binary");
+  setenv("LANG", "fr_FR", 1);
+  EXPECT_EQ(user(), "French_France.Latin1@Default");
+  setenv("LC_ALL", "", 1);
+  EXPECT_EQ(user(), "French_France.Latin1@Default");
+  setenv("LC_ALL", "it_IT", 1);
+  EXPECT_EQ(user(), "Italian_Italy.Latin1@Default");
+  for (const char* name : {"LC_ALL", "LANG"}) unsetenv(name);
+
+  // The longest name that can be kept, and one more.
+  system.current = std::string(1023, 'x');
+  system.set.clear();
+  EXPECT_EQ(user(), "English_UnitedStates.US-ASCII@Binary");
+  EXPECT_EQ(system.set, (Strings{"", std::string(1023, 'x')}));
+  system.current = std::string(1024, 'x');
+  system.set.clear();
+  const Strings traced = messages(RAS1_LEVEL_ERRORS, [&] { EXPECT_EQ(user(), "failed"); });
+  EXPECT_EQ(traced, Strings{"Unable to save current locale to restore. len 1024 > 1024 '" +
+                            std::string(1024, 'x') + "'"});
+  EXPECT_EQ(LXSetLocale(nullptr, LX_USER_LOCALE), LX_E_NO_NATIVE);
+  EXPECT_EQ(system.set, Strings{}) << "the system's locale is left alone";
+
+  // With LX_LANG it is not even asked for; a value as long as the buffer is not terminated.
+  system.queries = 0;
+  setenv("LX_LANG", "English@Binary", 1);
+  memset(buffer, '#', sizeof(buffer));
+  EXPECT_EQ(LXGetUserLocale(buffer, 7), 1);
+  EXPECT_EQ(std::string(buffer, 8), "English#");
+  EXPECT_EQ(LXSetLocale(nullptr, LX_USER_LOCALE), LX_OK);
+  EXPECT_EQ(system.queries, 0u);
+  EXPECT_EQ(system.set, Strings{});
+}
+
+TEST_F(NativeTest, ConventionsOfTheSystem) {
+  system.known["de_DE"] = german;
+  LXLocale* locale = LXGetLocale("English.Latin1", 0, nullptr);
+  ASSERT_NE(locale, nullptr);
+  LXMapNativeInfo("de_DE", locale);
+  EXPECT_EQ(system.set, (Strings{"de_DE", "C"}));
+  EXPECT_EQ(numbers(locale), (Strings{"2", "3", "4", "1", "0", "0", "1", "3", "2"}));
+  EXPECT_EQ(item(locale, 62), "3;3;0");
+  EXPECT_EQ(item(locale, 68), "2;3;0");
+  const Strings separators{item(locale, 59), item(locale, 60), item(locale, 66), item(locale, 67)};
+  EXPECT_EQ(separators, (Strings{",", ".", ".", "'"})) << "one of two bytes is not copied";
+  EXPECT_EQ(item(locale, 64) + item(locale, 71) + item(locale, 72), "\xA4~");
+  LXUChar units[4];
+  EXPECT_EQ(LXGetLocaleTextInfoU(locale, 64, units, 4, 0), 2);
+  EXPECT_EQ(units[0], 0x20AC);
+  EXPECT_EQ(LXReleaseLocale(locale), 0);
+
+  // Another codepage: numbers and groupings only. A name that the system refuses: nothing.
+  locale = LXGetLocale("English.US-ASCII", 0, nullptr);
+  LXMapNativeInfo("de_DE", locale);
+  EXPECT_EQ(item(locale, 62) + item(locale, 59) + item(locale, 60) + item(locale, 64), "3;3;0.,$");
+  EXPECT_EQ(LXReleaseLocale(locale), 0);
+  locale = LXGetLocale("English.Latin1", 0, nullptr);
+  LXMapNativeInfo("xx_XX", locale);
+  EXPECT_EQ(item(locale, 62) + item(locale, 59), "3;0.");
+  EXPECT_EQ(LXReleaseLocale(locale), 0);
+  EXPECT_EQ(system.current, "C");
+}
+
+TEST_F(NativeTest, UserLocaleAndConvertedNamesHaveTheConventions) {
+  system.known["de_DE"] = german;
+  system.environment = "de_DE";
+  int32_t rc = -1;
+  EXPECT_EQ(LXGetLocale(nullptr, LX_USER_LOCALE, &rc), nullptr);
+  EXPECT_EQ(rc, LX_E_NO_LANGUAGE) << "no German here";
+  const auto user = [&] { return LXGetLocale(nullptr, LX_USER_LOCALE | LX_FALLBACK, &rc); };
+  const auto convert = [&] { return LXConvertNativeLocale("de_DE", LX_FALLBACK | 0x1, &rc); };
+  for (const std::function<LXLocale*()>& create : {std::function<LXLocale*()>(user), {convert}}) {
+    LXLocale* locale = create();
+    ASSERT_NE(locale, nullptr);
+    EXPECT_EQ(item(locale, 88), "English_UnitedStates.Latin1@Binary");
+    EXPECT_EQ(item(locale, 62) + item(locale, 59), "3;3;0,");
+    EXPECT_EQ(LXReleaseLocale(locale), 0);
+    EXPECT_EQ(system.current, "C");
+  }
+  EXPECT_EQ(LXConvertNativeLocale("de_DE", 0, &rc), nullptr);
+  EXPECT_EQ(rc, LX_E_NO_LANGUAGE);
+  system.set.clear();
+  EXPECT_EQ(LXConvertNativeLocale("C", LX_USER_LOCALE, &rc), nullptr);
+  EXPECT_EQ(rc, LX_E_INVALID);
+  EXPECT_EQ(system.set, Strings{});
+
+  // Whatever allocation fails, the system's locale is put back and nothing is left.
+  for (size_t n = 1;; ++n) {
+    const size_t before = hooks.live_blocks();
+    hooks.fail_at(n);
+    LXLocale* locale = user();
+    const bool failed = hooks.failed();
+    hooks.fail_at(0);
+    EXPECT_EQ(locale == nullptr, failed);
+    EXPECT_EQ(rc, failed ? LX_E_MEMORY : LX_OK);
+    EXPECT_EQ(system.current, "C");
+    EXPECT_EQ(LXReleaseLocale(locale), 0);
+    EXPECT_EQ(hooks.live_blocks(), before) << n;
+    if (!failed) break;
+  }
+}
+
+}  // namespace
+}  // namespace lx::test

@@ -1,0 +1,437 @@
+// The process interface. A process is initialised once, so every case runs in a process of its own, which ends
+// through its exit routines: those of the library, and of a leak checker, are part of what is tested.
+#include "nls1.h"
+
+#include <atomic>
+#include <clocale>
+#include <thread>
+
+#include "core/library_fixture.h"
+#include "core/lxobjtypes.h"
+
+extern "C" {
+
+// Links in front of LXInit (--wrap): a code to fail with, or 0 to go on.
+static int32_t init_failure;
+int32_t __real_LXInit(const char*, LXAllocHook, LXFreeHook, void*, uint32_t);
+int32_t __wrap_LXInit(const char* directory, LXAllocHook allocate, LXFreeHook release, void* context,
+                      uint32_t options) {
+  if (init_failure != 0) return init_failure;
+  return __real_LXInit(directory, allocate, release, context, options);
+}
+}
+
+namespace lx::test {
+namespace {
+
+constexpr int kThreads = 8;
+constexpr char kEnglish[] = "English_UnitedStates.US-ASCII@Binary";
+constexpr char kJapanese[] = "Japanese_Japan.JapanEUC@Binary";
+constexpr int32_t kJapaneseInJapan = NLS1_LANGUAGE_TERRITORY(2, 392);
+
+std::string name_of(LXLocale* locale) {
+  char name[160] = "none";
+  NLS1_GetLocaleTextInfo(locale, LX_ITEM_LOCALE_STRING, name, sizeof(name), 0);
+  return name;
+}
+std::string thread_name() {
+  LXLocale* locale = NLS1_PrivateFunction_GetThreadLocale();
+  return locale != nullptr ? name_of(locale) : "null";
+}
+
+/// What the services answer when there is no library: codes, and nothing that needs an object.
+void expect_refusals() {
+  int32_t rc = -1;
+  char name[40] = "#";
+  NLS1_PrivateFunction_GetProcessLocale();
+  EXPECT_EQ(NLS1_PrivateFunction_GetThreadLocale(), nullptr);
+  EXPECT_EQ(NLS1_GetLocale(1, 0, 0, &rc), nullptr);
+  EXPECT_EQ(rc, 1) << "a code of its own";
+  EXPECT_EQ(NLS1_ConvertNativeLocale("C", 0, &rc), nullptr);
+  EXPECT_EQ(rc, LX_E_NOT_INITIALIZED);
+  EXPECT_EQ(NLS1_SetLocale(1, 0, 0), LX_E_NOT_INITIALIZED);
+  EXPECT_EQ(NLS1_SetLocaleFromNative("C", NLS1_THREAD | NLS1_PROCESS), LX_E_NOT_INITIALIZED);
+  EXPECT_EQ(NLS1_SetNativeLocale(1, 0, LC_ALL, 0), LX_E_NOT_INITIALIZED);
+  EXPECT_EQ(NLS1_SetNativeFromLocale(nullptr, LC_ALL, 0), LX_E_NOT_INITIALIZED);
+  for (auto* get_id : {NLS1_GetLanguageId, NLS1_GetTerritoryId, NLS1_GetCodepageId, NLS1_GetSortId}) {
+    rc = -1;
+    EXPECT_EQ(get_id("English", &rc), 0);
+    EXPECT_EQ(rc, LX_E_NOT_INITIALIZED);
+  }
+  for (auto* get_name : {NLS1_GetLanguageName, NLS1_GetTerritoryName, NLS1_GetCodepageName, NLS1_GetSortName})
+    EXPECT_EQ(get_name(1, name, sizeof(name)), LX_E_NOT_INITIALIZED);
+  EXPECT_STREQ(name, "#");
+  EXPECT_EQ(NLS1_GetLocaleNumInfo(nullptr, LX_ITEM_DEFAULT_CODEPAGE, 0), -1);
+}
+
+class Nls1Test : public LibraryTest {
+ protected:
+  void SetUp() override {
+    LibraryTest::SetUp();
+    for (const char* variable : {"NLS1_LOCALEDIR", "LC_ALL", "LANG", "LX_TRACE"}) unsetenv(variable);
+  }
+
+  /// English and Japanese with what they need, and a sort that has no file.
+  void write_directory() {
+    directory.write_locale({{367, "US-ASCII", ascii_codepage()}, {954, "JapanEUC", ascii_codepage()}});
+    ByteString language = directory.read("la_00001.nls");
+    uint8_t* words = language.data() + format::kHeaderBytes;
+    put_le16(words + 2 * format::language::kDefaultTerritory, 392);
+    put_le16(words + 2 * format::language::kDefaultCodepage, 954);
+    directory.write("la_00002.nls", language);
+    directory.write("te_00392.nls", directory.read("te_00840.nls"));
+    directory.write("control.nls", control_file({{1, LX_LANGUAGE, "English"},
+                                                 {2, LX_LANGUAGE, "Japanese"},
+                                                 {392, LX_TERRITORY, "Japan"},
+                                                 {840, LX_TERRITORY, "UnitedStates"},
+                                                 {40001, LX_TERRITORY, "Far"},
+                                                 {367, LX_CODEPAGE, "US-ASCII"},
+                                                 {954, LX_CODEPAGE, "JapanEUC"},
+                                                 {5, LX_SORT, "Default"}}));
+    directory.write_text("alias.txt", "JapanEUC ujis\n");
+    setenv("NLS1_LOCALEDIR", directory.path().c_str(), 1);
+  }
+
+  /// Runs `body` in a process that ends as a program does.
+  static void in_process(const std::string& what, const std::function<void()>& body) {
+    SCOPED_TRACE(what);
+    EXPECT_EXIT(
+        {
+          body();
+          exit(HasFailure() ? 3 : 0);
+        },
+        ::testing::ExitedWithCode(0), "");
+  }
+};
+
+// Each makes its first call at the same moment, has a locale of its own, changes it, and ends.
+TEST_F(Nls1Test, EightThreads) {
+  write_directory();
+  setenv("LC_ALL", "C.UTF-8", 1);
+  in_process("threads", [] {
+    std::atomic<int> ready{0}, changed{0};
+    std::vector<std::thread> threads;
+    const auto meet = [](std::atomic<int>& arrived) {
+      for (++arrived; arrived < kThreads;) std::this_thread::yield();
+    };
+    for (int i = 0; i < kThreads; ++i) {
+      threads.emplace_back([&, i] {
+        const std::string name = i % 2 == 0 ? kJapanese : kEnglish;
+        meet(ready);
+        EXPECT_EQ(i % 3 == 0 ? NLS1_GetLanguageId("Japanese", nullptr) : 2, 2);
+        EXPECT_EQ(thread_name(), kEnglish);
+        EXPECT_EQ(NLS1_SetLocaleFromNative(i % 2 == 0 ? "ja_JP.eucJP" : "C", NLS1_THREAD), LX_OK);
+        LXLocale* mine = NLS1_PrivateFunction_GetThreadLocale();
+        EXPECT_EQ(NLS1_SetLocaleNumInfo(mine, LX_ITEM_DIGITS, 10 + i), 1);
+        meet(changed);
+        EXPECT_EQ(NLS1_PrivateFunction_GetThreadLocale(), mine);
+        EXPECT_EQ(name_of(mine), name);
+        EXPECT_EQ(NLS1_GetLocaleNumInfo(mine, LX_ITEM_DIGITS, 0), 10 + i);
+        LXLocale* own = NLS1_GetLocale(kJapaneseInJapan, 0, 0, nullptr);
+        EXPECT_EQ(name_of(own), kJapanese);
+        EXPECT_EQ(LXReleaseLocale(own), 0);
+      });
+    }
+    for (std::thread& thread : threads) thread.join();
+    EXPECT_STREQ(setlocale(LC_ALL, nullptr), "C") << "the system's locale is as it was";
+    EXPECT_EQ(name_of(nullptr), kEnglish);
+  });
+}
+
+TEST_F(Nls1Test, ThreadsReleaseTheirLocales) {
+  write_directory();
+  in_process("blocks", [this] {
+    // The program's own initialisation comes first, so the blocks are its hooks'.
+    ASSERT_EQ(init(), LX_OK);
+    EXPECT_EQ(thread_name(), kEnglish);
+    const size_t blocks = hooks.live_blocks();
+    std::thread([] { EXPECT_EQ(thread_name(), kEnglish); }).join();
+    std::thread([] { EXPECT_EQ(NLS1_SetLocaleFromNative("C", NLS1_THREAD), LX_OK); }).join();
+    EXPECT_EQ(hooks.live_blocks(), blocks);
+    EXPECT_EQ(LXTerm(), LX_OK);
+    EXPECT_EQ(thread_name(), kEnglish) << "the program's last use is not the process's";
+    std::thread([] {
+      EXPECT_EQ(thread_name(), kEnglish);
+      EXPECT_EQ(LXTerm(), LX_OK);
+      expect_refusals();
+    }).join();
+    EXPECT_EQ(hooks.wrong_frees(), 0u);
+    expect_refusals();
+    _exit(HasFailure() ? 3 : 0);  // what the last LXTerm left behind are handles that nobody may release
+  });
+}
+
+TEST_F(Nls1Test, WithoutALibrary) {
+  in_process("initialisation fails", [] {
+    atexit([] {
+      if (LXTerm() != LX_OK) _exit(4);
+    });
+    init_failure = LX_E_MEMORY;
+    expect_refusals();
+    init_failure = 0;
+    expect_refusals();  // it is not tried again
+    // The program's own initialisation, which the library's exit routines leave alone.
+    EXPECT_EQ(LXInit(nullptr, nullptr, nullptr, nullptr, 0), LX_W_DEFAULTS);
+    expect_refusals();
+  });
+  write_directory();
+  in_process("after the end of the process", [] {
+    // Registered before the library's, so it runs after them.
+    atexit([] {
+      expect_refusals();
+      if (HasFailure()) _exit(4);
+    });
+    EXPECT_EQ(thread_name(), kEnglish);
+    EXPECT_EQ(NLS1_SetLocale(kJapaneseInJapan, 0, 0), LX_OK);
+    EXPECT_EQ(NLS1_SetLocaleFromNative("ja_JP.eucJP", NLS1_THREAD), LX_OK);
+  });
+}
+
+TEST_F(Nls1Test, LocalesFromIdentifiers) {
+  write_directory();
+  struct Case {
+    int32_t language_territory, codepage, flags;
+    const char* name;
+    int32_t code;
+  };
+  const int32_t far = NLS1_LANGUAGE_TERRITORY(1, 40000);
+  const Case cases[] = {
+      {0, 0, 0, kEnglish, LX_OK},
+      {840 * 65536 + 1, 0, 0, kEnglish, LX_OK},
+      {2, 0, 0, kJapanese, LX_OK},
+      {392 * 65536, 0, 0, "English_Japan.US-ASCII@Binary", LX_OK},
+      {NLS1_LANGUAGE_TERRITORY(2, 840), 367, 0, "Japanese_UnitedStates.US-ASCII@Binary", LX_OK},
+      {392, 0, 0, "none", LX_E_NO_LANGUAGE},
+      {NLS1_LANGUAGE_TERRITORY(1, 367), 0, 0, "none", LX_E_NO_TERRITORY},
+      {1, 840, LX_FALLBACK, "none", LX_E_NO_CODEPAGE},
+      {1, 65536 + 367, 0, "none", LX_E_NO_CODEPAGE},
+      {1, 0, 0x8, "none", LX_E_INVALID},
+      // The signed quotient is one too high, the file of that territory is not there.
+      {far, 0, 0, "English_Far.US-ASCII@Binary", LX_OK},
+  };
+  in_process("creation", [&cases] {
+    for (const Case& c : cases) {
+      SCOPED_TRACE(std::to_string(c.language_territory) + " " + std::to_string(c.codepage));
+      int32_t rc = -1;
+      LXLocale* locale = NLS1_GetLocale(c.language_territory, c.codepage, c.flags, &rc);
+      EXPECT_EQ(rc, c.code);
+      EXPECT_EQ(locale != nullptr ? name_of(locale) : "none", c.name);
+      LXReleaseLocale(locale);
+      // The process's default: undefined flags are taken off.
+      ASSERT_EQ(NLS1_SetLocale(0, 0, 0), LX_OK);
+      const bool set = c.code == LX_OK || c.code == LX_E_INVALID;
+      EXPECT_EQ(NLS1_SetLocale(c.language_territory, c.codepage, c.flags | NLS1_PROCESS), set ? LX_OK : c.code);
+      EXPECT_EQ(name_of(nullptr), c.code == LX_OK ? c.name : kEnglish);
+      // The thread's locale: never, and the process's then neither.
+      for (int32_t flags : {NLS1_THREAD, NLS1_THREAD | NLS1_PROCESS}) {
+        ASSERT_EQ(NLS1_SetLocale(0, 0, 0), LX_OK);
+        EXPECT_EQ(NLS1_SetLocale(c.language_territory, c.codepage, c.flags | flags),
+                  set ? LX_E_INVALID : c.code);
+        EXPECT_EQ(name_of(nullptr), kEnglish);
+        EXPECT_EQ(thread_name(), kEnglish);
+      }
+    }
+  });
+}
+
+TEST_F(Nls1Test, NativeLocales) {
+  write_directory();
+  in_process("native", [] {
+    int32_t rc = -1;
+    LXLocale* locale = NLS1_ConvertNativeLocale("ja_JP.eucJP", 0, &rc);
+    EXPECT_EQ(rc, LX_OK);
+    EXPECT_EQ(name_of(locale), kJapanese);
+    EXPECT_EQ(NLS1_GetLocaleNumInfo(locale, LX_ITEM_DEFAULT_CODEPAGE, 0), 954) << "a number here";
+    EXPECT_EQ(NLS1_SetNativeFromLocale(locale, LC_NUMERIC, 0), LX_E_NO_NATIVE);
+    EXPECT_EQ(NLS1_SetNativeFromLocale(locale, LC_NUMERIC, LX_FALLBACK), LX_OK);
+    EXPECT_EQ(NLS1_SetNativeFromLocale(locale, 99, LX_FALLBACK), LX_E_NO_NATIVE) << "no such category";
+    LXReleaseLocale(locale);
+    for (const char* unknown : {"xx_XX", "", static_cast<const char*>(nullptr)}) {
+      EXPECT_EQ(NLS1_ConvertNativeLocale(unknown, 0, &rc), nullptr);
+      EXPECT_EQ(rc, LX_E_NO_LANGUAGE);
+      EXPECT_EQ(NLS1_SetLocaleFromNative(unknown, NLS1_THREAD), LX_E_NO_LANGUAGE);
+    }
+    if (setlocale(LC_ALL, "C.UTF-8") != nullptr) {
+      EXPECT_EQ(NLS1_SetNativeLocale(kJapaneseInJapan, 0, LC_CTYPE, 0), LX_E_NO_NATIVE);
+      EXPECT_EQ(NLS1_SetNativeLocale(NLS1_LANGUAGE_TERRITORY(1, 840), 367, LC_CTYPE, 0), LX_OK);
+      EXPECT_STREQ(setlocale(LC_CTYPE, nullptr), "C");
+      EXPECT_STREQ(setlocale(LC_TIME, nullptr), "C.UTF-8");
+    }
+    EXPECT_EQ(NLS1_SetNativeLocale(392, 0, LC_CTYPE, 0), LX_E_NO_LANGUAGE);
+
+    // The name for the process begins with the territory: no language is called Japan.
+    EXPECT_EQ(NLS1_SetLocaleFromNative("ja_JP.eucJP", NLS1_PROCESS), LX_E_NO_LANGUAGE);
+    EXPECT_EQ(name_of(nullptr), kEnglish);
+    EXPECT_EQ(thread_name(), kEnglish);
+    EXPECT_EQ(NLS1_SetLocaleFromNative("ja_JP.eucJP", NLS1_PROCESS | NLS1_THREAD | LX_FALLBACK), LX_OK);
+    EXPECT_EQ(name_of(nullptr), "English_UnitedStates.JapanEUC@Binary");
+    EXPECT_EQ(thread_name(), kJapanese);
+    EXPECT_EQ(NLS1_SetLocaleFromNative("C", 0), LX_OK) << "nothing is asked for, nothing changes";
+    EXPECT_EQ(thread_name(), kJapanese);
+  });
+}
+
+// Each form is forwarded once, with its own unit's entry and exit around it.
+TEST_F(Nls1Test, Items) {
+  write_directory();
+  in_process("items", [] {
+    LXLocale* locale = NLS1_GetLocale(1, 0, 0, nullptr);
+    constexpr int32_t kItem = LX_ITEM_CURRENCY;
+    char text[8];
+    LXWChar wide[] = {'D', 'M', 0}, wide_out[8];
+    LXUChar unicode[] = {'F', 't', 0}, unicode_out[8];
+    RecordingTrace::set_level(RAS1_LEVEL_EVENTS);
+    EXPECT_EQ(NLS1_SetLocaleTextInfoW(locale, kItem, wide, 2, 0), 1);
+    EXPECT_EQ(NLS1_GetLocaleTextInfoU(locale, kItem, unicode_out, 8, 0), 3);
+    EXPECT_EQ(unicode_out[1], 'M');
+    EXPECT_EQ(NLS1_SetLocaleTextInfoU(locale, kItem, unicode, -1, 0), 1);
+    EXPECT_EQ(NLS1_GetLocaleTextInfoW(locale, kItem, wide_out, 8, 0), 3);
+    EXPECT_EQ(wide_out[1], LXWChar{'t'});
+    EXPECT_EQ(NLS1_SetLocaleTextInfoEx(locale, kItem, "Lei", LX_SHIFT_SINGLE, 3, 0), 1);
+    EXPECT_EQ(NLS1_GetLocaleTextInfo(locale, kItem, text, 8, 0), 4);
+    EXPECT_STREQ(text, "Lei");
+    EXPECT_EQ(NLS1_SetLocaleTextInfo(locale, kItem, "", 0, 0), 1);
+    EXPECT_EQ(NLS1_GetLocaleTextInfoEx(locale, kItem, text, LX_SHIFT_SINGLE, 3, LX_TERRITORY_VALUES), 2);
+    EXPECT_STREQ(text, "$");
+    EXPECT_EQ(NLS1_SetLocaleNumInfo(locale, LX_ITEM_POSITIVE_SPACE, 2), 0);
+    EXPECT_EQ(NLS1_GetLocaleNumInfo(locale, LX_ITEM_DEFAULT_CODEPAGE, 0), 367);
+    RecordingTrace::set_level(0);
+    std::vector<intptr_t> exits;
+    for (const TraceRecord& record : RecordingTrace::take())
+      if (record.unit == "qrlnls1" && record.kind == TraceRecord::kExitValue) exits.push_back(record.value);
+    EXPECT_EQ(exits, (std::vector<intptr_t>{1, 3, 1, 3, 1, 4, 1, 2, 0, 367}));
+    LXReleaseLocale(locale);
+  });
+}
+
+TEST_F(Nls1Test, ObjectsByNameAndIdentifier) {
+  write_directory();
+  in_process("objects", [] {
+    struct IdCase {
+      int32_t (*get)(const char*, int32_t*);
+      const char* name;
+      int32_t id, code;
+    };
+    for (const IdCase& c : {IdCase{NLS1_GetLanguageId, "jAPANESE", 2, LX_OK},
+                            {NLS1_GetLanguageId, "Japan", 0, LX_E_NOT_FOUND},
+                            {NLS1_GetTerritoryId, "Far", 40001, LX_OK},
+                            {NLS1_GetCodepageId, "UJIS", 954, LX_OK},
+                            {NLS1_GetCodepageId, nullptr, 0, LX_E_NOT_FOUND},
+                            {NLS1_GetSortId, "default", 5, LX_OK},
+                            {NLS1_GetSortId, "Binary", 0, LX_OK}}) {
+      int32_t rc = -1;
+      EXPECT_EQ(c.get(c.name, &rc), c.id);
+      EXPECT_EQ(rc, c.code);
+      EXPECT_EQ(c.get(c.name, nullptr), c.id);
+    }
+    struct NameCase {
+      int32_t (*get)(int32_t, char*, int32_t);
+      int32_t id, size;
+      const char* name;
+      int32_t code;
+    };
+    for (const NameCase& c :
+         {NameCase{NLS1_GetLanguageName, 2, 9, "Japanese", LX_OK},
+          {NLS1_GetLanguageName, 2, 8, "#", LX_E_SIZE},
+          {NLS1_GetLanguageName, 2, 0, "#", LX_E_SIZE},
+          {NLS1_GetLanguageName, kJapaneseInJapan, 40, "Japanese", LX_OK},
+          {NLS1_GetTerritoryName, kJapaneseInJapan, 40, "Japan", LX_OK},
+          {NLS1_GetTerritoryName, 392, 40, "Japan", LX_OK},
+          {NLS1_GetTerritoryName, NLS1_LANGUAGE_TERRITORY(1, 40001), 40, "#", LX_E_NOT_FOUND},
+          {NLS1_GetCodepageName, 954, 40, "JapanEUC", LX_OK},
+          {NLS1_GetCodepageName, 65536 + 954, 40, "#", LX_E_NOT_FOUND},
+          {NLS1_GetSortName, 5, 40, "Default", LX_OK},
+          {NLS1_GetSortName, 0, 40, "", LX_OK},
+          {NLS1_GetSortName, 6, 40, "#", LX_E_NOT_FOUND}}) {
+      SCOPED_TRACE(c.id);
+      char name[40] = "#";
+      EXPECT_EQ(c.get(c.id, name, c.size), c.code);
+      EXPECT_STREQ(name, c.name);
+    }
+  });
+  // Without sorts the search by identifier looks at the entry beside them: another type is not found.
+  directory.write("control.nls", control_file({{1, LX_LANGUAGE, "English"}, {5, LX_CODEPAGE, "Five"}}));
+  in_process("another type", [] {
+    char name[40] = "#";
+    EXPECT_EQ(NLS1_GetSortName(5, name, sizeof(name)), LX_E_NOT_FOUND);
+    EXPECT_EQ(NLS1_GetLocale(NLS1_LANGUAGE_TERRITORY(1, 1), 0, 0, nullptr), nullptr);
+    EXPECT_EQ(name_of(nullptr), "none") << "English has no territory here";
+    EXPECT_EQ(thread_name(), "null");
+  });
+}
+
+// Whatever the environment holds, the first call ends with a usable library.
+TEST_F(Nls1Test, Environment) {
+  if (access(kDefaultControl, F_OK) == 0) GTEST_SKIP() << "the default directory exists";
+  std::vector<std::string> values = {"",
+                                     "/",
+                                     "%s%n%99999d",
+                                     "\xFF\x01\n;=;_.@",
+                                     "_._@.;LC_CTYPE=",
+                                     "../../..",
+                                     "German_Germany.UTF-8@Default"};
+  // Sizes: locale names are read into 132 bytes, paths into 256 with 13 for the control file's name.
+  for (size_t bytes : {10, 11, 131, 132, 133, 242, 243, 244, 255, 256, 257, 65536})
+    values.push_back(std::string(bytes, 'x'));
+  for (const char* variable : {"NLS1_LOCALEDIR", "LX_LOCALEDIR", "LX_LANG", "LC_ALL"}) {
+    for (const std::string& value : values) {
+      in_process(variable + ("=" + value).substr(0, 40) + " " + std::to_string(value.size()), [&] {
+        setenv(variable, value.c_str(), 1);
+        EXPECT_EQ(thread_name(), kEnglish);
+        EXPECT_EQ(name_of(nullptr), kEnglish);
+        EXPECT_EQ(NLS1_GetLanguageId("English", nullptr), 1);
+      });
+    }
+  }
+  write_directory();
+  in_process("the user's locale", [] {
+    setenv("LX_LANG", "Japanese", 1);
+    EXPECT_EQ(thread_name(), kJapanese);
+    EXPECT_EQ(name_of(nullptr), kJapanese);
+  });
+  in_process("the core's directory", [this] {
+    unsetenv("NLS1_LOCALEDIR");
+    setenv("LX_LOCALEDIR", directory.path().c_str(), 1);
+    EXPECT_EQ(NLS1_GetTerritoryId("Japan", nullptr), 392);
+  });
+}
+
+TEST_F(Nls1Test, Messages) {
+  const auto expect_message = [this](uint32_t level, const char* text, const std::function<void()>& action) {
+    in_process(text, [&] {
+      bool found = false;
+      for (const std::string& message : messages(level, action)) found |= message == text;
+      EXPECT_TRUE(found);
+    });
+    in_process(std::string("level of ") + text, [&] {
+      for (const std::string& message : messages(~level, action)) EXPECT_NE(message, text);
+    });
+  };
+  const auto initialise = [] { NLS1_PrivateFunction_GetProcessLocale(); };
+  expect_message(RAS1_LEVEL_PROCESS, "Unable to determine location of locale definitions\n", initialise);
+  expect_message(RAS1_LEVEL_PROCESS, "Unable to initialize Lexicor, rc = 11", [&] {
+    init_failure = LX_E_NOT_INITIALIZED;
+    initialise();
+  });
+  write_directory();
+  expect_message(RAS1_LEVEL_DETAIL, "Invalid Language 3", [] { NLS1_GetLocale(3, 0, 0, nullptr); });
+  expect_message(RAS1_LEVEL_DETAIL, "Invalid Territory 9",
+                 [] { NLS1_GetLocale(9 * 65536 + 1, 0, 0, nullptr); });
+  expect_message(RAS1_LEVEL_DETAIL, "Invalid Codepage -7", [] { NLS1_SetLocale(1, -7, 0); });
+  expect_message(RAS1_LEVEL_ERRORS, "LXConvertNativeLocale failed for xx_XX with rc 31",
+                 [] { NLS1_ConvertNativeLocale("xx_XX", 0, nullptr); });
+  expect_message(RAS1_LEVEL_ERRORS, "NLS1_ConvertLocale failed with rc = 32",
+                 [] { NLS1_SetNativeLocale(2, 0, LC_ALL, 0); });
+  expect_message(RAS1_LEVEL_ERRORS, "setlocale failed to setlocale to C",
+                 [] { NLS1_SetNativeFromLocale(nullptr, 99, 0); });
+  expect_message(RAS1_LEVEL_ERRORS, "Object name length (8) for Japanese exceeds output buffer length (8)", [] {
+    char name[8];
+    NLS1_GetLanguageName(2, name, sizeof(name));
+  });
+  directory.write("control.nls", control_file({{2, LX_LANGUAGE, "Japanese"}}));
+  expect_message(RAS1_LEVEL_PROCESS, "Unable to set global locale, rc = 31", initialise);
+  expect_message(RAS1_LEVEL_PROCESS, "Unable to set thread locale, rc = 31", [] { thread_name(); });
+}
+
+}  // namespace
+}  // namespace lx::test

@@ -1,0 +1,43 @@
+// The lists of the locale directory's languages and territories, and which locale of CLDR each comes from.
+#pragma once
+
+#include <cstdint>
+#include <string>
+
+namespace lexicor_import {
+
+struct Language {
+  const char* name;
+  uint16_t id;
+  const char* locale;
+  const char* territory;  ///< defaults, by object name
+  const char* codepage;
+  const char* sort;
+};
+
+struct Territory {
+  const char* name;
+  uint16_t id;
+  const char* language;  ///< the language that its name and formats are written for
+  const char* locale;
+  const char* overrides;  ///< "key=value", separated by "|"
+};
+
+inline constexpr Language kLanguages[] = {
+#include "languages.inc"
+};
+
+inline constexpr Territory kTerritories[] = {
+#include "territories.inc"
+};
+
+/// Whether languages have the sorts of the table as defaults: every one of them must then be in control.txt.
+/// Otherwise their default is binary order.
+inline constexpr bool kDefaultSorts = false;
+
+/// The locale as ICU takes it: Gregorian calendar and Latin digits, whatever its own are.
+inline std::string icu_locale(const std::string& locale) {
+  return locale + "@calendar=gregorian;numbers=latn";
+}
+
+}  // namespace lexicor_import

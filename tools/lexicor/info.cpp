@@ -1,0 +1,163 @@
+// lexicor info: the items of a locale, as a table or as JSON.
+#include <lx.h>
+
+#include <iostream>
+#include <memory>
+#include <sstream>
+
+#include "command.h"
+#include "locale.h"
+#include "output.h"
+#include "report.h"
+#include "session.h"
+
+namespace lexicor_cli {
+
+namespace {
+
+struct InfoOptions {
+  std::string name;  // empty: the user's locale
+  bool native = false;
+  bool json = false;
+};
+
+enum class Kind { kNumber, kText };
+
+/// Items one behind the other: the n-th of several has its number behind the name.
+struct ItemRange {
+  const char* name;
+  int32_t first;
+  int32_t count;
+  Kind kind;
+};
+
+constexpr ItemRange kItems[] = {
+    {"language_id", LX_ITEM_LANGUAGE_ID, 1, Kind::kNumber},
+    {"language", LX_ITEM_LANGUAGE, 1, Kind::kText},
+    {"language_abbreviation", LX_ITEM_LANGUAGE_ABBREVIATION, 1, Kind::kText},
+    {"language_name", LX_ITEM_LANGUAGE_NAME, 1, Kind::kText},
+    {"territory_id", LX_ITEM_TERRITORY_ID, 1, Kind::kNumber},
+    {"territory", LX_ITEM_TERRITORY, 1, Kind::kText},
+    {"territory_abbreviation", LX_ITEM_TERRITORY_ABBREVIATION, 1, Kind::kText},
+    {"territory_name", LX_ITEM_TERRITORY_NAME, 1, Kind::kText},
+    {"codepage_id", LX_ITEM_CODEPAGE_ID, 1, Kind::kNumber},
+    {"codepage", LX_ITEM_CODEPAGE, 1, Kind::kText},
+    {"sort_id", LX_ITEM_SORT_ID, 1, Kind::kNumber},
+    {"sort", LX_ITEM_SORT, 1, Kind::kText},
+    {"default_territory", LX_ITEM_DEFAULT_TERRITORY, 1, Kind::kText},
+    {"default_codepage", LX_ITEM_DEFAULT_CODEPAGE, 1, Kind::kText},
+    {"default_sort", LX_ITEM_DEFAULT_SORT, 1, Kind::kText},
+    {"day", LX_ITEM_DAY, 7, Kind::kText},
+    {"short_day", LX_ITEM_SHORT_DAY, 7, Kind::kText},
+    {"month", LX_ITEM_MONTH, 13, Kind::kText},
+    {"short_month", LX_ITEM_SHORT_MONTH, 13, Kind::kText},
+    {"morning", LX_ITEM_MORNING, 1, Kind::kText},
+    {"afternoon", LX_ITEM_AFTERNOON, 1, Kind::kText},
+    {"flag_58", LX_ITEM_FLAG_58, 1, Kind::kNumber},
+    {"decimal", LX_ITEM_DECIMAL, 1, Kind::kText},
+    {"thousands", LX_ITEM_THOUSANDS, 1, Kind::kText},
+    {"list", LX_ITEM_LIST, 1, Kind::kText},
+    {"grouping", LX_ITEM_GROUPING, 1, Kind::kText},
+    {"digits", LX_ITEM_DIGITS, 1, Kind::kNumber},
+    {"currency", LX_ITEM_CURRENCY, 1, Kind::kText},
+    {"international_currency", LX_ITEM_INTERNATIONAL_CURRENCY, 1, Kind::kText},
+    {"monetary_decimal", LX_ITEM_MONETARY_DECIMAL, 1, Kind::kText},
+    {"monetary_thousands", LX_ITEM_MONETARY_THOUSANDS, 1, Kind::kText},
+    {"monetary_grouping", LX_ITEM_MONETARY_GROUPING, 1, Kind::kText},
+    {"currency_digits", LX_ITEM_CURRENCY_DIGITS, 1, Kind::kNumber},
+    {"international_digits", LX_ITEM_INTERNATIONAL_DIGITS, 1, Kind::kNumber},
+    {"positive_sign", LX_ITEM_POSITIVE_SIGN, 1, Kind::kText},
+    {"negative_sign", LX_ITEM_NEGATIVE_SIGN, 1, Kind::kText},
+    {"positive_precedes", LX_ITEM_POSITIVE_PRECEDES, 1, Kind::kNumber},
+    {"positive_space", LX_ITEM_POSITIVE_SPACE, 1, Kind::kNumber},
+    {"negative_precedes", LX_ITEM_NEGATIVE_PRECEDES, 1, Kind::kNumber},
+    {"negative_space", LX_ITEM_NEGATIVE_SPACE, 1, Kind::kNumber},
+    {"positive_position", LX_ITEM_POSITIVE_POSITION, 1, Kind::kNumber},
+    {"negative_position", LX_ITEM_NEGATIVE_POSITION, 1, Kind::kNumber},
+    {"time_format", LX_ITEM_TIME_FORMAT, 1, Kind::kText},
+    {"short_date_format", LX_ITEM_SHORT_DATE_FORMAT, 1, Kind::kText},
+    {"long_date_format", LX_ITEM_LONG_DATE_FORMAT, 1, Kind::kText},
+    {"flag_82", LX_ITEM_FLAG_82, 1, Kind::kNumber},
+    {"flag_83", LX_ITEM_FLAG_83, 1, Kind::kNumber},
+    {"value_84", LX_ITEM_VALUE_84, 1, Kind::kNumber},
+    {"codepage_width", LX_ITEM_CODEPAGE_WIDTH, 1, Kind::kNumber},
+    {"codepage_ascii", LX_ITEM_CODEPAGE_ASCII, 1, Kind::kNumber},
+    {"codepage_shift", LX_ITEM_CODEPAGE_SHIFT, 1, Kind::kNumber},
+    {"locale_string", LX_ITEM_LOCALE_STRING, 1, Kind::kText},
+};
+
+constexpr size_t kNumberChars = 2;
+constexpr size_t kNameChars = 22;  // of the longest name
+
+Json value_of(LXLocale* locale, Kind kind, int32_t item) {
+  if (kind == Kind::kNumber) {
+    const std::optional<int32_t> number = number_item(locale, item);
+    return number ? Json(*number) : Json();
+  }
+  const std::optional<std::string> text = text_item(locale, item);
+  return text ? Json(*text) : Json();
+}
+
+/// A text in quotes, so that blanks and empty texts are seen.
+std::string readable(const Json& value) {
+  return value.is_null() ? "(not in the locale directory)"
+                         : value.dump(-1, ' ', false, Json::error_handler_t::replace);
+}
+
+std::string info_text(LXLocale* locale, bool json) {
+  std::ostringstream out;
+  Json rows = Json::array();
+  for (const ItemRange& range : kItems) {
+    for (int32_t i = 0; i < range.count; ++i) {
+      const int32_t item = range.first + i;
+      const std::string name = range.name + (range.count > 1 ? "_" + std::to_string(i + 1) : "");
+      const Json value = value_of(locale, range.kind, item);
+      if (json)
+        rows.push_back({{"item", item}, {"name", name}, {"value", value}});
+      else
+        out << padded(std::to_string(item), kNumberChars, Align::kRight) << "  " << padded(name, kNameChars)
+            << "  " << readable(value) << '\n';
+    }
+  }
+  return json ? json_text({{"items", rows}}) : out.str();
+}
+
+LocalePtr open_asked(const InfoOptions& options) {
+  if (options.native) return open_native_locale(options.name);
+  if (!options.name.empty()) return open_locale(options.name);
+  std::string missing;
+  LocalePtr locale = open_user_locale(&missing);
+  if (!missing.empty()) std::cerr << "lexicor: the user's locale: " << missing << "; defaults take its place\n";
+  return locale;
+}
+
+int info(const InfoOptions& options, const CommonOptions& common) {
+  const Session session(common);
+  const LocalePtr locale = open_asked(options);
+  Output output;
+  output.write(info_text(locale.get(), options.json));
+  return kDone;
+}
+
+}  // namespace
+
+Run declare_info(CLI::App& command, const CommonOptions& common) {
+  const auto options = std::make_shared<InfoOptions>();
+  CLI::Option* name =
+      command
+          .add_option("LOCALE", options->name, "LANGUAGE[_TERRITORY][.CODEPAGE][@SORT]; else the user's locale")
+          ->type_name("");
+  command
+      .add_flag("--native", options->native, "LOCALE is a name of the operating system, with its conventions")
+      ->needs(name);
+  command.add_flag("--json", options->json, "print JSON");
+  command.footer(
+      "Each line has the number, the name and the value of an item; texts stand in quotes.\n"
+      "\n"
+      "Examples:\n"
+      "  lexicor info German_Austria\n"
+      "  lexicor info --native de_AT.utf8 --json");
+  return [options, &common] { return info(*options, common); };
+}
+
+}  // namespace lexicor_cli

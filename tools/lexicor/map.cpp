@@ -1,0 +1,238 @@
+// lexicor map: maps a text to another case or width, or its digits to ASCII digits, as a stream.
+#include <lx.h>
+
+#include <algorithm>
+#include <map>
+#include <memory>
+
+#include "catalogue.h"
+#include "codepage.h"
+#include "command.h"
+#include "input.h"
+#include "locale.h"
+#include "output.h"
+#include "pieces.h"
+#include "session.h"
+
+namespace lexicor_cli {
+
+namespace {
+
+// A byte becomes at most two characters of four bytes, each with a shift byte before it.
+constexpr size_t kGrowth = 10;
+// Enough for several characters: among them a place is looked for where the text can be cut.
+constexpr size_t kTailBytes = 64;
+// Selectors of LXLangGetSpecial.
+constexpr int32_t kSpecialUpper = 44;
+constexpr int32_t kSpecialLower = 45;
+
+struct Mapping {
+  uint32_t mode;
+  int32_t special;  // selector of the language's mappings that it applies, some of them to two characters; or 0
+};
+
+const std::map<std::string, Mapping> kMappings = {{"upper", {LX_MAP_UPPER, kSpecialUpper}},
+                                                  {"lower", {LX_MAP_LOWER, kSpecialLower}},
+                                                  {"full", {LX_MAP_FULL_WIDTH, 0}},
+                                                  {"half", {LX_MAP_HALF_WIDTH, 0}},
+                                                  {"digits", {LX_MAP_DIGITS, 0}}};
+
+struct MapOptions {
+  std::string mapping;
+  std::string locale;  // empty: the user's
+  std::string codepage = "UTF-8";
+  std::string output = "-";
+  std::vector<std::string> files;
+};
+
+/// The object of a locale's language.
+const LXObject* language_object(const std::string& name) {
+  int32_t code = LX_OK;
+  return LXGetObjFromName(nullptr, LX_LANGUAGE, name.c_str(), static_cast<int32_t>(name.size()),
+                          LX_FIND_AND_LOAD, &code);
+}
+
+/// Maps a text that comes in pieces. Each call of the library begins in the single-byte state, so a piece that
+/// begins in the other one gets a shift byte in front, which is taken off again where the pieces meet.
+class Mapper {
+ public:
+  Mapper(const Codepage& codepage, const LXObject* language, Mapping mapping, Output& output)
+      : codepage_(codepage), language_(language), mapping_(mapping), output_(output) {}
+
+  void take(const char* data, size_t got) {
+    for (size_t done = 0, bytes; done < got; done += bytes) {
+      bytes = codepage_.call_bytes(data + done, got - done);
+      if (!text_.empty() && codepage_.is_shift(text_.back()) && codepage_.is_shift(data[done])) map_whole();
+      text_.append(data + done, bytes);
+      map_safe();
+    }
+  }
+
+  /// Ends the text: false when it ended inside a character, at boundary().
+  bool finish() {
+    map_whole();
+    if (waiting_) write_shift(LX_SHIFT_DOUBLE);
+    return text_.empty();
+  }
+
+  uint64_t boundary() const { return offset_; }
+
+ private:
+  /// A character near the end of text_: where it, or the shift byte before it, begins, and the state there.
+  struct Char {
+    size_t begin;
+    LXShiftState state;
+    LXUChar unicode;
+  };
+
+  /// The whole characters in the first bytes of text_.
+  size_t whole_bytes(size_t bytes, LXShiftState* state) const {
+    const char* const text = text_.data();
+    const char* const end =
+        LXMoveStringPointerEx(codepage_.locale(), text, state_, static_cast<int32_t>(bytes), state, 0);
+    return static_cast<size_t>(end - text);
+  }
+
+  /// The last whole characters of text_.
+  std::vector<Char> tail() const {
+    LXShiftState state;
+    size_t at = whole_bytes(text_.size() - std::min(text_.size(), kTailBytes), &state);
+    std::vector<Char> chars;
+    while (at < text_.size()) {
+      Char c{at, state, 0};
+      if (codepage_.is_shift(text_[at])) state = codepage_.state_after(text_[at++]);
+      if (at == text_.size()) break;
+      const char* const text = text_.data() + at;
+      const int32_t bytes = codepage_.char_bytes(text, state);
+      if (static_cast<size_t>(bytes) > text_.size() - at) break;
+      LXStringToUnicodeEx(&c.unicode, 1, codepage_.locale(), text, state, bytes, 0);
+      chars.push_back(c);
+      at += static_cast<size_t>(bytes);
+    }
+    return chars;
+  }
+
+  bool is_pair(const Char& first, const Char& second) const {
+    LXUChar result[2];
+    return LXLangGetSpecial(language_, first.unicode, second.unicode, &result[0], &result[1],
+                            mapping_.special) != 0;
+  }
+
+  void map_whole() {
+    LXShiftState state;
+    const size_t whole = whole_bytes(text_.size(), &state);
+    map(whole, state);
+  }
+
+  /// Maps as much of text_ as what follows cannot change.
+  void map_safe() {
+    if (mapping_.special == 0) return map_whole();
+    const std::vector<Char> chars = tail();
+    for (size_t i = chars.size(); i-- > 1;) {
+      if (is_pair(chars[i - 1], chars[i])) continue;
+      map(chars[i].begin, chars[i].state);
+      return;
+    }
+  }
+
+  /// Maps the first bytes of text_ and takes them off; `state` is the one behind them.
+  void map(size_t bytes, LXShiftState state) {
+    if (bytes == 0) return;
+    std::string input = text_.substr(0, bytes);
+    if (state_ == LX_SHIFT_DOUBLE && !codepage_.is_shift(input[0]))
+      input.insert(0, 1, codepage_.shift_byte(LX_SHIFT_DOUBLE));
+    mapped_.resize(input.size() * kGrowth);
+    const int32_t written =
+        LXMapStringEx(codepage_.locale(), mapped_.data(), static_cast<int32_t>(mapped_.size()), input.data(),
+                      static_cast<int32_t>(input.size()), mapping_.mode);
+    if (written < 0)
+      throw Failure(kDataError, "the mapping failed: " + describe_code(LXGetError(codepage_.locale())));
+    write(mapped_.data(), static_cast<size_t>(written));
+    text_.erase(0, bytes);
+    state_ = state;
+    offset_ += bytes;
+  }
+
+  /// Writes a mapped piece, which begins in the single-byte state, behind what is written. A Shift-Out at its
+  /// end waits for the next piece, which may begin with a Shift-In.
+  void write(const char* text, size_t bytes) {
+    if (bytes == 0) return;
+    LXShiftState end;
+    LXMoveStringPointerEx(codepage_.locale(), text, LX_SHIFT_SINGLE, static_cast<int32_t>(bytes), &end, 0);
+    if (codepage_.is_shift(*text)) {
+      if (codepage_.state_after(*text) == written_state_) {
+        ++text;
+        --bytes;
+      }
+    } else if (written_state_ == LX_SHIFT_DOUBLE) {
+      write_shift(LX_SHIFT_SINGLE);
+    }
+    waiting_ = bytes > 0 && end == LX_SHIFT_DOUBLE && codepage_.is_shift(text[bytes - 1]);
+    if (waiting_) {
+      --bytes;
+      end = LX_SHIFT_SINGLE;
+    }
+    output_.write(text, bytes);
+    written_state_ = end;
+  }
+
+  void write_shift(LXShiftState state) {
+    const char shift = codepage_.shift_byte(state);
+    output_.write(&shift, 1);
+  }
+
+  const Codepage& codepage_;
+  const LXObject* language_;
+  const Mapping mapping_;
+  Output& output_;
+  std::string text_;                              // not yet mapped
+  LXShiftState state_ = LX_SHIFT_SINGLE;          // at its beginning
+  uint64_t offset_ = 0;                           // of text_ in the input
+  bool waiting_ = false;                          // a Shift-Out
+  LXShiftState written_state_ = LX_SHIFT_SINGLE;  // at the end of the output
+  std::vector<char> mapped_;
+};
+
+int map(const MapOptions& options, const CommonOptions& common) {
+  const Session session(common);
+  const LocalePtr named = options.locale.empty() ? open_user_locale() : open_locale(options.locale);
+  const std::string language = text_item(named.get(), LX_ITEM_LANGUAGE).value_or("");
+  const std::string territory = text_item(named.get(), LX_ITEM_TERRITORY).value_or("");
+  const Codepage codepage(session, read_catalogue(), options.codepage, language + "_" + territory);
+  Input input(options.files);
+  Pieces pieces(input);
+  Output output(options.output);
+  Mapper mapper(codepage, language_object(language), kMappings.at(options.mapping), output);
+  pieces.each(!output.is_terminal(), [&](const char* data, size_t bytes) { mapper.take(data, bytes); });
+  if (!mapper.finish()) throw input.cut_at(mapper.boundary());
+  output.commit();
+  return kDone;
+}
+
+}  // namespace
+
+Run declare_map(CLI::App& command, const CommonOptions& common) {
+  const auto options = std::make_shared<MapOptions>();
+  command.add_option("MAPPING", options->mapping, "upper, lower, full, half (width) or digits")
+      ->required()
+      ->type_name("")
+      ->check(CLI::IsMember(kMappings));
+  command
+      .add_option("--locale", options->locale,
+                  "locale whose language's own mappings are applied; else the user's locale")
+      ->type_name("LOCALE");
+  command.add_option("--codepage", options->codepage, "codepage of the text; else UTF-8")->type_name("CP");
+  command.add_option("-o,--output", options->output, "output file, replaced when it is complete")
+      ->type_name("OUT");
+  command.add_option("FILE", options->files, "input files, taken as one text; - is standard input")
+      ->type_name("");
+  command.footer(
+      "A character without a mapping stays as it is. Width is what the codepage has in both forms.\n"
+      "\n"
+      "Examples:\n"
+      "  lexicor map upper --locale German letter.txt\n"
+      "  lexicor map half --codepage MS932 -o names.half names.txt");
+  return [options, &common] { return map(*options, common); };
+}
+
+}  // namespace lexicor_cli

@@ -1,0 +1,55 @@
+// lexicor native: what an operating-system name of a locale stands for, and whether its objects are there.
+#include <lx.h>
+
+#include <memory>
+#include <sstream>
+
+#include "command.h"
+#include "locale.h"
+#include "output.h"
+#include "report.h"
+#include "session.h"
+
+namespace lexicor_cli {
+
+namespace {
+
+constexpr size_t kTitleChars = 9;  // "territory"
+
+int native(const std::string& native_name, const CommonOptions& common) {
+  const Session session(common);
+  const std::string locale_name = map_native_name(native_name, kDataError);
+  std::ostringstream out;
+  out << padded("locale", kTitleChars) << "  " << locale_name << '\n';
+  const LocaleName name(locale_name);
+  size_t name_chars = 0;
+  for (const LocalePart& part : name.parts) name_chars = std::max(name_chars, part.name.size());
+  bool complete = true;
+  for (const LocalePart& part : name.parts) {
+    const int code = load_part(part);
+    complete &= code == LX_OK;
+    out << padded(part.title, kTitleChars) << "  " << padded(part.name, name_chars) << "  "
+        << (code == LX_OK ? "there" : "missing: " + describe_code(code)) << '\n';
+  }
+  Output output;
+  output.write(out.str());
+  return complete ? kDone : kDataError;
+}
+
+}  // namespace
+
+Run declare_native(CLI::App& command, const CommonOptions& common) {
+  const auto name = std::make_shared<std::string>();
+  command.add_option("NAME", *name, "the operating system's name of a locale, in its own letter case")
+      ->required()
+      ->type_name("");
+  command.footer(
+      "Exit code 1: the name is not known, or an object that it stands for is missing.\n"
+      "\n"
+      "Examples:\n"
+      "  lexicor native de_DE.utf8\n"
+      "  lexicor list locales");
+  return [name, &common] { return native(*name, common); };
+}
+
+}  // namespace lexicor_cli
