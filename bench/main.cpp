@@ -1,4 +1,4 @@
-// lexicor_bench: conversion beside ICU, iconv and memcpy.
+// lexicor_bench: conversion, case mapping, comparison and collation beside ICU, iconv, glibc and memcpy.
 //
 //   lexicor_bench [--locale=DIRECTORY] [--rows=PART_OF_NAME] [Google Benchmark's own options]
 //   lexicor_bench --ratios ...   prints the table of ratios
@@ -64,7 +64,9 @@ int run(const Options& options) {
   for (const bench::CodepageName& name : bench::codepage_names())
     if (auto codepage = bench::Codepage::open(name)) codepages.push_back(std::move(codepage));
   if (codepages.empty() || !codepages.back()->is_utf8()) return EXIT_FAILURE;
-  const std::vector<bench::Row> rows = bench::make_rows(codepages, options.rows);
+  std::vector<bench::Row> rows = bench::make_rows(codepages, options.rows);
+  bench::add_mapping_rows(&rows, options.rows);
+  bench::add_collation_rows(&rows, options.rows);
   size_t room = 0;
   for (const bench::Row& row : rows) room = std::max({room, row.output_bytes + 64, row.input->bytes.size()});
   std::vector<char> output(room);

@@ -28,33 +28,42 @@ class Minimums : public benchmark::BenchmarkReporter {
   std::map<std::string, double> ns_;
 };
 
-/// `icu` and `iconv`: how many times our time they take, so that below 1 they are faster. `copies`: how many
-/// times the time of memcpy we take.
+/// How many times our time a peer takes: below 1 it is faster.
+struct Ratio {
+  const char* peer;
+  double times;
+  bool behind() const { return peer != kMemcpy && times < 1; }
+};
+
 struct Line {
-  double ns_per_char, icu, iconv, copies;
-  bool behind() const { return icu < 1 || iconv < 1; }
+  double ns;  // of all pieces
+  std::vector<Ratio> ratios;
+  bool behind() const {
+    return std::any_of(ratios.begin(), ratios.end(), [](const Ratio& ratio) { return ratio.behind(); });
+  }
 };
 
 Line measure(const Row& row) {
   Minimums minimums;
   benchmark::RunSpecifiedBenchmarks(&minimums, "^" + row.name + ":");
-  const double ours = minimums.ns(row, kOurs);
-  return {ours / static_cast<double>(row.input->chars), minimums.ns(row, kIcu) / ours,
-          minimums.ns(row, kIconv) / ours, ours / minimums.ns(row, kMemcpy)};
+  Line line{minimums.ns(row, kOurs), {}};
+  for (const Peer& peer : row.peers)
+    if (peer.name != kOurs) line.ratios.push_back({peer.name, minimums.ns(row, peer.name) / line.ns});
+  return line;
 }
 
 }  // namespace
 
 void print_ratios(const std::vector<Row>& rows, std::FILE* out) {
-  std::fprintf(out, "%-34s %9s %9s %8s %8s %8s\n", "row", "ns/char", "ns/call", "ICU", "iconv", "memcpy");
+  std::fprintf(out, "%-34s %9s %9s  times as long\n", "row", "ns/char", "ns/call");
   int behind = 0;
   for (const Row& row : rows) {
     const Line line = measure(row);
     behind += line.behind();
-    const double calls = static_cast<double>(row.input->ends.size());
-    const double ns_per_call = line.ns_per_char * static_cast<double>(row.input->chars) / calls;
-    std::fprintf(out, "%-34s %9.3f %9.0f %8.2f %8.2f %8.2f%s\n", row.name.c_str(), line.ns_per_char,
-                 ns_per_call, line.icu, line.iconv, line.copies, line.behind() ? "  behind" : "");
+    std::fprintf(out, "%-34s %9.3f %9.0f", row.name.c_str(), line.ns / static_cast<double>(row.input->chars),
+                 line.ns / static_cast<double>(row.input->ends.size()));
+    for (const Ratio& ratio : line.ratios) std::fprintf(out, "  %s %.2f", ratio.peer, ratio.times);
+    std::fprintf(out, "%s\n", line.behind() ? "  behind" : "");
     std::fflush(out);
   }
   std::fprintf(out, "%zu rows, %d behind\n", rows.size(), behind);

@@ -1,4 +1,4 @@
-// The rows of the table: one conversion of one text, with each library that can do it.
+// The rows of the table: one piece of work on one text, with each library that can do it.
 #pragma once
 
 #include <functional>
@@ -19,12 +19,13 @@ struct Pieces {
 
 struct Peer {
   const char* name;                  // kOurs, kIcu, kIconv, kMemcpy
-  std::function<size_t(char*)> run;  // converts all pieces into a buffer: the bytes written
+  std::function<size_t(char*)> run;  // does the work on all pieces; into a buffer, where it gives bytes
 };
 inline constexpr const char* kOurs = "lexicor";
 inline constexpr const char* kIcu = "icu";
 inline constexpr const char* kIconv = "iconv";
 inline constexpr const char* kMemcpy = "memcpy";
+inline constexpr const char* kGlibc = "glibc";
 
 struct Row {
   std::string name;  // codepage/text/direction/size
@@ -33,8 +34,11 @@ struct Row {
   size_t output_bytes;
 };
 
-/// All rows whose name contains `filter`. Ends the program when the libraries do not convert a text to the same
-/// bytes.
+/// The rows of each family whose name contains `filter`. They end the program when the libraries do not give
+/// the same results.
 std::vector<Row> make_rows(const std::vector<std::unique_ptr<Codepage>>& codepages, const std::string& filter);
+
+void add_mapping_rows(std::vector<Row>* rows, const std::string& filter);
+void add_collation_rows(std::vector<Row>* rows, const std::string& filter);
 
 }  // namespace bench

@@ -42,6 +42,9 @@ struct Codepage {
   // Bytes below this are the Unicode values of the same number, both ways, wherever they begin a character:
   // 0x100 for ISO 8859-1, 0x80 where ASCII is, else 0.
   uint16_t same_below;
+  // By first byte: the length of the characters of several bytes that begin with it, if none of them has
+  // another case; else 0.
+  uint8_t caseless[256];
 
   uint8_t length(uint8_t first_byte) const { return payload[format::codepage::kLengths + first_byte]; }
   bool is_shift(uint8_t byte) const { return byte == shift_out || byte == shift_in; }

@@ -30,8 +30,9 @@ Copied whole_bytes(const Codepage& cp, Form form, const uint8_t* text, LXShiftSt
   const size_t given = length < 0 ? units_with_null(text) : static_cast<size_t>(length);
   const size_t wanted = static_cast<size_t>(size);
   if (!characters) return whole_chars(cp, form, text, state, least(given, wanted), given);
-  const size_t chars =
-      least(length < 0 ? static_cast<size_t>(chars_in_bytes(cp, text, state, given)) : given, wanted);
+  const size_t there = length < 0 ? static_cast<size_t>(chars_in_bytes(cp, text, state, given)) : given;
+  if (length < 0 && there <= wanted) return {given, there};  // nothing behind the null is looked at
+  const size_t chars = least(there, wanted);
   return {bytes_of_chars(cp, text, state, static_cast<int32_t>(chars)), chars};
 }
 

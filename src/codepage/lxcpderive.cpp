@@ -145,6 +145,46 @@ bool has_two_level_rows(const Codepage& cp, size_t nodes) {
   return true;
 }
 
+/// The type trie of a multibyte codepage, searched for characters that have another case.
+class TypeTrie {
+ public:
+  explicit TypeTrie(const uint8_t* payload)
+      : nodes_(payload + lx::le16(payload + fmt::kTypeTrie)),
+        records_(payload + lx::le16(payload + fmt::kTypeRecords)) {}
+
+  bool has_case(uint8_t first_byte) const {
+    return nodes_[0] != 0 || has_case_under(lx::le16(nodes_ + 2) + (nodes_[1] & first_byte));
+  }
+
+ private:
+  // No deeper than a character has bytes.
+  bool has_case_under(size_t index) const {
+    constexpr uint32_t kCase = LX_C1_UPPER | LX_C1_LOWER;
+    const uint8_t* node = nodes_ + fmt::kTypeNodeBytes * index;
+    const unsigned mask = node[1];
+    for (unsigned byte = 0; byte <= mask; ++byte) {
+      if ((byte & ~mask) != 0) continue;
+      const size_t next = lx::le16(node + 2) + byte;
+      if (node[0] != 0 ? (lx::le32(records_ + fmt::kTypeRecordBytes * next) & kCase) != 0
+                       : has_case_under(next))
+        return true;
+    }
+    return false;
+  }
+
+  const uint8_t* nodes_;
+  const uint8_t* records_;
+};
+
+void fill_caseless(Codepage* cp) {
+  if (cp->single_byte) return;
+  const TypeTrie types(cp->payload);
+  for (unsigned b = 0; b < kRow; ++b) {
+    const uint8_t length = cp->length(static_cast<uint8_t>(b));
+    if (length > 1 && !types.has_case(static_cast<uint8_t>(b))) cp->caseless[b] = length;
+  }
+}
+
 }  // namespace
 
 namespace lx {
@@ -186,6 +226,7 @@ void* derive_codepage(uint16_t id, const Sections& sections) {
   cp->two_level_rows = has_two_level_rows(*cp, nodes.count());
   cp->same_below = same_below(*cp);
   cp->plain_utf8 = is_plain_utf8(*cp);
+  fill_caseless(cp);
   return block;
 }
 

@@ -151,8 +151,9 @@ struct CodepageMapper {
         *mapped = table[*c.p];
         return true;
       }
+      if (cp.caseless[*c.p] != 0) return false;
       const uint8_t* record = lx::type_record(cp, c.p);
-      if (record == nullptr || (lx::le32(record) & mask) == 0) return false;
+      if ((lx::le32(record) & mask) == 0) return false;
       *mapped = lx::pack(c.p, c.length) + lx::le32(record + 4);
       return true;
     } else if constexpr (kKind == Kind::kFullWidth) {
@@ -236,6 +237,22 @@ void map_run(Text& text, const Runs& runs, const SpecialFilter& filter) {
   text.out += i;
 }
 
+/// Copies the characters of several bytes that have no case, as far as they are whole and fit.
+void copy_caseless(LeadByteText& text) {
+  const size_t n = text.most();
+  size_t i = 0;
+  while (i < n) {
+    const size_t length = text.cp.caseless[text.p[i]];
+    if (length == 0 || length > n - i) break;
+    i += length;
+  }
+  if (i == 0) return;
+  memmove(text.out, text.p, i);
+  text.p += i;
+  text.out += i;
+}
+void copy_caseless(UnicodeText&) {}
+
 /// Looks for the character that was just taken, then for it and the next one, which is taken too when the pair
 /// is there: the number of results.
 template <class Text, class Mapper>
@@ -259,8 +276,10 @@ template <class Text, class Mapper>
 void map_all(Text& text, const Mapper& mapper, const SpecialFilter& filter, const Runs& runs) {
   LXShiftState reached = LX_SHIFT_SINGLE;
   for (;;) {
-    if constexpr (Text::kRuns && Mapper::kRuns)
+    if constexpr (Text::kRuns && Mapper::kRuns) {
       if (text.p != text.end && *text.p < runs.below) map_run(text, runs, filter);
+      if (!filter.any()) copy_caseless(text);
+    }
     typename Text::Char c;
     if (!text.take(&c)) break;
     bool written = true;

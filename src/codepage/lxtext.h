@@ -320,6 +320,17 @@ struct UnicodeWriter {
 /// where the codepage has them, as the Ex forms do.
 enum class Form { kPlain, kEx };
 
+/// A reader like another one, over another text.
+template <class Reader>
+Reader read_like(const Reader& first, const typename Reader::Unit* text, size_t units,
+                 [[maybe_unused]] LXShiftState state) {
+  Reader second(first);
+  second.p = text;
+  second.end = text + units;
+  if constexpr (std::is_same_v<Reader, ShiftReader>) second.state = state;
+  return second;
+}
+
 /// Calls `body` with the reader of a byte text.
 template <class Body>
 auto read_bytes(const Codepage& cp, Form form, LXShiftState state, const uint8_t* p, size_t bytes,

@@ -172,16 +172,6 @@ int32_t collate(const LXLocale& locale, const Reader& text1, const Reader& text2
   return compare_levels(sort, text1, text2, inserted, code);
 }
 
-/// The reader of the second text: like that of the first, over other units.
-template <class Reader>
-Reader read_like(const Reader& first, const typename Reader::Unit* units, size_t count, LXShiftState state) {
-  Reader second = first;
-  second.p = units;
-  second.end = units + count;
-  if constexpr (std::is_same_v<Reader, lx::ShiftReader>) second.state = state;
-  return second;
-}
-
 /// A byte text that a collation function was given.
 struct ByteText {
   const char* text;
@@ -235,7 +225,7 @@ int32_t collate_bytes(LXLocale* given, ByteText text1, int32_t length1, ByteText
   int32_t code = LX_OK;
   const int32_t difference =
       lx::read_bytes(cp, form, text1.state, bytes_of(text1.text), text1.bytes, [&](const auto& in) {
-        return collate(*locale, in, read_like(in, bytes_of(text2.text), text2.bytes, text2.state), options,
+        return collate(*locale, in, lx::read_like(in, bytes_of(text2.text), text2.bytes, text2.state), options,
                        &code);
       });
   return call.fail(code, difference);

@@ -235,8 +235,8 @@ void pass_blocks(ShiftReader*, ShiftReader*, const Same&, const uint8_t**) {}
 int32_t case_difference(const MultiByteReader&, const MultiByteReader&, uint8_t x, uint8_t y) {
   return x - y;
 }
-/// Callers rely on the order that this gives: bytes count as signed, and the state of the first text decides
-/// for both whether a shift byte ends the double-byte characters.
+/// Callers rely on the order that this gives: bytes count as signed, and a text whose double-byte characters
+/// end first is less. Both texts are in the same state here.
 int32_t case_difference(const ShiftReader& a, const ShiftReader& b, uint8_t x, uint8_t y) {
   if (a.state == LX_SHIFT_DOUBLE && a.cp.is_shift(*a.p)) return -1;
   if (a.state == LX_SHIFT_DOUBLE && b.cp.is_shift(*b.p)) return 1;

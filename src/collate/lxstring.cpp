@@ -20,16 +20,6 @@ using lx::Text;
 
 RAS1_Unit unit = RAS1_UNIT("lxstring");
 
-/// The reader of a second text of the same kind.
-template <class Reader>
-Reader read_like(const Reader& first, const Text<typename Reader::Unit>& text, size_t units) {
-  Reader second(first);
-  second.p = text.p;
-  second.end = text.p + units;
-  if constexpr (lx::kShifts<Reader>) second.state = text.state;
-  return second;
-}
-
 /// The frame of a function that looks into one text for what another one holds: `body` is given the call and
 /// both readers.
 template <class Result, class Unit, class Body>
@@ -42,8 +32,9 @@ Result search(LXLocale* given, Form form, const Text<Unit>& text, const Text<Uni
   const bool characters = (flags & LX_CHARACTERS) != 0;
   const size_t units = lx::units_of(cp, text, characters);
   const size_t other_units = lx::units_of(cp, other, characters);
-  return lx::read(cp, form, text, units,
-                  [&](const auto& in) { return body(call, in, read_like(in, other, other_units)); });
+  return lx::read(cp, form, text, units, [&](const auto& in) {
+    return body(call, in, lx::read_like(in, other.p, other_units, other.state));
+  });
 }
 
 template <class Unit>

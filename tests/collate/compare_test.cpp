@@ -39,6 +39,7 @@ TinyCodepage with_widths(TinyCodepage cp) {
   lx::put_le32(payload.data() + payload.size() - 4, '!');
   return cp;
 }
+
 int sign(int32_t value) {
   return (value > 0) - (value < 0);
 }
@@ -46,35 +47,27 @@ std::string encoded(const TinyCodepage& cp, const Units& text, size_t from, size
   return cp.encode({text.begin() + static_cast<long>(from), text.begin() + static_cast<long>(to)});
 }
 
-/// While one lives, the language maps sharp s to SS.
-class WithSpecial {
- public:
-  explicit WithSpecial(LXLocale* in) : in_(in), english_(in->language), german_(*english_) {
-    namespace words = lx::format::language;
-    const size_t bytes = 578;  // of the payload before the special mappings
-    const uint8_t entry[] = {0xDF, 0, 0, 0, 'S', 0, 'S', 0};
-    payload_.resize(bytes + sizeof(entry));
-    std::copy_n(english_->section[0], bytes, payload_.data());
-    std::copy_n(entry, sizeof(entry), payload_.data() + bytes);
-    lx::put_le16(payload_.data() + 2 * words::kUpperSpecials, 1);
-    lx::put_le16(payload_.data() + 2 * words::kUpperSpecialTable, bytes);
-    german_.section[0] = payload_.data();
-    in->language = &german_;
-  }
-  ~WithSpecial() { in_->language = english_; }
-
- private:
-  LXLocale* in_;
-  LXObject* english_;
-  LXObject german_;
-  ByteString payload_;
-};
-
 class Compare : public testing::Test {
  protected:
   void TearDown() override {
     RecordingTrace::set_level(0);
+    if (english_ != nullptr)
+      for (const TinyCodepage* cp : {&single_, &four_, &shift_}) library_.locale(*cp)->language = english_;
     EXPECT_TRUE(library_.close());
+  }
+
+  /// From here on the languages map sharp s to SS.
+  void use_special() {
+    namespace words = lx::format::language;
+    english_ = library_.locale(single_)->language;
+    german_ = *english_;
+    payload_.assign(english_->section[0], english_->section[0] + 578);
+    for (const char byte : {'\xDF', '\0', '\0', '\0', 'S', '\0', 'S', '\0'})
+      payload_.push_back(static_cast<uint8_t>(byte));
+    lx::put_le16(payload_.data() + 2 * words::kUpperSpecials, 1);
+    lx::put_le16(payload_.data() + 2 * words::kUpperSpecialTable, 578);
+    german_.section[0] = payload_.data();
+    for (const TinyCodepage* cp : {&single_, &four_, &shift_}) library_.locale(*cp)->language = &german_;
   }
 
   /// A locale whose characters of several bytes have small letters.
@@ -90,7 +83,7 @@ class Compare : public testing::Test {
   }
   /// A text over few characters, so that two are often equal up to case and width.
   uint16_t random_char(const TinyCodepage& cp) {
-    constexpr uint16_t kOften[] = {'a', 'A', 'b', ' ', 0xFF21, 0xE0, 0xC0, 0x3041, 0xFF71, 0x30A2};
+    constexpr uint16_t kOften[] = {'a', 'A', 'z', 'Z', '@', '`', 0xFF21, 0xE0, 0xC0, 0x3041, 0xFF71, 0x30A2};
     const uint16_t u = kOften[random_() % std::size(kOften)];
     return cp.find(u) != nullptr ? u : random_() % 2 == 0 ? 'a' : 'A';
   }
@@ -118,6 +111,9 @@ class Compare : public testing::Test {
                      utf8_ = with_widths(lx::test::tiny_utf8());
   lx::test::TinyLibrary library_{{single_, sjis_, four_, shift_, utf8_}};
   std::mt19937 random_{1};
+  LXObject* english_ = nullptr;
+  LXObject german_{};
+  ByteString payload_;
 };
 
 TEST_F(Compare, AllFormsFollowTheModel) {
@@ -163,13 +159,16 @@ TEST_F(Compare, AllFormsFollowTheModel) {
                 -expected);
       std::vector<LXWChar> p, q;
       Units f, g;
-      for (uint16_t u : a) p.push_back(cp.find(u)->code);
-      for (uint16_t u : b) q.push_back(cp.find(u)->code);
-      const auto mapped = [&](uint16_t u) {
-        return options == kWidth ? lx::unicode_full_to_half(u) : options == kCase ? lx::unicode_upper(u) : u;
+      const auto map = [&](const Units& text, std::vector<LXWChar>* codes, Units* mapped) {
+        for (uint16_t u : text) {
+          codes->push_back(cp.find(u)->code);
+          mapped->push_back(options == kWidth  ? lx::unicode_full_to_half(u)
+                            : options == kCase ? lx::unicode_upper(u)
+                                               : u);
+        }
       };
-      std::transform(a.begin(), a.end(), std::back_inserter(f), mapped);
-      std::transform(b.begin(), b.end(), std::back_inserter(g), mapped);
+      map(a, &p, &f);
+      map(b, &q, &g);
       const int32_t codes = static_cast<int32_t>(a.size());
       q.push_back(0), b.push_back(0);
       EXPECT_EQ(sign(LXStrcmpU(in, a.data(), codes, b.data(), -1, options)), f < g ? -1 : f > g);
@@ -191,22 +190,16 @@ struct Row {
 };
 
 TEST_F(Compare, ExactResults) {
-  const TinyCodepage *single = &single_, *sjis = &sjis_, *utf8 = &utf8_, *shift = &shift_;
+  const TinyCodepage *single = &single_, *sjis = &sjis_, *shift = &shift_;
   const Row rows[] = {
       {single, "", -1, "", 0, kCase, 0},
-      {single, "", 0, "a", -1, 0, -1},
       {single, "abc", -1, "abcd", 4, kWidth, -1},
       {single, "ab  ", 4, "ab", 2, kBlanks, 0},
       {single, "ab  ", 4, "AB", 2, kBlanks | LX_CHARACTERS | kCase, 0},
-      {single, "\xE0", 1, "a", 1, 0, 0x7F},
       {single, "a", 1, "A", 1, 0x80000001, 0},
       {single, "a", 1, "A", 1, 1, 0},
-      {single, "a", 1, "A", 1, kWidth, 0x20},
       {single, "_", 1, "a", 1, kCase, '_' - 'a'},  // small letters
-      {sjis, "\x82\x60", 2, "A", 1, kWidth, 0},
       {sjis, "\x82\x60", 2, "a", 1, kWidth, 'A' - 'a'},
-      {sjis, "\x82\x60", 2, "A", 1, kCase, 1},
-      {sjis, "a\x82", 2, "a", 1, 0, 0},
       {sjis, "a\x81\x40 ", 4, "a", 1, kWidth | kBlanks, 0},
       {sjis, "\x82\x60z", 1, "\x82\x60z", 2, LX_CHARACTERS, -1},
       // Kept: what truncation does; cut characters, and forms longer than what is left, end the comparison.
@@ -214,17 +207,15 @@ TEST_F(Compare, ExactResults) {
       {single, "ab\0c", 4, "ab", 2, kBlanks, 0},
       {sjis, "a\x82", -1, "a\x83", -1, kCase, 0},
       {sjis, "!", 1, "\x88\x9F", 2, kWidth, 0},
+      {sjis, "aaaaaaaaaaaaaaa!", 16, "aaaaaaaaaaaaaaa!b", 17, kWidth, 0},
       {sjis, "!a", 2, "\x88\x9F", 2, kWidth, 0x81 - 0x88},
-      {utf8, "\xC3\xA0", 2, "\xC3\xA1", 2, kCase, -1},
       {shift, "\x0E\x42\xC1\x42", 4, "\x42\xC1", 2, 0, 0, 0, 1},
-      {shift, "\x0E\x42\xC1\x0F", 4, "\xC1", 1, kWidth, 0},
-      {shift, "\x0E\x42\xC1\x42\xC2\x0F\x81", -1, "\xC1\x0E\x42\xC2\x0F\x81", -1, kWidth, 0},
       {shift, "\x0E\x42\xC1\x0F", -1, "\x0E\x42\xC1\x0F\x81", -1, kWidth, -1},
       {shift, "\x0E\x42\xC1\x40\x40\x0F", -1, "\xC1", -1, kWidth | kBlanks, 0},
       {shift, "\x81\x40\x40", 2, "\x81", 1, kBlanks | LX_CHARACTERS, 0},
       {shift, "\x0E\x44\x47\x42\xC1", 5, "\x44\x47\x44\x47", 4, kCase, 0, 0, 1},  // "small A" is 0x4447 here
       {shift, "\x42\xC1", 2, "\xC1", 1, kCase, 1, 1, 0},
-      // Kept: signed bytes; the first text's state decides at shift bytes; a last shift byte leaves no room.
+      // Kept: signed bytes; who leaves the double-byte state first is less, but not where the text ends.
       {shift, "\x81", 1, "\x25", 1, kCase, -0x7F - 0x25},
       {shift, "\x0E\x42\xC1\x0F\x81", 5, "\x0E\x42\xC1\x42\xC2", 5, kCase, -1},
       {shift, "\x0E\x42\xC1\x42\xC2", 5, "\x0E\x42\xC1\x0F\x81", 5, kCase, 1},
@@ -245,10 +236,10 @@ TEST_F(Compare, ExactResults) {
 
 TEST_F(Compare, CodesAndUnits) {
   LXLocale* const in = locale(four_);
-  const LXWChar far[] = {0x90308139, ' ', '@'}, near[] = {0x90318130}, big[] = {0xFFFFFFFF}, small[] = {1};
+  const LXWChar far[] = {0x90308230, ' ', '@'}, near[] = {0x90318139}, big[] = {0xFFFFFFFF}, small[] = {1};
   EXPECT_EQ(LXWcscmp(in, far, 2, far, 1, kBlanks), 0);
   EXPECT_EQ(LXWcscmp(locale(shift_), far, 2, far, 1, kBlanks), 1);
-  EXPECT_EQ(LXWcscmp(in, far, 1, near, 1, 0), 0x90308139 - 0x90318130);
+  EXPECT_EQ(LXWcscmp(in, far, 1, near, 1, 0), 0x90308230 - 0x90318139);
   EXPECT_EQ(LXWcscmp(in, big, 1, small, 1, 0), INT32_MAX);
   // Kept: U+2000 is the blank, and stays behind the second text where nothing is left of the first.
   const LXUChar a[] = {'a', 0x2000, 0x2000}, b[] = {'B', ' '}, full[] = {0xFF21};
@@ -262,7 +253,7 @@ TEST_F(Compare, CodesAndUnits) {
   // Kept: mapped codes order by their low 16 bits first; what a special mapping adds to codes and units is cut.
   const LXWChar sharp[] = {0xDF}, double_s[] = {'s', 's'};
   const LXUChar sharp_u[] = {0xDF}, double_s_u[] = {'s', 's'};
-  const WithSpecial special(in), single(locale(single_)), shift(locale(shift_));
+  use_special();
   EXPECT_GT(LXWcscmp(in, far, 1, near, 1, kCase), 0);
   EXPECT_EQ(LXWcscmp(locale(single_), sharp, 1, double_s, 2, kCase), -1);
   EXPECT_EQ(LXStrcmpU(in, sharp_u, 1, double_s_u, 2, kCase), -1);
@@ -291,12 +282,18 @@ TEST_F(Compare, RefusedOptionsAndMemory) {
   hooks.fail_at(1);
   EXPECT_EQ(LXStrcmp(in, blank.c_str(), -1, text.c_str(), -1, kBlanks), 1);  // the blank counts
   EXPECT_EQ(LXGetError(in), LX_OK);
-  const WithSpecial special(in);
+  use_special();
   for (size_t failing : {1u, 2u, 3u}) {
     hooks.fail_at(failing);
     EXPECT_EQ(LXStrcmp(in, blank.c_str(), -1, text.c_str(), -1, kCase), failing == 3 ? 1 : 0);
     EXPECT_EQ(LXGetError(in), failing == 3 ? LX_OK : LX_E_MEMORY);
   }
+}
+
+TEST_F(Compare, WithoutALibraryNothingIsTouched) {
+  EXPECT_TRUE(library_.close());
+  EXPECT_EQ(LXStrcmp(nullptr, nullptr, 1, nullptr, 2, 0), 0);
+  EXPECT_EQ(LXStrcmpU(nullptr, nullptr, 1, nullptr, 2, 0), 0);
 }
 
 TEST_F(Compare, Trace) {
@@ -321,12 +318,6 @@ TEST_F(Compare, Trace) {
                 "String2\x81|=64");
   const LXUChar u = 0x4241;
   EXPECT_EQ(said([&] { LXStrcmpU(in, &u, 1, &u, 0, kCase); }), "|options = 80000040|String1AB|String2|=1");
-}
-
-TEST_F(Compare, WithoutALibraryNothingIsTouched) {
-  EXPECT_TRUE(library_.close());
-  EXPECT_EQ(LXStrcmp(nullptr, nullptr, 1, nullptr, 2, 0), 0);
-  EXPECT_EQ(LXStrcmpU(nullptr, nullptr, 1, nullptr, 2, 0), 0);
 }
 
 }  // namespace

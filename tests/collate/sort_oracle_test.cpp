@@ -5,16 +5,14 @@
 //
 // LEXICOR_WRITE_DIFFERENCES=FILE appends the pairs that nothing explains.
 #include <gtest/gtest.h>
-#include <unicode/uchar.h>
-#include <unicode/ucol.h>
+#include <unicode/coll.h>
+#include <unicode/locdspnm.h>
+#include <unicode/normalizer2.h>
+#include <unicode/regex.h>
 #include <unicode/ucurr.h>
-#include <unicode/uldnames.h>
-#include <unicode/uloc.h>
 #include <unicode/ulocdata.h>
-#include <unicode/unorm2.h>
-#include <unicode/uregex.h>
-#include <unicode/uset.h>
-#include <unicode/ustring.h>
+#include <unicode/uniset.h>
+#include <unicode/usetiter.h>
 
 #include <algorithm>
 #include <cstdlib>
@@ -30,39 +28,33 @@
 namespace lx::test {
 namespace {
 
-using lexicor_import::IcuPtr;
+using icu::UnicodeString;
 using lexicor_import::Sort;
-using Text = std::u16string;
-using Words = std::vector<Text>;
+using Words = std::vector<UnicodeString>;
 
 constexpr size_t kLeastWords = 2000;
-constexpr size_t kMadeWords = 2000;
+constexpr size_t kMadeWords = 2400;
 constexpr size_t kNeighbours = 16;  ///< each word is compared with as many behind it in ICU's order
 constexpr size_t kOthers = 8;       ///< and with as many others
 
-/// The text of an ICU function that ends in buffer, room and error.
-template <class Function, class... Arguments>
-Text icu(Function function, Arguments... arguments) {
-  return lexicor_import::icu_text("ICU", [&](UChar* out, int32_t room, UErrorCode* error) {
-    return function(arguments..., out, room, error);
-  });
+/// The error that an ICU function leaves; a failure ends the test.
+class Status {
+ public:
+  ~Status() noexcept(false) { lexicor_import::require(error_, "ICU"); }
+  operator UErrorCode&() { return error_; }
+  operator UErrorCode*() { return &error_; }
+
+ private:
+  UErrorCode error_ = U_ZERO_ERROR;
+};
+
+std::string utf8(const UnicodeString& text) {
+  std::string out;
+  return text.toUTF8String(out);
 }
 
-std::string utf8(const Text& text) {
-  std::string out(3 * text.size(), '\0');
-  UErrorCode error = U_ZERO_ERROR;
-  int32_t bytes = 0;
-  u_strToUTF8(out.data(), static_cast<int32_t>(out.size()), &bytes, text.data(),
-              static_cast<int32_t>(text.size()), &error);
-  return out.substr(0, static_cast<size_t>(bytes));
-}
-
-Text utf16(const std::string& text) {
-  return icu([&](UChar* out, int32_t room, UErrorCode* error) {
-    int32_t units = 0;
-    u_strFromUTF8(out, room, &units, text.data(), static_cast<int32_t>(text.size()), error);
-    return units;
-  });
+const LXUChar* units(const UnicodeString& text) {
+  return reinterpret_cast<const LXUChar*>(text.getBuffer());
 }
 
 int sign(int64_t value) {
@@ -76,115 +68,86 @@ std::vector<std::string> locales_of(const Sort& sort) {
   return {locale.substr(0, locale.find('@'))};
 }
 
-void add_names(const std::string& locale, std::set<Text>& words) {
-  UErrorCode error = U_ZERO_ERROR;
-  const IcuPtr<ULocaleDisplayNames, uldn_close> names(uldn_open(locale.c_str(), ULDN_STANDARD_NAMES, &error));
+/// Names of languages, countries and currencies.
+void add_names(const std::string& locale, std::set<UnicodeString>& words) {
+  const std::unique_ptr<icu::LocaleDisplayNames> names(
+      icu::LocaleDisplayNames::createInstance(icu::Locale(locale.c_str())));
+  UnicodeString name;
   for (const char* const* code = uloc_getISOLanguages(); *code != nullptr; ++code)
-    words.insert(icu(uldn_languageDisplayName, names.get(), *code));
+    words.insert(names->languageDisplayName(*code, name));
   for (const char* const* code = uloc_getISOCountries(); *code != nullptr; ++code)
-    words.insert(icu(uldn_regionDisplayName, names.get(), *code));
-  const IcuPtr<UEnumeration, uenum_close> currencies(ucurr_openISOCurrencies(UCURR_ALL, &error));
-  while (const UChar* code = uenum_unext(currencies.get(), nullptr, &error)) {
-    int32_t units = 0;
-    const UChar* name = ucurr_getName(code, locale.c_str(), UCURR_LONG_NAME, nullptr, &units, &error);
-    words.emplace(name, static_cast<size_t>(units));
+    words.insert(names->regionDisplayName(*code, name));
+  Status status;
+  const lexicor_import::IcuPtr<UEnumeration, uenum_close> currencies(
+      ucurr_openISOCurrencies(UCURR_ALL, status));
+  while (const UChar* code = uenum_unext(currencies.get(), nullptr, status)) {
+    int32_t length = 0;
+    const UChar* text = ucurr_getName(code, locale.c_str(), UCURR_LONG_NAME, nullptr, &length, status);
+    words.insert(UnicodeString(text, length));
   }
-  lexicor_import::require(error, "names");
 }
 
 /// The letters of a language, and those of other languages that it meets; digraphs are letters too.
 Words letters_of(const std::string& locale) {
-  UErrorCode error = U_ZERO_ERROR;
-  const IcuPtr<ULocaleData, ulocdata_close> data(ulocdata_open(locale.c_str(), &error));
+  Status status;
+  const lexicor_import::IcuPtr<ULocaleData, ulocdata_close> data(ulocdata_open(locale.c_str(), status));
   Words letters;
   for (auto type : {ULOCDATA_ES_STANDARD, ULOCDATA_ES_AUXILIARY}) {
-    const IcuPtr<USet, uset_close> set(ulocdata_getExemplarSet(data.get(), nullptr, 0, type, &error));
-    lexicor_import::require(error, "exemplar set");
-    for (int32_t item = 0; item < uset_getItemCount(set.get()); ++item) {
-      UChar text[16];
-      UChar32 first = 0, last = 0;
-      const int32_t units = uset_getItem(set.get(), item, &first, &last, text, 16, &error);
-      if (units > 0) letters.emplace_back(text, static_cast<size_t>(units));
-      for (UChar32 code = first; units == 0 && code <= std::min(last, 0xFFFF); ++code)
-        letters.emplace_back(1, static_cast<char16_t>(code));
-    }
+    icu::UnicodeSet set;
+    ulocdata_getExemplarSet(data.get(), set.toUSet(), 0, type, status);
+    for (icu::UnicodeSetIterator letter(set); letter.next();) letters.push_back(letter.getString());
   }
   return letters;
 }
 
 /// Words of up to four letters, with case and accents varied; a mark stands behind a letter.
-void add_made(const std::string& locale, size_t count, std::set<Text>& words) {
-  UErrorCode error = U_ZERO_ERROR;
+void add_made(const std::string& locale, size_t count, std::set<UnicodeString>& words) {
+  Status status;
+  const icu::Locale language(locale.c_str());
+  const icu::Normalizer2 &apart = *icu::Normalizer2::getNFDInstance(status),
+                         &composed = *icu::Normalizer2::getNFCInstance(status);
+  icu::RegexMatcher accents("[\\u0300-\\u036F]", 0, status);
   const Words letters = letters_of(locale);
-  const UNormalizer2* apart = unorm2_getNFDInstance(&error);
-  const UNormalizer2* composed = unorm2_getNFCInstance(&error);
   std::mt19937 random(5489);
-  for (size_t least = words.size() + count; words.size() < least;) {
-    Text word;
+  for (const size_t least = words.size() + count; words.size() < least;) {
+    UnicodeString word;
     for (size_t length = 1 + random() % 4; length > 0; --length) {
-      const Text& letter = letters[random() % letters.size()];
-      if (u_isalpha(letter[0]) || (!word.empty() && u_isalpha(word.back()))) word += letter;
+      const UnicodeString& letter = letters[random() % letters.size()];
+      if (u_isalpha(letter[0]) || (!word.isEmpty() && u_isalpha(word[word.length() - 1]))) word += letter;
     }
-    const auto units = static_cast<int32_t>(word.size());
-    auto add = [&](auto function) {
-      const Text form = icu([&](UChar* out, int32_t room, UErrorCode* status) {
-        return function(out, room, word.data(), units, locale.c_str(), status);
-      });
-      words.insert(icu(unorm2_normalize, composed, form.data(), static_cast<int32_t>(form.size())));
-    };
-    add(u_strToLower);
-    add(u_strToUpper);
-    add([](UChar* out, int32_t room, const UChar* text, int32_t length, const char* name, UErrorCode* status) {
-      return u_strToTitle(out, room, text, length, nullptr, name, status);
-    });
-    Text plain = icu(unorm2_normalize, apart, word.data(), units);
-    const auto is_accent = [](char16_t unit) { return unit >= 0x300 && unit < 0x370; };
-    plain.erase(std::remove_if(plain.begin(), plain.end(), is_accent), plain.end());
-    words.insert(icu(unorm2_normalize, composed, plain.data(), static_cast<int32_t>(plain.size())));
+    UnicodeString lower(word), upper(word), title(word);
+    for (const UnicodeString& form :
+         {lower.toLower(language), upper.toUpper(language), title.toTitle(nullptr, language),
+          accents.reset(apart.normalize(word, status)).replaceAll("", status)}) {
+      words.insert(composed.normalize(form, status));
+    }
   }
 }
 
 Words words_of(const Sort& sort) {
-  std::set<Text> words;
+  std::set<UnicodeString> words;
   for (const std::string& locale : locales_of(sort)) {
     add_names(locale, words);
     add_made(locale, kMadeWords / locales_of(sort).size(), words);
   }
   Words list;
-  for (const Text& word : words) {
-    const bool plane_0 =
-        std::none_of(word.begin(), word.end(), [](char16_t u) { return u >= 0xD800 && u < 0xE000; });
-    if (plane_0) list.push_back(word);
+  for (const UnicodeString& word : words) {
+    if (word.countChar32() == word.length()) list.push_back(word);  // sorts have no characters above U+FFFF
   }
   return list;
 }
 
-class Peer {
- public:
-  explicit Peer(const Sort& sort) {
-    UErrorCode error = U_ZERO_ERROR;
-    collator_.reset(ucol_open(sort.locale, &error));
-    ucol_setAttribute(collator_.get(), UCOL_ALTERNATE_HANDLING, UCOL_SHIFTED, &error);
-    ucol_setStrength(collator_.get(), UCOL_TERTIARY);
-    lexicor_import::require(error, "ucol_open");
-  }
-  int compare(const Text& a, const Text& b) const {
-    return ucol_strcoll(collator_.get(), a.data(), static_cast<int32_t>(a.size()), b.data(),
-                        static_cast<int32_t>(b.size()));
-  }
-
- private:
-  IcuPtr<UCollator, ucol_close> collator_;
-};
+std::string key_of(LXLocale* locale, const UnicodeString& text) {
+  std::string key(1024, '\0');
+  const int32_t bytes =
+      LXStrxfrmU(locale, reinterpret_cast<uint8_t*>(key.data()), 1024, units(text), text.length(), 0);
+  EXPECT_TRUE(bytes >= 3 && bytes <= 1024) << utf8(text);
+  key.resize(static_cast<size_t>(bytes));
+  return key;
+}
 
 /// The levels of a key but the last one, with the zero byte behind each.
-std::string letters_key(LXLocale* locale, const Text& text) {
-  std::string key(1024, '\0');
-  const auto* units = reinterpret_cast<const LXUChar*>(text.data());
-  const int32_t bytes = LXStrxfrmU(locale, reinterpret_cast<uint8_t*>(key.data()), 1024, units,
-                                   static_cast<int32_t>(text.size()), 0);
-  EXPECT_GE(bytes, 3);
-  EXPECT_LE(bytes, 1024) << utf8(text);
+std::string letters_of_key(const std::string& key) {
   size_t at = 0;
   while (key.at(at) != '\0') at += 2;
   for (int level = 0; level < 2; ++level) at = key.find('\0', at + 1);
@@ -194,14 +157,10 @@ std::string letters_key(LXLocale* locale, const Text& text) {
 /// A line of sort_differences.txt: the sort, a regular expression for what a word holds, and the reason.
 struct Difference {
   std::string sort, pattern;
-  IcuPtr<URegularExpression, uregex_close> expression;
+  std::unique_ptr<icu::RegexMatcher> matcher;
   size_t pairs = 0;
 
-  bool matches(const Text& word) {
-    UErrorCode error = U_ZERO_ERROR;
-    uregex_setText(expression.get(), word.data(), static_cast<int32_t>(word.size()), &error);
-    return uregex_find(expression.get(), 0, &error) != 0;
-  }
+  bool matches(const UnicodeString& word) { return matcher->reset(word).find(); }
 };
 
 class SortOracle : public testing::Test {
@@ -211,22 +170,20 @@ class SortOracle : public testing::Test {
     ASSERT_TRUE(in);
     for (std::string line; std::getline(in, line);) {
       std::istringstream fields(line);
-      Difference difference;
+      Difference entry;
       std::string reason;
-      if (line.rfind("#", 0) == 0 || !(fields >> difference.sort)) continue;
-      fields >> difference.pattern >> reason;
+      if (line.rfind("#", 0) == 0 || !(fields >> entry.sort)) continue;
+      fields >> entry.pattern >> reason;
       EXPECT_FALSE(reason.empty()) << line;
-      UErrorCode error = U_ZERO_ERROR;
-      const Text pattern = utf16(difference.pattern);
-      difference.expression.reset(uregex_open(pattern.data(), static_cast<int32_t>(pattern.size()),
-                                              UREGEX_CASE_INSENSITIVE, nullptr, &error));
-      lexicor_import::require(error, difference.pattern.c_str());
-      differences_.push_back(std::move(difference));
+      Status status;
+      entry.matcher = std::make_unique<icu::RegexMatcher>(UnicodeString::fromUTF8(entry.pattern),
+                                                          UREGEX_CASE_INSENSITIVE, status);
+      differences_.push_back(std::move(entry));
     }
     if (const char* file = std::getenv("LEXICOR_WRITE_DIFFERENCES")) report_.open(file, std::ios::app);
   }
 
-  bool explained(const Sort& sort, const Text& a, const Text& b) {
+  bool explained(const Sort& sort, const UnicodeString& a, const UnicodeString& b) {
     bool found = false;
     for (Difference& difference : differences_) {
       if (difference.sort != sort.name || (!difference.matches(a) && !difference.matches(b))) continue;
@@ -240,24 +197,29 @@ class SortOracle : public testing::Test {
   size_t compare(const Sort& sort) {
     const LocalePtr locale(
         LXGetLocale((std::string("English_UnitedStates.UTF-8@") + sort.name).c_str(), 0, nullptr));
-    if (!locale) return ADD_FAILURE() << "no sort", 0;
-    const Peer peer(sort);
+    if (!locale) throw std::runtime_error("there is no such sort");
+    Status status;
+    const std::unique_ptr<icu::Collator> peer(icu::Collator::createInstance(icu::Locale(sort.locale), status));
+    peer->setAttribute(UCOL_ALTERNATE_HANDLING, UCOL_SHIFTED, status);
     Words words = words_of(sort);
     EXPECT_GE(words.size(), kLeastWords);
-    std::stable_sort(words.begin(), words.end(),
-                     [&](const Text& a, const Text& b) { return peer.compare(a, b) < 0; });
-    std::vector<std::string> keys;
-    for (const Text& word : words) keys.push_back(letters_key(locale.get(), word));
+    std::stable_sort(words.begin(), words.end(), [&](const UnicodeString& a, const UnicodeString& b) {
+      return peer->compare(a, b, status) < 0;
+    });
+    std::vector<std::string> keys, letters;
+    for (const UnicodeString& word : words) {
+      keys.push_back(key_of(locale.get(), word));
+      letters.push_back(letters_of_key(keys.back()));
+    }
     std::mt19937 random(5489);
     size_t wrong = 0;
     for (size_t i = 0; i < words.size(); ++i) {
       for (size_t step = 1; step <= kNeighbours + kOthers; ++step) {
         const size_t j = step <= kNeighbours ? std::min(i + step, words.size() - 1) : random() % words.size();
-        const Text &a = words[i], &b = words[j];
-        const int expected = peer.compare(a, b), keyed = sign(keys[i].compare(keys[j]));
-        const int compared = sign(
-            LXStrcollU(locale.get(), reinterpret_cast<const LXUChar*>(a.data()), static_cast<int32_t>(a.size()),
-                       reinterpret_cast<const LXUChar*>(b.data()), static_cast<int32_t>(b.size()), 0));
+        const UnicodeString &a = words[i], &b = words[j];
+        const int expected = peer->compare(a, b, status), keyed = sign(letters[i].compare(letters[j]));
+        const int compared = sign(LXStrcollU(locale.get(), units(a), a.length(), units(b), b.length(), 0));
+        EXPECT_EQ(compared, sign(keys[i].compare(keys[j]))) << utf8(a) << ' ' << utf8(b);
         if (keyed == expected && (expected == 0 || compared == expected)) continue;
         if (explained(sort, a, b)) continue;
         ++wrong;
@@ -278,8 +240,8 @@ TEST_F(SortOracle, OrdersWordsAsIcu) {
     SCOPED_TRACE(sort.name);
     EXPECT_EQ(compare(sort), 0U) << "pairs in another order";
   }
-  for (const Difference& difference : differences_)
-    EXPECT_GT(difference.pairs, 0U) << difference.sort << ' ' << difference.pattern << " does not occur";
+  for (const Difference& entry : differences_)
+    EXPECT_GT(entry.pairs, 0U) << entry.sort << ' ' << entry.pattern << " does not occur";
 }
 
 }  // namespace

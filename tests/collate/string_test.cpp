@@ -54,13 +54,13 @@ struct Ex {
   static char* tok(LXLocale* in, char* t, int32_t* n, const char* s, int32_t m, char** next, uint32_t flags) {
     return LXStrtokEx(in, t, &state, n, s, 0, m, next, &token_state, flags);
   }
-  template <auto kDoor>
-  static auto search(LXLocale* in, const char* t, int32_t n, const char* s, int32_t m, uint32_t flags) {
+  template <class Result, auto kDoor>
+  static Result search(LXLocale* in, const char* t, int32_t n, const char* s, int32_t m, uint32_t flags) {
     return kDoor(in, t, 0, n, s, 0, m, &state, flags);
   }
-  static constexpr auto cspn = search<LXStrcspnEx>;
-  static constexpr auto spn = search<LXStrspnEx>;
-  static constexpr auto str = search<LXStrstrEx>;
+  static constexpr auto cspn = search<int32_t, LXStrcspnEx>;
+  static constexpr auto spn = search<int32_t, LXStrspnEx>;
+  static constexpr auto str = search<char*, LXStrstrEx>;
 };
 LXShiftState Ex::state, Ex::token_state;
 
@@ -228,6 +228,7 @@ TEST_F(Strings, ConcatenationKeepsTextsWhole) {
     }
     std::vector<Unit> buffer = first.terminated();
     ASSERT_EQ(K::cat(in, buffer.data(), first.size(), second.units.data(), second.size(), 0), 0);
+    ASSERT_EQ(K::cat(in, buffer.data(), n32(head.size()), second.units.data(), 0, LX_CHARACTERS), 0);
     ASSERT_EQ(buffer, first.terminated());
     buffer.resize(100);
     const int32_t chars = n32(head.size() + tail.size());
@@ -331,10 +332,6 @@ TEST_F(Strings, TruncationFollowsTheModel) {
   }
 }
 
-std::string bytes_of_double(const char* text) {
-  return std::string("\x0E") + text;
-}
-
 TEST_F(Strings, KeptTruncation) {
   LXLocale* const sjis = library_.locale(lx::test::tiny_shift_jis());
   LXLocale* const shift = library_.locale(lx::test::tiny_shift());
@@ -342,12 +339,16 @@ TEST_F(Strings, KeptTruncation) {
   char text[] = "ab  c";
   EXPECT_EQ(LXTruncateString(sjis, text, 6, LX_DROP_BLANKS), 3);
   EXPECT_STREQ(text, "ab");
+  // What fits stays, half a character too; undefined flags are ignored.
+  char half[] = "a\x82";
+  EXPECT_EQ(LXTruncateString(sjis, half, 9, 0x100), 3);
+  EXPECT_STREQ(half, "a\x82");
   // A state is left open. The Shift-In made room for the null, which is no character in the double-byte state.
-  std::string open = bytes_of_double("\x44\x47\x44\x48\x0F");
+  std::string open = "\x0E\x44\x47\x44\x48\x0F";
   EXPECT_EQ(LXTruncateStringEx(shift, open.data(), 0, 2, LX_CHARACTERS), 2);
   EXPECT_STREQ(open.c_str(), "\x0E\x44\x47\x44\x48");
   // The Shift-Out behind the last character that fits makes room for it.
-  std::string wide = "\x81\x82" + bytes_of_double("\x44\x47\x0F");
+  std::string wide = "\x81\x82\x0E\x44\x47\x0F";
   EXPECT_EQ(LXTruncateStringEx(shift, wide.data(), 0, 2, LX_CHARACTERS), 3);
   EXPECT_STREQ(wide.c_str(), "\x81\x82");
   char out[] = "xyz";
@@ -363,60 +364,74 @@ TEST_F(Strings, KeptTruncation) {
 }
 
 TEST_F(Strings, TruncationMessages) {
-  LXLocale* const single = library_.locale(lx::test::tiny_single());
   LXLocale* const sjis = library_.locale(lx::test::tiny_shift_jis());
   LXLocale* const shift = library_.locale(lx::test::tiny_shift());
   set_full_width(sjis, 0x20, 0x8140);
   set_full_width(shift, 0x40, 0x4040);
-  const auto messages = [](auto action) {
+  const struct {
+    LXLocale* in;
+    std::string text;
+    int32_t size;
+    const char* messages;
+  } cases[] = {
+      {library_.locale(lx::test::tiny_single()), "ab  ", 9,
+       "Single byte code page, string length = 4|Stripping blank at position 3|Stripping blank at position 2|"
+       "Truncated string: ab|"},
+      {sjis, "a b \x81\x40 cd", 8,
+       "Blank encountered at 1|Blank position set to 1|Blank position reset|Blank encountered at 3|"
+       "Blank position set to 3|Full width blank encountered at 4|Blank encountered at 6|index set to 3|"
+       "Truncated string: a b|"},
+      {shift, "\x81\x40\x82\x40\x0E\x40\x40\x0F", 20,
+       "Blank encountered at 1|Setting blank position to 1|Resetting blank position|Blank encountered at 3|"
+       "Setting blank position to 3|Full width blank encountered at 5|Setting index to 3|"
+       "Truncated string: \x81\x40\x82|"},
+      {shift, "\x0E\x40\x40", 4,
+       "Full width blank encountered at 1|Blank position set to 1|Setting index to 1|Truncated string: \x0E|"},
+  };
+  for (const auto& test : cases) {
+    std::string text = test.text, messages;
     RecordingTrace::take();
     RecordingTrace::set_level(RAS1_LEVEL_DETAIL | RAS1_LEVEL_INPUT);
-    action();
+    LXTruncateStringEx(test.in, text.data(), 0, test.size, LX_DROP_FULL_BLANKS);
     RecordingTrace::set_level(0);
-    std::string all;
-    for (const auto& record : RecordingTrace::take()) all += record.text + "|";
-    return all;
-  };
-  char ascii[] = "ab  ", mixed[] = "a b \x81\x40 cd";
-  std::string stateful = "\x81\x40\x82\x40" + bytes_of_double("\x40\x40\x0F");
-  EXPECT_EQ(messages([&] { LXTruncateString(single, ascii, 9, LX_DROP_BLANKS); }),
-            "Input length = 9|Single byte code page, string length = 4|Stripping blank at position 3|"
-            "Stripping blank at position 2|Truncated string: ab|");
-  EXPECT_EQ(messages([&] { LXTruncateString(sjis, mixed, 8, LX_DROP_FULL_BLANKS); }),
-            "Input length = 8|Blank encountered at 1|Blank position set to 1|Blank position reset|"
-            "Blank encountered at 3|Blank position set to 3|Full width blank encountered at 4|"
-            "Blank encountered at 6|index set to 3|Truncated string: a b|");
-  EXPECT_EQ(messages([&] { LXTruncateStringEx(shift, stateful.data(), 0, 20, LX_DROP_FULL_BLANKS); }),
-            "Input length = 20|Blank encountered at 1|Setting blank position to 1|Resetting blank position|"
-            "Blank encountered at 3|Setting blank position to 3|Full width blank encountered at 5|"
-            "Setting index to 3|Truncated string: \x81\x40\x82|");
-  stateful = bytes_of_double("\x40\x40");
-  EXPECT_EQ(messages([&] { LXTruncateStringEx(shift, stateful.data(), 0, 4, LX_DROP_FULL_BLANKS); }),
-            "Input length = 4|Full width blank encountered at 1|Blank position set to 1|Setting index to 1|"
-            "Truncated string: \x0E|");
+    for (const auto& record : RecordingTrace::take()) messages += record.text + "|";
+    EXPECT_EQ(messages, "Input length = " + std::to_string(test.size) + "|" + test.messages);
+  }
 }
 
 TEST_F(Strings, SubstringsWithOptions) {
-  // Full width from half width and the other case, in the tables.
-  for (const TinyCodepage& cp : {lx::test::tiny_single(), lx::test::tiny_shift_jis()}) {
-    LXLocale* const in = library_.locale(cp);
-    if (cp.width > 1) set_full_width(in, 'A', 0x8260);
-    const std::string text = cp.width > 1 ? "x\x82\x60"
-                                            "bAbab"
-                                          : "xabAb";
-    const auto at = [&](const char* part, uint32_t options) -> ptrdiff_t {
-      const char* found = LXStrstr(in, text.c_str(), -1, part, -1, options);
-      EXPECT_EQ(LXStrstrEx(in, text.data(), 0, n32(text.size()), part, 0, -1, nullptr, options), found);
-      return found == nullptr ? -1 : found - text.c_str();
-    };
-    EXPECT_EQ(at("Ab", 0), cp.width > 1 ? 4 : 3);
-    EXPECT_EQ(at("Ab", LX_WIDTH_INSENSITIVE), cp.width > 1 ? 1 : 3);
-    EXPECT_EQ(at("aB", LX_CASE_INSENSITIVE), cp.width > 1 ? 4 : 1);
-    EXPECT_EQ(at("AB", 0x80000001), cp.width > 1 ? 4 : 1);
-    EXPECT_EQ(at("abx", LX_CASE_INSENSITIVE), -1);
-    EXPECT_EQ(at("", LX_CASE_INSENSITIVE), 0);
-    EXPECT_EQ(at("x", LX_IGNORE_BLANKS), -1);
-    EXPECT_EQ(LXGetError(in), LX_E_INVALID);
+  const TinyCodepage single = lx::test::tiny_single(), sjis = lx::test::tiny_shift_jis();
+  set_full_width(library_.locale(sjis), 'A', 0x8260);
+  const struct {
+    const TinyCodepage& cp;
+    std::string text, part;
+    uint32_t options;
+    ptrdiff_t place;  // -1: none
+  } cases[] = {
+      {single, "xabAb", "Ab", 0, 3},
+      {single, "xabAb", "Ab", LX_WIDTH_INSENSITIVE, 3},
+      {single, "xxAb", "aB", LX_CASE_INSENSITIVE, 2},
+      {single, "xabAb", "abx", LX_CASE_INSENSITIVE, -1},
+      {single, "xabAb", "x", LX_IGNORE_BLANKS, -1},
+      {sjis, "x\x82\x60\x62\x41\x62", "Ab", 0, 4},
+      {sjis, "x\x82\x60\x62\x41\x62", "Ab", LX_WIDTH_INSENSITIVE, 1},
+      {sjis, "x\x82\x60\x62\x41\x62", "aB", 0x80000001, 4},
+      {sjis, "x\x82\x60\x62\x41\x62", "aBx", LX_CASE_INSENSITIVE, -1},
+      {sjis, "\x82\x60", "", LX_CASE_INSENSITIVE, 0},
+      {sjis, "A", "\x82\x60", LX_WIDTH_INSENSITIVE, -1},  // more bytes than the text has
+      {lx::test::tiny_shift(), "\x0E\x44\x47\x0F\xC1\x82", "\x81\xC2", LX_CASE_INSENSITIVE, 4},
+  };
+  for (const auto& test : cases) {
+    LXLocale* const in = library_.locale(test.cp);
+    const char* const text = test.text.c_str();
+    const char* const place = test.place < 0 ? nullptr : text + test.place;
+    LXShiftState state = 0;
+    EXPECT_EQ(LXStrstrEx(in, text, 0, n32(test.text.size()), test.part.c_str(), 0, -1, &state, test.options),
+              place);
+    EXPECT_EQ(LXGetError(in), test.options == LX_IGNORE_BLANKS ? LX_E_INVALID : LX_OK);
+    if (!test.cp.shift) {
+      EXPECT_EQ(LXStrstr(in, text, -1, test.part.c_str(), -1, test.options), place) << text;
+    }
   }
   LXLocale* const in = library_.locale(lx::test::tiny_utf8());
   const LXUChar units[] = {'x', 0xFF21, 'b', 'a', 'B'}, part[] = {'A', 'b'};
@@ -433,6 +448,8 @@ TEST_F(Strings, NullsAndRefusals) {
   EXPECT_EQ(LXStrchr(in, text.data(), 4, 'b', 0), text.data() + 2);
   EXPECT_EQ(LXStrstr(in, text.data(), 4, "b\x82", -1, 0), text.data() + 2);  // the cut character is no part
   EXPECT_EQ(LXStrspn(in, "\x82\0a", 3, "\x82\0a", 3, 0), 0);
+  LXLocale* const shift = library_.locale(lx::test::tiny_shift());
+  EXPECT_EQ(LXStrspnEx(shift, "\x0F\x81", 0, 2, "\x82", 0, 1, nullptr, 0), 0);  // a shift byte is no span
   char half[8] = "a\x82", copy[8] = "";
   EXPECT_EQ(LXStrcat(in, half, 8, "b", -1, 0), 3);  // the half character goes
   EXPECT_STREQ(half, "ab");

@@ -39,6 +39,8 @@ struct Block {
 constexpr Block kIdeographs[] = {{0x4E, 0x9F}, {0x34, 0x4D}};
 constexpr Block kSyllables[] = {{0xAC, 0xD7}};
 constexpr Block kSurrogates = {0xD8, 0xDF};
+constexpr Block kOthers[] = {{0xA0, 0xA4},
+                             {0xE0, 0xF8}};  ///< Yi and private use: in code point order by nature
 constexpr unsigned kFirstSyllable = 0xAC00, kLastSyllable = 0xD7A3;
 constexpr unsigned kFirstJamo = 0x1100, kLastJamo = 0x11FF;
 
@@ -149,11 +151,10 @@ class Importer {
     for (const std::string& page : words(row_.scripts))
       scripts_.insert(static_cast<unsigned>(std::stoul(page, nullptr, 16)));
     table_pages_.insert(scripts_.begin(), scripts_.end());
-    for (const Block* block : {&kIdeographs[0], &kIdeographs[1], &kSyllables[0], &kSurrogates}) {
-      for (unsigned page = block->first_page; page <= block->last_page; ++page) table_pages_.erase(page);
+    for (const Block& block :
+         {kIdeographs[0], kIdeographs[1], kSyllables[0], kSurrogates, kOthers[0], kOthers[1]}) {
+      for (unsigned page = block.first_page; page <= block.last_page; ++page) table_pages_.erase(page);
     }
-    for (unsigned page = 0xE0; page <= 0xF8; ++page) table_pages_.erase(page);
-    for (unsigned page = 0xA0; page <= 0xA4; ++page) table_pages_.erase(page);
   }
 
   bool in_tables(char16_t unit) const {
@@ -168,8 +169,8 @@ class Importer {
         const std::vector<Ce> elements = collator_.elements(Text(1, static_cast<char16_t>(code)));
         if (elements.size() != 1) continue;
         ideographs_.emplace(elements[0].primary, code);
-        if (first_ideograph_.empty() || elements[0].primary < first_primary_) {
-          first_primary_ = elements[0].primary;
+        if (first_ideograph_.empty() || elements[0].primary < first_ideograph_weight_) {
+          first_ideograph_weight_ = elements[0].primary;
           first_ideograph_ = Text(1, static_cast<char16_t>(code));
         }
       }
@@ -288,13 +289,13 @@ class Importer {
       const bool scripted = scripts_.count(text[0] >> 8) != 0;
       if (!scripted && of_root.count(text) != 0 && same_letters(collator_.elements(text), root.elements(text)))
         continue;
-      add_contraction(text, scripted);
+      add_contraction(text);
     }
     for (const std::string& word : words(row_.marks)) {
       const auto mark = static_cast<char16_t>(std::stoul(word, nullptr, 16));
       for (const auto& entry : characters_) {
         const Text text{entry.first, mark};
-        if (composes(text)) add_contraction(text, false);
+        if (composes(text)) add_contraction(text);
       }
     }
   }
@@ -316,11 +317,19 @@ class Importer {
     });
   }
 
-  /// `own_element`: two elements become one of their own, behind the first one's.
-  void add_contraction(const Text& text, bool own_element) {
-    Draft drafted = draft(text);
+  /// Whether a pair is a vowel that is written before the consonant behind which it counts. No other letter of
+  /// its script comes behind such vowels, so both become one element behind the consonant's.
+  bool is_turned_around(const Text& text) const {
+    const std::vector<Ce> both = collator_.elements(text), first = collator_.elements(text.substr(0, 1)),
+                          second = collator_.elements(text.substr(1));
+    return both.size() == 2 && first.size() == 1 && second.size() == 1 &&
+           both[0].primary == second[0].primary && both[1].primary == first[0].primary;
+  }
+
+  void add_contraction(const Text& text) {
     if (text.size() != 2) return note("contraction of more than two characters", text);
-    if (own_element && drafted.elements.size() == 2 && !drafted.cut) {
+    Draft drafted = draft(text);
+    if (is_turned_around(text)) {
       const uint32_t both = static_cast<uint32_t>(text[0]) << 16 | text[1];
       drafted.elements[0].primary = {Primary::kContraction, both};
       drafted.elements.pop_back();
@@ -469,7 +478,7 @@ class Importer {
   std::map<uint32_t, unsigned> ideographs_;  ///< by ICU's weight
   std::map<Weights, unsigned> syllables_;    ///< by the weights of their letters
   Text first_ideograph_;                     ///< in ICU's order
-  uint32_t first_primary_ = 0;               ///< its weight
+  uint32_t first_ideograph_weight_ = 0;      ///< its weight
   std::map<char16_t, Draft> characters_;
   std::map<Text, Draft> contractions_;
   std::map<Primary, Text> primaries_;  ///< with a text that has this weight alone, empty where there is none
