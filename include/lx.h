@@ -40,7 +40,9 @@
 #include "lx/locale.h"
 #include "lx/map.h"
 #include "lx/native.h"
+#include "lx/number.h"
 #include "lx/object.h"
 #include "lx/string.h"
+#include "lx/time.h"
 
 #endif

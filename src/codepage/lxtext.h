@@ -320,15 +320,17 @@ struct UnicodeWriter {
 /// where the codepage has them, as the Ex forms do.
 enum class Form { kPlain, kEx };
 
-/// A reader like another one, over another text.
+/// A reader like another one, over another text. Made of its parts: a copy of what was just stored in parts
+/// would wait for the stores.
 template <class Reader>
-Reader read_like(const Reader& first, const typename Reader::Unit* text, size_t units,
-                 [[maybe_unused]] LXShiftState state) {
-  Reader second(first);
-  second.p = text;
-  second.end = text + units;
-  if constexpr (std::is_same_v<Reader, ShiftReader>) second.state = state;
-  return second;
+inline Reader read_like(const Reader& first, const typename Reader::Unit* text, size_t units,
+                        [[maybe_unused]] LXShiftState state) {
+  if constexpr (std::is_same_v<Reader, UnicodeReader>)
+    return {text, text + units};
+  else if constexpr (std::is_same_v<Reader, ShiftReader>)
+    return {first.cp, text, text + units, state};
+  else
+    return {first.cp, text, text + units};
 }
 
 /// Calls `body` with the reader of a byte text.

@@ -29,25 +29,27 @@ constexpr uint32_t kTruncation = 0x00800000u | LX_WIDTH_INSENSITIVE;
 template <class Reader>
 struct Side {
   lx::Elements<Reader> elements;
-  Element element{};
-  LXWeights second{};
+  Element element;
+  Element second;
   bool pending = false;  // the second set of an expansion
   bool needs = true;     // an element
 
   Side(const Sort& sort, const Reader& text) : elements(sort, text) {}
 
   bool used_up() const { return !pending && elements.at_end(); }
-  uint16_t primary() const { return element.weights.primary; }
-  bool inserts() const { return primary() != 0 && (element.char_class & LX_APPEND_PRIMARY) == 0; }
+  int32_t primary() const { return static_cast<int32_t>(element.primary()); }
+  bool inserts() const { return primary() != 0 && (element.char_class() & LX_APPEND_PRIMARY) == 0; }
   void take(const Sort& sort) {
     if (pending) {
-      element.weights = second;
+      element = second;
       pending = false;
       return;
     }
     element = elements.next();
-    pending = element.sets == 2;
-    if (pending) sort.expand(element, &element.weights, &second);
+    pending = element.sets() == 2;
+    if (!pending) return;
+    second = sort.second_set(element);
+    element = sort.first_set(element);
   }
   /// Whether a primary is left.
   bool has_primary_left(const Sort& sort) {
@@ -112,19 +114,31 @@ int32_t compare_specials(const Level<lx::PlacedSpecial>& a, const Level<lx::Plac
   return (a.count() > b.count()) - (a.count() < b.count());
 }
 
+/// Whether the levels of both texts have room; `chars` characters each at most.
+struct LevelSpace {
+  lx::WorkBuffer first;
+  lx::WorkBuffer second;
+
+  LevelSpace(size_t chars1, size_t chars2) : first(bytes_for(chars1)), second(bytes_for(chars2)) {}
+  explicit operator bool() const { return first && second; }
+
+ private:
+  static size_t bytes_for(size_t chars) {
+    return Levels::bytes_for(chars <= Levels::kMostChars ? chars : Levels::kMostChars);
+  }
+};
+
 template <class Reader>
 int32_t compare_levels(const Sort& sort, const Reader& text1, const Reader& text2, bool primaries,
                        int32_t* code) {
-  const lx::LevelCounts counts1 = lx::count_weights(sort, text1);
-  const lx::LevelCounts counts2 = lx::count_weights(sort, text2);
-  const size_t bytes1 = (counts1.bytes() + 1) & ~size_t{1};
-  const lx::WorkBuffer space(bytes1 + counts2.bytes());
-  if (!space) {
-    *code = LX_E_MEMORY;
-    return 0;
-  }
-  const Levels a(sort, text1, counts1, space.as<uint8_t>());
-  const Levels b(sort, text2, counts2, space.as<uint8_t>() + bytes1);
+  const size_t chars1 = lx::room(text1.p, text1.end);
+  const size_t chars2 = lx::room(text2.p, text2.end);
+  const LevelSpace space(chars1, chars2);
+  *code = LX_E_MEMORY;
+  if (!space || chars1 > Levels::kMostChars || chars2 > Levels::kMostChars) return 0;
+  *code = LX_OK;
+  const Levels a(sort, text1, chars1, space.first.as<uint8_t>());
+  const Levels b(sort, text2, chars2, space.second.as<uint8_t>());
   if (primaries)
     if (const int32_t difference = compare_primaries(a.primaries, b.primaries)) return difference;
   if (const int32_t difference = compare_bytes(a.secondaries, b.secondaries)) return difference;
@@ -132,24 +146,149 @@ int32_t compare_levels(const Sort& sort, const Reader& text1, const Reader& text
   return compare_specials(a.specials, b.specials);
 }
 
+/// Compares the weights of one level that are not 0, in the order of the texts: the shorter of two equal
+/// beginnings is less. `weight_of(set, position)` is 0 for none.
+template <class Reader, class WeightOf>
+int32_t compare_appended(const Sort& sort, const Reader& text1, const Reader& text2, WeightOf weight_of) {
+  lx::WeightSets<Reader> a(sort, text1);
+  lx::WeightSets<Reader> b(sort, text2);
+  const auto next = [&](lx::WeightSets<Reader>& sets) {
+    Element set;
+    while (sets.next(&set))
+      if (const int64_t weight = weight_of(set, sets.position())) return weight;
+    return int64_t{0};
+  };
+  for (;;) {
+    const int64_t weight1 = next(a);
+    const int64_t weight2 = next(b);
+    if (weight1 == weight2 && weight1 != 0) continue;
+    if (weight1 == 0 || weight2 == 0) return (weight1 != 0) - (weight2 != 0);
+    const int64_t difference = weight1 - weight2;
+    return static_cast<int32_t>(difference > INT32_MAX ? 1 : difference < -INT32_MAX ? -1 : difference);
+  }
+}
+
+/// How many units two texts begin with alike.
+template <class Unit>
+size_t equal_units(const Unit* a, const Unit* b, size_t most) {
+  constexpr size_t kWord = sizeof(uint64_t) / sizeof(Unit);
+  size_t n = 0;
+  if constexpr (kWord > 1)
+    while (most - n >= kWord && memcmp(a + n, b + n, sizeof(uint64_t)) == 0) n += kWord;
+  while (n < most && a[n] == b[n]) ++n;
+  return n;
+}
+
+/// Whether a character begins at `n`, as far as the bytes before it tell: none of them can begin one that goes
+/// on there.
 template <class Reader>
-int32_t compare_keys(const Sort& sort, const Reader& text1, const Reader& text2, int32_t* code) {
-  const lx::LevelCounts counts[] = {lx::count_weights(sort, text1), lx::count_weights(sort, text2)};
-  const lx::WorkBuffer space1(counts[0].bytes());
-  const lx::WorkBuffer space2(counts[1].bytes());
+bool surely_begins(const Reader& in, size_t n) {
+  for (size_t back = 1; back < lx::kMaxCharBytes && back <= n; ++back)
+    if (in.cp.length(in.p[n - back]) > back) return false;
+  return true;
+}
+
+/// How many of the first `units` units are whole characters.
+template <class Reader>
+size_t whole_units(const Reader& in, size_t units) {
+  if constexpr (Reader::kOneUnit) {
+    return units;
+  } else {
+    for (size_t n = units; n + lx::kMaxCharBytes > units && n > 0; --n)
+      if (surely_begins(in, n)) return n;
+    size_t n = 0;
+    for (size_t length = 0; n < units && (length = in.cp.length(in.p[n])) <= units - n;) n += length;
+    return n;
+  }
+}
+
+/// How many units both texts begin with alike, up to a place that no element reaches over.
+template <class Reader>
+size_t equal_beginning(const Sort& sort, const Reader& text1, const Reader& text2) {
+  if constexpr (std::is_same_v<Reader, lx::ShiftReader>)
+    return 0;  // equal bytes say nothing without their state
+  const size_t units1 = lx::room(text1.p, text1.end);
+  const size_t units2 = lx::room(text2.p, text2.end);
+  const size_t equal = equal_units(text1.p, text2.p, lx::least(units1, units2));
+  if (equal == 0) return 0;
+  const size_t whole = whole_units(text1, equal);
+  if (whole == 0 || sort.pair_count == 0) return whole;
+  const size_t last = whole_units(text1, whole - 1);
+  LXUChar u = 0;
+  lx::read_like(text1, text1.p + last, whole - last, LX_SHIFT_SINGLE).next(&u);
+  if (!sort.element(u).starts_pair()) return whole;
+  const auto reaches_on = [&](const Reader& text, size_t units) {
+    LXUChar next = 0;
+    Element pair;
+    return lx::read_like(text, text.p + whole, units - whole, LX_SHIFT_SINGLE).next(&next) &&
+           sort.pair(u, next, &pair);
+  };
+  return reaches_on(text1, units1) || reaches_on(text2, units2) ? 0 : whole;
+}
+
+/// The keys of two texts of at most `chars1` and `chars2` characters, compared.
+template <class Reader>
+int32_t compare_keys(const Sort& sort, const Reader& text1, size_t chars1, const Reader& text2, size_t chars2,
+                     int32_t* code) {
+  const LevelSpace space(chars1, chars2);
   *code = LX_E_MEMORY;
-  if (!space1 || !space2) return 0;
-  const lx::Key key1(sort, text1, counts[0], space1.as<uint8_t>());
-  const lx::Key key2(sort, text2, counts[1], space2.as<uint8_t>());
-  const lx::WorkBuffer bytes1(key1.bytes());
-  const lx::WorkBuffer bytes2(key2.bytes());
-  if (!bytes1 || !bytes2) return 0;
-  key1.write(bytes1.as<uint8_t>());
-  key2.write(bytes2.as<uint8_t>());
+  if (!space || chars1 > Levels::kMostChars || chars2 > Levels::kMostChars) return 0;
   *code = LX_OK;
-  const int32_t difference =
-      memcmp(bytes1.as<void>(), bytes2.as<void>(), lx::least(key1.bytes(), key2.bytes()));
-  return difference != 0 ? difference : (key1.bytes() > key2.bytes()) - (key1.bytes() < key2.bytes());
+  uint8_t* const bytes1 = space.first.as<uint8_t>();
+  uint8_t* const bytes2 = space.second.as<uint8_t>();
+  const lx::Key key1(sort, text1, chars1, bytes1);
+  const lx::Key key2(sort, text2, chars2, bytes2);
+  const size_t size1 = key1.bytes();
+  const size_t size2 = key2.bytes();
+  key1.write(bytes1);
+  key2.write(bytes2);
+  const int32_t difference = memcmp(bytes1, bytes2, lx::least(size1, size2));
+  return difference != 0 ? difference : (size1 > size2) - (size1 < size2);
+}
+
+/// Compares texts that begin alike: `rest1` and `rest2` are what follows.
+template <class Reader>
+[[gnu::noinline]] int32_t compare_rest(const Sort& sort, const Reader& text1, const Reader& text2,
+                                       const Reader& rest1, const Reader& rest2, int32_t* code) {
+  if (rest1.p == rest1.end && rest2.p == rest2.end) return 0;
+  const auto compare = [&](auto weight_of) { return compare_appended(sort, rest1, rest2, weight_of); };
+  if (const int32_t difference = compare([](const Element& set, uint16_t) { return set.primary(); }))
+    return difference;
+  if (!sort.appends_all) return compare_levels(sort, text1, text2, false, code);
+  if (const int32_t difference = compare([](const Element& set, uint16_t) { return set.secondary(); }))
+    return difference;
+  if (const int32_t difference = compare([](const Element& set, uint16_t) { return set.tertiary(); }))
+    return difference;
+  // From the start: positions count modulo 65,536.
+  return compare_appended(sort, text1, text2, [](const Element& set, uint16_t position) {
+    return set.special() != 0 ? int64_t{position} << 16 | set.special() : 0;
+  });
+}
+
+template <class Reader>
+[[gnu::noinline]] int32_t compare_inserted(const Sort& sort, const Reader& text1, const Reader& text2,
+                                           int32_t* code) {
+  bool inserted = false;
+  const int32_t difference = compare_directly(sort, text1, text2, &inserted);
+  return difference != 0 ? difference : compare_levels(sort, text1, text2, inserted, code);
+}
+
+/// Compares by the weights alone. Most texts are told apart by the first character that differs.
+template <class Reader>
+int32_t compare_weights(const Sort& sort, const Reader& text1, const Reader& text2, int32_t* code) {
+  if (!sort.appends_primaries) return compare_inserted(sort, text1, text2, code);
+  const size_t equal = equal_beginning(sort, text1, text2);
+  const auto rest = [equal](const Reader& text) {
+    LXShiftState state = LX_SHIFT_SINGLE;
+    if constexpr (std::is_same_v<Reader, lx::ShiftReader>) state = text.state;
+    return lx::read_like(text, text.p + equal, lx::room(text.p, text.end) - equal, state);
+  };
+  const Element x = lx::Elements<Reader>(sort, rest(text1)).next();
+  const Element y = lx::Elements<Reader>(sort, rest(text2)).next();
+  const bool decided =
+      x.sets() == 1 && y.sets() == 1 && x.primary() != 0 && y.primary() != 0 && x.primary() != y.primary();
+  if (decided) return static_cast<int32_t>(x.primary()) - static_cast<int32_t>(y.primary());
+  return compare_rest(sort, text1, text2, rest(text1), rest(text2), code);
 }
 
 /// Compares two texts of one kind by the locale's sort, as `options` ask.
@@ -157,19 +296,16 @@ template <class Reader>
 int32_t collate(const LXLocale& locale, const Reader& text1, const Reader& text2, uint32_t options,
                 int32_t* code) {
   const Sort& sort = lx::sort_of(*locale.sort);
+  if (options == 0) return compare_weights(sort, text1, text2, code);
   Fold fold;
   if (!lx::fold_of(options, &fold)) {
     *code = LX_E_INVALID;
     return 0;
   }
-  if (fold != Fold::kNone) {
-    const lx::Folding folding(locale, fold);
-    return compare_keys(sort, lx::FoldReader<Reader>{folding, text1}, lx::FoldReader<Reader>{folding, text2},
-                        code);
-  }
-  bool inserted = false;
-  if (const int32_t difference = compare_directly(sort, text1, text2, &inserted)) return difference;
-  return compare_levels(sort, text1, text2, inserted, code);
+  const lx::Folding folding(locale, fold);
+  const auto chars = [&](const Reader& text) { return folding.most_chars(lx::room(text.p, text.end)); };
+  return compare_keys(sort, lx::FoldReader<Reader>{folding, text1}, chars(text1),
+                      lx::FoldReader<Reader>{folding, text2}, chars(text2), code);
 }
 
 /// A byte text that a collation function was given.

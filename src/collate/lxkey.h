@@ -24,6 +24,9 @@ struct Folding {
   uint16_t unicode(LXUChar u) const { return u; }
   uint16_t folded(LXWChar code) const;
   uint16_t folded(LXUChar u) const;
+
+  /// How many characters a text of `units` units can have when it is folded.
+  size_t most_chars(size_t units) const { return specials.count != 0 ? 2 * units : units; }
 };
 
 /// Reads a text folded: a special mapping of a character, or else of it and its successor, takes their place.
@@ -92,12 +95,12 @@ auto read_folded(const Folding& folding, const In& in, Body&& body) {
 class Key {
  public:
   template <class Reader>
-  Key(const Sort& sort, const Reader& text, const LevelCounts& counts, uint8_t* space)
-      : levels_(sort, text, counts, space) {
+  Key(const Sort& sort, const Reader& text, size_t chars, uint8_t* space) : levels_(sort, text, chars, space) {
     trim(sort);
   }
 
   size_t bytes() const;
+  /// `output` may be the space of the levels, or stand before it.
   void write(uint8_t* output) const;
 
  private:

@@ -38,57 +38,35 @@ struct PlacedSpecial {
   uint16_t weight;
 };
 
-/// How many weights a text has on each level.
-struct LevelCounts {
-  size_t primaries = 0, secondaries = 0, tertiaries = 0, specials = 0;
-
-  void add(const LXWeights& w) {
-    primaries += w.primary != 0;
-    secondaries += w.secondary != 0;
-    tertiaries += w.tertiary != 0;
-    specials += w.special != 0;
-  }
-  size_t bytes() const {
-    return sizeof(PlacedSpecial) * specials + sizeof(uint16_t) * primaries + secondaries + tertiaries;
-  }
-};
-
-/// Gives `visit(weights, class, position)` every weight set of a text.
-template <class Reader, class Visit>
-void visit_weights(const Sort& sort, const Reader& text, Visit visit) {
-  for (Elements<Reader> elements(sort, text); !elements.at_end();) {
-    const Element element = elements.next();
-    if (element.sets == 1) visit(element.weights, element.char_class, elements.position());
-    if (element.sets != 2) continue;
-    LXWeights first, second;
-    sort.expand(element, &first, &second);
-    visit(first, element.char_class, elements.position());
-    visit(second, element.char_class, elements.position());
-  }
-}
-
-template <class Reader>
-LevelCounts count_weights(const Sort& sort, const Reader& text) {
-  LevelCounts counts;
-  visit_weights(sort, text, [&](const LXWeights& w, unsigned, uint16_t) { counts.add(w); });
-  return counts;
-}
-
-/// The four levels of a text, in a space of LevelCounts::bytes() aligned to 2 bytes.
+/// The four levels of a text of at most `chars` characters, in a space of bytes_for(chars) bytes that is
+/// aligned to 4 bytes. The levels stand in the order of a key, a byte between two of them, so that one can be
+/// made of them in place.
 struct Levels {
-  Level<PlacedSpecial> specials;
   Level<uint16_t> primaries;
   Level<uint8_t> secondaries;
   Level<uint8_t> tertiaries;
+  Level<PlacedSpecial> specials;
+
+  // A character has up to two weight sets, or one special weight.
+  static constexpr size_t kPrimaryBytes = 2 * sizeof(uint16_t);
+  static constexpr size_t kByteLevelBytes = 2;
+  static constexpr size_t kLevelBytes = kPrimaryBytes + 2 * kByteLevelBytes;
+  static constexpr size_t kSeparators = 3;
+
+  static constexpr size_t specials_at(size_t chars) {
+    return (chars * kLevelBytes + kSeparators + 3) & ~size_t{3};
+  }
+  static constexpr size_t bytes_for(size_t chars) { return specials_at(chars) + chars * sizeof(PlacedSpecial); }
+  static constexpr size_t kMostChars = INT32_MAX / (2 * (kLevelBytes + sizeof(PlacedSpecial)));
 
   template <class Reader>
-  Levels(const Sort& sort, const Reader& text, const LevelCounts& counts, uint8_t* space)
-      : specials(space),
-        primaries(specials.begin + counts.specials),
-        secondaries(primaries.begin + counts.primaries),
-        tertiaries(secondaries.begin + counts.secondaries) {
-    visit_weights(sort, text,
-                  [this](const LXWeights& w, unsigned c, uint16_t position) { place(w, c, position); });
+  Levels(const Sort& sort, const Reader& text, size_t chars, uint8_t* space)
+      : primaries(space),
+        secondaries(space + chars * kPrimaryBytes + 1),
+        tertiaries(secondaries.begin + chars * kByteLevelBytes + 1),
+        specials(space + specials_at(chars)) {
+    WeightSets<Reader> sets(sort, text);
+    for (Element set; sets.next(&set);) place(set, sets.position());
     primaries.close_run();
     secondaries.close_run();
     tertiaries.close_run();
@@ -96,11 +74,14 @@ struct Levels {
   }
 
  private:
-  void place(const LXWeights& w, unsigned char_class, uint16_t position) {
-    if (w.primary != 0) primaries.add(w.primary, (char_class & LX_APPEND_PRIMARY) != 0);
-    if (w.secondary != 0) secondaries.add(w.secondary, (char_class & LX_APPEND_SECONDARY) != 0);
-    if (w.tertiary != 0) tertiaries.add(w.tertiary, (char_class & LX_APPEND_TERTIARY) != 0);
-    if (w.special != 0) specials.add({position, w.special}, (char_class & LX_APPEND_SPECIAL) != 0);
+  void place(const Element& set, uint16_t position) {
+    const auto appends = [&](unsigned bit) { return (set.char_class() & bit) != 0; };
+    if (set.primary() != 0) primaries.add(static_cast<uint16_t>(set.primary()), appends(LX_APPEND_PRIMARY));
+    if (set.secondary() != 0)
+      secondaries.add(static_cast<uint8_t>(set.secondary()), appends(LX_APPEND_SECONDARY));
+    if (set.tertiary() != 0) tertiaries.add(static_cast<uint8_t>(set.tertiary()), appends(LX_APPEND_TERTIARY));
+    if (set.special() != 0)
+      specials.add({position, static_cast<uint16_t>(set.special())}, appends(LX_APPEND_SPECIAL));
   }
 };
 

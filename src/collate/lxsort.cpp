@@ -1,6 +1,8 @@
 // Sort objects: validation and derivation when one is loaded, and the weights of characters and pairs.
 #include "collate/lxsort.h"
 
+#include <cstring>
+
 #include "core/lxmemory.h"
 #include "core/lxobjtypes.h"
 
@@ -10,6 +12,7 @@ namespace fmt = lx::format::sort;
 using lx::Bytes;
 using lx::Element;
 using lx::le16;
+using lx::Pair;
 using lx::Sort;
 
 constexpr size_t kPages = 256;
@@ -23,16 +26,12 @@ bool is_table(uint8_t flags) {
 }
 
 /// A weight of a table or contraction record.
-Element element_of(const uint8_t* record) {
+Element element_of(const uint8_t* record, unsigned sets = 1) {
   const uint16_t flags = le16(record + 4);
-  Element element{};
-  element.sets = 1;
-  element.char_class = (flags & fmt::kWeightClass) >> fmt::kWeightClassShift & 0xF;
-  if ((flags & fmt::kWeightSpecial) != 0)
-    element.weights.special = le16(record);
-  else
-    element.weights = {le16(record), record[2], record[3], 0};
-  return element;
+  const bool special = (flags & fmt::kWeightSpecial) != 0;
+  const LXWeights weights =
+      special ? LXWeights{0, 0, 0, le16(record)} : LXWeights{le16(record), record[2], record[3], 0};
+  return Element(weights, sets, (flags & fmt::kWeightClass) >> fmt::kWeightClassShift);
 }
 
 const uint8_t* table_record(const uint8_t* payload, LXUChar u) {
@@ -46,11 +45,23 @@ bool is_expansion(const uint8_t* record) {
 /// An expansion has no weights until its record is found.
 Element table_element(const uint8_t* payload, LXUChar u) {
   const uint8_t* record = table_record(payload, u);
-  return is_expansion(record) ? Element{} : element_of(record);
+  return is_expansion(record) ? Element() : element_of(record);
 }
 
-bool inserts_primary(const Element& element) {
-  return element.sets != 0 && (element.char_class & LX_APPEND_PRIMARY) == 0;
+/// Notes what an element of one set inserts. Only weights that it has count.
+void note_set(Sort* sort, const Element& set) {
+  const auto inserts = [&](uint32_t weight, unsigned bit) {
+    return weight != 0 && (set.char_class() & bit) == 0;
+  };
+  if (inserts(set.primary(), LX_APPEND_PRIMARY)) sort->appends_primaries = false;
+  if (inserts(set.primary(), LX_APPEND_PRIMARY) || inserts(set.secondary(), LX_APPEND_SECONDARY) ||
+      inserts(set.tertiary(), LX_APPEND_TERTIARY) || inserts(set.special(), LX_APPEND_SPECIAL))
+    sort->appends_all = false;
+}
+void note_insertion(Sort* sort, const Element& element) {
+  if (element.sets() != 2) return note_set(sort, element);
+  note_set(sort, sort->first_set(element));
+  note_set(sort, sort->second_set(element));
 }
 
 /// The pages that are laid flat: those of the weight table, and those where a pair begins.
@@ -68,51 +79,82 @@ Element& flat_element(const Sort& sort, LXUChar u) {
   return const_cast<Element&>(sort.pages[u >> 8].elements[u & 0xFF]);
 }
 
-void fill(Sort* sort, Element* elements, const bool (&flat)[kPages]) {
+void fill_pages(Sort* sort, Element* elements, const bool (&flat)[kPages]) {
   const uint8_t* payload = sort->payload;
-  sort->appends_primaries = true;
   for (size_t number = 0; number < kPages; ++number) {
     const uint8_t* entry = page_at(payload, number);
     Sort::Page& page = sort->pages[number];
     page = {nullptr, entry[0], entry[1], le16(entry + 2)};
     const bool computed = !is_table(page.flags);
-    if (computed && inserts_primary(Sort::computed(page, 0))) sort->appends_primaries = false;
+    // Of a whole page some character has a weight, whatever its base.
+    if (computed) note_insertion(sort, Sort::computed(page, 0));
+    if (computed) note_insertion(sort, Sort::computed(page, 1));
     if (!flat[number]) continue;
     for (size_t low = 0; low < kPageElements; ++low) {
       const auto u = static_cast<LXUChar>(number << 8 | low);
       elements[low] = computed ? Sort::computed(page, u) : table_element(payload, u);
-      if (inserts_primary(elements[low])) sort->appends_primaries = false;
+      note_insertion(sort, elements[low]);
     }
     page.elements = elements;
     elements += kPageElements;
   }
+}
+
+void fill_expansions(Sort* sort) {
+  const uint8_t* payload = sort->payload;
   // From the back: of several records of a character the first counts.
   for (size_t i = le16(payload + fmt::kExpansionCount); i-- > 0;) {
     const LXUChar u = le16(sort->expansions + fmt::kExpansionBytes * i);
     if (!is_table(sort->pages[u >> 8].flags) || !is_expansion(table_record(payload, u))) continue;
-    Element& element = flat_element(*sort, u);
-    element = element_of(table_record(payload, u));
-    element.sets = 2;
-    element.weights.special = static_cast<uint16_t>(i);
-    if (inserts_primary(element)) sort->appends_primaries = false;
+    const Element pointing = element_of(table_record(payload, u));
+    const Element element({0, 0, 0, static_cast<uint16_t>(i)}, 2, pointing.char_class());
+    flat_element(*sort, u) = element;
+    note_insertion(sort, element);
   }
-  const uint8_t* record = sort->contractions;
-  for (size_t i = 0; i < sort->contraction_count; ++i, record += fmt::kContractionBytes) {
-    flat_element(*sort, le16(record)).starts_pair = 1;
-    if (inserts_primary(element_of(record + 4))) sort->appends_primaries = false;
+}
+
+/// The place of a pair among those in order, or where it belongs.
+size_t place_of(const Pair* pairs, size_t count, uint32_t characters) {
+  size_t low = 0;
+  size_t high = count;
+  while (low < high) {
+    const size_t middle = low + (high - low) / 2;
+    if (pairs[middle].characters < characters)
+      low = middle + 1;
+    else
+      high = middle;
+  }
+  return low;
+}
+
+void fill_pairs(Sort* sort, Pair* pairs) {
+  const uint8_t* record = sort->payload + le16(sort->payload + fmt::kContractions);
+  const size_t count = le16(sort->payload + fmt::kContractionCount);
+  sort->pairs = pairs;
+  for (size_t i = 0; i < count; ++i, record += fmt::kContractionBytes) {
+    const LXUChar first = le16(record);
+    const LXUChar second = le16(record + 2);
+    const uint32_t characters = static_cast<uint32_t>(first) << 16 | second;
+    const size_t place = place_of(pairs, sort->pair_count, characters);
+    if (place < sort->pair_count && pairs[place].characters == characters) continue;  // the first counts
+    memmove(pairs + place + 1, pairs + place, (sort->pair_count - place) * sizeof(Pair));
+    pairs[place] = {characters, element_of(record + 4)};
+    ++sort->pair_count;
+    note_insertion(sort, pairs[place].element);
+    flat_element(*sort, first).set_starts_pair();
+    sort->second_bits[(second & 0xFF) / 32] |= 1u << second % 32;
   }
 }
 
 /// Gives what a public look-up found to its caller.
 int32_t give(const Sort& sort, const Element& element, LXWeights* first, LXWeights* second,
              uint8_t* char_class) {
-  if (element.sets == 0) return 0;
-  *char_class = element.char_class;
-  if (element.sets == 1)
-    *first = element.weights;
-  else
-    sort.expand(element, first, second);
-  return element.sets;
+  const unsigned sets = element.sets();
+  if (sets == 0) return 0;
+  *char_class = static_cast<uint8_t>(element.char_class());
+  *first = sets == 2 ? sort.first_set(element).weights() : element.weights();
+  if (sets == 2) *second = sort.second_set(element).weights();
+  return static_cast<int32_t>(sets);
 }
 
 }  // namespace
@@ -140,26 +182,29 @@ void* derive_sort(Bytes bytes) {
   const uint8_t* payload = bytes.data;
   bool flat[kPages];
   const size_t pages = flat_pages(payload, flat);
-  auto* sort = static_cast<Sort*>(hook_allocate(sizeof(Sort) + pages * kPageElements * sizeof(Element)));
+  const size_t pairs = le16(payload + fmt::kContractionCount);
+  auto* sort = static_cast<Sort*>(
+      hook_allocate_zeroed(sizeof(Sort) + pairs * sizeof(Pair) + pages * kPageElements * sizeof(Element)));
   if (sort == nullptr) return nullptr;
   sort->payload = payload;
-  sort->contractions = payload + le16(payload + fmt::kContractions);
   sort->expansions = payload + le16(payload + fmt::kExpansions);
-  sort->contraction_count = le16(payload + fmt::kContractionCount);
   sort->default_secondary = payload[fmt::kDefaultSecondary];
   sort->default_tertiary = payload[fmt::kDefaultTertiary];
-  fill(sort, reinterpret_cast<Element*>(sort + 1), flat);
+  sort->appends_primaries = true;
+  sort->appends_all = true;
+  auto* const first_pair = reinterpret_cast<Pair*>(sort + 1);
+  fill_pages(sort, reinterpret_cast<Element*>(first_pair + pairs), flat);
+  fill_expansions(sort);
+  fill_pairs(sort, first_pair);
   return sort;
 }
 
-bool Sort::pair(LXUChar first, LXUChar second, Element* element) const {
-  const uint8_t* record = contractions;
-  for (size_t i = 0; i < contraction_count; ++i, record += fmt::kContractionBytes)
-    if (le16(record) == first && le16(record + 2) == second) {
-      *element = element_of(record + 4);
-      return true;
-    }
-  return false;
+bool Sort::find_pair(LXUChar first, LXUChar second, Element* element) const {
+  const uint32_t characters = static_cast<uint32_t>(first) << 16 | second;
+  const size_t place = place_of(pairs, pair_count, characters);
+  if (place == pair_count || pairs[place].characters != characters) return false;
+  *element = pairs[place].element;
+  return true;
 }
 
 }  // namespace lx

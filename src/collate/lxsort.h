@@ -8,24 +8,52 @@
 
 namespace lx {
 
-/// What a character weighs. `sets`: how many weight sets it has; of two, the expansion table holds both.
-struct Element {
-  LXWeights weights;              // of two sets: `special` is the number of the expansion record
-  unsigned char sets : 2;         // 0: the character is ignored
-  unsigned char starts_pair : 1;  // some contraction begins with it
-  unsigned char char_class : 4;   // LX_APPEND_ bits
-};
-static_assert(sizeof(Element) == 8, "one load an element");
+/// What a character weighs, in one word: the weights of one level each, how many weight sets there are, whether
+/// some contraction begins with the character, and its class. Of two sets the expansion table holds both; the
+/// special weight is then the number of the record.
+class Element {
+ public:
+  Element() = default;
+  Element(const LXWeights& w, unsigned sets, unsigned char_class)
+      : bits_(w.primary | uint64_t{w.secondary} << 16 | uint64_t{w.tertiary} << 24 | uint64_t{w.special} << 32 |
+              uint64_t{sets} << 48 | uint64_t{char_class & 0xF} << 52) {}
 
-/// Derived data of a sort object, one block with the elements behind it.
+  uint32_t primary() const { return static_cast<uint16_t>(bits_); }
+  uint32_t secondary() const { return static_cast<uint8_t>(bits_ >> 16); }
+  uint32_t tertiary() const { return static_cast<uint8_t>(bits_ >> 24); }
+  uint32_t special() const { return static_cast<uint16_t>(bits_ >> 32); }
+  LXWeights weights() const {
+    return {static_cast<uint16_t>(primary()), static_cast<uint8_t>(secondary()),
+            static_cast<uint8_t>(tertiary()), static_cast<uint16_t>(special())};
+  }
+  unsigned sets() const { return bits_ >> 48 & 3; }  // 0: the character is ignored
+  bool starts_pair() const { return (bits_ & kStartsPair) != 0; }
+  unsigned char_class() const { return bits_ >> 52 & 0xF; }  // LX_APPEND_ bits
+
+  void set_starts_pair() { bits_ |= kStartsPair; }
+
+ private:
+  static constexpr uint64_t kStartsPair = uint64_t{1} << 50;
+  uint64_t bits_ = 0;
+};
+
+/// Two characters that sort as one element.
+struct Pair {
+  uint32_t characters;  // the first one in the upper half
+  Element element;
+};
+
+/// Derived data of a sort object, one block with the pairs and elements behind it.
 struct Sort {
   const uint8_t* payload;
-  const uint8_t* contractions;
   const uint8_t* expansions;
-  size_t contraction_count;
+  const Pair* pairs;  // in ascending order, each once
+  size_t pair_count;
+  uint32_t second_bits[8];  // by low byte, the characters that stand second in a pair
   uint8_t default_secondary;
   uint8_t default_tertiary;
   bool appends_primaries;  // no character inserts its primary ahead of others
+  bool appends_all;        // ... nor any other weight
   struct Page {
     const Element* elements;  // 256; null: computed from the fields below
     uint8_t flags;
@@ -33,34 +61,35 @@ struct Sort {
     uint16_t base;
   } pages[256];
 
-  Element element(LXUChar u) const {
+  [[gnu::always_inline]] Element element(LXUChar u) const {
     const Page& page = pages[u >> 8];
     if (page.elements != nullptr) return page.elements[u & 0xFF];
     return computed(page, u);
   }
 
   static Element computed(const Page& page, LXUChar u) {
-    Element element{};
-    if ((page.flags & format::sort::kPageUncovered) != 0) return element;
+    if ((page.flags & format::sort::kPageUncovered) != 0) return Element();
     const auto weight = static_cast<uint16_t>(page.base + (u & 0xFF));
-    if ((page.flags & format::sort::kPagePrimary) != 0)
-      element.weights.primary = weight;
-    else
-      element.weights.special = weight;
-    element.sets = 1;
-    element.char_class = page.char_class & 0xF;
-    return element;
+    const bool primary = (page.flags & format::sort::kPagePrimary) != 0;
+    return Element(primary ? LXWeights{weight, 0, 0, 0} : LXWeights{0, 0, 0, weight}, 1, page.char_class);
   }
 
-  /// Both sets of an element that has two.
-  void expand(const Element& element, LXWeights* first, LXWeights* second) const {
-    const uint8_t* record = expansions + format::sort::kExpansionBytes * element.weights.special + 2;
-    *first = {le16(record), record[2], record[3], 0};
-    *second = {le16(record + 4), record[6], record[7], 0};
-  }
+  /// The sets of an element that has two, each as an element of one.
+  Element first_set(const Element& element) const { return set_of(element, 2); }
+  Element second_set(const Element& element) const { return set_of(element, 6); }
 
   /// The element of a pair: false when the pair is none.
-  bool pair(LXUChar first, LXUChar second, Element* element) const;
+  bool pair(LXUChar first, LXUChar second, Element* element) const {
+    const unsigned low = second & 0xFF;
+    return (second_bits[low / 32] >> low % 32 & 1) != 0 && find_pair(first, second, element);
+  }
+  bool find_pair(LXUChar first, LXUChar second, Element* element) const;
+
+ private:
+  Element set_of(const Element& element, size_t offset) const {
+    const uint8_t* w = expansions + format::sort::kExpansionBytes * element.special() + offset;
+    return Element(LXWeights{le16(w), w[2], w[3], 0}, 1, element.char_class());
+  }
 };
 
 /// The derived data of a loaded sort object.
@@ -92,16 +121,16 @@ class Elements {
   uint16_t position() const { return position_; }
 
   /// The next element; one without sets also stands for a character that the end of the text cuts.
-  Element next() {
+  [[gnu::always_inline]] Element next() {
     LXUChar u = ahead_;
     if (!has_ahead_ && !in_.next(&u)) {
       drop_rest(&in_);
-      return Element{};
+      return Element();
     }
     has_ahead_ = false;
     ++position_;
     const Element element = sort_.element(u);
-    if (!element.starts_pair || !in_.next(&ahead_)) return element;
+    if (!element.starts_pair() || !in_.next(&ahead_)) return element;
     Element pair;
     if (sort_.pair(u, ahead_, &pair)) {
       ++position_;
@@ -117,6 +146,38 @@ class Elements {
   uint16_t position_ = 0;
   bool has_ahead_ = false;
   LXUChar ahead_ = 0;
+};
+
+/// Walks the weight sets of a text, those of an expansion one after the other: elements of one set each.
+template <class Reader>
+class WeightSets {
+ public:
+  WeightSets(const Sort& sort, const Reader& in) : sort_(sort), elements_(sort, in) {}
+
+  uint16_t position() const { return elements_.position(); }
+
+  bool next(Element* set) {
+    if (pending_) {
+      pending_ = false;
+      *set = second_;
+      return true;
+    }
+    while (!elements_.at_end()) {
+      const Element element = elements_.next();
+      if (element.sets() == 0) continue;
+      pending_ = element.sets() == 2;
+      if (pending_) second_ = sort_.second_set(element);
+      *set = pending_ ? sort_.first_set(element) : element;
+      return true;
+    }
+    return false;
+  }
+
+ private:
+  const Sort& sort_;
+  Elements<Reader> elements_;
+  Element second_;
+  bool pending_ = false;
 };
 
 }  // namespace lx

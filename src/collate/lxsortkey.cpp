@@ -16,45 +16,49 @@ using lx::Fold;
 using lx::Folding;
 using lx::Form;
 using lx::Key;
+using lx::Levels;
 using lx::Sort;
 
 RAS1_Unit unit = RAS1_UNIT("lxsortkey");
 
 constexpr int32_t kEmptyKeyBytes = 3;
 
-/// Where the caller's buffer begins to be used: at a multiple of the alignment unit. Less than the whole size
-/// may be usable, and only that counts when the key is fitted in.
+/// The caller's buffer. It is used from a multiple of the alignment unit on: less than the whole size may be
+/// usable, and only that counts when the key is fitted in.
 struct Output {
   uint8_t* start;
   size_t size;
+  uint8_t* aligned;
   size_t usable;
 
   Output(uint8_t* output, int32_t given) : start(output), size(given > 0 ? static_cast<size_t>(given) : 0) {
-    const size_t unit_bytes = lx::globals.area->table_alignment;
-    const size_t shift = (0 - reinterpret_cast<uintptr_t>(output)) & (unit_bytes - 1);
+    const size_t shift = (0 - reinterpret_cast<uintptr_t>(output)) & (alignment() - 1);
+    aligned = output + shift;
     usable = size > shift ? size - shift : 0;
   }
-  bool is_work_area(size_t units) const {
-    constexpr size_t kLevelBytes = 8;  // of a unit: twice 2 + 1 + 1, and as much again for its specials
-    const size_t unit_bytes = lx::globals.area->table_alignment;
-    if (units > SIZE_MAX / (4 * kLevelBytes)) return false;
-    const size_t levels = (units * kLevelBytes + 3 + unit_bytes - 1) & ~(unit_bytes - 1);
-    return usable >= levels + units * kLevelBytes;
+  static size_t alignment() { return lx::globals.area->table_alignment; }
+
+  /// Whether it can be the work area for a text of `chars` characters. Callers rely on its rest being cleared
+  /// then; twice as much as the special level needs is asked for.
+  bool is_work_area(size_t chars) const {
+    const size_t levels =
+        (chars * Levels::kLevelBytes + Levels::kSeparators + alignment() - 1) & ~(alignment() - 1);
+    return usable >= levels + chars * 2 * sizeof(lx::PlacedSpecial);
   }
 };
 
-/// Makes the key of a text of at most `units` characters: its bytes, or -1 without memory.
+/// Makes the key of a text of at most `chars` characters: its bytes, or -1 without memory.
 template <class Reader>
-int32_t make_key(const Sort& sort, const Reader& text, size_t units, const Output& output) {
-  const lx::LevelCounts counts = lx::count_weights(sort, text);
-  const lx::WorkBuffer space(counts.bytes());
+int32_t make_key(const Sort& sort, const Reader& text, size_t chars, const Output& output) {
+  if (chars > Levels::kMostChars) return -1;
+  const bool in_place = output.is_work_area(chars);
+  const lx::WorkBuffer space(in_place ? 0 : Levels::bytes_for(chars));
   if (!space) return -1;
-  const Key key(sort, text, counts, space.as<uint8_t>());
+  const Key key(sort, text, chars, in_place ? output.aligned : space.as<uint8_t>());
   const size_t bytes = key.bytes();
-  if (bytes > INT32_MAX) return -1;
   if (bytes <= output.usable) {
     key.write(output.start);
-    if (output.is_work_area(units)) memset(output.start + bytes, 0, output.size - bytes);
+    if (in_place) memset(output.start + bytes, 0, output.size - bytes);
   }
   return static_cast<int32_t>(bytes);
 }
@@ -124,7 +128,7 @@ int32_t transform(LXLocale* given, uint8_t* output, int32_t size, const Unit* te
   const int32_t bytes = read(cp, units, [&](const auto& in) {
     return lx::read_folded(folding, in, [&](const auto& reader) {
       if (locale.sort != nullptr)
-        return make_key(lx::sort_of(*locale.sort), reader, units, Output(output, size));
+        return make_key(lx::sort_of(*locale.sort), reader, folding.most_chars(units), Output(output, size));
       return write_folded(reader, output, size,
                           [&](LXUChar u, uint8_t* p) { return store_character(cp, in, u, p); });
     });
@@ -184,10 +188,9 @@ void Key::trim(const Sort& sort) {
 }
 
 size_t Key::bytes() const {
-  constexpr size_t kSeparators = 3;
   const size_t special_bytes = sizeof(uint16_t) * (positions_ ? 2 : 1);
   return sizeof(uint16_t) * levels_.primaries.count() + levels_.secondaries.count() +
-         levels_.tertiaries.count() + special_bytes * levels_.specials.count() + kSeparators;
+         levels_.tertiaries.count() + special_bytes * levels_.specials.count() + Levels::kSeparators;
 }
 
 void Key::write(uint8_t* output) const {
@@ -198,7 +201,7 @@ void Key::write(uint8_t* output) const {
   for (const uint16_t* p = levels_.primaries.begin; p != levels_.primaries.end; ++p) put(*p);
   *output++ = 0;
   const auto put_level = [&](const Level<uint8_t>& level) {
-    memcpy(output, level.begin, level.count());
+    memmove(output, level.begin, level.count());
     output += level.count();
     *output++ = 0;
   };

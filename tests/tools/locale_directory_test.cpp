@@ -31,7 +31,11 @@ class DirectoryTest : public testing::Test {
             (std::string("lexicor-data-") + testing::UnitTest::GetInstance()->current_test_info()->name());
     fs::remove_all(root_);
     write_text(source() / "control.txt",
-               "language 1 English\nterritory 840 UnitedStates\ncodepage 819 Latin1\n");
+               "language 1 English\nterritory 840 UnitedStates\ncodepage 819 Latin1\nsort 1 Default\n");
+    write_text(source() / "sorts/Default.txt",
+               "@defaults 0001 0001\n0061 ; [.0200.0001.0001]\n0041 ; [.0200.0001.0002]\n"
+               "00E6 ; [.0200.0002.0001][.0201.0001.0001]\n0062 0063 ; [.0203.0001.0001]\n"
+               "@uncovered 0100..FFFF\n");
     write_text(source() / "alias.txt", "Latin1 L1\n");
     for (const char* file : {"languages/English.toml", "territories/UnitedStates.toml"}) {
       fs::create_directories((source() / file).parent_path());
@@ -79,7 +83,7 @@ TEST_F(DirectoryTest, SameBytesForTheSameSourcesAndNothingLeftBehind) {
   EXPECT_EQ(contents(), first);
   std::string names;
   for (const auto& file : first) names += file.first + " ";
-  EXPECT_EQ(names, "alias.txt control.nls cp_00819.nls la_00001.nls te_00840.nls ");
+  EXPECT_EQ(names, "alias.txt control.nls cp_00819.nls la_00001.nls so_00001.nls te_00840.nls ");
   EXPECT_TRUE(check_compiled_directory(out().string()).empty());
   EXPECT_TRUE(check_source_directory(source().string()).empty());
 }

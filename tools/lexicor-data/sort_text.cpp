@@ -3,6 +3,7 @@
 #include "sort_text.h"
 
 #include <algorithm>
+#include <cctype>
 #include <cstdio>
 #include <istream>
 #include <ostream>
@@ -530,7 +531,10 @@ void write_sort(std::ostream& out, const SortSource& sort) {
     if (entry.contraction) {
       out << ' ' << hex(entry.second);
       const std::string second = comment(entry.second);
-      shown = shown.empty() || second.empty() ? "" : shown + second;
+      if (shown.empty() || second.empty())
+        shown.clear();
+      else
+        shown += second;
     }
     out << " ; " << sets_text(*entry.element);
     if (!shown.empty()) out << " # " << shown;

@@ -84,7 +84,7 @@ LanguageSource import_language(const Language& row, const Control& control) {
   LanguageSource language;
   language.territory = default_id(control, ObjectType::kTerritory, row.territory);
   language.codepage = default_id(control, ObjectType::kCodepage, row.codepage);
-  const bool binary = !kDefaultSorts || std::string(row.sort) == "Binary";
+  const bool binary = std::string(row.sort) == "Binary";
   language.sort = binary ? 0 : default_id(control, ObjectType::kSort, row.sort);
   language.abbreviation = upper_code(row.locale);
   language.name = own_name(row.locale);

@@ -31,10 +31,6 @@ inline constexpr Territory kTerritories[] = {
 #include "territories.inc"
 };
 
-/// Whether languages have the sorts of the table as defaults: every one of them must then be in control.txt.
-/// Otherwise their default is binary order.
-inline constexpr bool kDefaultSorts = false;
-
 /// The locale as ICU takes it: Gregorian calendar and Latin digits, whatever its own are.
 inline std::string icu_locale(const std::string& locale) {
   return locale + "@calendar=gregorian;numbers=latn";

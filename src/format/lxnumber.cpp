@@ -1,0 +1,429 @@
+// Numbers and currency amounts as text. One algorithm in four forms: a number is made in units of the form, and
+// a writer of the form takes it, together with the texts that stand around an amount.
+#include <cstring>
+
+#include "core/lxcall.h"
+#include "format/lxnumbertext.h"
+
+namespace {
+
+namespace territory = lx::format::territory;
+using lx::bytes_of;
+using lx::Call;
+using lx::Codepage;
+using lx::codepage_of;
+using lx::DecimalDigits;
+using lx::FixedChars;
+using lx::Form;
+using lx::NumberForm;
+using lx::NumberText;
+using lx::NumberUnit;
+using lx::TextKind;
+
+RAS1_Unit unit = RAS1_UNIT("lxnumber");
+
+/// Where a text goes. `state` is the one it begins in, for the Ex forms.
+template <NumberForm kForm>
+struct Output {
+  NumberUnit<kForm>* buffer;
+  int32_t size;
+  uint32_t flags;
+  LXShiftState state = LX_SHIFT_SINGLE;
+
+  bool current() const { return (flags & LX_TERRITORY_VALUES) == 0; }
+  bool by_chars() const { return sizeof(*buffer) == 1 && (flags & LX_CHARACTERS) != 0; }
+  size_t nulls() const { return (flags & LX_TERMINATE) != 0 ? 1 : 0; }
+};
+
+/// A writer that never leaves a double-byte character without room for the Shift-In behind it.
+struct ClosedWriter {
+  lx::ShiftWriter out;
+  uint8_t* const end;
+
+  size_t put_count(const uint8_t* bytes, size_t count) {
+    size_t n = 0;
+    while (n < count && put(LXWChar{bytes[n]})) ++n;
+    return n;
+  }
+  bool put(LXUChar u) { return put(LXWChar{lx::unicode_to_code(out.cp, u)}); }
+  bool put(LXWChar code) {
+    const bool closing = lx::code_bytes(lx::without_zero_bytes(code)) > 1;
+    if (closing && out.p == end) return false;
+    out.end = end - closing;
+    return out.put(code);
+  }
+  uint8_t* close() {
+    if (out.state == LX_SHIFT_DOUBLE && out.p != end) *out.p++ = out.take_shift_byte();
+    return out.p;
+  }
+};
+
+template <class Writer>
+typename Writer::Unit* close(Writer& out) {
+  return out.p;
+}
+uint8_t* close(ClosedWriter& out) {
+  return out.close();
+}
+
+/// Writes single-unit characters: how many fit.
+template <class Writer>
+size_t put_units(Writer& out, const typename Writer::Unit* units, size_t count) {
+  const size_t n = lx::least(count, lx::room(out.p, out.end));
+  auto* const to = out.p;
+  for (size_t i = 0; i < n; ++i) to[i] = units[i];
+  out.p = to + n;
+  return n;
+}
+size_t put_units(ClosedWriter& out, const uint8_t* units, size_t count) {
+  return out.put_count(units, count);
+}
+
+/// False when the number did not fit.
+template <class Writer, class Unit>
+bool put_number(Writer& out, const NumberText<Unit>& number) {
+  if (put_units(out, number.begin(), number.units()) < number.units()) return false;
+  if (number.zeros() == 0) return true;
+  constexpr size_t kRun = 16;
+  Unit zeros[kRun];
+  for (Unit& zero : zeros) zero = number.zero();
+  for (size_t left = number.zeros(); left != 0;) {
+    const size_t n = lx::least(left, kRun);
+    if (put_units(out, zeros, n) < n) return false;
+    left -= n;
+  }
+  return true;
+}
+
+struct Written {
+  size_t units;
+  bool all;
+};
+
+/// Writes the text that `write(out)` makes into `room` units; it is false for a text that does not fit.
+/// `kDirect`: the text is single bytes, so that all kinds of bytes without shift states are the same.
+template <NumberForm kForm, bool kDirect, class Write>
+Written write_text(const Codepage& cp, NumberUnit<kForm>* p, size_t room, LXShiftState state, Write write) {
+  const auto run = [&](auto out) {
+    const bool all = write(out);
+    return Written{static_cast<size_t>(close(out) - p), all};
+  };
+  NumberUnit<kForm>* const end = p + room;
+  if constexpr (kForm == NumberForm::kUnicode) {
+    return run(lx::UnicodeWriter{p, end});
+  } else if constexpr (kForm == NumberForm::kCodes) {
+    return run(lx::CodeWriter{cp, p, end});
+  } else {
+    if (kForm == NumberForm::kEx && cp.shift_sensitive) return run(ClosedWriter{{cp, p, end, state}, end});
+    if constexpr (kDirect)
+      return run(lx::SingleByteWriter{cp, p, end});
+    else
+      return lx::write_bytes(cp, Form::kPlain, state, p, end, run);
+  }
+}
+
+template <NumberForm kForm>
+int32_t finish(Call& call, const Output<kForm>& to, size_t units, size_t count, bool all) {
+  if (to.nulls() != 0) to.buffer[units] = 0;
+  return call.fail(all ? LX_OK : LX_E_SIZE, static_cast<int32_t>(count + to.nulls()));
+}
+
+/// Copies a number, whose units are characters, to a buffer of at least one unit.
+template <NumberForm kForm>
+int32_t write_number(Call& call, const Output<kForm>& to, const NumberText<NumberUnit<kForm>>& number) {
+  const Codepage& cp = codepage_of(call.codepage());
+  const size_t most = static_cast<size_t>(to.size) - to.nulls();
+  const bool shifts = kForm == NumberForm::kEx && cp.shift_sensitive && to.state == LX_SHIFT_DOUBLE;
+  const size_t shift_bytes = shifts && to.by_chars() && most != 0 ? 1 : 0;  // a Shift-In, which does not count
+  const Written written = write_text<kForm, true>(cp, to.buffer, most + shift_bytes, to.state,
+                                                  [&](auto& out) { return put_number(out, number); });
+  return finish(call, to, written.units, written.units - shift_bytes, written.all);
+}
+
+/// The frame of a writing function: `make(call)` is run when there is a buffer to write to.
+template <NumberForm kForm, class Make>
+int32_t format(LXLocale* given, const Output<kForm>& to, uint32_t allowed_flags, Make make) {
+  Call call(unit, given);
+  if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
+  if ((to.flags & ~(allowed_flags | LX_TERRITORY_VALUES | LX_TERMINATE | LX_CHARACTERS)) != 0)
+    return call.fail(LX_E_INVALID, -1);
+  if (to.size <= 0) return call.fail(LX_E_SIZE, 0);
+  return make(call, *call.locale());
+}
+
+template <NumberForm kForm>
+int32_t long_to_text(LXLocale* given, int32_t value, const Output<kForm>& to) {
+  return format(given, to, LX_UNSIGNED, [&](Call& call, const LXLocale& locale) {
+    const bool negative = value < 0 && (to.flags & LX_UNSIGNED) == 0;
+    DecimalDigits digits;
+    lx::integer_digits(negative ? 0u - static_cast<uint32_t>(value) : static_cast<uint32_t>(value), &digits);
+    NumberText<NumberUnit<kForm>> number(lx::fixed_chars<kForm>(locale));
+    number.put_integer(digits, lx::separator_of<kForm>(locale, to.current(), lx::kThousands),
+                       lx::GroupSizes<kForm>(locale, to.current(), lx::kGrouping));
+    if (negative) number.put_minus();
+    return write_number(call, to, number);
+  });
+}
+
+/// The conventions of plain numbers, and of amounts.
+struct DoubleItems {
+  lx::NumberSeparator decimal, thousands;
+  lx::NumberGrouping grouping;
+  lx::NumberDigits fraction_digits;
+};
+constexpr DoubleItems kPlainItems{lx::kDecimal, lx::kThousands, lx::kGrouping, lx::kDigits};
+constexpr DoubleItems kLocalItems{lx::kMonetaryDecimal, lx::kMonetaryThousands, lx::kMonetaryGrouping,
+                                  lx::kCurrencyDigits};
+constexpr DoubleItems kInternationalItems{lx::kMonetaryDecimal, lx::kMonetaryThousands, lx::kMonetaryGrouping,
+                                          lx::kInternationalDigits};
+
+/// The number without its sign.
+template <NumberForm kForm>
+void put_magnitude(NumberText<NumberUnit<kForm>>* number, double value, const LXLocale& locale, bool current,
+                   const DoubleItems& items) {
+  DecimalDigits digits;
+  lx::double_digits(value < 0 ? -value : value == 0 ? 0.0 : value, &digits);
+  if (digits.fraction == nullptr) {
+    const Codepage& cp = codepage_of(*locale.codepage);
+    number->put_word(digits, [&](char c) {
+      const LXUChar u = static_cast<LXUChar>(c);
+      return static_cast<NumberUnit<kForm>>(kForm == NumberForm::kUnicode ? u : lx::unicode_to_code(cp, u));
+    });
+    return;
+  }
+  const uint16_t fraction_digits =
+      current ? locale.numbers[items.fraction_digits]
+              : lx::payload_word(*locale.territory, territory::kNumbers + items.fraction_digits);
+  number->put_integer(digits, lx::separator_of<kForm>(locale, current, items.thousands),
+                      lx::GroupSizes<kForm>(locale, current, items.grouping));
+  number->put_fraction(digits.fraction, lx::separator_of<kForm>(locale, current, items.decimal),
+                       fraction_digits);
+}
+
+template <NumberForm kForm>
+int32_t double_to_text(LXLocale* given, double value, const Output<kForm>& to) {
+  return format(given, to, 0, [&](Call& call, const LXLocale& locale) {
+    NumberText<NumberUnit<kForm>> number(lx::fixed_chars<kForm>(locale));
+    put_magnitude<kForm>(&number, value, locale, to.current(), kPlainItems);
+    if (value < 0) number.put_minus();
+    return write_number(call, to, number);
+  });
+}
+
+/// What stands before and behind an amount: "$" the symbol, "-" the sign text, " " the space where there is
+/// one.
+struct Layout {
+  const char* before;
+  const char* behind;
+};
+/// By sign position, and by whether the symbol precedes.
+constexpr Layout kLayouts[][2] = {
+    {{"(", " $)"}, {"($ ", ")"}}, {{"-", " $"}, {"-$ ", ""}}, {{"", " $-"}, {"$ ", "-"}},
+    {{"", " -$"}, {"-$ ", ""}},   {{"", " $-"}, {"$- ", ""}},
+};
+
+/// How an amount is laid out.
+struct Placement {
+  Layout layout;
+  int32_t symbol, sign;  // items
+  bool space;
+};
+
+Placement placement_of(const LXLocale& locale, bool current, bool negative, bool international) {
+  const LXObject& land = *locale.territory;
+  const unsigned flags = current ? locale.flags : lx::payload_word(land, territory::kFlags) >> 1;
+  const uint8_t* positions =
+      current ? locale.sign_positions : lx::payload_of(land) + 2 * territory::kSignPositions;
+  const unsigned own = flags >> (negative ? 2 : 0);  // bit 0: the symbol precedes, bit 1: a space
+  const size_t position = lx::least(positions[negative ? 1 : 0], 4);
+  return {kLayouts[position][own & 1], international ? LX_ITEM_INTERNATIONAL_CURRENCY : LX_ITEM_CURRENCY,
+          negative ? LX_ITEM_NEGATIVE_SIGN : LX_ITEM_POSITIVE_SIGN, (own & 2) != 0};
+}
+
+template <class Value, class Writer, class Reader>
+bool put_all(Writer& out, Reader in) {
+  Value value{};
+  while (in.next(&value))
+    if (!out.put(value)) return false;
+  return true;
+}
+
+/// Writes the text of an item.
+template <NumberForm kForm, class Writer>
+bool put_item(Writer& out, const LXLocale& locale, int32_t item, bool current) {
+  TextKind kind{};
+  if constexpr (kForm == NumberForm::kUnicode) {
+    const void* text = LXLocaleGetTextItemU(&locale, item, current, &kind);
+    return put_all<LXUChar>(out, lx::PayloadReader{static_cast<const uint8_t*>(text), nullptr});
+  } else {
+    const auto* text = static_cast<const uint8_t*>(LXLocaleGetTextItem(&locale, item, current, &kind));
+    if (kind == TextKind::kUnicode) return put_all<LXUChar>(out, lx::PayloadReader{text, nullptr});
+    return lx::read_bytes(codepage_of(*locale.codepage), lx::kTextForm<kForm>, LX_SHIFT_SINGLE, text,
+                          strlen(reinterpret_cast<const char*>(text)),
+                          [&](auto in) { return put_all<LXWChar>(out, in); });
+  }
+}
+
+template <NumberForm kForm, class Writer>
+bool put_pieces(Writer& out, const char* pieces, const LXLocale& locale, bool current,
+                const Placement& placement) {
+  using Char = std::conditional_t<kForm == NumberForm::kUnicode, LXUChar, LXWChar>;
+  const FixedChars& chars = lx::fixed_chars<kForm>(locale);
+  for (; *pieces != '\0'; ++pieces) {
+    bool put = true;
+    if (*pieces == '$')
+      put = put_item<kForm>(out, locale, placement.symbol, current);
+    else if (*pieces == '-')
+      put = put_item<kForm>(out, locale, placement.sign, current);
+    else if (*pieces == '(')
+      put = out.put(Char{chars.open});
+    else if (*pieces == ')')
+      put = out.put(Char{chars.close});
+    else if (placement.space)
+      put = out.put(Char{chars.space});
+    if (!put) return false;
+  }
+  return true;
+}
+
+/// The bytes of at most `*chars` characters of a text, with the Shift-In that is due behind them; `*chars`
+/// receives how many there are.
+size_t cut_to_chars(const Codepage& cp, Form form, LXShiftState state, uint8_t* text, size_t bytes,
+                    size_t* chars) {
+  return lx::read_bytes(cp, form, state, text, bytes, [&](auto in) {
+    size_t n = 0;
+    LXWChar code = 0;
+    while (n < *chars && in.next(&code)) ++n;
+    *chars = n;
+    size_t kept = static_cast<size_t>(in.p - text);
+    if constexpr (std::is_same_v<decltype(in), lx::ShiftReader>)
+      if (n != 0 && in.state == LX_SHIFT_DOUBLE && kept < bytes) text[kept++] = cp.shift_in;
+    return kept;
+  });
+}
+
+template <NumberForm kForm>
+int32_t currency_to_text(LXLocale* given, double value, const Output<kForm>& to) {
+  return format(given, to, LX_INTERNATIONAL, [&](Call& call, const LXLocale& locale) {
+    const Codepage& cp = codepage_of(*locale.codepage);
+    const bool current = to.current();
+    const bool international = (to.flags & LX_INTERNATIONAL) != 0;
+    const Placement placement = placement_of(locale, current, !(value >= 0), international);
+    NumberText<NumberUnit<kForm>> number(lx::fixed_chars<kForm>(locale));
+    put_magnitude<kForm>(&number, value, locale, current, international ? kInternationalItems : kLocalItems);
+    const auto write = [&](NumberUnit<kForm>* p, size_t room) {
+      return write_text<kForm, false>(cp, p, room, to.state, [&](auto& out) {
+        return put_pieces<kForm>(out, placement.layout.before, locale, current, placement) &&
+               put_number(out, number) &&
+               put_pieces<kForm>(out, placement.layout.behind, locale, current, placement);
+      });
+    };
+    const size_t size = static_cast<size_t>(to.size);
+    if constexpr (sizeof(NumberUnit<kForm>) == 1) {
+      if (to.by_chars()) {
+        constexpr size_t kWorkBytes = 512;
+        constexpr size_t kWorkBytesPerChar = 6;
+        uint8_t work[kWorkBytes] = {};
+        const size_t work_bytes = size < kWorkBytes / kWorkBytesPerChar ? size * kWorkBytesPerChar : kWorkBytes;
+        const Written written = write(work, work_bytes - to.nulls());
+        size_t chars = size - to.nulls();
+        const size_t bytes = cut_to_chars(cp, lx::kTextForm<kForm>, to.state, work, written.units, &chars);
+        memcpy(to.buffer, work, bytes);
+        return finish(call, to, bytes, chars, written.all);
+      }
+    }
+    const Written written = write(to.buffer, size - to.nulls());
+    return finish(call, to, written.units, written.units, written.all);
+  });
+}
+
+template <NumberForm kForm, class Text>
+int32_t first_group_size(LXLocale* given, const Text* text, int32_t* remaining, const Text** next) {
+  Call call(unit, given);
+  if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
+  if (text == nullptr) return call.exit(-1);
+  using Unit = NumberUnit<kForm>;
+  const FixedChars& chars = lx::fixed_chars<kForm>(*call.locale());
+  const auto unit_at = [&](int32_t i) { return static_cast<Unit>(text[i]); };
+  int32_t units = 0;
+  const int32_t size = lx::group_size(unit_at, *remaining, chars, &units);
+  if (size < 0) return call.exit(-1);
+  const bool more = units < *remaining && text[units] != 0;
+  *remaining = more ? *remaining - units : 0;
+  *next = more ? text + units + 1 : nullptr;
+  return call.exit(size);
+}
+
+using PlainOutput = Output<NumberForm::kPlain>;
+using ExOutput = Output<NumberForm::kEx>;
+using CodeOutput = Output<NumberForm::kCodes>;
+using UnicodeOutput = Output<NumberForm::kUnicode>;
+
+}  // namespace
+
+extern "C" {
+
+int32_t LXLongToString(LXLocale* locale, int32_t value, char* buffer, int32_t size, uint32_t flags) {
+  return long_to_text(locale, value, PlainOutput{bytes_of(buffer), size, flags});
+}
+
+int32_t LXLongToStringEx(LXLocale* locale, int32_t value, char* buffer, LXShiftState state, int32_t size,
+                         uint32_t flags) {
+  return long_to_text(locale, value, ExOutput{bytes_of(buffer), size, flags, state});
+}
+
+int32_t LXLongToStringW(LXLocale* locale, int32_t value, LXWChar* buffer, int32_t size, uint32_t flags) {
+  return long_to_text(locale, value, CodeOutput{buffer, size, flags});
+}
+
+int32_t LXLongToStringU(LXLocale* locale, int32_t value, LXUChar* buffer, int32_t size, uint32_t flags) {
+  return long_to_text(locale, value, UnicodeOutput{buffer, size, flags});
+}
+
+int32_t LXDoubleToString(LXLocale* locale, double value, char* buffer, int32_t size, uint32_t flags) {
+  return double_to_text(locale, value, PlainOutput{bytes_of(buffer), size, flags});
+}
+
+int32_t LXDoubleToStringEx(LXLocale* locale, double value, char* buffer, LXShiftState state, int32_t size,
+                           uint32_t flags) {
+  return double_to_text(locale, value, ExOutput{bytes_of(buffer), size, flags, state});
+}
+
+int32_t LXDoubleToStringW(LXLocale* locale, double value, LXWChar* buffer, int32_t size, uint32_t flags) {
+  return double_to_text(locale, value, CodeOutput{buffer, size, flags});
+}
+
+int32_t LXDoubleToStringU(LXLocale* locale, double value, LXUChar* buffer, int32_t size, uint32_t flags) {
+  return double_to_text(locale, value, UnicodeOutput{buffer, size, flags});
+}
+
+int32_t LXCurrencyToString(LXLocale* locale, double value, char* buffer, int32_t size, uint32_t flags) {
+  return currency_to_text(locale, value, PlainOutput{bytes_of(buffer), size, flags});
+}
+
+int32_t LXCurrencyToStringEx(LXLocale* locale, double value, char* buffer, LXShiftState state, int32_t size,
+                             uint32_t flags) {
+  return currency_to_text(locale, value, ExOutput{bytes_of(buffer), size, flags, state});
+}
+
+int32_t LXCurrencyToStringW(LXLocale* locale, double value, LXWChar* buffer, int32_t size, uint32_t flags) {
+  return currency_to_text(locale, value, CodeOutput{buffer, size, flags});
+}
+
+int32_t LXCurrencyToStringU(LXLocale* locale, double value, LXUChar* buffer, int32_t size, uint32_t flags) {
+  return currency_to_text(locale, value, UnicodeOutput{buffer, size, flags});
+}
+
+int32_t LXStrGroupingSize(LXLocale* locale, const char* text, int32_t* remaining, const char** next) {
+  return first_group_size<NumberForm::kPlain>(locale, text, remaining, next);
+}
+
+int32_t LXStrGroupingSizeW(LXLocale* locale, const LXWChar* text, int32_t* remaining, const LXWChar** next) {
+  return first_group_size<NumberForm::kCodes>(locale, text, remaining, next);
+}
+
+int32_t LXStrGroupingSizeU(LXLocale* locale, const LXUChar* text, int32_t* remaining, const LXUChar** next) {
+  return first_group_size<NumberForm::kUnicode>(locale, text, remaining, next);
+}
+
+}  // extern "C"

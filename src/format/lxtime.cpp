@@ -1,0 +1,291 @@
+// Times as text. One walk over the format for all kinds of text; nested formats are walked the same way, into
+// the same buffer.
+#include "core/lxcall.h"
+#include "format/lxtimetext.h"
+
+namespace {
+
+using lx::bytes_of;
+using lx::Call;
+using lx::Codepage;
+using lx::codepage_of;
+using lx::Form;
+using lx::TimeAction;
+using lx::TimeDirective;
+using lx::TimeSymbols;
+
+RAS1_Unit unit = RAS1_UNIT("lxtime");
+
+constexpr uint32_t kFlags = LX_TERRITORY_VALUES | LX_TERMINATE | LX_CHARACTERS;
+constexpr size_t kWorkBytes = 512;  // worked on in character mode, at most
+constexpr size_t kWorkBytesPerChar = 6;
+constexpr size_t kMostDigits = 4;
+
+/// The week of the year that the day is in, of weeks that begin on `first_weekday`.
+uint32_t week_of(const LXTime& time, int first_weekday) {
+  const int32_t weekday = (time.weekday + 7 - first_weekday) % 7;
+  return static_cast<uint32_t>(time.day_of_year / 7 + (time.day_of_year % 7 >= weekday ? 1 : 0));
+}
+
+/// A field with what is added to it; of a year before 0 the magnitude.
+uint32_t number_of(int32_t value, int32_t added) {
+  const int64_t sum = int64_t{value} + added;
+  return static_cast<uint32_t>(sum < 0 ? -sum : sum);
+}
+
+template <class Text>
+class TimeFormatter {
+  using Unit = typename Text::Unit;
+  using Value = typename Text::Value;
+  using Reader = typename Text::Reader;
+  using Writer = typename Text::Writer;
+
+ public:
+  TimeFormatter(const LXLocale& locale, const LXTime& time, bool current)
+      : locale_(locale), time_(time), symbols_(lx::time_symbols<Text>(locale)), current_(current) {}
+
+  /// Writes as much as there is before a failure: the code.
+  int32_t expand(Reader format, Writer* out, int depth = 0) const {
+    const int32_t code = walk(format, out, depth);
+    lx::close_text(out);
+    return code;
+  }
+
+ private:
+  int32_t walk(Reader format, Writer* out, int depth) const {
+    const Writer start = *out;
+    Writer to = *out;  // a copy, as is what other functions move: this one stays in registers
+    Value value{};
+    int32_t code = LX_OK;
+    while (code == LX_OK && format.p != format.end) {
+      const Unit* const before = format.p;
+      if (!format.next(&value)) {
+        if (format.p != format.end) code = LX_E_FORMAT;
+        break;
+      }
+      if (!lx::is_percent(format, value, symbols_)) {
+        if (!lx::copy_char<Text>(format, before, value, &to)) code = LX_E_SIZE;
+      } else if (lx::units_left(to) == 0) {
+        code = LX_E_SIZE;
+      } else {
+        bool flag = false;
+        const TimeDirective& directive = lx::take_directive(&format, symbols_, &flag, &value);
+        if (directive.field.member != nullptr) {
+          code = write_field(directive, flag, &to);
+        } else if (directive.action == TimeAction::kPercent) {
+          to.put(value);
+        } else {
+          Writer moved = to;
+          code = write_nested(directive, flag, start, &moved, depth);
+          lx::go_to(&to, moved);
+        }
+      }
+    }
+    lx::go_to(out, to);
+    return code;
+  }
+
+  int32_t write_field(const TimeDirective& directive, bool flag, Writer* out) const {
+    if (!directive.field.in_range(time_)) return LX_E_NOT_FOUND;
+    const int32_t value = time_.*directive.field.member;
+    if (directive.items != 0)
+      return write_item(directive.first_item + (directive.action == TimeAction::kMarker ? value / 12 : value),
+                        out);
+    uint32_t number = number_of(value, directive.write_added);
+    if (directive.action == TimeAction::kHour12) {
+      number = value % 12 == 0 ? 12 : static_cast<uint32_t>(value % 12);
+    } else if (directive.action == TimeAction::kWeek) {
+      if (!lx::time_field::kDayOfYear.in_range(time_)) return LX_E_NOT_FOUND;
+      number = week_of(time_, directive.write_added);
+    }
+    return write_number(number, directive.digits, flag, out);
+  }
+
+  /// Callers rely on where nested formats go: the date of %c, and %x and %X, to the start of the buffer, and
+  /// only the time of %c behind what is there.
+  int32_t write_nested(const TimeDirective& directive, bool flag, const Writer& start, Writer* out,
+                       int depth) const {
+    const int32_t date = flag ? LX_ITEM_LONG_DATE_FORMAT : LX_ITEM_SHORT_DATE_FORMAT;
+    switch (directive.action) {
+      case TimeAction::kDate:
+        return expand_item(date, start, out, depth);
+      case TimeAction::kTime:
+        return expand_item(LX_ITEM_TIME_FORMAT, start, out, depth);
+      case TimeAction::kDateTime: {
+        const int32_t code = expand_item(date, start, out, depth);
+        if (code != LX_OK) return code;
+        if (!out->put(Value{symbols_.space})) return LX_E_SIZE;
+        return expand_item(LX_ITEM_TIME_FORMAT, *out, out, depth);
+      }
+      default:
+        return LX_E_FORMAT;
+    }
+  }
+
+  /// Expands a format of the locale at `place`, in as many units as `out` has left, and moves `out` on.
+  int32_t expand_item(int32_t item, const Writer& place, Writer* out, int depth) const {
+    if (lx::units_left(*out) == 0) return LX_E_SIZE;
+    if (depth == lx::kMostNestedFormats) return LX_E_FORMAT;
+    const lx::TimeItem<Text> format(locale_, item, current_);
+    Writer nested = place;
+    nested.end = nested.p + lx::room(out->p, out->end);
+    const Unit* const begin = nested.p;
+    const int32_t code = expand(format.reader(locale_), &nested, depth + 1);
+    nested.p = out->p + (nested.p - begin);
+    lx::go_to(out, nested);
+    return code;
+  }
+
+  int32_t write_item(int32_t item, Writer* out) const {
+    Writer word = *out;
+    int32_t code = LX_OK;
+    if (!Text::kShift && lx::units_left(word) >= lx::kItemUnits) {
+      word.end = word.p + lx::kItemUnits;
+      lx::write_time_unicode(lx::time_name(locale_, item), &word);
+    } else {
+      code = write_item_cut(item, &word);
+    }
+    lx::go_to(out, word);
+    return code;
+  }
+  int32_t write_item_cut(int32_t item, Writer* out) const {
+    const lx::TimeItem<Text> text(locale_, item, current_);
+    Reader in = text.reader(locale_);
+    const Unit* before = in.p;
+    for (Value value{}; in.next(&value); before = in.p)
+      if (!lx::copy_char<Text>(in, before, value, out)) return LX_E_SIZE;
+    return LX_OK;
+  }
+
+  /// The last `most_digits` digits; `bare`: without leading zeros. A number that fills the output is 40, also
+  /// when all of it is there.
+  int32_t write_number(uint32_t number, uint32_t most_digits, bool bare, Writer* out) const {
+    uint32_t count = most_digits;
+    if (bare) {
+      count = 1;
+      for (uint32_t rest = number / 10; rest != 0 && count < most_digits; rest /= 10) ++count;
+    }
+    // In place where there is room; copying single units that have just been stored would stall.
+    Unit cut[kMostDigits];
+    const bool fits = !Text::kShift && lx::units_left(*out) > kMostDigits;
+    Unit* const digits = fits ? out->p : cut;
+    for (uint32_t i = count; i-- > 0; number /= 10) digits[i] = static_cast<Unit>(symbols_.zero + number % 10);
+    if (fits) {
+      out->p += count;
+      return LX_OK;
+    }
+    for (uint32_t i = 0; i < count; ++i)
+      if (!out->put(Value{cut[i]})) return LX_E_SIZE;
+    return lx::units_left(*out) == 0 ? LX_E_SIZE : LX_OK;
+  }
+
+  const LXLocale& locale_;
+  const LXTime& time_;
+  const TimeSymbols& symbols_;
+  const bool current_;
+};
+
+/// The code of what needs no locale: the flags and the size.
+int32_t refusal(uint32_t flags, int32_t size) {
+  return (flags & ~kFlags) != 0 ? LX_E_INVALID : size < 1 ? LX_E_SIZE : LX_OK;
+}
+
+/// Writes to `units` units and a null where one is asked for: the units written without the null.
+template <class Text>
+size_t format_time(const LXLocale& locale, const LXTime& time, typename Text::Unit* buffer, size_t units,
+                   typename Text::Reader format, LXShiftState state, uint32_t flags, int32_t* code) {
+  const Codepage& cp = codepage_of(*locale.codepage);
+  const bool null = (flags & LX_TERMINATE) != 0;
+  auto out = Text::write(cp, buffer, units - null, state);
+  if (format.p != format.end)
+    *code = TimeFormatter<Text>(locale, time, (flags & LX_TERRITORY_VALUES) == 0).expand(format, &out);
+  if (null) *out.p = 0;
+  return static_cast<size_t>(out.p - buffer);
+}
+
+/// Copies at most `chars` whole characters of the work buffer out, the null one of them: how many they are.
+template <class Text>
+size_t cut_to_chars(const Codepage& cp, const uint8_t* work, size_t bytes, LXShiftState state, uint8_t* buffer,
+                    size_t chars, bool null) {
+  auto in = Text::read(cp, work, bytes, state);
+  size_t count = 0;
+  typename Text::Value value{};
+  while (count < chars - null && in.next(&value)) ++count;
+  size_t copied = static_cast<size_t>(in.p - work);
+  memcpy(buffer, work, copied);
+  if constexpr (Text::kShift) {
+    if (in.state == LX_SHIFT_DOUBLE && copied != 0) buffer[copied++] = cp.shift_in;
+  }
+  if (null) buffer[copied] = 0;
+  return count + null;
+}
+
+template <class Text>
+int32_t format_units(LXLocale* given, const LXTime* time, typename Text::Unit* buffer, int32_t size,
+                     const typename Text::Unit* format, int32_t format_length, uint32_t flags) {
+  Call call(unit, given);
+  if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
+  int32_t code = refusal(flags, size);
+  if (code != LX_OK) return call.fail(code, code == LX_E_INVALID ? -1 : 0);
+  const Codepage& cp = codepage_of(call.codepage());
+  const size_t units = lx::text_units(format, format_length);
+  const size_t written = format_time<Text>(*call.locale(), *time, buffer, static_cast<size_t>(size),
+                                           Text::read(cp, format, units), LX_SHIFT_SINGLE, flags, &code);
+  return call.fail(code, static_cast<int32_t>(written + ((flags & LX_TERMINATE) != 0)));
+}
+
+int32_t format_bytes(LXLocale* given, const LXTime* time, char* buffer, LXShiftState state, int32_t size,
+                     const char* format, LXShiftState format_state, int32_t format_length, uint32_t flags,
+                     Form form) {
+  Call call(unit, given);
+  if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
+  int32_t code = refusal(flags, size);
+  if (code != LX_OK) return call.fail(code, code == LX_E_INVALID ? -1 : 0);
+  const LXLocale& locale = *call.locale();
+  const Codepage& cp = codepage_of(*locale.codepage);
+  const bool characters = (flags & LX_CHARACTERS) != 0;
+  const bool null = (flags & LX_TERMINATE) != 0;
+  const size_t most = static_cast<size_t>(size);
+  const size_t written = lx::with_time_bytes(cp, form, [&](auto text) {
+    using Text = decltype(text);
+    const size_t bytes = lx::given_bytes<Text>(cp, bytes_of(format), format_state, format_length, characters);
+    const auto in = Text::read(cp, bytes_of(format), bytes, format_state);
+    uint8_t work[kWorkBytes];
+    // Cleared, since nested formats may leave places unwritten.
+    if (characters) memset(work, 0, sizeof(work));
+    const size_t room =
+        characters ? lx::least(lx::least(most, kWorkBytes) * kWorkBytesPerChar, kWorkBytes) : most;
+    const size_t filled =
+        format_time<Text>(locale, *time, characters ? work : bytes_of(buffer), room, in, state, flags, &code);
+    if (!characters) return null + filled;
+    return cut_to_chars<Text>(cp, work, filled, state, bytes_of(buffer), most, null);
+  });
+  return call.fail(code, static_cast<int32_t>(written));
+}
+
+}  // namespace
+
+extern "C" {
+
+int32_t LXTimeToString(LXLocale* locale, const LXTime* time, char* buffer, int32_t size, const char* format,
+                       int32_t format_length, uint32_t flags) {
+  return format_bytes(locale, time, buffer, LX_SHIFT_SINGLE, size, format, LX_SHIFT_SINGLE, format_length,
+                      flags, Form::kPlain);
+}
+
+int32_t LXTimeToStringW(LXLocale* locale, const LXTime* time, LXWChar* buffer, int32_t size,
+                        const LXWChar* format, int32_t format_length, uint32_t flags) {
+  return format_units<lx::CodeTime>(locale, time, buffer, size, format, format_length, flags);
+}
+
+int32_t LXTimeToStringU(LXLocale* locale, const LXTime* time, LXUChar* buffer, int32_t size,
+                        const LXUChar* format, int32_t format_length, uint32_t flags) {
+  return format_units<lx::UnicodeTime>(locale, time, buffer, size, format, format_length, flags);
+}
+
+int32_t LXTimeToStringEx(LXLocale* locale, const LXTime* time, char* buffer, LXShiftState state, int32_t size,
+                         const char* format, LXShiftState format_state, int32_t format_length, uint32_t flags) {
+  return format_bytes(locale, time, buffer, state, size, format, format_state, format_length, flags, Form::kEx);
+}
+
+}  // extern "C"

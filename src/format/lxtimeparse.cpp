@@ -1,0 +1,271 @@
+// Times from text: the text is matched against the format character by character, and the directives fill the
+// fields of the record. One walk for all kinds of text; nested formats are matched the same way.
+#include "core/lxcall.h"
+#include "format/lxtimetext.h"
+
+namespace {
+
+using lx::bytes_of;
+using lx::Call;
+using lx::Codepage;
+using lx::codepage_of;
+using lx::Form;
+using lx::has_more;
+using lx::TimeAction;
+using lx::TimeDirective;
+using lx::TimeSymbols;
+
+RAS1_Unit unit = RAS1_UNIT("lxtimeparse");
+
+constexpr uint32_t kFlags = LX_TERRITORY_VALUES | LX_CHARACTERS;
+
+enum class Match { kSame, kDifferent, kCut };
+
+/// Compares the character that `format` has just read with the text and moves over it. kCut: the text ends
+/// before it does.
+template <class Text>
+Match match_char(const typename Text::Reader& format, const typename Text::Unit* before,
+                 typename Text::Value value, typename Text::Reader* text) {
+  if constexpr (Text::Reader::kOneUnit) {
+    typename Text::Value other{};
+    return text->next(&other) && other == value ? Match::kSame : Match::kDifferent;
+  } else {
+    auto at = *text;
+    size_t count = static_cast<size_t>(format.p - before);
+    if constexpr (Text::kShift) {
+      count = format.cp.width_in(format.state);
+      if (at.p != at.end) lx::take_shift(at.cp, &at.p, &at.state);
+    }
+    if (count > lx::room(at.p, at.end)) return Match::kCut;
+    if constexpr (Text::kShift) {
+      if (at.state != format.state) return Match::kDifferent;
+    }
+    if (memcmp(at.p, format.p - count, count) != 0) return Match::kDifferent;
+    at.p += count;
+    lx::go_on_at(*text, at);
+    return Match::kSame;
+  }
+}
+
+template <class Text>
+class TimeParser {
+  using Unit = typename Text::Unit;
+  using Value = typename Text::Value;
+  using Reader = typename Text::Reader;
+
+ public:
+  TimeParser(const LXLocale& locale, LXTime* time, bool current)
+      : locale_(locale), time_(*time), symbols_(lx::time_symbols<Text>(locale)), current_(current) {}
+
+  /// The code; the text stands behind what was read.
+  int32_t match(Reader format, Reader* text, int depth = 0) {
+    bool afternoon = false;
+    Value value{};
+    while (has_more(format) && has_more(*text)) {
+      const Unit* const before = format.p;
+      if (!format.next(&value)) break;
+      if (!lx::is_percent(format, value, symbols_)) {
+        const Match found = match_char<Text>(format, before, value, text);
+        if (found == Match::kDifferent) return LX_E_NOT_FOUND;
+        if (found == Match::kCut) break;
+        continue;
+      }
+      bool flag = false;
+      const TimeDirective& directive = lx::take_directive(&format, symbols_, &flag, &value);
+      const int32_t code = directive.field.member != nullptr ? read_field(directive, text, &afternoon)
+                                                             : read_nested(directive, flag, value, text, depth);
+      if (code != LX_OK) return code;
+    }
+    if (afternoon && time_.hours <= 11) time_.hours += 12;
+    if constexpr (Text::kShift) {
+      if (text->state == LX_SHIFT_DOUBLE && text->p != text->end && *text->p == text->cp.shift_in)
+        lx::take_shift(text->cp, &text->p, &text->state);
+    }
+    return LX_OK;
+  }
+
+ private:
+  int32_t read_field(const TimeDirective& directive, Reader* text, bool* afternoon) {
+    int32_t LXTime::*const member = directive.field.member;
+    switch (directive.action) {
+      case TimeAction::kWord:
+        return read_word(directive, text, &(time_.*member)) ? LX_OK : LX_E_NOT_FOUND;
+      case TimeAction::kMarker: {
+        int32_t marker = 0;
+        if (!read_word(directive, text, &marker)) return LX_E_NOT_FOUND;
+        *afternoon = marker != 0;
+        return LX_OK;
+      }
+      case TimeAction::kWeek:
+        return LX_E_FORMAT;
+      default: {
+        int32_t number = 0;
+        if (!read_number(directive.digits, text, &number)) return LX_E_NOT_FOUND;
+        const bool noon = directive.action == TimeAction::kHour12 && number == 12;
+        time_.*member = noon ? 0 : number - directive.read_added;
+        return number > directive.read_most ? LX_E_NOT_FOUND : LX_OK;
+      }
+    }
+  }
+
+  int32_t read_nested(const TimeDirective& directive, bool flag, Value percent, Reader* text, int depth) {
+    const int32_t date = flag ? LX_ITEM_LONG_DATE_FORMAT : LX_ITEM_SHORT_DATE_FORMAT;
+    Value value{};
+    switch (directive.action) {
+      case TimeAction::kPercent:
+        return text->next(&value) && value == percent && lx::read_single(*text) ? LX_OK : LX_E_NOT_FOUND;
+      case TimeAction::kDate:
+        return match_item(date, text, depth);
+      case TimeAction::kTime:
+        return match_item(LX_ITEM_TIME_FORMAT, text, depth);
+      case TimeAction::kDateTime: {
+        const int32_t code = match_item(date, text, depth);
+        if (code != LX_OK) return code;
+        if (!text->next(&value)) return LX_E_NOT_FOUND;
+        return match_item(LX_ITEM_TIME_FORMAT, text, depth);
+      }
+      default:
+        return LX_E_FORMAT;
+    }
+  }
+
+  int32_t match_item(int32_t item, Reader* text, int depth) {
+    if (!has_more(*text)) return LX_OK;
+    if (depth == lx::kMostNestedFormats) return LX_E_FORMAT;
+    const lx::TimeItem<Text> format(locale_, item, current_);
+    return match(format.reader(locale_), text, depth + 1);
+  }
+
+  /// Reads the longest of the directive's items that the text has, of equal ones the first.
+  bool read_word(const TimeDirective& directive, Reader* text, int32_t* index) {
+    Reader longest = *text;
+    for (int32_t i = 0; i < directive.items; ++i) {
+      const lx::TimeItem<Text> item(locale_, directive.first_item + i, current_);
+      Reader at = *text;
+      if (!passes(item, &at) || at.p <= longest.p) continue;
+      lx::go_on_at(longest, at);
+      *index = i;
+    }
+    const bool found = longest.p != text->p;
+    lx::go_on_at(*text, longest);
+    return found;
+  }
+
+  /// Whether the text has an item's characters; `at` moves over them.
+  bool passes(const lx::TimeItem<Text>& item, Reader* at) const {
+    if constexpr (!Text::kShift) {
+      if (item.count > lx::room(at->p, at->end)) return false;
+      if (memcmp(at->p, item.units, item.count * sizeof(Unit)) != 0) return false;
+      at->p += item.count;
+    } else {
+      Reader in = item.reader(locale_);
+      Value value{};
+      while (in.next(&value))
+        if (match_char<Text>(in, in.p, value, at) != Match::kSame) return false;
+    }
+    return true;
+  }
+
+  /// False where no digit stands.
+  bool read_number(int most_digits, Reader* text, int32_t* number) const {
+    int digits = 0;
+    for (; digits < most_digits; ++digits) {
+      Reader at = *text;
+      Value value{};
+      if (!at.next(&value) || !lx::read_single(at)) break;
+      const uint32_t digit = uint32_t{value} - symbols_.zero;
+      if (digit > 9) break;
+      *number = *number * 10 + static_cast<int32_t>(digit);
+      lx::go_on_at(*text, at);
+    }
+    return digits > 0;
+  }
+
+  const LXLocale& locale_;
+  LXTime& time_;
+  const TimeSymbols& symbols_;
+  const bool current_;
+};
+
+/// The units read, or -1.
+template <class Text>
+int32_t parse_time(const LXLocale& locale, LXTime* time, const typename Text::Reader& given,
+                   const typename Text::Reader& format, uint32_t flags, int32_t* code) {
+  if (given.p == given.end || format.p == format.end) return 0;
+  auto text = given;
+  *code = TimeParser<Text>(locale, time, (flags & LX_TERRITORY_VALUES) == 0).match(format, &text);
+  return *code == LX_OK ? static_cast<int32_t>(text.p - given.p) : -1;
+}
+
+template <class Text>
+int32_t parse_units(LXLocale* given, LXTime* time, const typename Text::Unit* text, int32_t length,
+                    const typename Text::Unit* format, int32_t format_length, uint32_t flags) {
+  Call call(unit, given);
+  if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
+  if ((flags & ~kFlags) != 0) return call.fail(LX_E_INVALID, -1);
+  const Codepage& cp = codepage_of(call.codepage());
+  int32_t code = LX_OK;
+  const int32_t read =
+      parse_time<Text>(*call.locale(), time, Text::read(cp, text, lx::text_units(text, length)),
+                       Text::read(cp, format, lx::text_units(format, format_length)), flags, &code);
+  return call.fail(code, read);
+}
+
+/// The characters that were read.
+template <class Reader>
+int32_t chars_of(Reader in) {
+  int32_t chars = 0;
+  for (LXWChar value = 0; in.next(&value);) ++chars;
+  return chars;
+}
+
+int32_t parse_bytes(LXLocale* given, LXTime* time, const char* text, LXShiftState state, int32_t length,
+                    const char* format, LXShiftState format_state, int32_t format_length, uint32_t flags,
+                    Form form) {
+  Call call(unit, given);
+  if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
+  if ((flags & ~kFlags) != 0) return call.fail(LX_E_INVALID, -1);
+  const LXLocale& locale = *call.locale();
+  const Codepage& cp = codepage_of(*locale.codepage);
+  const bool characters = (flags & LX_CHARACTERS) != 0;
+  int32_t code = LX_OK;
+  const int32_t read = lx::with_time_bytes(cp, form, [&](auto kind) {
+    using Text = decltype(kind);
+    const auto reader = [&](const char* p, LXShiftState start, int32_t units) {
+      return Text::read(cp, bytes_of(p), lx::given_bytes<Text>(cp, bytes_of(p), start, units, characters),
+                        start);
+    };
+    const int32_t bytes = parse_time<Text>(locale, time, reader(text, state, length),
+                                           reader(format, format_state, format_length), flags, &code);
+    if (bytes < 0 || !characters) return bytes;
+    return chars_of(Text::read(cp, bytes_of(text), static_cast<size_t>(bytes), state));
+  });
+  return call.fail(code, read);
+}
+
+}  // namespace
+
+extern "C" {
+
+int32_t LXStringToTime(LXLocale* locale, LXTime* time, const char* text, int32_t length, const char* format,
+                       int32_t format_length, uint32_t flags) {
+  return parse_bytes(locale, time, text, LX_SHIFT_SINGLE, length, format, LX_SHIFT_SINGLE, format_length, flags,
+                     Form::kPlain);
+}
+
+int32_t LXStringToTimeW(LXLocale* locale, LXTime* time, const LXWChar* text, int32_t length,
+                        const LXWChar* format, int32_t format_length, uint32_t flags) {
+  return parse_units<lx::CodeTime>(locale, time, text, length, format, format_length, flags);
+}
+
+int32_t LXStringToTimeU(LXLocale* locale, LXTime* time, const LXUChar* text, int32_t length,
+                        const LXUChar* format, int32_t format_length, uint32_t flags) {
+  return parse_units<lx::UnicodeTime>(locale, time, text, length, format, format_length, flags);
+}
+
+int32_t LXStringToTimeEx(LXLocale* locale, LXTime* time, const char* text, LXShiftState state, int32_t length,
+                         const char* format, LXShiftState format_state, int32_t format_length, uint32_t flags) {
+  return parse_bytes(locale, time, text, state, length, format, format_state, format_length, flags, Form::kEx);
+}
+
+}  // extern "C"

@@ -1,0 +1,252 @@
+// The kinds of text as times walk them: the readers and writers of a kind in pairs, the items of a locale in a
+// kind, and what both directions ask of a format.
+#pragma once
+
+#include <cstring>
+
+#include "codepage/lxtext.h"
+#include "core/lxrecords.h"
+#include "format/lxtime.h"
+#include "locale/lxlocale.h"
+
+namespace lx {
+
+/// A writer that keeps room for the Shift-In that ends a text in the single-byte state.
+struct ClosedShiftOutput {
+  using Unit = uint8_t;
+  const Codepage& cp;
+  uint8_t* p;
+  uint8_t* end;
+  LXShiftState state;
+
+  bool put(LXUChar u) { return put(LXWChar{unicode_to_code(cp, u)}); }
+  bool put(LXWChar code) {
+    uint8_t bytes[kMaxCharBytes];
+    const uint32_t stored = without_zero_bytes(code);
+    const size_t count = code_bytes(stored);
+    store_code(bytes, stored, count);
+    return copy(bytes, count, count == 1 ? LX_SHIFT_SINGLE : LX_SHIFT_DOUBLE);
+  }
+  bool copy(const uint8_t* bytes, size_t count, LXShiftState needed) {
+    const size_t shift = state != needed ? 1 : 0;
+    if (shift + count + (needed == LX_SHIFT_DOUBLE ? 1 : 0) > room(p, end)) return false;
+    if (shift != 0) *p++ = needed == LX_SHIFT_DOUBLE ? cp.shift_out : cp.shift_in;
+    state = needed;
+    for (size_t i = 0; i < count; ++i) *p++ = bytes[i];
+    return true;
+  }
+  void close() {
+    if (state == LX_SHIFT_SINGLE || p == end) return;
+    *p++ = cp.shift_in;
+    state = LX_SHIFT_SINGLE;
+  }
+};
+
+/// A kind of text: its reader, and the writer to it.
+template <class ReaderOf, class WriterOf>
+struct TimeText {
+  using Reader = ReaderOf;
+  using Writer = WriterOf;
+  using Unit = typename Reader::Unit;
+  static constexpr bool kUnicode = std::is_same_v<Reader, UnicodeReader>;
+  static constexpr bool kShift = std::is_same_v<Reader, ShiftReader>;
+  static constexpr bool kBytes = sizeof(Unit) == 1;
+  using Value = std::conditional_t<kUnicode, LXUChar, LXWChar>;
+
+  static Reader read(const Codepage& cp, const Unit* p, size_t units, LXShiftState state = LX_SHIFT_SINGLE) {
+    if constexpr (kUnicode)
+      return {p, p + units};
+    else if constexpr (kShift)
+      return {cp, p, p + units, state};
+    else
+      return {cp, p, p + units};
+  }
+  static Writer write(const Codepage& cp, Unit* p, size_t units, LXShiftState state = LX_SHIFT_SINGLE) {
+    if constexpr (kUnicode)
+      return {p, p + units};
+    else if constexpr (kShift)
+      return {cp, p, p + units, state};
+    else
+      return {cp, p, p + units};
+  }
+};
+using UnicodeTime = TimeText<UnicodeReader, UnicodeWriter>;
+using CodeTime = TimeText<CodeReader, CodeWriter>;
+
+/// Calls `body` with the kind of a byte text.
+template <class Body>
+auto with_time_bytes(const Codepage& cp, Form form, Body&& body) {
+  if (form == Form::kEx && cp.shift_sensitive) return body(TimeText<ShiftReader, ClosedShiftOutput>{});
+  if (cp.utf8) return body(TimeText<Utf8Reader, Utf8Writer>{});
+  if (cp.single_byte && cp.one_byte_codes) return body(TimeText<SingleByteReader, SingleByteWriter>{});
+  return body(TimeText<MultiByteReader, MultiByteWriter>{});
+}
+
+/// Only packed codes and shift-stateful text tell codepage 930 from other EBCDIC.
+template <class Text>
+const TimeSymbols& time_symbols(const LXLocale& locale) {
+  if (Text::kUnicode || keeps_ascii(locale)) return kAsciiTime;
+  const bool katakana = !Text::kBytes || Text::kShift;
+  return katakana && locale.codepage->disk.id == kKatakanaCodepage ? kKatakanaTime : kEbcdicTime;
+}
+
+template <class Writer>
+void close_text(Writer*) {}
+inline void close_text(ClosedShiftOutput* out) {
+  out->close();
+}
+
+/// Takes over the place, and the shift state, from a copy that has gone on.
+template <class Writer>
+void go_to(Writer* out, const Writer& place) {
+  out->p = place.p;
+  if constexpr (std::is_same_v<Writer, ClosedShiftOutput>) out->state = place.state;
+}
+
+/// The units that can be written before the output is full.
+template <class Writer>
+size_t units_left(const Writer& out) {
+  return room(out.p, out.end);
+}
+inline size_t units_left(const ClosedShiftOutput& out) {
+  return room(out.p, out.end) - (out.state == LX_SHIFT_DOUBLE && out.p != out.end ? 1 : 0);
+}
+
+/// Whether the character that was read can be a letter or digit: in the double-byte state none is.
+template <class Reader>
+bool read_single(const Reader&) {
+  return true;
+}
+inline bool read_single(const ShiftReader& in) {
+  return in.state != LX_SHIFT_DOUBLE;
+}
+
+/// Whether characters follow. A shift byte at the very end is none.
+template <class Reader>
+bool has_more(const Reader& in) {
+  return in.p != in.end;
+}
+inline bool has_more(const ShiftReader& in) {
+  return in.p != in.end && !(in.end - in.p == 1 && in.cp.is_shift(*in.p));
+}
+
+/// Copies the character that `in` has just read, bytes and all. `before`: where it stood.
+template <class Text>
+bool copy_char(const typename Text::Reader& in, const typename Text::Unit* before, typename Text::Value value,
+               typename Text::Writer* out) {
+  if constexpr (Text::Reader::kOneUnit) {
+    return out->put(value);
+  } else if constexpr (Text::kShift) {
+    const size_t count = in.cp.width_in(in.state);
+    return out->copy(in.p - count, count, in.state);
+  } else {
+    const size_t count = static_cast<size_t>(in.p - before);
+    if (count > room(out->p, out->end)) return false;
+    for (size_t i = 0; i < count; ++i) *out->p++ = before[i];
+    return true;
+  }
+}
+
+/// The bytes of a text that a caller gave, whose length counts bytes, or characters. Nothing behind the last
+/// character is looked at.
+template <class Text>
+size_t given_bytes(const Codepage& cp, const uint8_t* text, LXShiftState state, int32_t length,
+                   bool characters) {
+  if (length < 0) return strlen(reinterpret_cast<const char*>(text));
+  if (!characters || Text::Reader::kOneUnit) return static_cast<size_t>(length);
+  const uint8_t* p = text;
+  for (int32_t i = 0; i < length; ++i) {
+    if constexpr (Text::kShift) {
+      take_shift(cp, &p, &state);
+      p += cp.width_in(state);
+    } else {
+      p += cp.length(*p);
+    }
+  }
+  return static_cast<size_t>(p - text);
+}
+
+/// Names and nested formats are used as far as they fit before a null.
+inline constexpr size_t kItemUnits = 31;
+
+/// Writes a null-terminated 16-bit text, as far as it fits.
+template <class Writer>
+inline void write_time_unicode(const uint8_t* text, Writer* out) {
+  Writer copy = *out;  // in registers
+  LXUChar u = le16(text);
+  if constexpr (std::is_same_v<Writer, SingleByteWriter>) {
+    const unsigned below = copy.same_below();
+    for (; u != 0 && u < below && copy.put(LXWChar{u}); u = le16(text)) text += 2;
+  }
+  for (; u != 0 && copy.put(u); u = le16(text)) text += 2;
+  go_to(out, copy);
+}
+
+/// The text of a name, all of which are the language's.
+inline const uint8_t* time_name(const LXLocale& locale, int32_t item) {
+  return payload_text(*locale.language, item_of(item).index);
+}
+
+/// Writes an item of the locale, as far as it fits.
+template <class Text, class Writer = typename Text::Writer>
+void write_time_item(const LXLocale& locale, int32_t item, bool current, Writer* out) {
+  TextKind kind{};
+  const auto get = Text::kUnicode ? LXLocaleGetTextItemU : LXLocaleGetTextItem;
+  const auto* text = static_cast<const uint8_t*>(get(&locale, item, current, &kind));
+  if (kind == TextKind::kUnicode) {
+    write_time_unicode(text, out);
+  } else if constexpr (!Text::kUnicode) {
+    const Codepage& cp = codepage_of(*locale.codepage);
+    const size_t bytes = strlen(reinterpret_cast<const char*>(text));
+    const auto fill = [&](auto in) {
+      for (LXWChar code = 0; in.next(&code) && out->put(code);) {
+      }
+    };
+    if constexpr (Text::kBytes)
+      fill(Text::read(cp, text, bytes));
+    else
+      read_bytes(cp, Form::kEx, LX_SHIFT_SINGLE, text, bytes, fill);
+  }
+  close_text(out);
+}
+
+template <class Text>
+struct TimeItem {
+  typename Text::Unit units[kItemUnits];
+  size_t count;
+
+  TimeItem(const LXLocale& locale, int32_t number, bool current) {
+    auto out = Text::write(codepage_of(*locale.codepage), units, kItemUnits);
+    write_time_item<Text>(locale, number, current, &out);
+    count = static_cast<size_t>(out.p - units);
+  }
+  typename Text::Reader reader(const LXLocale& locale) const {
+    return Text::read(codepage_of(*locale.codepage), units, count);
+  }
+};
+
+/// The directive that the character just read names.
+template <class Reader, class Value>
+const TimeDirective& directive_at(const Reader& format, Value value, const TimeSymbols& symbols) {
+  return symbols.directive(read_single(format) ? value : sizeof(symbols.directives));
+}
+
+/// Whether the character just read begins a directive.
+template <class Reader, class Value>
+bool is_percent(const Reader& format, Value value, const TimeSymbols& symbols) {
+  return value == symbols.percent && read_single(format);
+}
+
+/// Reads what follows a "%": kNone or kFlag where that is no directive.
+template <class Reader, class Value>
+const TimeDirective& take_directive(Reader* format, const TimeSymbols& symbols, bool* flag, Value* value) {
+  *flag = false;
+  for (;;) {
+    if (!format->next(value)) return kTimeDirectives[0];
+    const TimeDirective& directive = directive_at(*format, *value, symbols);
+    if (directive.action != TimeAction::kFlag || *flag) return directive;
+    *flag = true;
+  }
+}
+
+}  // namespace lx
