@@ -10,12 +10,7 @@ namespace lx {
 
 template <class Unit>
 inline size_t units_with_null(const Unit* text) {
-  size_t n = 0;
-  while (text[n] != 0) ++n;
-  return n + 1;
-}
-inline size_t units_with_null(const uint8_t* text) {
-  return strlen(reinterpret_cast<const char*>(text)) + 1;
+  return text_units(text, -1) + 1;
 }
 
 /// What a copy takes, in units and in characters.

@@ -44,6 +44,9 @@ inline size_t text_units(const Unit* text, int32_t length) {
 inline size_t text_units(const char* text, int32_t length) {
   return length < 0 ? strlen(text) : static_cast<size_t>(length);
 }
+inline size_t text_units(const uint8_t* text, int32_t length) {
+  return text_units(reinterpret_cast<const char*>(text), length);
+}
 /// The bytes of a text whose length counts bytes, or with LX_CHARACTERS characters.
 inline size_t text_bytes(const Codepage& cp, const char* text, LXShiftState state, int32_t length,
                          uint32_t flags) {
@@ -279,6 +282,31 @@ struct ShiftWriter {
     store_code(p, code, count);
     p += count;
     return true;
+  }
+};
+
+/// A shift-stateful writer that never leaves a double-byte character without room for the Shift-In behind it,
+/// so that close() can end the text in the single-byte state.
+struct ClosedShiftWriter {
+  using Unit = uint8_t;
+  static constexpr bool kOneUnit = false;
+  static constexpr bool kRuns = false;
+  ShiftWriter out;
+  uint8_t* const end;
+  uint8_t*& p = out.p;
+
+  explicit ClosedShiftWriter(const ShiftWriter& writer) : out(writer), end(writer.end) {}
+  ClosedShiftWriter(const ClosedShiftWriter& other) : out(other.out), end(other.end) {}
+
+  bool put(LXUChar u) { return put(LXWChar{unicode_to_code(out.cp, u)}); }
+  bool put(LXWChar code) {
+    const bool closing = code_bytes(without_zero_bytes(code)) > 1;
+    if (closing && p == end) return false;
+    out.end = end - closing;
+    return out.put(code);
+  }
+  void close() {
+    if (out.state == LX_SHIFT_DOUBLE && p != end) *p++ = out.take_shift_byte();
   }
 };
 

@@ -338,7 +338,7 @@ void drop_blanks(LXLocale* locale, ByteText* text1, ByteText* text2, Form form) 
   drop(text2, lx::least(text1->bytes, text2->bytes));
 }
 
-/// Both byte forms. `in_binary(call)` compares by code value where the locale has no sort.
+/// Both byte forms. `in_binary(length1, length2, options)` compares by code value where the locale has no sort.
 template <class InBinary>
 int32_t collate_bytes(LXLocale* given, ByteText text1, int32_t length1, ByteText text2, int32_t length2,
                       uint32_t options, Form form, InBinary in_binary) {
@@ -350,8 +350,11 @@ int32_t collate_bytes(LXLocale* given, ByteText text1, int32_t length1, ByteText
   text2.bytes = lx::text_bytes(cp, text2.text, text2.state, length2, options);
   options &= ~uint32_t{LX_CHARACTERS};
   if (locale->sort == nullptr) {
-    // Comparison has its own error code.
-    const int32_t difference = in_binary(text1, text2, options);
+    // Comparison has its own error code, and its own rule for null-terminated texts.
+    const auto length_of = [](const ByteText& text, int32_t length) {
+      return length < 0 ? length : static_cast<int32_t>(text.bytes);
+    };
+    const int32_t difference = in_binary(length_of(text1, length1), length_of(text2, length2), options);
     return call.fail(locale->last_error, difference);
   }
   if ((options & kBlanksOption) != 0) {
@@ -409,9 +412,8 @@ extern "C" {
 int32_t LXStrcoll(LXLocale* locale, const char* text1, int32_t length1, const char* text2, int32_t length2,
                   uint32_t options) {
   return collate_bytes(locale, {text1, LX_SHIFT_SINGLE, 0}, length1, {text2, LX_SHIFT_SINGLE, 0}, length2,
-                       options, Form::kPlain, [&](const ByteText& a, const ByteText& b, uint32_t left) {
-                         return LXStrcmp(locale, text1, static_cast<int32_t>(a.bytes), text2,
-                                         static_cast<int32_t>(b.bytes), left);
+                       options, Form::kPlain, [&](int32_t bytes1, int32_t bytes2, uint32_t left) {
+                         return LXStrcmp(locale, text1, bytes1, text2, bytes2, left);
                        });
 }
 
@@ -421,9 +423,9 @@ int32_t LXStrcollEx(LXLocale* locale, const char* text1, LXShiftState state1, in
   if (used == nullptr || !codepage_of(*used->codepage).shift_sensitive)
     return LXStrcoll(locale, text1, length1, text2, length2, options);
   return collate_bytes(locale, {text1, state1, 0}, length1, {text2, state2, 0}, length2, options, Form::kEx,
-                       [&](const ByteText& a, const ByteText& b, uint32_t left) {
-                         return LXStrcmpEx(locale, text1, state1, static_cast<int32_t>(a.bytes), text2, state2,
-                                           static_cast<int32_t>(b.bytes), binary_options(left, true));
+                       [&](int32_t bytes1, int32_t bytes2, uint32_t left) {
+                         return LXStrcmpEx(locale, text1, state1, bytes1, text2, state2, bytes2,
+                                           binary_options(left, true));
                        });
 }
 

@@ -35,35 +35,13 @@ struct Output {
   size_t nulls() const { return (flags & LX_TERMINATE) != 0 ? 1 : 0; }
 };
 
-/// A writer that never leaves a double-byte character without room for the Shift-In behind it.
-struct ClosedWriter {
-  lx::ShiftWriter out;
-  uint8_t* const end;
-
-  size_t put_count(const uint8_t* bytes, size_t count) {
-    size_t n = 0;
-    while (n < count && put(LXWChar{bytes[n]})) ++n;
-    return n;
-  }
-  bool put(LXUChar u) { return put(LXWChar{lx::unicode_to_code(out.cp, u)}); }
-  bool put(LXWChar code) {
-    const bool closing = lx::code_bytes(lx::without_zero_bytes(code)) > 1;
-    if (closing && out.p == end) return false;
-    out.end = end - closing;
-    return out.put(code);
-  }
-  uint8_t* close() {
-    if (out.state == LX_SHIFT_DOUBLE && out.p != end) *out.p++ = out.take_shift_byte();
-    return out.p;
-  }
-};
-
 template <class Writer>
 typename Writer::Unit* close(Writer& out) {
   return out.p;
 }
-uint8_t* close(ClosedWriter& out) {
-  return out.close();
+uint8_t* close(lx::ClosedShiftWriter& out) {
+  out.close();
+  return out.p;
 }
 
 /// Writes single-unit characters: how many fit.
@@ -75,8 +53,10 @@ size_t put_units(Writer& out, const typename Writer::Unit* units, size_t count) 
   out.p = to + n;
   return n;
 }
-size_t put_units(ClosedWriter& out, const uint8_t* units, size_t count) {
-  return out.put_count(units, count);
+size_t put_units(lx::ClosedShiftWriter& out, const uint8_t* units, size_t count) {
+  size_t n = 0;
+  while (n < count && out.put(LXWChar{units[n]})) ++n;
+  return n;
 }
 
 /// False when the number did not fit.
@@ -114,7 +94,7 @@ Written write_text(const Codepage& cp, NumberUnit<kForm>* p, size_t room, LXShif
   } else if constexpr (kForm == NumberForm::kCodes) {
     return run(lx::CodeWriter{cp, p, end});
   } else {
-    if (kForm == NumberForm::kEx && cp.shift_sensitive) return run(ClosedWriter{{cp, p, end, state}, end});
+    if (kForm == NumberForm::kEx && cp.shift_sensitive) return run(lx::ClosedShiftWriter({cp, p, end, state}));
     if constexpr (kDirect)
       return run(lx::SingleByteWriter{cp, p, end});
     else

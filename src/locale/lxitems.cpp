@@ -182,36 +182,9 @@ bool read_text(const LXLocale& locale, const ItemText& from, Form form, int32_t*
   return true;
 }
 
-/// A writer that never leaves a double-byte character without room for the Shift-In behind it.
-struct ClosedShiftWriter {
-  using Unit = uint8_t;
-  static constexpr bool kOneUnit = false;
-  static constexpr bool kRuns = false;
-  lx::ShiftWriter out;
-  uint8_t* const end;
-  uint8_t*& p = out.p;
-
-  ClosedShiftWriter(const lx::ShiftWriter& writer) : out(writer), end(writer.end) {}
-  ClosedShiftWriter(const ClosedShiftWriter& other) : out(other.out), end(other.end) {}
-
-  template <class Value>
-  bool put(Value value) {
-    const LXWChar code = std::is_same_v<Value, LXUChar>
-                             ? lx::unicode_to_code(out.cp, static_cast<LXUChar>(value))
-                             : static_cast<LXWChar>(value);
-    const bool closing = lx::code_bytes(code) > 1;
-    if (closing && p == end) return false;
-    out.end = end - closing;
-    return out.put(code);
-  }
-  void close() {
-    if (out.state == LX_SHIFT_DOUBLE && p != end) *p++ = out.take_shift_byte();
-  }
-};
-
 template <class Writer>
 void close(Writer&) {}
-void close(ClosedShiftWriter& out) {
+void close(lx::ClosedShiftWriter& out) {
   out.close();
 }
 
@@ -343,7 +316,7 @@ int32_t LXGetLocaleTextInfoEx(LXLocale* locale, int32_t item, char* buffer, LXSh
     return LXGetLocaleTextInfo(locale, item, buffer, size, flags);
   return get_text<true>(locale, item, bytes_of(buffer), size, flags, Form::kEx,
                         [&](const Codepage& cp, uint8_t* end, auto body) {
-                          body(ClosedShiftWriter({cp, bytes_of(buffer), end, state}));
+                          body(lx::ClosedShiftWriter({cp, bytes_of(buffer), end, state}));
                         });
 }
 

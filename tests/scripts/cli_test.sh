@@ -234,6 +234,81 @@ same 'the output of a cut mapping' old <(printf '\x81\x82\x83')
 says 'no such mapping' 2 'title not in' "$lexicor" map title
 says 'mapping for an unknown locale' 2 "no territory 'Mars'.*lexicor list territories" "$lexicor" map upper --locale English_Mars
 
+# --- Sorting: line ends, the sort, keys beside comparison, and what a line may hold.
+# sorts NAME INPUT OUTPUT ARGUMENTS...: input and expected output as escapes of printf.
+sorts() {
+  bytes "$2" in
+  bytes "$3" expected
+  expect "$1" 0 '' "$lexicor" sort "${@:4}" in
+  same "$1" out expected
+}
+for key in '' --key; do
+  sorts "the alphabet's end $key" 'zebra\n\xc3\xb6l\n\xc3\x84pple\napa\n' 'apa\nzebra\n\xc3\x84pple\n\xc3\xb6l\n' \
+    --locale Swedish@Swedish $key
+  sorts "a line without an end $key" 'b\r\nx\0y\nx\0\r\n\n\r\na' '\n\r\na\r\nb\r\nx\0\r\nx\0y\n' --locale English@BINARY $key
+  sorts "equal lines $key" 'b\na\nA\r\nB\na\r\n' 'b\nB\na\nA\r\na\r\n' --locale English@Default --case-insensitive --reverse $key
+  sorts "unequal lines $key" 'b\nA\na\r\nB\na\n' 'A\nb\n' --locale English@Default --case-insensitive --unique $key
+  sorts "without case in binary order $key" '\xb1\n\x88\x9f\na\n\nA\n\0\0\0\n' '\n\0\0\0\na\nA\n\xb1\n\x88\x9f\n' \
+    --locale English@BINARY --codepage MS932 --case-insensitive $key
+  sorts "host text with meeting fields $key" '\x0e\x44\x82\x0f\x0e\x44\x81\x0f\x25\xc1\x25\x0e\x44\x82\x44\x81\x0f\x25\x0e\x44\x81' \
+    '\xc1\x25\x0e\x44\x81\x0f\x25\x0e\x44\x82\x0f\x0e\x44\x81\x0f\x25' \
+    --locale Japanese@Japanese --codepage IBM930 --unique $key
+done
+bytes 'b\na' part1
+bytes 'd\nc\n' part2
+expect 'each file ends its last line' 0 '' "$lexicor" sort -o part2 part2 part1
+same 'each file ends its last line' part2 <(printf 'a\nb\nc\nd\n')
+python3 -c '
+import random
+random.seed(1)
+for _ in range(100000):
+    print("".join(random.choices("aàbcdhlnñoôszAÀCHÑ \u0301-", k=random.randrange(9))))' >words
+for locale in English@Default Spanish@SpanishTraditional French@FrenchCanadian Vietnamese@Vietnamese; do
+  expect "100,000 lines in $locale" 0 '' "$lexicor" sort --locale $locale -o compared words
+  expect "100,000 keys in $locale" 0 '' "$lexicor" sort --locale $locale --key -o by_key words
+  same "keys and comparison in $locale" by_key compared
+  same "the lines in $locale" <(sort compared) <(sort words)
+done
+"$lexicor" sort --locale English@BINARY words >out
+same 'binary order' out <(sort words)
+bytes 'a\nb\xe3\x81\nc' in
+expect 'a line that ends in a character' 1 'lexicor: a line ends inside the character that begins at byte 3' "$lexicor" sort in
+expect 'sorted input cut' 1 'lexicor: the input ends inside the character that begins at byte 2' "$lexicor" sort -o old cut
+same 'the output of a cut sort' old <(printf '\x81\x82\x83')
+if script --version >/dev/null 2>&1; then
+  for _ in 1 2 3; do cat words; done >many
+  script -qec "'$lexicor' sort --locale English@Default --key -o out many" /dev/null | grep -q ' 100 %' ||
+    fault 'no bar on a terminal'
+fi
+
+# --- Which text comes first, and why.
+# orders EXIT OUTPUT SUBCOMMAND ARGUMENTS...: the exit status and the whole, or for explain the last line, of the output.
+orders() {
+  expect "$*" "$1" '' "$lexicor" "${@:3}"
+  [ "$(tail -n 1 out)" = "$2" ] || fault "$*: $(cat out)"
+}
+orders 4 'ö > z' compare --locale Swedish@Swedish ö z
+orders 3 'ö < z' compare --locale German@Default ö z
+orders 0 'Zoo = zoo' compare --locale English@Default --case-insensitive Zoo zoo
+orders 0 'Ａ = A' compare --locale Japanese@Japanese --width-insensitive Ａ A
+expect 'half an argument' 1 "lexicor: 'a"$'\xe3'"' ends inside the character that begins at byte 1" "$lexicor" compare a$'\xe3' b
+says 'case and width' 2 'excludes' "$lexicor" compare --width-insensitive --case-insensitive a b
+orders 0 '61 C3 A9' key --locale English@BINARY aé
+orders 0 '[ | | |]' key --locale English@Default ''
+orders 0 "$("$lexicor" key --locale English@Default ae | sed 's/\]/ 0002:0014]/')" key --locale English@Default a-e
+"$lexicor" key --locale English@Default -- -- | grep -qE '^\[ \| \| \|( [0-9A-F]{4}){2}\]$' || fault 'a key of special weights'
+orders 0 'côte < coté: decided by the secondary weights' explain --locale French@FrenchCanadian côte coté
+grep -q 'inserted: secondary  ô$' out && grep -q '^secondary: decides: number 1 is ' out || fault "explain: $(cat out)"
+orders 0 'côte > coté: decided by the secondary weights' explain --locale French@Default côte coté
+orders 0 'chata > cihla: decided by the primary weights' explain --locale Czech@Czech chata cihla
+grep -q '^  U+0063 U+0068  .*  ch$' out || fault "a pair explained: $(cat out)"
+orders 0 'co-op > coop: decided by the special weights' explain --locale English@Default co-op coop
+grep -q '^special: decides: number 1 is 0003:.* in A, none in B$' out || fault "special weights explained: $(cat out)"
+orders 0 'æ = æ: nothing decides' explain --locale English@Default æ æ
+grep -q '^    and  ' out || fault "an expansion explained: $(cat out)"
+orders 0 '😀 > é: decided by the bytes' explain --locale English@BINARY 😀 é
+grep -q '^  U+FFFD  F0     byte F0$' out || fault "bytes explained: $(cat out)"
+
 # --- Locales: their items, and the operating system's names.
 "$lexicor" info English_UnitedStates.IBM930 >out || fault 'info'
 [ "$(awk '{print $1}' out)" = "$(seq 88)" ] || fault 'info: the 88 items'

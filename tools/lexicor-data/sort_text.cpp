@@ -11,6 +11,7 @@
 #include <tuple>
 #include <vector>
 
+#include "line_text.h"
 #include "sort_check.h"
 #include "ucm.h"
 
@@ -35,17 +36,6 @@ std::string hex(unsigned value) {
   char text[16];
   std::snprintf(text, sizeof text, "%04X", value);
   return text;
-}
-
-bool is_blank(char c) {
-  return c == ' ' || c == '\t';
-}
-
-int hex_value(char c) {
-  if (c >= '0' && c <= '9') return c - '0';
-  if (c >= 'A' && c <= 'F') return c - 'A' + 10;
-  if (c >= 'a' && c <= 'f') return c - 'a' + 10;
-  return -1;
 }
 
 bool is_surrogate(unsigned code) {

@@ -10,6 +10,8 @@
 #include <ostream>
 #include <tuple>
 
+#include "line_text.h"
+
 namespace lexicor_data {
 namespace {
 
@@ -67,17 +69,6 @@ std::string unicode_text(uint32_t unicode) {
 
 uint32_t first_byte(const Mapping& mapping) {
   return mapping.code >> (8 * (mapping.bytes - 1));
-}
-
-bool is_blank(char c) {
-  return c == ' ' || c == '\t';
-}
-
-int hex_value(char c) {
-  if (c >= '0' && c <= '9') return c - '0';
-  if (c >= 'A' && c <= 'F') return c - 'A' + 10;
-  if (c >= 'a' && c <= 'f') return c - 'a' + 10;
-  return -1;
 }
 
 bool canonical_less(const Mapping& a, const Mapping& b) {

@@ -94,4 +94,11 @@ int32_t Codepage::char_bytes(const char* text, LXShiftState state) const {
   return LXByteLength(locale_, text);
 }
 
+size_t Codepage::whole_bytes(const char* text, size_t bytes, LXShiftState state,
+                             LXShiftState* end_state) const {
+  const char* const end =
+      LXMoveStringPointerEx(locale_, text, state, static_cast<int32_t>(bytes), end_state, 0);
+  return static_cast<size_t>(end - text);
+}
+
 }  // namespace lexicor_cli

@@ -41,6 +41,8 @@ class Codepage {
   size_t call_bytes(const char* text, size_t bytes) const;
   /// Bytes of the character at `text`, which is no shift byte.
   int32_t char_bytes(const char* text, LXShiftState state) const;
+  /// The whole characters in the first `bytes` bytes of a text; `*end_state` is the state behind them.
+  size_t whole_bytes(const char* text, size_t bytes, LXShiftState state, LXShiftState* end_state) const;
 
  private:
   static constexpr unsigned kUtf8Id = 57352;

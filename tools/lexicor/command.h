@@ -9,7 +9,8 @@
 
 namespace lexicor_cli {
 
-enum ExitCode { kDone = 0, kDataError = 1, kUsageError = 2 };
+/// The last two are answers of `compare`, whose kDone says that the texts are equal.
+enum ExitCode { kDone = 0, kDataError = 1, kUsageError = 2, kLess = 3, kGreater = 4 };
 
 /// Ends the program with a message on standard error and an exit code.
 class Failure : public std::runtime_error {
@@ -38,10 +39,16 @@ struct Subcommand {
   Declare declare;
 };
 
+Run declare_compare(CLI::App& command, const CommonOptions& common);
 Run declare_convert(CLI::App& command, const CommonOptions& common);
+Run declare_explain(CLI::App& command, const CommonOptions& common);
+Run declare_format(CLI::App& command, const CommonOptions& common);
 Run declare_info(CLI::App& command, const CommonOptions& common);
+Run declare_key(CLI::App& command, const CommonOptions& common);
 Run declare_list(CLI::App& command, const CommonOptions& common);
 Run declare_map(CLI::App& command, const CommonOptions& common);
 Run declare_native(CLI::App& command, const CommonOptions& common);
+Run declare_parse(CLI::App& command, const CommonOptions& common);
+Run declare_sort(CLI::App& command, const CommonOptions& common);
 
 }  // namespace lexicor_cli

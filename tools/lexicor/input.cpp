@@ -46,6 +46,12 @@ bool Input::open_next() {
   return true;
 }
 
+std::vector<uint64_t> Input::starts() const {
+  std::vector<uint64_t> offsets;
+  for (const Start& start : starts_) offsets.push_back(start.offset);
+  return offsets;
+}
+
 uint64_t Input::total_bytes() const {
   uint64_t total = 0;
   for (const std::string& name : names_) {

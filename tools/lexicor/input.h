@@ -21,6 +21,9 @@ class Input {
   /// and the reason.
   size_t read(char* buffer, size_t bytes);
 
+  /// Where the files that have been opened begin in the whole text.
+  std::vector<uint64_t> starts() const;
+
   /// The size of all files together; 0 when one of them is no regular file.
   uint64_t total_bytes() const;
 

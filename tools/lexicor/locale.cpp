@@ -118,6 +118,10 @@ LocalePtr open_user_locale(std::string* missing) {
   return opened(locale, code, "the user's");
 }
 
+LocalePtr open_chosen_locale(const std::string& name) {
+  return name.empty() ? open_user_locale() : open_locale(name);
+}
+
 std::string map_native_name(const std::string& native_name, ExitCode unknown) {
   char name[kNameBytes];
   const std::string mapped = LXMapNativeLocale(native_name.c_str(), name, sizeof name);
@@ -143,6 +147,11 @@ std::optional<std::string> text_item(LXLocale* locale, int32_t item) {
   units.resize(static_cast<size_t>(written) - 1);
   for (const LXUChar unit : units) append_utf8(text, unit);
   return text;
+}
+
+std::string language_territory(LXLocale* locale) {
+  return text_item(locale, LX_ITEM_LANGUAGE).value_or("") + "_" +
+         text_item(locale, LX_ITEM_TERRITORY).value_or("");
 }
 
 }  // namespace lexicor_cli

@@ -41,6 +41,8 @@ LocalePtr open_native_locale(const std::string& native_name);
 /// The user's locale, with defaults in place of what is not there; `*missing` tells the first thing that is
 /// not.
 LocalePtr open_user_locale(std::string* missing = nullptr);
+/// The locale of an option: of a core name, or the user's where the name is empty.
+LocalePtr open_chosen_locale(const std::string& name);
 
 /// The locale name that an operating-system name stands for. Throws a Failure with the exit code `unknown` when
 /// it stands for none.
@@ -50,5 +52,7 @@ std::string map_native_name(const std::string& native_name, ExitCode unknown);
 std::optional<int32_t> number_item(LXLocale* locale, int32_t item);
 /// The value of a text item in UTF-8; none where the directory lacks the object that it would name.
 std::optional<std::string> text_item(LXLocale* locale, int32_t item);
+/// The beginning of a locale's name, "German_Austria".
+std::string language_territory(LXLocale* locale);
 
 }  // namespace lexicor_cli

@@ -3,8 +3,9 @@
 #include "loss.h"
 
 #include <algorithm>
-#include <cstdio>
 #include <cstring>
+
+#include "hex.h"
 
 namespace lexicor_cli {
 
@@ -52,16 +53,6 @@ class Substitution {
   bool known_ = false;
 };
 
-std::string hex_bytes(const char* text, int32_t bytes) {
-  std::string result;
-  for (int32_t i = 0; i < bytes; ++i) {
-    char hex[8];
-    std::snprintf(hex, sizeof hex, " %02X", static_cast<unsigned>(static_cast<unsigned char>(text[i])));
-    result += hex;
-  }
-  return result;
-}
-
 // A UTF-8 character of four bytes lies beyond 16-bit Unicode: the library takes it as four bytes without a
 // value, the report as the one character that its writer meant.
 constexpr size_t kLongUtf8Bytes = 4;
@@ -94,12 +85,6 @@ size_t long_utf8_beginning(const std::string& text) {
     if (!is_utf8_trail(c)) return 0;
   }
   return 0;
-}
-
-std::string code_point_name(uint32_t code_point) {
-  char name[16];
-  std::snprintf(name, sizeof name, "U+%04X", static_cast<unsigned>(code_point));
-  return name;
 }
 
 }  // namespace
@@ -198,7 +183,8 @@ LossFinder::Kind LossFinder::kind_of(LXWChar code, LXUChar unicode) const {
 
 std::string LossFinder::describe(const char* text, int32_t bytes, LXUChar unicode, Kind kind) const {
   if (kind == Kind::kNotInTarget) return code_point_name(unicode) + ", which " + target_.name() + " lacks";
-  return (bytes == 1 ? "byte" : "bytes") + hex_bytes(text, bytes) + ", no character in " + source_.name();
+  return (bytes == 1 ? "byte " : "bytes ") + hex_bytes({text, static_cast<size_t>(bytes)}) +
+         ", no character in " + source_.name();
 }
 
 void LossFinder::record(uint64_t offset, const std::string& message) {

@@ -1,5 +1,5 @@
-// lexicor: conversion and mapping of text and a look into a locale directory, from the command line.
-// Exit codes: 0 done, 1 an error in the data or the files, 2 a wrong command line.
+// lexicor: conversion, mapping and sorting of text and a look into a locale directory, from the command line.
+// Exit codes: 0 done, 1 an error in the data or the files, 2 a wrong command line, and of `compare` 3 and 4.
 #include <lx.h>
 
 #include <csignal>
@@ -20,6 +20,12 @@ using namespace lexicor_cli;
 constexpr Subcommand kSubcommands[] = {
     {"convert", "Convert text from one codepage to another", declare_convert},
     {"map", "Map text to another case or width, or to ASCII digits", declare_map},
+    {"sort", "Sort the lines of a text by a locale's sort", declare_sort},
+    {"compare", "Tell which of two texts comes first", declare_compare},
+    {"key", "Show the sort key of a text", declare_key},
+    {"explain", "Show the weights of two texts, and which of them decides", declare_explain},
+    {"format", "Write a number, an amount of money or a time as a locale does", declare_format},
+    {"parse", "Read what a locale writes: a number, an amount of money or a time", declare_parse},
     {"info", "Show the items of a locale", declare_info},
     {"list", "List the objects of the locale directory, or the operating system's locales", declare_list},
     {"native", "Show what an operating-system name of a locale stands for", declare_native},
@@ -31,6 +37,8 @@ constexpr char kFooter[] =
     "  lexicor convert --from MS932 --to UTF-8 -o letter.utf8 letter.sjis\n"
     "  lexicor convert --from UTF-8 --to IBM930 --strict < letter.utf8 > letter.host\n"
     "  lexicor map upper --locale German letter.utf8\n"
+    "  lexicor sort --locale Swedish names.txt\n"
+    "  lexicor explain --locale French@FrenchCanadian côte coté\n"
     "  lexicor info German_Austria\n"
     "  lexicor convert --help";
 

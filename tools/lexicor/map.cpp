@@ -87,10 +87,7 @@ class Mapper {
 
   /// The whole characters in the first bytes of text_.
   size_t whole_bytes(size_t bytes, LXShiftState* state) const {
-    const char* const text = text_.data();
-    const char* const end =
-        LXMoveStringPointerEx(codepage_.locale(), text, state_, static_cast<int32_t>(bytes), state, 0);
-    return static_cast<size_t>(end - text);
+    return codepage_.whole_bytes(text_.data(), bytes, state_, state);
   }
 
   /// The last whole characters of text_.
@@ -195,10 +192,9 @@ class Mapper {
 
 int map(const MapOptions& options, const CommonOptions& common) {
   const Session session(common);
-  const LocalePtr named = options.locale.empty() ? open_user_locale() : open_locale(options.locale);
+  const LocalePtr named = open_chosen_locale(options.locale);
   const std::string language = text_item(named.get(), LX_ITEM_LANGUAGE).value_or("");
-  const std::string territory = text_item(named.get(), LX_ITEM_TERRITORY).value_or("");
-  const Codepage codepage(session, read_catalogue(), options.codepage, language + "_" + territory);
+  const Codepage codepage(session, read_catalogue(), options.codepage, language_territory(named.get()));
   Input input(options.files);
   Pieces pieces(input);
   Output output(options.output);

@@ -11,13 +11,12 @@ namespace lexicor_cli {
 
 namespace {
 
-constexpr uint64_t kWorthShowing = 8 * 1024 * 1024;
 constexpr int kBarChars = 40;
 
 }  // namespace
 
-Progress::Progress(uint64_t total, bool allowed)
-    : total_(total), visible_(allowed && total > kWorthShowing && isatty(STDERR_FILENO) != 0) {}
+Progress::Progress(uint64_t total, bool allowed, uint64_t worth_showing)
+    : total_(total), visible_(allowed && total > worth_showing && isatty(STDERR_FILENO) != 0) {}
 
 Progress::~Progress() {
   if (visible_) std::fputs("\r\033[K", stderr);

@@ -7,8 +7,10 @@ namespace lexicor_cli {
 
 class Progress {
  public:
-  /// Shows nothing unless standard error is a terminal and `total` is above 8 MiB.
-  Progress(uint64_t total, bool allowed);
+  static constexpr uint64_t kWorthShowing = 8 * 1024 * 1024;
+
+  /// Shows nothing unless standard error is a terminal and `total` is above `worth_showing`.
+  Progress(uint64_t total, bool allowed, uint64_t worth_showing = kWorthShowing);
   /// Takes the bar off the screen.
   ~Progress();
   Progress(const Progress&) = delete;

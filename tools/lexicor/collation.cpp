@@ -1,0 +1,68 @@
+// The locale of the codepage gets the sort of the locale that was named, so that one handle has both.
+#include "collation.h"
+
+#include <limits>
+
+namespace lexicor_cli {
+
+namespace {
+
+// Folding makes two characters of a byte, and each of them has two elements of 4 bytes.
+constexpr size_t kKeyBytesPerByte = 16;
+constexpr size_t kKeySeparators = 3;
+
+int32_t length_of(std::string_view text) {
+  constexpr size_t kMost = std::numeric_limits<int32_t>::max() / kKeyBytesPerByte - kKeySeparators;
+  if (text.size() > kMost)
+    throw Failure(kDataError, "a text of " + std::to_string(text.size()) + " bytes is too long to be ordered");
+  return static_cast<int32_t>(text.size());
+}
+
+[[noreturn]] void throw_failed(LXLocale* locale) {
+  throw Failure(kDataError, "the comparison failed: " + describe_code(LXGetError(locale)));
+}
+
+}  // namespace
+
+Collation::Collation(const Session& session, const std::string& locale_name, const std::string& codepage)
+    : Collation(session, open_chosen_locale(locale_name), codepage) {}
+
+Collation::Collation(const Session& session, const LocalePtr& named, const std::string& codepage)
+    : codepage_(session, read_catalogue(), codepage, language_territory(named.get())) {
+  const int32_t id = number_item(named.get(), LX_ITEM_SORT_ID).value_or(0);
+  int32_t code = LX_OK;
+  sort_ = LXGetObjFromID(nullptr, LX_SORT, static_cast<uint16_t>(id), LX_FIND_AND_LOAD, &code);
+  if (code == LX_OK && LXSetLocaleNumInfo(codepage_.locale(), LX_ITEM_SORT_ID, id) == 0)
+    code = LXGetError(codepage_.locale());
+  if (code != LX_OK)
+    throw Failure(kDataError, "sort " + std::to_string(id) + " cannot be used: " + describe_code(code));
+}
+
+int32_t Collation::compare(std::string_view text1, std::string_view text2, uint32_t options) const {
+  LXLocale* const locale = codepage_.locale();
+  const int32_t result = LXStrcollEx(locale, text1.data(), LX_SHIFT_SINGLE, length_of(text1), text2.data(),
+                                     LX_SHIFT_SINGLE, length_of(text2), options);
+  if (result == 0 && LXGetError(locale) != LX_OK) throw_failed(locale);
+  return result;
+}
+
+void Collation::append_key(std::string_view text, uint32_t options, std::string* keys) {
+  LXLocale* const locale = codepage_.locale();
+  const int32_t length = length_of(text);
+  const size_t most = text.size() * kKeyBytesPerByte + kKeySeparators;
+  if (room_.size() < most) room_.resize(most);
+  const int32_t bytes = LXStrxfrmEx(locale, reinterpret_cast<uint8_t*>(room_.data()),
+                                    static_cast<int32_t>(most), text.data(), LX_SHIFT_SINGLE, length, options);
+  if (bytes < 0) throw_failed(locale);
+  keys->append(room_.data(), static_cast<size_t>(bytes));
+}
+
+void Collation::check_argument(const std::string& text) const {
+  LXShiftState state;
+  const size_t whole = codepage_.whole_bytes(text.data(), text.size(), LX_SHIFT_SINGLE, &state);
+  if (whole == text.size()) return;
+  throw Failure(kDataError,
+                "'" + text + "' ends inside the character that begins at byte " + std::to_string(whole));
+}
+
+}  // namespace lexicor_cli

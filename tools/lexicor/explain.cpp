@@ -1,0 +1,279 @@
+// lexicor explain: the collation elements of two texts, their weights level by level as they are compared, and
+// the weight that decides.
+#include <lx.h>
+
+#include <algorithm>
+#include <memory>
+#include <sstream>
+#include <utility>
+#include <vector>
+
+#include "collation.h"
+#include "command.h"
+#include "hex.h"
+#include "output.h"
+#include "report.h"
+
+namespace lexicor_cli {
+
+namespace {
+
+struct ExplainOptions {
+  std::string locale;  // empty: the user's
+  std::string text1, text2;
+};
+
+/// One level of a text: its weights in the order in which they are compared.
+struct Level {
+  std::vector<uint32_t> weights;
+  size_t insert_point = 0;
+  size_t appended_first = 0;  // weights before the first one that was inserted
+  bool inserts = false;
+
+  void place(uint32_t weight, bool append) {
+    if (!append && !inserts) {
+      inserts = true;
+      appended_first = weights.size();
+    }
+    weights.insert(append ? weights.end() : weights.begin() + static_cast<ptrdiff_t>(insert_point), weight);
+    if (append) insert_point = weights.size();
+  }
+};
+
+/// What is known of a level before any text: its name, how its weights look, and the class bit for appending.
+struct LevelKind {
+  const char* title;
+  int digits;
+  uint8_t append;
+};
+constexpr LevelKind kLevels[] = {{"primary", 4, LX_APPEND_PRIMARY},
+                                 {"secondary", 2, LX_APPEND_SECONDARY},
+                                 {"tertiary", 2, LX_APPEND_TERTIARY},
+                                 {"special", 4, LX_APPEND_SPECIAL}};
+constexpr size_t kLevelCount = 4;
+constexpr size_t kSpecial = 3;
+constexpr LevelKind kBytes = {"bytes", 2, 0};
+
+using Row = std::vector<std::string>;
+
+/// A text, taken apart: rows of its elements for the reader, and its levels.
+struct Explained {
+  std::vector<Row> rows;
+  std::vector<Level> levels;
+};
+
+/// A character of a text.
+struct Char {
+  std::string bytes;
+  LXUChar unicode;
+  std::string shown;
+};
+
+/// A control character is not shown, nor is what has no value in 16-bit Unicode: its bytes are.
+std::string shown(const Codepage& codepage, const Char& c) {
+  char bytes[8];
+  const int32_t count = LXCpUnicodeToChar(codepage.object(), c.unicode, bytes);
+  if (c.bytes != std::string_view(bytes, static_cast<size_t>(count)))
+    return (c.bytes.size() == 1 ? "byte " : "bytes ") + hex_bytes(c.bytes);
+  return c.unicode < 0x20 || (c.unicode >= 0x7F && c.unicode < 0xA0) ? "" : c.bytes;
+}
+
+std::vector<Char> chars_of(const Codepage& codepage, const std::string& text) {
+  std::vector<Char> chars;
+  for (size_t at = 0; at < text.size();) {
+    const int32_t bytes = codepage.char_bytes(&text[at], LX_SHIFT_SINGLE);
+    Char c{text.substr(at, static_cast<size_t>(bytes)), 0, ""};
+    LXStringToUnicode(&c.unicode, 1, codepage.locale(), &text[at], bytes, 0);
+    c.shown = shown(codepage, c);
+    chars.push_back(c);
+    at += c.bytes.size();
+  }
+  return chars;
+}
+
+std::string weight_text(const LevelKind& kind, uint32_t weight) {
+  if (kind.append != LX_APPEND_SPECIAL) return hex_text(weight, kind.digits);
+  return hex_text(weight >> 16, kind.digits) + ":" + hex_text(weight & 0xFFFF, kind.digits);
+}
+
+/// The rows and levels of a text under a sort object.
+class Weigher {
+ public:
+  Weigher(const LXObject* sort, const std::vector<Char>& chars) : sort_(sort), chars_(chars) {
+    text_.levels.resize(kLevelCount);
+    text_.rows.push_back({"", "primary", "secondary", "tertiary", "special", "weights are", "character"});
+    while (at_ < chars_.size()) take_element();
+  }
+
+  Explained text() { return std::move(text_); }
+
+ private:
+  void take_element() {
+    LXWeights first{}, second{};
+    uint8_t char_class = 0;
+    const Char& c = chars_[at_];
+    if (at_ + 1 < chars_.size()) {
+      const Char& next = chars_[at_ + 1];
+      if (LXSortGetCombination(sort_, c.unicode, next.unicode, &first, &char_class) != 0) {
+        at_ += 2;
+        add(code_point_name(c.unicode) + " " + code_point_name(next.unicode), c.shown + next.shown, first,
+            char_class);
+        return;
+      }
+    }
+    ++at_;
+    const int32_t sets = LXSortGetWeights(sort_, c.unicode, &first, &second, &char_class);
+    add(code_point_name(c.unicode), c.shown, first, char_class);
+    if (sets == 2) add("", "", second, char_class);
+  }
+
+  void add(const std::string& name, const std::string& characters, const LXWeights& weights,
+           uint8_t char_class) {
+    const uint32_t values[kLevelCount] = {weights.primary, weights.secondary, weights.tertiary,
+                                          weights.special};
+    Row row = {"  " + (name.empty() ? "  and" : name)};
+    std::string inserted;
+    bool weighs = false;
+    for (size_t i = 0; i < kLevelCount; ++i) {
+      const LevelKind& kind = kLevels[i];
+      row.push_back(values[i] == 0 ? "-" : hex_text(values[i], kind.digits));
+      if (values[i] == 0) continue;
+      weighs = true;
+      const bool append = (char_class & kind.append) != 0;
+      if (!append) inserted += (inserted.empty() ? "inserted: " : ", ") + std::string(kind.title);
+      const auto position = static_cast<uint32_t>(i == kSpecial ? (at_ & 0xFFFF) << 16 : 0);
+      text_.levels[i].place(position | values[i], append);
+    }
+    row.push_back(!weighs ? "none: ignored" : inserted.empty() ? "appended" : inserted);
+    row.push_back(characters);
+    text_.rows.push_back(row);
+  }
+
+  const LXObject* sort_;
+  const std::vector<Char>& chars_;
+  size_t at_ = 0;  // also the position of the character before it, counted from 1
+  Explained text_;
+};
+
+/// In binary order the bytes are all that counts.
+Explained bytes_of(const std::vector<Char>& chars) {
+  Explained text;
+  text.levels.resize(1);
+  text.rows.push_back({"", "bytes", "character"});
+  for (const Char& c : chars) {
+    for (const char byte : c.bytes) text.levels[0].place(static_cast<uint8_t>(byte), true);
+    text.rows.push_back({"  " + code_point_name(c.unicode), hex_bytes(c.bytes), c.shown});
+  }
+  return text;
+}
+
+void write_table(std::ostream& out, const std::vector<Row>& rows) {
+  std::vector<size_t> chars(rows[0].size());
+  for (const Row& row : rows) {
+    // The last column, of characters that may be of any width, is not filled up.
+    for (size_t i = 0; i + 1 < row.size(); ++i) chars[i] = std::max(chars[i], row[i].size());
+  }
+  for (const Row& row : rows) {
+    std::string line;
+    for (size_t i = 0; i < row.size(); ++i) line += (i > 0 ? "  " : "") + padded(row[i], chars[i]);
+    out << line.substr(0, line.find_last_not_of(' ') + 1) << '\n';
+  }
+}
+
+/// What a level says: the place of the weight that decides, if one does, and a remark for the reader.
+struct Verdict {
+  bool decides;
+  std::string text;
+};
+
+Verdict judge(const LevelKind& kind, const Level& a, const Level& b) {
+  const size_t shorter = std::min(a.weights.size(), b.weights.size());
+  const auto place = static_cast<size_t>(
+      std::mismatch(a.weights.begin(), a.weights.begin() + static_cast<ptrdiff_t>(shorter), b.weights.begin())
+          .first -
+      a.weights.begin());
+  if (place == a.weights.size() && place == b.weights.size())
+    return {false, place == 0 ? "no weights" : "equal"};
+  const auto inserts_before = [&](const Level& level) {
+    return level.inserts && level.appended_first < shorter;
+  };
+  if (place == shorter && kind.append == LX_APPEND_PRIMARY && (inserts_before(a) || inserts_before(b)))
+    return {false, "equal as far as both go; behind inserted weights their number does not count"};
+  const auto weight = [&](const Level& level) {
+    return place < level.weights.size() ? weight_text(kind, level.weights[place]) : "none";
+  };
+  return {true, "decides: number " + std::to_string(place + 1) + " is " + weight(a) + " in A, " + weight(b) +
+                    " in B"};
+}
+
+void write_level(std::ostream& out, const LevelKind& kind, const Level& level, char name) {
+  out << "  " << name;
+  for (size_t i = 0; i < level.weights.size(); ++i) out << ' ' << weight_text(kind, level.weights[i]);
+  out << '\n';
+}
+
+/// The levels of both texts; returns the title of the one that decides, or an empty text.
+std::string write_levels(std::ostream& out, const Explained& a, const Explained& b) {
+  std::string decided;
+  for (size_t i = 0; i < a.levels.size(); ++i) {
+    const LevelKind& kind = a.levels.size() == 1 ? kBytes : kLevels[i];
+    const Verdict verdict = judge(kind, a.levels[i], b.levels[i]);
+    out << '\n' << kind.title << ": " << (decided.empty() ? verdict.text : "not reached") << '\n';
+    write_level(out, kind, a.levels[i], 'A');
+    write_level(out, kind, b.levels[i], 'B');
+    if (decided.empty() && verdict.decides) decided = kind.title;
+  }
+  return decided;
+}
+
+int explain(const ExplainOptions& options, const CommonOptions& common) {
+  const Session session(common);
+  const Collation collation(session, options.locale);
+  collation.check_argument(options.text1);
+  collation.check_argument(options.text2);
+  std::ostringstream out;
+  const auto take_apart = [&](char name, const std::string& text) {
+    const std::vector<Char> chars = chars_of(collation.codepage(), text);
+    Explained explained = collation.binary() ? bytes_of(chars) : Weigher(collation.sort(), chars).text();
+    explained.rows[0][0] = name;
+    write_table(out, explained.rows);
+    return explained;
+  };
+  out << "sort " << text_item(collation.codepage().locale(), LX_ITEM_SORT).value_or("") << "\n\n";
+  const Explained a = take_apart('A', options.text1);
+  out << '\n';
+  const Explained b = take_apart('B', options.text2);
+  const std::string decided = write_levels(out, a, b);
+  out << '\n'
+      << options.text1 << sign_text(collation.compare(options.text1, options.text2, 0)) << options.text2 << ": "
+      << (decided.empty() ? "nothing decides"
+                          : "decided by the " + decided + (collation.binary() ? "" : " weights"))
+      << '\n';
+  Output().write(out.str());
+  return kDone;
+}
+
+}  // namespace
+
+Run declare_explain(CLI::App& command, const CommonOptions& common) {
+  const auto options = std::make_shared<ExplainOptions>();
+  command.add_option("--locale", options->locale, "locale whose sort is used; else the user's locale")
+      ->type_name("LOCALE");
+  command.add_option("A", options->text1, "a text, in UTF-8")->required()->type_name("");
+  command.add_option("B", options->text2, "another one")->required()->type_name("");
+  command.footer(
+      "Shows the elements of each text with their weights in hexadecimal: a character, a pair that sorts as "
+      "one,\n"
+      "or the two of an expansion. Appended weights stand behind those before them; inserted ones ahead of the "
+      "run\n"
+      "of such. Then come the weights in the order in which they are compared, a special one behind the "
+      "position of\n"
+      "its character. In binary order the bytes of the text take the place of weights.\n"
+      "\n"
+      "Examples:\n"
+      "  lexicor explain --locale French@FrenchCanadian côte coté\n"
+      "  lexicor explain --locale Czech@Czech chata cihla");
+  return [options, &common] { return explain(*options, common); };
+}
+
+}  // namespace lexicor_cli

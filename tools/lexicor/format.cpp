@@ -1,0 +1,255 @@
+// lexicor format and lexicor parse: numbers, amounts of money and times as a locale writes them, and back.
+#include <lx.h>
+
+#include <array>
+#include <charconv>
+#include <cstdio>
+#include <map>
+#include <memory>
+
+#include "command.h"
+#include "locale.h"
+#include "moment.h"
+#include "output.h"
+#include "session.h"
+#include "text_locale.h"
+
+namespace lexicor_cli {
+
+namespace {
+
+// The digits of the largest double, each with a separator, and signs and symbols beside them.
+constexpr size_t kNumberUnits = 2048;
+
+struct ValueOptions {
+  std::string kind;
+  std::string locale;  // empty: the user's
+  std::string format;  // empty: kDefaultFormat
+  bool international = false;
+  std::string text;
+};
+
+std::string written_text(const TextLocale& locale, const Units& units, int32_t written) {
+  const int32_t code = LXGetError(locale.locale());
+  if (written < 0 || code != LX_OK)
+    throw Failure(kDataError, "the value cannot be written: " + describe_code(code));
+  return locale.text(units, static_cast<size_t>(written));
+}
+
+/// Reads a whole argument as a C number; throws a Failure that points at what is none.
+template <typename Number>
+std::errc read_c_number(const std::string& text, Number* value, size_t* stop) {
+  const std::from_chars_result result = std::from_chars(text.data(), text.data() + text.size(), *value);
+  *stop = static_cast<size_t>(result.ptr - text.data());
+  return result.ec;
+}
+
+double c_double(const TextLocale& locale, const std::string& text) {
+  double value = 0;
+  size_t stop;
+  const std::errc error = read_c_number(text, &value, &stop);
+  const Units units = locale.units(text);
+  if (error == std::errc::result_out_of_range)
+    throw locale.pointing(kDataError, "a number that a double cannot hold", units, 0);
+  if (error != std::errc() || stop < text.size())
+    throw locale.pointing(kDataError, "no number of the form -1234.56", units, stop);
+  return value;
+}
+
+std::string format_number(const TextLocale& locale, const ValueOptions& options) {
+  Units units(kNumberUnits);
+  int32_t integer = 0;
+  size_t stop;
+  if (read_c_number(options.text, &integer, &stop) == std::errc() && stop == options.text.size())
+    return written_text(locale, units,
+                        LXLongToStringU(locale.locale(), integer, units.data(), kNumberUnits, 0));
+  const double value = c_double(locale, options.text);
+  return written_text(locale, units, LXDoubleToStringU(locale.locale(), value, units.data(), kNumberUnits, 0));
+}
+
+std::string format_money(const TextLocale& locale, const ValueOptions& options) {
+  Units units(kNumberUnits);
+  const double value = c_double(locale, options.text);
+  return written_text(locale, units,
+                      LXCurrencyToStringU(locale.locale(), value, units.data(), kNumberUnits,
+                                          options.international ? LX_INTERNATIONAL : 0));
+}
+
+int32_t class_of(LXLocale* locale, LXUChar unit) {
+  return LXStrGetDigitU(locale, &unit, 1, nullptr, nullptr, nullptr, nullptr, nullptr, 1, LX_NATIONAL_DIGITS);
+}
+
+bool is_digit(LXLocale* locale, LXUChar unit) {
+  const int32_t value = class_of(locale, unit);
+  return value >= 0 && value <= 9;
+}
+
+/// Reads the part of a text from `begin` to `end`. A thousands separator that is white space ends a number for
+/// the library, so those between digits are left out. Throws a Failure that points at where reading stopped.
+double read_double(const TextLocale& locale, const Units& text, size_t begin, size_t end, bool monetary) {
+  LXLocale* const handle = locale.locale();
+  const Units separator =
+      locale.units(text_item(handle, monetary ? LX_ITEM_MONETARY_THOUSANDS : LX_ITEM_THOUSANDS).value_or(""));
+  const bool blank = !separator.empty() && class_of(handle, separator[0]) == LX_CLASS_SPACE;
+  Units units;
+  std::vector<size_t> places;
+  for (size_t i = begin; i < end; ++i) {
+    if (blank && text[i] == separator[0] && i > begin && i + 1 < end && is_digit(handle, text[i - 1]) &&
+        is_digit(handle, text[i + 1]))
+      continue;
+    units.push_back(text[i]);
+    places.push_back(i);
+  }
+  places.push_back(end);
+  const LXUChar* stop = units.data();
+  const double value = LXStringToDoubleU(handle, units.data(), static_cast<int32_t>(units.size()), &stop,
+                                         LX_NATIONAL_DIGITS | (monetary ? LX_MONETARY : 0));
+  const size_t read = static_cast<size_t>(stop - units.data());
+  bool digits = false;
+  for (size_t i = 0; i < read; ++i) digits |= is_digit(handle, units[i]);
+  if (!digits || read < units.size())
+    throw locale.pointing(kDataError, monetary ? "no amount of the locale" : "no number of the locale", text,
+                          places[read]);
+  return value;
+}
+
+/// An amount without what stands around its digits.
+class Amount {
+ public:
+  Amount(const TextLocale& locale, const Units& text) : locale_(locale), text_(text), end_(text.size()) {}
+
+  double read() {
+    const Units minus = item(LX_ITEM_NEGATIVE_SIGN), plus = item(LX_ITEM_POSITIVE_SIGN);
+    peel_blanks();
+    const bool parentheses = number_item(locale_.locale(), LX_ITEM_NEGATIVE_POSITION) == 0 &&
+                             end_ - begin_ >= 2 && text_[begin_] == '(' && text_[end_ - 1] == ')';
+    begin_ += parentheses ? 1 : 0;
+    end_ -= parentheses ? 1 : 0;
+    // A sign stands outside or inside of the symbol.
+    bool negative = peel(minus), sign = negative || peel(plus);
+    if (!peel(item(LX_ITEM_CURRENCY))) peel(item(LX_ITEM_INTERNATIONAL_CURRENCY));
+    if (!sign) {
+      negative = peel(minus);
+      sign = negative || peel(plus);
+    }
+    const double value = read_double(locale_, text_, begin_, end_, true);
+    return negative || parentheses ? -value : value;
+  }
+
+ private:
+  Units item(int32_t number) const { return locale_.units(text_item(locale_.locale(), number).value_or("")); }
+
+  bool is_blank(LXUChar unit) const { return class_of(locale_.locale(), unit) == LX_CLASS_SPACE; }
+
+  void peel_blanks() {
+    while (begin_ < end_ && is_blank(text_[begin_])) ++begin_;
+    while (begin_ < end_ && is_blank(text_[end_ - 1])) --end_;
+  }
+
+  /// Takes a part off the beginning or the end, and the white space behind it.
+  bool peel(const Units& part) {
+    if (part.empty() || part.size() > end_ - begin_) return false;
+    const auto at = [&](size_t place) {
+      return std::equal(part.begin(), part.end(), text_.begin() + static_cast<ptrdiff_t>(place));
+    };
+    if (at(begin_))
+      begin_ += part.size();
+    else if (at(end_ - part.size()))
+      end_ -= part.size();
+    else
+      return false;
+    peel_blanks();
+    return true;
+  }
+
+  const TextLocale& locale_;
+  const Units& text_;
+  size_t begin_ = 0, end_;
+};
+
+/// Without the digits that adding fraction digits one by one leaves inexact.
+std::string c_text(double value) {
+  char text[32];
+  std::snprintf(text, sizeof text, "%.15g", value);
+  return text;
+}
+
+std::string format_time(const TextLocale& locale, const ValueOptions& options) {
+  return format_moment(locale, options.text, options.format.empty() ? kDefaultFormat : options.format);
+}
+
+std::string parse_number(const TextLocale& locale, const ValueOptions& options) {
+  const Units units = locale.units(options.text);
+  return c_text(read_double(locale, units, 0, units.size(), false));
+}
+
+std::string parse_money(const TextLocale& locale, const ValueOptions& options) {
+  const Units units = locale.units(options.text);
+  return c_text(Amount(locale, units).read());
+}
+
+std::string parse_time(const TextLocale& locale, const ValueOptions& options) {
+  return parse_moment(locale, options.text, options.format.empty() ? kDefaultFormat : options.format);
+}
+
+using Work = std::string (*)(const TextLocale&, const ValueOptions&);
+using Works = std::map<std::string, Work>;
+
+const Works kFormats = {{"number", format_number}, {"money", format_money}, {"time", format_time}};
+const Works kParses = {{"number", parse_number}, {"money", parse_money}, {"time", parse_time}};
+
+Run declare_values(CLI::App& command, const CommonOptions& common, const Works& works, const char* text_name,
+                   const char* text_help, const std::shared_ptr<ValueOptions>& options) {
+  command.add_option("KIND", options->kind, "number, money or time")
+      ->required()
+      ->type_name("")
+      ->check(CLI::IsMember(works));
+  command.add_option(text_name, options->text, text_help)->required()->type_name("");
+  command.add_option("--locale", options->locale, "locale by whose conventions; else the user's")
+      ->type_name("LOCALE");
+  command.add_option("--format", options->format, "of a time: a text with directives; else '%x %X'")
+      ->type_name("FORMAT");
+  return [options, &common, &works] {
+    if (!options->format.empty() && options->kind != "time")
+      throw Failure(kUsageError, "--format is for times");
+    if (options->international && options->kind != "money")
+      throw Failure(kUsageError, "--international is for money");
+    const Session session(common);
+    const TextLocale locale(session, options->locale);
+    Output().write(works.at(options->kind)(locale, *options) + "\n");
+    return static_cast<int>(kDone);
+  };
+}
+
+}  // namespace
+
+Run declare_format(CLI::App& command, const CommonOptions& common) {
+  const auto options = std::make_shared<ValueOptions>();
+  command.add_flag("--international", options->international,
+                   "of money: the international symbol and its fraction digits");
+  command.footer(
+      "A VALUE is a number like -1234.56, or a time like 2026-11-21T14:05:09. A whole number of 32 bits is\n"
+      "written without a fraction; other digits are cut behind the locale's fraction digits, not rounded.\n"
+      "\n"
+      "Examples:\n"
+      "  lexicor format number 1234567.891 --locale German\n"
+      "  lexicor format money -1234.5 --locale Japanese --international\n"
+      "  lexicor format time 2026-11-21T14:05:09 --locale French --format '%#x'");
+  return declare_values(command, common, kFormats, "VALUE", "a number, or a time in ISO 8601", options);
+}
+
+Run declare_parse(CLI::App& command, const CommonOptions& common) {
+  const auto options = std::make_shared<ValueOptions>();
+  command.footer(
+      "Prints a number like -1234.56, or what the text gives of a time like 2026-11-21T14:05:09. A year of "
+      "two\n"
+      "digits is one of the 1900s. A TEXT that begins with - and no digit goes behind --.\n"
+      "\n"
+      "Examples:\n"
+      "  lexicor parse number 1.234.567,89 --locale German\n"
+      "  lexicor parse money --locale English_UnitedStates -- -'$1,234.50'\n"
+      "  lexicor parse time '21. November 2026' --locale German --format '%d. %B %Y'");
+  return declare_values(command, common, kParses, "TEXT", "what the locale writes, in UTF-8", options);
+}
+
+}  // namespace lexicor_cli

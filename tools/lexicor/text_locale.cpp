@@ -1,0 +1,74 @@
+// Places are counted in characters, of which each is one unit, and shown in columns of the terminal.
+#include "text_locale.h"
+
+#include <locale.h>
+#include <wchar.h>
+
+#include <algorithm>
+
+#include "catalogue.h"
+#include "locale.h"
+
+namespace lexicor_cli {
+
+namespace {
+
+constexpr LXUChar kReplacement = 0xFFFD;
+constexpr size_t kUtf8Growth = 3;
+
+/// The columns of the first characters of a text: two of a wide character, none of a combining one.
+size_t columns(const Units& text, size_t chars) {
+  const locale_t widths = newlocale(LC_CTYPE_MASK, "C.UTF-8", nullptr);
+  const locale_t before = widths != nullptr ? uselocale(widths) : nullptr;
+  size_t columns = 0;
+  for (size_t i = 0; i < chars; ++i) {
+    const int width = i < text.size() ? wcwidth(static_cast<wchar_t>(text[i])) : 1;
+    columns += width < 0 ? 1 : static_cast<size_t>(width);
+  }
+  if (widths != nullptr) {
+    uselocale(before);
+    freelocale(widths);
+  }
+  return columns;
+}
+
+}  // namespace
+
+TextLocale::TextLocale(const Session& session, const std::string& name)
+    : utf8_(session, read_catalogue(), "UTF-8", language_territory(open_chosen_locale(name).get())) {}
+
+Units TextLocale::units(const std::string& text) const {
+  LXShiftState state;
+  const size_t whole = utf8_.whole_bytes(text.data(), text.size(), LX_SHIFT_SINGLE, &state);
+  Units units(whole);
+  const int32_t count = whole == 0 ? 0
+                                   : LXStringToUnicode(units.data(), static_cast<int32_t>(whole), locale(),
+                                                       text.data(), static_cast<int32_t>(whole), 0);
+  units.resize(static_cast<size_t>(std::max(count, 0)));
+  if (whole < text.size()) units.push_back(kReplacement);
+  const auto bad = std::find(units.begin(), units.end(), kReplacement);
+  if (bad != units.end())
+    throw pointing(kDataError, "a character that is not one of 16-bit Unicode in UTF-8", units,
+                   static_cast<size_t>(bad - units.begin()));
+  return units;
+}
+
+std::string TextLocale::text(const Units& units, size_t count) const {
+  std::string text(count * kUtf8Growth, '\0');
+  const int32_t bytes = count == 0 ? 0
+                                   : LXUnicodeToString(locale(), text.data(), static_cast<int32_t>(text.size()),
+                                                       units.data(), static_cast<int32_t>(count), 0);
+  text.resize(static_cast<size_t>(std::max(bytes, 0)));
+  return text;
+}
+
+Failure TextLocale::pointing(ExitCode code, const std::string& message, const Units& units, size_t at) const {
+  Units line = units;
+  for (LXUChar& unit : line) {
+    if (unit < ' ') unit = ' ';
+  }
+  return Failure(
+      code, message + "\n  " + text(line, line.size()) + "\n  " + std::string(columns(line, at), ' ') + "^");
+}
+
+}  // namespace lexicor_cli
