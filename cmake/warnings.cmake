@@ -6,7 +6,7 @@ if(LEXICOR_WERROR)
 endif()
 if(LEXICOR_SANITIZE)
   # GCC's instrumented code makes this warning speak of the C++ library's own headers.
-  target_compile_options(lexicor_flags INTERFACE -Wno-maybe-uninitialized)
+  target_compile_options(lexicor_flags INTERFACE $<$<CXX_COMPILER_ID:GNU>:-Wno-maybe-uninitialized>)
   target_compile_options(lexicor_flags INTERFACE -fsanitize=${LEXICOR_SANITIZE} -fno-sanitize-recover=all
                                                  -fno-omit-frame-pointer)
   target_link_options(lexicor_flags INTERFACE -fsanitize=${LEXICOR_SANITIZE})

@@ -1,34 +1,10 @@
 // Any bytes as the data file of a codepage: refused, or every function is safe with it.
-#include <cstring>
 #include <vector>
 
-#include "core/lxbytes.h"
-#include "core/lxformat.h"
 #include "lx.h"
 #include "scratch.h"
 
 namespace {
-
-namespace format = lx::format;
-
-constexpr uint16_t kId = 819;
-
-/// The control file: one codepage, so that the language and territory are the built-in ones.
-std::vector<uint8_t> control() {
-  std::vector<uint8_t> file(format::kHeaderBytes + 3 * format::kRecordBytes);
-  lx::put_le32(file.data(), format::kMagic);
-  lx::put_le16(file.data() + format::kHeaderSections, 1);
-  lx::put_le16(file.data() + format::header_section_size(0), 3 * format::kRecordBytes);
-  lx::put_le32(file.data() + format::header_section_offset(0), format::kHeaderBytes);
-  const char* names[] = {"English", "UnitedStates", "Fuzz"};
-  for (uint8_t type = 0; type < 3; ++type) {
-    uint8_t* record = file.data() + format::kHeaderBytes + type * format::kRecordBytes;
-    lx::put_le16(record + format::kRecordId, type == LX_CODEPAGE ? kId : 1);
-    record[format::kRecordType] = type;
-    strcpy(reinterpret_cast<char*>(record) + format::kRecordName, names[type]);
-  }
-  return file;
-}
 
 /// Every pair of bytes and every Unicode value, through the forms.
 void exercise(LXLocale* locale) {
@@ -64,9 +40,9 @@ void exercise(LXLocale* locale) {
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
   static const fuzz::Scratch scratch;
-  static const std::vector<uint8_t> control_file = control();
+  static const std::vector<uint8_t> control_file = fuzz::control_file();
   scratch.write("control.nls", control_file.data(), control_file.size());
-  scratch.write("cp_00819.nls", data, size);
+  scratch.write(fuzz::file_name(LX_CODEPAGE), data, size);
   if (LXInit(scratch.path().c_str(), nullptr, nullptr, nullptr, 0) != LX_OK) abort();
   int32_t rc = LX_OK;
   LXLocale* locale = LXGetLocale("English_UnitedStates.Fuzz", 0, &rc);
