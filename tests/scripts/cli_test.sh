@@ -335,6 +335,55 @@ run 'a system locale with missing objects' 1 "$lexicor" --locale-dir broken nati
 grep -q '^language   English  *there$' out && grep -q '^codepage   UTF-8  *missing: file not found$' out ||
   fault "a system locale with missing objects: $(cat out)"
 
+# --- Numbers, money and times: written, read back, and where reading stops.
+# answers OUTPUT ARGUMENTS...: exit status 0 and the whole of the output.
+answers() {
+  expect "${*:2}" 0 '' "$lexicor" "${@:2}"
+  [ "$(cat out)" = "$1" ] || fault "${*:2}: $(cat out)"
+}
+# stops STATUS AT MESSAGE TEXT ARGUMENTS...: the exit status, the message, and a mark below column AT of the text.
+stops() {
+  expect "${*:5}" "$1" "$(printf 'lexicor: %s\n  %s\n  %*s^' "$3" "$4" "$2" '')" "$lexicor" "${@:5}"
+}
+answers '-1.234.567' format number -1234567 --locale German.IBM273
+answers '5,000,000,000.23' format number 5000000000.239 --locale English
+answers '-₹12,34,567.50' format money -1234567.5 --locale Hindi_India
+answers 'JPY1,234.' format money 1234 --locale Japanese_Japan --international
+answers 'Samstag, 21.11.26; 14:05:09 %' format time 2026-11-21T14:05:09 --locale German_Germany --format '%A, %x; %X %%'
+answers '2/29/00 12:00:00 AM' format time 2000-02-29
+answers 'Wednesday 365' format time 2008-12-31 --format '%A %j'
+answers 34 parse number ٣٤
+answers -1234.5 parse money -- '-$1,234.50'
+answers 1234.5 parse money '1,234.50 USD'
+answers -5 parse money '($5)'
+answers 2026-11-21 parse time '21. November 2026' --locale German --format '%d. %B %Y'
+answers 12:05:00 parse time '12:05 PM' --format '%I:%M %p'
+answers 1926-11-21T14:05:09 parse time '21.11.26 14:05:09' --locale German_Germany
+for locale in French_France Swedish German_German-Switzerland Thai Arabic English_UnitedStates Greek; do
+  for value in 'number -1234567.89' 'money -1234567.89' 'money 7' 'time 2026-03-04T00:05:09 --format %c%%%#c'; do
+    read -r kind number format <<<"$value"
+    text=$("$lexicor" format $kind --locale $locale $format -- "$number")
+    answers "$number" parse $kind --locale $locale $format -- "$text"
+  done
+done
+number='reading stopped: not a number as the locale writes it'
+amount='reading stopped: not an amount as the locale writes it'
+stops 1 3 "$number" 1,2x4 parse number 1,2x4
+stops 1 1 "$number" - parse number -- -
+stops 1 1 "$number" '1 234' parse number '1 234' --locale English
+stops 1 3 "$amount" '$12$4' parse money '$12$4'
+stops 1 1 "$amount" '--5' parse money -- --5
+stops 1 4 'reading stopped: not a time in the format 日本%d' 日本x parse time 日本x --format 日本%d
+stops 1 4 'reading stopped: not a time in the format %d. %B %Y' '21. Novembr 2026' parse time '21. Novembr 2026' --format '%d. %B %Y'
+stops 1 10 'the month has no such day' 31.02.2026 parse time 31.02.2026 --format %d.%m.%Y
+stops 1 3 'the text has a date without a year' Nov parse time Nov --format %b
+stops 2 1 'a format has no such directive' é%U parse time 5 --format é%U
+stops 1 8 'there is no such time' 2026-02-29 format time 2026-02-29
+stops 1 6 'a time has the form YYYY-MM-DD[THH:MM[:SS]]' 2026-1-1 format time 2026-1-1
+stops 1 1 'reading stopped: not a number like -1234.56' 1,5 format money 1,5
+stops 1 1 'a character that is not UTF-8, or beyond U+FFFF' a😀x parse number a😀x
+expect 'a format of a number' 2 'lexicor: --format is for times' "$lexicor" format number 1 --format %x
+
 # --- Lists.
 "$lexicor" list >out || fault 'list'
 [ "$(grep -c '^[a-z]' out)" = 4 ] || fault 'the tables of the whole list'

@@ -22,8 +22,9 @@ soname=$(readelf -d "$library" | sed -n 's/.*SONAME.*\[\(.*\)\]/\1/p')
 [ "$soname" = liblexicor.so.1 ] || { echo "symbols: soname is $soname" >&2; exit 1; }
 
 # A sanitizer build needs its runtime.
-if nm -D --undefined-only "$library" | grep -qE '__(asan|tsan|ubsan)_'; then exit 0; fi
+undefined=$(nm -D --undefined-only "$library")
+if grep -qE '__(asan|tsan|ubsan)_' <<<"$undefined"; then exit 0; fi
 needed=$(readelf -d "$library" | sed -n 's/.*NEEDED.*\[\(.*\)\]/\1/p' | grep -vE '^(libc|libm)\.so' || true)
 [ -z "$needed" ] || { echo "symbols: needs $needed" >&2; exit 1; }
-runtime=$(nm -D --undefined-only "$library" | awk '{print $2}' | grep -E '^(_Z|__cxa_(throw|begin|end|guard|pure|alloc)|__gxx)' || true)
+runtime=$(awk '{print $2}' <<<"$undefined" | grep -E '^(_Z|__cxa_(throw|begin|end|guard|pure|alloc)|__gxx)' || true)
 [ -z "$runtime" ] || { echo "symbols: C++ runtime symbols: $runtime" >&2; exit 1; }

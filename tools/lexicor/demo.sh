@@ -1,6 +1,7 @@
 #!/bin/bash
-# The conversion part of the demo: converts each sample to the codepages that its language lives in, and back, and
-# compares byte for byte. Argument: the build directory. Exit 1 when any text comes back different.
+# The demo: converts each sample to the codepages that its language lives in, and back, and compares byte for
+# byte; then writes the same values as fifteen locales do. Argument: the build directory. Exit 1 when any text
+# comes back different.
 set -u
 here=$(cd "$(dirname "${BASH_SOURCE[0]}")" && pwd)
 build=${1:?usage: demo.sh BUILD_DIR}
@@ -72,3 +73,19 @@ if [ "$failed" -gt 0 ]; then
   exit 1
 fi
 echo "All $total conversions came back byte for byte."
+
+# values LOCALE: the same number, amount and moment as the locale writes them.
+values() {
+  local number amount moment
+  number=$("$lexicor" format number 1234567.89 --locale "$1") &&
+    amount=$("$lexicor" format money -1234567.89 --locale "$1") &&
+    moment=$("$lexicor" format time 2026-11-21T14:05:09 --format '%#x, %X' --locale "$1") || exit 1
+  printf '%-25s  %s  %s  %s\n' "$1" "$(fit "$number" 12)" "$(fit "$amount" 19)" "$moment"
+}
+
+printf '\n%-25s  %-12s  %-19s  %s\n' 'Locale' 'Number' 'Amount' 'Moment'
+for locale in English_UnitedStates English_India German_Germany German_German-Switzerland French_France \
+  Portuguese_Brazil Swedish_Sweden Polish_Poland Greek_Greece Russian_Russia Hindi_India Thai_Thailand \
+  Japanese_Japan Korean_Korea Arabic_SaudiArabia; do
+  values "$locale"
+done

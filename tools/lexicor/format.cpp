@@ -1,7 +1,7 @@
 // lexicor format and lexicor parse: numbers, amounts of money and times as a locale writes them, and back.
 #include <lx.h>
 
-#include <array>
+#include <algorithm>
 #include <charconv>
 #include <cstdio>
 #include <map>
@@ -20,6 +20,8 @@ namespace {
 
 // The digits of the largest double, each with a separator, and signs and symbols beside them.
 constexpr size_t kNumberUnits = 2048;
+constexpr char kNoNumber[] = "reading stopped: not a number as the locale writes it";
+constexpr char kNoAmount[] = "reading stopped: not an amount as the locale writes it";
 
 struct ValueOptions {
   std::string kind;
@@ -36,7 +38,7 @@ std::string written_text(const TextLocale& locale, const Units& units, int32_t w
   return locale.text(units, static_cast<size_t>(written));
 }
 
-/// Reads a whole argument as a C number; throws a Failure that points at what is none.
+/// Reads the beginning of a text as a C number.
 template <typename Number>
 std::errc read_c_number(const std::string& text, Number* value, size_t* stop) {
   const std::from_chars_result result = std::from_chars(text.data(), text.data() + text.size(), *value);
@@ -52,7 +54,7 @@ double c_double(const TextLocale& locale, const std::string& text) {
   if (error == std::errc::result_out_of_range)
     throw locale.pointing(kDataError, "a number that a double cannot hold", units, 0);
   if (error != std::errc() || stop < text.size())
-    throw locale.pointing(kDataError, "no number of the form -1234.56", units, stop);
+    throw locale.pointing(kDataError, "reading stopped: not a number like -1234.56", units, stop);
   return value;
 }
 
@@ -108,8 +110,7 @@ double read_double(const TextLocale& locale, const Units& text, size_t begin, si
   bool digits = false;
   for (size_t i = 0; i < read; ++i) digits |= is_digit(handle, units[i]);
   if (!digits || read < units.size())
-    throw locale.pointing(kDataError, monetary ? "no amount of the locale" : "no number of the locale", text,
-                          places[read]);
+    throw locale.pointing(kDataError, monetary ? kNoAmount : kNoNumber, text, places[read]);
   return value;
 }
 
@@ -119,21 +120,27 @@ class Amount {
   Amount(const TextLocale& locale, const Units& text) : locale_(locale), text_(text), end_(text.size()) {}
 
   double read() {
-    const Units minus = item(LX_ITEM_NEGATIVE_SIGN), plus = item(LX_ITEM_POSITIVE_SIGN);
     peel_blanks();
     const bool parentheses = number_item(locale_.locale(), LX_ITEM_NEGATIVE_POSITION) == 0 &&
                              end_ - begin_ >= 2 && text_[begin_] == '(' && text_[end_ - 1] == ')';
-    begin_ += parentheses ? 1 : 0;
-    end_ -= parentheses ? 1 : 0;
-    // A sign stands outside or inside of the symbol.
-    bool negative = peel(minus), sign = negative || peel(plus);
-    if (!peel(item(LX_ITEM_CURRENCY))) peel(item(LX_ITEM_INTERNATIONAL_CURRENCY));
-    if (!sign) {
-      negative = peel(minus);
-      sign = negative || peel(plus);
+    if (parentheses) {
+      ++begin_;
+      --end_;
+      peel_blanks();
     }
+    // A sign stands outside or inside of the symbol, and only once.
+    int32_t sign = parentheses ? -1 : peel_sign();
+    if (!peel(item(LX_ITEM_CURRENCY))) peel(item(LX_ITEM_INTERNATIONAL_CURRENCY));
+    const size_t inner = begin_;
+    const int32_t inner_sign = peel_sign();
+    if (sign == 0)
+      sign = inner_sign;
+    else if (inner_sign != 0)
+      throw locale_.pointing(kDataError, kNoAmount, text_, begin_ > inner ? inner : end_);
+    if (sign != 0 && begin_ < end_ && (text_[begin_] == '+' || text_[begin_] == '-'))
+      throw locale_.pointing(kDataError, kNoAmount, text_, begin_);
     const double value = read_double(locale_, text_, begin_, end_, true);
-    return negative || parentheses ? -value : value;
+    return sign < 0 ? -value : value;
   }
 
  private:
@@ -144,6 +151,11 @@ class Amount {
   void peel_blanks() {
     while (begin_ < end_ && is_blank(text_[begin_])) ++begin_;
     while (begin_ < end_ && is_blank(text_[end_ - 1])) --end_;
+  }
+
+  /// Takes a sign off: -1, 1, or 0 where there is none.
+  int32_t peel_sign() {
+    return peel(item(LX_ITEM_NEGATIVE_SIGN)) ? -1 : peel(item(LX_ITEM_POSITIVE_SIGN)) ? 1 : 0;
   }
 
   /// Takes a part off the beginning or the end, and the white space behind it.

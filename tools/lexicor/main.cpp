@@ -39,6 +39,7 @@ constexpr char kFooter[] =
     "  lexicor map upper --locale German letter.utf8\n"
     "  lexicor sort --locale Swedish names.txt\n"
     "  lexicor explain --locale French@FrenchCanadian côte coté\n"
+    "  lexicor format money 1234567.5 --locale German\n"
     "  lexicor info German_Austria\n"
     "  lexicor convert --help";
 

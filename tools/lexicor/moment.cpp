@@ -32,8 +32,7 @@ void complete(LXTime* time) {
   const int32_t year = time->year + kFirstYear;
   time->day_of_year = time->day - 1;
   for (int32_t month = 0; month < time->month; ++month) time->day_of_year += month_days(year, month);
-  // Days since a Sunday: as many years from one divisible by 400 as keep all terms above 0. The calendar
-  // repeats, weekdays and all, every 400 years.
+  // The whole years before this one; 400 more, in which the weekdays come round, keep that above 0.
   const int32_t years = year + 399;
   time->weekday = (1 + years * 365 + years / 4 - years / 100 + years / 400 + time->day_of_year) % 7;
 }
@@ -85,7 +84,7 @@ Units expanded(const TextLocale& locale, const std::string& format, const char* 
     const bool flag = i < format.size() && format[i] == '#';
     i += flag ? 1 : 0;
     if (i >= format.size() || std::strchr(known, format[i]) == nullptr)
-      throw locale.pointing(kUsageError, "no directive of a format", locale.units(format),
+      throw locale.pointing(kUsageError, "a format has no such directive", locale.units(format),
                             locale.units(format.substr(0, begin)).size());
     const std::string date = item(flag ? LX_ITEM_LONG_DATE_FORMAT : LX_ITEM_SHORT_DATE_FORMAT);
     const std::string hours = item(LX_ITEM_TIME_FORMAT);
@@ -123,11 +122,11 @@ std::string iso_text(const TextLocale& locale, const LXTime& time, const Units& 
   };
   const bool has_month = time.month >= 0, has_day = time.day > 0;
   std::string iso;
-  char part[32];
+  char part[64];
   if (time.year != kUnset || has_month || has_day) {
-    if (time.year == kUnset) throw fail("a date without a year");
-    if (!has_month) throw fail("a date without a month");
-    if (!has_day) throw fail("a date without a day of the month");
+    if (time.year == kUnset) throw fail("the text has a date without a year");
+    if (!has_month) throw fail("the text has a date without a month");
+    if (!has_day) throw fail("the text has a date without a day of the month");
     const int32_t year = time.year + kFirstYear;
     if (time.day > month_days(year, time.month)) throw fail("the month has no such day");
     std::snprintf(part, sizeof part, "%04d-%02d-%02d", static_cast<int>(year), time.month + 1, time.day);
@@ -137,7 +136,7 @@ std::string iso_text(const TextLocale& locale, const LXTime& time, const Units& 
     std::snprintf(part, sizeof part, "%02d:%02d:%02d", time.hours, time.minutes, time.seconds);
     iso += (iso.empty() ? "" : "T") + std::string(part);
   }
-  if (iso.empty()) throw fail("neither a date nor an hour");
+  if (iso.empty()) throw fail("the text has neither a date nor an hour");
   return iso;
 }
 
@@ -168,8 +167,9 @@ std::string parse_moment(const TextLocale& locale, const std::string& text, cons
     throw Failure(kDataError, "the time cannot be read: " + describe_code(code));
   const size_t stop = read < 0 ? stop_of(locale, units, directives) : static_cast<size_t>(read);
   if (stop < units.size() || read < 0)
-    throw locale.pointing(kDataError, "no time in the format " + locale.text(directives, directives.size()),
-                          units, stop);
+    throw locale.pointing(
+        kDataError, "reading stopped: not a time in the format " + locale.text(directives, directives.size()),
+        units, stop);
   return iso_text(locale, time, units);
 }
 

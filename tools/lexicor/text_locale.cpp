@@ -32,6 +32,13 @@ size_t columns(const Units& text, size_t chars) {
   return columns;
 }
 
+/// A message, the text that it is about and a mark below a column of it.
+Failure marked(ExitCode code, const std::string& message, std::string text, size_t column) {
+  std::replace_if(
+      text.begin(), text.end(), [](char c) { return c >= 0 && c < ' '; }, ' ');
+  return Failure(code, message + "\n  " + text + "\n  " + std::string(column, ' ') + "^");
+}
+
 }  // namespace
 
 TextLocale::TextLocale(const Session& session, const std::string& name)
@@ -48,8 +55,8 @@ Units TextLocale::units(const std::string& text) const {
   if (whole < text.size()) units.push_back(kReplacement);
   const auto bad = std::find(units.begin(), units.end(), kReplacement);
   if (bad != units.end())
-    throw pointing(kDataError, "a character that is not one of 16-bit Unicode in UTF-8", units,
-                   static_cast<size_t>(bad - units.begin()));
+    throw marked(kDataError, "a character that is not UTF-8, or beyond U+FFFF", text,
+                 columns(units, static_cast<size_t>(bad - units.begin())));
   return units;
 }
 
@@ -63,12 +70,7 @@ std::string TextLocale::text(const Units& units, size_t count) const {
 }
 
 Failure TextLocale::pointing(ExitCode code, const std::string& message, const Units& units, size_t at) const {
-  Units line = units;
-  for (LXUChar& unit : line) {
-    if (unit < ' ') unit = ' ';
-  }
-  return Failure(
-      code, message + "\n  " + text(line, line.size()) + "\n  " + std::string(columns(line, at), ' ') + "^");
+  return marked(code, message, text(units, units.size()), columns(units, at));
 }
 
 }  // namespace lexicor_cli
