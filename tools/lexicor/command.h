@@ -2,10 +2,14 @@
 // exit codes, and the error that ends one with a message.
 #pragma once
 
-#include <CLI/CLI.hpp>
 #include <functional>
 #include <stdexcept>
 #include <string>
+
+// The header of the argument parser is large: only who declares options includes it.
+namespace CLI {
+class App;
+}
 
 namespace lexicor_cli {
 

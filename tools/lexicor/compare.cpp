@@ -1,6 +1,7 @@
 // lexicor compare and lexicor key: which of two texts comes first, and the bytes by which a text is sorted.
 #include <lx.h>
 
+#include <CLI/CLI.hpp>
 #include <memory>
 
 #include "collation.h"

@@ -1,6 +1,7 @@
 // lexicor convert: converts a text from one codepage to another, as a stream.
 #include <lx.h>
 
+#include <CLI/CLI.hpp>
 #include <algorithm>
 #include <iostream>
 #include <memory>

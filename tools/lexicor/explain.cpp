@@ -2,6 +2,7 @@
 // the weight that decides.
 #include <lx.h>
 
+#include <CLI/CLI.hpp>
 #include <algorithm>
 #include <memory>
 #include <sstream>

@@ -1,6 +1,7 @@
 // lexicor format and lexicor parse: numbers, amounts of money and times as a locale writes them, and back.
 #include <lx.h>
 
+#include <CLI/CLI.hpp>
 #include <algorithm>
 #include <charconv>
 #include <cstdio>

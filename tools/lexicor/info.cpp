@@ -1,6 +1,7 @@
 // lexicor info: the items of a locale, as a table or as JSON.
 #include <lx.h>
 
+#include <CLI/CLI.hpp>
 #include <iostream>
 #include <memory>
 #include <sstream>

@@ -2,6 +2,7 @@
 // or as JSON.
 #include <lx.h>
 
+#include <CLI/CLI.hpp>
 #include <algorithm>
 #include <memory>
 #include <sstream>

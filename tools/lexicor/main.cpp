@@ -2,6 +2,7 @@
 // Exit codes: 0 done, 1 an error in the data or the files, 2 a wrong command line, and of `compare` 3 and 4.
 #include <lx.h>
 
+#include <CLI/CLI.hpp>
 #include <csignal>
 #include <iostream>
 #include <new>

@@ -1,6 +1,7 @@
 // lexicor map: maps a text to another case or width, or its digits to ASCII digits, as a stream.
 #include <lx.h>
 
+#include <CLI/CLI.hpp>
 #include <algorithm>
 #include <map>
 #include <memory>

@@ -1,6 +1,7 @@
 // lexicor native: what an operating-system name of a locale stands for, and whether its objects are there.
 #include <lx.h>
 
+#include <CLI/CLI.hpp>
 #include <memory>
 #include <sstream>
 

@@ -2,6 +2,7 @@
 // it.
 #include <lx.h>
 
+#include <CLI/CLI.hpp>
 #include <algorithm>
 #include <cstring>
 #include <deque>
