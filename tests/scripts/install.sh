@@ -3,7 +3,7 @@
 set -euo pipefail
 source_dir=$1 build_dir=$2
 # A sanitizer build is not one to install.
-if nm -D --undefined-only "$build_dir/lib/liblexicor.so" | grep -qE '__(asan|tsan|ubsan)_'; then exit 77; fi
+if grep -qE '__(asan|tsan|ubsan)_' < <(nm -D --undefined-only "$build_dir/lib/liblexicor.so"); then exit 77; fi
 
 work=$(mktemp -d)
 trap 'rm -rf "$work"' EXIT
