@@ -21,6 +21,8 @@ typedef struct LXObject LXObject;         /* one data object; begins with an LXO
 typedef struct LXObjManager LXObjManager; /* the objects of one locale directory */
 typedef struct LXConversion LXConversion; /* a streaming conversion between two locales */
 typedef struct LXFile LXFile;             /* an open file */
+typedef struct LXStream LXStream;         /* a character stream over a caller's transfer callback */
+typedef struct LXCatalog LXCatalog;       /* an open message catalog */
 
 /* One multibyte character packed into an integer, its bytes in order with the first byte most
  * significant: the single byte 0x41 is 0x41, the bytes 0x82 0xA0 are 0x82A0. Not a Unicode value. */
@@ -56,6 +58,15 @@ enum {
   LX_E_FORMAT = 51,           /* bad time format */
   LX_E_OUTPUT_FULL = 52,      /* conversion output full, more is pending */
   LX_E_INPUT_CUT = 53,        /* conversion input ended inside a character */
+  LX_E_STREAM_DIRECTION = 60, /* the operation does not fit the stream's direction */
+  LX_E_STREAM_READ = 61,      /* the callback failed while half of a 16-bit unit was read */
+  LX_E_STREAM_FLUSH = 62,     /* flushing failed; the buffered bytes are dropped */
+  LX_E_STREAM_HALF = 63,      /* only one byte of a 16-bit unit could be read; it is kept */
+  LX_E_STREAM_COUNT = 64,     /* the callback returned a count that cannot be */
+  LX_E_STREAM_KEPT = 65,      /* the callback stopped taking bytes; the rest is kept in the buffer */
+  LX_E_CATALOG_NULL = 70,     /* the catalog handle is null */
+  LX_E_CATALOG = 71,          /* message catalog not found, damaged or unreadable */
+  LX_E_MESSAGE = 72,          /* message missing, and no default text given */
   LX_E_FILE_NOT_FOUND = 1000, /* file not found */
   LX_E_FILE_ACCESS = 1001,    /* access denied */
   LX_E_FILE_MODE = 1002,      /* read on a file that was opened for writing */

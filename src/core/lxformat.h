@@ -1,5 +1,6 @@
-// The layouts of the locale directory's files: every offset and size as a named constant. All integers are
-// little-endian. Shared by the library, the data compiler and the tests.
+// The layouts of the locale directory's files and of message catalogs: every offset and size as a named
+// constant. Integers of the locale directory are little-endian; those of a catalog are in the byte order of the
+// machine that reads it. Shared by the library, the compilers and the tests.
 #pragma once
 
 #include <cstddef>
@@ -180,5 +181,39 @@ inline constexpr size_t kUnicodeValues = 4370;
 inline constexpr size_t kNodeBytes = 4;  // u8 leaf, u8 mask, u16 base
 }  // namespace v1
 }  // namespace codepage
+
+// Message catalog: 32-bit unsigned integers, offsets from the start of the file. A chain of set records leads
+// to each set's index and block of texts; texts end with a null byte that their length counts.
+namespace catalog {
+inline constexpr uint32_t kMagic = 0x476CF463;
+inline constexpr uint32_t kVersion = 0x10000000;
+inline constexpr uint32_t kBigEndian = 1;  // byte-order codes
+inline constexpr uint32_t kLittleEndian = 2;
+
+inline constexpr size_t kHeaderBytes = 152;
+inline constexpr size_t kHeaderMagic = 0;
+inline constexpr size_t kHeaderVersion = 4;
+inline constexpr size_t kHeaderByteOrder = 8;
+inline constexpr size_t kHeaderSets = 12;      // number of sets, at least 1
+inline constexpr size_t kHeaderFirstSet = 16;  // offset of the first set record
+inline constexpr size_t kHeaderLocale = 20;    // null-terminated name of the texts' locale
+inline constexpr size_t kHeaderLocaleBytes = 132;
+
+// Set records, in ascending order of their numbers.
+inline constexpr size_t kSetBytes = 28;
+inline constexpr size_t kSetNumber = 0;
+inline constexpr size_t kSetNext = 4;  // offset of the next set record, 0 for the last
+inline constexpr size_t kSetMessages = 8;
+inline constexpr size_t kSetIndex = 12;
+inline constexpr size_t kSetTexts = 16;
+inline constexpr size_t kSetTextBytes = 20;
+inline constexpr size_t kSetUnread = 24;
+
+// Index entries, in ascending order of their numbers.
+inline constexpr size_t kEntryBytes = 12;
+inline constexpr size_t kEntryNumber = 0;
+inline constexpr size_t kEntryTextBytes = 4;
+inline constexpr size_t kEntryText = 8;  // offset in the set's block of texts
+}  // namespace catalog
 
 }  // namespace lx::format
