@@ -170,22 +170,41 @@ int32_t compare_appended(const Sort& sort, const Reader& text1, const Reader& te
 
 /// How many units two texts begin with alike.
 template <class Unit>
-size_t equal_units(const Unit* a, const Unit* b, size_t most) {
+[[gnu::always_inline]] inline size_t equal_units(const Unit* a, size_t units1, const Unit* b, size_t units2) {
+  const size_t most = lx::least(units1, units2);
   constexpr size_t kWord = sizeof(uint64_t) / sizeof(Unit);
+  if (most == 0 || a[0] != b[0]) return 0;  // most texts, and words of no foreseeable number cost more
   size_t n = 0;
-  if constexpr (kWord > 1)
-    while (most - n >= kWord && memcmp(a + n, b + n, sizeof(uint64_t)) == 0) n += kWord;
+  for (; most - n >= kWord; n += kWord) {
+    const auto word = [n](const Unit* text) { return lx::le64(reinterpret_cast<const uint8_t*>(text + n)); };
+    const uint64_t bits = word(a) ^ word(b);
+    if (bits != 0) return n + static_cast<size_t>(__builtin_ctzll(bits)) / (8 * sizeof(Unit));
+  }
   while (n < most && a[n] == b[n]) ++n;
   return n;
 }
 
 /// Whether a character begins at `n`, as far as the bytes before it tell: none of them can begin one that goes
 /// on there.
-template <class Reader>
-bool surely_begins(const Reader& in, size_t n) {
+bool surely_begins(const Codepage& cp, const uint8_t* text, size_t n) {
   for (size_t back = 1; back < lx::kMaxCharBytes && back <= n; ++back)
-    if (in.cp.length(in.p[n - back]) > back) return false;
+    if (cp.length(text[n - back]) > back) return false;
   return true;
+}
+
+/// The difference of two texts that begin with the same `same` units, when ASCII characters that decide follow
+/// in both; else 0.
+template <class Unit>
+[[gnu::always_inline]] inline int32_t compare_ascii(const Codepage& cp, const Sort& sort, const Unit* text1,
+                                                    size_t units1, const Unit* text2, size_t units2,
+                                                    size_t same) {
+  if (same == units1 || same == units2) return 0;
+  if (text1[same] >= lx::kAsciiUnits || text2[same] >= lx::kAsciiUnits) return 0;
+  if constexpr (sizeof(Unit) == 1)
+    if (!surely_begins(cp, text1, same)) return 0;
+  const int32_t primary1 = sort.deciding[text1[same]];
+  const int32_t primary2 = sort.deciding[text2[same]];
+  return primary1 != 0 && primary2 != 0 ? primary1 - primary2 : 0;
 }
 
 /// How many of the first `units` units are whole characters.
@@ -195,35 +214,31 @@ size_t whole_units(const Reader& in, size_t units) {
     return units;
   } else {
     for (size_t n = units; n + lx::kMaxCharBytes > units && n > 0; --n)
-      if (surely_begins(in, n)) return n;
+      if (surely_begins(in.cp, in.p, n)) return n;
     size_t n = 0;
     for (size_t length = 0; n < units && (length = in.cp.length(in.p[n])) <= units - n;) n += length;
     return n;
   }
 }
 
-/// How many units both texts begin with alike, up to a place that no element reaches over.
+/// How many of the `same` units that both texts begin with stand before a place that no element reaches over.
 template <class Reader>
-size_t equal_beginning(const Sort& sort, const Reader& text1, const Reader& text2) {
-  if constexpr (std::is_same_v<Reader, lx::ShiftReader>)
-    return 0;  // equal bytes say nothing without their state
-  const size_t units1 = lx::room(text1.p, text1.end);
-  const size_t units2 = lx::room(text2.p, text2.end);
-  const size_t equal = equal_units(text1.p, text2.p, lx::least(units1, units2));
-  if (equal == 0) return 0;
-  const size_t whole = whole_units(text1, equal);
+size_t equal_beginning(const Sort& sort, const Reader& text1, const Reader& text2, size_t same) {
+  if (same == 0) return 0;
+  const size_t whole = whole_units(text1, same);
   if (whole == 0 || sort.pair_count == 0) return whole;
   const size_t last = whole_units(text1, whole - 1);
   LXUChar u = 0;
   lx::read_like(text1, text1.p + last, whole - last, LX_SHIFT_SINGLE).next(&u);
   if (!sort.element(u).starts_pair()) return whole;
-  const auto reaches_on = [&](const Reader& text, size_t units) {
+  const auto reaches_on = [&](const Reader& text) {
     LXUChar next = 0;
     Element pair;
-    return lx::read_like(text, text.p + whole, units - whole, LX_SHIFT_SINGLE).next(&next) &&
+    return lx::read_like(text, text.p + whole, lx::room(text.p, text.end) - whole, LX_SHIFT_SINGLE)
+               .next(&next) &&
            sort.pair(u, next, &pair);
   };
-  return reaches_on(text1, units1) || reaches_on(text2, units2) ? 0 : whole;
+  return reaches_on(text1) || reaches_on(text2) ? 0 : whole;
 }
 
 /// The keys of two texts of at most `chars1` and `chars2` characters, compared.
@@ -244,6 +259,39 @@ int32_t compare_keys(const Sort& sort, const Reader& text1, size_t chars1, const
   key2.write(bytes2);
   const int32_t difference = memcmp(bytes1, bytes2, lx::least(size1, size2));
   return difference != 0 ? difference : (size1 > size2) - (size1 < size2);
+}
+
+/// Compares texts whose characters weigh one by one on the same levels: false where some do not.
+template <class Reader>
+bool compare_in_step(const Sort& sort, Reader text1, Reader text2, int32_t* difference) {
+  int32_t secondary = 0;
+  int32_t tertiary = 0;
+  // Notes the first difference of a level; false where only one of the two weighs on it.
+  const auto note = [](uint32_t weight1, uint32_t weight2, int32_t* first) {
+    if (*first == 0) *first = static_cast<int32_t>(weight1) - static_cast<int32_t>(weight2);
+    return weight1 == weight2 || (weight1 != 0 && weight2 != 0);
+  };
+  for (;;) {
+    LXUChar u1 = 0;
+    LXUChar u2 = 0;
+    const bool more1 = text1.next(&u1);
+    const bool more2 = text2.next(&u2);
+    if (!(more1 || lx::exhausted(text1)) || !(more2 || lx::exhausted(text2))) return false;
+    if (!more1 && !more2) break;
+    const Element x = more1 ? sort.element(u1) : Element();
+    const Element y = more2 ? sort.element(u2) : Element();
+    if ((more1 && !x.stands_alone()) || (more2 && !y.stands_alone())) return false;
+    if (x.primary() != y.primary()) {
+      *difference = more1 && more2 ? static_cast<int32_t>(x.primary()) - static_cast<int32_t>(y.primary())
+                                   : more1 - more2;
+      return !more1 || !more2 || (x.primary() != 0 && y.primary() != 0);
+    }
+    if (!more1 || !more2 || x.special() != y.special()) return false;
+    if (!note(x.secondary(), y.secondary(), &secondary)) return false;
+    if (!note(x.tertiary(), y.tertiary(), &tertiary)) return false;
+  }
+  *difference = secondary != 0 ? secondary : tertiary;
+  return true;
 }
 
 /// Compares texts that begin alike: `rest1` and `rest2` are what follows.
@@ -273,30 +321,30 @@ template <class Reader>
   return difference != 0 ? difference : compare_levels(sort, text1, text2, inserted, code);
 }
 
-/// Compares by the weights alone. Most texts are told apart by the first character that differs.
+/// Compares by the weights alone. Most texts are told apart by the first character that differs. `same`: how
+/// many units they begin with alike.
 template <class Reader>
-int32_t compare_weights(const Sort& sort, const Reader& text1, const Reader& text2, int32_t* code) {
+int32_t compare_weights(const Sort& sort, const Reader& text1, const Reader& text2, size_t same,
+                        int32_t* code) {
   if (!sort.appends_primaries) return compare_inserted(sort, text1, text2, code);
-  const size_t equal = equal_beginning(sort, text1, text2);
+  const size_t equal = equal_beginning(sort, text1, text2, same);
   const auto rest = [equal](const Reader& text) {
     LXShiftState state = LX_SHIFT_SINGLE;
     if constexpr (std::is_same_v<Reader, lx::ShiftReader>) state = text.state;
     return lx::read_like(text, text.p + equal, lx::room(text.p, text.end) - equal, state);
   };
-  const Element x = lx::Elements<Reader>(sort, rest(text1)).next();
-  const Element y = lx::Elements<Reader>(sort, rest(text2)).next();
-  const bool decided =
-      x.sets() == 1 && y.sets() == 1 && x.primary() != 0 && y.primary() != 0 && x.primary() != y.primary();
-  if (decided) return static_cast<int32_t>(x.primary()) - static_cast<int32_t>(y.primary());
+  int32_t difference = 0;
+  if (sort.appends_all && compare_in_step(sort, rest(text1), rest(text2), &difference)) return difference;
   return compare_rest(sort, text1, text2, rest(text1), rest(text2), code);
 }
 
-/// Compares two texts of one kind by the locale's sort, as `options` ask.
+/// Compares two texts of one kind by the locale's sort, as `options` ask. `same`: without options, how many
+/// units they begin with alike.
 template <class Reader>
-int32_t collate(const LXLocale& locale, const Reader& text1, const Reader& text2, uint32_t options,
+int32_t collate(const LXLocale& locale, const Reader& text1, const Reader& text2, uint32_t options, size_t same,
                 int32_t* code) {
   const Sort& sort = lx::sort_of(*locale.sort);
-  if (options == 0) return compare_weights(sort, text1, text2, code);
+  if (options == 0) return compare_weights(sort, text1, text2, same, code);
   Fold fold;
   if (!lx::fold_of(options, &fold)) {
     *code = LX_E_INVALID;
@@ -338,13 +386,13 @@ void drop_blanks(LXLocale* locale, ByteText* text1, ByteText* text2, Form form) 
   drop(text2, lx::least(text1->bytes, text2->bytes));
 }
 
-/// Both byte forms. `in_binary(length1, length2, options)` compares by code value where the locale has no sort.
+/// Both byte forms. `in_binary(length1, length2, options)` compares by code value where the locale has no sort;
+/// `same`: how many bytes are known to be the same in both texts.
 template <class InBinary>
-int32_t collate_bytes(LXLocale* given, ByteText text1, int32_t length1, ByteText text2, int32_t length2,
-                      uint32_t options, Form form, InBinary in_binary) {
-  Call call(unit, given);
-  if (!call) return call.fail(LX_E_NOT_INITIALIZED, 0);
-  LXLocale* locale = call.locale();
+[[gnu::noinline]] int32_t collate_bytes(Call* call, ByteText&& text1, int32_t length1, ByteText&& text2,
+                                        int32_t length2, uint32_t options, size_t same, Form form,
+                                        InBinary in_binary) {
+  LXLocale* locale = call->locale();
   const Codepage& cp = codepage_of(*locale->codepage);
   text1.bytes = lx::text_bytes(cp, text1.text, text1.state, length1, options);
   text2.bytes = lx::text_bytes(cp, text2.text, text2.state, length2, options);
@@ -355,19 +403,22 @@ int32_t collate_bytes(LXLocale* given, ByteText text1, int32_t length1, ByteText
       return length < 0 ? length : static_cast<int32_t>(text.bytes);
     };
     const int32_t difference = in_binary(length_of(text1, length1), length_of(text2, length2), options);
-    return call.fail(locale->last_error, difference);
+    return call->fail(locale->last_error, difference);
   }
   if ((options & kBlanksOption) != 0) {
     drop_blanks(locale, &text1, &text2, form);
     options &= ~LX_IGNORE_BLANKS;
   }
+  const uint8_t* const p1 = bytes_of(text1.text);
+  const uint8_t* const p2 = bytes_of(text2.text);
+  // With shift states equal bytes say nothing.
+  if (options == 0 && !(form == Form::kEx && cp.shift_sensitive))
+    same += equal_units(p1 + same, text1.bytes - same, p2 + same, text2.bytes - same);
   int32_t code = LX_OK;
-  const int32_t difference =
-      lx::read_bytes(cp, form, text1.state, bytes_of(text1.text), text1.bytes, [&](const auto& in) {
-        return collate(*locale, in, lx::read_like(in, bytes_of(text2.text), text2.bytes, text2.state), options,
-                       &code);
-      });
-  return call.fail(code, difference);
+  const int32_t difference = lx::read_bytes(cp, form, text1.state, p1, text1.bytes, [&](const auto& in) {
+    return collate(*locale, in, lx::read_like(in, p2, text2.bytes, text2.state), options, same, &code);
+  });
+  return call->fail(code, difference);
 }
 
 /// The options that comparison by code value knows.
@@ -399,9 +450,19 @@ int32_t collate_units(Call* call, const Unit* text1, int32_t length1, const Unit
     count1 = without_blanks(text1, count1, blank, full);
     count2 = without_blanks(text2, count2, blank, full);
   }
+  options &= ~(LX_IGNORE_BLANKS | LX_CHARACTERS);
+  size_t same = 0;
+  if (options == 0) {
+    same = equal_units(text1, count1, text2, count2);
+    if (sizeof(Unit) == sizeof(LXUChar) || cp.same_below >= lx::kAsciiUnits) {
+      const Sort& sort = lx::sort_of(*locale.sort);
+      const int32_t difference = compare_ascii(cp, sort, text1, count1, text2, count2, same);
+      if (difference != 0) return call->exit(difference);
+    }
+  }
   int32_t code = LX_OK;
-  const int32_t difference = collate(locale, reader(cp, text1, count1), reader(cp, text2, count2),
-                                     options & ~(LX_IGNORE_BLANKS | LX_CHARACTERS), &code);
+  const int32_t difference =
+      collate(locale, reader(cp, text1, count1), reader(cp, text2, count2), options, same, &code);
   return call->fail(code, difference);
 }
 
@@ -411,8 +472,20 @@ extern "C" {
 
 int32_t LXStrcoll(LXLocale* locale, const char* text1, int32_t length1, const char* text2, int32_t length2,
                   uint32_t options) {
-  return collate_bytes(locale, {text1, LX_SHIFT_SINGLE, 0}, length1, {text2, LX_SHIFT_SINGLE, 0}, length2,
-                       options, Form::kPlain, [&](int32_t bytes1, int32_t bytes2, uint32_t left) {
+  Call call(unit, locale);
+  if (!call) return call.fail(LX_E_NOT_INITIALIZED, 0);
+  const Codepage& cp = codepage_of(call.codepage());
+  size_t same = 0;
+  if (options == 0 && call.locale()->sort != nullptr && cp.same_below >= lx::kAsciiUnits) {
+    const size_t bytes1 = lx::text_units(text1, length1);
+    const size_t bytes2 = lx::text_units(text2, length2);
+    same = equal_units(bytes_of(text1), bytes1, bytes_of(text2), bytes2);
+    const int32_t difference = compare_ascii(cp, lx::sort_of(*call.locale()->sort), bytes_of(text1), bytes1,
+                                             bytes_of(text2), bytes2, same);
+    if (difference != 0) return call.exit(difference);
+  }
+  return collate_bytes(&call, {text1, LX_SHIFT_SINGLE, 0}, length1, {text2, LX_SHIFT_SINGLE, 0}, length2,
+                       options, same, Form::kPlain, [=](int32_t bytes1, int32_t bytes2, uint32_t left) {
                          return LXStrcmp(locale, text1, bytes1, text2, bytes2, left);
                        });
 }
@@ -422,7 +495,8 @@ int32_t LXStrcollEx(LXLocale* locale, const char* text1, LXShiftState state1, in
   const LXLocale* used = lx::locale_of(locale);
   if (used == nullptr || !codepage_of(*used->codepage).shift_sensitive)
     return LXStrcoll(locale, text1, length1, text2, length2, options);
-  return collate_bytes(locale, {text1, state1, 0}, length1, {text2, state2, 0}, length2, options, Form::kEx,
+  Call call(unit, locale);
+  return collate_bytes(&call, {text1, state1, 0}, length1, {text2, state2, 0}, length2, options, 0, Form::kEx,
                        [&](int32_t bytes1, int32_t bytes2, uint32_t left) {
                          return LXStrcmpEx(locale, text1, state1, bytes1, text2, state2, bytes2,
                                            binary_options(left, true));

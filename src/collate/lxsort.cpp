@@ -157,6 +157,15 @@ int32_t give(const Sort& sort, const Element& element, LXWeights* first, LXWeigh
   return static_cast<int32_t>(sets);
 }
 
+void fill_deciding(Sort* sort) {
+  for (LXUChar u = 0; u < lx::kAsciiUnits; ++u) {
+    const Element element = sort->element(u);
+    const bool alone = element.sets() == 1 && !element.starts_pair() && !sort->may_end_pair(u);
+    sort->deciding[u] =
+        alone && sort->appends_primaries ? static_cast<uint16_t>(element.primary()) : uint16_t{0};
+  }
+}
+
 }  // namespace
 
 namespace lx {
@@ -196,6 +205,7 @@ void* derive_sort(Bytes bytes) {
   fill_pages(sort, reinterpret_cast<Element*>(first_pair + pairs), flat);
   fill_expansions(sort);
   fill_pairs(sort, first_pair);
+  fill_deciding(sort);
   return sort;
 }
 

@@ -28,7 +28,8 @@ class Element {
   }
   unsigned sets() const { return bits_ >> 48 & 3; }  // 0: the character is ignored
   bool starts_pair() const { return (bits_ & kStartsPair) != 0; }
-  unsigned char_class() const { return bits_ >> 52 & 0xF; }  // LX_APPEND_ bits
+  bool stands_alone() const { return (bits_ >> 48 & 7) == 1; }  // one set, and begins no pair
+  unsigned char_class() const { return bits_ >> 52 & 0xF; }     // LX_APPEND_ bits
 
   void set_starts_pair() { bits_ |= kStartsPair; }
 
@@ -43,6 +44,8 @@ struct Pair {
   Element element;
 };
 
+inline constexpr size_t kAsciiUnits = 128;
+
 /// Derived data of a sort object, one block with the pairs and elements behind it.
 struct Sort {
   const uint8_t* payload;
@@ -54,6 +57,8 @@ struct Sort {
   uint8_t default_tertiary;
   bool appends_primaries;  // no character inserts its primary ahead of others
   bool appends_all;        // ... nor any other weight
+  // Of the ASCII characters the primaries that decide wherever they stand: not of expansions and pairs; else 0.
+  uint16_t deciding[kAsciiUnits];
   struct Page {
     const Element* elements;  // 256; null: computed from the fields below
     uint8_t flags;
@@ -80,8 +85,11 @@ struct Sort {
 
   /// The element of a pair: false when the pair is none.
   bool pair(LXUChar first, LXUChar second, Element* element) const {
+    return may_end_pair(second) && find_pair(first, second, element);
+  }
+  bool may_end_pair(LXUChar second) const {
     const unsigned low = second & 0xFF;
-    return (second_bits[low / 32] >> low % 32 & 1) != 0 && find_pair(first, second, element);
+    return (second_bits[low / 32] >> low % 32 & 1) != 0;
   }
   bool find_pair(LXUChar first, LXUChar second, Element* element) const;
 

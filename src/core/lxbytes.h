@@ -15,6 +15,9 @@ inline constexpr uint32_t le32(const uint8_t* p) {
   return static_cast<uint32_t>(p[0]) | static_cast<uint32_t>(p[1]) << 8 | static_cast<uint32_t>(p[2]) << 16 |
          static_cast<uint32_t>(p[3]) << 24;
 }
+inline constexpr uint64_t le64(const uint8_t* p) {
+  return le32(p) | uint64_t{le32(p + 4)} << 32;
+}
 inline constexpr void put_le16(uint8_t* p, uint16_t v) {
   p[0] = static_cast<uint8_t>(v);
   p[1] = static_cast<uint8_t>(v >> 8);
