@@ -1,4 +1,4 @@
-/* Lexicor: one locale for the process and one for each thread.
+/* Lexicor: one locale for the process and one for each thread, and translation between codepages by number.
  *
  * These functions initialise the library on their first use; nobody need call LXInit. The process begins with
  * the user's locale as its default, and each thread with a locale of its own, made of the user's locale too. */
@@ -81,6 +81,51 @@ LX_API int32_t NLS1_SetLocaleTextInfoU(LXLocale* locale, int32_t item, const LXU
                                        int32_t flags);
 LX_API int32_t NLS1_SetLocaleTextInfoEx(LXLocale* locale, int32_t item, const char* text, LXShiftState state,
                                         int32_t length, int32_t flags);
+
+/* Translation between codepages. */
+
+/* The number of UTF-16, which is no object of the locale directory: an array of LXUChar in this machine's byte
+ * order, one character a unit. */
+#define NLS1_UTF16 1200
+
+/* Flags of NLS1_TranslateString beside LX_TERMINATE and LX_CHARACTERS. */
+#define NLS1_PAD 0x00400000         /* fill the rest of the output with blanks */
+#define NLS1_DROP_BLANKS 0x00800000 /* blanks at the end of the input that do not fit are no error */
+
+/* Translates a string from one codepage to another, both named by their identifiers or NLS1_UTF16, through
+ * Unicode, in the single-byte state of a shift-sensitive codepage from the start.
+ *
+ *  output_size   of `output`, in bytes, also for UTF-16; with LX_CHARACTERS in characters, and the buffer must
+ *                have room for their bytes, the shift bytes and a null. 0 and below: nothing is written.
+ *  input_length  of `input`, in bytes, also for UTF-16; with LX_CHARACTERS in characters. Below 0:
+ *                null-terminated (a null unit in UTF-16). A count of characters of a shift-sensitive codepage
+ *                takes in the shift byte behind the last one: the byte there is looked at.
+ *  consumed      may be null. The input bytes translated, with NLS1_DROP_BLANKS also those of the blanks that
+ *                were dropped; with LX_CHARACTERS what the result is.
+ *  flags         0 or a sum of
+ *                  LX_TERMINATE      the output ends with a null (a null unit in UTF-16), for which room is
+ *                                    kept, and which counts;
+ *                  LX_CHARACTERS     input length, output size, `consumed` and result count characters;
+ *                  NLS1_PAD          the output is filled up with blanks of the target, which count;
+ *                  NLS1_DROP_BLANKS  when the output is full and only single-byte blanks are left of the
+ *                                    input, it counts as translated.
+ *  rc            may be null. 0; 2 other flags; 30 the codepage's file is not there, or built-in data stand in
+ *                for it; 37 no such codepage; 40 input is left over: it does not fit, or ends inside a
+ *                character, or the output of UTF-16 has a size of 1; or why a codepage could not be loaded, or
+ *                11 (not initialised).
+ *
+ * Returns the bytes written (characters with LX_CHARACTERS), or -1 with nothing written when a codepage cannot
+ * be had, the flags are invalid, or the output of UTF-16 has a size of 1. With code 40 what fits is written,
+ * never half a character.
+ *
+ * Without LX_TERMINATE a null-terminated input still gives a null that counts, when all of it was translated
+ * and there is room. An empty input of length 0 gives 0 and no padding; with LX_TERMINATE one null byte, also
+ * in UTF-16. Output in a shift-sensitive codepage ends in the single-byte state: when it is full in the other
+ * one, the last character is taken back for the shift byte, and still counts as consumed: give one byte more
+ * than the text needs. The two buffers may not overlap; one of UTF-16 is aligned as LXUChar is. */
+LX_API int32_t NLS1_TranslateString(int32_t target_codepage, int32_t source_codepage, void* output,
+                                    int32_t output_size, const void* input, int32_t input_length,
+                                    int32_t* consumed, int32_t flags, uint32_t* rc);
 
 /* Initialises the process. And the calling thread's locale, null when it could not be made; it belongs to the
  * thread's services: do not release it. */

@@ -17,6 +17,7 @@ enum RAS1_Level {
   RAS1_LEVEL_PROCESS = 0x100, /* failures of process initialisation */
   RAS1_LEVEL_ERRORS = 0x80,   /* messages that report a failure */
   RAS1_LEVEL_EVENTS = 0x40,   /* entry and exit */
+  RAS1_LEVEL_FLOW = 0x20,     /* the way that a call takes */
   RAS1_LEVEL_DETAIL = 0x10,   /* state, counts, each entry of a table */
   RAS1_LEVEL_INPUT = 0x08,    /* the arguments of a call */
   RAS1_LEVEL_NOTICES = 0x04   /* data altered on the way */

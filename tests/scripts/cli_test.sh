@@ -234,6 +234,29 @@ same 'the output of a cut mapping' old <(printf '\x81\x82\x83')
 says 'no such mapping' 2 'title not in' "$lexicor" map title
 says 'mapping for an unknown locale' 2 "no territory 'Mars'.*lexicor list territories" "$lexicor" map upper --locale English_Mars
 
+# --- Translation of fields: a size, padding and blanks, UTF-16, what is left over.
+# translates NAME STATUS STDERR INPUT OUTPUT ARGUMENTS...: input and expected output as escapes of printf.
+translates() {
+  bytes "$4" in
+  bytes "$5" expected
+  expect "$1" "$2" "$3" "$lexicor" translate "${@:6}" in
+  same "$1" out expected
+}
+translates 'a field' 0 '' '\xe3\x81\x82A\n' '\x0e\x44\x81\x0f\xc1\x25' --from UTF-8 --to 930
+translates 'from UTF-16' 0 '' '\x42\x30A\0' '\xe3\x81\x82A' --from 1200 --to utf8
+translates 'to UTF-16' 0 '' '\xe3\x81\x82A' '\x42\x30A\0 \0' --from utf8 --to utf-16 --pad --size 7
+translates 'no bytes' 0 '' '' '' --from 1252 --to 1200
+translates 'padded on a host' 0 '' 'ab' '\x81\x82\x40\x40' --from 1252 --to 1141 --size 4 --pad
+translates 'trimmed' 0 '' 'ab  ' 'ab' --from 1252 --to 1251 --size 2 --trim
+translates 'left over' 1 'lexicor: the input is left over from byte 2 on: it does not fit in a size of 2, or ends inside a character' \
+  'ab  ' 'ab' --from 1252 --to 1251 --size 2
+translates 'a field cut' 1 'lexicor: the input ends inside the character that begins at byte 1' 'a\xe3' '' --from utf8 --to 1252
+says 'padding to no size' 2 '--pad requires --size' "$lexicor" translate --from 1252 --to 1251 --pad
+says 'a size of nothing' 2 '--size' "$lexicor" translate --from 1252 --to 1251 --size 0
+says 'translation from an unknown codepage' 2 "unknown codepage 'utf-17'" "$lexicor" translate --from utf-17 --to 1251
+"$lexicor" translate --from UTF-8 --to IBM939 large >there
+same '1 MB translated' there <("$lexicor" convert --from UTF-8 --to IBM939 large)
+
 # --- Sorting: line ends, the sort, keys beside comparison, and what a line may hold.
 # sorts NAME INPUT OUTPUT ARGUMENTS...: input and expected output as escapes of printf.
 sorts() {

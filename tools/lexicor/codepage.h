@@ -25,6 +25,7 @@ class Codepage {
   LXLocale* locale() const { return locale_; }
   const LXObject* object() const { return object_; }
   const std::string& name() const { return name_; }
+  unsigned id() const { return id_; }
   bool utf8() const { return id_ == kUtf8Id; }
 
   bool shift_sensitive() const { return shift_sensitive_; }

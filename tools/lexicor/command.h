@@ -54,5 +54,6 @@ Run declare_map(CLI::App& command, const CommonOptions& common);
 Run declare_native(CLI::App& command, const CommonOptions& common);
 Run declare_parse(CLI::App& command, const CommonOptions& common);
 Run declare_sort(CLI::App& command, const CommonOptions& common);
+Run declare_translate(CLI::App& command, const CommonOptions& common);
 
 }  // namespace lexicor_cli

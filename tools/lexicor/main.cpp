@@ -20,6 +20,7 @@ using namespace lexicor_cli;
 
 constexpr Subcommand kSubcommands[] = {
     {"convert", "Convert text from one codepage to another", declare_convert},
+    {"translate", "Translate a field from one codepage to another, to a size", declare_translate},
     {"map", "Map text to another case or width, or to ASCII digits", declare_map},
     {"sort", "Sort the lines of a text by a locale's sort", declare_sort},
     {"compare", "Tell which of two texts comes first", declare_compare},

@@ -1,0 +1,285 @@
+// Translation of strings between codepages by number: random texts against the conversions between locales, for
+// every pair of kinds and every size; then what only translation does, row by row; then refusals and messages.
+#include <random>
+
+#include "core/library_fixture.h"
+#include "core/lxformat.h"
+#include "nls1.h"
+#include "support/tiny_codepages.h"
+
+namespace lx::test {
+namespace {
+
+constexpr int32_t kTerm = LX_TERMINATE, kChars = LX_CHARACTERS, kPad = NLS1_PAD, kDrop = NLS1_DROP_BLANKS;
+// Single byte, two kinds of multibyte, shift-sensitive, UTF-16.
+constexpr int32_t S = 9001, J = 9002, V = 57352, H = 9005, U = NLS1_UTF16;
+
+// In a block of its size, so that whoever reads or writes beyond it is seen.
+using Bytes = std::vector<char>;
+
+struct Translated {
+  Bytes output;
+  int32_t result = 0, consumed = 9999;
+  uint32_t rc = 99;
+};
+Translated translate(int32_t to, int32_t from, const Bytes& input, int32_t length, int32_t size, int32_t flags,
+                     size_t room) {
+  Translated t{Bytes(room, '\xA5')};
+  t.result =
+      NLS1_TranslateString(to, from, t.output.data(), size, input.data(), length, &t.consumed, flags, &t.rc);
+  return t;
+}
+
+/// Two codepages, null for UTF-16, and a text.
+struct Pair {
+  TinyLibrary& library;
+  const TinyCodepage* to;
+  const TinyCodepage* from;
+  Bytes input;
+
+  static int32_t number(const TinyCodepage* cp) { return cp != nullptr ? cp->file.id : U; }
+
+  /// What the conversion of the core gives, counted as the translation counts.
+  int32_t convert(const Bytes& text, int32_t length, int32_t size, int32_t flags, char* out) const {
+    const int32_t unit = (flags & kChars) != 0 ? 1 : 2;
+    const auto* const units = reinterpret_cast<const LXUChar*>(text.data());
+    LXLocale* const target = to != nullptr ? library.locale(*to) : nullptr;
+    if (from == nullptr)
+      return LXUnicodeToStringEx(target, out, 0, size, units, length < 0 ? -1 : length / unit, flags);
+    LXLocale* const source = library.locale(*from);
+    if (to != nullptr) return LXConvertStringEx(target, out, 0, size, source, text.data(), 0, length, flags);
+    return unit * LXStringToUnicodeEx(reinterpret_cast<LXUChar*>(out), size / unit, source, text.data(), 0,
+                                      length, flags);
+  }
+
+  Bytes output_of(const Bytes& text) const {
+    Translated t = translate(number(to), number(from), text, static_cast<int32_t>(text.size()), 4000, 0, 4000);
+    t.output.resize(static_cast<size_t>(t.result));
+    return t.output;
+  }
+
+  void check(const Bytes& text, int32_t length, int32_t size, int32_t flags) const {
+    SCOPED_TRACE(testing::Message() << number(from) << " to " << number(to) << ": " << length << ' ' << size
+                                    << ' ' << flags);
+    const size_t room = static_cast<size_t>(size) * ((flags & kChars) != 0 ? 5 : 1);
+    const Translated t = translate(number(to), number(from), text, length, size, flags, room);
+    const bool closes = to != nullptr && to->shift, units = to == nullptr && from == nullptr;
+    Bytes expected(room, '\xA5');
+    const int32_t result = units ? t.result : convert(text, length, size, flags, expected.data());
+    if (closes && flags == 0 && length > 0) {
+      const auto before_shift = t.output.begin() + std::max(t.result - 1, 0);
+      ASSERT_TRUE(std::equal(t.output.begin(), before_shift, expected.begin()));
+    } else if (!closes && !units) {
+      ASSERT_EQ(t.result, result);
+      ASSERT_EQ(t.output, expected);
+    }
+    if ((flags & kChars) != 0) return;
+    const auto at = input.begin() + t.consumed;
+    EXPECT_EQ(t.rc, at == input.end() ? LX_OK : LX_E_SIZE);
+    if (closes ||
+        (from != nullptr && from->shift &&
+         std::count(input.begin(), at, from->shift_out) != std::count(input.begin(), at, from->shift_in)))
+      return;
+    // What was consumed and what was not give the whole, each on its own.
+    Bytes parts = output_of({input.begin(), at});
+    EXPECT_TRUE(std::equal(parts.begin(), parts.end(), t.output.begin()));
+    for (char byte : output_of({at, input.end()})) parts.push_back(byte);
+    EXPECT_EQ(parts, output_of(input));
+  }
+};
+
+TEST(Translate, AgreesWithConversion) {
+  expect_in_child("random texts", [] {
+    TinyLibrary library;
+    const std::vector<TinyCodepage> all = tiny_codepages();
+    std::mt19937 random(8);
+    for (size_t i = 0; i < 4 * (all.size() + 1) * (all.size() + 1); ++i) {
+      const size_t f = i / 4 % (all.size() + 1), t = i / 4 / (all.size() + 1);
+      const auto& characters = all[f < all.size() ? f : random() % all.size()].characters;
+      const int32_t chars = std::initializer_list<int32_t>{1, 3, 9, 70}.begin()[i % 4];
+      std::vector<uint16_t> text(static_cast<size_t>(chars));
+      for (size_t at = 0; at < text.size(); ++at)
+        while (text[at] == 0)
+          text[at] = at % 20 > 3 ? text[at - 1] : characters[random() % characters.size()].unicode;
+      std::string bytes(reinterpret_cast<const char*>(text.data()), 2 * text.size());
+      if (f < all.size()) bytes = all[f].encode(text);
+      const Pair pair{library,
+                      t < all.size() ? &all[t] : nullptr,
+                      f < all.size() ? &all[f] : nullptr,
+                      {bytes.begin(), bytes.end()}};
+      const Bytes with_null(bytes.c_str(), bytes.c_str() + bytes.size() + 1);
+      Bytes ended = with_null;
+      if (pair.from == nullptr) ended.push_back('\0');
+      for (int32_t flags : {0, kTerm, kChars, kTerm | kChars}) {
+        for (int32_t size = pair.to == nullptr ? 2 : 1; size < 3 * chars + 6; size += 1 + size / 40) {
+          // A count of characters takes in the shift byte behind them: the byte there must be readable.
+          if ((flags & kChars) != 0)
+            pair.check(with_null, chars, size, flags);
+          else
+            pair.check(pair.input, static_cast<int32_t>(bytes.size()), size, flags);
+          pair.check(ended, -1, size, flags);
+        }
+      }
+    }
+  });
+}
+
+struct Row {
+  int32_t to, from, size, flags;
+  std::string input, output;
+  int32_t consumed;  // the result too where characters are counted; -1: refused
+  uint32_t code = LX_OK;
+  int32_t length = -2;  // of the whole input
+};
+
+TEST(Translate, Ends) {
+  const std::string k = "\x82\x9F", one = "\x0E\x44\x47", z(1, '\0'), az = "a" + z, hiragana = "\x41\x30";
+  constexpr uint32_t kLeft = LX_E_SIZE;
+  const Row rows[] = {
+      // Blanks that do not fit.
+      {S, S, 2, kDrop, "ab   ", "ab", 5},
+      {S, S, 2, 0, "ab   ", "ab", 2, kLeft},
+      {S, S, 2, kDrop, "ab  c", "ab", 2, kLeft},
+      {S, H, 1, kDrop, "\xC1\x40\x40", "A", 3},
+      {S, S, 3, kDrop | kTerm, "ab  ", "ab" + z, 4},
+      {S, S, 2, kDrop | kChars, "ab  ", "ab", 2},
+      {S, U, 1, kDrop, az + " " + z + " " + z, "a", 6},
+      {S, U, 1, kDrop, az + " " + z + " ", "a", 2, kLeft},
+      {U, H, 2, kDrop, one + "\x0F\x40\x40", hiragana, 6},
+      {U, H, 2, kDrop, one + "\x40\x40", hiragana, 3, kLeft},
+      // Shift bytes and cut characters at the end of what is consumed.
+      {U, H, 2, 0, one + "\x0F", hiragana, 4},
+      {U, H, 2, 0, one + "\x0F\xC1", hiragana, 4, kLeft},
+      {U, H, 2, 0, "\xC1" + one, "A" + z, 1, kLeft},
+      {U, H, 8, 0, "\xC1\x0E\x44", "A" + z, 1, kLeft},
+      {V, J, 8, 0, "a\x82", "a", 1, kLeft},
+      {V, J, 8, 0, "a\x82" + z, "a", 1, kLeft, -1},
+      {S, U, 8, 0, az + "b", "a", 2, kLeft},
+      {U, S, 3, kPad, "ab", az, 1, kLeft},
+      // Padding.
+      {H, S, 3, kPad, "A", "\xC1\x40\x40", 1},
+      {S, S, 5, kPad | kTerm, "ab", "ab  " + z, 2},
+      {S, S, 5, kPad, "ab" + z, "ab   ", 2, LX_OK, -1},
+      {V, J, 4, kPad, k + k, "\xE3\x81\x81 ", 2, kLeft},
+      {J, V, 4, kPad | kChars | kTerm, "a\xE3\x81\x81", "a" + k + " " + z, 4, LX_OK, 2},
+      {U, S, 2, kPad | kChars, "a", az + " " + z, 2},
+      {U, U, 7, kPad, hiragana, hiragana + " " + z + " " + z, 2},
+      {S, S, 2, kPad, z, "  ", 0, LX_OK, -1},
+      {S, S, 2, kPad, "", "", 0},
+      // The state at the end; what is taken back stays consumed.
+      {H, J, 6, kPad, k, one + "\x0F\x40\x40", 2},
+      {H, J, 5, kTerm, k, one + "\x0F" + z, 2},
+      {H, J, 4, 0, k + z, one + "\x0F", 2, LX_OK, -1},
+      {H, J, 5, 0, k + k, one + "\x0F", 4},
+      {H, J, 5, 0, k + k + z, one + "\x0F" + z, 4, LX_OK, -1},
+      {H, J, 5, kPad, k + k + k, one + "\x0F\x40", 4, kLeft},
+      {H, J, 3, 0, k, "\x0E\x0F", 2},
+      {H, J, 2, 0, k, "", 0, kLeft},
+      {H, J, 3, kChars, k + k + k, one + "\x44\x47\x0F", 2, LX_OK, 3},
+      {H, J, 4, kChars, k + k + k, one + "\x44\x47\x44\x47\x0F", 3, LX_OK, 3},
+      // Nothing to translate, or no room.
+      {S, S, 0, kTerm, "ab", "", 0},
+      {S, S, -5, kTerm | kPad, "ab", "", 0},
+      {U, S, 4, kTerm, "", z, 0},
+      {U, S, 4, kTerm | kChars, "", z, 1},
+      {U, U, 2, 0, z + z, z + z, 0, LX_OK, -1},
+      {U, S, 3, kTerm, "ab", z + z, 0, kLeft},
+      {U, U, 1, 0, az, "", -1, kLeft},
+      {U, S, 1, kChars, "a", "", -1, kLeft},
+      {S, S, 2, 1, "ab", "", -1, LX_E_INVALID},
+      {S, S, 0, kDrop | kPad | kChars | kTerm | 0x100, "", "", -1, LX_E_INVALID},
+  };
+  expect_in_child("rows", [&] {
+    // A single-byte codepage has no shift states, whatever it says.
+    std::vector<TinyCodepage> codepages = tiny_codepages();
+    codepages[0].file.sections[0][format::codepage::kShiftOut] = 'a';
+    codepages[0].file.sections[0][format::codepage::kFlags] = format::codepage::kFlagShift;
+    TinyLibrary library(codepages);
+    for (const Row& row : rows) {
+      SCOPED_TRACE(&row - rows);
+      const Bytes input(row.input.begin(), row.input.end());
+      const int32_t length = row.length == -2 ? static_cast<int32_t>(input.size()) : row.length;
+      const bool by_chars = (row.flags & kChars) != 0;
+      // One byte more where a character is taken back for the shift byte.
+      const size_t room = by_chars ? row.output.size() + 1 : static_cast<size_t>(std::max(row.size, 0));
+      Translated t = translate(row.to, row.from, input, length, row.size, row.flags, room);
+      EXPECT_EQ(t.result,
+                by_chars || row.consumed < 0 ? row.consumed : static_cast<int32_t>(row.output.size()));
+      EXPECT_EQ(t.consumed, std::max(row.consumed, 0));
+      EXPECT_EQ(t.rc, row.code);
+      t.output.resize(row.output.size());
+      EXPECT_EQ(testing::PrintToString(std::string(t.output.begin(), t.output.end())),
+                testing::PrintToString(row.output));
+    }
+  });
+}
+
+class TranslateTest : public LibraryTest {};
+
+// Built-in data may serve a locale whose codepage has no file; a translation is refused each time.
+TEST_F(TranslateTest, CodepagesThatCannotBeHad) {
+  directory.write_locale(
+      {{367, "US-ASCII", ascii_codepage()}, {954, "NoFile", ascii_codepage()}, {955, "Bad", ascii_codepage()}});
+  unlink(directory.file("cp_00954.nls").c_str());
+  directory.write_text("cp_00955.nls", std::string(100, 'x'));
+  setenv("NLS1_LOCALEDIR", directory.path().c_str(), 1);
+  expect_in_child("codepages", [] {
+    const int32_t cases[][3] = {{367, 954, LX_E_NO_CODEPAGE}, {954, 367, LX_E_NO_CODEPAGE},
+                                {367, 955, LX_E_CORRUPT},     {955, 367, LX_E_NO_CODEPAGE},
+                                {367, 1, LX_E_NOT_FOUND},     {65536 + 367, 367, LX_E_NOT_FOUND},
+                                {-1, U, LX_E_NOT_FOUND}};
+    char out = '#';
+    uint32_t rc = 99;
+    for (const auto& [to, from, code] : cases) {
+      EXPECT_EQ(NLS1_TranslateString(to, from, &out, 1, "a", 1, nullptr, 1, &rc), -1);
+      EXPECT_EQ(rc, static_cast<uint32_t>(code)) << from << " to " << to;
+    }
+    EXPECT_EQ(out, '#');
+    EXPECT_EQ(NLS1_TranslateString(367, 367, &out, 1, "a", 1, nullptr, 0, nullptr), 1);
+  });
+  unsetenv("NLS1_LOCALEDIR");
+}
+
+TEST(Translate, Messages) {
+  struct Case {
+    uint32_t level;
+    int32_t to, from, length;
+    std::string messages;  // each with a bar behind it
+  };
+  const std::string shift = " codepage 9005 is shift sensitive, Shift-In=0E, Shift-Out=0f|";
+  const std::string single = " codepage 9001 is single byte|";
+  const Case cases[] = {
+      {RAS1_LEVEL_DETAIL, V, S, -1,
+       "Source" + single + "Target codepage 57352 is not shift sensitive|Source length = 1|"},
+      {RAS1_LEVEL_DETAIL, S, H, 2, "Source" + shift + "Target" + single},
+      {RAS1_LEVEL_DETAIL, H, U, -1, "Target" + shift + "Source length = 2|"},
+      {RAS1_LEVEL_ERRORS, 1, 2, 2, "Unable to locate codepage 2|Unable to locate codepage 1|"},
+      {RAS1_LEVEL_FLOW, J, S, 2, "Process SingleByte Input, Multi-byte output |"},
+      {RAS1_LEVEL_FLOW, H, S, 2, "Process SingleByte Input, Extended Multi-byte output |"},
+      {RAS1_LEVEL_FLOW, V, H, 2, "Process Multi-Byte Input, Multi-byte output |"},
+      {RAS1_LEVEL_FLOW, H, J, 2, "Process multi-byte Input, Extended Multi-byte output |"},
+      {RAS1_LEVEL_FLOW, S, J, 2, ""},
+      {RAS1_LEVEL_FLOW, H, U, 2, ""},
+      {RAS1_LEVEL_FLOW, H, S, 0, ""},
+  };
+  expect_in_child("messages", [&cases] {
+    TinyLibrary library;
+    for (const Case& c : cases) {
+      RecordingTrace::take();
+      RecordingTrace::set_level(c.level | RAS1_LEVEL_EVENTS);
+      const Translated t = translate(c.to, c.from, {'a', 0, 0, 0}, c.length, 8, 0, 8);
+      RecordingTrace::set_level(0);
+      std::string found;
+      for (const TraceRecord& record : RecordingTrace::take()) {
+        if (record.unit != "qrlnsts") continue;
+        if (record.kind == TraceRecord::kEntry) found += "entry|";
+        if (record.kind == TraceRecord::kMessage) found += record.text + "|";
+        if (record.kind == TraceRecord::kExitValue) found += std::to_string(record.value);
+      }
+      EXPECT_EQ(found, "entry|" + c.messages + std::to_string(t.result)) << c.from << " to " << c.to;
+    }
+  });
+}
+
+}  // namespace
+}  // namespace lx::test
