@@ -1,12 +1,9 @@
 // Every shipped language and territory, read from the compiled objects through the library, against ICU's own
 // services: names, symbols, currencies, case mapping, and numbers, amounts, dates and times written out. What
 // differs must be what locale_differences.txt lists, each line with its reason.
-//
-// LEXICOR_WRITE_DIFFERENCES=FILE appends the lines that the test found, with both sides in place of the reason.
 #include <gtest/gtest.h>
 #include <unicode/uchar.h>
 #include <unicode/ucurr.h>
-#include <unicode/udat.h>
 #include <unicode/uldnames.h>
 #include <unicode/uloc.h>
 #include <unicode/ulocdata.h>
@@ -15,15 +12,13 @@
 #include <unicode/ustring.h>
 
 #include <algorithm>
-#include <cstdlib>
 #include <ctime>
-#include <fstream>
-#include <map>
 #include <sstream>
 #include <vector>
 
 #include "compile.h"
-#include "import/icu_text.h"
+#include "directory/icu_peer.h"
+#include "directory/listed_differences.h"
 #include "import/locale_table.h"
 #include "support/library.h"
 
@@ -32,34 +27,13 @@ namespace {
 
 using lexicor_import::ascii_signs;
 using lexicor_import::IcuPtr;
-using Text = std::u16string;
+using Text = Text16;
 
 constexpr tm kDates[] = {{9, 5, 14, 5, 6, 103, 6, 185, 0, 0, nullptr},     // 5 July 2003, a Saturday
                          {0, 0, 0, 1, 0, 124, 1, 0, 0, 0, nullptr},        // 1 January 2024, midnight
                          {59, 59, 9, 31, 11, 99, 5, 364, 0, 0, nullptr},   // 31 December 1999
                          {45, 30, 12, 20, 4, 126, 3, 139, 0, 0, nullptr},  // 20 May 2026, noon
                          {1, 10, 23, 8, 8, 100, 5, 251, 0, 0, nullptr}};   // 8 September 2000
-
-/// The text of an ICU function that ends in buffer, room and error.
-template <class Function, class... Arguments>
-Text icu(Function function, Arguments... arguments) {
-  return lexicor_import::icu_text("ICU", [&](UChar* out, int32_t room, UErrorCode* error) {
-    return function(arguments..., out, room, error);
-  });
-}
-
-std::string utf8(const Text& text) {
-  std::string out(3 * text.size(), '\0');
-  UErrorCode error = U_ZERO_ERROR;
-  int32_t bytes = 0;
-  u_strToUTF8(out.data(), static_cast<int32_t>(out.size()), &bytes, text.data(),
-              static_cast<int32_t>(text.size()), &error);
-  return out.substr(0, static_cast<size_t>(bytes));
-}
-
-Text widen(const std::string& text) {
-  return Text(text.begin(), text.end());
-}
 
 /// The items of a locale: the territory's own values.
 class Items {
@@ -113,7 +87,7 @@ class Items {
              : *part == 's' ? text(LX_ITEM_POSITIVE_SIGN + negative)
              : *part == 'n' ? body
              : *part == '_' ? Text(space == 1 ? 1 : 0, u' ')
-                            : widen({*part});
+                            : widen(std::string(1, *part));
     }
     return out;
   }
@@ -149,44 +123,22 @@ class Items {
   LocalePtr locale_;
 };
 
-/// The differences found, "object item" with both sides.
+/// The differences found: object, item and both sides.
 class Differences {
  public:
   void compare(const std::string& object, const std::string& item, const Text& ours, const Text& theirs) {
     ++compared_;
-    if (ours != theirs) found_[object + " " + item] = utf8(ours) + " / " + utf8(theirs);
+    if (ours != theirs) found_.add(object, item, utf8(ours) + " / " + utf8(theirs));
   }
   void expect_listed() const {
     EXPECT_GT(compared_, 1500U);
-    std::map<std::string, std::string> listed;
-    std::ifstream in(LEXICOR_DATA_DIR "/../tests/directory/locale_differences.txt");
-    for (std::string line, object, item, reason; std::getline(in, line);) {
-      std::istringstream words(line);
-      if (line.empty() || line[0] == '#') continue;
-      words >> object >> item >> std::ws;
-      EXPECT_TRUE(std::getline(words, reason)) << "no reason: " << line;
-      EXPECT_TRUE(listed.emplace(object + " " + item, reason).second) << "listed twice: " << line;
-    }
-    const char* file = getenv("LEXICOR_WRITE_DIFFERENCES");
-    std::ofstream out(file == nullptr ? "/dev/null" : file, std::ios::app);
-    for (const auto& [place, sides] : found_) {
-      out << place << " " << sides << '\n';
-      EXPECT_EQ(listed.erase(place), 1U) << "not listed: " << place << ": " << sides;
-    }
-    for (const auto& [place, reason] : listed)
-      ADD_FAILURE() << "listed and not found: " << place << ": " << reason;
+    found_.expect_listed("locale_differences.txt");
   }
 
  private:
   size_t compared_ = 0;
-  std::map<std::string, std::string> found_;
+  ListedDifferences found_;
 };
-
-IcuPtr<UDateFormat, udat_close> open_date(UDateFormatStyle time, UDateFormatStyle date,
-                                          const std::string& locale) {
-  UErrorCode error = U_ZERO_ERROR;
-  return IcuPtr<UDateFormat, udat_close>(udat_open(time, date, locale.c_str(), u"UTC", -1, nullptr, 0, &error));
-}
 
 /// The letters of a language that have case, a blank behind each.
 Text letters_of(const char* locale) {
@@ -259,7 +211,7 @@ void compare_territory(const lexicor_import::Territory& row, Differences* differ
     int32_t item;
     Text theirs;
   } texts[] = {
-      {"abbreviation", LX_ITEM_TERRITORY_ABBREVIATION, widen(uloc_getISO3Country(row.locale))},
+      {"abbreviation", LX_ITEM_TERRITORY_ABBREVIATION, widen(std::string(uloc_getISO3Country(row.locale)))},
       {"name", LX_ITEM_TERRITORY_NAME, icu(uloc_getDisplayCountry, row.locale, row.locale)},
       {"decimal", LX_ITEM_DECIMAL, icu(unum_getSymbol, numbers.get(), UNUM_DECIMAL_SEPARATOR_SYMBOL)},
       {"thousands", LX_ITEM_THOUSANDS, icu(unum_getSymbol, numbers.get(), UNUM_GROUPING_SEPARATOR_SYMBOL)},
@@ -294,10 +246,7 @@ void compare_territory(const lexicor_import::Territory& row, Differences* differ
     for (tm when : kDates) {
       ours += items.expand(item, when) + u'|';
       const UDate milliseconds = static_cast<UDate>(timegm(&when)) * 1000;
-      theirs += icu([&](UChar* out, int32_t room, UErrorCode* status) {
-                  return udat_format(format.get(), milliseconds, out, room, nullptr, status);
-                }) +
-                u'|';
+      theirs += formatted(format, milliseconds) + u'|';
     }
     compare(name, ours, theirs);
   };

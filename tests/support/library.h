@@ -26,11 +26,11 @@ struct LocaleReleaser {
 };
 using LocalePtr = std::unique_ptr<LXLocale, LocaleReleaser>;
 
-/// An English locale with this codepage; throws when there is none.
-inline LocalePtr locale_with(const std::string& codepage) {
+/// A locale with this codepage, of language_territory; throws when there is none.
+inline LocalePtr locale_with(const std::string& codepage, const std::string& of = "English_UnitedStates") {
   int32_t rc = LX_OK;
-  LocalePtr locale(LXGetLocale(("English_UnitedStates." + codepage + "@BINARY").c_str(), 0, &rc));
-  if (!locale) throw std::runtime_error("no locale with codepage " + codepage + ": " + std::to_string(rc));
+  LocalePtr locale(LXGetLocale((of + "." + codepage + "@BINARY").c_str(), 0, &rc));
+  if (!locale) throw std::runtime_error("no locale " + of + "." + codepage + ": " + std::to_string(rc));
   return locale;
 }
 
