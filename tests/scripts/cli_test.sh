@@ -8,35 +8,10 @@ samples=$source_dir/data/samples
 [ -x "$lexicor" ] || exit 77
 export LC_ALL=C
 unset LX_LOCALEDIR
-work=$(mktemp -d) || exit 1
-trap 'rm -rf "$work"' EXIT
-cd "$work" || exit 1
+. "$source_dir/tests/scripts/expect.bash"
 
-failures=0
-fault() { echo "FAILED: $1" && failures=$((failures + 1)); }
-
-# run NAME STATUS COMMAND...: the exit status. Output goes to out, standard error to err.
-run() {
-  "${@:3}" >out 2>err
-  local actual=$?
-  [ "$actual" = "$2" ] || fault "$1: exit $actual, expected $2"
-}
-# expect NAME STATUS STDERR COMMAND...: the exit status, and the whole of standard error.
-expect() {
-  run "$1" "$2" "${@:4}"
-  [ "$(cat err)" = "$3" ] || fault "$1: standard error is: $(cat err)"
-}
-# says NAME STATUS PATTERN COMMAND...: the exit status, and a pattern in standard error.
-says() {
-  run "$1" "$2" "${@:4}"
-  grep -q -e "$3" err || fault "$1: standard error is: $(cat err)"
-}
 # convert NAME STATUS STDERR FROM TO ARGUMENTS...
 convert() { expect "$1" "$2" "$3" "$lexicor" convert --from "$4" --to "$5" "${@:6}"; }
-
-same() { cmp "$2" "$3" >&2 || fault "$1"; }
-# bytes TEXT FILE: a file of the bytes that the escapes of printf stand for.
-bytes() { printf "$1" >"$2"; }
 
 # converts NAME FROM TO INPUT OUTPUT: input and expected output as escapes of printf.
 converts() {

@@ -1,11 +1,12 @@
 #!/bin/bash
 # The demo: converts each sample to the codepages that its language lives in, and back, and compares byte for
-# byte; then writes the same values as fifteen locales do. Argument: the build directory. Exit 1 when any text
-# comes back different.
+# byte; then writes the same values as fifteen locales do, and fetches messages of four languages in the codepages
+# of their callers. Argument: the build directory. Exit 1 when any text comes back different.
 set -u
 here=$(cd "$(dirname "${BASH_SOURCE[0]}")" && pwd)
 build=${1:?usage: demo.sh BUILD_DIR}
 lexicor=$build/bin/lexicor
+gencat=$build/bin/lexicor-gencat
 samples=$here/../../data/samples
 work=$(mktemp -d) || exit 1
 trap 'rm -rf "$work"' EXIT
@@ -31,6 +32,9 @@ fit() {
   printf '%s%*s' "$text" $(($2 - width)) ''
 }
 
+# first_bytes FILE: eight of them, in hexadecimal.
+first_bytes() { head -c 8 "$1" | od -An -tx1 | tr -d '\n' | tr a-f A-F; }
+
 total=0 failed=0
 # trip LANGUAGE SAMPLE CODEPAGE...: one line for each codepage.
 trip() {
@@ -48,7 +52,7 @@ trip() {
       verdict=${bad}DIFFERENT$plain
     fi
     touch "$there" "$back"
-    hex=$(head -c 8 "$there" | od -An -tx1 | tr -d '\n' | tr a-f A-F)
+    hex=$(first_bytes "$there")
     IFS= read -r text <"$back" || true
     printf '%-20s  %-10s  %4d >%4d  %-24s  %s  %s\n' "$language" "$codepage" \
       "$(stat -c %s "$sample")" "$(stat -c %s "$there")" "$hex" "$(fit "$text" 25)" "$verdict"
@@ -89,3 +93,23 @@ for locale in English_UnitedStates English_India German_Germany German_German-Sw
   Japanese_Japan Korean_Korea Arabic_SaudiArabia; do
   values "$locale"
 done
+
+# messages LANGUAGE SOURCE CATALOG_LOCALE SET NUMBER CALLER_LOCALE...: compiles the catalog, and fetches a message of
+# it in each caller's codepage.
+messages() {
+  local language=$1 catalog=$work/$2.cat locale=$3 set=$4 number=$5 source=$samples/catalog/$2.msg caller text
+  shift 5
+  "$gencat" --new --locale "$locale" "$catalog" "$source" || exit 1
+  for caller in "$@"; do
+    "$lexicor" message "$catalog" "$set" "$number" --locale "$caller" >"$work/message" &&
+      "$lexicor" convert --from "${caller#*.}" --to UTF-8 --strict -o "$work/shown" "$work/message" || exit 1
+    IFS= read -r text <"$work/shown" || true
+    printf '%-9s  %-8s  %-8s  %-24s  %s\n' "$language" "${locale#*.}" "${caller#*.}" "$(first_bytes "$work/message")" "$text"
+  done
+}
+
+printf '\n%-9s  %-8s  %-8s   %-23s  %s\n' 'Messages' 'Catalog' 'Caller' 'First bytes' 'Text'
+messages English english English_UnitedStates.IBM037 1 2 English_UnitedStates.MS1252 English_UnitedStates.IBM500
+messages German german German_Germany.IBM273 1 2 German_Germany.MS1252 German_Germany.IBM850 German_Germany.IBM1141
+messages Japanese japanese Japanese_Japan.IBM930 1 2 Japanese_Japan.MS932 Japanese_Japan.JapanEUC Japanese_Japan.IBM939
+messages Russian russian Russian_Russia.MS1251 1 2 Russian_Russia.KOI8-R Russian_Russia.IBM866 Russian_Russia.IBM1025

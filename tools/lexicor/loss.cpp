@@ -5,77 +5,12 @@
 #include <algorithm>
 #include <cstring>
 
+#include "character_values.h"
 #include "hex.h"
 
 namespace lexicor_cli {
 
 namespace {
-
-constexpr LXUChar kReplacement = 0xFFFD;
-
-/// The Unicode values of a codepage's single bytes; U+FFFD for one that is not a character.
-std::vector<LXUChar> single_byte_values(const Codepage& codepage) {
-  std::vector<LXUChar> values(256, kReplacement);
-  for (int byte = 0; byte < 256; ++byte) {
-    const char text = static_cast<char>(byte);
-    LXUChar unit;
-    if (LXStringToUnicodeEx(&unit, 1, codepage.locale(), &text, LX_SHIFT_SINGLE, 1, 0) == 1)
-      values[static_cast<size_t>(byte)] = unit;
-  }
-  return values;
-}
-
-/// Tells the substitution byte from the character that a Unicode value maps to.
-class Substitution {
- public:
-  explicit Substitution(const Codepage& codepage) : codepage_(codepage), single_(single_byte_values(codepage)) {
-    // Values that stand for no character: the first one that the codepage does not encode gives the byte away.
-    constexpr LXUChar kProbes[] = {0xFFFF, 0xFFFE, 0xFDD0, 0xD800};
-    for (const LXUChar probe : kProbes) {
-      const LXWChar code = LXCpUnicodeToCharW(codepage.object(), probe);
-      if (code > 0xFF || single_[code] == probe) continue;
-      byte_ = code;
-      known_ = true;
-      break;
-    }
-  }
-
-  bool stands_for(LXUChar unicode, LXWChar code) const {
-    if (code > 0xFF || single_[code] == unicode) return false;
-    // A page of a codepage that maps nothing may give the null byte in place of the substitution byte.
-    return code == 0 || (known_ && code == byte_);
-  }
-
- private:
-  const Codepage& codepage_;
-  std::vector<LXUChar> single_;
-  LXWChar byte_ = 0;
-  bool known_ = false;
-};
-
-// A UTF-8 character of four bytes lies beyond 16-bit Unicode: the library takes it as four bytes without a
-// value, the report as the one character that its writer meant.
-constexpr size_t kLongUtf8Bytes = 4;
-
-bool is_long_utf8_lead(char c) {
-  const auto byte = static_cast<unsigned char>(c);
-  return byte >= 0xF0 && byte <= 0xF4;
-}
-
-bool is_utf8_trail(char c) {
-  return (static_cast<unsigned char>(c) & 0xC0) == 0x80;
-}
-
-/// The code point of the four-byte UTF-8 character at `text`, or 0.
-uint32_t long_utf8_code_point(const char* text, const char* end) {
-  if (static_cast<size_t>(end - text) < kLongUtf8Bytes || !is_long_utf8_lead(*text)) return 0;
-  uint32_t code_point = static_cast<unsigned char>(*text) & 0x07u;
-  for (size_t i = 1; i < kLongUtf8Bytes; ++i) {
-    if (!is_utf8_trail(text[i])) return 0;
-    code_point = code_point << 6 | (static_cast<unsigned char>(text[i]) & 0x3Fu);
-  }
-  return code_point >= 0x10000 && code_point <= 0x10FFFF ? code_point : 0;
-}
 
 /// The bytes at the end of the text that may be the first ones of a four-byte UTF-8 character.
 size_t long_utf8_beginning(const std::string& text) {

@@ -3,16 +3,11 @@
 #include <lx.h>
 
 #include <CLI/CLI.hpp>
-#include <csignal>
-#include <iostream>
-#include <new>
-#include <sstream>
-#include <string>
 #include <utility>
 #include <vector>
 
 #include "command.h"
-#include "output.h"
+#include "program.h"
 
 namespace {
 
@@ -45,17 +40,6 @@ constexpr char kFooter[] =
     "  lexicor info German_Austria\n"
     "  lexicor convert --help";
 
-/// A wrong command line, a question for help or the version: prints it and returns the exit code.
-int answer_parse(const CLI::App& app, const CLI::ParseError& error) {
-  std::ostringstream out, err;
-  const int code = app.exit(error, out, err);
-  std::string text = out.str();
-  if (!text.empty() && text.back() != '\n') text += '\n';
-  Output().write(text);
-  std::cerr << err.str();
-  return code == 0 ? kDone : kUsageError;
-}
-
 int run(int argc, char** argv) {
   CLI::App app("Lexicor: national-language support. Codepage conversion and locale data.", "lexicor");
   CommonOptions common;
@@ -85,17 +69,5 @@ int run(int argc, char** argv) {
 }  // namespace
 
 int main(int argc, char** argv) {
-  std::signal(SIGPIPE, SIG_IGN);
-  try {
-    return run(argc, argv);
-  } catch (const Failure& failure) {
-    std::cerr << "lexicor: " << failure.what() << '\n';
-    return failure.code();
-  } catch (const BrokenPipe&) {
-    // Ends as a program does that a closed pipe kills, also where the signal was ignored from the start.
-    return 128 + SIGPIPE;
-  } catch (const std::bad_alloc&) {
-    std::cerr << "lexicor: out of memory\n";
-    return kDataError;
-  }
+  return lexicor_cli::run_program("lexicor", run, argc, argv);
 }

@@ -1,0 +1,45 @@
+// The errors and warnings of sources, with their places: a source is read to its end, so that all of them come
+// out at once.
+#pragma once
+
+#include <cstddef>
+#include <string>
+#include <vector>
+
+namespace lexicor_gencat {
+
+/// Lines and columns count from 1; columns count characters.
+struct Place {
+  std::string file;
+  int line = 0;
+  int column = 0;
+};
+
+std::string place_text(const Place& place);
+
+class Problems {
+ public:
+  /// More of a file than this are counted, not listed.
+  static constexpr size_t kListed = 20;
+
+  void error(const Place& place, const std::string& text);
+  void warning(const Place& place, const std::string& text);
+
+  size_t errors() const { return errors_; }
+  /// The listed messages, a line each, in the order in which they were found.
+  std::vector<std::string> lines() const;
+
+ private:
+  struct File {
+    std::string name;
+    std::vector<std::string> listed;
+    size_t unlisted = 0;
+  };
+
+  void add(const Place& place, const std::string& text);
+
+  std::vector<File> files_;
+  size_t errors_ = 0;
+};
+
+}  // namespace lexicor_gencat
