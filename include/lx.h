@@ -30,6 +30,7 @@
 #define LX_VERSION "1.0.0"
 
 #include "lx/base.h"
+#include "lx/catalog.h"
 #include "lx/codepage.h"
 #include "lx/collate.h"
 #include "lx/compare.h"

@@ -382,6 +382,28 @@ stops 1 1 'reading stopped: not a number like -1234.56' 1,5 format money 1,5
 stops 1 1 'a character that is not UTF-8, or beyond U+FFFF' a😀x parse number a😀x
 expect 'a format of a number' 2 'lexicor: --format is for times' "$lexicor" format number 1 --format %x
 
+# --- Messages: a catalog of one, in Latin1, written by hand for a little-endian machine.
+words() { for word; do printf "$(printf '\\x%02x' $((word & 255)) $((word >> 8 & 255)) $((word >> 16 & 255)) $((word >> 24)))"; done; }
+mkdir -p cats/DE_DEU
+{ words 0x476cf463 0x10000000 2 1 152 && printf '%s' German.Latin1 && head -c 119 /dev/zero
+  words 1 0 1 180 192 6 0 3 6 0 && printf 'Gr\xfc\xdfe\0'; } >cats/DE_DEU/app.cat
+answers Grüße message cats/DE_DEU/app.cat 1 3
+answers Grüße message app 1 3 --load --locale German_Germany --directory 'none;cats/%L/%N.cat'
+answers ersatz message cats/DE_DEU/app.cat 1 4 --default ersatz
+"$lexicor" message cats/DE_DEU/app.cat 1 3 --codepage IBM273 >out
+same 'a message for a host' out <(printf '\xc7\x99\xd0\xa1\x85\x25')
+"$lexicor" message cats/DE_DEU/app.cat 1 4 --codepage IBM930 --default あ >out
+same 'a default text for a host' out <(printf '\x0e\x44\x81\x0f\x25')
+expect 'no message' 1 "lexicor: the catalog 'cats/DE_DEU/app.cat' has no message 4 in set 1" \
+  "$lexicor" message cats/DE_DEU/app.cat 1 4
+says 'a directory as catalog' 1 '^cats is a directory: a template names a file, as cats/%N does' \
+  "$lexicor" message app 1 3 --directory cats --default ersatz
+expect 'no catalog' 1 "lexicor: no catalog 'app' found; searched:
+  LX_NLSPATH is not used: it has 28 bytes, and 27 are the most
+  name: app
+  with %N = app, %l = DE, %t = AUT" \
+  env LX_NLSPATH='cats/%L/%N.cat;cats/%l/%N.ca' "$lexicor" message app 1 3 --locale German_Austria --one-locale
+
 # --- Lists.
 "$lexicor" list >out || fault 'list'
 [ "$(grep -c '^[a-z]' out)" = 4 ] || fault 'the tables of the whole list'

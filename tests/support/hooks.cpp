@@ -9,6 +9,7 @@ void Hooks::fail_at(size_t call, bool from_then_on) {
   from_then_on_ = from_then_on;
   calls_ = 0;
   failed_ = false;
+  largest_ = 0;
 }
 
 size_t Hooks::live_bytes() const {
@@ -21,6 +22,7 @@ void* Hooks::allocate(void* context, size_t bytes) {
   Hooks& self = *static_cast<Hooks*>(context);
   const std::lock_guard<std::mutex> lock(self.mutex_);
   ++self.calls_;
+  if (bytes > self.largest_) self.largest_ = bytes;
   if (self.fail_at_ != 0 &&
       (self.calls_ == self.fail_at_ || (self.from_then_on_ && self.calls_ > self.fail_at_))) {
     self.failed_ = true;

@@ -22,6 +22,7 @@ class Hooks {
   size_t live_bytes() const;
   size_t wrong_frees() const { return wrong_frees_; }  // of blocks that were not out
   bool failed() const { return failed_; }              // whether an allocation was refused
+  size_t largest() const { return largest_; }          // most bytes asked for at once since fail_at()
 
   static void* allocate(void* context, size_t bytes);
   static int32_t release(void* context, void* block);
@@ -32,6 +33,7 @@ class Hooks {
   size_t calls_ = 0;
   size_t fail_at_ = 0;
   size_t wrong_frees_ = 0;
+  size_t largest_ = 0;
   bool from_then_on_ = false;
   bool fail_frees_ = false;
   bool failed_ = false;

@@ -51,6 +51,7 @@ Run declare_info(CLI::App& command, const CommonOptions& common);
 Run declare_key(CLI::App& command, const CommonOptions& common);
 Run declare_list(CLI::App& command, const CommonOptions& common);
 Run declare_map(CLI::App& command, const CommonOptions& common);
+Run declare_message(CLI::App& command, const CommonOptions& common);
 Run declare_native(CLI::App& command, const CommonOptions& common);
 Run declare_parse(CLI::App& command, const CommonOptions& common);
 Run declare_sort(CLI::App& command, const CommonOptions& common);

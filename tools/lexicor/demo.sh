@@ -94,22 +94,22 @@ for locale in English_UnitedStates English_India German_Germany German_German-Sw
   values "$locale"
 done
 
-# messages LANGUAGE SOURCE CATALOG_LOCALE SET NUMBER CALLER_LOCALE...: compiles the catalog, and fetches a message of
-# it in each caller's codepage.
+# messages LANGUAGE SOURCE CATALOG_LOCALE SET NUMBER CODEPAGE...: compiles the catalog, and fetches a message of it in
+# the codepage of each caller.
 messages() {
   local language=$1 catalog=$work/$2.cat locale=$3 set=$4 number=$5 source=$samples/catalog/$2.msg caller text
   shift 5
   "$gencat" --new --locale "$locale" "$catalog" "$source" || exit 1
   for caller in "$@"; do
-    "$lexicor" message "$catalog" "$set" "$number" --locale "$caller" >"$work/message" &&
-      "$lexicor" convert --from "${caller#*.}" --to UTF-8 --strict -o "$work/shown" "$work/message" || exit 1
+    "$lexicor" message "$catalog" "$set" "$number" --locale "${locale%.*}" --codepage "$caller" >"$work/message" &&
+      "$lexicor" convert --from "$caller" --to UTF-8 --strict -o "$work/shown" "$work/message" || exit 1
     IFS= read -r text <"$work/shown" || true
-    printf '%-9s  %-8s  %-8s  %-24s  %s\n' "$language" "${locale#*.}" "${caller#*.}" "$(first_bytes "$work/message")" "$text"
+    printf '%-9s  %-8s  %-8s  %-24s  %s\n' "$language" "${locale#*.}" "$caller" "$(first_bytes "$work/message")" "$text"
   done
 }
 
 printf '\n%-9s  %-8s  %-8s   %-23s  %s\n' 'Messages' 'Catalog' 'Caller' 'First bytes' 'Text'
-messages English english English_UnitedStates.IBM037 1 2 English_UnitedStates.MS1252 English_UnitedStates.IBM500
-messages German german German_Germany.IBM273 1 2 German_Germany.MS1252 German_Germany.IBM850 German_Germany.IBM1141
-messages Japanese japanese Japanese_Japan.IBM930 1 2 Japanese_Japan.MS932 Japanese_Japan.JapanEUC Japanese_Japan.IBM939
-messages Russian russian Russian_Russia.MS1251 1 2 Russian_Russia.KOI8-R Russian_Russia.IBM866 Russian_Russia.IBM1025
+messages English english English_UnitedStates.IBM037 1 2 MS1252 IBM500
+messages German german German_Germany.IBM273 1 2 MS1252 IBM850 IBM1141
+messages Japanese japanese Japanese_Japan.IBM930 1 2 MS932 JapanEUC IBM939
+messages Russian russian Russian_Russia.MS1251 1 2 KOI8-R IBM866 IBM1025

@@ -23,6 +23,7 @@ constexpr Subcommand kSubcommands[] = {
     {"explain", "Show the weights of two texts, and which of them decides", declare_explain},
     {"format", "Write a number, an amount of money or a time as a locale does", declare_format},
     {"parse", "Read what a locale writes: a number, an amount of money or a time", declare_parse},
+    {"message", "Fetch a message of a message catalog", declare_message},
     {"info", "Show the items of a locale", declare_info},
     {"list", "List the objects of the locale directory, or the operating system's locales", declare_list},
     {"native", "Show what an operating-system name of a locale stands for", declare_native},
