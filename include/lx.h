@@ -43,6 +43,7 @@
 #include "lx/native.h"
 #include "lx/number.h"
 #include "lx/object.h"
+#include "lx/stream.h"
 #include "lx/string.h"
 #include "lx/time.h"
 

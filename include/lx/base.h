@@ -59,9 +59,9 @@ enum {
   LX_E_OUTPUT_FULL = 52,      /* conversion output full, more is pending */
   LX_E_INPUT_CUT = 53,        /* conversion input ended inside a character */
   LX_E_STREAM_DIRECTION = 60, /* the operation does not fit the stream's direction */
-  LX_E_STREAM_READ = 61,      /* the callback failed while half of a 16-bit unit was read */
+  LX_E_STREAM_READ = 61,      /* the callback failed inside a character or a 16-bit unit */
   LX_E_STREAM_FLUSH = 62,     /* flushing failed; the buffered bytes are dropped */
-  LX_E_STREAM_HALF = 63,      /* only one byte of a 16-bit unit could be read; it is kept */
+  LX_E_STREAM_HALF = 63,      /* only a part of a character could be read; it is kept */
   LX_E_STREAM_COUNT = 64,     /* the callback returned a count that cannot be */
   LX_E_STREAM_KEPT = 65,      /* the callback stopped taking bytes; the rest is kept in the buffer */
   LX_E_CATALOG_NULL = 70,     /* the catalog handle is null */

@@ -232,6 +232,35 @@ says 'translation from an unknown codepage' 2 "unknown codepage 'utf-17'" "$lexi
 "$lexicor" translate --from UTF-8 --to IBM939 large >there
 same '1 MB translated' there <("$lexicor" convert --from UTF-8 --to IBM939 large)
 
+# --- Line ends: every kind, kinds left alone, shift states, ends that meet the end of a piece.
+# rewrites NAME STDERR FROM EOL INPUT OUTPUT ARGUMENTS...: input and expected output as escapes of printf.
+rewrites() {
+  bytes "$5" in
+  bytes "$6" expected
+  expect "$1" 0 "$2" "$lexicor" lines --from "$3" --eol "$4" "${@:7}" in
+  same "$1" out expected
+}
+rewrites 'to line feeds' 'lexicor: 3 line ends (2 crlf, 1 lf), 2 rewritten' utf8 lf 'a\r\n\r\n\xc3\xa9\nb\r' \
+  'a\n\n\xc3\xa9\nb\r' --report
+rewrites 'to pairs' '' MS932 crlf '\x82\xa0\n\x85\x0a\r\n\n' '\x82\xa0\r\n\x85\x0a\r\n\r\n'
+rewrites 'host lines to new line' 'lexicor: 3 line ends (1 crlf, 1 lf, 1 nl), 2 rewritten' IBM939 nl \
+  '\x0e\x44\x81\x44\x15\x0f\x0d\x25\xc1\x15\x25' '\x0e\x44\x81\x44\x15\x0f\x15\xc1\x15\x15' --report
+rewrites 'an unclosed text' '' IBM939 lf '\x15\x0e\x44\x81' '\x25\x0e\x44\x81\x0f'
+rewrites 'only pairs' '' IBM037 lf '\x25\x0d\x25\x15' '\x25\x25\x15' --find crlf
+rewrites 'an empty text' 'lexicor: 0 line ends, 0 rewritten' utf8 lf '' '' --report
+for bytes in 4094 4095 4096 65534 65535 65536; do
+  { head -c "$bytes" /dev/zero | tr '\0' a && printf '\r\n\xe3\x81\x82\r\n'; } >in
+  "$lexicor" lines --from utf8 --eol lf -o out in
+  same "a pair behind $bytes bytes" out <(tr -d '\r' <in)
+done
+bytes 'a\r\n\xe3\x81' half
+expect 'lines cut' 1 'lexicor: the input ends inside the character that begins at byte 3' \
+  "$lexicor" lines --from utf8 --eol lf -o old half
+same 'the output of cut lines' old <(printf '\x81\x82\x83')
+says 'no such line end' 2 'cr not in' "$lexicor" lines --from utf8 --eol cr
+says 'a full device' 1 '/dev/full' "$lexicor" lines --from utf8 --eol lf -o /dev/full half
+says 'a missing text' 1 'lexicor: missing: ' "$lexicor" lines --from utf8 --eol lf missing
+
 # --- Sorting: line ends, the sort, keys beside comparison, and what a line may hold.
 # sorts NAME INPUT OUTPUT ARGUMENTS...: input and expected output as escapes of printf.
 sorts() {

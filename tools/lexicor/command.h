@@ -49,6 +49,7 @@ Run declare_explain(CLI::App& command, const CommonOptions& common);
 Run declare_format(CLI::App& command, const CommonOptions& common);
 Run declare_info(CLI::App& command, const CommonOptions& common);
 Run declare_key(CLI::App& command, const CommonOptions& common);
+Run declare_lines(CLI::App& command, const CommonOptions& common);
 Run declare_list(CLI::App& command, const CommonOptions& common);
 Run declare_map(CLI::App& command, const CommonOptions& common);
 Run declare_message(CLI::App& command, const CommonOptions& common);

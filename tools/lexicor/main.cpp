@@ -17,6 +17,7 @@ constexpr Subcommand kSubcommands[] = {
     {"convert", "Convert text from one codepage to another", declare_convert},
     {"translate", "Translate a field from one codepage to another, to a size", declare_translate},
     {"map", "Map text to another case or width, or to ASCII digits", declare_map},
+    {"lines", "Rewrite the line ends of a text", declare_lines},
     {"sort", "Sort the lines of a text by a locale's sort", declare_sort},
     {"compare", "Tell which of two texts comes first", declare_compare},
     {"key", "Show the sort key of a text", declare_key},
@@ -35,6 +36,7 @@ constexpr char kFooter[] =
     "  lexicor convert --from MS932 --to UTF-8 -o letter.utf8 letter.sjis\n"
     "  lexicor convert --from UTF-8 --to IBM930 --strict < letter.utf8 > letter.host\n"
     "  lexicor map upper --locale German letter.utf8\n"
+    "  lexicor lines --from UTF-8 --eol crlf letter.utf8\n"
     "  lexicor sort --locale Swedish names.txt\n"
     "  lexicor explain --locale French@FrenchCanadian côte coté\n"
     "  lexicor format money 1234567.5 --locale German\n"

@@ -96,9 +96,10 @@ CatalogPtr open_catalog(const MessageOptions& options, LXLocale* locale) {
 /// A text of the command line in the codepage of the caller.
 std::string recoded(const std::string& utf8_text, const Codepage& utf8, const Codepage& caller) {
   std::string text((utf8_text.size() + 1) * kMostCharBytes, '\0');
-  text.resize(static_cast<size_t>(
-      LXConvertString(caller.locale(), text.data(), static_cast<int32_t>(text.size()), utf8.locale(),
-                      utf8_text.data(), static_cast<int32_t>(utf8_text.size()), 0)));
+  const int32_t bytes = LXConvertStringEx(
+      caller.locale(), text.data(), LX_SHIFT_SINGLE, static_cast<int32_t>(text.size()), utf8.locale(),
+      utf8_text.data(), LX_SHIFT_SINGLE, static_cast<int32_t>(utf8_text.size()), LX_TERMINATE);
+  text.resize(static_cast<size_t>(bytes) - 1);
   return text;
 }
 

@@ -1,0 +1,196 @@
+// Reading strings and lines from a stream. Characters are read one by one; what ends a string and cannot be
+// stored goes back into the stream.
+#include <cstring>
+
+#include "codepage/lxtext.h"
+#include "core/lxcall.h"
+#include "stream/lxeol.h"
+#include "stream/lxstream.h"
+
+namespace {
+
+using lx::bytes_of;
+using lx::Call;
+using lx::Codepage;
+using lx::codepage_of;
+using lx::Form;
+using lx::LineEnds;
+using lx::StreamChar;
+
+RAS1_Unit unit = RAS1_UNIT("lxreadstring");
+
+constexpr uint32_t kFlags = LX_EOL_ALL | LX_DROP_RETURNS | LX_TERMINATE | LX_CHARACTERS;
+constexpr int32_t kAtEnd = -1;
+constexpr int32_t kFailed = -2;
+
+/// The characters of a stream, as packed codes or as 16-bit units.
+template <class Value>
+struct Source {
+  const Codepage& cp;
+  LXStream& stream;
+  StreamChar held{};  // the character read last
+  Value value = 0;
+
+  int32_t next() {
+    if constexpr (std::is_same_v<Value, LXUChar>) {
+      const int32_t code = lx::read_unit(stream, &held);
+      if (code == LX_OK) value = lx::unit_of(held);
+      return code;
+    } else {
+      const int32_t code = lx::read_char(cp, stream, &held);
+      if (code == LX_OK) value = lx::pack(held.bytes, held.length);
+      return code;
+    }
+  }
+  /// Whether it can be a line-end character.
+  bool one_unit() const { return std::is_same_v<Value, LXUChar> || held.length == 1; }
+  /// There is room: it was taken out of the buffer, or read when that was empty.
+  void put_back(const StreamChar& c) { lx::push_back(cp, stream, c); }
+};
+
+template <class Writer>
+class Line {
+ public:
+  using Value = std::conditional_t<std::is_same_v<Writer, lx::UnicodeWriter>, LXUChar, LXWChar>;
+
+  Line(const Codepage& cp, LXStream& stream, const Writer& out, size_t most_chars, uint32_t flags)
+      : in_{cp, stream},
+        out_(out),
+        most_chars_(most_chars),
+        ends_(cp, flags & LX_EOL_ALL),
+        drop_returns_((flags & LX_DROP_RETURNS) != 0) {}
+
+  /// Reads it. LX_OK when it is full or its line ended, else what ended the reading.
+  int32_t read() {
+    while (has_room()) {
+      const int32_t code = in_.next();
+      if (code != LX_OK) return code;
+      const uint32_t kind = in_.one_unit() ? ends_.kind_of(in_.value) : 0;
+      if (is_return() && (drop_returns_ || ends_.any(LX_EOL_CRLF))) {
+        if (!Writer(out_).put(in_.value)) return put_back(in_.held);
+        const Step step = read_behind_return(in_.held, kind);
+        if (step.ended) return step.code;
+        continue;
+      }
+      if (!put(in_.value)) return put_back(in_.held);
+      if (kind != 0) return LX_OK;
+    }
+    return LX_OK;
+  }
+
+  size_t chars() const { return chars_; }
+  /// Where the text ends, in the single-byte state.
+  typename Writer::Unit* close() {
+    if constexpr (std::is_same_v<Writer, lx::ClosedShiftWriter>) out_.close();
+    return out_.p;
+  }
+
+ private:
+  struct Step {
+    bool ended;
+    int32_t code;
+  };
+
+  bool has_room() const { return chars_ < most_chars_ && out_.p != out_.end; }
+  bool is_return() const { return in_.one_unit() && in_.value == ends_.carriage_return; }
+  bool put(Value value) {
+    if (!has_room() || !out_.put(value)) return false;
+    ++chars_;
+    return true;
+  }
+  bool pair_fits() const {
+    Writer ahead(out_);
+    return drop_returns_ ||
+           (most_chars_ - chars_ > 1 && ahead.put(ends_.carriage_return) && ahead.put(ends_.line_feed));
+  }
+  int32_t put_back(const StreamChar& c) {
+    in_.put_back(c);
+    return LX_OK;
+  }
+
+  /// A carriage return was read that fits, and that ends a line itself when it has a kind: what follows
+  /// decides. A pair that does not fit stays in the stream, so that it is found when the next string is read;
+  /// where it stands alone, the carriage return is stored, so that there is a next one.
+  Step read_behind_return(const StreamChar carriage_return, uint32_t kind) {
+    const int32_t code = in_.next();
+    if (code > LX_OK) {
+      in_.put_back(carriage_return);
+      return {true, code};
+    }
+    const bool pair = code == LX_OK && in_.one_unit() && in_.value == ends_.line_feed;
+    const bool whole = pair && pair_fits();
+    if (code == LX_OK && !whole) in_.put_back(in_.held);
+    if (pair && !whole && chars_ != 0) return {true, put_back(carriage_return)};
+    if (!whole || !drop_returns_) put(ends_.carriage_return);
+    if (!whole) return {code != LX_OK || kind != 0, code};
+    put(ends_.line_feed);
+    return {kind != 0 || ends_.any(LX_EOL_CRLF) || ends_.kind_of(ends_.line_feed) != 0, LX_OK};
+  }
+
+  Source<Value> in_;
+  Writer out_;
+  size_t most_chars_;
+  LineEnds<Value> ends_;
+  bool drop_returns_;
+  size_t chars_ = 0;
+};
+
+/// Calls `body` with the form's writer. Packed codes are stored as they are, so that all codepages have the
+/// same plain one.
+template <class Body>
+int32_t with_writer(const Codepage& cp, Form form, uint8_t* p, uint8_t* end, Body body) {
+  if (form == Form::kEx && cp.shift_sensitive)
+    return body(lx::ClosedShiftWriter({cp, p, end, LX_SHIFT_SINGLE}));
+  return body(lx::MultiByteWriter{cp, p, end});
+}
+template <class Body>
+int32_t with_writer(const Codepage& cp, Form, LXWChar* p, LXWChar* end, Body body) {
+  return body(lx::CodeWriter{cp, p, end});
+}
+template <class Body>
+int32_t with_writer(const Codepage&, Form, LXUChar* p, LXUChar* end, Body body) {
+  return body(lx::UnicodeWriter{p, end});
+}
+
+template <class Unit>
+int32_t read_string(LXStream* stream, LXLocale* given, Form form, Unit* output, int32_t size, uint32_t flags) {
+  Call call(unit, given);
+  if (!call) return call.fail(LX_E_NOT_INITIALIZED, kFailed);
+  if (stream->direction != lx::kReadStream) return call.fail(LX_E_STREAM_DIRECTION, kFailed);
+  if ((flags & ~kFlags) != 0) return call.fail(LX_E_INVALID, kFailed);
+  const Codepage& cp = codepage_of(call.codepage());
+  const bool by_chars = sizeof(Unit) == 1 && (flags & LX_CHARACTERS) != 0;
+  const size_t given_room = size > 0 ? static_cast<size_t>(size) : 0;
+  const size_t nulls = (flags & LX_TERMINATE) != 0 && given_room != 0 ? 1 : 0;
+  const size_t most = given_room - nulls;
+  Unit* const end =
+      by_chars ? lx::no_end<Unit>() : output + lx::least(most, lx::room(output, lx::no_end<Unit>()));
+  return with_writer(cp, form, output, end, [&](const auto& out) {
+    Line line(cp, *stream, out, most, flags);
+    const int32_t code = line.read();
+    if (line.chars() == 0 && code != LX_OK) return code > LX_OK ? call.fail(code, kFailed) : call.exit(kAtEnd);
+    Unit* const behind = line.close();
+    if (nulls != 0) *behind = 0;
+    const size_t count = by_chars ? line.chars() : lx::room(output, behind);
+    return call.fail(code > LX_OK ? code : LX_OK, static_cast<int32_t>(count + nulls));
+  });
+}
+
+}  // namespace
+
+extern "C" {
+
+int32_t LXReadString(LXStream* stream, LXLocale* locale, char* output, int32_t size, uint32_t flags) {
+  return read_string(stream, locale, Form::kPlain, bytes_of(output), size, flags);
+}
+int32_t LXReadStringEx(LXStream* stream, LXLocale* locale, char* output, int32_t size, uint32_t flags) {
+  return read_string(stream, locale, Form::kEx, bytes_of(output), size, flags);
+}
+int32_t LXReadStringW(LXStream* stream, LXLocale* locale, LXWChar* output, int32_t size, uint32_t flags) {
+  return read_string(stream, locale, Form::kPlain, output, size, flags);
+}
+int32_t LXReadStringU(LXStream* stream, LXLocale* locale, LXUChar* output, int32_t size, uint32_t flags) {
+  return read_string(stream, locale, Form::kPlain, output, size, flags);
+}
+
+}  // extern "C"
