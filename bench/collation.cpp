@@ -3,7 +3,6 @@
 #include <locale.h>
 #include <string.h>
 #include <unicode/ucol.h>
-#include <unicode/ustring.h>
 
 #include <algorithm>
 #include <cstdio>
@@ -36,10 +35,6 @@ struct Word {
   std::string utf8;
 };
 
-size_t utf8_bytes(char16_t c) {
-  return c < 0x80 ? 1 : c < 0x800 ? 2 : 3;
-}
-
 std::vector<Word> words_of(Language language) {
   const std::u16string text = make_text(language, Mixture::kNative, utf8_bytes, 12 * kWords);
   std::vector<Word> words;
@@ -49,15 +44,7 @@ std::vector<Word> words_of(Language language) {
       current += c;
       continue;
     }
-    if (current.size() > 1 && words.size() < kWords) {
-      Word word{current, std::string(3 * current.size(), '\0')};
-      int32_t bytes = 0;
-      UErrorCode error = U_ZERO_ERROR;
-      u_strToUTF8(word.utf8.data(), static_cast<int32_t>(word.utf8.size()), &bytes, current.data(),
-                  static_cast<int32_t>(current.size()), &error);
-      word.utf8.resize(static_cast<size_t>(bytes));
-      words.push_back(word);
-    }
+    if (current.size() > 1 && words.size() < kWords) words.push_back({current, to_utf8(current)});
     current.clear();
   }
   return words;

@@ -1,4 +1,4 @@
-// lexicor_bench: conversion, case mapping, comparison and collation beside ICU, iconv, glibc and memcpy.
+// lexicor_bench: conversion, case mapping, collation, numbers and times beside ICU, iconv, glibc and memcpy.
 //
 //   lexicor_bench [--locale=DIRECTORY] [--rows=PART_OF_NAME] [Google Benchmark's own options]
 //   lexicor_bench --ratios ...   prints the table of ratios
@@ -67,6 +67,7 @@ int run(const Options& options) {
   std::vector<bench::Row> rows = bench::make_rows(codepages, options.rows);
   bench::add_mapping_rows(&rows, options.rows);
   bench::add_collation_rows(&rows, options.rows);
+  bench::add_formatting_rows(&rows, options.rows);
   size_t room = 0;
   for (const bench::Row& row : rows) room = std::max({room, row.output_bytes + 64, row.input->bytes.size()});
   std::vector<char> output(room);

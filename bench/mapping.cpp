@@ -29,20 +29,6 @@ constexpr Text kTexts[] = {
     {"Japanese", Language::kJapanese, Mixture::kNative, "Japanese.UTF-8", "ja"},
 };
 
-size_t utf8_bytes(char16_t c) {
-  return c < 0x80 ? 1 : c < 0x800 ? 2 : 3;
-}
-
-std::string to_utf8(const std::u16string& text) {
-  std::string bytes(3 * text.size(), '\0');
-  int32_t count = 0;
-  UErrorCode error = U_ZERO_ERROR;
-  u_strToUTF8(bytes.data(), static_cast<int32_t>(bytes.size()), &count, text.data(),
-              static_cast<int32_t>(text.size()), &error);
-  bytes.resize(static_cast<size_t>(count));
-  return bytes;
-}
-
 /// The text in one piece, or cut into short strings.
 std::shared_ptr<const Pieces> pieces_of(const std::u16string& text, bool short_strings, bool utf8) {
   auto pieces = std::make_shared<Pieces>();

@@ -40,5 +40,6 @@ std::vector<Row> make_rows(const std::vector<std::unique_ptr<Codepage>>& codepag
 
 void add_mapping_rows(std::vector<Row>* rows, const std::string& filter);
 void add_collation_rows(std::vector<Row>* rows, const std::string& filter);
+void add_formatting_rows(std::vector<Row>* rows, const std::string& filter);
 
 }  // namespace bench

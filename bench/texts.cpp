@@ -2,6 +2,8 @@
 // the front preferred, as common characters are few and rare ones many.
 #include "texts.h"
 
+#include <unicode/ustring.h>
+
 #include <cstdint>
 
 namespace bench {
@@ -133,6 +135,20 @@ class Generator {
 
 std::u16string make_text(Language language, Mixture mixture, const CharBytes& char_bytes, size_t bytes) {
   return Generator(recipe_of(language), mixture, char_bytes).make(bytes);
+}
+
+size_t utf8_bytes(char16_t c) {
+  return c < 0x80 ? 1 : c < 0x800 ? 2 : 3;
+}
+
+std::string to_utf8(const std::u16string& text) {
+  std::string bytes(3 * text.size(), '\0');
+  int32_t count = 0;
+  UErrorCode error = U_ZERO_ERROR;
+  u_strToUTF8(bytes.data(), static_cast<int32_t>(bytes.size()), &count, text.data(),
+              static_cast<int32_t>(text.size()), &error);
+  bytes.resize(static_cast<size_t>(count));
+  return bytes;
 }
 
 }  // namespace bench

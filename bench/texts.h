@@ -22,4 +22,8 @@ using CharBytes = std::function<size_t(char16_t)>;
 /// A text of at least `bytes` bytes that ends with a full stop.
 std::u16string make_text(Language language, Mixture mixture, const CharBytes& char_bytes, size_t bytes);
 
+/// UTF-8 of 16-bit values: the bytes of one, and a text.
+size_t utf8_bytes(char16_t c);
+std::string to_utf8(const std::u16string& text);
+
 }  // namespace bench

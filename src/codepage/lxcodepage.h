@@ -39,6 +39,7 @@ struct Codepage {
   bool plain_utf8;      // ... and bytes have the lengths of UTF-8, up to 3
   bool one_byte_codes;  // every Unicode value becomes one byte
   bool two_level_rows;  // the root's children are leaves
+  bool plain_digits;    // no byte where ASCII or EBCDIC has a digit is white space
   // Bytes below this are the Unicode values of the same number, both ways, wherever they begin a character:
   // 0x100 for ISO 8859-1, 0x80 where ASCII is, else 0.
   uint16_t same_below;

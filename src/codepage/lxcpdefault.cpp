@@ -84,6 +84,7 @@ constexpr Codepage make_default_codepage() {
   cp.substitution = kQuestionMark;
   cp.single_byte = true;
   cp.one_byte_codes = true;
+  cp.plain_digits = true;
   cp.same_below = 0x80;
   return cp;
 }

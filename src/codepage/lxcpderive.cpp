@@ -145,6 +145,14 @@ bool has_two_level_rows(const Codepage& cp, size_t nodes) {
   return true;
 }
 
+bool has_plain_digits(const Codepage& cp) {
+  for (int i = 0; i < 10; ++i)
+    if (((cp.type(static_cast<uint8_t>(0x30 + i)) | cp.type(static_cast<uint8_t>(0xF0 + i))) & LX_C1_SPACE) !=
+        0)
+      return false;
+  return true;
+}
+
 /// The type trie of a multibyte codepage, searched for characters that have another case.
 class TypeTrie {
  public:
@@ -226,6 +234,7 @@ void* derive_codepage(uint16_t id, const Sections& sections) {
   cp->two_level_rows = has_two_level_rows(*cp, nodes.count());
   cp->same_below = same_below(*cp);
   cp->plain_utf8 = is_plain_utf8(*cp);
+  cp->plain_digits = has_plain_digits(*cp);
   fill_caseless(cp);
   return block;
 }

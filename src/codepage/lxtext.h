@@ -105,6 +105,10 @@ struct LeadByteReader {
   template <class Value>
   bool next(Value* value) {
     if (p == end) return false;
+    if (kUtf8 && *p < cp.same_below) {  // apart: the next character does not wait for the length of this one
+      *value = *p++;
+      return true;
+    }
     const size_t length = cp.length(*p);
     if (length > static_cast<size_t>(end - p)) return false;
     decode(length, value);
@@ -291,24 +295,41 @@ struct ClosedShiftWriter {
   using Unit = uint8_t;
   static constexpr bool kOneUnit = false;
   static constexpr bool kRuns = false;
-  ShiftWriter out;
-  uint8_t* const end;
-  uint8_t*& p = out.p;
+  const Codepage& cp;
+  uint8_t* p;
+  uint8_t* end;
+  LXShiftState state;
 
-  explicit ClosedShiftWriter(const ShiftWriter& writer) : out(writer), end(writer.end) {}
-  ClosedShiftWriter(const ClosedShiftWriter& other) : out(other.out), end(other.end) {}
-
-  bool put(LXUChar u) { return put(LXWChar{unicode_to_code(out.cp, u)}); }
+  bool put(LXUChar u) { return put(LXWChar{unicode_to_code(cp, u)}); }
   bool put(LXWChar code) {
-    const bool closing = code_bytes(without_zero_bytes(code)) > 1;
-    if (closing && p == end) return false;
-    out.end = end - closing;
-    return out.put(code);
+    uint8_t bytes[kMaxCharBytes];
+    const uint32_t stored = without_zero_bytes(code);
+    const size_t count = code_bytes(stored);
+    store_code(bytes, stored, count);
+    return copy(bytes, count, count == 1 ? LX_SHIFT_SINGLE : LX_SHIFT_DOUBLE);
+  }
+  /// Writes the bytes of a character of a state.
+  bool copy(const uint8_t* bytes, size_t count, LXShiftState needed) {
+    const size_t shift = state != needed ? 1 : 0;
+    if (shift + count + (needed == LX_SHIFT_DOUBLE ? 1 : 0) > room(p, end)) return false;
+    if (shift != 0) *p++ = needed == LX_SHIFT_DOUBLE ? cp.shift_out : cp.shift_in;
+    state = needed;
+    for (size_t i = 0; i < count; ++i) *p++ = bytes[i];
+    return true;
   }
   void close() {
-    if (out.state == LX_SHIFT_DOUBLE && p != end) *p++ = out.take_shift_byte();
+    if (state == LX_SHIFT_SINGLE || p == end) return;
+    *p++ = cp.shift_in;
+    state = LX_SHIFT_SINGLE;
   }
 };
+
+/// Ends a text in the state that it must end in.
+template <class Writer>
+void close_text(Writer&) {}
+inline void close_text(ClosedShiftWriter& out) {
+  out.close();
+}
 
 struct CodeWriter {
   using Unit = LXWChar;
@@ -432,7 +453,8 @@ template <class Reader, class Writer>
 template <class Text>
 inline void go_on_at(Text& text, const Text& place) {
   text.p = place.p;
-  if constexpr (std::is_same_v<Text, ShiftReader> || std::is_same_v<Text, ShiftWriter>)
+  if constexpr (std::is_same_v<Text, ShiftReader> || std::is_same_v<Text, ShiftWriter> ||
+                std::is_same_v<Text, ClosedShiftWriter>)
     text.state = place.state;
 }
 

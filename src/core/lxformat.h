@@ -60,6 +60,7 @@ inline constexpr size_t kUpperSpecials = 3;  // entry counts
 inline constexpr size_t kLowerSpecials = 4;
 inline constexpr size_t kFirstText = 5;  // 5 abbreviation, 6 name, 7 days, 14 short days, 21 months,
 inline constexpr size_t kLastText = 48;  // 34 short months, 47 morning, 48 afternoon
+inline constexpr size_t kFirstDay = 7;   // items 16 to 57 are the words from here to kLastText
 inline constexpr size_t kUpperSpecialTable = 49;
 inline constexpr size_t kLowerSpecialTable = 50;
 inline constexpr size_t kSpecialBytes = 8;  // first, second or 0, result 1, result 2 or 0

@@ -35,15 +35,6 @@ struct Output {
   size_t nulls() const { return (flags & LX_TERMINATE) != 0 ? 1 : 0; }
 };
 
-template <class Writer>
-typename Writer::Unit* close(Writer& out) {
-  return out.p;
-}
-uint8_t* close(lx::ClosedShiftWriter& out) {
-  out.close();
-  return out.p;
-}
-
 /// Writes single-unit characters: how many fit.
 template <class Writer>
 size_t put_units(Writer& out, const typename Writer::Unit* units, size_t count) {
@@ -86,7 +77,8 @@ template <NumberForm kForm, bool kDirect, class Write>
 Written write_text(const Codepage& cp, NumberUnit<kForm>* p, size_t room, LXShiftState state, Write write) {
   const auto run = [&](auto out) {
     const bool all = write(out);
-    return Written{static_cast<size_t>(close(out) - p), all};
+    lx::close_text(out);
+    return Written{static_cast<size_t>(out.p - p), all};
   };
   NumberUnit<kForm>* const end = p + room;
   if constexpr (kForm == NumberForm::kUnicode) {
@@ -94,7 +86,7 @@ Written write_text(const Codepage& cp, NumberUnit<kForm>* p, size_t room, LXShif
   } else if constexpr (kForm == NumberForm::kCodes) {
     return run(lx::CodeWriter{cp, p, end});
   } else {
-    if (kForm == NumberForm::kEx && cp.shift_sensitive) return run(lx::ClosedShiftWriter({cp, p, end, state}));
+    if (kForm == NumberForm::kEx && cp.shift_sensitive) return run(lx::ClosedShiftWriter{cp, p, end, state});
     if constexpr (kDirect)
       return run(lx::SingleByteWriter{cp, p, end});
     else

@@ -30,6 +30,34 @@ const FixedChars& fixed_chars(const LXLocale& locale) {
   return kForm == NumberForm::kUnicode || keeps_ascii(locale) ? kAsciiChars : kEbcdicChars;
 }
 
+inline constexpr int32_t kNoClass = -1;  // of a character in a number
+
+/// The base-36 values of the digits and letters of a family of codepages.
+struct DigitValues {
+  int8_t of[256];
+  uint8_t zero;  // the others stand behind it
+  constexpr explicit DigitValues(bool ascii) : of(), zero(ascii ? kAsciiChars.zero : kEbcdicChars.zero) {
+    for (int8_t& value : of) value = kNoClass;
+    const auto set = [this](unsigned first, unsigned value, unsigned count) {
+      for (unsigned i = 0; i < count; ++i) of[first + i] = static_cast<int8_t>(value + i);
+    };
+    set(zero, 0, 10);
+    if (ascii) {
+      set(0x41, 10, 26);
+      set(0x61, 10, 26);
+      return;
+    }
+    constexpr unsigned kLetters[] = {0x80, 0xC0};
+    for (unsigned letters : kLetters) {  // three runs of letters with gaps between them
+      set(letters + 0x01, 10, 9);
+      set(letters + 0x11, 19, 9);
+      set(letters + 0x22, 28, 8);
+    }
+  }
+};
+inline constexpr DigitValues kAsciiDigits(true);
+inline constexpr DigitValues kEbcdicDigits(false);
+
 /// Where the items stand in the locale record and, in the same order, in the territory.
 enum NumberSeparator : size_t { kDecimal = 0, kThousands = 1, kMonetaryDecimal = 3, kMonetaryThousands = 4 };
 enum NumberGrouping : size_t { kGrouping = 0, kMonetaryGrouping = 2 };

@@ -12,47 +12,23 @@ using lx::bytes_of;
 using lx::Call;
 using lx::Codepage;
 using lx::codepage_of;
+using lx::DigitValues;
 using lx::FixedChars;
 using lx::Form;
+using lx::kNoClass;
 using lx::NumberForm;
 using lx::NumberUnit;
 
 RAS1_Unit unit = RAS1_UNIT("lxnumberread");
 
-constexpr int32_t kNoClass = -1;
 constexpr int32_t kClassD = 13;
 constexpr int32_t kClassE = 14;
 constexpr int32_t kClassX = 33;
-constexpr int32_t kExponentMarker = 6;  // state of the double parser
+constexpr int32_t kIntegerDigits = 3, kFractionDigits = 5, kExponentMarker = 6;  // states of the double parser
 
 // Characters are packed codes, or in the U forms Unicode values.
 template <NumberForm kForm>
 using Char = std::conditional_t<kForm == NumberForm::kUnicode, LXUChar, LXWChar>;
-
-/// The base-36 values of the digits and letters of a family of codepages.
-struct DigitValues {
-  int8_t of[256];
-  constexpr explicit DigitValues(bool ascii) : of() {
-    for (int8_t& value : of) value = kNoClass;
-    const auto set = [this](unsigned first, unsigned value, unsigned count) {
-      for (unsigned i = 0; i < count; ++i) of[first + i] = static_cast<int8_t>(value + i);
-    };
-    set(ascii ? 0x30 : 0xF0, 0, 10);
-    if (ascii) {
-      set(0x41, 10, 26);
-      set(0x61, 10, 26);
-      return;
-    }
-    constexpr unsigned kLetters[] = {0x80, 0xC0};
-    for (unsigned letters : kLetters) {  // three runs of letters with gaps between them
-      set(letters + 0x01, 10, 9);
-      set(letters + 0x11, 19, 9);
-      set(letters + 0x22, 28, 8);
-    }
-  }
-};
-constexpr DigitValues kAsciiDigits(true);
-constexpr DigitValues kEbcdicDigits(false);
 
 /// A sign, as one of the texts that hold one, or as `first` alone.
 struct Sign {
@@ -118,9 +94,45 @@ struct Classifier {
   uint32_t decimal;
   Sign positive, negative;
 
+  /// Digits are nothing else: no white space, no separator, and no sign begins with one.
+  const bool plain_digits = (kForm == NumberForm::kUnicode || cp.plain_digits) && !national &&
+                            !is_digit(thousands) && !is_digit(decimal) && !is_digit(positive.first) &&
+                            !is_digit(negative.first);
+
+  /// Takes the digits that stand next, as long as `use(digit)` wants them. All other items are left to take(),
+  /// and digits too where they may be something else.
+  template <class Reader, class Use>
+  void take_digits(Reader* in, Use use) const {
+    if (!plain_digits) return;
+    const uint32_t zero = digits.zero;
+    Reader at(*in);  // a copy, in registers
+    Char<kForm> c{};
+    for (Reader ahead(at); ahead.next(&c); lx::go_on_at(at, ahead)) {
+      const uint32_t digit = c - zero;
+      if (digit > 9 || !use(digit)) break;
+    }
+    lx::go_on_at(*in, at);
+  }
+
   /// Takes one item of the text and gives its class; a character that is none is not taken.
   template <class Reader>
   int32_t take(Reader* in) const {
+    Reader ahead(*in);
+    Char<kForm> c{};
+    if (!ahead.next(&c)) return kNoClass;
+    if (plain_digits && is_digit(c)) {
+      lx::go_on_at(*in, ahead);
+      return static_cast<int32_t>(c - uint32_t{digits.zero});
+    }
+    Reader any(*in);  // a copy, so that `in` can stay in registers
+    const int32_t found = take_any(&any);
+    lx::go_on_at(*in, any);
+    return found;
+  }
+
+ private:
+  template <class Reader>
+  [[gnu::noinline]] int32_t take_any(Reader* in) const {
     Reader ahead(*in);
     Char<kForm> c{};
     if (!ahead.next(&c)) return kNoClass;
@@ -129,8 +141,8 @@ struct Classifier {
       while (ahead.next(&c) && is_space(c));
       return LX_CLASS_SPACE;
     }
-    if (c == positive.first && c != 0 && take_sign(in, positive)) return LX_CLASS_POSITIVE;
-    if (c == negative.first && c != 0 && take_sign(in, negative)) return LX_CLASS_NEGATIVE;
+    if (c == positive.first && c != 0 && take_sign(in, ahead, positive)) return LX_CLASS_POSITIVE;
+    if (c == negative.first && c != 0 && take_sign(in, ahead, negative)) return LX_CLASS_NEGATIVE;
     if (national) c = ascii_digit(c);
     int32_t found = c <= 0xFF ? digits.of[c] : kNoClass;
     if (c == thousands && c != 0)
@@ -141,7 +153,8 @@ struct Classifier {
     return found;
   }
 
- private:
+  bool is_digit(uint32_t c) const { return c - digits.zero <= 9; }
+
   bool is_space(Char<kForm> c) const {
     if constexpr (kForm == NumberForm::kUnicode) return (lx::unicode_type(c) & LX_C1_SPACE) != 0;
     if (c <= 0xFF) return (cp.type(static_cast<uint8_t>(c)) & LX_C1_SPACE) != 0;
@@ -159,19 +172,19 @@ struct Classifier {
     }
   }
 
+  /// `ahead` stands behind the sign's first character.
   template <class Reader>
-  bool take_sign(Reader* in, const Sign& sign) const {
-    Reader ahead(*in);
-    Char<kForm> c{};
-    if (sign.bytes == nullptr && sign.unicode == nullptr && sign.codes == nullptr) {
-      ahead.next(&c);
-    } else {
-      const bool whole = read_sign<kForm>(cp, sign, [&](auto text, auto wanted) {
+  bool take_sign(Reader* in, Reader& ahead, const Sign& sign) const {
+    if (sign.bytes != nullptr || sign.unicode != nullptr || sign.codes != nullptr) {
+      Reader whole(*in);
+      Char<kForm> c{};
+      const bool same = read_sign<kForm>(cp, sign, [&](auto text, auto wanted) {
         while (text.next(&wanted))
-          if (!ahead.next(&c) || c != sign_char<kForm>(cp, wanted)) return false;
+          if (!whole.next(&c) || c != sign_char<kForm>(cp, wanted)) return false;
         return true;
       });
-      if (!whole) return false;
+      if (!same) return false;
+      lx::go_on_at(ahead, whole);
     }
     lx::go_on_at(*in, ahead);
     return true;
@@ -186,12 +199,13 @@ Sign single_sign(uint8_t c) {
 
 template <NumberForm kForm>
 const DigitValues& digit_values(bool ascii) {
-  return kForm == NumberForm::kUnicode || ascii ? kAsciiDigits : kEbcdicDigits;
+  return kForm == NumberForm::kUnicode || ascii ? lx::kAsciiDigits : lx::kEbcdicDigits;
 }
 
 /// What a locale's numbers are made of.
 template <NumberForm kForm>
-Classifier<kForm> classifier_of(const LXLocale& locale, uint32_t flags, bool with_decimal) {
+[[gnu::always_inline]] inline Classifier<kForm> classifier_of(const LXLocale& locale, uint32_t flags,
+                                                              bool with_decimal) {
   const bool current = (flags & LX_TERRITORY_VALUES) == 0;
   const bool monetary = (flags & LX_MONETARY) != 0;
   const FixedChars& chars = lx::fixed_chars<kForm>(locale);
@@ -283,6 +297,11 @@ int32_t read_long(Reader& in, const Classes& classes, uint32_t base, bool is_uns
   Magnitude magnitude(base, is_unsigned);
   if (!prefix) magnitude.add(static_cast<uint32_t>(c));
   for (;;) {
+    classes.take_digits(&in, [&](uint32_t digit) {
+      if (digit >= base) return false;
+      magnitude.add(digit);
+      return true;
+    });
     c = take();
     if (is_digit(c))
       magnitude.add(static_cast<uint32_t>(c));
@@ -293,16 +312,17 @@ int32_t read_long(Reader& in, const Classes& classes, uint32_t base, bool is_uns
   return magnitude.result(negative);
 }
 
+constexpr double kPowers[] = {1e0,  1e1,  1e2,  1e3,  1e4,  1e5,  1e6,  1e7,  1e8,  1e9,  1e10, 1e11,
+                              1e12, 1e13, 1e14, 1e15, 1e16, 1e17, 1e18, 1e19, 1e20, 1e21, 1e22};
+constexpr double kInversePowers[] = {1e-0,  1e-1,  1e-2,  1e-3,  1e-4,  1e-5,  1e-6,  1e-7,
+                                     1e-8,  1e-9,  1e-10, 1e-11, 1e-12, 1e-13, 1e-14, 1e-15,
+                                     1e-16, 1e-17, 1e-18, 1e-19, 1e-20, 1e-21, 1e-22};
+
 /// 10 to the power of `exponent`. Up to the 22nd they are as pow gives them everywhere. Beyond that the long
 /// form of pow does, because pow itself differs in its last bit from one word size to the other.
-double power_of_ten(int32_t exponent) {
-  constexpr double kPowers[] = {1e0,  1e1,  1e2,  1e3,  1e4,  1e5,  1e6,  1e7,  1e8,  1e9,  1e10, 1e11,
-                                1e12, 1e13, 1e14, 1e15, 1e16, 1e17, 1e18, 1e19, 1e20, 1e21, 1e22};
-  constexpr double kInverse[] = {1e-0,  1e-1,  1e-2,  1e-3,  1e-4,  1e-5,  1e-6,  1e-7,
-                                 1e-8,  1e-9,  1e-10, 1e-11, 1e-12, 1e-13, 1e-14, 1e-15,
-                                 1e-16, 1e-17, 1e-18, 1e-19, 1e-20, 1e-21, 1e-22};
+inline double power_of_ten(int32_t exponent) {
   if (exponent >= 0 && exponent <= 22) return kPowers[exponent];
-  if (exponent < 0 && exponent >= -22) return kInverse[-exponent];
+  if (exponent < 0 && exponent >= -22) return kInversePowers[-exponent];
   return static_cast<double>(powl(10.0L, static_cast<long double>(exponent)));
 }
 
@@ -317,24 +337,24 @@ struct DoubleParts {
   double result() const { return mantissa_sign * value * power_of_ten(exponent_sign * exponent); }
 };
 
-int32_t after_digit(int32_t state, int32_t digit, DoubleParts* parts) {
+[[gnu::always_inline]] inline int32_t after_digit(int32_t state, int32_t digit, DoubleParts* parts) {
   switch (state) {
     case 0:
       parts->value = digit;
-      return 3;
+      return kIntegerDigits;
     case 1:
-    case 3:
+    case kIntegerDigits:
     case 4:
       parts->value = parts->value * 10 + digit;
-      return 3;
+      return kIntegerDigits;
     case 2:
       parts->fraction_exponent = -1;
       parts->value = digit / 10.0;
-      return 5;
-    case 5:
+      return kFractionDigits;
+    case kFractionDigits:
       if (parts->fraction_exponent > -INT32_MAX) --parts->fraction_exponent;
       parts->value += digit * power_of_ten(parts->fraction_exponent);
-      return 5;
+      return kFractionDigits;
     case kExponentMarker:
     case 7:
       parts->exponent = digit;
@@ -365,13 +385,13 @@ int32_t next_state(int32_t state, int32_t c, DoubleParts* parts) {
     case LX_CLASS_SPACE:
       return state == 0 ? 0 : -1;
     case LX_CLASS_THOUSANDS:
-      return state == 3 ? 4 : -1;
+      return state == kIntegerDigits ? 4 : -1;
     case LX_CLASS_DECIMAL:
-      if (state == 3) parts->fraction_exponent = 0;
-      return state == 0 || state == 1 ? 2 : state == 3 ? 5 : -1;
+      if (state == kIntegerDigits) parts->fraction_exponent = 0;
+      return state == 0 || state == 1 ? 2 : state == kIntegerDigits ? kFractionDigits : -1;
     case kClassD:
     case kClassE:
-      return state == 5 ? kExponentMarker : -1;
+      return state == kFractionDigits ? kExponentMarker : -1;
     default:
       return -1;
   }
@@ -379,11 +399,18 @@ int32_t next_state(int32_t state, int32_t c, DoubleParts* parts) {
 
 /// Reads a double; the reader is left at what ended it. The signs of an exponent are plain ones.
 template <class Reader, class Classes>
-double read_double(Reader& in, Classes classes, const FixedChars& chars) {
+double read_double(Reader& in, Classes& classes, const FixedChars& chars) {
   DoubleParts parts;
   Reader item(in);
   int32_t state = 0;
   for (;;) {
+    if (state == kIntegerDigits || state == kFractionDigits) {  // which digits do not leave
+      DoubleParts moved = parts;                                // a copy, in registers
+      classes.take_digits(&in, [&](uint32_t digit) {
+        return after_digit(state, static_cast<int32_t>(digit), &moved) == state;
+      });
+      parts = moved;
+    }
     lx::go_on_at(item, in);
     state = next_state(state, classes.take(&in), &parts);
     if (state < 0) break;
@@ -432,7 +459,7 @@ double text_to_double(LXLocale* given, const Input<kForm>& from, const Text** en
   put_place(end, from.text);
   constexpr uint32_t kAllowed = LX_TERRITORY_VALUES | LX_NATIONAL_DIGITS | LX_MONETARY | LX_CHARACTERS;
   if ((from.flags & ~kAllowed) != 0) return exit(LX_E_INVALID);
-  const auto classes = classifier_of<kForm>(*call.locale(), from.flags, true);
+  auto classes = classifier_of<kForm>(*call.locale(), from.flags, true);
   read(codepage_of(call.codepage()), from, [&](auto in) {
     value = read_double(in, classes, lx::fixed_chars<kForm>(*call.locale()));
     put_place(end, in.p);

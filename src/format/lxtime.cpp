@@ -47,7 +47,7 @@ class TimeFormatter {
   /// Writes as much as there is before a failure: the code.
   int32_t expand(Reader format, Writer* out, int depth = 0) const {
     const int32_t code = walk(format, out, depth);
-    lx::close_text(out);
+    lx::close_text(*out);
     return code;
   }
 
@@ -77,11 +77,11 @@ class TimeFormatter {
         } else {
           Writer moved = to;
           code = write_nested(directive, flag, start, &moved, depth);
-          lx::go_to(&to, moved);
+          lx::go_on_at(to, moved);
         }
       }
     }
-    lx::go_to(out, to);
+    lx::go_on_at(*out, to);
     return code;
   }
 
@@ -132,7 +132,7 @@ class TimeFormatter {
     const Unit* const begin = nested.p;
     const int32_t code = expand(format.reader(locale_), &nested, depth + 1);
     nested.p = out->p + (nested.p - begin);
-    lx::go_to(out, nested);
+    lx::go_on_at(*out, nested);
     return code;
   }
 
@@ -145,7 +145,7 @@ class TimeFormatter {
     } else {
       code = write_item_cut(item, &word);
     }
-    lx::go_to(out, word);
+    lx::go_on_at(*out, word);
     return code;
   }
   int32_t write_item_cut(int32_t item, Writer* out) const {

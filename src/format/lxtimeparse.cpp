@@ -40,7 +40,9 @@ Match match_char(const typename Text::Reader& format, const typename Text::Unit*
     if constexpr (Text::kShift) {
       if (at.state != format.state) return Match::kDifferent;
     }
-    if (memcmp(at.p, format.p - count, count) != 0) return Match::kDifferent;
+    // A single byte apart: not worth a call.
+    if (count == 1 ? *at.p != format.p[-1] : memcmp(at.p, format.p - count, count) != 0)
+      return Match::kDifferent;
     at.p += count;
     lx::go_on_at(*text, at);
     return Match::kSame;
@@ -61,21 +63,31 @@ class TimeParser {
   int32_t match(Reader format, Reader* text, int depth = 0) {
     bool afternoon = false;
     Value value{};
-    while (has_more(format) && has_more(*text)) {
+    Reader at = *text;  // a copy, as is what other functions move: this one stays in registers
+    const TimeSymbols& symbols = symbols_;
+    int32_t code = LX_OK;
+    while (code == LX_OK && has_more(format) && has_more(at)) {
       const Unit* const before = format.p;
       if (!format.next(&value)) break;
-      if (!lx::is_percent(format, value, symbols_)) {
-        const Match found = match_char<Text>(format, before, value, text);
-        if (found == Match::kDifferent) return LX_E_NOT_FOUND;
+      if (!lx::is_percent(format, value, symbols)) {
+        const Match found = match_char<Text>(format, before, value, &at);
+        if (found == Match::kDifferent) code = LX_E_NOT_FOUND;
         if (found == Match::kCut) break;
         continue;
       }
       bool flag = false;
-      const TimeDirective& directive = lx::take_directive(&format, symbols_, &flag, &value);
-      const int32_t code = directive.field.member != nullptr ? read_field(directive, text, &afternoon)
-                                                             : read_nested(directive, flag, value, text, depth);
-      if (code != LX_OK) return code;
+      const TimeDirective& directive = lx::take_directive(&format, symbols, &flag, &value);
+      if (directive.digits != 0) {
+        code = read_number(directive, symbols.zero, &at);
+      } else {
+        Reader moved = at;
+        code = directive.field.member != nullptr ? read_name(directive, &moved, &afternoon)
+                                                 : read_nested(directive, flag, value, &moved, depth);
+        lx::go_on_at(at, moved);
+      }
     }
+    lx::go_on_at(*text, at);
+    if (code != LX_OK) return code;
     if (afternoon && time_.hours <= 11) time_.hours += 12;
     if constexpr (Text::kShift) {
       if (text->state == LX_SHIFT_DOUBLE && text->p != text->end && *text->p == text->cp.shift_in)
@@ -85,30 +97,37 @@ class TimeParser {
   }
 
  private:
-  int32_t read_field(const TimeDirective& directive, Reader* text, bool* afternoon) {
-    int32_t LXTime::*const member = directive.field.member;
-    switch (directive.action) {
-      case TimeAction::kWord:
-        return read_word(directive, text, &(time_.*member)) ? LX_OK : LX_E_NOT_FOUND;
-      case TimeAction::kMarker: {
-        int32_t marker = 0;
-        if (!read_word(directive, text, &marker)) return LX_E_NOT_FOUND;
-        *afternoon = marker != 0;
-        return LX_OK;
-      }
-      case TimeAction::kWeek:
-        return LX_E_FORMAT;
-      default: {
-        int32_t number = 0;
-        if (!read_number(directive.digits, text, &number)) return LX_E_NOT_FOUND;
-        const bool noon = directive.action == TimeAction::kHour12 && number == 12;
-        time_.*member = noon ? 0 : number - directive.read_added;
-        return number > directive.read_most ? LX_E_NOT_FOUND : LX_OK;
-      }
-    }
+  [[gnu::noinline]] int32_t read_name(const TimeDirective& directive, Reader* text, bool* afternoon) {
+    int32_t index = 0;
+    if (!read_word(directive, text, &index)) return LX_E_NOT_FOUND;
+    if (directive.action == TimeAction::kMarker)
+      *afternoon = index != 0;
+    else
+      time_.*directive.field.member = index;
+    return LX_OK;
   }
 
-  int32_t read_nested(const TimeDirective& directive, bool flag, Value percent, Reader* text, int depth) {
+  /// A number is stored also when it is too large.
+  int32_t read_number(const TimeDirective& directive, uint32_t zero, Reader* text) {
+    if (directive.action == TimeAction::kWeek) return LX_E_FORMAT;
+    int32_t number = 0;
+    int digits = 0;
+    Reader at = *text;
+    Value value{};
+    for (; digits < directive.digits && at.next(&value) && lx::read_single(at); ++digits) {
+      const uint32_t digit = uint32_t{value} - zero;
+      if (digit > 9) break;
+      number = number * 10 + static_cast<int32_t>(digit);
+      lx::go_on_at(*text, at);
+    }
+    if (digits == 0) return LX_E_NOT_FOUND;
+    const bool noon = directive.action == TimeAction::kHour12 && number == 12;
+    time_.*directive.field.member = noon ? 0 : number - directive.read_added;
+    return number > directive.read_most ? LX_E_NOT_FOUND : LX_OK;
+  }
+
+  [[gnu::noinline]] int32_t read_nested(const TimeDirective& directive, bool flag, Value percent, Reader* text,
+                                        int depth) {
     const int32_t date = flag ? LX_ITEM_LONG_DATE_FORMAT : LX_ITEM_SHORT_DATE_FORMAT;
     Value value{};
     switch (directive.action) {
@@ -164,21 +183,6 @@ class TimeParser {
         if (match_char<Text>(in, in.p, value, at) != Match::kSame) return false;
     }
     return true;
-  }
-
-  /// False where no digit stands.
-  bool read_number(int most_digits, Reader* text, int32_t* number) const {
-    int digits = 0;
-    for (; digits < most_digits; ++digits) {
-      Reader at = *text;
-      Value value{};
-      if (!at.next(&value) || !lx::read_single(at)) break;
-      const uint32_t digit = uint32_t{value} - symbols_.zero;
-      if (digit > 9) break;
-      *number = *number * 10 + static_cast<int32_t>(digit);
-      lx::go_on_at(*text, at);
-    }
-    return digits > 0;
   }
 
   const LXLocale& locale_;

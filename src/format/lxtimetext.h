@@ -11,37 +11,6 @@
 
 namespace lx {
 
-/// A writer that keeps room for the Shift-In that ends a text in the single-byte state.
-struct ClosedShiftOutput {
-  using Unit = uint8_t;
-  const Codepage& cp;
-  uint8_t* p;
-  uint8_t* end;
-  LXShiftState state;
-
-  bool put(LXUChar u) { return put(LXWChar{unicode_to_code(cp, u)}); }
-  bool put(LXWChar code) {
-    uint8_t bytes[kMaxCharBytes];
-    const uint32_t stored = without_zero_bytes(code);
-    const size_t count = code_bytes(stored);
-    store_code(bytes, stored, count);
-    return copy(bytes, count, count == 1 ? LX_SHIFT_SINGLE : LX_SHIFT_DOUBLE);
-  }
-  bool copy(const uint8_t* bytes, size_t count, LXShiftState needed) {
-    const size_t shift = state != needed ? 1 : 0;
-    if (shift + count + (needed == LX_SHIFT_DOUBLE ? 1 : 0) > room(p, end)) return false;
-    if (shift != 0) *p++ = needed == LX_SHIFT_DOUBLE ? cp.shift_out : cp.shift_in;
-    state = needed;
-    for (size_t i = 0; i < count; ++i) *p++ = bytes[i];
-    return true;
-  }
-  void close() {
-    if (state == LX_SHIFT_SINGLE || p == end) return;
-    *p++ = cp.shift_in;
-    state = LX_SHIFT_SINGLE;
-  }
-};
-
 /// A kind of text: its reader, and the writer to it.
 template <class ReaderOf, class WriterOf>
 struct TimeText {
@@ -76,7 +45,7 @@ using CodeTime = TimeText<CodeReader, CodeWriter>;
 /// Calls `body` with the kind of a byte text.
 template <class Body>
 auto with_time_bytes(const Codepage& cp, Form form, Body&& body) {
-  if (form == Form::kEx && cp.shift_sensitive) return body(TimeText<ShiftReader, ClosedShiftOutput>{});
+  if (form == Form::kEx && cp.shift_sensitive) return body(TimeText<ShiftReader, ClosedShiftWriter>{});
   if (cp.utf8) return body(TimeText<Utf8Reader, Utf8Writer>{});
   if (cp.single_byte && cp.one_byte_codes) return body(TimeText<SingleByteReader, SingleByteWriter>{});
   return body(TimeText<MultiByteReader, MultiByteWriter>{});
@@ -90,25 +59,12 @@ const TimeSymbols& time_symbols(const LXLocale& locale) {
   return katakana && locale.codepage->disk.id == kKatakanaCodepage ? kKatakanaTime : kEbcdicTime;
 }
 
-template <class Writer>
-void close_text(Writer*) {}
-inline void close_text(ClosedShiftOutput* out) {
-  out->close();
-}
-
-/// Takes over the place, and the shift state, from a copy that has gone on.
-template <class Writer>
-void go_to(Writer* out, const Writer& place) {
-  out->p = place.p;
-  if constexpr (std::is_same_v<Writer, ClosedShiftOutput>) out->state = place.state;
-}
-
 /// The units that can be written before the output is full.
 template <class Writer>
 size_t units_left(const Writer& out) {
   return room(out.p, out.end);
 }
-inline size_t units_left(const ClosedShiftOutput& out) {
+inline size_t units_left(const ClosedShiftWriter& out) {
   return room(out.p, out.end) - (out.state == LX_SHIFT_DOUBLE && out.p != out.end ? 1 : 0);
 }
 
@@ -174,17 +130,18 @@ template <class Writer>
 inline void write_time_unicode(const uint8_t* text, Writer* out) {
   Writer copy = *out;  // in registers
   LXUChar u = le16(text);
-  if constexpr (std::is_same_v<Writer, SingleByteWriter>) {
+  if constexpr (sizeof(typename Writer::Unit) == 1 && !std::is_same_v<Writer, ClosedShiftWriter>) {
     const unsigned below = copy.same_below();
-    for (; u != 0 && u < below && copy.put(LXWChar{u}); u = le16(text)) text += 2;
+    for (; u != 0 && u < below && copy.p != copy.end; u = le16(text += 2)) *copy.p++ = static_cast<uint8_t>(u);
   }
-  for (; u != 0 && copy.put(u); u = le16(text)) text += 2;
-  go_to(out, copy);
+  for (; u != 0 && copy.put(u); u = le16(text += 2)) {
+  }
+  go_on_at(*out, copy);
 }
 
 /// The text of a name, all of which are the language's.
 inline const uint8_t* time_name(const LXLocale& locale, int32_t item) {
-  return payload_text(*locale.language, item_of(item).index);
+  return payload_text(*locale.language, format::language::kFirstDay + static_cast<size_t>(item - LX_ITEM_DAY));
 }
 
 /// Writes an item of the locale, as far as it fits.
@@ -207,7 +164,7 @@ void write_time_item(const LXLocale& locale, int32_t item, bool current, Writer*
     else
       read_bytes(cp, Form::kEx, LX_SHIFT_SINGLE, text, bytes, fill);
   }
-  close_text(out);
+  close_text(*out);
 }
 
 template <class Text>

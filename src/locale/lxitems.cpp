@@ -45,7 +45,7 @@ constexpr ItemRange kRanges[] = {
     {11, 11, ItemKind::kObjectId, LX_SORT},
     {12, 12, ItemKind::kObjectName, LX_SORT},
     {13, 15, ItemKind::kDefaultName, language::kDefaultTerritory},
-    {16, 57, ItemKind::kLanguageText, language::kFirstText + 2},
+    {16, 57, ItemKind::kLanguageText, language::kFirstDay},
     {58, 58, ItemKind::kTerritoryFlag, 0},
     {59, 61, ItemKind::kSeparator, 0},
     {62, 62, ItemKind::kText, 0},
@@ -182,12 +182,6 @@ bool read_text(const LXLocale& locale, const ItemText& from, Form form, int32_t*
   return true;
 }
 
-template <class Writer>
-void close(Writer&) {}
-void close(lx::ClosedShiftWriter& out) {
-  out.close();
-}
-
 /// The frame of all four forms. `write(cp, end_units, body)` calls `body` with the form's writer.
 template <bool kDirect, class Unit, class Write>
 int32_t get_text(LXLocale* given, int32_t number, Unit* buffer, int32_t size, int32_t flags, Form form,
@@ -210,7 +204,7 @@ int32_t get_text(LXLocale* given, int32_t number, Unit* buffer, int32_t size, in
   const bool read = read_text<kDirect>(locale, from, form, &rc, [&](auto in, auto value) {
     write(codepage_of(*locale.codepage), end, [&](auto out) {
       const auto moved = lx::transfer<decltype(value)>(in, out, by_chars ? most : SIZE_MAX);
-      close(out);
+      lx::close_text(out);
       *out.p = 0;
       written = static_cast<int32_t>(by_chars ? moved.chars : static_cast<size_t>(out.p - buffer)) + 1;
     });
@@ -316,7 +310,7 @@ int32_t LXGetLocaleTextInfoEx(LXLocale* locale, int32_t item, char* buffer, LXSh
     return LXGetLocaleTextInfo(locale, item, buffer, size, flags);
   return get_text<true>(locale, item, bytes_of(buffer), size, flags, Form::kEx,
                         [&](const Codepage& cp, uint8_t* end, auto body) {
-                          body(lx::ClosedShiftWriter({cp, bytes_of(buffer), end, state}));
+                          body(lx::ClosedShiftWriter{cp, bytes_of(buffer), end, state});
                         });
 }
 

@@ -526,6 +526,9 @@ TEST_F(NumberTest, SignTextsNationalDigitsAndWhiteSpace) {
       EXPECT_EQ(read(locale, Units(kYen) + u"k12.5E-1", form, kReadDouble, LX_MONETARY).value, -1.25);
       EXPECT_EQ(read(locale, Units(kYen) + u"12", form, 10, LX_MONETARY).end, 0u);
     }
+    set_text(locale, LX_ITEM_POSITIVE_SIGN, u"1-");  // a digit that is not one in a run of digits
+    for (Form form : {kEx, kWide, kUnicode})
+      for (int32_t base : {10, kReadDouble}) EXPECT_EQ(read(locale, u"31-2", form, base, LX_MONETARY).end, 1u);
   }
   for (uint32_t flags : {0u, uint32_t{LX_NATIONAL_DIGITS}})
     for (const TinyCodepage& codepage : {tiny_money(), tiny_utf8()})

@@ -1,0 +1,496 @@
+// Numbers, amounts and times written and read, beside ICU and glibc: some hundred values of all sizes, one call
+// each. ICU works on UTF-16 in every row, and its formats stay open; glibc works in a locale of the language.
+#include <locale.h>
+#include <monetary.h>
+#include <time.h>
+#include <unicode/udat.h>
+#include <unicode/unum.h>
+#include <unicode/ustring.h>
+
+#include <algorithm>
+#include <cmath>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <random>
+
+#include "rows.h"
+
+namespace bench {
+namespace {
+
+constexpr size_t kValues = 500;
+constexpr int32_t kRoomUnits = 128;  // for one text
+
+enum class Encoding { kCodepage, kUtf8, kUtf16 };
+
+struct Text {
+  const char* label;
+  const char* locale;
+  Encoding encoding;  // kCodepage or kUtf16: the form that is called
+  const char* icu;    // null: no peer
+  const char* glibc;  // null: no peer
+  const char* glibc_fallback;
+  char decimal;
+  const char16_t* icu_date_time;  // what %c makes
+};
+constexpr Text kTexts[] = {
+    {"English/Latin1", "English_UnitedStates.Latin1", Encoding::kCodepage, "en_US", "en_US.UTF-8", "C", '.',
+     u"M/d/yy h:mm:ss a"},
+    {"German/UTF-8", "German_Germany.UTF-8", Encoding::kCodepage, "de_DE", "de_DE.UTF-8", nullptr, ',',
+     u"dd.MM.yy HH:mm:ss"},
+    {"German/UTF-16", "German_Germany.UTF-8", Encoding::kUtf16, "de_DE", nullptr, nullptr, ',',
+     u"dd.MM.yy HH:mm:ss"},
+    {"German/IBM1141", "German_Germany.IBM1141", Encoding::kCodepage, nullptr, nullptr, nullptr, ',', nullptr},
+};
+
+/// A format of times as each library writes it.
+struct Pattern {
+  const char* label;
+  const char* ours;
+  const char* glibc;
+  const char16_t* icu;  // null: the text's icu_date_time
+  bool to_the_second;
+};
+constexpr Pattern kWritten[] = {
+    {"time_short", "%H:%M:%S", "%H:%M:%S", u"HH:mm:ss", true},
+    {"time_numbers", "%Y-%m-%d %H:%M:%S", "%Y-%m-%d %H:%M:%S", u"yyyy-MM-dd HH:mm:ss", true},
+    {"time_names", "%A, %d. %B %Y", "%A, %d. %B %Y", u"EEEE, dd. MMMM yyyy", false},
+    {"time_c", "%c", "%x %X", nullptr, true},  // glibc's %c has more fields
+};
+constexpr Pattern kRead[] = {kWritten[1], kWritten[2]};
+
+struct Values {
+  std::vector<int32_t> integers;
+  std::vector<double> amounts;  // in quarters: two fraction digits are all there are
+  std::vector<double> positive_amounts;
+  std::vector<double> precise;  // with 17 digits
+  std::vector<LXTime> times;
+  std::vector<tm> system_times;
+  std::vector<UDate> dates;
+};
+
+Values make_values() {
+  std::mt19937 random(1);
+  Values values;
+  for (size_t i = 0; i < kValues; ++i) {
+    const int digits = static_cast<int>(random() % 9) + 1;
+    const auto integer = static_cast<int32_t>(random() % static_cast<uint32_t>(std::pow(10, digits)));
+    values.integers.push_back(random() % 4 == 0 ? -integer : integer);
+    values.amounts.push_back(values.integers.back() + static_cast<uint32_t>(random() % 4) * 0.25);
+    values.positive_amounts.push_back(std::fabs(values.amounts.back()));
+    values.precise.push_back(std::uniform_real_distribution<double>(0, 1000)(random));
+    const auto seconds = static_cast<time_t>(random() & INT32_MAX);
+    tm system{};
+    gmtime_r(&seconds, &system);
+    values.system_times.push_back(system);
+    values.times.push_back({system.tm_sec, system.tm_min, system.tm_hour, system.tm_mday, system.tm_mon,
+                            system.tm_year, system.tm_wday, system.tm_yday});
+    values.dates.push_back(static_cast<UDate>(seconds) * 1000);
+  }
+  return values;
+}
+
+std::string printed(const char* format, double value, char decimal) {
+  char text[64];
+  std::snprintf(text, sizeof(text), format, value);
+  std::replace(text, text + sizeof(text), '.', decimal);
+  return text;
+}
+
+std::u16string from_utf8(const std::string& bytes) {
+  std::u16string units(bytes.size(), u'\0');
+  int32_t count = 0;
+  UErrorCode error = U_ZERO_ERROR;
+  u_strFromUTF8(units.data(), static_cast<int32_t>(units.size()), &count, bytes.data(),
+                static_cast<int32_t>(bytes.size()), &error);
+  units.resize(static_cast<size_t>(count));
+  return units;
+}
+
+const LXUChar* lx_units(const std::u16string& text) {
+  return reinterpret_cast<const LXUChar*>(text.data());
+}
+LXUChar* lx_units(char* text) {
+  return reinterpret_cast<LXUChar*>(text);
+}
+int32_t length(size_t n) {
+  return static_cast<int32_t>(n);
+}
+size_t count_of(int32_t n) {
+  return static_cast<size_t>(n);
+}
+
+/// What is read, for each library.
+struct Inputs {
+  std::vector<std::string> codepage, utf8;
+  std::vector<std::u16string> utf16;
+
+  void add(LXLocale* locale, const std::string& text) {
+    utf8.push_back(text);
+    utf16.push_back(from_utf8(text));
+    std::string bytes(4 * text.size(), '\0');
+    bytes.resize(count_of(LXUnicodeToString(locale, bytes.data(), length(bytes.size()), lx_units(utf16.back()),
+                                            length(utf16.back().size()), 0)));
+    codepage.push_back(bytes);
+  }
+};
+
+/// The time that fields name, as one number.
+template <class Fields, class... Member>
+double key_of(const Fields& fields, Member... member) {
+  double key = 0;
+  ((key = key * 366 + fields.*member), ...);
+  return key;
+}
+double key_of(const LXTime& t) {
+  return key_of(t, &LXTime::year, &LXTime::month, &LXTime::day, &LXTime::hours, &LXTime::minutes,
+                &LXTime::seconds);
+}
+double key_of(const tm& t) {
+  return key_of(t, &tm::tm_year, &tm::tm_mon, &tm::tm_mday, &tm::tm_hour, &tm::tm_min, &tm::tm_sec);
+}
+
+class RowMaker {
+ public:
+  RowMaker(std::vector<Row>* rows, const std::string& filter) : rows_(rows), filter_(filter) {}
+
+  bool start(std::string name, LXLocale* locale) {
+    if (name.find(filter_) == std::string::npos) return false;
+    row_ = {std::move(name), nullptr, {}, kRoomUnits * sizeof(LXUChar)};
+    locale_ = locale;
+    texts_.clear();
+    return true;
+  }
+
+  /// A peer that writes value `i` with `call(i, output)`, which gives the bytes. `same`: its texts are those of
+  /// the first peer.
+  template <class Call>
+  void writer(const char* name, locale_t system, Encoding encoding, bool same, Call call) {
+    const locale_t before = uselocale(system);
+    std::vector<std::u16string> texts;
+    for (size_t i = 0; i < kValues; ++i) {
+      alignas(char16_t) char out[sizeof(char16_t) * kRoomUnits];
+      texts.push_back(decoded(std::string(out, call(i, out)), encoding));
+      if (same && !texts_.empty() && texts[i] != texts_[i]) stop(name, i);
+    }
+    uselocale(before);
+    if (texts_.empty()) set_input(texts);
+    add(name, system, call);
+  }
+
+  /// A peer that reads text `i` with `call(i)`, which gives a number for what it read: `expected`.
+  template <class Call>
+  void reader(const char* name, locale_t system, const std::vector<double>& expected, Call call) {
+    const locale_t before = uselocale(system);
+    for (size_t i = 0; i < kValues; ++i)
+      if (!(std::fabs(call(i) - expected[i]) <= std::fabs(expected[i]) * 1e-14)) stop(name, i);
+    uselocale(before);
+    add(name, system, [call](size_t i, char*) { return static_cast<size_t>(static_cast<int64_t>(call(i))); });
+  }
+
+  void set_input(const std::vector<std::u16string>& texts) {
+    auto pieces = std::make_shared<Pieces>();
+    for (const std::u16string& text : texts) {
+      pieces->chars += text.size();
+      pieces->ends.push_back(pieces->chars);
+    }
+    pieces->bytes.resize(pieces->chars);
+    row_.input = pieces;
+    texts_ = texts;
+  }
+
+  void finish() { rows_->push_back(std::move(row_)); }
+
+ private:
+  template <class Call>
+  void add(const char* name, locale_t system, Call call) {
+    row_.peers.push_back({name, [system, call](char* out) {
+                            const locale_t before = uselocale(system);
+                            size_t sum = 0;
+                            for (size_t i = 0; i < kValues; ++i) sum += call(i, out);
+                            uselocale(before);
+                            return sum;
+                          }});
+  }
+
+  /// ICU writes spaces that do not break.
+  std::u16string decoded(const std::string& bytes, Encoding encoding) const {
+    std::u16string text(bytes.size(), u'\0');
+    if (encoding == Encoding::kUtf8)
+      text = from_utf8(bytes);
+    else if (encoding == Encoding::kUtf16)
+      text.assign(reinterpret_cast<const char16_t*>(bytes.data()), bytes.size() / 2);
+    else
+      text.resize(
+          count_of(LXStringToUnicode(lx_units(reinterpret_cast<char*>(text.data())), length(text.size()),
+                                     locale_, bytes.data(), length(bytes.size()), 0)));
+    for (char16_t& c : text)
+      if (c == u'\u00A0' || c == u'\u202F') c = u' ';
+    return text;
+  }
+
+  [[noreturn]] void stop(const char* peer, size_t i) const {
+    std::fprintf(stderr, "%s: %s gives something else for value %zu\n", row_.name.c_str(), peer, i);
+    std::exit(1);
+  }
+
+  std::vector<Row>* rows_;
+  const std::string& filter_;
+  LXLocale* locale_ = nullptr;
+  std::vector<std::u16string> texts_;
+  Row row_{};
+};
+
+using IcuNumbers = std::shared_ptr<UNumberFormat>;
+using IcuTimes = std::shared_ptr<UDateFormat>;
+
+IcuNumbers icu_numbers(const Text& text, UNumberFormatStyle style, int32_t fraction_digits) {
+  UErrorCode error = U_ZERO_ERROR;
+  const IcuNumbers icu(unum_open(style, nullptr, 0, text.icu, nullptr, &error), unum_close);
+  unum_setAttribute(icu.get(), UNUM_FRACTION_DIGITS, fraction_digits);
+  return icu;
+}
+
+IcuTimes icu_times(const Text& text, const Pattern& pattern) {
+  UErrorCode error = U_ZERO_ERROR;
+  return {udat_open(UDAT_PATTERN, UDAT_PATTERN, text.icu, u"GMT", -1,
+                    pattern.icu != nullptr ? pattern.icu : text.icu_date_time, -1, &error),
+          udat_close};
+}
+
+/// The rows of one text.
+class TextRows {
+ public:
+  TextRows(RowMaker* make, const Text& text, const std::shared_ptr<LXLocale>& locale, const Values& values)
+      : make_(*make), text_(text), owner_(locale), locale_(locale.get()), values_(values) {
+    if (text.glibc == nullptr) return;
+    system_ = newlocale(LC_ALL_MASK, text.glibc, nullptr);
+    own_system_ = system_ != nullptr;
+    if (!own_system_ && text.glibc_fallback != nullptr)
+      system_ = newlocale(LC_ALL_MASK, text.glibc_fallback, nullptr);
+  }
+
+  void add() {
+    write_numbers(
+        "integer", values_.integers, LXLongToString, LXLongToStringU,
+        [](char* out, int32_t value) { return std::snprintf(out, kRoomUnits, "%'d", value); }, UNUM_DECIMAL, 0);
+    write_numbers(
+        "double", values_.amounts, LXDoubleToString, LXDoubleToStringU,
+        [](char* out, double value) { return std::snprintf(out, kRoomUnits, "%'.2f", value); }, UNUM_DECIMAL,
+        2);
+    // Not negative: the territories write the others in different ways.
+    write_numbers(
+        "currency", values_.positive_amounts, LXCurrencyToString, LXCurrencyToStringU,
+        [](char* out, double value) { return static_cast<int32_t>(strfmon(out, kRoomUnits, "%n", value)); },
+        UNUM_CURRENCY, 2);
+    for (const Pattern& pattern : kWritten) write_times(pattern);
+    read_integers();
+    read_doubles("double", "%.2f", values_.amounts);
+    read_doubles("double_17", "%.17g", values_.precise);
+    for (const Pattern& pattern : kRead) read_times(pattern);
+  }
+
+ private:
+  bool start(const char* work, const char* label) {
+    return make_.start(std::string(work) + "/" + text_.label + "/" + label, locale_);
+  }
+
+  /// Our writer in the form of the text.
+  template <class Bytes, class Units>
+  void ours(Bytes bytes, Units units) {
+    if (text_.encoding == Encoding::kUtf16)
+      make_.writer(kOurs, nullptr, Encoding::kUtf16, true, [owner = owner_, units](size_t i, char* out) {
+        return 2 * count_of(units(owner.get(), i, lx_units(out)));
+      });
+    else
+      make_.writer(kOurs, nullptr, Encoding::kCodepage, true, [owner = owner_, bytes](size_t i, char* out) {
+        return count_of(bytes(owner.get(), i, out));
+      });
+  }
+  /// `exact`: the texts are ours, if it is the language's own locale.
+  template <class Call>
+  void glibc(bool exact, Call call) {
+    if (system_ != nullptr) make_.writer(kGlibc, system_, Encoding::kUtf8, exact && own_system_, call);
+  }
+  template <class Call>
+  void icu(Call call) {
+    make_.writer(kIcu, nullptr, Encoding::kUtf16, true, [call](size_t i, char* out) {
+      UErrorCode error = U_ZERO_ERROR;
+      return 2 * count_of(call(i, reinterpret_cast<char16_t*>(out), &error));
+    });
+  }
+
+  /// `system(output, value)` is glibc's.
+  template <class Value, class Bytes, class Units, class System>
+  void write_numbers(const char* label, const std::vector<Value>& values, Bytes bytes, Units units,
+                     System system, UNumberFormatStyle style, int32_t fraction_digits) {
+    if (!start("write", label)) return;
+    ours([&values, bytes](LXLocale* locale, size_t i,
+                          char* out) { return bytes(locale, values[i], out, kRoomUnits, 0); },
+         [&values, units](LXLocale* locale, size_t i, LXUChar* out) {
+           return units(locale, values[i], out, kRoomUnits, 0);
+         });
+    glibc(true, [&values, system](size_t i, char* out) { return count_of(system(out, values[i])); });
+    if (text_.icu != nullptr) {
+      icu([&values, format = icu_numbers(text_, style, fraction_digits)](size_t i, char16_t* out,
+                                                                         UErrorCode* error) {
+        if constexpr (std::is_integral_v<Value>)
+          return unum_format(format.get(), values[i], out, kRoomUnits, nullptr, error);
+        else
+          return unum_formatDouble(format.get(), values[i], out, kRoomUnits, nullptr, error);
+      });
+    }
+    make_.finish();
+  }
+
+  void write_times(const Pattern& pattern) {
+    if (!start("write", pattern.label)) return;
+    Inputs format;
+    format.add(locale_, pattern.ours);
+    ours(
+        [format = format.codepage[0], &values = values_.times](LXLocale* locale, size_t i, char* out) {
+          return LXTimeToString(locale, &values[i], out, kRoomUnits, format.data(), length(format.size()), 0);
+        },
+        [format = format.utf16[0], &values = values_.times](LXLocale* locale, size_t i, LXUChar* out) {
+          return LXTimeToStringU(locale, &values[i], out, kRoomUnits, lx_units(format), length(format.size()),
+                                 0);
+        });
+    const bool exact = pattern.icu != nullptr;
+    glibc(exact, [format = pattern.glibc, &values = values_.system_times](size_t i, char* out) {
+      return strftime(out, kRoomUnits, format, &values[i]);
+    });
+    if (text_.icu != nullptr) {
+      icu([times = icu_times(text_, pattern), &values = values_.dates](size_t i, char16_t* out,
+                                                                       UErrorCode* error) {
+        return udat_format(times.get(), values[i], out, kRoomUnits, nullptr, error);
+      });
+    }
+    make_.finish();
+  }
+
+  /// The peers that read a row's texts: `bytes` and `units` are ours, in the form of the text; the others are
+  /// left out where the text has no such peer.
+  template <class Bytes, class Units, class System, class Icu>
+  void readers(const std::shared_ptr<const Inputs>& in, const std::vector<double>& expected,
+               const std::vector<double>& icu_expected, Bytes bytes, Units units, System system, Icu icu) {
+    make_.set_input(in->utf16);
+    if (text_.encoding == Encoding::kUtf16)
+      make_.reader(kOurs, nullptr, expected,
+                   [owner = owner_, in, units](size_t i) { return units(owner.get(), in->utf16[i]); });
+    else
+      make_.reader(kOurs, nullptr, expected,
+                   [owner = owner_, in, bytes](size_t i) { return bytes(owner.get(), in->codepage[i]); });
+    if (system_ != nullptr)
+      make_.reader(kGlibc, system_, expected, [in, system](size_t i) { return system(in->utf8[i].c_str()); });
+    if (text_.icu != nullptr)
+      make_.reader(kIcu, nullptr, icu_expected, [in, icu](size_t i) {
+        UErrorCode error = U_ZERO_ERROR;
+        return icu(in->utf16[i], &error);
+      });
+    make_.finish();
+  }
+
+  void read_integers() {
+    if (!start("read", "integer")) return;
+    const auto in = std::make_shared<Inputs>();
+    for (const int32_t value : values_.integers) in->add(locale_, std::to_string(value));
+    const std::vector<double> expected(values_.integers.begin(), values_.integers.end());
+    readers(
+        in, expected, expected,
+        [](LXLocale* locale, const std::string& text) -> double {
+          return LXStringToLong(locale, text.data(), length(text.size()), nullptr, 10, 0);
+        },
+        [](LXLocale* locale, const std::u16string& text) -> double {
+          return LXStringToLongU(locale, lx_units(text), length(text.size()), nullptr, 10, 0);
+        },
+        [](const char* text) { return static_cast<double>(std::strtol(text, nullptr, 10)); },
+        [format = icu_numbers(text_, UNUM_DECIMAL, 0)](const std::u16string& text, UErrorCode* error)
+            -> double { return unum_parse(format.get(), text.data(), length(text.size()), nullptr, error); });
+  }
+
+  void read_doubles(const char* label, const char* printf_format, const std::vector<double>& values) {
+    if (!start("read", label)) return;
+    const auto in = std::make_shared<Inputs>();
+    for (const double value : values) in->add(locale_, printed(printf_format, value, text_.decimal));
+    readers(
+        in, values, values,
+        [](LXLocale* locale, const std::string& text) {
+          return LXStringToDouble(locale, text.data(), length(text.size()), nullptr, 0);
+        },
+        [](LXLocale* locale, const std::u16string& text) {
+          return LXStringToDoubleU(locale, lx_units(text), length(text.size()), nullptr, 0);
+        },
+        [](const char* text) { return std::strtod(text, nullptr); },
+        [format = icu_numbers(text_, UNUM_DECIMAL, 2)](const std::u16string& text, UErrorCode* error) {
+          return unum_parseDouble(format.get(), text.data(), length(text.size()), nullptr, error);
+        });
+  }
+
+  void read_times(const Pattern& pattern) {
+    if (!start("read", pattern.label)) return;
+    const auto in = std::make_shared<Inputs>();
+    std::vector<double> expected, icu_expected;
+    for (size_t i = 0; i < kValues; ++i) {
+      LXUChar text[kRoomUnits];
+      const std::u16string format = from_utf8(pattern.ours);
+      const size_t units = count_of(LXTimeToStringU(locale_, &values_.times[i], text, kRoomUnits,
+                                                    lx_units(format), length(format.size()), 0));
+      in->add(locale_, to_utf8(std::u16string(text, text + units)));
+      LXTime time = values_.times[i];
+      if (!pattern.to_the_second) time.hours = time.minutes = time.seconds = 0;
+      expected.push_back(key_of(time));
+      icu_expected.push_back(values_.dates[i] -
+                             (pattern.to_the_second ? 0 : std::fmod(values_.dates[i], 86400e3)));
+    }
+    Inputs format;
+    format.add(locale_, pattern.ours);
+    readers(
+        in, expected, icu_expected,
+        [format = format.codepage[0]](LXLocale* locale, const std::string& text) {
+          LXTime time{};
+          LXStringToTime(locale, &time, text.data(), length(text.size()), format.data(), length(format.size()),
+                         0);
+          return key_of(time);
+        },
+        [format = format.utf16[0]](LXLocale* locale, const std::u16string& text) {
+          LXTime time{};
+          LXStringToTimeU(locale, &time, lx_units(text), length(text.size()), lx_units(format),
+                          length(format.size()), 0);
+          return key_of(time);
+        },
+        [format = pattern.glibc](const char* text) {
+          tm time{};
+          strptime(text, format, &time);
+          return key_of(time);
+        },
+        [times = icu_times(text_, pattern)](const std::u16string& text, UErrorCode* error) {
+          return udat_parse(times.get(), text.data(), length(text.size()), nullptr, error);
+        });
+  }
+
+  RowMaker& make_;
+  const Text& text_;
+  std::shared_ptr<LXLocale> owner_;
+  LXLocale* locale_;
+  const Values& values_;
+  locale_t system_ = nullptr;
+  bool own_system_ = false;
+};
+
+}  // namespace
+
+void add_formatting_rows(std::vector<Row>* rows, const std::string& filter) {
+  static const Values values = make_values();  // the rows refer to them
+  RowMaker make(rows, filter);
+  for (const Text& text : kTexts) {
+    const std::shared_ptr<LXLocale> locale(LXGetLocale(text.locale, 0, nullptr), LXReleaseLocale);
+    if (locale == nullptr) {
+      std::fprintf(stderr, "no locale %s\n", text.locale);
+      continue;
+    }
+    TextRows(&make, text, locale, values).add();
+  }
+}
+
+}  // namespace bench
