@@ -172,8 +172,8 @@ int32_t compare_appended(const Sort& sort, const Reader& text1, const Reader& te
 template <class Unit>
 [[gnu::always_inline]] inline size_t equal_units(const Unit* a, size_t units1, const Unit* b, size_t units2) {
   const size_t most = lx::least(units1, units2);
-  constexpr size_t kWord = sizeof(uint64_t) / sizeof(Unit);
   if (most == 0 || a[0] != b[0]) return 0;  // most texts, and words of no foreseeable number cost more
+  constexpr size_t kWord = sizeof(uint64_t) / sizeof(Unit);
   size_t n = 0;
   for (; most - n >= kWord; n += kWord) {
     const auto word = [n](const Unit* text) { return lx::le64(reinterpret_cast<const uint8_t*>(text + n)); };
@@ -192,6 +192,13 @@ bool surely_begins(const Codepage& cp, const uint8_t* text, size_t n) {
   return true;
 }
 
+/// Whether the ASCII character at `p` may be one element with what follows.
+template <class Unit>
+bool may_reach_on(const Sort& sort, const Unit* p, const Unit* end) {
+  if (!sort.element(static_cast<LXUChar>(*p)).starts_pair() || ++p == end) return false;
+  return *p >= lx::kAsciiUnits || sort.may_end_pair(static_cast<LXUChar>(*p));
+}
+
 /// The difference of two texts that begin with the same `same` units, when ASCII characters that decide follow
 /// in both; else 0.
 template <class Unit>
@@ -204,7 +211,10 @@ template <class Unit>
     if (!surely_begins(cp, text1, same)) return 0;
   const int32_t primary1 = sort.deciding[text1[same]];
   const int32_t primary2 = sort.deciding[text2[same]];
-  return primary1 != 0 && primary2 != 0 ? primary1 - primary2 : 0;
+  if (primary1 == 0 || primary2 == 0) return 0;
+  const bool reach_on = sort.pair_count != 0 && (may_reach_on(sort, text1 + same, text1 + units1) ||
+                                                 may_reach_on(sort, text2 + same, text2 + units2));
+  return reach_on ? 0 : primary1 - primary2;
 }
 
 /// How many of the first `units` units are whole characters.
@@ -263,7 +273,8 @@ int32_t compare_keys(const Sort& sort, const Reader& text1, size_t chars1, const
 
 /// Compares texts whose characters weigh one by one on the same levels: false where some do not.
 template <class Reader>
-bool compare_in_step(const Sort& sort, Reader text1, Reader text2, int32_t* difference) {
+[[gnu::noinline]] bool compare_in_step(const Sort& sort, const Reader& text1, const Reader& text2,
+                                       int32_t* difference) {
   int32_t secondary = 0;
   int32_t tertiary = 0;
   // Notes the first difference of a level; false where only one of the two weighs on it.
@@ -271,22 +282,22 @@ bool compare_in_step(const Sort& sort, Reader text1, Reader text2, int32_t* diff
     if (*first == 0) *first = static_cast<int32_t>(weight1) - static_cast<int32_t>(weight2);
     return weight1 == weight2 || (weight1 != 0 && weight2 != 0);
   };
+  lx::Elements<Reader> a(sort, text1);
+  lx::Elements<Reader> b(sort, text2);
   for (;;) {
-    LXUChar u1 = 0;
-    LXUChar u2 = 0;
-    const bool more1 = text1.next(&u1);
-    const bool more2 = text2.next(&u2);
-    if (!(more1 || lx::exhausted(text1)) || !(more2 || lx::exhausted(text2))) return false;
+    const bool more1 = !a.at_end();
+    const bool more2 = !b.at_end();
     if (!more1 && !more2) break;
-    const Element x = more1 ? sort.element(u1) : Element();
-    const Element y = more2 ? sort.element(u2) : Element();
-    if ((more1 && !x.stands_alone()) || (more2 && !y.stands_alone())) return false;
+    const Element x = more1 ? a.next() : Element();
+    const Element y = more2 ? b.next() : Element();
+    if ((more1 && x.sets() != 1) || (more2 && y.sets() != 1)) return false;
     if (x.primary() != y.primary()) {
       *difference = more1 && more2 ? static_cast<int32_t>(x.primary()) - static_cast<int32_t>(y.primary())
                                    : more1 - more2;
       return !more1 || !more2 || (x.primary() != 0 && y.primary() != 0);
     }
     if (!more1 || !more2 || x.special() != y.special()) return false;
+    if (x.special() != 0 && a.position() != b.position()) return false;
     if (!note(x.secondary(), y.secondary(), &secondary)) return false;
     if (!note(x.tertiary(), y.tertiary(), &tertiary)) return false;
   }
@@ -324,22 +335,26 @@ template <class Reader>
 /// Compares by the weights alone. Most texts are told apart by the first character that differs. `same`: how
 /// many units they begin with alike.
 template <class Reader>
-int32_t compare_weights(const Sort& sort, const Reader& text1, const Reader& text2, size_t same,
-                        int32_t* code) {
-  if (!sort.appends_primaries) return compare_inserted(sort, text1, text2, code);
+int32_t compare_weights(const Sort& sort, Reader text1, Reader text2, size_t same, int32_t* code) {
+  if (!sort.appends_primaries) return compare_inserted(sort, Reader(text1), Reader(text2), code);
   const size_t equal = equal_beginning(sort, text1, text2, same);
   const auto rest = [equal](const Reader& text) {
     LXShiftState state = LX_SHIFT_SINGLE;
     if constexpr (std::is_same_v<Reader, lx::ShiftReader>) state = text.state;
     return lx::read_like(text, text.p + equal, lx::room(text.p, text.end) - equal, state);
   };
+  const Element x = lx::Elements<Reader>(sort, rest(text1)).next();
+  const Element y = lx::Elements<Reader>(sort, rest(text2)).next();
+  const bool decided =
+      x.sets() == 1 && y.sets() == 1 && x.primary() != 0 && y.primary() != 0 && x.primary() != y.primary();
+  if (decided) return static_cast<int32_t>(x.primary()) - static_cast<int32_t>(y.primary());
   int32_t difference = 0;
   if (sort.appends_all && compare_in_step(sort, rest(text1), rest(text2), &difference)) return difference;
-  return compare_rest(sort, text1, text2, rest(text1), rest(text2), code);
+  return compare_rest(sort, Reader(text1), Reader(text2), rest(text1), rest(text2), code);
 }
 
-/// Compares two texts of one kind by the locale's sort, as `options` ask. `same`: without options, how many
-/// units they begin with alike.
+/// Compares two texts of one kind by the locale's sort, as `options` ask. `same`: of how many units it is known
+/// that both begin with them.
 template <class Reader>
 int32_t collate(const LXLocale& locale, const Reader& text1, const Reader& text2, uint32_t options, size_t same,
                 int32_t* code) {
@@ -386,12 +401,10 @@ void drop_blanks(LXLocale* locale, ByteText* text1, ByteText* text2, Form form) 
   drop(text2, lx::least(text1->bytes, text2->bytes));
 }
 
-/// Both byte forms. `in_binary(length1, length2, options)` compares by code value where the locale has no sort;
-/// `same`: how many bytes are known to be the same in both texts.
+/// Both byte forms. `in_binary(length1, length2, options)` compares by code value where the locale has no sort.
 template <class InBinary>
 [[gnu::noinline]] int32_t collate_bytes(Call* call, ByteText&& text1, int32_t length1, ByteText&& text2,
-                                        int32_t length2, uint32_t options, size_t same, Form form,
-                                        InBinary in_binary) {
+                                        int32_t length2, uint32_t options, Form form, InBinary in_binary) {
   LXLocale* locale = call->locale();
   const Codepage& cp = codepage_of(*locale->codepage);
   text1.bytes = lx::text_bytes(cp, text1.text, text1.state, length1, options);
@@ -409,15 +422,12 @@ template <class InBinary>
     drop_blanks(locale, &text1, &text2, form);
     options &= ~LX_IGNORE_BLANKS;
   }
-  const uint8_t* const p1 = bytes_of(text1.text);
-  const uint8_t* const p2 = bytes_of(text2.text);
-  // With shift states equal bytes say nothing.
-  if (options == 0 && !(form == Form::kEx && cp.shift_sensitive))
-    same += equal_units(p1 + same, text1.bytes - same, p2 + same, text2.bytes - same);
   int32_t code = LX_OK;
-  const int32_t difference = lx::read_bytes(cp, form, text1.state, p1, text1.bytes, [&](const auto& in) {
-    return collate(*locale, in, lx::read_like(in, p2, text2.bytes, text2.state), options, same, &code);
-  });
+  const int32_t difference =
+      lx::read_bytes(cp, form, text1.state, bytes_of(text1.text), text1.bytes, [&](const auto& in) {
+        return collate(*locale, in, lx::read_like(in, bytes_of(text2.text), text2.bytes, text2.state), options,
+                       0, &code);
+      });
   return call->fail(code, difference);
 }
 
@@ -474,18 +484,25 @@ int32_t LXStrcoll(LXLocale* locale, const char* text1, int32_t length1, const ch
                   uint32_t options) {
   Call call(unit, locale);
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, 0);
-  const Codepage& cp = codepage_of(call.codepage());
-  size_t same = 0;
-  if (options == 0 && call.locale()->sort != nullptr && cp.same_below >= lx::kAsciiUnits) {
+  if (options == 0 && call.locale()->sort != nullptr) {  // most calls, at once
+    const Sort& sort = lx::sort_of(*call.locale()->sort);
+    const Codepage& cp = codepage_of(call.codepage());
+    const uint8_t* const p1 = bytes_of(text1);
+    const uint8_t* const p2 = bytes_of(text2);
     const size_t bytes1 = lx::text_units(text1, length1);
     const size_t bytes2 = lx::text_units(text2, length2);
-    same = equal_units(bytes_of(text1), bytes1, bytes_of(text2), bytes2);
-    const int32_t difference = compare_ascii(cp, lx::sort_of(*call.locale()->sort), bytes_of(text1), bytes1,
-                                             bytes_of(text2), bytes2, same);
-    if (difference != 0) return call.exit(difference);
+    const size_t same = equal_units(p1, bytes1, p2, bytes2);
+    int32_t code = LX_OK;
+    int32_t difference =
+        cp.same_below >= lx::kAsciiUnits ? compare_ascii(cp, sort, p1, bytes1, p2, bytes2, same) : 0;
+    if (difference == 0)
+      difference = lx::read_bytes(cp, Form::kPlain, LX_SHIFT_SINGLE, p1, bytes1, [&](const auto& in) {
+        return compare_weights(sort, in, lx::read_like(in, p2, bytes2, LX_SHIFT_SINGLE), same, &code);
+      });
+    return call.fail(code, difference);
   }
   return collate_bytes(&call, {text1, LX_SHIFT_SINGLE, 0}, length1, {text2, LX_SHIFT_SINGLE, 0}, length2,
-                       options, same, Form::kPlain, [=](int32_t bytes1, int32_t bytes2, uint32_t left) {
+                       options, Form::kPlain, [=](int32_t bytes1, int32_t bytes2, uint32_t left) {
                          return LXStrcmp(locale, text1, bytes1, text2, bytes2, left);
                        });
 }
@@ -496,7 +513,7 @@ int32_t LXStrcollEx(LXLocale* locale, const char* text1, LXShiftState state1, in
   if (used == nullptr || !codepage_of(*used->codepage).shift_sensitive)
     return LXStrcoll(locale, text1, length1, text2, length2, options);
   Call call(unit, locale);
-  return collate_bytes(&call, {text1, state1, 0}, length1, {text2, state2, 0}, length2, options, 0, Form::kEx,
+  return collate_bytes(&call, {text1, state1, 0}, length1, {text2, state2, 0}, length2, options, Form::kEx,
                        [&](int32_t bytes1, int32_t bytes2, uint32_t left) {
                          return LXStrcmpEx(locale, text1, state1, bytes1, text2, state2, bytes2,
                                            binary_options(left, true));

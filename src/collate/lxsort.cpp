@@ -160,7 +160,7 @@ int32_t give(const Sort& sort, const Element& element, LXWeights* first, LXWeigh
 void fill_deciding(Sort* sort) {
   for (LXUChar u = 0; u < lx::kAsciiUnits; ++u) {
     const Element element = sort->element(u);
-    const bool alone = element.sets() == 1 && !element.starts_pair() && !sort->may_end_pair(u);
+    const bool alone = element.sets() == 1 && !sort->may_end_pair(u);
     sort->deciding[u] =
         alone && sort->appends_primaries ? static_cast<uint16_t>(element.primary()) : uint16_t{0};
   }

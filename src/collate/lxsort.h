@@ -28,7 +28,6 @@ class Element {
   }
   unsigned sets() const { return bits_ >> 48 & 3; }  // 0: the character is ignored
   bool starts_pair() const { return (bits_ & kStartsPair) != 0; }
-  bool stands_alone() const { return (bits_ >> 48 & 7) == 1; }  // one set, and begins no pair
   unsigned char_class() const { return bits_ >> 52 & 0xF; }     // LX_APPEND_ bits
 
   void set_starts_pair() { bits_ |= kStartsPair; }
@@ -57,7 +56,8 @@ struct Sort {
   uint8_t default_tertiary;
   bool appends_primaries;  // no character inserts its primary ahead of others
   bool appends_all;        // ... nor any other weight
-  // Of the ASCII characters the primaries that decide wherever they stand: not of expansions and pairs; else 0.
+  // Of the ASCII characters the primaries that decide where the character stands for itself: not of expansions,
+  // nor of what can end a pair; else 0.
   uint16_t deciding[kAsciiUnits];
   struct Page {
     const Element* elements;  // 256; null: computed from the fields below
