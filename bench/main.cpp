@@ -69,7 +69,7 @@ int run(const Options& options) {
   bench::add_collation_rows(&rows, options.rows);
   bench::add_formatting_rows(&rows, options.rows);
   size_t room = 0;
-  for (const bench::Row& row : rows) room = std::max({room, row.output_bytes + 64, row.input->bytes.size()});
+  for (const bench::Row& row : rows) room = std::max({room, row.output_room + 64, row.input->bytes.size()});
   std::vector<char> output(room);
   for (const bench::Row& row : rows)
     for (const bench::Peer& peer : row.peers) register_peer(row, peer, &output);

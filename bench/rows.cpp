@@ -115,12 +115,12 @@ class RowMaker {
   /// All but memcpy must write the same bytes.
   void check() {
     std::vector<char> expected(room_for(*row_.input)), output(expected.size());
-    row_.output_bytes = row_.peers.front().run(expected.data());
-    if (row_.output_bytes == 0) stop(row_.name, kOurs, "writes nothing");
+    row_.output_room = row_.peers.front().run(expected.data());
+    if (row_.output_room == 0) stop(row_.name, kOurs, "writes nothing");
     for (const Peer& peer : row_.peers) {
       if (peer.name == kMemcpy) continue;
       const size_t bytes = peer.run(output.data());
-      if (bytes != row_.output_bytes || memcmp(output.data(), expected.data(), bytes) != 0)
+      if (bytes != row_.output_room || memcmp(output.data(), expected.data(), bytes) != 0)
         stop(row_.name, peer.name, "writes other bytes");
     }
   }

@@ -31,7 +31,7 @@ struct Row {
   std::string name;  // codepage/text/direction/size
   std::shared_ptr<const Pieces> input;
   std::vector<Peer> peers;
-  size_t output_bytes;
+  size_t output_room;  // bytes of output that its peers need, or take for granted
 };
 
 /// The rows of each family whose name contains `filter`. They end the program when the libraries do not give

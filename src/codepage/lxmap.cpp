@@ -239,12 +239,18 @@ void map_run(Text& text, const Runs& runs, const SpecialFilter& filter) {
 
 /// Copies the characters of several bytes that have no case, as far as they are whole and fit.
 void copy_caseless(LeadByteText& text) {
+  const uint8_t* const p = text.p;
+  const uint8_t* const lengths = text.cp.caseless;
   const size_t n = text.most();
   size_t i = 0;
   while (i < n) {
-    const size_t length = text.cp.caseless[text.p[i]];
+    const size_t length = lengths[p[i]];
     if (length == 0 || length > n - i) break;
     i += length;
+    // Mostly the next ones are as long: then no look-up waits for the one before it.
+    while (n - i >= 4 * length && lengths[p[i]] == length && lengths[p[i + length]] == length &&
+           lengths[p[i + 2 * length]] == length && lengths[p[i + 3 * length]] == length)
+      i += 4 * length;
   }
   if (i == 0) return;
   memmove(text.out, text.p, i);
