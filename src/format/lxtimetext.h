@@ -98,6 +98,10 @@ bool copy_char(const typename Text::Reader& in, const typename Text::Unit* befor
   } else {
     const size_t count = static_cast<size_t>(in.p - before);
     if (count > room(out->p, out->end)) return false;
+    if (count == 1) {  // apart: most characters
+      *out->p++ = *before;
+      return true;
+    }
     for (size_t i = 0; i < count; ++i) *out->p++ = before[i];
     return true;
   }
