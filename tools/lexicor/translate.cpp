@@ -59,7 +59,8 @@ int translate(const TranslateOptions& options, const CommonOptions& common) {
   Pieces pieces(input);
   Output output(options.output);
   const std::vector<char> text = read_whole(pieces, !output.is_terminal());
-  const size_t needed = std::min<uint64_t>(kMostBytes, uint64_t{text.size()} * kGrowth + kClosingBytes);
+  const auto needed =
+      static_cast<size_t>(std::min<uint64_t>(kMostBytes, uint64_t{text.size()} * kGrowth + kClosingBytes));
   const size_t size = options.size > 0 ? static_cast<size_t>(options.size) : needed;
   const std::unique_ptr<char[]> buffer(new char[size]);  // not filled: what is not used takes no memory
   int32_t consumed = 0;
