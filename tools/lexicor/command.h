@@ -6,12 +6,9 @@
 #include <stdexcept>
 #include <string>
 
-// The header of the argument parser is large: only who declares options includes it.
-namespace CLI {
-class App;
-}
-
 namespace lexicor_cli {
+
+class Arguments;
 
 /// The last two are answers of `compare`, whose kDone says that the texts are equal.
 enum ExitCode { kDone = 0, kDataError = 1, kUsageError = 2, kLess = 3, kGreater = 4 };
@@ -35,7 +32,7 @@ struct CommonOptions {
 using Run = std::function<int()>;
 
 /// Declares the subcommand's options. They, and `common`, outlive the Run that comes back.
-using Declare = Run (*)(CLI::App& command, const CommonOptions& common);
+using Declare = Run (*)(Arguments& command, const CommonOptions& common);
 
 struct Subcommand {
   const char* name;
@@ -43,19 +40,19 @@ struct Subcommand {
   Declare declare;
 };
 
-Run declare_compare(CLI::App& command, const CommonOptions& common);
-Run declare_convert(CLI::App& command, const CommonOptions& common);
-Run declare_explain(CLI::App& command, const CommonOptions& common);
-Run declare_format(CLI::App& command, const CommonOptions& common);
-Run declare_info(CLI::App& command, const CommonOptions& common);
-Run declare_key(CLI::App& command, const CommonOptions& common);
-Run declare_lines(CLI::App& command, const CommonOptions& common);
-Run declare_list(CLI::App& command, const CommonOptions& common);
-Run declare_map(CLI::App& command, const CommonOptions& common);
-Run declare_message(CLI::App& command, const CommonOptions& common);
-Run declare_native(CLI::App& command, const CommonOptions& common);
-Run declare_parse(CLI::App& command, const CommonOptions& common);
-Run declare_sort(CLI::App& command, const CommonOptions& common);
-Run declare_translate(CLI::App& command, const CommonOptions& common);
+Run declare_compare(Arguments& command, const CommonOptions& common);
+Run declare_convert(Arguments& command, const CommonOptions& common);
+Run declare_explain(Arguments& command, const CommonOptions& common);
+Run declare_format(Arguments& command, const CommonOptions& common);
+Run declare_info(Arguments& command, const CommonOptions& common);
+Run declare_key(Arguments& command, const CommonOptions& common);
+Run declare_lines(Arguments& command, const CommonOptions& common);
+Run declare_list(Arguments& command, const CommonOptions& common);
+Run declare_map(Arguments& command, const CommonOptions& common);
+Run declare_message(Arguments& command, const CommonOptions& common);
+Run declare_native(Arguments& command, const CommonOptions& common);
+Run declare_parse(Arguments& command, const CommonOptions& common);
+Run declare_sort(Arguments& command, const CommonOptions& common);
+Run declare_translate(Arguments& command, const CommonOptions& common);
 
 }  // namespace lexicor_cli

@@ -1,9 +1,9 @@
 // lexicor compare and lexicor key: which of two texts comes first, and the bytes by which a text is sorted.
 #include <lx.h>
 
-#include <CLI/CLI.hpp>
 #include <memory>
 
+#include "arguments.h"
 #include "collation.h"
 #include "command.h"
 #include "hex.h"
@@ -83,24 +83,24 @@ int show_key(const CompareOptions& options, const CommonOptions& common) {
   return kDone;
 }
 
-void declare_order(CLI::App& command, CompareOptions& options) {
+void declare_order(Arguments& command, CompareOptions& options) {
   command.add_option("--locale", options.locale, "locale whose sort is used; else the user's locale")
-      ->type_name("LOCALE");
-  CLI::Option* ignore_case =
+      .type_name("LOCALE");
+  const Arguments::Option ignore_case =
       command.add_flag("--case-insensitive", options.ignore_case, "letter case does not count");
   command
       .add_flag("--width-insensitive", options.ignore_width,
                 "full-width and half-width forms are equal; case counts")
-      ->excludes(ignore_case);
+      .excludes(ignore_case);
 }
 
 }  // namespace
 
-Run declare_compare(CLI::App& command, const CommonOptions& common) {
+Run declare_compare(Arguments& command, const CommonOptions& common) {
   const auto options = std::make_shared<CompareOptions>();
   declare_order(command, *options);
-  command.add_option("A", options->text1, "a text, in UTF-8")->required()->type_name("");
-  command.add_option("B", options->text2, "another one")->required()->type_name("");
+  command.add_option("A", options->text1, "a text, in UTF-8").required().type_name("");
+  command.add_option("B", options->text2, "another one").required().type_name("");
   command.footer(
       "Prints A < B, A = B or A > B. Exit codes: 0 equal, 3 A comes first, 4 B comes first; 1 and 2 are "
       "errors.\n"
@@ -111,10 +111,10 @@ Run declare_compare(CLI::App& command, const CommonOptions& common) {
   return [options, &common] { return compare(*options, common); };
 }
 
-Run declare_key(CLI::App& command, const CommonOptions& common) {
+Run declare_key(Arguments& command, const CommonOptions& common) {
   const auto options = std::make_shared<CompareOptions>();
   declare_order(command, *options);
-  command.add_option("TEXT", options->text1, "a text, in UTF-8")->required()->type_name("");
+  command.add_option("TEXT", options->text1, "a text, in UTF-8").required().type_name("");
   command.footer(
       "Prints the key's primary, secondary, tertiary and special weights in hexadecimal, each special one "
       "behind\n"

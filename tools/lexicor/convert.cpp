@@ -1,12 +1,12 @@
 // lexicor convert: converts a text from one codepage to another, as a stream.
 #include <lx.h>
 
-#include <CLI/CLI.hpp>
 #include <algorithm>
 #include <iostream>
 #include <memory>
 #include <optional>
 
+#include "arguments.h"
 #include "catalogue.h"
 #include "codepage.h"
 #include "command.h"
@@ -146,19 +146,19 @@ int convert(const ConvertOptions& options, const CommonOptions& common) {
 
 }  // namespace
 
-Run declare_convert(CLI::App& command, const CommonOptions& common) {
+Run declare_convert(Arguments& command, const CommonOptions& common) {
   const auto options = std::make_shared<ConvertOptions>();
   command.add_option("--from", options->from, "codepage of the input: a name, an identifier or an alias")
-      ->required()
-      ->type_name("CP");
-  command.add_option("--to", options->to, "codepage of the output")->required()->type_name("CP");
+      .required()
+      .type_name("CP");
+  command.add_option("--to", options->to, "codepage of the output").required().type_name("CP");
   command.add_flag(
       "--strict", options->strict,
       "report every character that is lost; when there is one, exit with 1 and leave OUT as it was");
   command.add_option("-o,--output", options->output, "output file, replaced when it is complete")
-      ->type_name("OUT");
+      .type_name("OUT");
   command.add_option("FILE", options->files, "input files, taken as one text; - is standard input")
-      ->type_name("");
+      .type_name("");
   command.footer(
       "A character that the output codepage lacks becomes its substitution character. Text in a "
       "shift-sensitive\n"

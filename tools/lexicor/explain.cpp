@@ -2,13 +2,13 @@
 // the weight that decides.
 #include <lx.h>
 
-#include <CLI/CLI.hpp>
 #include <algorithm>
 #include <memory>
 #include <sstream>
 #include <utility>
 #include <vector>
 
+#include "arguments.h"
 #include "collation.h"
 #include "command.h"
 #include "hex.h"
@@ -256,12 +256,12 @@ int explain(const ExplainOptions& options, const CommonOptions& common) {
 
 }  // namespace
 
-Run declare_explain(CLI::App& command, const CommonOptions& common) {
+Run declare_explain(Arguments& command, const CommonOptions& common) {
   const auto options = std::make_shared<ExplainOptions>();
   command.add_option("--locale", options->locale, "locale whose sort is used; else the user's locale")
-      ->type_name("LOCALE");
-  command.add_option("A", options->text1, "a text, in UTF-8")->required()->type_name("");
-  command.add_option("B", options->text2, "another one")->required()->type_name("");
+      .type_name("LOCALE");
+  command.add_option("A", options->text1, "a text, in UTF-8").required().type_name("");
+  command.add_option("B", options->text2, "another one").required().type_name("");
   command.footer(
       "Shows the elements of each text with their weights in hexadecimal: a character, a pair that sorts as "
       "one,\n"

@@ -1,13 +1,13 @@
 // lexicor format and lexicor parse: numbers, amounts of money and times as a locale writes them, and back.
 #include <lx.h>
 
-#include <CLI/CLI.hpp>
 #include <algorithm>
 #include <charconv>
 #include <cstdio>
 #include <map>
 #include <memory>
 
+#include "arguments.h"
 #include "command.h"
 #include "locale.h"
 #include "moment.h"
@@ -211,17 +211,17 @@ using Works = std::map<std::string, Work>;
 const Works kFormats = {{"number", format_number}, {"money", format_money}, {"time", format_time}};
 const Works kParses = {{"number", parse_number}, {"money", parse_money}, {"time", parse_time}};
 
-Run declare_values(CLI::App& command, const CommonOptions& common, const Works& works, const char* text_name,
+Run declare_values(Arguments& command, const CommonOptions& common, const Works& works, const char* text_name,
                    const char* text_help, const std::shared_ptr<ValueOptions>& options) {
   command.add_option("KIND", options->kind, "number, money or time")
-      ->required()
-      ->type_name("")
-      ->check(CLI::IsMember(works));
-  command.add_option(text_name, options->text, text_help)->required()->type_name("");
+      .required()
+      .type_name("")
+      .one_of(keys_of(works));
+  command.add_option(text_name, options->text, text_help).required().type_name("");
   command.add_option("--locale", options->locale, "locale by whose conventions; else the user's")
-      ->type_name("LOCALE");
+      .type_name("LOCALE");
   command.add_option("--format", options->format, "of a time: a text with directives; else '%x %X'")
-      ->type_name("FORMAT");
+      .type_name("FORMAT");
   return [options, &common, &works] {
     if (!options->format.empty() && options->kind != "time")
       throw Failure(kUsageError, "--format is for times");
@@ -236,7 +236,7 @@ Run declare_values(CLI::App& command, const CommonOptions& common, const Works& 
 
 }  // namespace
 
-Run declare_format(CLI::App& command, const CommonOptions& common) {
+Run declare_format(Arguments& command, const CommonOptions& common) {
   const auto options = std::make_shared<ValueOptions>();
   command.add_flag("--international", options->international,
                    "of money: the international symbol and its fraction digits");
@@ -251,7 +251,7 @@ Run declare_format(CLI::App& command, const CommonOptions& common) {
   return declare_values(command, common, kFormats, "VALUE", "a number, or a time in ISO 8601", options);
 }
 
-Run declare_parse(CLI::App& command, const CommonOptions& common) {
+Run declare_parse(Arguments& command, const CommonOptions& common) {
   const auto options = std::make_shared<ValueOptions>();
   command.footer(
       "Prints a number like -1234.56, or what the text gives of a time like 2026-11-21T14:05:09. A year of "

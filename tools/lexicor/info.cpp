@@ -1,11 +1,11 @@
 // lexicor info: the items of a locale, as a table or as JSON.
 #include <lx.h>
 
-#include <CLI/CLI.hpp>
 #include <iostream>
 #include <memory>
 #include <sstream>
 
+#include "arguments.h"
 #include "command.h"
 #include "locale.h"
 #include "output.h"
@@ -142,15 +142,15 @@ int info(const InfoOptions& options, const CommonOptions& common) {
 
 }  // namespace
 
-Run declare_info(CLI::App& command, const CommonOptions& common) {
+Run declare_info(Arguments& command, const CommonOptions& common) {
   const auto options = std::make_shared<InfoOptions>();
-  CLI::Option* name =
+  const Arguments::Option name =
       command
           .add_option("LOCALE", options->name, "LANGUAGE[_TERRITORY][.CODEPAGE][@SORT]; else the user's locale")
-          ->type_name("");
+          .type_name("");
   command
       .add_flag("--native", options->native, "LOCALE is a name of the operating system, with its conventions")
-      ->needs(name);
+      .needs(name);
   command.add_flag("--json", options->json, "print JSON");
   command.footer(
       "Each line has the number, the name and the value of an item; texts stand in quotes.\n"

@@ -1,13 +1,13 @@
 // lexicor lines: rewrites the line ends of a text in a codepage, by the library's character streams.
 #include <lx.h>
 
-#include <CLI/CLI.hpp>
 #include <algorithm>
 #include <exception>
 #include <iostream>
 #include <map>
 #include <memory>
 
+#include "arguments.h"
 #include "catalogue.h"
 #include "codepage.h"
 #include "command.h"
@@ -228,28 +228,27 @@ int rewrite_lines(const LinesOptions& options, const CommonOptions& common) {
 
 }  // namespace
 
-Run declare_lines(CLI::App& command, const CommonOptions& common) {
+Run declare_lines(Arguments& command, const CommonOptions& common) {
   const auto options = std::make_shared<LinesOptions>();
   command.add_option("--from", options->from, "codepage of the text: a name, an identifier or an alias")
-      ->required()
-      ->type_name("CP");
+      .required()
+      .type_name("CP");
   command
       .add_option(
           "--eol", options->eol,
           "line end to write: lf, crlf, nl (new line of EBCDIC), or other (a fourth one of the codepage)")
-      ->required()
-      ->type_name("KIND")
-      ->check(CLI::IsMember(kKinds));
+      .required()
+      .type_name("KIND")
+      .one_of(keys_of(kKinds));
   command.add_option("--find", options->find, "line ends to rewrite, separated by commas; else all four kinds")
-      ->type_name("KIND,...")
-      ->delimiter(',')
-      ->allow_extra_args(false)
-      ->check(CLI::IsMember(kKinds));
+      .type_name("KIND,...")
+      .divided_by(',')
+      .one_of(keys_of(kKinds));
   command.add_flag("--report", options->report, "say on standard error how many line ends there were");
   command.add_option("-o,--output", options->output, "output file, replaced when it is complete")
-      ->type_name("OUT");
+      .type_name("OUT");
   command.add_option("FILE", options->files, "input files, taken as one text; - is standard input")
-      ->type_name("");
+      .type_name("");
   command.footer(
       "The bytes of a line end are the codepage's own. In most codepages nl and other are the line feed; in "
       "EBCDIC\n"

@@ -2,12 +2,12 @@
 // or as JSON.
 #include <lx.h>
 
-#include <CLI/CLI.hpp>
 #include <algorithm>
 #include <memory>
 #include <sstream>
 #include <utility>
 
+#include "arguments.h"
 #include "catalogue.h"
 #include "command.h"
 #include "output.h"
@@ -167,13 +167,13 @@ int list(const ListOptions& options, const CommonOptions& common) {
 
 }  // namespace
 
-Run declare_list(CLI::App& command, const CommonOptions& common) {
+Run declare_list(Arguments& command, const CommonOptions& common) {
   const auto options = std::make_shared<ListOptions>();
   command
       .add_option("WHAT", options->what,
                   "codepages, languages, territories, sorts, aliases or locales; all objects when left out")
-      ->type_name("")
-      ->check(CLI::IsMember({"codepages", "languages", "territories", "sorts", "aliases", "locales"}));
+      .type_name("")
+      .one_of({"codepages", "languages", "territories", "sorts", "aliases", "locales"});
   command.add_flag("--json", options->json, "print JSON");
   command.footer(
       "Each line has the identifier, the name and, of a codepage, its aliases. Locales are the operating "

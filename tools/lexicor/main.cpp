@@ -6,6 +6,7 @@
 #include <utility>
 #include <vector>
 
+#include "arguments.h"
 #include "command.h"
 #include "program.h"
 
@@ -56,7 +57,8 @@ int run(int argc, char** argv) {
   for (const Subcommand& subcommand : kSubcommands) {
     CLI::App* command = app.add_subcommand(subcommand.name, subcommand.summary);
     command->fallthrough();
-    runs.emplace_back(command, subcommand.declare(*command, common));
+    Arguments arguments(*command);
+    runs.emplace_back(command, subcommand.declare(arguments, common));
   }
   try {
     app.parse(argc, argv);

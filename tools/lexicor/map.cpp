@@ -1,11 +1,11 @@
 // lexicor map: maps a text to another case or width, or its digits to ASCII digits, as a stream.
 #include <lx.h>
 
-#include <CLI/CLI.hpp>
 #include <algorithm>
 #include <map>
 #include <memory>
 
+#include "arguments.h"
 #include "catalogue.h"
 #include "codepage.h"
 #include "command.h"
@@ -208,21 +208,21 @@ int map(const MapOptions& options, const CommonOptions& common) {
 
 }  // namespace
 
-Run declare_map(CLI::App& command, const CommonOptions& common) {
+Run declare_map(Arguments& command, const CommonOptions& common) {
   const auto options = std::make_shared<MapOptions>();
   command.add_option("MAPPING", options->mapping, "upper, lower, full, half (width) or digits")
-      ->required()
-      ->type_name("")
-      ->check(CLI::IsMember(kMappings));
+      .required()
+      .type_name("")
+      .one_of(keys_of(kMappings));
   command
       .add_option("--locale", options->locale,
                   "locale whose language's own mappings are applied; else the user's locale")
-      ->type_name("LOCALE");
-  command.add_option("--codepage", options->codepage, "codepage of the text; else UTF-8")->type_name("CP");
+      .type_name("LOCALE");
+  command.add_option("--codepage", options->codepage, "codepage of the text; else UTF-8").type_name("CP");
   command.add_option("-o,--output", options->output, "output file, replaced when it is complete")
-      ->type_name("OUT");
+      .type_name("OUT");
   command.add_option("FILE", options->files, "input files, taken as one text; - is standard input")
-      ->type_name("");
+      .type_name("");
   command.footer(
       "A character without a mapping stays as it is. Width is what the codepage has in both forms.\n"
       "\n"

@@ -1,7 +1,6 @@
 // lexicor message: a message of a message catalog, in the codepage of the caller.
 #include <lx.h>
 
-#include <CLI/CLI.hpp>
 #include <cstdlib>
 #include <cstring>
 #include <filesystem>
@@ -10,6 +9,7 @@
 #include <sstream>
 #include <vector>
 
+#include "arguments.h"
 #include "catalogue.h"
 #include "codepage.h"
 #include "command.h"
@@ -138,27 +138,25 @@ int message(const MessageOptions& options, const CommonOptions& common) {
 
 }  // namespace
 
-Run declare_message(CLI::App& command, const CommonOptions& common) {
+Run declare_message(Arguments& command, const CommonOptions& common) {
   const auto options = std::make_shared<MessageOptions>();
-  command.add_option("CATALOG", options->catalog, "name of the catalog, or its path")
-      ->required()
-      ->type_name("");
-  command.add_option("SET", options->set, "number of the set")->required()->type_name("");
-  command.add_option("NUMBER", options->number, "number of the message")->required()->type_name("");
+  command.add_option("CATALOG", options->catalog, "name of the catalog, or its path").required().type_name("");
+  command.add_option("SET", options->set, "number of the set").required().type_name("");
+  command.add_option("NUMBER", options->number, "number of the message").required().type_name("");
   command.add_option("--default", options->default_text, "what to print when there is no such message")
-      ->type_name("TEXT");
+      .type_name("TEXT");
   command
       .add_option("--locale", options->locale, "locale whose %l, %t and %L are taken; else the user's locale")
-      ->type_name("LOCALE");
+      .type_name("LOCALE");
   command
       .add_option("--codepage", options->codepage,
                   "codepage of the caller, in which the message comes; else UTF-8")
-      ->type_name("CP");
+      .type_name("CP");
   command
       .add_option(
           "--directory", options->directory,
           "templates of paths, divided by ';', looked at before those of LX_NLSPATH and the name itself")
-      ->type_name("TEMPLATES");
+      .type_name("TEMPLATES");
   command.add_flag("--load", options->load, "read the whole catalog at once, for this locale only");
   command.add_flag("--one-locale", options->one_locale, "do not look for the default locale's catalog");
   command.footer(

@@ -1,10 +1,10 @@
 // lexicor native: what an operating-system name of a locale stands for, and whether its objects are there.
 #include <lx.h>
 
-#include <CLI/CLI.hpp>
 #include <memory>
 #include <sstream>
 
+#include "arguments.h"
 #include "command.h"
 #include "locale.h"
 #include "output.h"
@@ -39,11 +39,11 @@ int native(const std::string& native_name, const CommonOptions& common) {
 
 }  // namespace
 
-Run declare_native(CLI::App& command, const CommonOptions& common) {
+Run declare_native(Arguments& command, const CommonOptions& common) {
   const auto name = std::make_shared<std::string>();
   command.add_option("NAME", *name, "the operating system's name of a locale, in its own letter case")
-      ->required()
-      ->type_name("");
+      .required()
+      .type_name("");
   command.footer(
       "Exit code 1: the name is not known, or an object that it stands for is missing.\n"
       "\n"

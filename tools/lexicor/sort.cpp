@@ -2,7 +2,6 @@
 // it.
 #include <lx.h>
 
-#include <CLI/CLI.hpp>
 #include <algorithm>
 #include <cstring>
 #include <deque>
@@ -11,6 +10,7 @@
 #include <string_view>
 #include <vector>
 
+#include "arguments.h"
 #include "collation.h"
 #include "command.h"
 #include "input.h"
@@ -261,19 +261,19 @@ int sort(const SortOptions& options, const CommonOptions& common) {
 
 }  // namespace
 
-Run declare_sort(CLI::App& command, const CommonOptions& common) {
+Run declare_sort(Arguments& command, const CommonOptions& common) {
   const auto options = std::make_shared<SortOptions>();
   command.add_option("--locale", options->locale, "locale whose sort is used; else the user's locale")
-      ->type_name("LOCALE");
-  command.add_option("--codepage", options->codepage, "codepage of the text; else UTF-8")->type_name("CP");
+      .type_name("LOCALE");
+  command.add_option("--codepage", options->codepage, "codepage of the text; else UTF-8").type_name("CP");
   command.add_flag("--key", options->key,
                    "make a key of every line and compare those: faster, takes more memory, same result");
   command.add_flag("--case-insensitive", options->ignore_case, "letter case does not count");
   command.add_flag("--reverse", options->reverse, "last ones first; equal lines still keep their order");
   command.add_flag("--unique", options->unique, "of equal lines write the first only");
   command.add_option("-o,--output", options->output, "output file, replaced when it is complete")
-      ->type_name("OUT");
-  command.add_option("FILE", options->files, "input files; - is standard input")->type_name("");
+      .type_name("OUT");
+  command.add_option("FILE", options->files, "input files; - is standard input").type_name("");
   command.footer(
       "A line ends with a line feed, or with a carriage return and one, which do not count. Equal lines keep "
       "their\n"

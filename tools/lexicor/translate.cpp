@@ -2,11 +2,11 @@
 // with the fields of its records: an output size, padding, blanks that may be lost.
 #include <nls1.h>
 
-#include <CLI/CLI.hpp>
 #include <algorithm>
 #include <limits>
 #include <memory>
 
+#include "arguments.h"
 #include "catalogue.h"
 #include "codepage.h"
 #include "command.h"
@@ -82,26 +82,27 @@ int translate(const TranslateOptions& options, const CommonOptions& common) {
 
 }  // namespace
 
-Run declare_translate(CLI::App& command, const CommonOptions& common) {
+Run declare_translate(Arguments& command, const CommonOptions& common) {
   const auto options = std::make_shared<TranslateOptions>();
   command
       .add_option("--from", options->from,
                   "codepage of the input: a name, an identifier or an alias; 1200 or UTF-16 is UTF-16")
-      ->required()
-      ->type_name("CP");
-  command.add_option("--to", options->to, "codepage of the output")->required()->type_name("CP");
-  CLI::Option* size = command
-                          .add_option("--size", options->size,
-                                      "size of the output; what does not fit is left out, and exits with 1")
-                          ->type_name("BYTES")
-                          ->check(CLI::Range(1, std::numeric_limits<int32_t>::max()));
-  command.add_flag("--pad", options->pad, "fill the output up to the size with blanks")->needs(size);
+      .required()
+      .type_name("CP");
+  command.add_option("--to", options->to, "codepage of the output").required().type_name("CP");
+  const Arguments::Option size =
+      command
+          .add_option("--size", options->size,
+                      "size of the output; what does not fit is left out, and exits with 1")
+          .type_name("BYTES")
+          .at_least(1);
+  command.add_flag("--pad", options->pad, "fill the output up to the size with blanks").needs(size);
   command.add_flag("--trim", options->trim, "blanks at the end of the input that do not fit are no error")
-      ->needs(size);
+      .needs(size);
   command.add_option("-o,--output", options->output, "output file, replaced when it is complete")
-      ->type_name("OUT");
+      .type_name("OUT");
   command.add_option("FILE", options->files, "input files, taken as one string; - is standard input")
-      ->type_name("");
+      .type_name("");
   command.footer(
       "The input is one string of up to 2 GB, line ends and all; 'lexicor convert' takes text of any length. "
       "UTF-16 has\n"

@@ -1,0 +1,63 @@
+// What a subcommand declares of its arguments. The argument parser behind it has a large header, which only
+// arguments.cpp and the main files include.
+#pragma once
+
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <vector>
+
+namespace CLI {
+class App;
+class Option;
+}  // namespace CLI
+
+namespace lexicor_cli {
+
+class Arguments {
+ public:
+  /// One option or positional argument.
+  class Option {
+   public:
+    explicit Option(CLI::Option* option) : option_(option) {}
+
+    const Option& required() const;
+    /// What stands for the value in the help; empty: nothing.
+    const Option& type_name(const char* name) const;
+    const Option& one_of(const std::vector<std::string>& values) const;
+    const Option& at_least(int32_t least) const;
+    /// Several values in one argument.
+    const Option& divided_by(char delimiter) const;
+    const Option& needs(const Option& other) const;
+    const Option& excludes(const Option& other) const;
+
+   private:
+    CLI::Option* option_;
+  };
+
+  explicit Arguments(CLI::App& command) : command_(command) {}
+
+  /// `name` without a dash: a positional argument. The value keeps what it holds when the argument is not
+  /// given.
+  Option add_option(const char* name, std::string& value, const char* help);
+  Option add_option(const char* name, std::optional<std::string>& value, const char* help);
+  Option add_option(const char* name, std::vector<std::string>& values, const char* help);
+  Option add_option(const char* name, int32_t& value, const char* help);
+  Option add_option(const char* name, uint32_t& value, const char* help);
+  Option add_flag(const char* name, bool& value, const char* help);
+  /// What the help ends with.
+  void footer(const char* text);
+
+ private:
+  CLI::App& command_;
+};
+
+/// The keys of a map, for one_of().
+template <class Map>
+std::vector<std::string> keys_of(const Map& map) {
+  std::vector<std::string> keys;
+  for (const auto& entry : map) keys.push_back(entry.first);
+  return keys;
+}
+
+}  // namespace lexicor_cli
