@@ -217,6 +217,17 @@ template <class Unit>
   return reach_on ? 0 : primary1 - primary2;
 }
 
+/// Compares the beginnings of two texts: their difference where that tells them apart, else 0. `*same` receives
+/// how many units they begin with alike.
+template <class Unit>
+[[gnu::always_inline]] inline int32_t compare_beginnings(const Codepage& cp, const Sort& sort,
+                                                         const Unit* text1, size_t units1, const Unit* text2,
+                                                         size_t units2, size_t* same) {
+  *same = equal_units(text1, units1, text2, units2);
+  const bool ascii = sizeof(Unit) == sizeof(LXUChar) || cp.same_below >= lx::kAsciiUnits;
+  return ascii ? compare_ascii(cp, sort, text1, units1, text2, units2, *same) : 0;
+}
+
 /// How many of the first `units` units are whole characters.
 template <class Reader>
 size_t whole_units(const Reader& in, size_t units) {
@@ -335,8 +346,9 @@ template <class Reader>
 /// Compares by the weights alone. Most texts are told apart by the first character that differs. `same`: how
 /// many units they begin with alike.
 template <class Reader>
-int32_t compare_weights(const Sort& sort, Reader text1, Reader text2, size_t same, int32_t* code) {
-  if (!sort.appends_primaries) return compare_inserted(sort, Reader(text1), Reader(text2), code);
+int32_t compare_weights(const Sort& sort, const Reader& text1, const Reader& text2, size_t same,
+                        int32_t* code) {
+  if (!sort.appends_primaries) return compare_inserted(sort, text1, text2, code);
   const size_t equal = equal_beginning(sort, text1, text2, same);
   const auto rest = [equal](const Reader& text) {
     LXShiftState state = LX_SHIFT_SINGLE;
@@ -350,7 +362,7 @@ int32_t compare_weights(const Sort& sort, Reader text1, Reader text2, size_t sam
   if (decided) return static_cast<int32_t>(x.primary()) - static_cast<int32_t>(y.primary());
   int32_t difference = 0;
   if (sort.appends_all && compare_in_step(sort, rest(text1), rest(text2), &difference)) return difference;
-  return compare_rest(sort, Reader(text1), Reader(text2), rest(text1), rest(text2), code);
+  return compare_rest(sort, text1, text2, rest(text1), rest(text2), code);
 }
 
 /// Compares two texts of one kind by the locale's sort, as `options` ask. `same`: of how many units it is known
@@ -463,12 +475,9 @@ int32_t collate_units(Call* call, const Unit* text1, int32_t length1, const Unit
   options &= ~(LX_IGNORE_BLANKS | LX_CHARACTERS);
   size_t same = 0;
   if (options == 0) {
-    same = equal_units(text1, count1, text2, count2);
-    if (sizeof(Unit) == sizeof(LXUChar) || cp.same_below >= lx::kAsciiUnits) {
-      const Sort& sort = lx::sort_of(*locale.sort);
-      const int32_t difference = compare_ascii(cp, sort, text1, count1, text2, count2, same);
-      if (difference != 0) return call->exit(difference);
-    }
+    const Sort& sort = lx::sort_of(*locale.sort);
+    const int32_t difference = compare_beginnings(cp, sort, text1, count1, text2, count2, &same);
+    if (difference != 0) return call->exit(difference);
   }
   int32_t code = LX_OK;
   const int32_t difference =
@@ -491,10 +500,9 @@ int32_t LXStrcoll(LXLocale* locale, const char* text1, int32_t length1, const ch
     const uint8_t* const p2 = bytes_of(text2);
     const size_t bytes1 = lx::text_units(text1, length1);
     const size_t bytes2 = lx::text_units(text2, length2);
-    const size_t same = equal_units(p1, bytes1, p2, bytes2);
+    size_t same = 0;
     int32_t code = LX_OK;
-    int32_t difference =
-        cp.same_below >= lx::kAsciiUnits ? compare_ascii(cp, sort, p1, bytes1, p2, bytes2, same) : 0;
+    int32_t difference = compare_beginnings(cp, sort, p1, bytes1, p2, bytes2, &same);
     if (difference == 0)
       difference = lx::read_bytes(cp, Form::kPlain, LX_SHIFT_SINGLE, p1, bytes1, [&](const auto& in) {
         return compare_weights(sort, in, lx::read_like(in, p2, bytes2, LX_SHIFT_SINGLE), same, &code);

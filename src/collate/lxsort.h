@@ -28,7 +28,7 @@ class Element {
   }
   unsigned sets() const { return bits_ >> 48 & 3; }  // 0: the character is ignored
   bool starts_pair() const { return (bits_ & kStartsPair) != 0; }
-  unsigned char_class() const { return bits_ >> 52 & 0xF; }     // LX_APPEND_ bits
+  unsigned char_class() const { return bits_ >> 52 & 0xF; }  // LX_APPEND_ bits
 
   void set_starts_pair() { bits_ |= kStartsPair; }
 

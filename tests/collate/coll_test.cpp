@@ -351,6 +351,16 @@ TEST_F(CollateTest, KeysOrderAsComparisonDoes) {
   EXPECT_GT(different, 100000);
 }
 
+TEST_F(CollateTest, SpecialsBehindPairs) {
+  SortBuilder sort = example();
+  for (LXUChar inserted : text("yz12")) sort.characters.erase(inserted);
+  sort.characters['x'] = letter(0x203);  // as "ch"
+  open(sort);
+  EXPECT_EQ(compare("ch", "x"), 0);
+  EXPECT_EQ(compare("ch-", "x-"), 1) << "the third character, not the second";
+  EXPECT_EQ(compare("ch-a", "x-b"), -1);
+}
+
 TEST_F(CollateTest, ShiftStatefulAndPackedForms) {
   open(example());
   LXLocale* locale = LXGetLocale("English.TINY-SHIFT@Test", 0, nullptr);
