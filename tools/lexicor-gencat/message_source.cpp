@@ -6,6 +6,7 @@
 #include <optional>
 
 #include "lexicor-data/line_text.h"
+#include "source_parser.h"
 
 namespace lexicor_gencat {
 
@@ -56,15 +57,9 @@ void read_declaration(const std::string& comment, const char* key, std::string& 
   value = comment.substr(prefix.size(), comment.find_first_of(" \t\r", prefix.size()) - prefix.size());
 }
 
-class SourceReader {
+class SourceReader : SourceParser {
  public:
-  SourceReader(const std::string& source, const std::string& file_name, const Recoder& recoder,
-               CatalogBuilder& builder, Problems& problems)
-      : reader_(recoder.source(), source),
-        file_name_(file_name),
-        recoder_(recoder),
-        builder_(builder),
-        problems_(problems) {}
+  using SourceParser::SourceParser;
 
   void read() {
     builder_.begin_source();
@@ -82,21 +77,6 @@ class SourceReader {
       error(at_, at_ == 0 ? "expected a message number, a directive that begins with $, or an empty line"
                           : "expected the message number at the begin of the line, without blanks before it");
   }
-
-  uint32_t peek() const { return at_ < line_.size() ? line_[at_].syntax : Character::kNone; }
-  bool at_end() const { return at_ >= line_.size(); }
-
-  template <class Is>
-  void skip(Is is) {
-    while (!at_end() && is(peek())) ++at_;
-  }
-
-  Place place(size_t at) const {
-    if (line_.empty()) return {file_name_, reader_.line_number(), 1};
-    const Character& c = line_[std::min(at, line_.size() - 1)];
-    return {file_name_, c.line, c.column + (at < line_.size() ? 0 : 1)};
-  }
-  void error(size_t at, const std::string& text) { problems_.error(place(at), text); }
 
   std::string word(size_t begin, size_t end) const {
     std::string text;
@@ -190,13 +170,6 @@ class SourceReader {
                  : builder_.put_named(name, std::move(text), where);
   }
 
-  LineReader reader_;
-  const std::string& file_name_;
-  const Recoder& recoder_;
-  CatalogBuilder& builder_;
-  Problems& problems_;
-  std::vector<Character> line_;
-  size_t at_ = 0;
   uint32_t quote_ = 0;
 };
 

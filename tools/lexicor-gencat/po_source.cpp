@@ -7,6 +7,7 @@
 
 #include "lexicor-data/line_text.h"
 #include "message_source.h"
+#include "source_parser.h"
 
 namespace lexicor_gencat {
 
@@ -49,16 +50,11 @@ std::optional<Number> parse_context(const std::string& context) {
   return Number{static_cast<uint32_t>(values[0]), static_cast<uint32_t>(values[1])};
 }
 
-class PoReader {
+class PoReader : SourceParser {
  public:
   PoReader(const std::string& source, const std::string& file_name, const Recoder& recoder,
            CatalogBuilder& builder, Problems& problems)
-      : reader_(recoder.source(), source),
-        file_name_(file_name),
-        recoder_(recoder),
-        builder_(builder),
-        problems_(problems),
-        text_(recoder.target().codepage()) {}
+      : SourceParser(source, file_name, recoder, builder, problems), text_(recoder.target().codepage()) {}
 
   void read() {
     builder_.begin_source();
@@ -77,19 +73,11 @@ class PoReader {
     std::vector<std::string> texts;  // the translations
   };
 
-  uint32_t peek() const { return at_ < line_.size() ? line_[at_].syntax : Character::kNone; }
-  Place place(size_t at) const {
-    return {file_name_, reader_.line_number(), static_cast<int>(std::min(at, line_.size())) + 1};
-  }
-  void error(size_t at, const std::string& text) { problems_.error(place(at), text); }
-  void skip_blanks() {
-    while (is_blank(peek())) ++at_;
-  }
   bool is_header() const { return entry_.has_id && entry_.id_chars == 0 && !entry_.has_context; }
 
   void read_line() {
     at_ = 0;
-    skip_blanks();
+    skip(is_blank);
     if (at_ == line_.size()) return;
     if (peek() == '#') return read_comment();
     if (peek() == '"') {
@@ -130,7 +118,7 @@ class PoReader {
       error(begin, "expected msgctxt, msgid, msgid_plural, msgstr, a text in double quotes or a comment");
       return;
     }
-    skip_blanks();
+    skip(is_blank);
     if (peek() != '"') return error(at_, "expected a text in double quotes");
     read_string();
   }
@@ -172,7 +160,7 @@ class PoReader {
     }
     if (at_ == line_.size()) return error(begin, "the closing quote is missing");
     ++at_;
-    skip_blanks();
+    skip(is_blank);
     if (at_ < line_.size()) error(at_, "expected nothing behind the closing quote");
     if (field_ == Field::kText) entry_.texts.back() += text_.finish();
   }
@@ -236,14 +224,7 @@ class PoReader {
     }
   }
 
-  LineReader reader_;
-  const std::string& file_name_;
-  const Recoder& recoder_;
-  CatalogBuilder& builder_;
-  Problems& problems_;
   TextWriter text_;
-  std::vector<Character> line_;
-  size_t at_ = 0;
   Field field_ = Field::kNone;
   Entry entry_;
   uint32_t next_number_ = 1;
