@@ -95,10 +95,12 @@ auto read_folded(const Folding& folding, const In& in, Body&& body) {
 class Key {
  public:
   template <class Reader>
-  Key(const Sort& sort, const Reader& text, size_t chars, uint8_t* space) : levels_(sort, text, chars, space) {
+  Key(const Sort& sort, const Reader& text, size_t most_chars, uint8_t* space)
+      : levels_(sort, text, most_chars, space) {
     trim(sort);
   }
 
+  size_t chars() const { return levels_.chars; }  // of the text
   size_t bytes() const;
   /// `output` may be the space of the levels, or stand before it.
   void write(uint8_t* output) const;

@@ -38,14 +38,15 @@ struct PlacedSpecial {
   uint16_t weight;
 };
 
-/// The four levels of a text of at most `chars` characters, in a space of bytes_for(chars) bytes that is
-/// aligned to 4 bytes. The levels stand in the order of a key, a byte between two of them, so that one can be
-/// made of them in place.
+/// The four levels of a text of at most `most_chars` characters, in a space of bytes_for(most_chars) bytes that
+/// is aligned to 4 bytes. The levels stand in the order of a key, a byte between two of them, so that one can
+/// be made of them in place.
 struct Levels {
   Level<uint16_t> primaries;
   Level<uint8_t> secondaries;
   Level<uint8_t> tertiaries;
   Level<PlacedSpecial> specials;
+  size_t chars;  // of the text
 
   // A character has up to two weight sets, or one special weight.
   static constexpr size_t kPrimaryBytes = 2 * sizeof(uint16_t);
@@ -60,13 +61,14 @@ struct Levels {
   static constexpr size_t kMostChars = INT32_MAX / (2 * (kLevelBytes + sizeof(PlacedSpecial)));
 
   template <class Reader>
-  Levels(const Sort& sort, const Reader& text, size_t chars, uint8_t* space)
+  Levels(const Sort& sort, const Reader& text, size_t most_chars, uint8_t* space)
       : primaries(space),
-        secondaries(space + chars * kPrimaryBytes + 1),
-        tertiaries(secondaries.begin + chars * kByteLevelBytes + 1),
-        specials(space + specials_at(chars)) {
+        secondaries(space + most_chars * kPrimaryBytes + 1),
+        tertiaries(secondaries.begin + most_chars * kByteLevelBytes + 1),
+        specials(space + specials_at(most_chars)) {
     WeightSets<Reader> sets(sort, text);
     for (Element set; sets.next(&set);) place(set, sets.position());
+    chars = sets.consumed();
     primaries.close_run();
     secondaries.close_run();
     tertiaries.close_run();

@@ -146,15 +146,31 @@ void fill_pairs(Sort* sort, Pair* pairs) {
   }
 }
 
-/// Gives what a public look-up found to its caller.
-int32_t give(const Sort& sort, const Element& element, LXWeights* first, LXWeights* second,
+/// Where a public look-up stores a weight set.
+struct SetOut {
+  uint16_t* primary;
+  uint8_t* secondary;
+  uint8_t* tertiary;
+  uint16_t* special;
+
+  void store(const LXWeights& weights) const {
+    *primary = weights.primary;
+    *secondary = weights.secondary;
+    *tertiary = weights.tertiary;
+    *special = weights.special;
+  }
+};
+
+/// Gives what a public look-up found to its caller; of an element without weights nothing is stored.
+int32_t give(const Sort& sort, const Element& element, const SetOut& first, const SetOut& second,
              uint8_t* char_class) {
-  const unsigned sets = element.sets();
-  if (sets == 0) return 0;
+  if (element.sets() == 0) return 0;
+  LXWeights weights[2];
+  const int32_t sets = lx::weight_sets(sort, element, &weights[0], &weights[1]);
+  first.store(weights[0]);
+  if (sets == 2) second.store(weights[1]);
   *char_class = static_cast<uint8_t>(element.char_class());
-  *first = sets == 2 ? sort.first_set(element).weights() : element.weights();
-  if (sets == 2) *second = sort.second_set(element).weights();
-  return static_cast<int32_t>(sets);
+  return sets;
 }
 
 void fill_deciding(Sort* sort) {
@@ -221,20 +237,22 @@ bool Sort::find_pair(LXUChar first, LXUChar second, Element* element) const {
 
 extern "C" {
 
-int32_t LXSortGetWeights(const LXObject* object, LXUChar unicode, LXWeights* first, LXWeights* second,
-                         uint8_t* char_class) {
+int32_t LXSortGetWeights(const LXObject* object, LXUChar unicode, uint16_t* primary1, uint8_t* secondary1,
+                         uint8_t* tertiary1, uint16_t* special1, uint16_t* primary2, uint8_t* secondary2,
+                         uint8_t* tertiary2, uint16_t* special2, uint8_t* char_class) {
   if (!lx::initialized() || object == nullptr || object->derived == nullptr) return 0;
   const Sort& sort = lx::sort_of(*object);
-  return give(sort, sort.element(unicode), first, second, char_class);
+  return give(sort, sort.element(unicode), {primary1, secondary1, tertiary1, special1},
+              {primary2, secondary2, tertiary2, special2}, char_class);
 }
 
-int32_t LXSortGetCombination(const LXObject* object, LXUChar first, LXUChar second, LXWeights* weights,
-                             uint8_t* char_class) {
+int32_t LXSortGetCombination(const LXObject* object, LXUChar first, LXUChar second, uint16_t* primary,
+                             uint8_t* secondary, uint8_t* tertiary, uint16_t* special, uint8_t* char_class) {
   Element element;
   if (!lx::initialized() || object == nullptr || object->derived == nullptr) return 0;
   const Sort& sort = lx::sort_of(*object);
   if (!sort.pair(first, second, &element)) return 0;
-  return give(sort, element, weights, nullptr, char_class);
+  return give(sort, element, {primary, secondary, tertiary, special}, {}, char_class);
 }
 
 }  // extern "C"

@@ -2,6 +2,7 @@
 // gives one collation element after the other. All of it trusts the tables, which validate_sort() has checked.
 #pragma once
 
+#include "codepage/lxtext.h"
 #include "core/lxbytes.h"
 #include "core/lxformat.h"
 #include "core/lxobjman.h"
@@ -105,9 +106,20 @@ inline const Sort& sort_of(const LXObject& object) {
   return *static_cast<const Sort*>(object.derived);
 }
 
-/// Whether a reader has come to the end of its text; a character that the end cuts is still before it.
+/// The weight sets of an element that has some, and how many they are.
+inline int32_t weight_sets(const Sort& sort, const Element& element, LXWeights* first, LXWeights* second) {
+  const bool two = element.sets() == 2;
+  *first = two ? sort.first_set(element).weights() : element.weights();
+  if (two) *second = sort.second_set(element).weights();
+  return static_cast<int32_t>(element.sets());
+}
+
+/// Whether a reader has come to the end of its text; a character that the end cuts is still before it, a shift
+/// byte that ends the text is not.
 template <class Reader>
 bool exhausted(const Reader& in) {
+  if constexpr (std::is_same_v<Reader, ShiftReader>)
+    if (in.end - in.p == 1) return in.cp.is_shift(*in.p);
   return in.p == in.end;
 }
 
@@ -117,16 +129,28 @@ void drop_rest(Reader* in) {
   in->p = in->end;
 }
 
+inline constexpr LXUChar kNoAhead = LX_NO_LOOK_AHEAD;
+
+/// When the character behind another one is read: where a pair may begin, or where the sort has pairs at all,
+/// as callers see it who go from element to element by themselves.
+enum class LookAhead { kNeeded, kAlways };
+
 /// Walks a text element by element. Pairs are matched from the left, two characters at a time.
-template <class Reader>
+template <class Reader, LookAhead kAhead = LookAhead::kNeeded>
 class Elements {
  public:
   Elements(const Sort& sort, const Reader& in) : sort_(sort), in_(in) {}
+  /// Goes on behind `consumed` characters and the one that was read ahead, if one was.
+  Elements(const Sort& sort, const Reader& in, size_t consumed, LXUChar ahead)
+      : sort_(sort), in_(in), consumed_(consumed), has_ahead_(ahead != kNoAhead), ahead_(ahead) {}
 
   bool at_end() const { return !has_ahead_ && exhausted(in_); }
+  const Reader& in() const { return in_; }
+  LXUChar ahead() const { return has_ahead_ ? ahead_ : kNoAhead; }
 
-  /// The number of characters consumed, modulo 65,536.
-  uint16_t position() const { return position_; }
+  size_t consumed() const { return consumed_; }  // characters
+  /// As special weights keep it: modulo 65,536.
+  uint16_t position() const { return static_cast<uint16_t>(consumed_); }
 
   /// The next element; one without sets also stands for a character that the end of the text cuts.
   [[gnu::always_inline]] Element next() {
@@ -136,22 +160,29 @@ class Elements {
       return Element();
     }
     has_ahead_ = false;
-    ++position_;
+    ++consumed_;
     const Element element = sort_.element(u);
-    if (!element.starts_pair() || !in_.next(&ahead_)) return element;
+    const bool looks = kAhead == LookAhead::kAlways ? sort_.pair_count != 0 : element.starts_pair();
+    const Reader before(in_);
+    if (!looks || !in_.next(&ahead_)) return element;
     Element pair;
     if (sort_.pair(u, ahead_, &pair)) {
-      ++position_;
+      ++consumed_;
       return pair;
     }
     has_ahead_ = true;
+    if constexpr (kAhead == LookAhead::kAlways) {
+      // What stands for no character cannot be handed out: it is read again.
+      has_ahead_ = ahead_ != kNoAhead;
+      if (!has_ahead_) go_on_at(in_, before);
+    }
     return element;
   }
 
  private:
   const Sort& sort_;
   Reader in_;
-  uint16_t position_ = 0;
+  size_t consumed_ = 0;
   bool has_ahead_ = false;
   LXUChar ahead_ = 0;
 };
@@ -162,6 +193,7 @@ class WeightSets {
  public:
   WeightSets(const Sort& sort, const Reader& in) : sort_(sort), elements_(sort, in) {}
 
+  size_t consumed() const { return elements_.consumed(); }
   uint16_t position() const { return elements_.position(); }
 
   bool next(Element* set) {

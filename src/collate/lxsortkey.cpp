@@ -39,7 +39,7 @@ struct Output {
   static size_t alignment() { return lx::globals.area->table_alignment; }
 
   /// Whether it can be the work area for a text of `chars` characters. Callers rely on its rest being cleared
-  /// then; twice as much as the special level needs is asked for.
+  /// exactly then; twice as much as the special level needs is asked for.
   bool is_work_area(size_t chars) const {
     const size_t levels =
         (chars * Levels::kLevelBytes + Levels::kSeparators + alignment() - 1) & ~(alignment() - 1);
@@ -47,18 +47,25 @@ struct Output {
   }
 };
 
-/// Makes the key of a text of at most `chars` characters: its bytes, or -1 without memory.
+/// The key of a text without a character, which only a text with an end inside its first one can be.
+int32_t key_of_nothing(const Output& output) {
+  if (output.size >= kEmptyKeyBytes) memset(output.start, 0, kEmptyKeyBytes);
+  return kEmptyKeyBytes;
+}
+
+/// Makes the key of a text of at most `most_chars` characters: its bytes, or -1 without memory.
 template <class Reader>
-int32_t make_key(const Sort& sort, const Reader& text, size_t chars, const Output& output) {
-  if (chars > Levels::kMostChars) return -1;
-  const bool in_place = output.is_work_area(chars);
-  const lx::WorkBuffer space(in_place ? 0 : Levels::bytes_for(chars));
+int32_t make_key(const Sort& sort, const Reader& text, size_t most_chars, const Output& output) {
+  if (most_chars > Levels::kMostChars) return -1;
+  const bool in_place = output.is_work_area(most_chars);
+  const lx::WorkBuffer space(in_place ? 0 : Levels::bytes_for(most_chars));
   if (!space) return -1;
-  const Key key(sort, text, chars, in_place ? output.aligned : space.as<uint8_t>());
+  const Key key(sort, text, most_chars, in_place ? output.aligned : space.as<uint8_t>());
+  if (key.chars() == 0) return key_of_nothing(output);
   const size_t bytes = key.bytes();
   if (bytes <= output.usable) {
     key.write(output.start);
-    if (in_place) memset(output.start + bytes, 0, output.size - bytes);
+    if (output.is_work_area(key.chars())) memset(output.start + bytes, 0, output.size - bytes);
   }
   return static_cast<int32_t>(bytes);
 }
@@ -250,10 +257,7 @@ int32_t LXStrGenSortKey(LXLocale* given, uint8_t* output, int32_t size, const LX
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
   const LXLocale& locale = *call.locale();
   if (locale.sort == nullptr || count < 0) return call.fail(LX_E_INVALID, -1);
-  if (count == 0) {
-    if (size >= kEmptyKeyBytes) memset(output, 0, kEmptyKeyBytes);
-    return call.exit(kEmptyKeyBytes);
-  }
+  if (count == 0) return call.exit(key_of_nothing(Output(output, size)));
   const lx::UnicodeReader reader{text, text + count};
   const int32_t bytes =
       make_key(lx::sort_of(*locale.sort), reader, static_cast<size_t>(count), Output(output, size));

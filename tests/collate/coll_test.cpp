@@ -2,6 +2,7 @@
 // and texts that keys, comparison and all forms agree.
 #include <algorithm>
 #include <random>
+#include <tuple>
 
 #include "core/library_fixture.h"
 #include "support/sort_builder.h"
@@ -102,7 +103,12 @@ TEST_F(CollateTest, Weights) {
   uint8_t char_class = 0;
   const auto found = [&](LXUChar u) {
     first = second = {};
-    return LXSortGetWeights(sort, u, &first, &second, &char_class);
+    return LXSortGetWeights(sort, u, &first.primary, &first.secondary, &first.tertiary, &first.special,
+                            &second.primary, &second.secondary, &second.tertiary, &second.special, &char_class);
+  };
+  const auto pair = [&](LXUChar u, LXUChar v) {
+    return LXSortGetCombination(sort, u, v, &first.primary, &first.secondary, &first.tertiary, &first.special,
+                                &char_class);
   };
   EXPECT_EQ(found('z'), 1);
   EXPECT_EQ(first.primary, 0x221);
@@ -117,9 +123,68 @@ TEST_F(CollateTest, Weights) {
   EXPECT_EQ(found(0x2010), 1);
   EXPECT_EQ(first.special, 0x60);
   EXPECT_EQ(found(0x0401), 0) << "a page that is not covered";
-  EXPECT_EQ(LXSortGetCombination(sort, 'c', 'h', &first, &char_class), 1);
+  EXPECT_EQ(pair('c', 'h'), 1);
   EXPECT_EQ(first.primary, 0x203) << "the first record counts";
-  EXPECT_EQ(LXSortGetCombination(sort, 'h', 'c', &first, &char_class), 0);
+  EXPECT_EQ(pair('h', 'c'), 0);
+  // Step by step: what was read ahead counts one unit, and a character cut by the end ends the text.
+  const char* at = "ca\xC3\xA6";
+  const char* const start = at;
+  int32_t left = 3;
+  uint16_t counter = 0;
+  LXUChar ahead = LX_NO_LOOK_AHEAD;
+  const auto step = [&] {
+    return LXStrGetNextWeight(nullptr, &at, &left, &counter, &first, &second, &char_class, &ahead);
+  };
+  EXPECT_EQ(step(), 1);
+  EXPECT_EQ(std::tie(at, left, counter, ahead), std::make_tuple(start + 2, 2, 1, LXUChar{'a'}));
+  EXPECT_EQ(step(), 1);
+  EXPECT_EQ(std::tie(at, left, counter, ahead), std::make_tuple(start + 2, 1, 2, LX_NO_LOOK_AHEAD));
+  EXPECT_EQ(step(), 0);
+  EXPECT_EQ(std::tie(at, left, counter), std::make_tuple(start + 2, 0, 2));
+  const LXUChar last[] = {'c', 0xFFFF, 'h'};
+  const LXUChar* unit_at = last;
+  int32_t units_left = 2;
+  EXPECT_EQ(LXStrGetNextWeightU(nullptr, &unit_at, &units_left, &counter, &first, &second, &char_class, &ahead),
+            1);
+  EXPECT_EQ(units_left, 1) << "U+FFFF stands for no character read ahead, so it is left where it is";
+}
+
+/// The key of a text as a caller makes it who takes the weights one element at a time.
+template <class Unit, class Next>
+ByteString stepped_key(const std::basic_string<Unit>& text, Next next) {
+  uint16_t primaries[512], specials[512];
+  uint8_t secondaries[512], tertiaries[512];
+  uint16_t *primary_at = primaries, *primary_end = primaries, *special_at = specials, *special_end = specials;
+  uint8_t *secondary_at = secondaries, *secondary_end = secondaries;
+  uint8_t *tertiary_at = tertiaries, *tertiary_end = tertiaries;
+  const Unit* p = text.data();
+  auto left = static_cast<int32_t>(text.size());
+  uint16_t counter = 0;
+  LXUChar ahead = LX_NO_LOOK_AHEAD;
+  while (left > 0) {
+    LXWeights sets[2];
+    uint8_t char_class = 0;
+    const int32_t count = next(&p, &left, &counter, &sets[0], &sets[1], &char_class, &ahead);
+    for (int32_t i = 0; i < count; ++i)
+      LXStrInsertWeights(sets[i].primary, &primary_at, &primary_end, sets[i].secondary, &secondary_at,
+                         &secondary_end, sets[i].tertiary, &tertiary_at, &tertiary_end, sets[i].special,
+                         &special_at, &special_end, counter, char_class);
+  }
+  while (secondary_end > secondaries && secondary_end[-1] == 1) --secondary_end;
+  while (tertiary_end > tertiaries && tertiary_end[-1] == 1) --tertiary_end;
+  ByteString made;
+  const auto put = [&](const uint16_t* from, const uint16_t* to, int step) {
+    for (; from < to; from += step) made.insert(made.end(), {uint8_t(*from >> 8), uint8_t(*from)});
+  };
+  put(primaries, primary_end, 1);
+  made.push_back(0);
+  made.insert(made.end(), secondaries, secondary_end);
+  made.push_back(0);
+  made.insert(made.end(), tertiaries, tertiary_end);
+  made.push_back(0);
+  const bool positions = made.size() > 3;
+  put(specials + !positions, special_end, positions ? 1 : 2);
+  return made;
 }
 
 TEST_F(CollateTest, Rules) {
@@ -211,6 +276,13 @@ TEST_F(CollateTest, KeyLayout) {
   EXPECT_EQ(buffer[35], 0);
   EXPECT_EQ(transform(0, 35), 7);
   EXPECT_EQ(buffer[34], 0x5A) << "less than the work area";
+  // The work area is that of the characters, however many bytes they take; none need none, at any address.
+  memset(buffer, 0x5A, sizeof(buffer));
+  EXPECT_EQ(LXStrxfrm(nullptr, buffer, 20, "\xC3\xA6", 2, 0), 8);
+  EXPECT_EQ(buffer[19], 0);
+  memset(buffer, 0x5A, sizeof(buffer));
+  EXPECT_EQ(LXStrxfrm(nullptr, buffer + 1, 3, "\xC3", 1, 0), 3);
+  EXPECT_EQ(std::count(buffer, buffer + 8, 0), 3);
   for (int32_t size : {0, 1, 2, 3}) {
     memset(buffer, 0x5A, sizeof(buffer));
     EXPECT_EQ(LXStrxfrm(nullptr, buffer, size, "", -1, 0), size == 0 ? 0 : 3);
@@ -300,6 +372,19 @@ TEST_F(CollateTest, KeysOrderAsComparisonDoes) {
       }
       texts.push_back(t);
     }
+    for (const Text& t : texts) {
+      const auto in = [](auto door) { return [=](auto... out) { return door(nullptr, out...); }; };
+      LXShiftState state = 0;
+      std::vector<LXWChar> codes(t.size() + 1);
+      LXUnicodeToStringW(nullptr, codes.data(), int32_t(t.size()), t.data(), int32_t(t.size()), 0);
+      ASSERT_EQ(stepped_key<LXUChar>({t.begin(), t.end()}, in(LXStrGetNextWeightU)), key(t));
+      ASSERT_EQ(stepped_key<LXWChar>({codes.begin(), codes.end() - 1}, in(LXStrGetNextWeightW)), key(t));
+      ASSERT_EQ(stepped_key(to_utf8(t), in(LXStrGetNextWeight)), key(t));
+      ASSERT_EQ(
+          stepped_key(to_utf8(t),
+                      [&](auto p, auto... out) { return LXStrGetNextWeightEx(nullptr, p, &state, out...); }),
+          key(t));
+    }
     for (const Text& a : texts)
       for (const Text& b : texts) {
         const ByteString key_a = key(a), key_b = key(b);
@@ -362,7 +447,10 @@ TEST_F(CollateTest, SpecialsBehindPairs) {
 }
 
 TEST_F(CollateTest, ShiftStatefulAndPackedForms) {
-  open(example());
+  SortBuilder sort = example();
+  sort.characters[0xFF21] = letter(0x200);
+  sort.computed[0x4E].char_class = 7;
+  open(sort);
   LXLocale* locale = LXGetLocale("English.TINY-SHIFT@Test", 0, nullptr);
   ASSERT_NE(locale, nullptr);
   const auto compare_ex = [&](const std::string& a, LXShiftState state, const std::string& b) {
@@ -373,6 +461,8 @@ TEST_F(CollateTest, ShiftStatefulAndPackedForms) {
   EXPECT_EQ(compare_ex("\x0E\x44\x47\x0F\x81", 0, "\x81"), 0)
       << "a character without weights between shift bytes";
   EXPECT_EQ(compare_ex("\x44\x47\x0F\x81", 1, "\x82"), -1) << "from the double-byte state";
+  EXPECT_EQ(compare_ex("\x0E\x42\xC1\x0F", 0, "\x0E\x42\xC1\x45\x41"), -1)
+      << "before a last shift byte a text has ended, so that what is inserted in the other one is left over";
   const LXWChar ab[] = {0x81, 0x82, 0}, ac[] = {0x81, 0x83, 0}, blanks[] = {0x81, 0x82, 0x40, 0x4040, 0};
   EXPECT_EQ(sign(LXWcscoll(locale, ab, -1, ac, -1, 0)), -1);
   EXPECT_EQ(LXWcscoll(locale, ab, -1, blanks, 3, LX_IGNORE_BLANKS), 0);

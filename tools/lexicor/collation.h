@@ -21,8 +21,7 @@ class Collation {
   Collation(const Session& session, const std::string& locale_name, const std::string& codepage = "UTF-8");
 
   const Codepage& codepage() const { return codepage_; }
-  /// Null: binary order, which has no weights.
-  const LXObject* sort() const { return sort_; }
+  /// Binary order has no weights.
   bool binary() const { return sort_ == nullptr; }
 
   /// Below 0, 0 or above 0.

@@ -97,34 +97,34 @@ std::string weight_text(const LevelKind& kind, uint32_t weight) {
   return hex_text(weight >> 16, kind.digits) + ":" + hex_text(weight & 0xFFFF, kind.digits);
 }
 
-/// The rows and levels of a text under a sort object.
+/// The rows and levels of a text under the locale's sort.
 class Weigher {
  public:
-  Weigher(const LXObject* sort, const std::vector<Char>& chars) : sort_(sort), chars_(chars) {
+  Weigher(LXLocale* locale, const std::vector<Char>& chars) : locale_(locale), chars_(chars) {
     text_.levels.resize(kLevelCount);
     text_.rows.push_back({"", "primary", "secondary", "tertiary", "special", "weights are", "character"});
-    while (at_ < chars_.size()) take_element();
+    std::vector<LXUChar> units;
+    for (const Char& c : chars) units.push_back(c.unicode);
+    const LXUChar* next = units.data();
+    for (auto remaining = static_cast<int32_t>(units.size()); remaining > 0;) take_element(&next, &remaining);
   }
 
   Explained text() { return std::move(text_); }
 
  private:
-  void take_element() {
+  void take_element(const LXUChar** next, int32_t* remaining) {
     LXWeights first{}, second{};
     uint8_t char_class = 0;
-    const Char& c = chars_[at_];
-    if (at_ + 1 < chars_.size()) {
-      const Char& next = chars_[at_ + 1];
-      if (LXSortGetCombination(sort_, c.unicode, next.unicode, &first, &char_class) != 0) {
-        at_ += 2;
-        add(code_point_name(c.unicode) + " " + code_point_name(next.unicode), c.shown + next.shown, first,
-            char_class);
-        return;
-      }
+    const size_t start = at_;
+    const int32_t sets =
+        LXStrGetNextWeightU(locale_, next, remaining, &counter_, &first, &second, &char_class, &look_ahead_);
+    at_ = chars_.size() - static_cast<size_t>(*remaining);
+    std::string name, characters;
+    for (size_t i = start; i < at_; ++i) {
+      name += (i > start ? " " : "") + code_point_name(chars_[i].unicode);
+      characters += chars_[i].shown;
     }
-    ++at_;
-    const int32_t sets = LXSortGetWeights(sort_, c.unicode, &first, &second, &char_class);
-    add(code_point_name(c.unicode), c.shown, first, char_class);
+    add(name, characters, first, char_class);
     if (sets == 2) add("", "", second, char_class);
   }
 
@@ -142,7 +142,7 @@ class Weigher {
       weighs = true;
       const bool append = (char_class & kind.append) != 0;
       if (!append) inserted += (inserted.empty() ? "inserted: " : ", ") + std::string(kind.title);
-      const auto position = static_cast<uint32_t>(i == kSpecial ? (at_ & 0xFFFF) << 16 : 0);
+      const uint32_t position = i == kSpecial ? uint32_t{counter_} << 16 : 0;
       text_.levels[i].place(position | values[i], append);
     }
     row.push_back(!weighs ? "none: ignored" : inserted.empty() ? "appended" : inserted);
@@ -150,9 +150,11 @@ class Weigher {
     text_.rows.push_back(row);
   }
 
-  const LXObject* sort_;
+  LXLocale* locale_;
   const std::vector<Char>& chars_;
-  size_t at_ = 0;  // also the position of the character before it, counted from 1
+  size_t at_ = 0;         // behind the characters of the last element
+  uint16_t counter_ = 0;  // the position of its special weight
+  LXUChar look_ahead_ = LX_NO_LOOK_AHEAD;
   Explained text_;
 };
 
@@ -235,7 +237,8 @@ int explain(const ExplainOptions& options, const CommonOptions& common) {
   std::ostringstream out;
   const auto take_apart = [&](char name, const std::string& text) {
     const std::vector<Char> chars = chars_of(collation.codepage(), text);
-    Explained explained = collation.binary() ? bytes_of(chars) : Weigher(collation.sort(), chars).text();
+    Explained explained =
+        collation.binary() ? bytes_of(chars) : Weigher(collation.codepage().locale(), chars).text();
     explained.rows[0][0] = name;
     write_table(out, explained.rows);
     return explained;
