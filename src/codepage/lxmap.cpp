@@ -109,7 +109,7 @@ uint32_t other_case(const uint8_t* record, uint32_t code, uint32_t mask) {
 
 template <Kind kKind>
 struct UnicodeMapper {
-  static constexpr bool kRuns = kKind == Kind::kCase;
+  static constexpr bool kCase = kKind == Kind::kCase;
   const Mode& mode;
   using Value = LXUChar;
 
@@ -133,7 +133,7 @@ struct UnicodeMapper {
 
 template <Kind kKind>
 struct CodepageMapper {
-  static constexpr bool kRuns = kKind == Kind::kCase;
+  static constexpr bool kCase = kKind == Kind::kCase;  // characters keep their width, and with it their state
   const Codepage& cp;
   const uint8_t* table;  // the case of single bytes
   uint32_t mask;
@@ -282,7 +282,7 @@ template <class Text, class Mapper>
 void map_all(Text& text, const Mapper& mapper, const SpecialFilter& filter, const Runs& runs) {
   LXShiftState reached = LX_SHIFT_SINGLE;
   for (;;) {
-    if constexpr (Text::kRuns && Mapper::kRuns) {
+    if constexpr (Text::kRuns && Mapper::kCase) {
       if (text.p != text.end && *text.p < runs.below) map_run(text, runs, filter);
       if (!filter.any()) copy_caseless(text);
     }
@@ -302,6 +302,7 @@ void map_all(Text& text, const Mapper& mapper, const SpecialFilter& filter, cons
       written = mapper.alone(c, &value) ? text.put(value, c) : text.copy(c);
     }
     if (!written) {
+      if constexpr (Mapper::kCase) reached = pass_before(text, reached);
       text.p = text.end;  // nothing that follows is passed through
       break;
     }

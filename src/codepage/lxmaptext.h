@@ -131,6 +131,7 @@ struct ShiftText {
   uint8_t* out_end;
   LXShiftState in_state = LX_SHIFT_SINGLE;
   LXShiftState out_state = LX_SHIFT_SINGLE;
+  bool behind_shift_in = false;  // the last character taken, and nothing of it is written
 
   using Char = ByteChar;
   bool take(Char* c) {
@@ -141,6 +142,7 @@ struct ShiftText {
     const size_t length = cp.width_in(state);
     if (length > static_cast<size_t>(end - q)) return false;
     *c = {q, length, in_state, state, shifted};
+    behind_shift_in = shifted && state == LX_SHIFT_SINGLE && out_state == in_state;
     p = q + length;
     in_state = state;
     return true;
@@ -153,6 +155,13 @@ struct ShiftText {
     return write(bytes, count, count == 1 ? LX_SHIFT_SINGLE : LX_SHIFT_DOUBLE, c);
   }
   bool copy(const Char& c) { return write(c.p, c.length, c.state, c); }
+
+  /// Passes the Shift-In before a character that could not be written itself: the state reached by it.
+  LXShiftState pass_shift_in(LXShiftState reached) {
+    if (!behind_shift_in || out == out_end) return reached;
+    *out++ = cp.shift_in;
+    return out_state = LX_SHIFT_SINGLE;
+  }
 
   /// `reached`: the state of the input behind the last character that was written. A shift byte that ends the
   /// input belongs to it as well.
@@ -172,10 +181,20 @@ struct ShiftText {
     if (lead + count + (needed != c.state ? 1 : 0) > room(out, out_end)) return false;
     if (lead) *out++ = shift_byte(needed);
     out_state = needed;
+    behind_shift_in = false;
     for (size_t i = 0; i < count; ++i) *out++ = bytes[i];
     return true;
   }
 };
+
+/// Passes on what stands before a character that does not fit: the state that the input has reached by it.
+template <class Text>
+LXShiftState pass_before(Text&, LXShiftState reached) {
+  return reached;
+}
+inline LXShiftState pass_before(ShiftText& text, LXShiftState reached) {
+  return text.pass_shift_in(reached);
+}
 
 /// What follows a character, for pairs.
 inline LXShiftState state_of(const UnicodeChar&) {
