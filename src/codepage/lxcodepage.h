@@ -12,6 +12,20 @@ namespace lx {
 inline constexpr uint16_t kNoUnicode = 0xFFFD;
 inline constexpr size_t kMaxCharBytes = 4;
 
+/// The codes of Unicode values as the page table of a codepage and its arrays have them.
+struct PageCodes {
+  const uint8_t* payload;
+  const uint8_t* low_array;
+  const uint8_t* high_array;
+
+  const uint8_t* entry(size_t page) const {
+    return payload + format::codepage::kPages + page * format::codepage::kPageBytes;
+  }
+  bool maps(size_t page) const { return entry(page)[2] <= entry(page)[3]; }
+  /// The packed code, a zero byte inside it still there, or the substitution byte.
+  uint32_t code(uint16_t u) const;
+};
+
 /// Derived data of a codepage object, one block with the arrays behind it.
 ///
 /// Towards Unicode: `unicode` for single bytes; for longer characters `rows`, one row of 256 values a trie
@@ -21,8 +35,7 @@ inline constexpr size_t kMaxCharBytes = 4;
 /// unmapped values hold the substitution byte.
 struct Codepage {
   const uint8_t* payload;
-  const uint8_t* low_array;
-  const uint8_t* high_array;
+  PageCodes pages;
   const uint16_t* rows;  // null: no multibyte characters
   const uint8_t* leaf;   // by node
   const uint16_t* codes16;
@@ -36,8 +49,6 @@ struct Codepage {
   bool single_byte;
   bool shift_sensitive;
   bool utf8;            // conversion is computed
-  bool plain_utf8;      // ... and bytes have the lengths of UTF-8, up to 3
-  bool one_byte_codes;  // every Unicode value becomes one byte
   bool two_level_rows;  // the root's children are leaves
   bool plain_digits;    // no byte where ASCII or EBCDIC has a digit is white space
   // Bytes below this are the Unicode values of the same number, both ways, wherever they begin a character:
@@ -132,9 +143,6 @@ inline uint32_t row_code(const Codepage& cp, uint16_t u) {
   const uint32_t index = cp.page_start[u >> 8] + (u & 0xFFu);
   return cp.codes32 != nullptr ? cp.codes32[index] : cp.codes16[index];
 }
-
-/// The packed code of a Unicode value as the page table gives it: a zero byte inside it is still there.
-uint32_t page_code(const Codepage& cp, uint16_t u);
 
 /// The packed code of a Unicode value, or the substitution byte.
 uint32_t unicode_to_code(const Codepage& cp, uint16_t u);

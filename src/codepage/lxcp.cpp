@@ -110,7 +110,7 @@ int32_t Specials::find(uint16_t first, uint16_t second, uint16_t* result1, uint1
 }
 
 uint32_t unicode_to_code(const Codepage& cp, uint16_t u) {
-  if (!cp.utf8) return page_code(cp, u);
+  if (!cp.utf8) return cp.pages.code(u);
   uint8_t bytes[kMaxCharBytes];
   const size_t count = utf8_bytes(u);
   store_utf8(bytes, u, count);

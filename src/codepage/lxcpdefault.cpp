@@ -76,14 +76,13 @@ constexpr DefaultCodes kDefaultCodes = make_default_codes();
 constexpr Codepage make_default_codepage() {
   Codepage cp{};
   cp.payload = LXDefCp.bytes;
-  cp.low_array = LXDefCp3.bytes;
+  cp.pages = {LXDefCp.bytes, LXDefCp3.bytes, nullptr};
   cp.codes16 = kDefaultCodes.rows[0];
   for (size_t b = 0; b < kRow; ++b) cp.unicode[b] = lx::le16(LXDefCp.bytes + fmt::kUnicode + 2 * b);
   cp.page_start[0] = kRow;
   cp.width = 1;
   cp.substitution = kQuestionMark;
   cp.single_byte = true;
-  cp.one_byte_codes = true;
   cp.plain_digits = true;
   cp.same_below = 0x80;
   return cp;

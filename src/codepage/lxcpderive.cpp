@@ -64,16 +64,10 @@ struct Layout {
         bytes(leaf + nodes) {}
 };
 
-bool page_maps(const uint8_t* payload, size_t page) {
-  const uint8_t* entry = payload + fmt::kPages + page * fmt::kPageBytes;
-  return entry[2] <= entry[3];
-}
-
 void fill_scalars(Codepage* cp, uint16_t id, const lx::Sections& sections) {
   const uint8_t* payload = sections.section[0].data;
   cp->payload = payload;
-  cp->low_array = sections.section[2].data;
-  cp->high_array = sections.section[3].data;
+  cp->pages = {payload, sections.section[2].data, sections.section[3].data};
   cp->width = payload[fmt::kWidth];
   cp->substitution = payload[fmt::kSubstitution];
   cp->shift_out = payload[fmt::kShiftOut];
@@ -107,17 +101,8 @@ void fill_codes(const Codepage& cp, Code* codes) {
     Code* row = codes + cp.page_start[page];
     for (size_t low = 0; low < kRow; ++low)
       row[low] =
-          static_cast<Code>(lx::without_zero_bytes(lx::page_code(cp, static_cast<uint16_t>(page << 8 | low))));
+          static_cast<Code>(lx::without_zero_bytes(cp.pages.code(static_cast<uint16_t>(page << 8 | low))));
   }
-}
-
-uint32_t largest_code(const Codepage& cp) {
-  uint32_t largest = cp.substitution;
-  for (uint32_t u = 0; u <= 0xFFFF; ++u) {
-    const uint32_t code = lx::page_code(cp, static_cast<uint16_t>(u));
-    if (code > largest) largest = code;
-  }
-  return largest;
 }
 
 uint16_t same_below(const Codepage& cp) {
@@ -129,13 +114,6 @@ uint16_t same_below(const Codepage& cp) {
     if (!cp.utf8 && lx::row_code(cp, b) != b) break;
   }
   return static_cast<uint16_t>(below & 0x180);
-}
-
-bool is_plain_utf8(const Codepage& cp) {
-  if (!cp.utf8 || cp.same_below == 0) return false;
-  for (unsigned b = 0xC2; b <= 0xEF; ++b)
-    if (cp.length(static_cast<uint8_t>(b)) != (b < 0xE0 ? 2 : 3)) return false;
-  return true;
 }
 
 bool has_two_level_rows(const Codepage& cp, size_t nodes) {
@@ -206,10 +184,8 @@ void* derive_codepage(uint16_t id, const Sections& sections) {
   if (nodes.out_of_memory()) return nullptr;
   uint32_t code_rows = 1;
   for (size_t page = 0; page < kRow; ++page)
-    if (!scalars.utf8 && page_maps(scalars.payload, page)) scalars.page_start[page] = kRow * code_rows++;
-  const uint32_t largest = scalars.utf8 ? 0 : largest_code(scalars);
-  const bool wide = largest > 0xFFFF;
-  scalars.one_byte_codes = !scalars.utf8 && largest <= 0xFF;
+    if (!scalars.utf8 && scalars.pages.maps(page)) scalars.page_start[page] = kRow * code_rows++;
+  const bool wide = !scalars.utf8 && scalars.width > 2;
   const Layout layout(code_rows, wide, nodes.count());
 
   uint8_t* block = static_cast<uint8_t*>(hook_allocate(layout.bytes));
@@ -233,30 +209,29 @@ void* derive_codepage(uint16_t id, const Sections& sections) {
   }
   cp->two_level_rows = has_two_level_rows(*cp, nodes.count());
   cp->same_below = same_below(*cp);
-  cp->plain_utf8 = is_plain_utf8(*cp);
   cp->plain_digits = has_plain_digits(*cp);
   fill_caseless(cp);
   return block;
 }
 
-uint32_t page_code(const Codepage& cp, uint16_t u) {
-  const uint8_t* entry = cp.payload + fmt::kPages + (u >> 8) * fmt::kPageBytes;
+uint32_t PageCodes::code(uint16_t u) const {
+  const uint8_t* of_page = entry(u >> 8);
   const uint8_t low_byte = static_cast<uint8_t>(u);
-  if (low_byte < entry[2] || low_byte > entry[3]) return cp.substitution;
-  const size_t index = low_byte & entry[1];
-  const size_t low = le16(entry + 4) + index;
-  const size_t high = le16(entry + 6) + index;
-  switch (entry[0]) {
+  if (low_byte < of_page[2] || low_byte > of_page[3]) return payload[fmt::kSubstitution];
+  const size_t index = low_byte & of_page[1];
+  const size_t low = le16(of_page + 4) + index;
+  const size_t high = le16(of_page + 6) + index;
+  switch (of_page[0]) {
     case fmt::kKindByte:
-      return cp.low_array[low];
+      return low_array[low];
     case fmt::kKindWord:
-      return le16(cp.low_array + 2 * low);
+      return le16(low_array + 2 * low);
     case fmt::kKindByteWord:
-      return static_cast<uint32_t>(cp.high_array[high]) << 16 | le16(cp.low_array + 2 * low);
+      return static_cast<uint32_t>(high_array[high]) << 16 | le16(low_array + 2 * low);
     case fmt::kKindWordWord:
-      return static_cast<uint32_t>(le16(cp.high_array + 2 * high)) << 16 | le16(cp.low_array + 2 * low);
+      return static_cast<uint32_t>(le16(high_array + 2 * high)) << 16 | le16(low_array + 2 * low);
     case fmt::kKindByteByte:
-      return static_cast<uint32_t>(cp.high_array[high]) << 8 | cp.low_array[low];
+      return static_cast<uint32_t>(high_array[high]) << 8 | low_array[low];
     default:
       return 0;
   }

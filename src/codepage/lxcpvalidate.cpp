@@ -1,5 +1,7 @@
 // Validation of a codepage when it is loaded: afterwards every look-up, for whatever bytes or Unicode value,
-// stays inside its section, and no walk reads beyond the character it stands on. Nothing else is refused.
+// stays inside its section, no walk reads beyond the character it stands on, and what the library writes in the
+// codepage reads back as the characters that were written, the null at its end included. Nothing else is
+// refused.
 #include "codepage/lxcodepage.h"
 #include "core/lxmemory.h"
 #include "core/lxobjtypes.h"
@@ -9,6 +11,13 @@ namespace {
 namespace fmt = lx::format::codepage;
 
 constexpr unsigned kAnyByte = 256;
+
+// What the library writes by number: the null, blanks, digits, signs and parentheses.
+constexpr uint8_t kWrittenAscii[] = {0x00, 0x20, 0x28, 0x29, 0x2B, 0x2D, 0x30, 0x31,
+                                     0x32, 0x33, 0x34, 0x35, 0x36, 0x37, 0x38, 0x39};
+constexpr uint8_t kWrittenEbcdic[] = {0x00, 0x40, 0x4D, 0x5D, 0x4E, 0x60, 0xF0, 0xF1,
+                                      0xF2, 0xF3, 0xF4, 0xF5, 0xF6, 0xF7, 0xF8, 0xF9};
+constexpr size_t kLineEndBytes = 4;
 
 /// One trie of a codepage: the nodes of the type trie have no byte range, so theirs is all bytes.
 struct Trie {
@@ -91,8 +100,8 @@ class Validator {
     if (!payload_.holds(0, fmt::kFixedBytes)) return LX_E_CORRUPT;
     width_ = payload_.data[fmt::kWidth];
     shift_ = (word(fmt::kFlags) & fmt::kFlagShift) != 0;
-    if (!lengths_fit() || !width_tables_fit()) return LX_E_CORRUPT;
-    if (!utf8_ && !pages_fit()) return LX_E_CORRUPT;
+    if (!lengths_fit() || !width_tables_fit() || !written_bytes_fit()) return LX_E_CORRUPT;
+    if (utf8_ ? !formula_fits() : !pages_fit() || !codes_fit()) return LX_E_CORRUPT;
     if (width_ == 1) return LX_OK;
     const int32_t rc = check_trie(type_trie());
     if (rc != LX_OK || utf8_) return rc;
@@ -102,12 +111,13 @@ class Validator {
  private:
   size_t word(size_t offset) const { return lx::le16(payload_.data + offset); }
   uint8_t length(unsigned byte) const { return payload_.data[fmt::kLengths + byte]; }
+  bool is_shift(unsigned byte) const {
+    return shift_ && (byte == payload_.data[fmt::kShiftOut] || byte == payload_.data[fmt::kShiftIn]);
+  }
 
-  /// Lengths are 1 to the width; where UTF-8 is computed, as long as the bytes that the formula reads, which is
-  /// three in a double-byte state.
+  /// Lengths are 1 to the width; where UTF-8 is computed, as long as the bytes that the formula reads.
   bool lengths_fit() const {
     if (width_ < 1 || width_ > lx::kMaxCharBytes) return false;
-    if (utf8_ && shift_ && width_ < 3) return false;
     for (unsigned byte = 0; byte < kAnyByte; ++byte) {
       if (length(byte) < 1 || length(byte) > width_) return false;
       if (utf8_ && length(byte) == 2 && byte > 0xDF) return false;
@@ -118,6 +128,54 @@ class Validator {
   bool width_tables_fit() const {
     return payload_.holds(word(fmt::kFullWidth), fmt::kFullWidthBytes) &&
            payload_.holds(word(fmt::kPairs), word(fmt::kPairCount) * fmt::kPairBytes);
+  }
+
+  /// Whether a byte that is written for a character of its own is one.
+  bool single(unsigned byte) const { return length(byte) == 1 && !is_shift(byte); }
+  bool all_single(const uint8_t* bytes, size_t count) const {
+    for (size_t i = 0; i < count; ++i)
+      if (!single(bytes[i])) return false;
+    return true;
+  }
+
+  /// The null is the character U+0000, so that texts end; shift bytes differ.
+  bool written_bytes_fit() const {
+    const bool ascii = (word(fmt::kFlags) & fmt::kFlagAscii) != 0;
+    return word(fmt::kUnicode) == 0 &&
+           all_single(ascii ? kWrittenAscii : kWrittenEbcdic, sizeof(kWrittenAscii)) &&
+           all_single(payload_.data + fmt::kLineEnds, kLineEndBytes) &&
+           single(payload_.data[fmt::kSubstitution]) &&
+           (!shift_ || payload_.data[fmt::kShiftOut] != payload_.data[fmt::kShiftIn]);
+  }
+
+  /// Where UTF-8 is computed: what the formula writes has the lengths of the codepage, which has no states.
+  bool formula_fits() const {
+    if (shift_ || width_ < 3) return false;
+    for (uint32_t u = 0; u <= UINT16_MAX; u += u < 0x800 ? 1 : 0x1000) {
+      uint8_t bytes[lx::kMaxCharBytes];
+      const size_t count = lx::utf8_bytes(static_cast<uint16_t>(u));
+      lx::store_utf8(bytes, static_cast<uint16_t>(u), count);
+      if (length(bytes[0]) != count) return false;
+    }
+    return true;
+  }
+
+  /// Every code is that of one character: of the length that its first byte has, or of the width of its state.
+  bool codes_fit() const {
+    const lx::PageCodes pages{payload_.data, sections_.section[2].data, sections_.section[3].data};
+    if (pages.code(0) != 0) return false;
+    for (unsigned page = 0; page < kAnyByte; ++page) {
+      for (unsigned low = pages.entry(page)[2]; low <= pages.entry(page)[3]; ++low)
+        if (!code_fits(lx::without_zero_bytes(pages.code(static_cast<uint16_t>(page << 8 | low)))))
+          return false;
+    }
+    return true;
+  }
+  bool code_fits(uint32_t code) const {
+    const size_t count = lx::code_bytes(code);
+    const unsigned first = code >> 8 * (count - 1);
+    if (count > width_ || is_shift(first)) return false;
+    return count == (shift_ && count > 1 ? width_ : length(first));
   }
 
   bool pages_fit() const {

@@ -152,8 +152,8 @@ struct CodepageMapper {
         return true;
       }
       if (cp.caseless[*c.p] != 0) return false;
-      const uint8_t* record = lx::type_record(cp, c.p);
-      if ((lx::le32(record) & mask) == 0) return false;
+      const uint8_t* record = lx::type_record(cp, c.p);  // none where the codepage has no such codes
+      if (record == nullptr || (lx::le32(record) & mask) == 0) return false;
       *mapped = lx::pack(c.p, c.length) + lx::le32(record + 4);
       return true;
     } else if constexpr (kKind == Kind::kFullWidth) {
@@ -415,7 +415,7 @@ int32_t store_other_case(const Codepage& cp, const char* text, size_t length, ch
   memcpy(bytes, text, length);
   const uint32_t code = lx::pack(bytes, length);
   const uint32_t other = other_case(lx::type_record(cp, bytes), code, mask);
-  if (other != code) return store_code_bytes(output, other);
+  if (other != code && lx::code_bytes(other) <= cp.width) return store_code_bytes(output, other);
   memmove(output, text, length);
   return static_cast<int32_t>(length);
 }

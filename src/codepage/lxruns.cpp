@@ -149,7 +149,7 @@ size_t SingleByteReader::read_run(LXUChar* values, size_t most, unsigned below) 
 
 template <>
 size_t Utf8Reader::read_run(LXUChar* values, size_t most, [[maybe_unused]] unsigned below) {
-  const bool plain = cp.plain_utf8;
+  const bool plain = cp.same_below != 0;
   const uint8_t* q = p;
   size_t n = 0;
   while (n < most) {
@@ -323,7 +323,7 @@ void MultiByteWriter::put_run(const LXUChar* values, size_t count) {
 
 void ShiftWriter::put_run(const LXUChar* values, size_t count) {
   size_t i = 0;
-  if (cp.codes16 != nullptr && !cp.utf8) {
+  if (cp.codes16 != nullptr) {
     const uint32_t* const page_start = cp.page_start;
     const uint16_t* const codes = cp.codes16;
     uint8_t* q = p;

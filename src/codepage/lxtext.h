@@ -135,7 +135,7 @@ struct ShiftReader {
   LXShiftState state;
 
   unsigned same_below() const { return 0; }
-  void decode(LXUChar* u) const { *u = state == LX_SHIFT_DOUBLE ? multibyte_unicode(cp, p) : cp.unicode[*p]; }
+  void decode(LXUChar* u) const { *u = state == LX_SHIFT_DOUBLE ? row_unicode(cp, p) : cp.unicode[*p]; }
   void decode(LXWChar* code) const { *code = pack(p, cp.width_in(state)); }
   size_t read_run(LXUChar* values, size_t most, unsigned below);
   template <class Value>
@@ -226,7 +226,7 @@ struct LeadByteWriter {
   uint8_t* end;
 
   unsigned same_below() const { return cp.same_below; }
-  size_t most_units() const { return kUtf8 ? 3 : cp.codes32 != nullptr ? 4 : 2; }
+  size_t most_units() const { return kUtf8 ? 3 : cp.width; }
   void put_run(const LXUChar* values, size_t count);
   bool put(LXUChar u) {
     if constexpr (!kUtf8) return store(row_code(cp, u));
@@ -272,9 +272,9 @@ struct ShiftWriter {
     return state == LX_SHIFT_DOUBLE ? cp.shift_out : cp.shift_in;
   }
 
-  size_t most_units() const { return 1 + (cp.codes32 != nullptr || cp.utf8 ? kMaxCharBytes : 2); }
+  size_t most_units() const { return 1 + cp.width; }
   void put_run(const LXUChar* values, size_t count);
-  bool put(LXUChar u) { return store(cp.utf8 ? unicode_to_code(cp, u) : row_code(cp, u)); }
+  bool put(LXUChar u) { return store(row_code(cp, u)); }
   bool put(LXWChar code) { return store(without_zero_bytes(code)); }
 
  private:
@@ -398,7 +398,7 @@ template <class Body>
 auto write_bytes(const Codepage& cp, Form form, LXShiftState state, uint8_t* p, uint8_t* end, Body&& body) {
   if (form == Form::kEx && cp.shift_sensitive) return body(ShiftWriter{cp, p, end, state});
   if (cp.utf8) return body(Utf8Writer{cp, p, end});
-  if (cp.single_byte && cp.one_byte_codes) return body(SingleByteWriter{cp, p, end});
+  if (cp.single_byte) return body(SingleByteWriter{cp, p, end});
   return body(MultiByteWriter{cp, p, end});
 }
 

@@ -47,7 +47,7 @@ template <class Body>
 auto with_time_bytes(const Codepage& cp, Form form, Body&& body) {
   if (form == Form::kEx && cp.shift_sensitive) return body(TimeText<ShiftReader, ClosedShiftWriter>{});
   if (cp.utf8) return body(TimeText<Utf8Reader, Utf8Writer>{});
-  if (cp.single_byte && cp.one_byte_codes) return body(TimeText<SingleByteReader, SingleByteWriter>{});
+  if (cp.single_byte) return body(TimeText<SingleByteReader, SingleByteWriter>{});
   return body(TimeText<MultiByteReader, MultiByteWriter>{});
 }
 

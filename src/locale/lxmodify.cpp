@@ -136,11 +136,7 @@ bool is_loaded(const LXObject* object, int32_t type) {
 namespace lx {
 
 size_t most_text_bytes(const Codepage& cp, size_t units) {
-  const size_t most = cp.single_byte && cp.one_byte_codes ? 1
-                      : cp.codes32 != nullptr             ? kMaxCharBytes
-                      : cp.utf8                           ? 3
-                                                          : 2;
-  return units * (most + cp.shift_sensitive);
+  return units * (size_t{cp.width} + cp.shift_sensitive);
 }
 
 void store_text(const Codepage& cp, const uint8_t* text, uint8_t* output) {

@@ -58,6 +58,14 @@ void set_page(S& s, uint8_t n, int kind, int mask, int lowest, int highest, size
   put_le16(p + 2, static_cast<uint16_t>(high));
 }
 
+/// Gives every value of a page the code in one more element of the low array: a byte, or a word.
+void set_code(S& s, uint8_t n, int kind, uint16_t code) {
+  s[2].resize((s[2].size() + 1) / 2 * 2);
+  const size_t element = s[2].size() / (kind == fmt::kKindByte ? 1 : 2);
+  s[2].insert(s[2].end(), {static_cast<uint8_t>(code), static_cast<uint8_t>(code >> 8)});
+  set_page(s, n, kind, 0, 0, 0xFF, element, 0);
+}
+
 /// The look-ups of a codepage over its sections.
 struct RawCodepage {
   uint16_t id;
@@ -228,14 +236,23 @@ TEST_F(Validate, Refused) {
       {"a length above the width", tiny_shift_jis, [](S& s) { payload(s)[fmt::kLengths + 0xFF] = 3; }},
       {"length 2 in a single-byte codepage", tiny_single, [](S& s) { payload(s)[fmt::kLengths] = 2; }},
       {"UTF-8: 3 bytes are read", tiny_utf8, [](S& s) { payload(s)[fmt::kLengths + 0xE0] = 2; }},
-      {"UTF-8 in a double-byte state: the formula reads 3 bytes", tiny_utf8,
-       [](S& s) {
-         payload(s)[fmt::kWidth] = 2;
-         set_word(s, fmt::kFlags, fmt::kFlagShift);
-         std::fill_n(payload(s) + fmt::kLengths, 256, uint8_t{1});
-         const uint8_t all[] = {1, 0, 0, 0};
-         std::copy_n(all, 4, type_node(s, 0));
-       }},
+      {"UTF-8: 2 bytes are written", tiny_utf8, [](S& s) { payload(s)[fmt::kLengths + 0xC3] = 3; }},
+      {"UTF-8 with shift states", tiny_utf8, [](S& s) { set_word(s, fmt::kFlags, fmt::kFlagShift); }},
+      // Texts end, and what is written reads back.
+      {"U+0000 is no null", tiny_single, [](S& s) { set_code(s, 0, fmt::kKindByte, 'A'); }},
+      {"a null is no U+0000", tiny_single, [](S& s) { set_word(s, fmt::kUnicode, 'A'); }},
+      {"a null begins a character", tiny_shift_jis, [](S& s) { payload(s)[fmt::kLengths] = 2; }},
+      {"a code above the width", tiny_single, [](S& s) { set_code(s, 5, fmt::kKindWord, 0x8140); }},
+      {"a lead byte as a code", tiny_shift_jis, [](S& s) { set_code(s, 5, fmt::kKindByte, 0x81); }},
+      {"two bytes without a lead byte", tiny_shift_jis, [](S& s) { set_code(s, 5, fmt::kKindWord, 0x4141); }},
+      {"a length below the codes", tiny_euc, [](S& s) { payload(s)[fmt::kLengths + 0x8F] = 1; }},
+      {"a shift byte as a code", tiny_shift, [](S& s) { set_code(s, 5, fmt::kKindByte, 0x0E); }},
+      {"a shift byte in front", tiny_shift, [](S& s) { set_code(s, 5, fmt::kKindWord, 0x0F41); }},
+      {"one byte to shift out and in", tiny_shift, [](S& s) { payload(s)[fmt::kShiftIn] = 0x0E; }},
+      {"a lead byte to substitute", tiny_shift_jis, [](S& s) { payload(s)[fmt::kSubstitution] = 0x81; }},
+      {"a digit begins a character", tiny_shift_jis, [](S& s) { payload(s)[fmt::kLengths + '7'] = 2; }},
+      {"a sign shifts", tiny_shift, [](S& s) { payload(s)[fmt::kShiftOut] = 0x60; }},
+      {"a line end shifts", tiny_shift, [](S& s) { payload(s)[fmt::kLineEnds + 3] = 0x0F; }},
       {"a full-width table behind the end", tiny_shift_jis,
        [](S& s) { set_word(s, fmt::kFullWidth, s[0].size() - fmt::kFullWidthBytes + 1); }},
       {"a pair table behind the end", tiny_shift_jis,
@@ -310,15 +327,17 @@ TEST_F(Validate, NotRefused) {
        }},
       {"codes with zero bytes, which are not stored", tiny_four,
        [](S& s) {
-         for (size_t i = 0; i < s[2].size(); i += 3) s[2][i] = 0;
-         for (size_t i = 0; i < s[3].size(); i += 5) s[3][i] = 0;
+         set_code(s, 5, 3, 0x8140);
+         s[3].resize((s[3].size() + 1) / 2 * 2 + 2);
+         put_le16(page(s, 5) + 6, static_cast<uint16_t>(s[3].size() / 2 - 1));
        }},
       {"pages that share rows", tiny_shift_jis, [](S& s) { std::copy_n(page(s, 0x30), 8, page(s, 0x31)); }},
       {"a mask that keeps a page inside", tiny_single,
        [](S& s) { set_page(s, 5, 0, 0x03, 0, 0xFF, s[2].size() - 4, 0); }},
       {"the last element of each array", tiny_four,
        [](S& s) {
-         set_page(s, 5, 3, 0x00, 0, 0xFF, s[2].size() / 2 - 1, s[3].size() / 2 - 1);
+         s[2].push_back(0x40);
+         s[3].push_back(0x81);
          set_page(s, 6, 4, 0x00, 0, 0xFF, s[2].size() - 1, s[3].size() - 1);
        }},
       {"an empty node of any base", tiny_shift_jis,
@@ -340,7 +359,6 @@ TEST_F(Validate, NotRefused) {
          std::copy_n(leaf, 6, node(s, 0));
        }},
       {"a short walk", tiny_euc, [](S& s) { std::copy_n(child(s, 0xA4), fmt::kNodeBytes, child(s, 0x8F)); }},
-      {"a longer walk from a single byte", tiny_euc, [](S& s) { payload(s)[fmt::kLengths + 0x8F] = 1; }},
       {"bytes behind everything", tiny_shift_jis,
        [](S& s) {
          for (ByteString& section : s) section.push_back(0xEE);
