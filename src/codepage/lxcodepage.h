@@ -161,8 +161,15 @@ inline size_t store_unicode(const Codepage& cp, uint16_t u, uint8_t* p) {
   return count;
 }
 
-/// The bytes that `chars` characters take, without a check for an end, and the whole characters in `bytes`.
-size_t bytes_of_chars(const Codepage& cp, const uint8_t* text, LXShiftState state, int32_t chars);
+/// The bytes that `chars` characters take; without `most` no end is checked, else whole characters in that many
+/// bytes count. A shift byte on either side belongs to a character.
+size_t bytes_of_chars(const Codepage& cp, const uint8_t* text, LXShiftState state, int32_t chars,
+                      size_t most = SIZE_MAX);
+/// How many characters those are for which bytes_of_chars() finds at most `bytes` bytes.
+int32_t chars_counted(const Codepage& cp, const uint8_t* text, LXShiftState state, size_t bytes);
+
+/// The whole characters in `bytes` bytes. Of several shift bytes in front of a character one is passed over,
+/// the next one counts as a character.
 int32_t chars_in_bytes(const Codepage& cp, const uint8_t* text, LXShiftState state, size_t bytes);
 
 /// The type record of the character at `p`: the type word, then what added to its packed code gives the other
@@ -179,6 +186,11 @@ struct Specials {
   int32_t find(uint16_t first, uint16_t second, uint16_t* result1, uint16_t* result2) const;
 };
 Specials specials_of(const LXObject& language, bool upper);
+
+/// Where a caller may leave out the place.
+inline void put_state(LXShiftState* to, LXShiftState state) {
+  if (to != nullptr) *to = state;
+}
 
 /// Consumes a shift byte at `*p`, if there is one: true, and the state is set.
 inline bool take_shift(const Codepage& cp, const uint8_t** p, LXShiftState* state) {

@@ -102,7 +102,7 @@ int32_t convert(Reader in, Writer out, const Request& request) {
 
 /// The end of an output of `size` units; a size in characters says nothing about its bytes.
 uint8_t* end_of(uint8_t* output, const Request& request) {
-  return request.characters ? lx::no_end<uint8_t>() : output + request.size;
+  return request.characters ? lx::no_end<uint8_t>() : lx::end_of(output, request.size);
 }
 
 /// Which flags a conversion knows, and what it returns for others when LX_CHARACTERS is among them.
@@ -148,7 +148,7 @@ int32_t to_unicode(LXUChar* output, int32_t size, LXLocale* locale, const char* 
   return carry_out(locale, lx::locale_of(locale), size, bytes_of(input), length, flags, kUnicode,
                    [&](const Codepage& cp, Request& request) {
                      request.count_bytes(cp, bytes_of(input), state);
-                     const lx::UnicodeWriter writer{output, output + request.size};
+                     const lx::UnicodeWriter writer{output, lx::end_of(output, request.size)};
                      return lx::read_bytes(cp, form, state, bytes_of(input), request.length, [&](auto reader) {
                        return convert<LXUChar>(reader, writer, request);
                      });
@@ -174,7 +174,7 @@ int32_t to_wide(LXLocale* locale, LXWChar* output, int32_t size, const char* inp
                    [&](const Codepage& cp, Request& request) {
                      request.count_bytes(cp, bytes_of(input), state);
                      request.take_terminator();
-                     const lx::CodeWriter writer{cp, output, output + request.size};
+                     const lx::CodeWriter writer{cp, output, lx::end_of(output, request.size)};
                      return lx::read_bytes(cp, form, state, bytes_of(input), request.length, [&](auto reader) {
                        return convert<LXWChar>(reader, writer, request);
                      });
@@ -233,7 +233,7 @@ int32_t LXConvertStringW(LXLocale* target, LXWChar* output, int32_t size, LXLoca
       target, from, size, input, length, flags, kBetweenLocales,
       [&](const Codepage& cp, const Request& request) {
         const lx::CodeReader reader{codepage_of(*from->codepage), input, input + request.length};
-        return convert<LXUChar>(reader, lx::CodeWriter{cp, output, output + request.size}, request);
+        return convert<LXUChar>(reader, lx::CodeWriter{cp, output, lx::end_of(output, request.size)}, request);
       });
 }
 
@@ -269,11 +269,12 @@ int32_t LXStringToUnicodeEx(LXUChar* output, int32_t size, LXLocale* locale, con
 
 int32_t LXStringToUnicodeW(LXUChar* output, int32_t size, LXLocale* locale, const LXWChar* input,
                            int32_t length, int32_t flags) {
-  return carry_out(locale, lx::locale_of(locale), size, input, length, flags, kUnicode,
-                   [&](const Codepage& cp, const Request& request) {
-                     const lx::CodeReader reader{cp, input, input + request.length};
-                     return convert<LXUChar>(reader, lx::UnicodeWriter{output, output + request.size}, request);
-                   });
+  return carry_out(
+      locale, lx::locale_of(locale), size, input, length, flags, kUnicode,
+      [&](const Codepage& cp, const Request& request) {
+        const lx::CodeReader reader{cp, input, input + request.length};
+        return convert<LXUChar>(reader, lx::UnicodeWriter{output, lx::end_of(output, request.size)}, request);
+      });
 }
 
 int32_t LXUnicodeToString(LXLocale* locale, char* output, int32_t size, const LXUChar* input, int32_t length,
@@ -292,7 +293,7 @@ int32_t LXUnicodeToStringW(LXLocale* locale, LXWChar* output, int32_t size, cons
       locale, lx::locale_of(locale), size, input, length, flags, kUnicode,
       [&](const Codepage& cp, const Request& request) {
         const lx::UnicodeReader reader{input, input + request.length};
-        return convert<LXUChar>(reader, lx::CodeWriter{cp, output, output + request.size}, request);
+        return convert<LXUChar>(reader, lx::CodeWriter{cp, output, lx::end_of(output, request.size)}, request);
       });
 }
 

@@ -33,7 +33,8 @@ Copied whole_bytes(const Codepage& cp, Form form, const uint8_t* text, LXShiftSt
   const size_t there = length < 0 ? static_cast<size_t>(chars_in_bytes(cp, text, state, given)) : given;
   if (length < 0 && there <= wanted) return {given, there};  // nothing behind the null is looked at
   const size_t chars = least(there, wanted);
-  return {bytes_of_chars(cp, text, state, static_cast<int32_t>(chars)), chars};
+  // Two shift bytes side by side may be counted as a character; the null still ends the text.
+  return {bytes_of_chars(cp, text, state, static_cast<int32_t>(chars), length < 0 ? given : SIZE_MAX), chars};
 }
 
 }  // namespace lx

@@ -62,6 +62,31 @@ Walk walk(const Codepage& cp, const uint8_t* text, size_t bytes) {
   return at;
 }
 
+/// Steps over characters, each with the shift bytes on both sides of it.
+struct CountedChars {
+  const Codepage& cp;
+  const uint8_t* p;
+  const uint8_t* end;
+  LXShiftState state;
+
+  size_t left(const uint8_t* q) const {
+    return reinterpret_cast<uintptr_t>(end) - reinterpret_cast<uintptr_t>(q);
+  }
+  /// False, with nothing passed, at the end and before a character that it cuts.
+  bool step() {
+    const uint8_t* q = p;
+    LXShiftState behind = state;
+    if (q == end || (cp.shift_sensitive && lx::take_shift(cp, &q, &behind) && q == end)) return false;
+    const size_t length = cp.shift_sensitive ? cp.width_in(behind) : cp.length(*q);
+    if (length > left(q)) return false;
+    q += length;
+    if (cp.shift_sensitive && q != end) lx::take_shift(cp, &q, &behind);
+    p = q;
+    state = behind;
+    return true;
+  }
+};
+
 size_t length_of(const char* text, int32_t bytes) {
   return bytes < 0 ? strlen(text) : static_cast<size_t>(bytes);
 }
@@ -125,18 +150,18 @@ uint16_t code_to_unicode(const Codepage& cp, uint32_t code) {
   return multibyte_unicode(cp, bytes);
 }
 
-size_t bytes_of_chars(const Codepage& cp, const uint8_t* text, LXShiftState state, int32_t chars) {
-  const uint8_t* p = text;
-  for (; chars > 0; --chars) {
-    if (!cp.shift_sensitive) {
-      p += cp.length(*p);
-      continue;
-    }
-    take_shift(cp, &p, &state);
-    p += cp.width_in(state);
-    take_shift(cp, &p, &state);
-  }
-  return static_cast<size_t>(p - text);
+size_t bytes_of_chars(const Codepage& cp, const uint8_t* text, LXShiftState state, int32_t chars, size_t most) {
+  const auto* const no_end = reinterpret_cast<const uint8_t*>(UINTPTR_MAX);
+  CountedChars at{cp, text, most == SIZE_MAX ? no_end : text + most, state};
+  while (chars > 0 && at.step()) --chars;
+  return static_cast<size_t>(at.p - text);
+}
+
+int32_t chars_counted(const Codepage& cp, const uint8_t* text, LXShiftState state, size_t bytes) {
+  CountedChars at{cp, text, text + bytes, state};
+  int32_t chars = 0;
+  while (at.step()) ++chars;
+  return chars;
 }
 
 int32_t chars_in_bytes(const Codepage& cp, const uint8_t* text, LXShiftState state, size_t bytes) {
@@ -201,7 +226,7 @@ char* LXNextCharEx(LXLocale* locale, const char* text, LXShiftState state, LXShi
   } else if (in) {
     p += in.cp().length(*p);
   }
-  *new_state = state;
+  lx::put_state(new_state, state);
   return same(text + (p - bytes_of(text)));
 }
 
@@ -218,7 +243,7 @@ char* LXPrevChar(LXLocale* locale, const char* start, const char* current) {
 char* LXPrevCharEx(LXLocale* locale, const char* start, const char* current, LXShiftState state,
                    LXShiftState* new_state) {
   const Primitive in(locale);
-  *new_state = state;
+  lx::put_state(new_state, state);
   if (!in || !in.shift_sensitive()) return LXPrevChar(locale, start, current);
   const Codepage& cp = in.cp();
   const char* p = current;
@@ -229,7 +254,7 @@ char* LXPrevCharEx(LXLocale* locale, const char* start, const char* current, LXS
   }
   const ptrdiff_t step = cp.width_in(state);
   p = p - start > step ? p - step : start;
-  *new_state = state;
+  lx::put_state(new_state, state);
   return same(p);
 }
 
@@ -260,7 +285,7 @@ char* LXMoveStringPointer(LXLocale* locale, const char* text, int32_t length, in
 char* LXMoveStringPointerEx(LXLocale* locale, const char* text, LXShiftState state, int32_t length,
                             LXShiftState* new_state, int32_t flags) {
   const Primitive in(locale);
-  if (in && !in.shift_sensitive()) *new_state = state;
+  if (in && !in.shift_sensitive()) lx::put_state(new_state, state);
   if (!in || !in.shift_sensitive()) return LXMoveStringPointer(locale, text, length, flags);
   if (length <= 0) return same(text);
   const Codepage& cp = in.cp();
@@ -273,7 +298,7 @@ char* LXMoveStringPointerEx(LXLocale* locale, const char* text, LXShiftState sta
     if (cp.width_in(state) > end - p) break;
     p += cp.width_in(state);
   }
-  *new_state = state;
+  lx::put_state(new_state, state);
   return same(text + (p - bytes_of(text)));
 }
 

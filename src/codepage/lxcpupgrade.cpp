@@ -75,7 +75,7 @@ bool upgrade_trie(lx::Bytes old, size_t old_values, uint8_t** block, size_t* byt
     to[3] = 0xFF;
     memcpy(to + 4, from + 2, 2);
   }
-  memcpy(fresh + *values, old.data + old_values, value_bytes);
+  if (value_bytes != 0) memcpy(fresh + *values, old.data + old_values, value_bytes);
   return true;
 }
 

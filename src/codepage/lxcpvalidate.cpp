@@ -99,7 +99,7 @@ class Validator {
   int32_t run() {
     if (!payload_.holds(0, fmt::kFixedBytes)) return LX_E_CORRUPT;
     width_ = payload_.data[fmt::kWidth];
-    shift_ = (word(fmt::kFlags) & fmt::kFlagShift) != 0;
+    shift_ = (word(fmt::kFlags) & fmt::kFlagShift) != 0 && width_ > 1;  // else no state differs
     if (!lengths_fit() || !width_tables_fit() || !written_bytes_fit()) return LX_E_CORRUPT;
     if (utf8_ ? !formula_fits() : !pages_fit() || !codes_fit()) return LX_E_CORRUPT;
     if (width_ == 1) return LX_OK;
@@ -130,7 +130,7 @@ class Validator {
            payload_.holds(word(fmt::kPairs), word(fmt::kPairCount) * fmt::kPairBytes);
   }
 
-  /// Whether a byte that is written for a character of its own is one.
+  /// Whether a byte that the library writes as a character is one.
   bool single(unsigned byte) const { return length(byte) == 1 && !is_shift(byte); }
   bool all_single(const uint8_t* bytes, size_t count) const {
     for (size_t i = 0; i < count; ++i)
@@ -138,14 +138,12 @@ class Validator {
     return true;
   }
 
-  /// The null is the character U+0000, so that texts end; shift bytes differ.
   bool written_bytes_fit() const {
     const bool ascii = (word(fmt::kFlags) & fmt::kFlagAscii) != 0;
     return word(fmt::kUnicode) == 0 &&
            all_single(ascii ? kWrittenAscii : kWrittenEbcdic, sizeof(kWrittenAscii)) &&
            all_single(payload_.data + fmt::kLineEnds, kLineEndBytes) &&
-           single(payload_.data[fmt::kSubstitution]) &&
-           (!shift_ || payload_.data[fmt::kShiftOut] != payload_.data[fmt::kShiftIn]);
+           single(payload_.data[fmt::kSubstitution]);
   }
 
   /// Where UTF-8 is computed: what the formula writes has the lengths of the codepage, which has no states.
@@ -160,22 +158,17 @@ class Validator {
     return true;
   }
 
-  /// Every code is that of one character: of the length that its first byte has, or of the width of its state.
+  /// Codes are no longer than the width says, and U+0000 is the null.
   bool codes_fit() const {
     const lx::PageCodes pages{payload_.data, sections_.section[2].data, sections_.section[3].data};
     if (pages.code(0) != 0) return false;
     for (unsigned page = 0; page < kAnyByte; ++page) {
-      for (unsigned low = pages.entry(page)[2]; low <= pages.entry(page)[3]; ++low)
-        if (!code_fits(lx::without_zero_bytes(pages.code(static_cast<uint16_t>(page << 8 | low)))))
-          return false;
+      for (unsigned low = pages.entry(page)[2]; low <= pages.entry(page)[3]; ++low) {
+        const uint32_t code = lx::without_zero_bytes(pages.code(static_cast<uint16_t>(page << 8 | low)));
+        if (lx::code_bytes(code) > width_) return false;
+      }
     }
     return true;
-  }
-  bool code_fits(uint32_t code) const {
-    const size_t count = lx::code_bytes(code);
-    const unsigned first = code >> 8 * (count - 1);
-    if (count > width_ || is_shift(first)) return false;
-    return count == (shift_ && count > 1 ? width_ : length(first));
   }
 
   bool pages_fit() const {

@@ -355,10 +355,11 @@ size_t map_bytes_to(const LXLocale& locale, uint8_t* output, size_t size, const 
                     const Mode& mode, Form form) {
   const Codepage& cp = codepage_of(*locale.codepage);
   const SpecialFilter filter(*locale.language, mode);
+  uint8_t* const out_end = lx::end_of(output, size);
   const uint8_t* const end =
       form == Form::kEx && cp.shift_sensitive
-          ? map_codepage(ShiftText{cp, input, input + bytes, output, output + size}, filter, mode)
-          : map_codepage(LeadByteText{cp, input, input + bytes, output, output + size}, filter, mode);
+          ? map_codepage(ShiftText{cp, input, input + bytes, output, out_end}, filter, mode)
+          : map_codepage(LeadByteText{cp, input, input + bytes, output, out_end}, filter, mode);
   return static_cast<size_t>(end - output);
 }
 
@@ -390,7 +391,7 @@ int32_t map_bytes(LXLocale* given, char* output, int32_t size, const char* input
   int32_t chars = lx::chars_in_bytes(cp, work, LX_SHIFT_SINGLE, mapped);
   if (chars > size) {
     chars = size;
-    mapped = lx::bytes_of_chars(cp, work, LX_SHIFT_SINGLE, chars);
+    mapped = lx::bytes_of_chars(cp, work, LX_SHIFT_SINGLE, chars, mapped);
   }
   memcpy(output, work, mapped);
   return call.exit(chars);
@@ -488,9 +489,9 @@ int32_t LXMapStringW(LXLocale* locale, LXWChar* output, int32_t size, const LXWC
     return call.exit(static_cast<int32_t>(copied.units));
   }
   const size_t codes = length < 0 ? lx::units_with_null(input) : static_cast<size_t>(length);
-  const LXWChar* const end =
-      map_codepage(CodeText{codepage_of(call.codepage()), input, input + codes, output, output + size},
-                   SpecialFilter(*call.locale()->language, parsed), parsed);
+  const LXWChar* const end = map_codepage(CodeText{codepage_of(call.codepage()), input, input + codes, output,
+                                                   lx::end_of(output, static_cast<size_t>(size))},
+                                          SpecialFilter(*call.locale()->language, parsed), parsed);
   return call.exit(static_cast<int32_t>(end - output));
 }
 
@@ -507,7 +508,7 @@ int32_t LXMapStringU(LXLocale* locale, LXUChar* output, int32_t size, const LXUC
     return call.exit(static_cast<int32_t>(copied.units));
   }
   const size_t units = length < 0 ? lx::units_with_null(input) : static_cast<size_t>(length);
-  UnicodeText text{input, input + units, output, output + size};
+  UnicodeText text{input, input + units, output, lx::end_of(output, static_cast<size_t>(size))};
   map_unicode(text, SpecialFilter(*call.locale()->language, parsed), parsed);
   return call.exit(static_cast<int32_t>(text.out - output));
 }

@@ -33,6 +33,12 @@ inline size_t least(size_t a, size_t b, size_t c) {
   return least(least(a, b), c);
 }
 
+/// Where an output of `units` units ends; one that is longer than memory ends there.
+template <class Unit>
+inline Unit* end_of(Unit* p, size_t units) {
+  return p + least(units, room(p, no_end<Unit>()));
+}
+
 /// The units of a text before its null, or the length where one is given.
 template <class Unit>
 inline size_t text_units(const Unit* text, int32_t length) {

@@ -74,8 +74,5 @@ LXShiftState state_at(const Reader& in, LXShiftState given) {
   if constexpr (kShifts<Reader>) return in.state;
   return given;
 }
-inline void put_state(LXShiftState* to, LXShiftState state) {
-  if (to != nullptr) *to = state;
-}
 
 }  // namespace lx

@@ -183,7 +183,7 @@ Place<Reader> take_token(Reader* rest, const CharacterSet<Reader>& set) {
 template <class Unit>
 int32_t length_of_rest(const Codepage& cp, const Text<Unit>& rest, size_t units, bool characters) {
   if constexpr (sizeof(Unit) == 1)
-    if (characters) return lx::chars_in_bytes(cp, rest.p, rest.state, units);
+    if (characters) return lx::chars_counted(cp, rest.p, rest.state, units);  // as the next call takes them
   return static_cast<int32_t>(units);
 }
 

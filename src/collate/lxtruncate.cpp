@@ -82,8 +82,7 @@ size_t cut_characters(const Reader& in, const Blanks& blanks, const Words& words
 /// The bytes that the first `chars` characters take, the null being one of them; what follows the null does not
 /// count.
 size_t size_in_bytes(const Codepage& cp, const uint8_t* text, LXShiftState state, size_t bytes, int32_t chars) {
-  if (static_cast<size_t>(chars) > lx::whole_chars(cp, Form::kEx, text, state, bytes, bytes).chars)
-    return bytes + 1;
+  if (chars > lx::chars_counted(cp, text, state, bytes)) return bytes + 1;
   return lx::bytes_of_chars(cp, text, state, chars);
 }
 

@@ -90,6 +90,19 @@ ssize_t read_fully(int descriptor, void* buffer, size_t bytes) {
 
 }  // namespace
 
+namespace lx {
+
+LXFile* open_for_reading(const char* path, int32_t* rc) {
+  struct stat status;
+  if (stat(path, &status) == 0 && S_ISFIFO(status.st_mode)) {
+    *rc = LX_E_OPEN;
+    return nullptr;
+  }
+  return LXOpenFile(globals.area->file_context, path, LX_READ, 0, rc);
+}
+
+}  // namespace lx
+
 extern "C" {
 
 LXFile* LXOpenFile(int32_t, const char* path, int32_t mode, int32_t no_temporary, int32_t* rc) {

@@ -5,10 +5,8 @@
 
 namespace lx {
 
-/// Opens for reading through the global area's file context.
-inline LXFile* open_for_reading(const char* path, int32_t* rc) {
-  return LXOpenFile(globals.area->file_context, path, LX_READ, 0, rc);
-}
+/// Opens for reading through the global area's file context. A pipe, which would wait for a writer, is refused.
+LXFile* open_for_reading(const char* path, int32_t* rc);
 
 /// Closes a file when its scope ends.
 class FileCloser {

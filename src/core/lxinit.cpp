@@ -21,6 +21,14 @@ void drop_area() {
   release(area->context, area);
 }
 
+/// The new count of uses. Other threads read it without the lock.
+uint32_t add_to_count(int32_t uses) {
+  lx::GlobalArea* area = lx::globals.area;
+  const uint32_t count = area->init_count + static_cast<uint32_t>(uses);
+  __atomic_store_n(&area->init_count, count, __ATOMIC_RELAXED);
+  return count;
+}
+
 /// Creates the area, or takes the one that a failed initialisation left, unless other hooks own that one.
 bool create_area(LXAllocHook allocate, LXFreeHook release, void* context) {
   if (lx::globals.area != nullptr) {
@@ -72,8 +80,8 @@ int32_t LXInit(const char* directory, LXAllocHook allocate, LXFreeHook release, 
   lx::Events events(unit);
   if (lx::initialized()) {
     lx::GlobalLock lock;
-    ++lx::globals.area->init_count;
-    LX_TRACE(unit, RAS1_LEVEL_DETAIL, "Lexicor init count = %d", lx::globals.area->init_count);
+    const uint32_t count = add_to_count(1);
+    LX_TRACE(unit, RAS1_LEVEL_DETAIL, "Lexicor init count = %d", static_cast<int>(count));
     return events.exit(LX_OK);
   }
   if (allocate == nullptr) allocate = LXDefAlloc;
@@ -81,7 +89,7 @@ int32_t LXInit(const char* directory, LXAllocHook allocate, LXFreeHook release, 
   if (!create_area(allocate, release, context)) return events.exit(LX_E_MEMORY);
 
   lx::GlobalArea* area = lx::globals.area;
-  LX_TRACE(unit, RAS1_LEVEL_DETAIL, "Lexicor init count = %d", area->init_count);
+  LX_TRACE(unit, RAS1_LEVEL_DETAIL, "Lexicor init count = %d", 0);
   BSS1_InitializeLock(&area->lock);
   int32_t result = LX_OK;
   {
@@ -95,7 +103,7 @@ int32_t LXInit(const char* directory, LXAllocHook allocate, LXFreeHook release, 
     if (manager != nullptr) {
       if (rc != LX_OK) result = LX_W_DEFAULTS;
       area->manager = manager;
-      ++area->init_count;
+      add_to_count(1);
     } else {
       area->file_context = 0;
       result = LX_E_NOT_INITIALIZED;
@@ -115,7 +123,7 @@ int32_t LXTerm(void) {
   {
     lx::GlobalLock lock;
     if (area->init_count > 1) {
-      --area->init_count;
+      add_to_count(-1);
       return events.exit(LX_OK);
     }
   }
@@ -130,7 +138,7 @@ int32_t LXTerm(void) {
   const int32_t rc = LXTermObjManager(manager);
   if (result == LX_OK) result = rc;
   area->file_context = 0;
-  area->init_count = 0;
+  add_to_count(-1);
   BSS1_DestroyLock(&area->lock);
   drop_area();
   return events.exit(result);

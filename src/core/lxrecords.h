@@ -35,6 +35,12 @@ enum ObjectFlag : uint8_t {
   kObjectOwned0 = 0x02,   // section n was allocated, not loaded by LXLoadFile
 };
 
+/// Unicode texts that a locale no longer uses. Callers may, so that they stay until the locale is released.
+struct ReplacedTexts {
+  ReplacedTexts* next;
+  LXUChar* texts[8];
+};
+
 struct AliasRecord {
   AliasRecord* next;
   char codepage[33];
@@ -68,6 +74,7 @@ struct LXLocale {
   LXUChar separators_unicode[5];
   LXUChar* texts_unicode[8];  // the texts
   int32_t last_error;
+  lx::ReplacedTexts* replaced;  // by changes of territory
 };
 
 namespace lx {
@@ -80,8 +87,8 @@ enum LocaleFlag : uint16_t {
 
 /// The one global area: one block from the allocation hook of the first LXInit.
 struct GlobalArea {
-  void* context;  // handed to both hooks
-  uint16_t init_count;
+  void* context;        // handed to both hooks
+  uint32_t init_count;  // written under the lock; every call reads it
   BSS1_Lock lock;
   int32_t file_context;  // 1 while initialised; first argument of every LXOpenFile
   LXObjManager* manager;
@@ -101,7 +108,7 @@ extern Globals globals;
 
 inline bool initialized() {
   const GlobalArea* area = globals.area;
-  return area != nullptr && area->init_count != 0;
+  return area != nullptr && __atomic_load_n(&area->init_count, __ATOMIC_RELAXED) != 0;
 }
 
 /// Whether files may be opened: also by the initialisation itself.

@@ -80,7 +80,7 @@ Written write_text(const Codepage& cp, NumberUnit<kForm>* p, size_t room, LXShif
     lx::close_text(out);
     return Written{static_cast<size_t>(out.p - p), all};
   };
-  NumberUnit<kForm>* const end = p + room;
+  NumberUnit<kForm>* const end = lx::end_of(p, room);
   if constexpr (kForm == NumberForm::kUnicode) {
     return run(lx::UnicodeWriter{p, end});
   } else if constexpr (kForm == NumberForm::kCodes) {

@@ -32,11 +32,11 @@ struct TimeText {
   }
   static Writer write(const Codepage& cp, Unit* p, size_t units, LXShiftState state = LX_SHIFT_SINGLE) {
     if constexpr (kUnicode)
-      return {p, p + units};
+      return {p, end_of(p, units)};
     else if constexpr (kShift)
-      return {cp, p, p + units, state};
+      return {cp, p, end_of(p, units), state};
     else
-      return {cp, p, p + units};
+      return {cp, p, end_of(p, units)};
   }
 };
 using UnicodeTime = TimeText<UnicodeReader, UnicodeWriter>;

@@ -198,7 +198,7 @@ int32_t get_text(LXLocale* given, int32_t number, Unit* buffer, int32_t size, in
 
   const bool by_chars = sizeof(Unit) == 1 && (flags & LX_CHARACTERS) != 0;
   const size_t most = static_cast<size_t>(from.one_unit && size > 2 ? 2 : size) - 1;  // without the null
-  Unit* const end = by_chars ? lx::no_end<Unit>() : buffer + most;
+  Unit* const end = by_chars ? lx::no_end<Unit>() : lx::end_of(buffer, most);
   int32_t written = 0;
   int32_t rc = LX_OK;
   const bool read = read_text<kDirect>(locale, from, form, &rc, [&](auto in, auto value) {

@@ -221,6 +221,12 @@ bool free_locale(LXLocale* locale) {
   bool freed = true;
   for (char* text : locale->texts) freed &= hook_free(text);
   for (LXUChar* text : locale->texts_unicode) freed &= hook_free(text);
+  for (ReplacedTexts* replaced = locale->replaced; replaced != nullptr;) {
+    for (LXUChar* text : replaced->texts) freed &= hook_free(text);
+    ReplacedTexts* const next = replaced->next;
+    freed &= hook_free(replaced);
+    replaced = next;
+  }
   freed &= hook_free(locale);
   return freed;
 }

@@ -167,12 +167,18 @@ int32_t set_modifiable(LXLocale* locale) {
 }
 
 int32_t change_territory(LXLocale* locale, LXObject* land) {
+  HookPtr<ReplacedTexts> replaced(static_cast<ReplacedTexts*>(hook_allocate_zeroed(sizeof(ReplacedTexts))));
+  if (!replaced) return LX_E_MEMORY;
   LXLocale saved = *locale;
   locale->territory = land;
   const int32_t code = set_modifiable(locale);
   if (code == LX_OK) {
     // The replaced Unicode texts are not freed; callers rely on their staying where they are.
     LXLocaleFreeOldText(*locale, saved);
+    for (size_t i = 0; i < kTexts; ++i)
+      if (locale->texts_unicode[i] != saved.texts_unicode[i]) replaced->texts[i] = saved.texts_unicode[i];
+    replaced->next = locale->replaced;
+    locale->replaced = replaced.detach();
     return LX_OK;
   }
   LXLocaleFreeOldText(saved, *locale);
@@ -203,7 +209,7 @@ extern "C" {
 int32_t LXLocaleSetModifiable(LXLocale* given) {
   Call call(unit, given);
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, LX_E_NOT_INITIALIZED);
-  const int32_t code = lx::set_modifiable(call.locale());
+  const int32_t code = lx::change_territory(call.locale(), call.locale()->territory);
   return call.fail(code, code);
 }
 

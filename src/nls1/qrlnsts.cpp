@@ -211,11 +211,12 @@ Outcome write_target(const Request& request, Body body) {
   const Side& target = request.target;
   if (target.cp == nullptr) {
     LXUChar* const units = static_cast<LXUChar*>(request.output);
-    return body(lx::UnicodeWriter{units, request.characters ? lx::no_end<LXUChar>() : units + request.size});
+    return body(
+        lx::UnicodeWriter{units, request.characters ? lx::no_end<LXUChar>() : lx::end_of(units, request.size)});
   }
   uint8_t* const bytes = static_cast<uint8_t*>(request.output);
   return lx::write_bytes(*target.cp, target.form(), LX_SHIFT_SINGLE, bytes,
-                         request.characters ? lx::no_end<uint8_t>() : bytes + request.size, body);
+                         request.characters ? lx::no_end<uint8_t>() : lx::end_of(bytes, request.size), body);
 }
 
 void trace_path(const Side& source, const Side& target) {

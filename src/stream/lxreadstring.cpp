@@ -163,8 +163,7 @@ int32_t read_string(LXStream* stream, LXLocale* given, Form form, Unit* output, 
   const size_t given_room = size > 0 ? static_cast<size_t>(size) : 0;
   const size_t nulls = (flags & LX_TERMINATE) != 0 && given_room != 0 ? 1 : 0;
   const size_t most = given_room - nulls;
-  Unit* const end =
-      by_chars ? lx::no_end<Unit>() : output + lx::least(most, lx::room(output, lx::no_end<Unit>()));
+  Unit* const end = by_chars ? lx::no_end<Unit>() : lx::end_of(output, most);
   return with_writer(cp, form, output, end, [&](const auto& out) {
     Line line(cp, *stream, out, most, flags);
     const int32_t code = line.read();

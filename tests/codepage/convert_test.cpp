@@ -316,13 +316,22 @@ TEST(ConvertAscii, ReadingDiffersFromWriting) {
   yen.file.id = 9300;
   yen.file.name = "TINY-YEN";
   yen.file.sections[0][778 + 2 * 0x5C] = 0xA5;  // 0x5C is U+00A5; U+005C becomes 0x5C
-  TinyLibrary library({yen});
+  TinyCodepage low_lead = lx::test::tiny_shift_jis();
+  low_lead.file.sections[0][10 + 0x7E] = 2;  // U+007E becomes 0x7E, which begins a character
+  TinyLibrary library({yen, low_lead});
   const std::string run(20, 'x');
   const std::string text = run + "\x5C" + run + "~a" + run;
   std::vector<LXUChar> expected(text.begin(), text.end()), units(text.size());
   expected[20] = 0xA5;
   const int32_t length = static_cast<int32_t>(text.size());
   EXPECT_EQ(LXStringToUnicode(units.data(), length, library.locale(yen), text.data(), length, 0), length);
+  EXPECT_EQ(units, expected);
+  expected[20] = 0x5C;
+  expected[41] = 0xFFFD;
+  expected.erase(expected.begin() + 42);
+  EXPECT_EQ(LXStringToUnicode(units.data(), length, library.locale(low_lead), text.data(), length, 0),
+            length - 1);
+  units.pop_back();
   EXPECT_EQ(units, expected);
   EXPECT_TRUE(library.close());
 }

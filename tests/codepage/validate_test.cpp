@@ -243,12 +243,6 @@ TEST_F(Validate, Refused) {
       {"a null is no U+0000", tiny_single, [](S& s) { set_word(s, fmt::kUnicode, 'A'); }},
       {"a null begins a character", tiny_shift_jis, [](S& s) { payload(s)[fmt::kLengths] = 2; }},
       {"a code above the width", tiny_single, [](S& s) { set_code(s, 5, fmt::kKindWord, 0x8140); }},
-      {"a lead byte as a code", tiny_shift_jis, [](S& s) { set_code(s, 5, fmt::kKindByte, 0x81); }},
-      {"two bytes without a lead byte", tiny_shift_jis, [](S& s) { set_code(s, 5, fmt::kKindWord, 0x4141); }},
-      {"a length below the codes", tiny_euc, [](S& s) { payload(s)[fmt::kLengths + 0x8F] = 1; }},
-      {"a shift byte as a code", tiny_shift, [](S& s) { set_code(s, 5, fmt::kKindByte, 0x0E); }},
-      {"a shift byte in front", tiny_shift, [](S& s) { set_code(s, 5, fmt::kKindWord, 0x0F41); }},
-      {"one byte to shift out and in", tiny_shift, [](S& s) { payload(s)[fmt::kShiftIn] = 0x0E; }},
       {"a lead byte to substitute", tiny_shift_jis, [](S& s) { payload(s)[fmt::kSubstitution] = 0x81; }},
       {"a digit begins a character", tiny_shift_jis, [](S& s) { payload(s)[fmt::kLengths + '7'] = 2; }},
       {"a sign shifts", tiny_shift, [](S& s) { payload(s)[fmt::kShiftOut] = 0x60; }},
@@ -358,6 +352,12 @@ TEST_F(Validate, NotRefused) {
          const uint8_t leaf[] = {7, 0x00, 0, 0xFF, 0, 0};
          std::copy_n(leaf, 6, node(s, 0));
        }},
+      {"a lead byte as a code", tiny_shift_jis, [](S& s) { set_code(s, 5, fmt::kKindByte, 0x81); }},
+      {"two bytes without a lead byte", tiny_shift_jis, [](S& s) { set_code(s, 5, fmt::kKindWord, 0x4141); }},
+      {"a shift byte as a code", tiny_shift, [](S& s) { set_code(s, 5, fmt::kKindByte, 0x0E); }},
+      {"a shift byte in front", tiny_shift, [](S& s) { set_code(s, 5, fmt::kKindWord, 0x0F41); }},
+      {"one byte to shift out and in", tiny_shift, [](S& s) { payload(s)[fmt::kShiftIn] = 0x0E; }},
+      {"a longer walk from a single byte", tiny_euc, [](S& s) { payload(s)[fmt::kLengths + 0x8F] = 1; }},
       {"a short walk", tiny_euc, [](S& s) { std::copy_n(child(s, 0xA4), fmt::kNodeBytes, child(s, 0x8F)); }},
       {"bytes behind everything", tiny_shift_jis,
        [](S& s) {

@@ -241,10 +241,13 @@ int open_sink() {
   if (path[0] == '\0' || strcmp(path, "stderr") == 0) return sink = STDERR_FILENO;
   if (strcmp(path, "stdout") == 0) return sink = STDOUT_FILENO;
   // For the owner only: a trace shows the texts that the program works on.
-  sink = open(path, O_WRONLY | O_APPEND | O_CREAT | O_CLOEXEC | O_NOCTTY, 0600);
+  // A pipe without a reader is refused in place of waiting for one.
+  sink = open(path, O_WRONLY | O_APPEND | O_CREAT | O_CLOEXEC | O_NOCTTY | O_NONBLOCK, 0600);
   if (sink < 0) {
     report_file(path, strerrordesc_np(errno));
     sink = STDERR_FILENO;
+  } else {
+    fcntl(sink, F_SETFL, O_APPEND);
   }
   return sink;
 }
