@@ -341,6 +341,11 @@ TEST_F(Map, CodepageDoors) {
   EXPECT_EQ(LXCpFullToHalfW(cp, 0x84A0), 0x8440u);
   EXPECT_EQ(LXCpFullToHalfW(cp, 0x8260), 'A');
   EXPECT_EQ(LXCpFullToHalfW(library_.object(lx::test::tiny_single()), 0x8260), 0u);
+  LXLocale* const in = library_.locale(lx::test::tiny_single());
+  const LXWChar given[] = {'a', 0x8140, 0};
+  LXWChar mapped[3] = {};
+  EXPECT_EQ(LXMapStringW(in, mapped, 3, given, 2, LX_MAP_UPPER_SIMPLE), 2);
+  EXPECT_EQ(mapped[1], 0x8140u) << "what the codepage has not is copied";
 }
 
 TEST_F(Map, RefusedCallsTouchNothing) {

@@ -1,6 +1,7 @@
 // The object manager: where the control file is searched, look-ups by name and identifier, loading, and the
 // built-in data that stand in.
 #include <strings.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -309,11 +310,12 @@ class LoadFailure : public ObjManTest {
     if (how == 4) put_le32(content.data() + format::header_section_offset(0), 0xFFFFFFFF);
     std::filesystem::remove(directory.file(object.file));
     if (how == 5) std::filesystem::create_directory(directory.file(object.file));
+    if (how == 6) mkfifo(directory.file(object.file).c_str(), 0600);  // does not wait for a writer
     if (how >= 1 && how <= 4) directory.write(object.file, content);
   }
-  static constexpr int32_t kCodes[] = {LX_E_FILE_NOT_FOUND, LX_E_CORRUPT, LX_E_FILE_IO,
-                                       LX_E_CORRUPT,        LX_E_FILE_IO, LX_E_FILE_IO};
-  static constexpr int kDamages = 6;
+  static constexpr int32_t kCodes[] = {LX_E_FILE_NOT_FOUND, LX_E_CORRUPT, LX_E_FILE_IO, LX_E_CORRUPT,
+                                       LX_E_FILE_IO,        LX_E_FILE_IO, LX_E_OPEN};
+  static constexpr int kDamages = 7;
 };
 
 TEST_F(LoadFailure, BuiltInDataStandInAndTheCodeIsKept) {
