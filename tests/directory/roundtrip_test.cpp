@@ -203,7 +203,12 @@ TEST_P(EveryCodepage, LongTextsConvertAsTheirCharacters) {
   }
 }
 
-/// Every value that the source does not map becomes the substitution byte, and every single byte U+FFFD.
+bool is_control(uint32_t u) {
+  return u < 0x20 || (u >= 0x7F && u <= 0x9F);
+}
+
+/// Every value that the source does not map becomes the question mark, and every single byte U+FFFD. No
+/// graphic character becomes a control.
 TEST_P(EveryCodepage, HasNothingBesides) {
   if (codepage().source.utf8) return;
   const LocalePtr locale = locale_with(codepage().source.name);
@@ -214,9 +219,11 @@ TEST_P(EveryCodepage, HasNothingBesides) {
     if (mapping.precision != 1 && mapping.bytes == 1) byte_mapped[mapping.code] = true;
   }
   const std::string substitution(1, static_cast<char>(codepage().source.substitution));
+  EXPECT_EQ(to_unicode(locale.get(), substitution), Units{'?'});
   for (uint32_t u = 0; u <= 0xFFFF; ++u) {
-    if (mapped[u]) continue;
-    ASSERT_EQ(from_unicode(locale.get(), {static_cast<LXUChar>(u)}), substitution) << u;
+    const std::string bytes = from_unicode(locale.get(), {static_cast<LXUChar>(u)});
+    ASSERT_TRUE(mapped[u] || bytes == substitution) << u;
+    ASSERT_FALSE(!is_control(u) && is_control(to_unicode(locale.get(), bytes).at(0))) << u;
   }
   for (uint32_t b = 0; b <= 0xFF; ++b) {
     const bool shift_byte = codepage().shift() && (b == lexicor_data::kShiftOut || b == lexicor_data::kShiftIn);
@@ -246,6 +253,11 @@ TEST(Directory, HasTheCodepagesThatEverybodyAsksFor) {
   for (const ShippedCodepage& codepage : shipped_codepages()) shipped[codepage.source.name] = codepage.id;
   EXPECT_GE(shipped.size(), 100u);
   for (const auto& [name, id] : known) EXPECT_EQ(shipped[name], id) << name;
+
+  // No shipped table has all that IBM's form of JapanEUC has.
+  const Library library(LEXICOR_LOCALE_DIR);
+  EXPECT_STREQ(LXGetCodepageFromAlias(nullptr, "eucjp"), "JapanEUC");
+  EXPECT_EQ(LXGetCodepageFromAlias(nullptr, "ibm-eucjp"), nullptr);
 }
 
 TEST(Utf8, BytesThatBeginNoCharacterAreOneByteWithoutAValue) {

@@ -6,6 +6,8 @@
 #include <stdexcept>
 #include <tuple>
 
+#include "same_sign.h"
+
 namespace lexicor_import {
 namespace {
 
@@ -17,6 +19,7 @@ using lexicor_data::Mapping;
 
 constexpr size_t kMaxCodeBytes = 4;
 constexpr uint32_t kCodePoints = 0x110000;
+constexpr size_t kRangeOfBytes = 2;  // where the dash stands in "F9-FC"
 constexpr uint32_t kNone = 0xFFFFFFFF;
 
 /// A packed code with its length, as a key: codes of different lengths never meet.
@@ -31,6 +34,10 @@ struct Code {
 
 uint32_t first_byte(Code code) {
   return code.bytes == 0 ? kNone : code.packed >> (8 * (code.bytes - 1));
+}
+
+bool is_private(uint32_t unicode) {
+  return unicode >= 0xE000 && unicode <= 0xF8FF;
 }
 
 Code pack(const Bytes& bytes) {
@@ -52,6 +59,8 @@ class Import {
     set_family();
     straighten_controls();
     for (const std::string& word : words(codepage.overrides)) apply_override(word);
+    drop_other_signs();
+    set_substitution();
     set_line_ends();
     write_mappings();
     return std::move(source_);
@@ -158,13 +167,10 @@ class Import {
     if (!source_.ascii && (byte_of('0') != 0xF0 || byte_of('-') != 0x60)) {
       throw std::runtime_error("neither ASCII-based nor EBCDIC");
     }
-    const int own = converter_.substitution();
-    source_.substitution = own >= 0 ? static_cast<uint8_t>(own) : source_.ascii ? 0x3F : 0x6F;
   }
 
   void straighten_controls() {
     if (!source_.ascii) return;
-    const uint32_t substitute = value_of(source_.substitution);
     bool changed = false;
     for (uint32_t byte = 0; byte <= 0x7F; byte = byte == 0x1F ? 0x7F : byte + 1) {
       if (value_of(byte) == byte && byte_of(byte) == byte) continue;
@@ -172,26 +178,34 @@ class Import {
       from_unicode_[byte] = {byte, 1};
       changed = true;
     }
-    if (!changed) return;
-    source_.source += "; controls as in ASCII";
-    if (substitute != kNone && byte_of(substitute) != kNone) {
-      source_.substitution = static_cast<uint8_t>(byte_of(substitute));
+    if (changed) source_.source += "; controls as in ASCII";
+  }
+
+  /// Of the mappings from Unicode alone, leaves those of the sign that the code reads as.
+  void drop_other_signs() {
+    for (auto at = from_unicode_.begin(); at != from_unicode_.end();) {
+      const auto read = to_unicode_.find(at->second);
+      const bool same = read != to_unicode_.end() && is_same_sign(at->first, read->second);
+      at = same ? std::next(at) : from_unicode_.erase(at);
     }
   }
 
   void apply_override(const std::string& word) {
     source_.source += "; " + word;
+    if (word == "assigned") return read_as_assigned();
     const size_t sign = word.find_first_of("=>");
     if (sign == std::string::npos) throw std::runtime_error("override " + word + " says nothing");
     const std::string left = word.substr(0, sign), right = word.substr(sign + 1);
-    if (left.find('-') != std::string::npos) {
-      prefer(hex(left.substr(0, 2)), hex(left.substr(3)), hex(right));
+    const size_t dash = left.find('-');
+    const uint32_t first = hex(left.substr(0, dash)), last = hex(left.substr(dash + 1));
+    if (dash == kRangeOfBytes) {
+      prefer(first, last, hex(right));
     } else if (word[sign] == '>') {
-      from_unicode_[hex(left)] = {hex(right), static_cast<uint8_t>(right.size() / 2)};
-    } else if (left == "sub") {
-      source_.substitution = static_cast<uint8_t>(hex(right));
+      const auto bytes = static_cast<uint8_t>(right.size() / 2);
+      for (uint32_t unicode = first; unicode <= last; ++unicode)
+        from_unicode_[unicode] = {hex(right) + unicode - first, bytes};
     } else {
-      replace({hex(left), 1}, right == "none" ? kNone : hex(right));
+      replace({first, static_cast<uint8_t>(left.size() / 2)}, right == "none" ? kNone : hex(right));
     }
   }
 
@@ -208,17 +222,29 @@ class Import {
     }
   }
 
-  /// Maps a code and a code point to each other only, or the code to nothing.
+  /// A code that reads as a private-use value, and as which a character is written, reads as this character.
+  void read_as_assigned() {
+    for (const auto& [unicode, code] : from_unicode_) {
+      const auto read = to_unicode_.find(code);
+      if (read != to_unicode_.end() && is_private(read->second) && !is_private(unicode)) read->second = unicode;
+    }
+  }
+
+  /// Maps a code and a code point to each other, or the code to nothing.
   void replace(Code code, uint32_t unicode) {
     for (auto at = from_unicode_.begin(); at != from_unicode_.end();) {
       at = at->second == code ? from_unicode_.erase(at) : std::next(at);
     }
-    for (auto at = to_unicode_.begin(); at != to_unicode_.end();) {
-      at = at->first == code || at->second == unicode ? to_unicode_.erase(at) : std::next(at);
-    }
+    to_unicode_.erase(code);
     if (unicode == kNone) return;
     to_unicode_[code] = unicode;
     from_unicode_[unicode] = code;
+  }
+
+  void set_substitution() {
+    source_.substitution = source_.ascii ? 0x3F : 0x6F;
+    if (value_of(source_.substitution) != '?' || byte_of('?') != source_.substitution)
+      throw std::runtime_error("the question mark is not that of its family");
   }
 
   void set_line_ends() {

@@ -12,15 +12,20 @@
 // bytes 3 and 4 repeat the line feed, 0A 0D 0A 0A. In EBCDIC byte 3 is the code of the next-line control, which
 // its text files are made of: 25 0D 15 25.
 //
-// The substitution is the converter's own where it is one byte, else "?" of the codepage's family, 3F or 6F.
+// The substitution is the question mark, 3F in ASCII-based codepages and 6F in EBCDIC, whatever the converter
+// has: 1A ends a file for many readers.
 //
 // Controls: tables of the DOS family put U+001A, U+001C and U+007F at each other's bytes, after the controls of
 // a terminal. In every ASCII-based source 00 to 1F and 7F stand for themselves, as in all other systems'
-// tables; the substitution moves along with its character.
+// tables.
 //
-// Overrides, by words: "sub=HH" sets the substitution; "HH=XXXX" maps a byte and a code point to each other and
-// to nothing else; "HH=none" takes the byte's mappings out; "XXXX>HH.." maps a code point one way to a code;
-// "HH-HH>HH" writes characters by their codes that begin with the last byte instead of those in the range.
+// Of the mappings from Unicode alone only those stay whose code reads as the same sign (same_sign.h); those of
+// the overrides too.
+//
+// Overrides, by words: "HH..=XXXX" maps a code and a code point to each other; "HH=none" takes the byte's
+// mappings out; "XXXX>HH.." maps a code point to a code, and "XXXX-XXXX>HH.." each to the next code; "HH-HH>HH"
+// writes characters by their codes that begin with the last byte instead of those in the range; "assigned"
+// reads codes as the characters that are written so instead of private-use values.
 #pragma once
 
 #include <map>

@@ -13,7 +13,6 @@ namespace lexicor_import {
 namespace {
 
 constexpr int kMaxUnits = 16;  // code points or bytes that one character can give
-constexpr uint32_t kLatin1End = 0x100;
 
 class IcuConverter : public Converter {
  public:
@@ -26,7 +25,7 @@ class IcuConverter : public Converter {
     }
     ucnv_setFallback(converter_, true);
     ucnv_setToUCallBack(converter_, UCNV_TO_U_CALLBACK_STOP, nullptr, nullptr, nullptr, &error);
-    stop_on_unassigned();
+    ucnv_setFromUCallBack(converter_, UCNV_FROM_U_CALLBACK_STOP, nullptr, nullptr, nullptr, &error);
   }
   ~IcuConverter() override { ucnv_close(converter_); }
 
@@ -47,41 +46,6 @@ class IcuConverter : public Converter {
 
   Bytes encode(uint32_t unicode) override {
     UErrorCode error = U_ZERO_ERROR;
-    return encode(unicode, error);
-  }
-
-  /// ICU writes <subchar1> for unassigned code points below U+0100 and <subchar> for others. There is no call
-  /// for the former, so it is seen on a code point that is not assigned.
-  int substitution() override {
-    UErrorCode error = U_ZERO_ERROR;
-    ucnv_setFromUCallBack(converter_, UCNV_FROM_U_CALLBACK_SUBSTITUTE, nullptr, nullptr, nullptr, &error);
-    int found = -1;
-    for (uint32_t unicode = kLatin1End - 1; unicode >= 0x80 && found < 0; --unicode) {
-      stop_on_unassigned();
-      if (!encode(unicode).empty()) continue;
-      ucnv_setFromUCallBack(converter_, UCNV_FROM_U_CALLBACK_SUBSTITUTE, nullptr, nullptr, nullptr, &error);
-      const Bytes bytes = encode(unicode);
-      if (bytes.size() == 1) found = bytes[0];
-    }
-    stop_on_unassigned();
-    if (found >= 0) return found;
-    char bytes[kMaxUnits];
-    int8_t length = sizeof bytes;
-    error = U_ZERO_ERROR;
-    ucnv_getSubstChars(converter_, bytes, &length, &error);
-    return U_SUCCESS(error) && length == 1 ? static_cast<uint8_t>(bytes[0]) : -1;
-  }
-
-  bool is_shift_stateful() const override { return ucnv_getType(converter_) == UCNV_EBCDIC_STATEFUL; }
-  std::string description() const override { return "ICU " U_ICU_VERSION " " + name_; }
-
- private:
-  void stop_on_unassigned() {
-    UErrorCode error = U_ZERO_ERROR;
-    ucnv_setFromUCallBack(converter_, UCNV_FROM_U_CALLBACK_STOP, nullptr, nullptr, nullptr, &error);
-  }
-
-  Bytes encode(uint32_t unicode, UErrorCode& error) {
     UChar units[2];
     int32_t count = 0;
     U16_APPEND_UNSAFE(units, count, static_cast<UChar32>(unicode));
@@ -91,6 +55,10 @@ class IcuConverter : public Converter {
     return Bytes(bytes, bytes + length);
   }
 
+  bool is_shift_stateful() const override { return ucnv_getType(converter_) == UCNV_EBCDIC_STATEFUL; }
+  std::string description() const override { return "ICU " U_ICU_VERSION " " + name_; }
+
+ private:
   std::string name_;
   UConverter* converter_ = nullptr;
 };
@@ -126,7 +94,6 @@ class IconvConverter : public Converter {
     return Bytes(out, out + result.bytes);
   }
 
-  int substitution() override { return -1; }
   bool is_shift_stateful() const override { return false; }
   std::string description() const override {
     return std::string("glibc ") + gnu_get_libc_version() + " " + name_;

@@ -28,8 +28,6 @@ class Converter {
   virtual Decoding decode(const Bytes& bytes, uint32_t& unicode) = 0;
   /// The bytes of a code point, fallbacks included, with shift bytes; empty when there are none.
   virtual Bytes encode(uint32_t unicode) = 0;
-  /// The one-byte substitution, or -1 where the converter has none of that length.
-  virtual int substitution() = 0;
   virtual bool is_shift_stateful() const = 0;
   /// The system, its version and the table, for the source's header.
   virtual std::string description() const = 0;
