@@ -1,6 +1,7 @@
 // Every shipped language and territory, read from the compiled objects through the library, against ICU's own
-// services: names, symbols, currencies, case mapping, and numbers, amounts, dates and times written out. What
-// differs must be what locale_differences.txt lists, each line with its reason.
+// services: codes, names, the territory where most speakers live, symbols, currencies, case mapping, and
+// numbers, amounts, dates and times written out. What differs must be what locale_differences.txt lists, each
+// line with its reason.
 #include <gtest/gtest.h>
 #include <unicode/uchar.h>
 #include <unicode/ucurr.h>
@@ -140,8 +141,9 @@ class Differences {
   ListedDifferences found_;
 };
 
-/// The letters of a language that have case, a blank behind each.
-Text letters_of(const char* locale) {
+/// The letters of a language that have case: alone and with a dot above, or as the ends of words and of
+/// clauses.
+Text letters_of(const char* locale, bool alone) {
   UErrorCode error = U_ZERO_ERROR;
   const IcuPtr<ULocaleData, ulocdata_close> data(ulocdata_open(locale, &error));
   const IcuPtr<USet, uset_close> set(
@@ -150,7 +152,8 @@ Text letters_of(const char* locale) {
   for (UChar32 value = 0x21; value <= 0xFFFF; ++value) {
     if (!uset_contains(set.get(), value) || !u_hasBinaryProperty(value, UCHAR_CHANGES_WHEN_CASEMAPPED))
       continue;
-    (letters += static_cast<char16_t>(value)) += u' ';
+    const Text letter(1, static_cast<char16_t>(value)), two = letter + letter;
+    letters += alone ? letter + u" " + letter + u"\u0307 " : two + u" " + two + u", ";
   }
   return letters;
 }
@@ -164,7 +167,7 @@ Text mapped(const Items& items, uint32_t mode, const Text& text) {
 }
 
 void compare_language(const lexicor_import::Language& row, Differences* differences) {
-  const Items items(std::string(row.name) + "_" + row.territory);
+  const Items items(row.name);
   const auto compare = [&](const char* item, const Text& ours, const Text& theirs) {
     differences->compare(row.name, item, ours, theirs);
   };
@@ -175,6 +178,14 @@ void compare_language(const lexicor_import::Language& row, Differences* differen
     return all;
   };
   UErrorCode error = U_ZERO_ERROR;
+  char code[ULOC_LANG_CAPACITY] = {}, likely[ULOC_FULLNAME_CAPACITY] = {};
+  uloc_getLanguage(row.locale, code, sizeof code, &error);
+  uloc_addLikelySubtags(row.locale, likely, sizeof likely, &error);
+  std::transform(code, std::end(code), code,
+                 [](char c) { return c == '\0' ? c : static_cast<char>(c & ~0x20); });
+  compare("abbreviation", items.text(LX_ITEM_LANGUAGE_ABBREVIATION), widen(std::string(code)));
+  compare("territory", items.text(LX_ITEM_TERRITORY_ABBREVIATION),
+          widen(std::string(uloc_getISO3Country(likely))));
   const IcuPtr<ULocaleDisplayNames, uldn_close> names(uldn_open(row.locale, ULDN_DIALECT_NAMES, &error));
   compare("name", items.text(LX_ITEM_LANGUAGE_NAME), icu(uldn_localeDisplayName, names.get(), row.locale));
   compare("days", items.texts(LX_ITEM_DAY, 7), symbols(UDAT_WEEKDAYS, 1, 7));
@@ -183,15 +194,19 @@ void compare_language(const lexicor_import::Language& row, Differences* differen
   compare("short_months", items.texts(LX_ITEM_SHORT_MONTH, 13), symbols(UDAT_SHORT_MONTHS, 0, 12) + u'|');
   compare("markers", items.texts(LX_ITEM_MORNING, 2), symbols(UDAT_AM_PMS, 0, 2));
 
-  const Text text = letters_of(row.locale) + items.texts(LX_ITEM_DAY, 7) + items.texts(LX_ITEM_MONTH, 12);
-  const auto peer = [&](auto function) {
+  const auto peer = [&](const Text& text, auto function) {
     const auto units = static_cast<int32_t>(text.size());
     return icu([&](UChar* out, int32_t room, UErrorCode* status) {
       return function(out, room, text.data(), units, row.locale, status);
     });
   };
-  compare("upper", mapped(items, LX_MAP_UPPER, text), peer(u_strToUpper));
-  compare("lower", mapped(items, LX_MAP_LOWER, text), peer(u_strToLower));
+  const Text words =
+      letters_of(row.locale, false) + items.texts(LX_ITEM_DAY, 7) + items.texts(LX_ITEM_MONTH, 12);
+  const Text letters = letters_of(row.locale, true);
+  compare("upper", mapped(items, LX_MAP_UPPER, words), peer(words, u_strToUpper));
+  compare("lower", mapped(items, LX_MAP_LOWER, words), peer(words, u_strToLower));
+  compare("upper_letters", mapped(items, LX_MAP_UPPER, letters), peer(letters, u_strToUpper));
+  compare("lower_letters", mapped(items, LX_MAP_LOWER, letters), peer(letters, u_strToLower));
 }
 
 void compare_territory(const lexicor_import::Territory& row, Differences* differences) {
@@ -205,7 +220,9 @@ void compare_territory(const lexicor_import::Territory& row, Differences* differ
   const NumberPtr numbers(unum_open(UNUM_DECIMAL, nullptr, 0, locale.c_str(), nullptr, &error));
   const NumberPtr amounts(unum_open(UNUM_CURRENCY, nullptr, 0, locale.c_str(), nullptr, &error));
   unum_setAttribute(numbers.get(), UNUM_MINIMUM_GROUPING_DIGITS, UNUM_MINIMUM_GROUPING_DIGITS_AUTO);
-  const Text currency = icu(ucurr_forLocale, locale.c_str());
+  const Text currency = items.text(LX_ITEM_INTERNATIONAL_CURRENCY);
+  unum_setTextAttribute(amounts.get(), UNUM_CURRENCY_CODE, currency.c_str(), -1, &error);
+  const Text digits = widen(std::to_string(ucurr_getDefaultFractionDigits(currency.c_str(), &error)));
   const struct {
     const char* name;
     int32_t item;
@@ -221,11 +238,11 @@ void compare_territory(const lexicor_import::Territory& row, Differences* differ
        icu(unum_getSymbol, amounts.get(), UNUM_MONETARY_GROUPING_SEPARATOR_SYMBOL)},
       {"negative", LX_ITEM_NEGATIVE_SIGN, icu(unum_getSymbol, amounts.get(), UNUM_MINUS_SIGN_SYMBOL)},
       {"symbol", LX_ITEM_CURRENCY, icu(unum_getSymbol, amounts.get(), UNUM_CURRENCY_SYMBOL)},
-      {"international", LX_ITEM_INTERNATIONAL_CURRENCY, currency},
+      {"international", LX_ITEM_INTERNATIONAL_CURRENCY, icu(ucurr_forLocale, locale.c_str())},
   };
   for (const auto& text : texts) compare(text.name, items.text(text.item), text.theirs);
-  compare("digits", widen(std::to_string(items.number(LX_ITEM_CURRENCY_DIGITS))),
-          widen(std::to_string(ucurr_getDefaultFractionDigits(currency.c_str(), &error))));
+  compare("digits", widen(std::to_string(items.number(LX_ITEM_CURRENCY_DIGITS))), digits);
+  compare("international_digits", widen(std::to_string(items.number(LX_ITEM_INTERNATIONAL_DIGITS))), digits);
 
   // Signs and separators are compared above; here it is what is made of them.
   const auto written = [&](const NumberPtr& format, int64_t value) {
