@@ -241,8 +241,10 @@ void compare_territory(const lexicor_import::Territory& row, Differences* differ
       {"international", LX_ITEM_INTERNATIONAL_CURRENCY, icu(ucurr_forLocale, locale.c_str())},
   };
   for (const auto& text : texts) compare(text.name, items.text(text.item), text.theirs);
-  compare("digits", widen(std::to_string(items.number(LX_ITEM_CURRENCY_DIGITS))), digits);
-  compare("international_digits", widen(std::to_string(items.number(LX_ITEM_INTERNATIONAL_DIGITS))), digits);
+  const auto number = [&](int32_t item) { return widen(std::to_string(items.number(item))); };
+  compare("digits", number(LX_ITEM_CURRENCY_DIGITS), digits);
+  compare("international_digits", number(LX_ITEM_INTERNATIONAL_DIGITS), digits);
+  compare("plus", number(LX_ITEM_POSITIVE_POSITION), number(LX_ITEM_NEGATIVE_POSITION));  // where the minus is
 
   // Signs and separators are compared above; here it is what is made of them.
   const auto written = [&](const NumberPtr& format, int64_t value) {
