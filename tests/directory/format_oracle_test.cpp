@@ -28,12 +28,12 @@ using NumberPtr = lexicor_import::IcuPtr<UNumberFormat, unum_close>;
 enum Kind {
   kLatinDigits, kNoBreakSpace, kDirection, kMinusSign, kApostrophe, kFourDigits, kCut, kDecimalEnd, kExactDigits,
   kMinusZero, kNotFinite, kParentheses, kSignSpace, kCodeSpace, kCurrency, kOneLanguage, kStandAlone,
-  kDayPeriods, kEra, kTwoDigitDay, kKinds
+  kDayPeriods, kEra, kTwoDigitDay, kMoneyGroups, kCodeDigits, kKinds
 };
 constexpr const char* kNames[kKinds] = {
   "latin_digits", "no_break_space", "direction", "minus_sign", "apostrophe", "four_digits", "cut", "decimal_end",
   "exact_digits", "minus_zero", "not_finite", "parentheses", "sign_space", "code_space", "currency",
-  "one_language", "stand_alone", "day_periods", "era", "two_digit_day"};
+  "one_language", "stand_alone", "day_periods", "era", "two_digit_day", "money_groups", "code_digits"};
 // clang-format on
 using Kinds = uint32_t;
 constexpr bool has(Kinds kinds, Kind kind) {
@@ -143,6 +143,14 @@ struct NumberPeer {
       unum_setTextAttribute(format.get(), UNUM_CURRENCY_CODE, code.data(), 3, &error);
       if (style == UNUM_CURRENCY) symbol(UNUM_CURRENCY_SYMBOL, widen(item(l, LX_ITEM_CURRENCY)));
     }
+    if (has(kinds, kMoneyGroups) && style != UNUM_DECIMAL) {
+      const NumberPtr numbers = open(UNUM_DECIMAL, kinds);
+      const int32_t size = unum_getAttribute(numbers.get(), UNUM_SECONDARY_GROUPING_SIZE);
+      unum_setAttribute(format.get(), UNUM_SECONDARY_GROUPING_SIZE, size);
+    }
+    if (has(kinds, kCodeDigits) && style == UNUM_CURRENCY_ISO)
+      unum_setAttribute(format.get(), UNUM_FRACTION_DIGITS,
+                        LXGetLocaleNumInfo(l, LX_ITEM_INTERNATIONAL_DIGITS, 0));
     if (has(kinds, kNotFinite)) symbol(UNUM_INFINITY_SYMBOL, u"inf"), symbol(UNUM_NAN_SYMBOL, u"nan");
     if (has(kinds, kCut)) unum_setAttribute(format.get(), UNUM_ROUNDING_MODE, UNUM_ROUND_DOWN);
     unum_setAttribute(format.get(), UNUM_MINIMUM_GROUPING_DIGITS,

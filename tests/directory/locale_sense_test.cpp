@@ -7,8 +7,10 @@
 #include <sstream>
 
 #include "compile.h"
+#include "import/locale_table.h"
 #include "sense.h"
 #include "support/library.h"
+#include "support/text_forms.h"
 #include "ucm.h"
 
 namespace lexicor_data {
@@ -48,6 +50,7 @@ TEST(LocaleSense, FaultsNameTheirPlace) {
       {"territories/Germany.toml", "thousands = \".\"", "thousands = \"\\u00A0\"",
        "f:11:13: a separator is one byte"},
       {"territories/Germany.toml", "list = \";\"", "list = \"1\"", "f:12:8: a separator is no digit"},
+      {"territories/Germany.toml", "list = \";\"", "list = \",\"", "f:12:8: is the same as decimal"},
       {"territories/Germany.toml", "monetary_thousands = \".\"", "monetary_thousands = \",\"",
        "f:14:22: is the same as monetary_decimal"},
       {"territories/Germany.toml", "number = 2", "number = 7", "f:17:10: expected a number from 0 to 6"},
@@ -95,40 +98,50 @@ TEST(LocaleSense, ShippedObjects) {
   EXPECT_GE(territories, 66U);
 }
 
-// Each operating-system name leads to objects that the directory has.
-TEST(LocaleSense, OperatingSystemNames) {
-  const lx::test::Library library(LEXICOR_LOCALE_DIR);
-  const auto create = [](void* user, const char* native, const char* name) -> int32_t {
-    int32_t rc = LX_OK;
-    const lx::test::LocalePtr locale(LXGetLocale(name, 0, &rc));
-    EXPECT_TRUE(locale != nullptr) << native << ": " << name << ": " << rc;
-    ++*static_cast<int*>(user);
-    return 1;
-  };
-  int names = 0;
-  LXEnumNativeLocales(create, &names);
-  EXPECT_EQ(names, 107);
+/// The texts of a locale that its codepage cannot hold: "number text, number text".
+std::string unwritable(const char* name) {
+  int32_t rc = LX_OK;
+  const lx::test::LocalePtr locale(LXGetLocale(name, 0, &rc));
+  EXPECT_TRUE(locale != nullptr) << name << ": " << rc;
+  const lx::test::LocalePtr utf8 = lx::test::locale_with("UTF-8");
+  std::string list;
+  for (int32_t item = 1; locale && item <= LX_ITEM_LONG_DATE_FORMAT; ++item) {
+    LXUChar whole[256], back[256];
+    char bytes[768];
+    const int32_t units = LXGetLocaleTextInfoU(locale.get(), item, whole, 256, LX_TERRITORY_VALUES);
+    if (units < 1) continue;  // a number
+    const int32_t written = LXGetLocaleTextInfo(locale.get(), item, bytes, sizeof bytes, LX_TERRITORY_VALUES);
+    const int32_t read = LXStringToUnicode(back, 256, locale.get(), bytes, written - 1, 0);
+    const lx::test::Units expected(whole, whole + units - 1), found(back, back + read);
+    if (found == expected) continue;
+    list += (list.empty() ? "" : ", ") + std::to_string(item) + " " +
+            encode(lx::test::kPlain, utf8.get(), expected);
+  }
+  return list;
 }
 
-TEST(LocaleSense, ShippedSpecialMappings) {
-  const struct {
-    const char* language;
-    const char* mapping;
-    bool has;
-  } cases[] = {
-      {"English", "special_", false},
-      {"German", R"({ from = "ß", to = "SS" })", true},
-      {"Turkish", R"({ from = "i", to = "İ" })", true},
-      {"Turkish", R"({ from = "I", to = "ı" })", true},
-      {"Azerbaijani", R"({ from = "i", to = "İ" })", true},
-      {"Lithuanian", "{ from = \"į\u0307\", to = \"Į\" }", true},
-      {"Greek", R"({ from = "Σ,", to = "ς," })", true},
-      {"Greek", R"({ from = "Σ.")", false},  // may stand inside an abbreviation
-  };
-  for (const auto& test : cases) {
-    const std::string text = shipped(std::string("languages/") + test.language + ".toml");
-    EXPECT_EQ(text.find(test.mapping) != std::string::npos, test.has) << test.language << ": " << test.mapping;
-  }
+// Each operating-system name leads to objects that the directory has. docs/native-names.md says of which of
+// their texts its codepage holds not all characters; the codepage of a language holds them all.
+TEST(LocaleSense, OperatingSystemNames) {
+  const lx::test::Library library(LEXICOR_LOCALE_DIR);
+  std::vector<std::string> rows;
+  LXEnumNativeLocales(
+      [](void* user, const char* native, const char* name) -> int32_t {
+        const std::string list = unwritable(name), locale = name;
+        const size_t dot = locale.find('.') + 1;
+        const std::string codepage = locale.substr(dot, locale.find('@') - dot);
+        static_cast<std::vector<std::string>*>(user)->push_back(
+            list.empty() ? "" : std::string("| ") + native + " | " + codepage + " | " + list + " |");
+        return 1;
+      },
+      &rows);
+  EXPECT_EQ(rows.size(), 107U);
+  std::string found, listed, line;
+  for (const std::string& row : rows) found += row.empty() ? row : row + '\n';
+  for (std::istringstream page(shipped("../docs/native-names.md")); std::getline(page, line);)
+    if (line.rfind("| ", 0) == 0 && line.rfind("| Name", 0) != 0) listed += line + '\n';
+  EXPECT_EQ(listed, found) << "the page's table, and what it must be";
+  for (const auto& row : lexicor_import::kLanguages) EXPECT_EQ(unwritable(row.name), "") << row.name;
 }
 
 }  // namespace

@@ -100,7 +100,7 @@ TEST(RowPacker, RowsStandWhereTheyWerePlaced) {
 // The library's built-in payloads are these values: 578 and 192 bytes.
 TEST(LocaleText, BuiltInValuesHaveTheBuiltInLayout) {
   const std::string language_text =
-      with(with(shipped("languages/English.toml"), "\"Latin1\"", "1"), "\"Default\"", "0");
+      with(with(shipped("languages/English.toml"), "\"UTF-8\"", "1"), "\"Default\"", "0");
   std::istringstream language_in(language_text), territory_in(shipped("territories/UnitedStates.toml"));
   const ByteVector language = pack_language(read_language(language_in, "e", built_in_control()), "e");
   const ByteVector territory = pack_territory(read_territory(territory_in, "u"), "u");
@@ -183,7 +183,7 @@ TEST(ObjectList, OrderAndTable) {
 
 TEST(Sources, FaultsNameTheirPlace) {
   const std::string language =
-      with(with(shipped("languages/English.toml"), "\"Latin1\"", "1"), "\"Default\"", "0");
+      with(with(shipped("languages/English.toml"), "\"UTF-8\"", "1"), "\"Default\"", "0");
   const std::string territory = shipped("territories/UnitedStates.toml");
   const Control control = built_in_control();
   using In = std::istream;

@@ -2,7 +2,7 @@
 //
 //   abbreviation = "EN"
 //   name = "English"
-//   default = { territory = "UnitedStates", codepage = "Latin1", sort = "Binary" }
+//   default = { territory = "UnitedStates", codepage = "UTF-8", sort = "Binary" }
 //   days = ["Sunday", ...]            short_days = ["Sun", ...]         7 each, Sunday first
 //   months = ["January", ...]         short_months = ["Jan", ...]       12 or 13 each
 //   morning = "AM"                    afternoon = "PM"

@@ -57,16 +57,17 @@ void check_specials(TomlTable& root, const char* key) {
 }
 
 void check_separators(TomlTable separators) {
-  constexpr const char* kPairs[][2] = {{"decimal", "thousands"}, {"monetary_decimal", "monetary_thousands"}};
+  constexpr const char* kPairs[][2] = {
+      {"decimal", "thousands"}, {"decimal", "list"}, {"monetary_decimal", "monetary_thousands"}};
   for (const char* key : {"decimal", "thousands", "list", "monetary_decimal", "monetary_thousands"}) {
     const char16_t unit = separators.character(key);
     if (unit >= 0x80) separators.fail(separators.node(key), "a separator is one byte in UTF-8 too: ASCII");
     if (unit < 0x20 || unit == 0x7F || is_digit(unit))
       separators.fail(separators.node(key), "a separator is no digit and no control");
   }
-  for (const auto& [decimal, thousands] : kPairs) {
-    if (separators.character(decimal) == separators.character(thousands)) {
-      separators.fail(separators.node(thousands), std::string("is the same as ") + decimal);
+  for (const auto& [decimal, other] : kPairs) {
+    if (separators.character(decimal) == separators.character(other)) {
+      separators.fail(separators.node(other), std::string("is the same as ") + decimal);
     }
   }
 }

@@ -1,15 +1,11 @@
 // lexicor-import OUTDIR: writes the sources of the locale directory (languages, territories, codepages, sorts,
 // their lines of control.txt, alias.txt) from what ICU and glibc know. A maintainer's program; the build needs
-// only what it wrote. A second run with the same ICU and glibc changes nothing. It prints what it left out, and
-// what cannot be written in the default codepages.
-#include <unicode/ustring.h>
-
+// only what it wrote. A second run with the same ICU and glibc changes nothing. It prints what it left out.
 #include <algorithm>
 #include <cstdio>
 #include <exception>
 #include <filesystem>
 #include <fstream>
-#include <map>
 #include <set>
 #include <sstream>
 #include <stdexcept>
@@ -17,7 +13,6 @@
 #include "alias_import.h"
 #include "codepage_import.h"
 #include "control_source.h"
-#include "icu_text.h"
 #include "language_toml.h"
 #include "locale_import.h"
 #include "locale_table.h"
@@ -79,14 +74,6 @@ std::string import_text(const Codepage& codepage) {
   return out.str();
 }
 
-std::u16string utf16(const std::string& text) {
-  return icu_text("UTF-8", [&](UChar* out, int32_t room, UErrorCode* error) {
-    int32_t units = 0;
-    u_strFromUTF8(out, room, &units, text.data(), static_cast<int32_t>(text.size()), error);
-    return units;
-  });
-}
-
 /// The 16-bit values that a codepage's source maps.
 std::set<char16_t> repertoire(const fs::path& directory, const std::string& codepage) {
   const std::string file = (directory / "codepages" / (codepage + ".ucm")).string();
@@ -99,38 +86,17 @@ std::set<char16_t> repertoire(const fs::path& directory, const std::string& code
   return values;
 }
 
-/// Prints the characters of a source that its codepage does not have.
-void print_unwritable(const fs::path& directory, const std::string& name, const std::string& codepage,
-                      const std::string& text) {
-  if (codepage == "UTF-8") return;
-  const std::set<char16_t> values = repertoire(directory, codepage);
-  std::set<char16_t> missing;
-  for (char16_t unit : utf16(text)) {
-    if (values.count(unit) == 0) missing.insert(unit);
-  }
-  for (char16_t unit : missing) {
-    std::printf("%s: not in %s: U+%04X\n", name.c_str(), codepage.c_str(), static_cast<unsigned>(unit));
-  }
-}
-
 void import_languages(const fs::path& directory, const Control& control) {
   fs::create_directories(directory / "languages");
   for (const Language& row : kLanguages) {
-    lexicor_data::LanguageSource language = import_language(row, control);
-    std::ostringstream out, texts;
-    lexicor_data::write_language(out, language, &control);
+    std::ostringstream out;
+    lexicor_data::write_language(out, import_language(row, control), &control);
     write_file(directory / "languages" / (std::string(row.name) + ".toml"),
                source_comment(row.locale) + out.str());
-    language.special_upper.clear();
-    language.special_lower.clear();
-    lexicor_data::write_language(texts, language, &control);
-    print_unwritable(directory, row.name, row.codepage, texts.str());
   }
 }
 
 void import_territories(const fs::path& directory) {
-  std::map<std::string, std::string> codepages;
-  for (const Language& row : kLanguages) codepages[row.name] = row.codepage;
   fs::create_directories(directory / "territories");
   for (const Territory& row : kTerritories) {
     Notes notes;
@@ -143,7 +109,6 @@ void import_territories(const fs::path& directory) {
     for (const std::string& note : notes) std::printf("%s: %s\n", row.name, note.c_str());
     write_file(directory / "territories" / (std::string(row.name) + ".toml"),
                source_comment(row.locale) + out.str());
-    print_unwritable(directory, row.name, codepages.at(row.language), out.str());
   }
 }
 

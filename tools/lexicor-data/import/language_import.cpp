@@ -15,6 +15,8 @@ using lexicor_data::Control;
 using lexicor_data::LanguageSource;
 using lexicor_data::ObjectType;
 
+constexpr char kDefaultCodepage[] = "UTF-8";
+
 uint16_t default_id(const Control& control, ObjectType type, const char* name) {
   const lexicor_data::ObjectName* object = control.find(type, name);
   if (object == nullptr) throw std::runtime_error(std::string("no object ") + name + " for a default");
@@ -83,7 +85,7 @@ std::string source_comment(const char* locale) {
 LanguageSource import_language(const Language& row, const Control& control) {
   LanguageSource language;
   language.territory = default_id(control, ObjectType::kTerritory, row.territory);
-  language.codepage = default_id(control, ObjectType::kCodepage, row.codepage);
+  language.codepage = default_id(control, ObjectType::kCodepage, kDefaultCodepage);
   const bool binary = std::string(row.sort) == "Binary";
   language.sort = binary ? 0 : default_id(control, ObjectType::kSort, row.sort);
   language.abbreviation = upper_code(row.locale);

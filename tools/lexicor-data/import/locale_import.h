@@ -1,7 +1,8 @@
 // Languages and territories from ICU's locale data.
 //
 // Language: the names that dates are written with (the stand-alone forms where the full date uses those), the
-// short ones, the day-period markers, the language's name for itself, and its special case mappings.
+// short ones, the day-period markers, the language's name for itself, and its special case mappings. The
+// default codepage is UTF-8, which alone holds the texts of every language and territory.
 //
 // Territory: symbols of Latin digits with marks of direction left out, no-break spaces as spaces, U+2212 as "-"
 // and U+2019 as "'"; two fraction digits for numbers; the layout of currency amounts as ICU writes 1 and -1;

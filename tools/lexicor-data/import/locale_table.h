@@ -11,7 +11,6 @@ struct Language {
   uint16_t id;
   const char* locale;
   const char* territory;  ///< defaults, by object name
-  const char* codepage;
   const char* sort;
 };
 

@@ -38,13 +38,23 @@ std::u16string widen(const std::string& text) {
   return {text.begin(), text.end()};
 }
 
-/// Takes an override out of the list; false: there is none.
+/// Takes an override out of the list, for the text that CLDR gives; false: there is none. One that CLDR has
+/// come to agree with must leave the table.
 bool take(Overrides& overrides, const char* key, std::u16string& text) {
   const auto found = overrides.find(key);
   if (found == overrides.end()) return false;
-  text = widen(found->second);
+  const std::u16string instead = widen(found->second);
+  if (instead == text) throw std::runtime_error(std::string("override ") + key + " is what CLDR says");
+  text = instead;
   overrides.erase(found);
   return true;
+}
+
+/// The same for a number of one digit.
+template <class Number>
+void take_digit(Overrides& overrides, const char* key, Number& number) {
+  std::u16string text = widen(std::to_string(number));
+  if (take(overrides, key, text)) number = text.at(0) & 0xF;
 }
 
 class NumberFormat {
@@ -123,16 +133,16 @@ Layout read_layout(const std::u16string& amount, const std::u16string& symbol) {
 }
 
 void read_currency(const std::string& locale, Overrides& overrides, TerritorySource& territory) {
-  if (!take(overrides, "currency", territory.international_currency)) {
-    territory.international_currency = icu_text("currency", [&](UChar* out, int32_t room, UErrorCode* error) {
-      return ucurr_forLocale(locale.c_str(), out, room, error);
-    });
-  }
+  territory.international_currency = icu_text("currency", [&](UChar* out, int32_t room, UErrorCode* error) {
+    return ucurr_forLocale(locale.c_str(), out, room, error);
+  });
+  take(overrides, "currency", territory.international_currency);
   NumberFormat amounts(UNUM_CURRENCY, locale);
   amounts.set_currency(territory.international_currency);
   territory.separators[3] = amounts.separator(UNUM_MONETARY_SEPARATOR_SYMBOL);
   territory.separators[4] = amounts.separator(UNUM_MONETARY_GROUPING_SEPARATOR_SYMBOL);
   territory.monetary_grouping = amounts.grouping();
+  take(overrides, "monetary_grouping", territory.monetary_grouping);
   territory.currency = amounts.symbol(UNUM_CURRENCY_SYMBOL);
   const Layout positive = read_layout(amounts.format(1), territory.currency);
   const Layout negative = read_layout(amounts.format(-1), territory.currency);
@@ -148,6 +158,7 @@ void read_currency(const std::string& locale, Overrides& overrides, TerritorySou
   const int32_t digits = ucurr_getDefaultFractionDigits(territory.international_currency.c_str(), &error);
   require(error, "fraction digits");
   territory.digits = {kNumberDigits, static_cast<uint16_t>(digits), static_cast<uint16_t>(digits)};
+  take_digit(overrides, "international_digits", territory.digits[2]);
 }
 
 /// The format of the first style that is short enough.
@@ -175,17 +186,15 @@ void read_region(const Territory& row, Overrides& overrides, TerritorySource& te
   uloc_getCountry(row.locale, code, sizeof code, &error);
   const URegion* region = uregion_getRegionFromCode(code, &error);
   require(error, "region");
-  if (!take(overrides, "abbreviation", territory.abbreviation)) {
-    territory.abbreviation = widen(uloc_getISO3Country(row.locale));
-    if (row.id < kFirstOwnId && row.id != uregion_getNumericCode(region)) {
-      throw std::runtime_error("the identifier is not the country's number");
-    }
+  territory.abbreviation = widen(uloc_getISO3Country(row.locale));
+  const bool other = take(overrides, "abbreviation", territory.abbreviation);
+  if (!other && row.id < kFirstOwnId && row.id != uregion_getNumericCode(region)) {
+    throw std::runtime_error("the identifier is not the country's number");
   }
-  if (!take(overrides, "name", territory.name)) {
-    territory.name = plain(icu_text("country", [&](UChar* out, int32_t room, UErrorCode* status) {
-      return uloc_getDisplayCountry(row.locale, row.locale, out, room, status);
-    }));
-  }
+  territory.name = plain(icu_text("country", [&](UChar* out, int32_t room, UErrorCode* status) {
+    return uloc_getDisplayCountry(row.locale, row.locale, out, room, status);
+  }));
+  take(overrides, "name", territory.name);
 }
 
 }  // namespace
@@ -208,9 +217,8 @@ TerritorySource import_territory(const Territory& row, Notes& notes) {
   territory.short_date_format = format_of(locale, false, UDAT_SHORT, notes);
   territory.long_date_format = format_of(locale, false, UDAT_FULL, notes);
   take(overrides, "long_date", territory.long_date_format);
-  std::u16string position;
-  if (take(overrides, "positive_position", position)) territory.positive_position = position.at(0) & 0xF;
-  if (take(overrides, "negative_position", position)) territory.negative_position = position.at(0) & 0xF;
+  take_digit(overrides, "positive_position", territory.positive_position);
+  take_digit(overrides, "negative_position", territory.negative_position);
   if (!overrides.empty()) throw std::runtime_error("unknown override " + overrides.begin()->first);
   return territory;
 }
