@@ -13,7 +13,8 @@
  *     shift state in place of the lead byte's length.
  *  4. W is not Unicode: a packed code holds the bytes of one character of the codepage.
  *  5. Lengths are signed 32-bit; below 0 means null-terminated. LX_CHARACTERS makes lengths and sizes
- *     count characters in place of bytes.
+ *     count characters in place of bytes. In a shift-sensitive codepage the byte behind the last of
+ *     them is then looked at, whether it is a shift byte, so that it must be readable.
  *  6. Characters are never cut: output ends on a whole character, and a character cut by the end of
  *     the input is not entered.
  *  7. Termination. Output is terminated where a function says so; LX_TERMINATE asks for it and keeps

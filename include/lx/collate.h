@@ -89,7 +89,8 @@ LX_API int32_t LXStrcollU(LXLocale* locale, const LXUChar* text1, int32_t length
  * one begins the other, order as LXStrcoll does. Lengths as for LXStrcoll; `options` 0, LX_CASE_INSENSITIVE or
  * LX_WIDTH_INSENSITIVE, and LX_CHARACTERS. Returns the bytes of the whole key; when they do not fit `size`
  * the output is not a key. An empty text has a key of 3 bytes (0 when `size` is 0). -1 with last error 2
- * (options) or 20. In binary order the key is the text, with options folded. */
+ * (options) or 20. In binary order the key is the text, with options folded: in the U and W forms units as the
+ * machine stores them, which are not in the order of their bytes. */
 LX_API int32_t LXStrxfrm(LXLocale* locale, uint8_t* output, int32_t size, const char* text, int32_t length,
                          uint32_t options);
 LX_API int32_t LXStrxfrmEx(LXLocale* locale, uint8_t* output, int32_t size, const char* text,
