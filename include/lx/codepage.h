@@ -69,7 +69,7 @@ LX_API int32_t LXPutChar(LXLocale* locale, char* text, LXWChar code);
 LX_API void LXPutCharEx(LXLocale* locale, char* text, LXShiftState state, LXWChar code);
 
 /* The start of the character after the one at `text`. Ex: shift bytes before and behind the character
- * are passed too; `unused` is not used. */
+ * are passed too; `unused` is not used. In these walks a null `new_state` is left out. */
 LX_API char* LXNextChar(LXLocale* locale, const char* text);
 LX_API char* LXNextCharEx(LXLocale* locale, const char* text, LXShiftState state, LXShiftState* new_state,
                           int32_t unused);

@@ -483,6 +483,9 @@ TEST(Trace, SinkFromTheEnvironment) {
   const std::string instead = "; tracing to standard error instead of \"";
   const std::string no_file = "LX_TRACE_FILE: No such file or directory" + instead + missing + "\"";
   const std::string too_long = "LX_TRACE_FILE: the path is too long" + instead;
+  const std::string pipe = directory / "pipe";
+  ASSERT_EQ(mkfifo(pipe.c_str(), 0600), 0);
+  const std::string no_reader = "LX_TRACE_FILE: No such device or address" + instead + pipe + "\"";
   const struct {
     Texts variables, out, err;
   } kCases[] = {
@@ -490,6 +493,7 @@ TEST(Trace, SinkFromTheEnvironment) {
       {{on, file + "stderr"}, {}, both},
       {{on, file + "stdout"}, both, {}},
       {{on, file + missing}, {}, {no_file, both[0], both[1]}},
+      {{on, file + pipe}, {}, {no_reader, both[0], both[1]}},
       {{on, file + std::string(5000, 'p')}, {}, {too_long, both[0], both[1]}},
   };
   for (const auto& c : kCases) {
