@@ -253,10 +253,9 @@ for shift in '' x xx; do
     same "$name" out expected
   done
 done
-bytes 'ab\xe3\x81' cut
-expect 'mapped input cut' 1 'lexicor: the input ends inside the character that begins at byte 2' \
-  "$lexicor" map upper -o old cut
-same 'the output of a cut mapping' old <(printf '\x81\x82\x83')
+maps 'malformed text between letters' upper 'a\xc3bc\xe7oi\xc3\xa9\xe3\x81' 'A\xc3BC\xe7OI\xc3\x89\xe3\x81'
+maps 'malformed double-byte text' half '\x82\x60\x81\n\x82\x60\x82' 'A\x81\nA\x82' --codepage MS932
+maps 'malformed host text' lower '\xc1\x0e\x42\xc1\x44\x0f\xc1\x0e\x25\x42\xc1' '\x81\x0e\x42\x81\x44\x0f\x81\x0e\x25\x42\x81' --codepage IBM939
 says 'no such mapping' 2 'title not in' "$lexicor" map title
 says 'mapping for an unknown locale' 2 "no territory 'Mars'.*lexicor list territories" "$lexicor" map upper --locale English_Mars
 
@@ -276,7 +275,16 @@ translates 'padded on a host' 0 '' 'ab' '\x81\x82\x40\x40' --from 1252 --to 1141
 translates 'trimmed' 0 '' 'ab  ' 'ab' --from 1252 --to 1251 --size 2 --trim
 translates 'left over' 1 'lexicor: the input is left over from byte 2 on: it does not fit in a size of 2, or ends inside a character' \
   'ab  ' 'ab' --from 1252 --to 1251 --size 2
-translates 'a field cut' 1 'lexicor: the input ends inside the character that begins at byte 1' 'a\xe3' '' --from utf8 --to 1252
+translates 'a lost character' 1 'lexicor: 1 character lost from UTF-8 to MS932: 1 not in MS932
+  line 1, column 2 (byte 1): U+00E9 is not in MS932' 'a\xc3\xa9' 'a?' --from utf8 --to 932
+translates 'a lost character, lossy' 0 '' 'a\xc3\xa9' 'a?' --from utf8 --to 932 --lossy
+translates 'half a pair' 1 'lexicor: 1 character lost from UTF-16 to US-ASCII: 1 not in US-ASCII
+  byte 2: U+D83D is not in US-ASCII' 'a\0\x3d\xd8' 'a?' --from 1200 --to us-ascii
+translates 'units cut' 1 'lexicor: the input ends inside the character that begins at byte 2' 'a\0b' '' --from 1200 --to utf8
+translates 'a malformed field' 1 "lexicor: malformed input at line 1, column 2 (byte 1): byte E3 $bad 80 to BF must follow, but the text ends" 'a\xe3' '' \
+  --from utf8 --to 1252
+translates 'a field beyond 16 bits' 1 "lexicor: line 1, column 2 (byte 1): U+1F600 is beyond U+FFFF, which only 'lexicor convert' takes" \
+  'a\xf0\x9f\x98\x80' '' --from utf8 --to utf8
 says 'padding to no size' 2 '--pad requires --size' "$lexicor" translate --from 1252 --to 1251 --pad
 says 'a size of nothing' 2 '--size' "$lexicor" translate --from 1252 --to 1251 --size 0
 says 'translation from an unknown codepage' 2 "unknown codepage 'utf-17'" "$lexicor" translate --from utf-17 --to 1251
@@ -293,9 +301,10 @@ rewrites() {
 }
 rewrites 'to line feeds' 'lexicor: 3 line ends (2 crlf, 1 lf), 2 rewritten' utf8 lf 'a\r\n\r\n\xc3\xa9\nb\r' \
   'a\n\n\xc3\xa9\nb\r' --report
-rewrites 'to pairs' '' MS932 crlf '\x82\xa0\n\x85\x0a\r\n\n' '\x82\xa0\r\n\x85\x0a\r\n\r\n'
+rewrites 'to pairs' '' MS932 crlf '\x82\xa0\n\x83\x5c\r\n\n' '\x82\xa0\r\n\x83\x5c\r\n\r\n'
 rewrites 'host lines to new line' 'lexicor: 3 line ends (1 crlf, 1 lf, 1 nl), 2 rewritten' IBM939 nl \
-  '\x0e\x44\x81\x44\x15\x0f\x0d\x25\xc1\x15\x25' '\x0e\x44\x81\x44\x15\x0f\x15\xc1\x15\x15' --report
+  '\x0e\x44\x81\x0f\x0d\x25\xc1\x15\x25' '\x0e\x44\x81\x0f\x15\xc1\x15\x15' --report
+rewrites 'characters beyond U+FFFF' '' utf8 lf '\xf0\x9f\x98\x80\r\n' '\xf0\x9f\x98\x80\n'
 rewrites 'an unclosed text' '' IBM939 lf '\x15\x0e\x44\x81' '\x25\x0e\x44\x81\x0f'
 rewrites 'only pairs' '' IBM037 lf '\x25\x0d\x25\x15' '\x25\x25\x15' --find crlf
 rewrites 'an empty text' 'lexicor: 0 line ends, 0 rewritten' utf8 lf '' '' --report
@@ -304,12 +313,12 @@ for bytes in 4094 4095 4096 65534 65535 65536; do
   "$lexicor" lines --from utf8 --eol lf -o out in
   same "a pair behind $bytes bytes" out <(tr -d '\r' <in)
 done
-bytes 'a\r\n\xe3\x81' half
-expect 'lines cut' 1 'lexicor: the input ends inside the character that begins at byte 3' \
+bytes 'a\r\n\xe7\x81\n' half
+expect 'malformed lines' 1 "lexicor: malformed input at line 2, column 1 (byte 3): bytes E7 81 are not UTF-8: 80 to BF must follow, but there is 0A" \
   "$lexicor" lines --from utf8 --eol lf -o old half
-same 'the output of cut lines' old <(printf '\x81\x82\x83')
+same 'the output of malformed lines' old <(printf '\x81\x82\x83')
 says 'no such line end' 2 'cr not in' "$lexicor" lines --from utf8 --eol cr
-says 'a full device' 1 '/dev/full' "$lexicor" lines --from utf8 --eol lf -o /dev/full half
+says 'a full device' 1 '/dev/full' "$lexicor" lines --from utf8 --eol lf -o /dev/full plain
 says 'a missing text' 1 'lexicor: missing: ' "$lexicor" lines --from utf8 --eol lf missing
 
 # --- Sorting: line ends, the sort, keys beside comparison, and what a line may hold.

@@ -32,16 +32,16 @@ int convert(const ConvertOptions& options, const CommonOptions& common) {
   Input input(options.files);
   Pieces pieces(input);
   Output output(options.output);
-  Losses losses(source, target.name(), input,
+  Losses losses(source.name(), target.name(),
                 options.strict  ? OnLoss::kStop
                 : options.lossy ? OnLoss::kIgnore
                                 : OnLoss::kReport);
-  Recoder recoder(source, target, input, output, losses);
+  Recoder recoder(source, target, input, &output, losses);
   pieces.each(!output.is_terminal(), [&](const char* data, size_t bytes) { recoder.take(data, bytes); });
   recoder.finish();
   output.commit();
-  if (losses.total() == 0) return kDone;
-  throw Failure(kDataError, losses.report());
+  losses.throw_any();
+  return kDone;
 }
 
 }  // namespace

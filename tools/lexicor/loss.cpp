@@ -5,14 +5,17 @@
 
 namespace lexicor_cli {
 
-void Losses::record(LossKind kind, uint64_t offset, const Place& place, const std::string& what) {
+void Losses::record(LossKind kind, const std::string& where, const std::string& what) {
   if (ignored()) return;
   count(kind, 1);
-  if (first_.size() < kReported)
-    first_.push_back(input_.locate(offset, place.line(), place.column()) + ": " + what);
+  if (first_.size() < kReported) first_.push_back(where + ": " + what);
   if (on_loss_ == OnLoss::kStop)
     throw Failure(kDataError,
                   "stopped at the first loss from " + source_ + " to " + target_ + "\n  " + first_[0]);
+}
+
+void Losses::throw_any() const {
+  if (total() != 0) throw Failure(kDataError, report());
 }
 
 uint64_t Losses::total() const {

@@ -6,10 +6,7 @@
 #include <string>
 #include <vector>
 
-#include "codepage.h"
 #include "command.h"
-#include "input.h"
-#include "place.h"
 
 namespace lexicor_cli {
 
@@ -25,19 +22,23 @@ enum class OnLoss { kReport, kStop, kIgnore };
 
 class Losses {
  public:
-  Losses(const Codepage& source, const std::string& target, const Input& input, OnLoss on_loss)
-      : source_(source.name()), target_(target), input_(input), on_loss_(on_loss) {}
+  /// The names are those of the codepages.
+  Losses(const std::string& source, const std::string& target, OnLoss on_loss)
+      : source_(source), target_(target), on_loss_(on_loss) {}
 
   bool ignored() const { return on_loss_ == OnLoss::kIgnore; }
   /// Whether the places of losses are still wanted: of the first ones only.
   bool places_wanted() const { return !ignored() && first_.size() < kReported; }
 
-  /// Records a loss at a byte of the whole input. Throws a Failure when the first loss ends the work.
-  void record(LossKind kind, uint64_t offset, const Place& place, const std::string& what);
+  /// Records a loss: where it is, as Input says it, and what. Throws a Failure when the first loss ends the
+  /// work.
+  void record(LossKind kind, const std::string& where, const std::string& what);
   /// Records losses whose places are not wanted.
   void count(LossKind kind, uint64_t count) { counts_[static_cast<size_t>(kind)] += count; }
 
   uint64_t total() const;
+  /// Throws the report when there is anything to report.
+  void throw_any() const;
   /// The message: the losses of each kind, and the first ones with their places.
   std::string report() const;
 
@@ -46,7 +47,6 @@ class Losses {
   static constexpr size_t kReported = 10;
 
   const std::string source_, target_;
-  const Input& input_;
   const OnLoss on_loss_;
   std::array<uint64_t, kKinds> counts_{};
   std::vector<std::string> first_;

@@ -31,7 +31,7 @@ std::string code_bytes(LXWChar code) {
 
 }  // namespace
 
-Recoder::Recoder(const Codepage& source, const Codepage& target, const Input& input, Output& output,
+Recoder::Recoder(const Codepage& source, const Codepage& target, const Input& input, Output* output,
                  Losses& losses)
     : source_(source),
       target_(target),
@@ -65,8 +65,8 @@ void Recoder::begin_file(const char** data, size_t* bytes) {
   for (; !text_.empty() && *bytes > 0; --*bytes) feed((*data)++, 1, false);
   if (!text_.empty()) return;
   place_.restart();
-  if (!at_char || !source_.utf8() || repertoire_.has(kSignatureValue) || *bytes < kSignatureBytes ||
-      std::memcmp(*data, kSignature, kSignatureBytes) != 0)
+  if (!at_char || output_ == nullptr || !source_.utf8() || repertoire_.has(kSignatureValue) ||
+      *bytes < kSignatureBytes || std::memcmp(*data, kSignature, kSignatureBytes) != 0)
     return;
   *data += kSignatureBytes;
   *bytes -= kSignatureBytes;
@@ -77,7 +77,7 @@ void Recoder::finish() {
   feed("", 0, true);
   if (target_state_ == LX_SHIFT_DOUBLE) {
     const char shift_in = target_.shift_byte(LX_SHIFT_SINGLE);
-    output_.write(&shift_in, 1);
+    write(&shift_in, 1);
   }
 }
 
@@ -145,7 +145,7 @@ void Recoder::convert_stretch(const char* text, size_t bytes) {
   if (copies_) {
     if (losses_.places_wanted()) place_.pass(text, bytes, state_);
     flush();
-    output_.write(text, bytes);
+    write(text, bytes);
     pass(text, bytes);
     return;
   }
@@ -167,16 +167,20 @@ void Recoder::convert_stretch(const char* text, size_t bytes) {
 /// Converts what ends a stretch to the character that stands for what is lost.
 void Recoder::lose(const char* text, const Stretch& stretch, const char* end) {
   if (stretch.end == Stretch::End::kMalformed)
-    losses_.record(LossKind::kMalformed, offset_, place_,
+    losses_.record(LossKind::kMalformed, where(offset_),
                    malformed_.describe(text, stretch.end_bytes, end, state_));
   else
-    losses_.record(LossKind::kLacking, offset_, place_,
+    losses_.record(LossKind::kLacking, where(offset_),
                    lacks_text(long_utf8_code_point(text, end), target_.name()));
   place_.pass_malformed();
   offset_ += stretch.end_bytes;
   units_.assign(1, kReplacement);
   unit_count_ = 1;
   emit();
+}
+
+std::string Recoder::where(uint64_t offset) const {
+  return losses_.places_wanted() ? input_.locate(offset, place_.line(), place_.column()) : "";
 }
 
 void Recoder::decode(const char* text, size_t bytes) {
@@ -204,8 +208,7 @@ void Recoder::find_losses(const char* text, size_t bytes) {
         passed = text;
         passed_state = state;
       }
-      losses_.record(kind, offset_ + static_cast<uint64_t>(bytes) - static_cast<uint64_t>(end - text), place_,
-                     what);
+      losses_.record(kind, where(offset_ + bytes - static_cast<uint64_t>(end - text)), what);
     }
     text += c.bytes;
   }
@@ -215,7 +218,7 @@ void Recoder::find_losses(const char* text, size_t bytes) {
 /// Counts the losses of decoded UTF-8, whose characters are what their values say.
 void Recoder::count_losses() {
   for (size_t i = 0; i < unit_count_; ++i) {
-    if (!repertoire_.has(units_[i])) losses_.count(kind_of(units_[i]), 1);
+    if (!repertoire_.has(units_[i])) losses_.count(repertoire_.kind_of_loss(units_[i]), 1);
   }
 }
 
@@ -229,7 +232,7 @@ bool Recoder::find_loss(const Char& c, LossKind* kind, std::string* what) const 
     return true;
   }
   if (!repertoire_.has(c.unicode)) {
-    *kind = kind_of(c.unicode);
+    *kind = repertoire_.kind_of_loss(c.unicode);
     if (worded) *what = repertoire_.describe_loss(c.unicode);
     return true;
   }
@@ -240,11 +243,6 @@ bool Recoder::find_loss(const Char& c, LossKind* kind, std::string* what) const 
     *what = bytes_text(c.text, c.bytes) + (c.bytes == 1 ? " is " : " are ") + code_point_name(c.unicode) +
             ", which " + source_.name() + " writes as " + code_bytes(own);
   return true;
-}
-
-LossKind Recoder::kind_of(LXUChar unicode) const {
-  const LXUChar back = repertoire_.back(unicode);
-  return back == kReplacement || back == unicode ? LossKind::kLacking : LossKind::kChanged;
 }
 
 /// Goes past well-formed text.
@@ -276,8 +274,12 @@ void Recoder::emit() {
 }
 
 void Recoder::flush() {
-  output_.write(out_.data(), out_used_);
+  write(out_.data(), out_used_);
   out_used_ = 0;
+}
+
+void Recoder::write(const char* text, size_t bytes) {
+  if (output_ != nullptr) output_->write(text, bytes);
 }
 
 }  // namespace lexicor_cli

@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "codepage.h"
+#include "input.h"
 #include "loss.h"
 #include "malformed.h"
 #include "output.h"
@@ -17,7 +18,8 @@ namespace lexicor_cli {
 
 class Recoder {
  public:
-  Recoder(const Codepage& source, const Codepage& target, const Input& input, Output& output, Losses& losses);
+  /// Without an output it finds the losses only, and a signature is text.
+  Recoder(const Codepage& source, const Codepage& target, const Input& input, Output* output, Losses& losses);
 
   /// Converts the next bytes of the input, of one file. A file may begin with the signature of UTF-8.
   void take(const char* data, size_t bytes);
@@ -45,16 +47,17 @@ class Recoder {
   void find_losses(const char* text, size_t bytes);
   void count_losses();
   bool find_loss(const Char& c, LossKind* kind, std::string* what) const;
-  LossKind kind_of(LXUChar unicode) const;
   void pass(const char* text, size_t bytes);
   void hide_shift_bytes();
   void emit();
   void flush();
+  void write(const char* text, size_t bytes);
+  std::string where(uint64_t offset) const;
 
   const Codepage& source_;
   const Codepage& target_;
   const Input& input_;
-  Output& output_;
+  Output* const output_;
   Losses& losses_;
   const MalformedFinder malformed_;
   Repertoire repertoire_;  // of the target

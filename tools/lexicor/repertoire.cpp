@@ -67,10 +67,15 @@ LXUChar Repertoire::value_of(LXWChar code) const {
   return code > 0xFF ? LXCpMbToUnicodeW(codepage_.object(), code) : single_[code];
 }
 
-std::string Repertoire::describe_loss(LXUChar unicode) const {
+LossKind Repertoire::kind_of_loss(LXUChar unicode) const {
+  // Half a surrogate pair comes back from UTF-8, and is none of its characters.
   const LXUChar other = back(unicode);
-  if (other == kReplacement || other == unicode) return lacks_text(unicode, codepage_.name());
-  return code_point_name(unicode) + " becomes " + code_point_name(other) + " in " + codepage_.name();
+  return other == kReplacement || other == unicode ? LossKind::kLacking : LossKind::kChanged;
+}
+
+std::string Repertoire::describe_loss(LXUChar unicode) const {
+  if (kind_of_loss(unicode) == LossKind::kLacking) return lacks_text(unicode, codepage_.name());
+  return code_point_name(unicode) + " becomes " + code_point_name(back(unicode)) + " in " + codepage_.name();
 }
 
 std::string lacks_text(uint32_t code_point, const std::string& codepage) {

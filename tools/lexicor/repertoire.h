@@ -9,6 +9,7 @@
 
 #include "character_values.h"
 #include "codepage.h"
+#include "loss.h"
 
 namespace lexicor_cli {
 
@@ -18,8 +19,8 @@ class Repertoire {
 
   bool has(LXUChar unicode) const { return !lost_[unicode]; }
   bool has_all(const LXUChar* units, size_t count) const;
-  /// What a value is when it is written and read back; U+FFFD when the codepage lacks it.
-  LXUChar back(LXUChar unicode) const;
+  /// How a value that the codepage has not is lost.
+  LossKind kind_of_loss(LXUChar unicode) const;
   /// What is lost of a value that the codepage has not, in words.
   std::string describe_loss(LXUChar unicode) const;
   /// Makes has_all() say no to a value, so that texts with it are looked at.
@@ -28,6 +29,8 @@ class Repertoire {
  private:
   static constexpr uint32_t kValues = 0x10000, kAscii = 0x80;
 
+  /// What a value is when it is written and read back; U+FFFD when the codepage lacks it.
+  LXUChar back(LXUChar unicode) const;
   void learn_ascii();
   LXUChar value_of(LXWChar code) const;
 
