@@ -469,6 +469,7 @@ stops 1 8 'there is no such time' 2026-02-29 format time 2026-02-29
 stops 1 6 'a time has the form YYYY-MM-DD[THH:MM[:SS]]' 2026-1-1 format time 2026-1-1
 stops 1 1 'reading stopped: not a number like -1234.56' 1,5 format money 1,5
 stops 1 1 'a character that is not UTF-8, or beyond U+FFFF' a😀x parse number a😀x
+stops 1 1 'a character that is not UTF-8, or beyond U+FFFF' a$'\xc3'bc parse number a$'\xc3'bc
 expect 'a format of a number' 2 'lexicor: --format is for times' "$lexicor" format number 1 --format %x
 
 # --- Messages: a catalog of one, in Latin1, written by hand for a little-endian machine.
