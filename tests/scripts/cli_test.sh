@@ -253,6 +253,10 @@ for shift in '' x xx; do
     same "$name" out expected
   done
 done
+bytes 'bir iki' in
+expect 'a letter that the codepage lacks' 1 'lexicor: 3 characters lost: U+0069 maps to U+0130, which is not in MS932' \
+  "$lexicor" map upper --locale Turkish --codepage MS932 in
+same 'a letter that the codepage lacks' out <(printf 'B?R ?K?')
 maps 'malformed text between letters' upper 'a\xc3bc\xe7oi\xc3\xa9\xe3\x81' 'A\xc3BC\xe7OI\xc3\x89\xe3\x81'
 maps 'malformed double-byte text' half '\x82\x60\x81\n\x82\x60\x82' 'A\x81\nA\x82' --codepage MS932
 maps 'malformed host text' lower '\xc1\x0e\x42\xc1\x44\x0f\xc1\x0e\x25\x42\xc1' '\x81\x0e\x42\x81\x44\x0f\x81\x0e\x25\x42\x81' --codepage IBM939

@@ -9,11 +9,13 @@
 #include "catalogue.h"
 #include "codepage.h"
 #include "command.h"
+#include "hex.h"
 #include "input.h"
 #include "locale.h"
 #include "malformed.h"
 #include "output.h"
 #include "pieces.h"
+#include "repertoire.h"
 #include "session.h"
 
 namespace lexicor_cli {
@@ -54,12 +56,61 @@ const LXObject* language_object(const std::string& name) {
                           LX_FIND_AND_LOAD, &code);
 }
 
+/// Counts the characters whose own mapping in the language has letters that the codepage lacks: the library
+/// puts the substitution character in their place.
+class LostMappings {
+ public:
+  LostMappings(const Codepage& codepage, const LXObject* language, int32_t special) : codepage_(codepage) {
+    if (special == 0 || codepage.utf8()) return;
+    const Repertoire repertoire(codepage);
+    for (uint32_t unicode = 0; unicode < 0x10000; ++unicode) {
+      const auto unit = static_cast<LXUChar>(unicode);
+      LXUChar result[2];
+      const int32_t results = LXLangGetSpecial(language, unit, 0, &result[0], &result[1], special);
+      for (int32_t i = 0; i < results; ++i) {
+        if (repertoire.has(unit) && !repertoire.has(result[i])) lost_[unit] = result[i];
+      }
+    }
+  }
+
+  void count(const std::string& text, LXShiftState state) {
+    if (lost_.empty()) return;
+    std::vector<LXUChar> units(text.size());
+    const auto length = static_cast<int32_t>(text.size());
+    const int32_t count =
+        LXStringToUnicodeEx(units.data(), length, codepage_.locale(), text.data(), state, length, 0);
+    for (int32_t i = 0; i < count; ++i) {
+      const auto found = lost_.find(units[static_cast<size_t>(i)]);
+      if (found == lost_.end()) continue;
+      if (count_++ == 0) first_ = found->first;
+    }
+  }
+
+  void throw_any() const {
+    if (count_ == 0) return;
+    throw Failure(kDataError, std::to_string(count_) + (count_ == 1 ? " character" : " characters") +
+                                  " lost: " + code_point_name(first_) + " maps to " +
+                                  code_point_name(lost_.at(first_)) + ", which is not in " + codepage_.name());
+  }
+
+ private:
+  const Codepage& codepage_;
+  std::map<LXUChar, LXUChar> lost_;
+  uint64_t count_ = 0;
+  LXUChar first_ = 0;
+};
+
 /// Maps a text that comes in pieces. Each call of the library begins in the single-byte state, so a piece that
 /// begins in the other one gets a shift byte in front, which is taken off again where the pieces meet.
 class Mapper {
  public:
   Mapper(const Codepage& codepage, const LXObject* language, Mapping mapping, Output& output)
-      : codepage_(codepage), finder_(codepage), language_(language), mapping_(mapping), output_(output) {}
+      : codepage_(codepage),
+        finder_(codepage),
+        language_(language),
+        mapping_(mapping),
+        output_(output),
+        lost_(codepage, language, mapping.special) {}
 
   void take(const char* data, size_t bytes) {
     unseen_.append(data, bytes);
@@ -72,6 +123,8 @@ class Mapper {
     map_whole();
     if (waiting_) write_shift(LX_SHIFT_DOUBLE);
   }
+
+  void throw_losses() const { lost_.throw_any(); }
 
  private:
   /// Takes the well-formed text of unseen_, and malformed bytes as they are.
@@ -162,6 +215,7 @@ class Mapper {
   void map(size_t bytes, LXShiftState state) {
     if (bytes == 0) return;
     std::string input = text_.substr(0, bytes);
+    lost_.count(input, state_);
     if (state_ == LX_SHIFT_DOUBLE && !codepage_.is_shift(input[0]))
       input.insert(0, 1, codepage_.shift_byte(LX_SHIFT_DOUBLE));
     mapped_.resize(input.size() * kGrowth);
@@ -208,6 +262,7 @@ class Mapper {
   const LXObject* language_;
   const Mapping mapping_;
   Output& output_;
+  LostMappings lost_;
   std::string unseen_;                            // a cut character, then what is not looked at
   LXShiftState unseen_state_ = LX_SHIFT_SINGLE;   // at its beginning
   std::string text_;                              // well-formed and not yet mapped
@@ -229,6 +284,7 @@ int map(const MapOptions& options, const CommonOptions& common) {
   pieces.each(!output.is_terminal(), [&](const char* data, size_t bytes) { mapper.take(data, bytes); });
   mapper.finish();
   output.commit();
+  mapper.throw_losses();
   return kDone;
 }
 
@@ -252,7 +308,7 @@ Run declare_map(Arguments& command, const CommonOptions& common) {
   command.footer(
       "A character without a mapping stays as it is, and so do malformed bytes. Width is what the codepage has "
       "in both\n"
-      "forms.\n"
+      "forms. A letter of the language that the codepage lacks is lost, which is said, and exits with 1.\n"
       "\n"
       "Examples:\n"
       "  lexicor map upper --locale German letter.txt\n"

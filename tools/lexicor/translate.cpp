@@ -168,14 +168,13 @@ Run declare_translate(Arguments& command, const CommonOptions& common) {
   command.add_option("FILE", options->files, "input files, taken as one string; - is standard input")
       .type_name("");
   command.footer(
-      "Lost characters are reported as 'lexicor convert' does, and exit with 1. Malformed input and characters "
-      "beyond\n"
-      "U+FFFF are refused. "
       "The input is one string of up to 2 GB, line ends and all; 'lexicor convert' takes text of any length. "
       "UTF-16 has\n"
       "the byte order of this machine and no mark of it. Output in a shift-sensitive codepage ends in the "
       "single-byte\n"
-      "state; a full output loses its last double-byte character for that.\n"
+      "state; a full output loses its last double-byte character for that. Lost characters are reported as "
+      "'lexicor\n"
+      "convert' does, and exit with 1. Malformed input and characters beyond U+FFFF are refused.\n"
       "\n"
       "Examples:\n"
       "  lexicor translate --from UTF-8 --to IBM930 -o field.host field.utf8\n"
