@@ -34,7 +34,9 @@ class Losses {
   /// work.
   void record(LossKind kind, const std::string& where, const std::string& what);
   /// Records losses whose places are not wanted.
-  void count(LossKind kind, uint64_t count) { counts_[static_cast<size_t>(kind)] += count; }
+  void count(LossKind kind, uint64_t count) {
+    if (!ignored()) counts_[static_cast<size_t>(kind)] += count;
+  }
 
   uint64_t total() const;
   /// Throws the report when there is anything to report.

@@ -16,6 +16,9 @@ namespace {
 
 // The longest character and a shift byte.
 constexpr size_t kMostBytes = 5;
+// Behind a loss the parts are small at first, so that many losses do not make the same text be tried many
+// times.
+constexpr size_t kFirstWindowBytes = 64;
 constexpr char kSignature[] = "\xEF\xBB\xBF";
 constexpr size_t kSignatureBytes = 3;
 constexpr LXUChar kSignatureValue = 0xFEFF;
@@ -41,7 +44,9 @@ Recoder::Recoder(const Codepage& source, const Codepage& target, const Input& in
       malformed_(source, !target.utf8()),
       repertoire_(target),
       copies_(source.utf8() && target.utf8()),
+      window_bytes_(Pieces::kBytes),
       place_(source),
+      units_(1),
       out_(Pieces::kBytes) {
   if (source.utf8()) return;
   replacement_ = LXCpUnicodeToCharW(source.object(), kReplacement);
@@ -103,7 +108,8 @@ void Recoder::feed(const char* data, size_t bytes, bool last) {
 /// Converts the beginning of a text; 0 when it is a cut character, which waits for more.
 size_t Recoder::convert_some(const char* text, size_t bytes, bool last) {
   if (!source_.utf8()) {
-    const size_t done = convert_clean(text, source_.call_bytes(text, bytes));
+    const size_t done = convert_clean(text, source_.call_bytes(text, std::min(bytes, window_bytes_)));
+    window_bytes_ = done == 0 ? kFirstWindowBytes : std::min(2 * window_bytes_, Pieces::kBytes);
     if (done != 0) return done;
   }
   const Stretch stretch = malformed_.next(text, bytes, state_, last);
@@ -127,7 +133,7 @@ size_t Recoder::convert_clean(const char* text, size_t bytes) {
 
 /// The bytes that the decoded text has in the source again; 0 when they are others than at `text`.
 size_t Recoder::own_bytes(const char* text, size_t bytes) {
-  encoded_.resize(unit_count_ * kMostBytes);
+  if (encoded_.size() < unit_count_ * kMostBytes) encoded_.resize(unit_count_ * kMostBytes);
   const auto own = static_cast<size_t>(LXUnicodeToStringEx(source_.locale(), encoded_.data(), state_,
                                                            static_cast<int32_t>(encoded_.size()), units_.data(),
                                                            static_cast<int32_t>(unit_count_), 0));
@@ -144,8 +150,8 @@ LXShiftState Recoder::state_behind(const Codepage& codepage) const {
 void Recoder::convert_stretch(const char* text, size_t bytes) {
   if (copies_) {
     if (losses_.places_wanted()) place_.pass(text, bytes, state_);
-    flush();
-    write(text, bytes);
+    std::memcpy(room(bytes), text, bytes);
+    out_used_ += bytes;
     pass(text, bytes);
     return;
   }
@@ -166,15 +172,17 @@ void Recoder::convert_stretch(const char* text, size_t bytes) {
 
 /// Converts what ends a stretch to the character that stands for what is lost.
 void Recoder::lose(const char* text, const Stretch& stretch, const char* end) {
-  if (stretch.end == Stretch::End::kMalformed)
-    losses_.record(LossKind::kMalformed, where(offset_),
-                   malformed_.describe(text, stretch.end_bytes, end, state_));
+  const bool malformed = stretch.end == Stretch::End::kMalformed;
+  const LossKind kind = malformed ? LossKind::kMalformed : LossKind::kLacking;
+  if (losses_.places_wanted())
+    losses_.record(kind, where(offset_),
+                   malformed ? malformed_.describe(text, stretch.end_bytes, end, state_)
+                             : lacks_text(long_utf8_code_point(text, end), target_.name()));
   else
-    losses_.record(LossKind::kLacking, where(offset_),
-                   lacks_text(long_utf8_code_point(text, end), target_.name()));
+    losses_.count(kind, 1);
   place_.pass_malformed();
   offset_ += stretch.end_bytes;
-  units_.assign(1, kReplacement);
+  units_[0] = kReplacement;
   unit_count_ = 1;
   emit();
 }
@@ -264,13 +272,18 @@ void Recoder::hide_shift_bytes() {
 /// Writes the decoded text in the target.
 void Recoder::emit() {
   const size_t most = unit_count_ * kMostBytes;
-  if (out_.size() - out_used_ < most) flush();
-  if (out_.size() < most) out_.resize(most);
-  const int32_t written = LXUnicodeToStringEx(target_.locale(), out_.data() + out_used_, target_state_,
-                                              static_cast<int32_t>(out_.size() - out_used_), units_.data(),
-                                              static_cast<int32_t>(unit_count_), 0);
+  const int32_t written =
+      LXUnicodeToStringEx(target_.locale(), room(most), target_state_, static_cast<int32_t>(most),
+                          units_.data(), static_cast<int32_t>(unit_count_), 0);
   out_used_ += static_cast<size_t>(std::max(written, 0));
   if (target_.shift_sensitive() && unit_count_ != 0) target_state_ = state_behind(target_);
+}
+
+/// Room for so many bytes of output.
+char* Recoder::room(size_t bytes) {
+  if (out_.size() - out_used_ < bytes) flush();
+  if (out_.size() < bytes) out_.resize(bytes);
+  return out_.data() + out_used_;
 }
 
 void Recoder::flush() {

@@ -50,6 +50,7 @@ class Recoder {
   void pass(const char* text, size_t bytes);
   void hide_shift_bytes();
   void emit();
+  char* room(size_t bytes);
   void flush();
   void write(const char* text, size_t bytes);
   std::string where(uint64_t offset) const;
@@ -68,6 +69,7 @@ class Recoder {
   std::string text_;  // not yet converted: of a cut character, then of this call
   uint64_t offset_ = 0;
   LXShiftState state_ = LX_SHIFT_SINGLE;
+  size_t window_bytes_;  // of the next part that is tried as a whole
   Place place_;
   std::vector<LXUChar> units_;
   size_t unit_count_ = 0;
