@@ -69,26 +69,25 @@ MalformedFinder::MalformedFinder(const Codepage& codepage, bool long_utf8_ends)
 Stretch MalformedFinder::next(const char* text, size_t bytes, LXShiftState state, bool last) const {
   if (codepage_.utf8()) return next_utf8(text, bytes, last);
   if (single_byte_) return {bytes, 0, Stretch::End::kText};
-  const size_t limit = codepage_.call_bytes(text, bytes);
-  last = last && limit == bytes;
   // What stands behind malformed bytes is looked at again, so the windows begin small.
   size_t good = 0, window = kFirstWindowBytes;
-  for (;; window = std::min(2 * window, kLastWindowBytes)) {
-    const size_t size = std::min(window, limit - good);
-    const bool rest = size == limit - good;
+  for (bool whole_call = false; !whole_call; window = std::min(2 * window, kLastWindowBytes)) {
+    const size_t most = std::min(window, bytes - good);
+    const size_t size = codepage_.call_bytes(text + good, most);
+    const bool rest = size == bytes - good;
+    whole_call = rest || size < most ||
+                 (codepage_.is_shift(text[good + size - 1]) && codepage_.is_shift(text[good + size]));
     LXShiftState end_state = state;
     const size_t whole = codepage_.whole_bytes(text + good, size, state, &end_state);
     if (!has_values(text + good, whole, state) || (rest && last && whole < size)) {
-      Stretch stretch = walk(text + good, size, state, rest && last);
-      if (stretch.end != Stretch::End::kText || rest) {
-        stretch.good_bytes += good;
-        return stretch;
-      }
+      const Stretch stretch = walk(text + good, size, state, rest && last);
+      if (stretch.end != Stretch::End::kText)
+        return {good + stretch.good_bytes, stretch.end_bytes, stretch.end};
     }
     good += whole;
-    if (rest) return {good, 0, Stretch::End::kText};
     state = end_state;
   }
+  return {good, 0, Stretch::End::kText};
 }
 
 Stretch MalformedFinder::next_utf8(const char* text, size_t bytes, bool last) const {
