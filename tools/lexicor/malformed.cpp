@@ -43,15 +43,29 @@ size_t utf8_beginning(const char* text, size_t bytes, const Utf8Lead& lead) {
   return count;
 }
 
-size_t ascii_bytes(const char* text, size_t bytes) {
-  size_t count = 0;
+/// Well-formed characters of up to three bytes at the start of a text; the last bytes are left over.
+size_t short_utf8_bytes(const char* text, size_t bytes) {
+  const auto* const start = reinterpret_cast<const uint8_t*>(text);
+  const uint8_t* const end = start + bytes;
+  const uint8_t* p = start;
+  const auto trail = [](uint8_t byte) { return (byte & 0xC0) == 0x80; };
   uint64_t word;
-  for (; bytes - count >= sizeof word; count += sizeof word) {
-    std::memcpy(&word, text + count, sizeof word);
-    if ((word & 0x8080808080808080u) != 0) break;
+  while (static_cast<size_t>(end - p) >= sizeof word) {
+    if (*p < 0x80) {
+      std::memcpy(&word, p, sizeof word);
+      p += (word & 0x8080808080808080u) == 0 ? sizeof word : 1;
+    } else if (*p >= 0xC2 && *p <= 0xDF && trail(p[1])) {
+      p += 2;
+    } else if ((*p & 0xF0) == 0xE0 && trail(p[1]) && trail(p[2])) {
+      // Below 0x20 it could be shorter, and a surrogate has the upper five bits of 0xD800.
+      const unsigned upper = (*p & 0x0Fu) << 6 | (p[1] & 0x3Fu);
+      if (upper < 0x20 || upper >> 5 == 0xD800 >> 11) break;
+      p += 3;
+    } else {
+      break;
+    }
   }
-  while (count < bytes && static_cast<uint8_t>(text[count]) < 0x80) ++count;
-  return count;
+  return static_cast<size_t>(p - start);
 }
 
 }  // namespace
@@ -93,10 +107,8 @@ Stretch MalformedFinder::next(const char* text, size_t bytes, LXShiftState state
 Stretch MalformedFinder::next_utf8(const char* text, size_t bytes, bool last) const {
   size_t at = 0;
   while (at < bytes) {
-    if (static_cast<uint8_t>(text[at]) < 0x80) {
-      at += ascii_bytes(text + at, bytes - at);
-      continue;
-    }
+    at += short_utf8_bytes(text + at, bytes - at);
+    if (at == bytes) break;
     const Utf8Lead lead = utf8_lead(static_cast<uint8_t>(text[at]));
     const size_t count = utf8_beginning(text + at, bytes - at, lead);
     if (count != lead.bytes) {
