@@ -72,54 +72,105 @@ same 'file and standard input' out expected
 convert 'standard input' 0 '' utf8 ms932 < <(cat part1 part2)
 same 'standard input' out expected
 
-# --- Strict: each loss, and nothing that is none.
-bytes 'A\xe2\x82\xac\xf0\x9f\x98\x80\xff\xef\xbf\xbd\xc3\x41?' in
-convert 'losses' 1 'lexicor: 5 characters lost from utf8 to latin1
-  byte 1: U+20AC, which Latin1 lacks
-  byte 4: U+1F600, which has no 16-bit Unicode value
-  byte 8: byte FF, no character in UTF-8
-  byte 9: U+FFFD, which Latin1 lacks
-  byte 12: bytes C3 41, no character in UTF-8' utf8 latin1 --strict in
-convert 'losses are no error without --strict' 0 '' utf8 latin1 in
-bytes 'a\x81\xad\x82\xa0?' in
-convert 'a source character without a value' 1 'lexicor: 1 character lost from MS932 to UTF-8
-  byte 1: bytes 81 AD, no character in MS932' MS932 UTF-8 --strict in
-bytes '\xc1\x0e\x44\x81\x0f\xc1\x0e\x44\x82' in
-convert 'places in shift-sensitive text' 1 'lexicor: 2 characters lost from 930 to 367
-  byte 2: U+3042, which US-ASCII lacks
-  byte 7: U+3044, which US-ASCII lacks' 930 367 --strict in
-bytes '?\x1a\xef\xbf\xbd' in
-convert 'U+FFFD itself' 0 '' UTF-8 UTF-8 --strict in
-bytes '?\x1a\xe3\x81\x82' in
-convert 'substitution characters themselves' 0 '' UTF-8 MS932 --strict in
+# --- Losses: each kind with its place, malformed bytes that take nothing along, and what is none.
+# loses NAME FROM TO INPUT OUTPUT MESSAGE: the output is complete, exit 1; --lossy is silent; --strict stops at the first.
+loses() {
+  bytes "$4" in
+  bytes "$5" expected
+  convert "$1" 1 "lexicor: $6" "$2" "$3" in
+  same "$1" out expected
+  sed -n '1s/.* lost \(from .*\):.*/lexicor: stopped at the first loss \1/p;2p' err >first
+  convert "$1, lossy" 0 '' "$2" "$3" --lossy -o lossy in
+  same "$1, lossy" lossy expected
+  rm -f none
+  convert "$1, strict" 1 "$(cat first)" "$2" "$3" --strict -o none in
+  [ ! -e none ] || fault "$1: --strict left a file"
+}
+bad='is not UTF-8:'
+loses 'kinds of losses' utf8 ms932 'A\xc3\xa9\xf0\x9f\x98\x80\xff\n\xef\xbf\xbd\xc3\x41?\xe3\x80\x9c' 'A???\n??A?\x81\x60' \
+  "6 characters lost from UTF-8 to MS932: 2 malformed, 3 not in MS932, 1 changed
+  line 1, column 2 (byte 1): U+00E9 is not in MS932
+  line 1, column 3 (byte 3): U+1F600 is not in MS932
+  line 1, column 4 (byte 7): byte FF $bad no character has it
+  line 2, column 1 (byte 9): U+FFFD is not in MS932
+  line 2, column 2 (byte 12): byte C3 $bad 80 to BF must follow, but there is 41
+  line 2, column 5 (byte 15): U+301C becomes U+FF5E in MS932"
+loses 'malformed UTF-8' utf8 utf8 'Fran\xe7ois \xed\xa0\x80\xc0\xaf\xf4\x90\xe2\x82\xf0\x9f\x98\x80\xf0\x9f\x98' \
+  'Fran\xef\xbf\xbdois \xef\xbf\xbd\xef\xbf\xbd\xef\xbf\xbd\xef\xbf\xbd\xef\xbf\xbd\xef\xbf\xbd\xef\xbf\xbd\xef\xbf\xbd\xf0\x9f\x98\x80\xef\xbf\xbd' \
+  "10 characters lost from UTF-8 to UTF-8: 10 malformed
+  line 1, column 5 (byte 4): byte E7 $bad 80 to BF must follow, but there is 6F
+  line 1, column 10 (byte 9): byte ED $bad 80 to 9F must follow, but there is A0
+  line 1, column 11 (byte 10): byte A0 $bad it continues a character, and none begins before it
+  line 1, column 12 (byte 11): byte 80 $bad it continues a character, and none begins before it
+  line 1, column 13 (byte 12): byte C0 $bad no character has it
+  line 1, column 14 (byte 13): byte AF $bad it continues a character, and none begins before it
+  line 1, column 15 (byte 14): byte F4 $bad 80 to 8F must follow, but there is 90
+  line 1, column 16 (byte 15): byte 90 $bad it continues a character, and none begins before it
+  line 1, column 17 (byte 16): bytes E2 82 are not UTF-8: 80 to BF must follow, but there is F0
+  line 1, column 19 (byte 22): bytes F0 9F 98 are not UTF-8: 80 to BF must follow, but the text ends"
+loses 'malformed double-byte text' MS932 UTF-8 'a\x81\nb\x81\xad\xfa\x54\x81' 'a\xef\xbf\xbd\nb\xef\xbf\xbd\xef\xbf\xa2\xef\xbf\xbd' \
+  '4 characters lost from MS932 to UTF-8: 2 malformed, 1 unassigned in MS932, 1 changed
+  line 1, column 2 (byte 1): byte 81 is not MS932: a trail byte must follow, but there is 0A
+  line 2, column 2 (byte 4): bytes 81 AD are no character of MS932
+  line 2, column 3 (byte 6): bytes FA 54 are U+FFE2, which MS932 writes as 81 CA
+  line 2, column 4 (byte 8): byte 81 is not MS932: a trail byte must follow, but the text ends'
+state='is not IBM930 in the double-byte state:'
+loses 'malformed shift-sensitive text' 930 us-ascii '\xc1\x0e\x44\x81\x44\x0f\xc1\x15\x0e\x15\x44\x82\x44' 'A??A????' \
+  "6 characters lost from IBM930 to US-ASCII: 3 malformed, 3 not in US-ASCII
+  line 1, column 2 (byte 2): U+3042 is not in US-ASCII
+  line 1, column 3 (byte 4): byte 44 $state a second byte must follow, but there is 0F
+  line 1, column 5 (byte 7): U+0085 is not in US-ASCII
+  line 2, column 1 (byte 9): byte 15 $state no character begins with it
+  line 2, column 2 (byte 10): U+3044 is not in US-ASCII
+  line 2, column 3 (byte 12): byte 44 $state a second byte must follow, but the text ends"
+bytes 'b\xf0\x9f\x98\x80c' in
+"$lexicor" convert --from utf8 --to 930 --lossy in >substituted
+bytes 'b\x0ec' in
+says 'a character that would be a shift byte' 1 'U+000E is not in IBM930' "$lexicor" convert --from utf8 --to 930 in
+same 'a character that would be a shift byte' out substituted
 { head -c 65533 /dev/zero | tr '\0' a && printf '\xf0\x9f\x98\x80' && head -c 70000 /dev/zero | tr '\0' a &&
   printf '%.0s\xe2\x82\xac' $(seq 12); } >in
-convert 'losses in later pieces' 1 'lexicor: 13 characters lost from UTF-8 to Latin1
-  byte 65533: U+1F600, which has no 16-bit Unicode value
-'"$(for i in $(seq 0 8); do echo "  byte $((135537 + 3 * i)): U+20AC, which Latin1 lacks"; done)"'
-  and 3 more' UTF-8 Latin1 --strict in
-bytes 'abc' plain
-bytes 'd\xe2\x82\xac' euro
-convert 'losses in several files' 1 'lexicor: 1 character lost from UTF-8 to Latin1
-  euro, byte 1: U+20AC, which Latin1 lacks' UTF-8 Latin1 --strict plain euro
+convert 'losses in later pieces' 1 'lexicor: 13 characters lost from UTF-8 to Latin1: 13 not in Latin1
+  line 1, column 65534 (byte 65533): U+1F600 is not in Latin1
+'"$(for i in $(seq 0 8); do echo "  line 1, column $((135535 + i)) (byte $((135537 + 3 * i))): U+20AC is not in Latin1"; done)"'
+  and 3 more' UTF-8 Latin1 in
+{ head -c 65535 /dev/zero | tr '\0' a && printf '\xe3\x81\x82\xef\xbf\xbd?\x1a'; } >in
+convert 'no loss' 0 '' UTF-8 UTF-8 --strict in
+converts 'substitution characters themselves' UTF-8 MS932 '?\x1a\xe3\x81\x82' '?\x1a\x82\xa0'
 
-# --- Input that ends inside a character.
-{ head -c 65535 /dev/zero | tr '\0' a && printf '\xe3\x81'; } >in
-convert 'input cut behind a piece' 1 'lexicor: the input ends inside the character that begins at byte 65535' UTF-8 MS932 in
-bytes '\xc1\x0e\x44\x81\x44' in
-convert 'cut double-byte input' 1 'lexicor: the input ends inside the character that begins at byte 4' 930 UTF-8 in
-convert 'cut input of several files' 1 'lexicor: the input ends inside the character that begins at part1, byte 1' UTF-8 MS932 plain part1
+# --- A signature begins each file that has one; places are those of the file.
+bytes 'abc' plain
+bytes '\xef\xbb\xbfd\n\xe2\x82\xac\xef\xbb\xbf\xe3\x81' marked
+convert 'signatures' 1 'lexicor: 3 characters lost from UTF-8 to Latin1: 1 malformed, 2 not in Latin1
+  marked, line 2, column 1 (byte 5): U+20AC is not in Latin1
+  marked, line 2, column 2 (byte 8): U+FEFF is not in Latin1
+  marked, line 2, column 3 (byte 11): bytes E3 81 are not UTF-8: 80 to BF must follow, but there is 61' UTF-8 Latin1 plain marked plain
+cp marked expected && truncate -s 11 expected && cp expected marked
+convert 'a signature in UTF-8' 0 '' UTF-8 UTF-8 marked
+same 'a signature in UTF-8' out expected
 
 # --- The output file changes only when the conversion is complete, and then keeps its mode and its link.
 bytes 'ab\xe3\x81' cut
-printf 'old' >old && chmod 640 old && ln -s old link
-for arguments in '--from UTF-8 --to MS932 cut' '--from UTF-8 --to Latin1 --strict euro' '--from UTF-8 --to Latin1 none'; do
+printf 'old' >old && chmod 640 old && ln -s old link && ln -s new dangling
+for arguments in '--from UTF-8 --to MS932 --strict cut' '--from UTF-8 --to Latin1 none'; do
   "$lexicor" convert $arguments -o old 2>err && fault "$arguments: no error"
   [ "$(cat old)" = old ] || fault "$arguments: the output file changed"
 done
 convert 'output through a link' 0 '' UTF-8 Latin1 -o link plain
 [ "$(cat old)" = abc ] && [ -L link ] || fault 'output through a link'
 [ "$(stat -c %a old)" = 640 ] || fault 'mode of the output file'
+convert 'output through a dangling link' 0 '' UTF-8 Latin1 -o dangling plain
+same 'output through a dangling link' new plain
+printf 'before ' >log
+convert 'an open file' 0 '' UTF-8 Latin1 -o /dev/fd/3 plain 3>>log
+same 'an open file' log <(printf 'before abc')
+mkfifo pipe && { cat pipe >read & }
+convert 'a named pipe' 0 '' UTF-8 Latin1 -o pipe plain
+wait $!
+same 'a named pipe' read plain
+expect 'closed input' 1 'lexicor: standard input: it is closed' "$lexicor" convert --from UTF-8 --to Latin1 <&-
+(expect 'no open descriptor' 0 '' sh -c '"$0" convert --from UTF-8 --to Latin1 -o unsaid plain <&- >&- 2>&-' "$lexicor")
+same 'no open descriptor' unsaid plain
 convert 'a file onto itself' 0 '' UTF-8 037 -o old old
 same 'a file onto itself' old <(printf '\x81\x82\x83')
 ls old.* link.* none* >/dev/null 2>&1 && fault 'a temporary file is left'
@@ -202,10 +253,13 @@ for shift in '' x xx; do
     same "$name" out expected
   done
 done
-bytes 'ab\xe3\x81' cut
-expect 'mapped input cut' 1 'lexicor: the input ends inside the character that begins at byte 2' \
-  "$lexicor" map upper -o old cut
-same 'the output of a cut mapping' old <(printf '\x81\x82\x83')
+bytes 'bir iki' in
+expect 'a letter that the codepage lacks' 1 'lexicor: 3 characters lost: U+0069 maps to U+0130, which is not in MS932' \
+  "$lexicor" map upper --locale Turkish --codepage MS932 in
+same 'a letter that the codepage lacks' out <(printf 'B?R ?K?')
+maps 'malformed text between letters' upper 'a\xc3bc\xe7oi\xc3\xa9\xe3\x81' 'A\xc3BC\xe7OI\xc3\x89\xe3\x81'
+maps 'malformed double-byte text' half '\x82\x60\x81\n\x82\x60\x82' 'A\x81\nA\x82' --codepage MS932
+maps 'malformed host text' lower '\xc1\x0e\x42\xc1\x44\x0f\xc1\x0e\x25\x42\xc1' '\x81\x0e\x42\x81\x44\x0f\x81\x0e\x25\x42\x81' --codepage IBM939
 says 'no such mapping' 2 'title not in' "$lexicor" map title
 says 'mapping for an unknown locale' 2 "no territory 'Mars'.*lexicor list territories" "$lexicor" map upper --locale English_Mars
 
@@ -225,12 +279,21 @@ translates 'padded on a host' 0 '' 'ab' '\x81\x82\x40\x40' --from 1252 --to 1141
 translates 'trimmed' 0 '' 'ab  ' 'ab' --from 1252 --to 1251 --size 2 --trim
 translates 'left over' 1 'lexicor: the input is left over from byte 2 on: it does not fit in a size of 2, or ends inside a character' \
   'ab  ' 'ab' --from 1252 --to 1251 --size 2
-translates 'a field cut' 1 'lexicor: the input ends inside the character that begins at byte 1' 'a\xe3' '' --from utf8 --to 1252
+translates 'a lost character' 1 'lexicor: 1 character lost from UTF-8 to MS932: 1 not in MS932
+  line 1, column 2 (byte 1): U+00E9 is not in MS932' 'a\xc3\xa9' 'a?' --from utf8 --to 932
+translates 'a lost character, lossy' 0 '' 'a\xc3\xa9' 'a?' --from utf8 --to 932 --lossy
+translates 'half a pair' 1 'lexicor: 1 character lost from UTF-16 to US-ASCII: 1 not in US-ASCII
+  byte 2: U+D83D is not in US-ASCII' 'a\0\x3d\xd8' 'a?' --from 1200 --to us-ascii
+translates 'units cut' 1 'lexicor: the input ends inside the character that begins at byte 2' 'a\0b' '' --from 1200 --to utf8
+translates 'a malformed field' 1 "lexicor: malformed input at line 1, column 2 (byte 1): byte E3 $bad 80 to BF must follow, but the text ends" 'a\xe3' '' \
+  --from utf8 --to 1252
+translates 'a field beyond 16 bits' 1 "lexicor: line 1, column 2 (byte 1): U+1F600 is beyond U+FFFF, which only 'lexicor convert' takes" \
+  'a\xf0\x9f\x98\x80' '' --from utf8 --to utf8
 says 'padding to no size' 2 '--pad requires --size' "$lexicor" translate --from 1252 --to 1251 --pad
 says 'a size of nothing' 2 '--size' "$lexicor" translate --from 1252 --to 1251 --size 0
 says 'translation from an unknown codepage' 2 "unknown codepage 'utf-17'" "$lexicor" translate --from utf-17 --to 1251
-"$lexicor" translate --from UTF-8 --to IBM939 large >there
-same '1 MB translated' there <("$lexicor" convert --from UTF-8 --to IBM939 large)
+"$lexicor" translate --from UTF-8 --to IBM939 text >there
+same '1 MB translated' there <("$lexicor" convert --from UTF-8 --to IBM939 text)
 
 # --- Line ends: every kind, kinds left alone, shift states, ends that meet the end of a piece.
 # rewrites NAME STDERR FROM EOL INPUT OUTPUT ARGUMENTS...: input and expected output as escapes of printf.
@@ -242,9 +305,10 @@ rewrites() {
 }
 rewrites 'to line feeds' 'lexicor: 3 line ends (2 crlf, 1 lf), 2 rewritten' utf8 lf 'a\r\n\r\n\xc3\xa9\nb\r' \
   'a\n\n\xc3\xa9\nb\r' --report
-rewrites 'to pairs' '' MS932 crlf '\x82\xa0\n\x85\x0a\r\n\n' '\x82\xa0\r\n\x85\x0a\r\n\r\n'
+rewrites 'to pairs' '' MS932 crlf '\x82\xa0\n\x83\x5c\r\n\n' '\x82\xa0\r\n\x83\x5c\r\n\r\n'
 rewrites 'host lines to new line' 'lexicor: 3 line ends (1 crlf, 1 lf, 1 nl), 2 rewritten' IBM939 nl \
-  '\x0e\x44\x81\x44\x15\x0f\x0d\x25\xc1\x15\x25' '\x0e\x44\x81\x44\x15\x0f\x15\xc1\x15\x15' --report
+  '\x0e\x44\x81\x0f\x0d\x25\xc1\x15\x25' '\x0e\x44\x81\x0f\x15\xc1\x15\x15' --report
+rewrites 'characters beyond U+FFFF' '' utf8 lf '\xf0\x9f\x98\x80\r\n' '\xf0\x9f\x98\x80\n'
 rewrites 'an unclosed text' '' IBM939 lf '\x15\x0e\x44\x81' '\x25\x0e\x44\x81\x0f'
 rewrites 'only pairs' '' IBM037 lf '\x25\x0d\x25\x15' '\x25\x25\x15' --find crlf
 rewrites 'an empty text' 'lexicor: 0 line ends, 0 rewritten' utf8 lf '' '' --report
@@ -253,12 +317,12 @@ for bytes in 4094 4095 4096 65534 65535 65536; do
   "$lexicor" lines --from utf8 --eol lf -o out in
   same "a pair behind $bytes bytes" out <(tr -d '\r' <in)
 done
-bytes 'a\r\n\xe3\x81' half
-expect 'lines cut' 1 'lexicor: the input ends inside the character that begins at byte 3' \
+bytes 'a\r\n\xe7\x81\n' half
+expect 'malformed lines' 1 "lexicor: malformed input at line 2, column 1 (byte 3): bytes E7 81 are not UTF-8: 80 to BF must follow, but there is 0A" \
   "$lexicor" lines --from utf8 --eol lf -o old half
-same 'the output of cut lines' old <(printf '\x81\x82\x83')
+same 'the output of malformed lines' old <(printf '\x81\x82\x83')
 says 'no such line end' 2 'cr not in' "$lexicor" lines --from utf8 --eol cr
-says 'a full device' 1 '/dev/full' "$lexicor" lines --from utf8 --eol lf -o /dev/full half
+says 'a full device' 1 '/dev/full' "$lexicor" lines --from utf8 --eol lf -o /dev/full plain
 says 'a missing text' 1 'lexicor: missing: ' "$lexicor" lines --from utf8 --eol lf missing
 
 # --- Sorting: line ends, the sort, keys beside comparison, and what a line may hold.
@@ -409,6 +473,7 @@ stops 1 8 'there is no such time' 2026-02-29 format time 2026-02-29
 stops 1 6 'a time has the form YYYY-MM-DD[THH:MM[:SS]]' 2026-1-1 format time 2026-1-1
 stops 1 1 'reading stopped: not a number like -1234.56' 1,5 format money 1,5
 stops 1 1 'a character that is not UTF-8, or beyond U+FFFF' a😀x parse number a😀x
+stops 1 1 'a character that is not UTF-8, or beyond U+FFFF' a$'\xc3'bc parse number a$'\xc3'bc
 expect 'a format of a number' 2 'lexicor: --format is for times' "$lexicor" format number 1 --format %x
 
 # --- Messages: a catalog of one, in Latin1, written by hand for a little-endian machine.

@@ -12,6 +12,7 @@
 #include "compile.h"
 #include "control_source.h"
 #include "core/lxformat.h"
+#include "lexicor/descriptors.h"
 #include "ucm.h"
 
 namespace {
@@ -77,6 +78,7 @@ int check(const std::string& directory) {
 }  // namespace
 
 int main(int argc, char** argv) {
+  lexicor_cli::open_closed_descriptors();
   CLI::App app("Compiles, dumps and checks Lexicor locale data.");
   app.require_subcommand(1);
   std::string source, out, file, control_file, directory;

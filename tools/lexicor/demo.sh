@@ -78,6 +78,12 @@ if [ "$failed" -gt 0 ]; then
 fi
 echo "All $total conversions came back byte for byte."
 
+printf '\nA text that is half Latin1 and half UTF-8, as 932: what cannot come along is said.\n'
+if printf 'Fran\xe7ois Müller\nzahlt 5 € 😀\n' | "$lexicor" convert --from UTF-8 --to MS932 2>"$work/said"; then
+  echo 'nothing was said' && exit 1
+fi
+cat "$work/said"
+
 # values LOCALE: the same number, amount and moment as the locale writes them.
 values() {
   local number amount moment

@@ -5,6 +5,7 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <cerrno>
 #include <cstring>
 #include <utility>
@@ -29,6 +30,7 @@ size_t Input::read(char* buffer, size_t bytes) {
     if (n == 0) {
       if (fd_ != STDIN_FILENO) close(fd_);
       fd_ = -1;
+      if (got > 0) break;
     }
     got += static_cast<size_t>(n);
     offset_ += static_cast<uint64_t>(n);
@@ -63,13 +65,32 @@ uint64_t Input::total_bytes() const {
   return total;
 }
 
-std::string Input::locate(uint64_t offset) const {
-  if (names_.size() == 1) return "byte " + std::to_string(offset);
+bool Input::begins_file(uint64_t offset) const {
+  return std::any_of(starts_.begin(), starts_.end(),
+                     [&](const Start& start) { return start.offset == offset; });
+}
+
+Input::Start Input::start_before(uint64_t offset) const {
   Start start{0, 0};
   for (const Start& candidate : starts_) {
     if (candidate.offset <= offset) start = candidate;
   }
-  return title(start.file) + ", byte " + std::to_string(offset - start.offset);
+  return start;
+}
+
+std::string Input::locate(uint64_t offset) const {
+  const Start start = start_before(offset);
+  return file_prefix(start) + "byte " + std::to_string(offset - start.offset);
+}
+
+std::string Input::locate(uint64_t offset, uint64_t line, uint64_t column) const {
+  const Start start = start_before(offset);
+  return file_prefix(start) + "line " + std::to_string(line) + ", column " + std::to_string(column) +
+         " (byte " + std::to_string(offset - start.offset) + ")";
+}
+
+std::string Input::file_prefix(const Start& start) const {
+  return names_.size() == 1 ? "" : title(start.file) + ", ";
 }
 
 Failure Input::cut_at(uint64_t offset) const {
@@ -77,7 +98,8 @@ Failure Input::cut_at(uint64_t offset) const {
 }
 
 void Input::fail(size_t file) const {
-  throw Failure(kDataError, title(file) + ": " + std::strerror(errno));
+  const bool closed = errno == EBADF && names_[file] == "-";
+  throw Failure(kDataError, title(file) + ": " + (closed ? "it is closed" : std::strerror(errno)));
 }
 
 std::string Input::title(size_t file) const {

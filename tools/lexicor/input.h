@@ -17,18 +17,22 @@ class Input {
   Input(const Input&) = delete;
   Input& operator=(const Input&) = delete;
 
-  /// Reads until `bytes` bytes are there or the input ends; 0 at the end. Throws a Failure with the file's name
-  /// and the reason.
+  /// Reads until `bytes` bytes are there or a file ends; 0 at the end of the input. Throws a Failure with the
+  /// file's name and the reason.
   size_t read(char* buffer, size_t bytes);
 
   /// Where the files that have been opened begin in the whole text.
   std::vector<uint64_t> starts() const;
+  /// Whether one of them begins at a byte of the whole text.
+  bool begins_file(uint64_t offset) const;
 
   /// The size of all files together; 0 when one of them is no regular file.
   uint64_t total_bytes() const;
 
   /// Where a byte of the whole text stands: "byte 12", or "FILE, byte 12" when there are several files.
   std::string locate(uint64_t offset) const;
+  /// The same with the line and the column in its file: "line 2, column 5 (byte 12)".
+  std::string locate(uint64_t offset, uint64_t line, uint64_t column) const;
   /// What to throw when the input ended inside the character that begins there.
   Failure cut_at(uint64_t offset) const;
 
@@ -40,6 +44,8 @@ class Input {
 
   /// Opens the next file; false when there is none left.
   bool open_next();
+  Start start_before(uint64_t offset) const;
+  std::string file_prefix(const Start& start) const;
   [[noreturn]] void fail(size_t file) const;
   std::string title(size_t file) const;
 

@@ -16,6 +16,7 @@
 #include "pieces.h"
 #include "progress.h"
 #include "session.h"
+#include "well_formed.h"
 
 namespace lexicor_cli {
 
@@ -65,19 +66,18 @@ class Peer {
 class Source : public Peer {
  public:
   /// Reads the first piece: when this stands before the output is opened, a missing input leaves no trace.
-  explicit Source(Input& input)
-      : input_(input), piece_(Pieces::kBytes), got_(input.read(piece_.data(), piece_.size())) {}
+  Source(Input& input, const Codepage& codepage)
+      : input_(input), check_(codepage, input), piece_(Pieces::kBytes) {
+    read();
+  }
 
   void show(Progress& progress) { progress_ = &progress; }
-  uint64_t offset() const { return before_ + at_; }
 
  private:
   size_t move(char* buffer, size_t bytes) override {
     if (at_ == got_ && got_ != 0) {
       if (progress_ != nullptr) progress_->advance(got_);
-      before_ += got_;
-      at_ = 0;
-      got_ = input_.read(piece_.data(), piece_.size());
+      read();
     }
     const size_t count = std::min(bytes, got_ - at_);
     std::copy_n(piece_.data() + at_, count, buffer);
@@ -85,12 +85,22 @@ class Source : public Peer {
     return count;
   }
 
+  /// Reads the next piece. A stream takes characters by their first bytes: malformed text does not come to it.
+  void read() {
+    at_ = 0;
+    got_ = input_.read(piece_.data(), piece_.size());
+    if (got_ > 0)
+      check_.take(piece_.data(), got_);
+    else
+      check_.finish();
+  }
+
   Input& input_;
+  WellFormed check_;
   Progress* progress_ = nullptr;
   std::vector<char> piece_;
-  size_t got_;  // 0 at the end of the input
+  size_t got_ = 0;  // 0 at the end of the input
   size_t at_ = 0;
-  uint64_t before_ = 0;  // bytes of the earlier pieces
 };
 
 class Target : public Peer {
@@ -139,12 +149,6 @@ class Stream {
   [[noreturn]] void fail() const {
     peer_.rethrow();
     throw Failure(kDataError, "the stream failed: " + describe_code(LXGetError(locale_)));
-  }
-  /// Bytes that a read stream keeps. They are taken out; the input has ended.
-  size_t take_kept() {
-    size_t bytes = 0;
-    while (LXReadCharU(stream_, locale_) != LX_STREAM_NO_UNIT || LXGetError(locale_) == LX_OK) bytes += 2;
-    return bytes + (LXGetError(locale_) == LX_E_STREAM_HALF ? 1 : 0);
   }
 
  private:
@@ -207,7 +211,7 @@ int rewrite_lines(const LinesOptions& options, const CommonOptions& common) {
   uint32_t find = options.find.empty() ? LX_EOL_ALL : 0;
   for (const std::string& name : options.find) find |= kKinds.at(name);
   Input input(options.files);
-  Source source(input);
+  Source source(input, codepage);
   Output output(options.output);
   Target target(output);
   Progress progress(input.total_bytes(), !output.is_terminal());
@@ -219,7 +223,6 @@ int rewrite_lines(const LinesOptions& options, const CommonOptions& common) {
   source.rethrow();
   out.close();
   target.flush();
-  if (code == LX_E_STREAM_HALF) throw input.cut_at(source.offset() - in.take_kept());
   if (code != LX_OK) in.fail();
   output.commit();
   if (options.report) rewriter.report();
@@ -254,7 +257,9 @@ Run declare_lines(Arguments& command, const CommonOptions& common) {
       "EBCDIC\n"
       "nl is 0x15. A carriage return alone is no line end. Nothing but line ends is changed, except that "
       "shift\n"
-      "bytes that change nothing are left out.\n"
+      "bytes that change nothing are left out. Malformed text is refused: its place is shown, OUT stays as it "
+      "was, and\n"
+      "the exit code is 1.\n"
       "\n"
       "Examples:\n"
       "  lexicor lines --from UTF-8 --eol lf -o letter.unix letter.txt\n"

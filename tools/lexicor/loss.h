@@ -1,64 +1,57 @@
-// Finds the characters that a conversion loses: source characters without a Unicode value, and Unicode values
-// that the target codepage lacks. A text that really contains U+FFFD or the substitution character loses
-// nothing by it.
+// What a conversion loses: the kinds of losses, their count, the places and the words of the messages.
 #pragma once
 
-#include <lx.h>
-
-#include <bitset>
+#include <array>
 #include <cstdint>
 #include <string>
 #include <vector>
 
-#include "codepage.h"
+#include "command.h"
 
 namespace lexicor_cli {
 
-struct Loss {
-  uint64_t offset;      // of the character's first byte in the input
-  std::string message;  // what it is and why it is lost
+/// Why a character does not come back when the output is converted back.
+enum class LossKind {
+  kMalformed,   // bytes that make no character of the source
+  kUnassigned,  // a code of the source without a character
+  kLacking,     // a character that the target lacks
+  kChanged      // a character that comes back as another one, or in other bytes
 };
 
-class LossFinder {
+enum class OnLoss { kReport, kStop, kIgnore };
+
+class Losses {
  public:
-  LossFinder(const Codepage& source, const Codepage& target);
+  /// The names are those of the codepages.
+  Losses(const std::string& source, const std::string& target, OnLoss on_loss)
+      : source_(source), target_(target), on_loss_(on_loss) {}
 
-  /// Looks at the next bytes of the input. A character that they cut is looked at with the bytes that follow.
-  void take(const char* data, size_t bytes);
-  /// Looks at what take() has held back; call it when the input has ended on a whole character.
-  void finish() { look_at(text_.size()); }
+  bool ignored() const { return on_loss_ == OnLoss::kIgnore; }
+  /// Whether the places of losses are still wanted: of the first ones only.
+  bool places_wanted() const { return !ignored() && first_.size() < kReported; }
 
-  uint64_t count() const { return count_; }
-  /// The first of them, at most kReported.
-  const std::vector<Loss>& first() const { return first_; }
+  /// Records a loss: where it is, as Input says it, and what. Throws a Failure when the first loss ends the
+  /// work.
+  void record(LossKind kind, const std::string& where, const std::string& what);
+  /// Records losses whose places are not wanted.
+  void count(LossKind kind, uint64_t count) {
+    if (!ignored()) counts_[static_cast<size_t>(kind)] += count;
+  }
 
-  static constexpr size_t kReported = 10;
+  uint64_t total() const;
+  /// Throws the report when there is anything to report.
+  void throw_any() const;
+  /// The message: the losses of each kind, and the first ones with their places.
+  std::string report() const;
 
  private:
-  enum class Kind { kNone, kNoUnicode, kNotInTarget };
+  static constexpr size_t kKinds = 4;
+  static constexpr size_t kReported = 10;
 
-  void find_lacking(const Codepage& target);
-  void look_at(size_t bytes);
-  void look_at_chars(const char* text, const char* end, LXShiftState state);
-  Kind kind_of(LXWChar code, LXUChar unicode) const;
-  std::string describe(const char* text, int32_t bytes, LXUChar unicode, Kind kind) const;
-  void record(uint64_t offset, const std::string& message);
-  bool is_own_encoding(const char* text, int32_t bytes, int32_t unit_count);
-
-  const Codepage& source_;
-  const Codepage& target_;
-  std::bitset<0x10000> lacking_;  // Unicode values that the target lacks
-  bool has_replacement_ = false;  // the source has a character for U+FFFD
-  LXWChar replacement_ = 0;       // its packed code
-
-  std::string text_;  // bytes not looked at: of a cut character, then those of this call
-  LXShiftState state_ = LX_SHIFT_SINGLE;
-  uint64_t offset_ = 0;  // of text_ in the input
-  std::vector<LXUChar> units_;
-  std::string encoded_;
-
-  uint64_t count_ = 0;
-  std::vector<Loss> first_;
+  const std::string source_, target_;
+  const OnLoss on_loss_;
+  std::array<uint64_t, kKinds> counts_{};
+  std::vector<std::string> first_;
 };
 
 }  // namespace lexicor_cli

@@ -9,10 +9,13 @@
 #include "catalogue.h"
 #include "codepage.h"
 #include "command.h"
+#include "hex.h"
 #include "input.h"
 #include "locale.h"
+#include "malformed.h"
 #include "output.h"
 #include "pieces.h"
+#include "repertoire.h"
 #include "session.h"
 
 namespace lexicor_cli {
@@ -53,32 +56,107 @@ const LXObject* language_object(const std::string& name) {
                           LX_FIND_AND_LOAD, &code);
 }
 
+/// Counts the characters whose own mapping in the language has letters that the codepage lacks: the library
+/// puts the substitution character in their place.
+class LostMappings {
+ public:
+  LostMappings(const Codepage& codepage, const LXObject* language, int32_t special) : codepage_(codepage) {
+    if (special == 0 || codepage.utf8()) return;
+    const Repertoire repertoire(codepage);
+    for (uint32_t unicode = 0; unicode < 0x10000; ++unicode) {
+      const auto unit = static_cast<LXUChar>(unicode);
+      LXUChar result[2];
+      const int32_t results = LXLangGetSpecial(language, unit, 0, &result[0], &result[1], special);
+      for (int32_t i = 0; i < results; ++i) {
+        if (repertoire.has(unit) && !repertoire.has(result[i])) lost_[unit] = result[i];
+      }
+    }
+  }
+
+  void count(const std::string& text, LXShiftState state) {
+    if (lost_.empty()) return;
+    std::vector<LXUChar> units(text.size());
+    const auto length = static_cast<int32_t>(text.size());
+    const int32_t count =
+        LXStringToUnicodeEx(units.data(), length, codepage_.locale(), text.data(), state, length, 0);
+    for (int32_t i = 0; i < count; ++i) {
+      const auto found = lost_.find(units[static_cast<size_t>(i)]);
+      if (found == lost_.end()) continue;
+      if (count_++ == 0) first_ = found->first;
+    }
+  }
+
+  void throw_any() const {
+    if (count_ == 0) return;
+    throw Failure(kDataError, std::to_string(count_) + (count_ == 1 ? " character" : " characters") +
+                                  " lost: " + code_point_name(first_) + " maps to " +
+                                  code_point_name(lost_.at(first_)) + ", which is not in " + codepage_.name());
+  }
+
+ private:
+  const Codepage& codepage_;
+  std::map<LXUChar, LXUChar> lost_;
+  uint64_t count_ = 0;
+  LXUChar first_ = 0;
+};
+
 /// Maps a text that comes in pieces. Each call of the library begins in the single-byte state, so a piece that
 /// begins in the other one gets a shift byte in front, which is taken off again where the pieces meet.
 class Mapper {
  public:
   Mapper(const Codepage& codepage, const LXObject* language, Mapping mapping, Output& output)
-      : codepage_(codepage), language_(language), mapping_(mapping), output_(output) {}
+      : codepage_(codepage),
+        finder_(codepage),
+        language_(language),
+        mapping_(mapping),
+        output_(output),
+        lost_(codepage, language, mapping.special) {}
 
-  void take(const char* data, size_t got) {
-    for (size_t done = 0, bytes; done < got; done += bytes) {
-      bytes = codepage_.call_bytes(data + done, got - done);
-      if (!text_.empty() && codepage_.is_shift(text_.back()) && codepage_.is_shift(data[done])) map_whole();
-      text_.append(data + done, bytes);
-      map_safe();
-    }
+  void take(const char* data, size_t bytes) {
+    unseen_.append(data, bytes);
+    look(false);
   }
 
-  /// Ends the text: false when it ended inside a character, at boundary().
-  bool finish() {
+  /// Ends the text.
+  void finish() {
+    look(true);
     map_whole();
     if (waiting_) write_shift(LX_SHIFT_DOUBLE);
-    return text_.empty();
   }
 
-  uint64_t boundary() const { return offset_; }
+  void throw_losses() const { lost_.throw_any(); }
 
  private:
+  /// Takes the well-formed text of unseen_, and malformed bytes as they are.
+  void look(bool last) {
+    size_t at = 0;
+    while (at < unseen_.size()) {
+      const char* const text = unseen_.data() + at;
+      const Stretch stretch = finder_.next(text, unseen_.size() - at, unseen_state_, last);
+      const size_t good = stretch.good_bytes;
+      if (good == 0 && stretch.end == Stretch::End::kText) break;
+      if (good > 0) take_good(text, good);
+      if (stretch.end == Stretch::End::kMalformed) pass_on(text + good, stretch.end_bytes);
+      at += good + stretch.end_bytes;
+    }
+    unseen_.erase(0, at);
+  }
+
+  void take_good(const char* text, size_t bytes) {
+    if (codepage_.shift_sensitive()) codepage_.whole_bytes(text, bytes, unseen_state_, &unseen_state_);
+    if (!text_.empty() && codepage_.is_shift(text_.back()) && codepage_.is_shift(*text)) map_whole();
+    text_.append(text, bytes);
+    map_safe();
+  }
+
+  void pass_on(const char* text, size_t bytes) {
+    map_whole();
+    if (written_state_ != state_) write_shift(state_);
+    written_state_ = state_;
+    waiting_ = false;
+    output_.write(text, bytes);
+  }
+
   /// A character near the end of text_: where it, or the shift byte before it, begins, and the state there.
   struct Char {
     size_t begin;
@@ -137,6 +215,7 @@ class Mapper {
   void map(size_t bytes, LXShiftState state) {
     if (bytes == 0) return;
     std::string input = text_.substr(0, bytes);
+    lost_.count(input, state_);
     if (state_ == LX_SHIFT_DOUBLE && !codepage_.is_shift(input[0]))
       input.insert(0, 1, codepage_.shift_byte(LX_SHIFT_DOUBLE));
     mapped_.resize(input.size() * kGrowth);
@@ -148,7 +227,6 @@ class Mapper {
     write(mapped_.data(), static_cast<size_t>(written));
     text_.erase(0, bytes);
     state_ = state;
-    offset_ += bytes;
   }
 
   /// Writes a mapped piece, which begins in the single-byte state, behind what is written. A Shift-Out at its
@@ -180,12 +258,15 @@ class Mapper {
   }
 
   const Codepage& codepage_;
+  const MalformedFinder finder_;
   const LXObject* language_;
   const Mapping mapping_;
   Output& output_;
-  std::string text_;                              // not yet mapped
+  LostMappings lost_;
+  std::string unseen_;                            // a cut character, then what is not looked at
+  LXShiftState unseen_state_ = LX_SHIFT_SINGLE;   // at its beginning
+  std::string text_;                              // well-formed and not yet mapped
   LXShiftState state_ = LX_SHIFT_SINGLE;          // at its beginning
-  uint64_t offset_ = 0;                           // of text_ in the input
   bool waiting_ = false;                          // a Shift-Out
   LXShiftState written_state_ = LX_SHIFT_SINGLE;  // at the end of the output
   std::vector<char> mapped_;
@@ -201,8 +282,9 @@ int map(const MapOptions& options, const CommonOptions& common) {
   Output output(options.output);
   Mapper mapper(codepage, language_object(language), kMappings.at(options.mapping), output);
   pieces.each(!output.is_terminal(), [&](const char* data, size_t bytes) { mapper.take(data, bytes); });
-  if (!mapper.finish()) throw input.cut_at(mapper.boundary());
+  mapper.finish();
   output.commit();
+  mapper.throw_losses();
   return kDone;
 }
 
@@ -224,7 +306,9 @@ Run declare_map(Arguments& command, const CommonOptions& common) {
   command.add_option("FILE", options->files, "input files, taken as one text; - is standard input")
       .type_name("");
   command.footer(
-      "A character without a mapping stays as it is. Width is what the codepage has in both forms.\n"
+      "A character without a mapping stays as it is, and so do malformed bytes. Width is what the codepage has "
+      "in both\n"
+      "forms. A letter of the language that the codepage lacks is lost, which is said, and exits with 1.\n"
       "\n"
       "Examples:\n"
       "  lexicor map upper --locale German letter.txt\n"

@@ -6,10 +6,11 @@
 #include <unistd.h>
 
 #include <cerrno>
+#include <charconv>
 #include <csignal>
 #include <cstdio>
-#include <cstdlib>
 #include <cstring>
+#include <filesystem>
 
 #include "command.h"
 
@@ -42,12 +43,42 @@ mode_t mode_of(const struct stat* existing) {
   return 0666 & ~mask;
 }
 
-std::string real_path(const std::string& path) {
-  char* resolved = realpath(path.c_str(), nullptr);
-  if (resolved == nullptr) return path;
-  std::string result = resolved;
-  std::free(resolved);
-  return result;
+/// Where a path leads, and whether a symbolic link leads on from there. All but the last name are resolved.
+struct Step {
+  std::filesystem::path directory;
+  std::filesystem::path name;
+
+  std::string path() const { return (directory / name).string(); }
+};
+
+Step step_to(const std::filesystem::path& path) {
+  std::error_code error;
+  const std::filesystem::path parent = path.has_parent_path() ? path.parent_path() : ".";
+  const std::filesystem::path directory = std::filesystem::canonical(parent, error);
+  return {error ? parent : directory, path.filename()};
+}
+
+/// The descriptor that a name in the directory of this process's open files stands for, else -1.
+int descriptor_of(const Step& step) {
+  std::error_code error;
+  if (step.directory != std::filesystem::canonical("/proc/self/fd", error) || error) return -1;
+  const std::string name = step.name.string();
+  int descriptor = -1;
+  const auto end = std::from_chars(name.data(), name.data() + name.size(), descriptor);
+  return end.ec == std::errc() && end.ptr == name.data() + name.size() ? descriptor : -1;
+}
+
+/// Follows symbolic links to the file that they name, whether it exists or not, or to an open descriptor.
+Step follow(const std::string& path) {
+  constexpr int kMostLinks = 40;
+  Step step = step_to(path);
+  for (int links = 0; links < kMostLinks && descriptor_of(step) < 0; ++links) {
+    std::error_code error;
+    const std::filesystem::path next = std::filesystem::read_symlink(step.path(), error);
+    if (error) break;
+    step = step_to(step.directory / next);
+  }
+  return step;
 }
 
 }  // namespace
@@ -58,6 +89,14 @@ Output::Output(const std::string& path) : path_(path) {
     fd_ = STDOUT_FILENO;
     return;
   }
+  const Step step = follow(path);
+  target_ = step.path();
+  const int descriptor = descriptor_of(step);
+  if (descriptor >= 0) {
+    fd_ = fcntl(descriptor, F_DUPFD_CLOEXEC, STDERR_FILENO + 1);
+    if (fd_ < 0) fail();
+    return;
+  }
   struct stat status;
   const bool exists = stat(path.c_str(), &status) == 0;
   if (exists && !S_ISREG(status.st_mode)) {
@@ -66,7 +105,6 @@ Output::Output(const std::string& path) : path_(path) {
     return;
   }
   if (exists && access(path.c_str(), W_OK) != 0) fail();
-  target_ = exists ? real_path(path) : path;
   std::string name = target_ + ".XXXXXX";
   fd_ = mkostemp(name.data(), O_CLOEXEC);
   if (fd_ < 0) fail();
@@ -112,7 +150,8 @@ bool Output::is_terminal() const {
 }
 
 void Output::fail() const {
-  throw Failure(kDataError, path_ + ": " + std::strerror(errno));
+  const bool closed = errno == EBADF && fd_ <= STDERR_FILENO;
+  throw Failure(kDataError, path_ + ": " + (closed ? "it is closed" : std::strerror(errno)));
 }
 
 }  // namespace lexicor_cli

@@ -10,6 +10,7 @@
 #include <string>
 
 #include "command.h"
+#include "descriptors.h"
 #include "output.h"
 
 namespace lexicor_cli {
@@ -27,6 +28,7 @@ inline int answer_parse(const CLI::App& app, const CLI::ParseError& error) {
 
 /// Runs the program; what it throws becomes a message and an exit code.
 inline int run_program(const char* name, int (*run)(int, char**), int argc, char** argv) {
+  open_closed_descriptors();
   std::signal(SIGPIPE, SIG_IGN);
   try {
     return run(argc, argv);

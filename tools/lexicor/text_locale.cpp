@@ -8,12 +8,12 @@
 
 #include "catalogue.h"
 #include "locale.h"
+#include "malformed.h"
 
 namespace lexicor_cli {
 
 namespace {
 
-constexpr LXUChar kReplacement = 0xFFFD;
 constexpr size_t kUtf8Growth = 3;
 
 /// The columns of the first characters of a text: two of a wide character, none of a combining one.
@@ -45,18 +45,15 @@ TextLocale::TextLocale(const Session& session, const std::string& name)
     : utf8_(session, read_catalogue(), "UTF-8", language_territory(open_chosen_locale(name).get())) {}
 
 Units TextLocale::units(const std::string& text) const {
-  LXShiftState state;
-  const size_t whole = utf8_.whole_bytes(text.data(), text.size(), LX_SHIFT_SINGLE, &state);
-  Units units(whole);
-  const int32_t count = whole == 0 ? 0
-                                   : LXStringToUnicode(units.data(), static_cast<int32_t>(whole), locale(),
-                                                       text.data(), static_cast<int32_t>(whole), 0);
+  const Stretch stretch = MalformedFinder(utf8_, true).next(text.data(), text.size(), LX_SHIFT_SINGLE, true);
+  const auto bytes = static_cast<int32_t>(stretch.good_bytes);
+  Units units(stretch.good_bytes);
+  const int32_t count =
+      bytes == 0 ? 0 : LXStringToUnicode(units.data(), bytes, locale(), text.data(), bytes, 0);
   units.resize(static_cast<size_t>(std::max(count, 0)));
-  if (whole < text.size()) units.push_back(kReplacement);
-  const auto bad = std::find(units.begin(), units.end(), kReplacement);
-  if (bad != units.end())
+  if (stretch.end != Stretch::End::kText)
     throw marked(kDataError, "a character that is not UTF-8, or beyond U+FFFF", text,
-                 columns(units, static_cast<size_t>(bad - units.begin())));
+                 columns(units, units.size()));
   return units;
 }
 

@@ -3,6 +3,7 @@
 #include <nls1.h>
 
 #include <algorithm>
+#include <cstring>
 #include <limits>
 #include <memory>
 
@@ -11,9 +12,13 @@
 #include "codepage.h"
 #include "command.h"
 #include "input.h"
+#include "loss.h"
 #include "output.h"
 #include "pieces.h"
+#include "recoder.h"
+#include "repertoire.h"
 #include "session.h"
+#include "well_formed.h"
 
 namespace lexicor_cli {
 
@@ -28,56 +33,114 @@ constexpr size_t kClosingBytes = 1;
 struct TranslateOptions {
   std::string from, to, output = "-";
   int32_t size = 0;  // 0: as much as the text needs
-  bool pad = false, trim = false;
+  bool pad = false, trim = false, lossy = false;
   std::vector<std::string> files;
 };
 
-/// The number that the process layer knows a codepage by.
-int32_t codepage_number(const Session& session, const Catalogue& catalogue, const std::string& name) {
-  if (name == std::to_string(NLS1_UTF16) || same_name(name, "UTF-16")) return NLS1_UTF16;
-  return static_cast<int32_t>(Codepage(session, catalogue, name).id());
-}
+/// The source or the target: a codepage, or 16-bit Unicode.
+class Side {
+ public:
+  Side(const Session& session, const Catalogue& catalogue, const std::string& name)
+      : utf16_(name == std::to_string(NLS1_UTF16) || same_name(name, kUtf16Name)),
+        codepage_(session, catalogue, utf16_ ? "UTF-8" : name) {}
 
-/// The whole input, which is one string for the library.
-std::vector<char> read_whole(Pieces& pieces, bool show_progress) {
+  bool utf16() const { return utf16_; }
+  std::string name() const { return utf16_ ? kUtf16Name : codepage_.name(); }
+  /// The number that the process layer knows it by.
+  int32_t number() const { return utf16_ ? NLS1_UTF16 : static_cast<int32_t>(codepage_.id()); }
+  /// The codepage; of 16-bit Unicode UTF-8, which has the same characters.
+  const Codepage& codepage() const { return codepage_; }
+
+ private:
+  static constexpr char kUtf16Name[] = "UTF-16";
+
+  bool utf16_;
+  Codepage codepage_;
+};
+
+/// The whole input, which is one string for the library. Each piece is shown to `look(data, bytes)`.
+template <class Look>
+std::vector<char> read_whole(Pieces& pieces, bool show_progress, Look look) {
   std::vector<char> text;
   pieces.each(show_progress, [&](const char* data, size_t bytes) {
     if (bytes > kMostBytes - text.size())
       throw Failure(kDataError, "the input is longer than " + std::to_string(kMostBytes) +
                                     " bytes; 'lexicor convert' takes any length");
+    look(data, bytes);
     text.insert(text.end(), data, data + bytes);
   });
   return text;
 }
 
+/// Reads the input, of which malformed text is refused, and finds what is lost of it.
+std::vector<char> read_text(const Side& source, const Side& target, const Input& input, Pieces& pieces,
+                            bool show_progress, Losses* losses) {
+  WellFormed check(source.codepage(), input, true);
+  Recoder recoder(source.codepage(), target.codepage(), input, nullptr, *losses);
+  std::vector<char> text = read_whole(pieces, show_progress, [&](const char* data, size_t bytes) {
+    check.take(data, bytes);
+    recoder.take(data, bytes);
+  });
+  check.finish();
+  recoder.finish();
+  return text;
+}
+
+/// Reads 16-bit units, and finds what is lost of them. A half of a surrogate pair is no character.
+std::vector<char> read_units(const Side& target, const Input& input, Pieces& pieces, bool show_progress,
+                             Losses* losses) {
+  std::vector<char> text = read_whole(pieces, show_progress, [](const char*, size_t) {});
+  if (target.utf16()) return text;
+  const Repertoire repertoire(target.codepage());
+  for (size_t at = 0; at + sizeof(LXUChar) <= text.size(); at += sizeof(LXUChar)) {
+    LXUChar unit;
+    std::memcpy(&unit, text.data() + at, sizeof unit);
+    if (!repertoire.has(unit))
+      losses->record(repertoire.kind_of_loss(unit), input.locate(at), repertoire.describe_loss(unit));
+  }
+  return text;
+}
+
+/// The size that the output needs at most, up to what the library takes.
+size_t needed_bytes(size_t text_bytes) {
+  return static_cast<size_t>(std::min<uint64_t>(kMostBytes, uint64_t{text_bytes} * kGrowth + kClosingBytes));
+}
+
 int translate(const TranslateOptions& options, const CommonOptions& common) {
   const Session session(common);
   const Catalogue catalogue = read_catalogue();
-  const int32_t source = codepage_number(session, catalogue, options.from);
-  const int32_t target = codepage_number(session, catalogue, options.to);
+  const Side source(session, catalogue, options.from);
+  const Side target(session, catalogue, options.to);
   Input input(options.files);
   Pieces pieces(input);
   Output output(options.output);
-  const std::vector<char> text = read_whole(pieces, !output.is_terminal());
-  const auto needed =
-      static_cast<size_t>(std::min<uint64_t>(kMostBytes, uint64_t{text.size()} * kGrowth + kClosingBytes));
+  Losses losses(source.name(), target.name(), options.lossy ? OnLoss::kIgnore : OnLoss::kReport);
+  const bool show = !output.is_terminal();
+  const std::vector<char> text = source.utf16() ? read_units(target, input, pieces, show, &losses)
+                                                : read_text(source, target, input, pieces, show, &losses);
+  const size_t needed = needed_bytes(text.size());
   const size_t size = options.size > 0 ? static_cast<size_t>(options.size) : needed;
   const std::unique_ptr<char[]> buffer(new char[size]);  // not filled: what is not used takes no memory
   int32_t consumed = 0;
   uint32_t code = LX_OK;
-  const int32_t written = NLS1_TranslateString(
-      target, source, buffer.get(), static_cast<int32_t>(size), text.data(), static_cast<int32_t>(text.size()),
-      &consumed, (options.pad ? NLS1_PAD : 0) | (options.trim ? NLS1_DROP_BLANKS : 0), &code);
+  const int32_t written =
+      NLS1_TranslateString(target.number(), source.number(), buffer.get(), static_cast<int32_t>(size),
+                           text.data(), static_cast<int32_t>(text.size()), &consumed,
+                           (options.pad ? NLS1_PAD : 0) | (options.trim ? NLS1_DROP_BLANKS : 0), &code);
   if (code != LX_OK && code != LX_E_SIZE)
     throw Failure(kDataError, "the translation failed: " + describe_code(static_cast<int>(code)));
-  const auto rest = static_cast<uint64_t>(consumed);
+  const auto rest = static_cast<size_t>(consumed);
   if (code == LX_E_SIZE && options.size == 0 && needed < kMostBytes) throw input.cut_at(rest);
   if (written > 0) output.write(buffer.get(), static_cast<size_t>(written));
   output.commit();
-  if (code == LX_OK) return kDone;
+  if (code == LX_OK) {
+    losses.throw_any();
+    return kDone;
+  }
   throw Failure(kDataError, "the input is left over from " + input.locate(rest) +
                                 " on: it does not fit in a size of " + std::to_string(size) +
-                                ", or ends inside a character");
+                                ", or ends inside a character" +
+                                (losses.total() == 0 ? "" : "\n" + losses.report()));
 }
 
 }  // namespace
@@ -99,6 +162,7 @@ Run declare_translate(Arguments& command, const CommonOptions& common) {
   command.add_flag("--pad", options->pad, "fill the output up to the size with blanks").needs(size);
   command.add_flag("--trim", options->trim, "blanks at the end of the input that do not fit are no error")
       .needs(size);
+  command.add_flag("--lossy", options->lossy, "say nothing of lost characters, and exit with 0");
   command.add_option("-o,--output", options->output, "output file, replaced when it is complete")
       .type_name("OUT");
   command.add_option("FILE", options->files, "input files, taken as one string; - is standard input")
@@ -108,7 +172,9 @@ Run declare_translate(Arguments& command, const CommonOptions& common) {
       "UTF-16 has\n"
       "the byte order of this machine and no mark of it. Output in a shift-sensitive codepage ends in the "
       "single-byte\n"
-      "state; a full output loses its last double-byte character for that.\n"
+      "state; a full output loses its last double-byte character for that. Lost characters are reported as "
+      "'lexicor\n"
+      "convert' does, and exit with 1. Malformed input and characters beyond U+FFFF are refused.\n"
       "\n"
       "Examples:\n"
       "  lexicor translate --from UTF-8 --to IBM930 -o field.host field.utf8\n"

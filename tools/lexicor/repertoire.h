@@ -1,0 +1,48 @@
+// The characters that a codepage has: which 16-bit Unicode values come back from it as they were.
+#pragma once
+
+#include <lx.h>
+
+#include <bitset>
+#include <string>
+#include <vector>
+
+#include "character_values.h"
+#include "codepage.h"
+#include "loss.h"
+
+namespace lexicor_cli {
+
+class Repertoire {
+ public:
+  explicit Repertoire(const Codepage& codepage);
+
+  bool has(LXUChar unicode) const { return !lost_[unicode]; }
+  bool has_all(const LXUChar* units, size_t count) const;
+  /// How a value that the codepage has not is lost.
+  LossKind kind_of_loss(LXUChar unicode) const;
+  /// What is lost of a value that the codepage has not, in words.
+  std::string describe_loss(LXUChar unicode) const;
+  /// Makes has_all() say no to a value, so that texts with it are looked at.
+  void watch(LXUChar unicode);
+
+ private:
+  static constexpr uint32_t kValues = 0x10000, kAscii = 0x80;
+
+  /// What a value is when it is written and read back; U+FFFD when the codepage lacks it.
+  LXUChar back(LXUChar unicode) const;
+  void learn_ascii();
+  LXUChar value_of(LXWChar code) const;
+
+  const Codepage& codepage_;
+  const Substitution substitution_;
+  const std::vector<LXUChar> single_;
+  std::bitset<kValues> lost_;
+  std::bitset<kValues> watched_;  // and those that are lost
+  bool has_ascii_;
+};
+
+/// That a codepage lacks a character.
+std::string lacks_text(uint32_t code_point, const std::string& codepage);
+
+}  // namespace lexicor_cli
