@@ -274,12 +274,14 @@ for key in '' --key; do
     --locale Swedish@Swedish $key
   sorts "a line without an end $key" 'b\r\nx\0y\nx\0\r\n\n\r\na' '\n\r\na\r\nb\r\nx\0\r\nx\0y\n' --locale English@BINARY $key
   sorts "equal lines $key" 'b\na\nA\r\nB\na\r\n' 'b\nB\na\nA\r\na\r\n' --locale English@Default --case-insensitive --reverse $key
-  sorts "unequal lines $key" 'b\nA\na\r\nB\na\n' 'A\nb\n' --locale English@Default --case-insensitive --unique $key
+  sorts "unequal lines $key" 'b\nA\na\r\nB\na\n' 'A\nb\n' --locale English@Default --case-insensitive --unique=order $key
+  sorts "lines of other bytes $key" 'a\nco\xc2\xadop\ncoop\nco\xc2\xadop\na\r\nb\ncoop' 'a\na\r\nb\nco\xc2\xadop\ncoop\n' \
+    --locale English@Default --unique $key
   sorts "without case in binary order $key" '\xb1\n\x88\x9f\na\n\nA\n\0\0\0\n' '\n\0\0\0\na\nA\n\xb1\n\x88\x9f\n' \
     --locale English@BINARY --codepage MS932 --case-insensitive $key
   sorts "host text with meeting fields $key" '\x0e\x44\x82\x0f\x0e\x44\x81\x0f\x25\xc1\x25\x0e\x44\x82\x44\x81\x0f\x25\x0e\x44\x81' \
     '\xc1\x25\x0e\x44\x81\x0f\x25\x0e\x44\x82\x0f\x0e\x44\x81\x0f\x25' \
-    --locale Japanese@Japanese --codepage IBM930 --unique $key
+    --locale Japanese@Japanese --codepage IBM930 --unique=order $key
 done
 bytes 'b\na' part1
 bytes 'd\nc\n' part2
@@ -289,7 +291,7 @@ python3 -c '
 import random
 random.seed(1)
 for _ in range(100000):
-    print("".join(random.choices("aàbcdhlnñoôszAÀCHÑ \u0301-", k=random.randrange(9))))' >words
+    print("".join(random.choices("aàbcdhlnñoôszAÀCHÑ \u0301\u00ad-中ガ", k=random.randrange(9))))' >words
 for locale in English@Default Spanish@SpanishTraditional French@FrenchCanadian Vietnamese@Vietnamese; do
   expect "100,000 lines in $locale" 0 '' "$lexicor" sort --locale $locale -o compared words
   expect "100,000 keys in $locale" 0 '' "$lexicor" sort --locale $locale --key -o by_key words
@@ -318,6 +320,9 @@ orders 4 'ö > z' compare --locale Swedish@Swedish ö z
 orders 3 'ö < z' compare --locale German@Default ö z
 orders 0 'Zoo = zoo' compare --locale English@Default --case-insensitive Zoo zoo
 orders 0 'Ａ = A' compare --locale Japanese@Japanese --width-insensitive Ａ A
+orders 3 'Ａb < abc' compare --locale Japanese@BINARY --width-insensitive Ａb abc
+orders 3 'ab < abc' compare --locale English@Default --width-insensitive ab abc
+orders 0 $'\xc2\xad- = -: nothing decides' explain --locale English@Default $'\xc2\xad-' -
 expect 'half an argument' 1 "lexicor: 'a"$'\xe3'"' ends inside the character that begins at byte 1" "$lexicor" compare a$'\xe3' b
 says 'case and width' 2 'excludes' "$lexicor" compare --width-insensitive --case-insensitive a b
 orders 0 '61 C3 A9' key --locale English@BINARY aé
