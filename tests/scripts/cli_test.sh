@@ -130,7 +130,9 @@ says 'near alias' 2 'did you mean SHIFT-JIS' "$lexicor" convert --from shift+jis
 says 'no near name' 2 'lexicor list codepages' "$lexicor" convert --from xyzzyplugh --to utf8
 says 'identifier that is none' 2 "unknown codepage '70000'" "$lexicor" convert --from 70000 --to utf8
 says 'no subcommand' 2 'subcommand is required' "$lexicor"
-says 'unknown option' 2 '--jsn' "$lexicor" list --jsn
+says 'unknown option' 2 '^lexicor: unknown option --form; did you mean --from?$' "$lexicor" convert --form utf8
+says 'unknown command' 2 "^lexicor: unknown command 'sotr'; did you mean sort?$" "$lexicor" sotr --locale German
+says 'not yet a codepage' 2 "codepage 'utf-16le' is not supported" "$lexicor" convert --from utf-16le --to utf8
 convert 'no input file' 1 'lexicor: none: No such file or directory' utf8 037 none
 convert 'a directory' 1 'lexicor: .: Is a directory' utf8 037 .
 convert 'no output directory' 1 'lexicor: none/out: No such file or directory' utf8 037 -o none/out plain
@@ -162,6 +164,11 @@ says 'a damaged object is not replaced silently' 1 'codepage IBM037 cannot be lo
   "$lexicor" --locale-dir broken convert --from us-ascii --to 037 plain
 says 'a missing object is not replaced silently' 1 'codepage UTF-8 cannot be loaded: file not found' \
   "$lexicor" --locale-dir broken convert --from us-ascii --to utf-8 plain
+cp -r "$2/locale" damaged && head -c 100 /dev/zero >damaged/so_00001.nls
+says 'a damaged default sort' 1 'sort Default cannot be loaded: the file is damaged .*(code 2000): damaged/so_00001.nls' \
+  "$lexicor" --locale-dir damaged compare --locale German a b
+: >broken/control.nls
+says 'an empty control file' 0 'in broken (broken/control.nls is empty)' "$lexicor" --locale-dir broken list
 head -c 100 /dev/zero >broken/control.nls
 says 'a damaged control file' 0 'in broken (the file is damaged' "$lexicor" --locale-dir broken list
 grep -q '^ *1  US-ASCII$' out || fault 'the built-in codepage is not listed'
@@ -316,7 +323,10 @@ orders() {
   expect "$*" "$1" '' "$lexicor" "${@:3}"
   [ "$(tail -n 1 out)" = "$2" ] || fault "$*: $(cat out)"
 }
-orders 4 'ö > z' compare --locale Swedish@Swedish ö z
+orders 4 'ö > z' compare --locale sv_SE.UTF-8 ö z
+expect "the user's order" 4 '' env LC_ALL=sv_SE.UTF-8 "$lexicor" compare ö z
+says "the user's unknown system locale" 3 '^lexicor: .* xx_YY.UTF-8: it is not known; English_UnitedStates\..* is used instead$' \
+  env LC_ALL=xx_YY.UTF-8 "$lexicor" compare ö z
 orders 3 'ö < z' compare --locale German@Default ö z
 orders 0 'Zoo = zoo' compare --locale English@Default --case-insensitive Zoo zoo
 orders 0 'Ａ = A' compare --locale Japanese@Japanese --width-insensitive Ａ A
@@ -360,7 +370,8 @@ cp "$2/locale/control.nls" broken
 says 'info on no locale' 2 "no language 'Klingon'" "$lexicor" info Klingon
 says 'info on a damaged codepage' 1 'codepage IBM037 cannot be loaded' "$lexicor" --locale-dir broken info English.IBM037
 says 'an unknown system name' 2 "operating-system locale 'c'" "$lexicor" info --native c
-expect 'a whole system locale' 0 '' "$lexicor" native C
+expect 'a whole system locale' 0 '' "$lexicor" native 'LC_CTYPE=ja_JP.EUC-JP;LC_NUMERIC=C;LC_TIME=C;LC_COLLATE=C;'
+grep -q '^codepage   JapanEUC ' out || fault "a whole system locale: $(cat out)"
 expect 'an unknown system locale' 1 \
   "lexicor: unknown operating-system locale 'xx'; 'lexicor list locales' shows those that are known" "$lexicor" native xx
 run 'a system locale with missing objects' 1 "$lexicor" --locale-dir broken native en_US.utf8
@@ -424,7 +435,7 @@ mkdir -p cats/DE_DEU
 answers Grüße message cats/DE_DEU/app.cat 1 3
 answers Grüße message app 1 3 --load --locale German_Germany --directory 'none;cats/%L/%N.cat'
 answers ersatz message cats/DE_DEU/app.cat 1 4 --default ersatz
-"$lexicor" message cats/DE_DEU/app.cat 1 3 --codepage IBM273 >out
+"$lexicor" message app 1 3 --locale German_Germany --directory 'cats/%L/%N.cat' --codepage IBM273 >out
 same 'a message for a host' out <(printf '\xc7\x99\xd0\xa1\x85\x25')
 "$lexicor" message cats/DE_DEU/app.cat 1 4 --codepage IBM930 --default あ >out
 same 'a default text for a host' out <(printf '\x0e\x44\x81\x0f\x25')
