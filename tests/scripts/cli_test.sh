@@ -389,6 +389,7 @@ stops() {
   expect "${*:5}" "$1" "$(printf 'lexicor: %s\n  %s\n  %*s^' "$3" "$4" "$2" '')" "$lexicor" "${@:5}"
 }
 answers '-1.234.567' format number -1234567 --locale German.IBM273
+answers '-2,14,74,83,649' format number -2147483649 --locale Hindi_India
 answers '5,000,000,000.23' format number 5000000000.239 --locale English
 answers '-₹12,34,567.50' format money -1234567.5 --locale Hindi_India
 answers 'JPY1,234.' format money 1234 --locale Japanese_Japan --international
@@ -424,6 +425,7 @@ stops 2 1 'a format has no such directive' é%U parse time 5 --format é%U
 stops 1 8 'there is no such time' 2026-02-29 format time 2026-02-29
 stops 1 6 'a time has the form YYYY-MM-DD[THH:MM[:SS]]' 2026-1-1 format time 2026-1-1
 stops 1 1 'reading stopped: not a number like -1234.56' 1,5 format money 1,5
+stops 1 0 'a whole number that a double cannot hold to its last digit' 9007199254740993 format number 9007199254740993
 stops 1 1 'a character that is not UTF-8, or beyond U+FFFF' a😀x parse number a😀x
 expect 'a format of a number' 2 'lexicor: --format is for times' "$lexicor" format number 1 --format %x
 
@@ -463,6 +465,14 @@ assert list(lists) == ["codepages", "languages", "territories", "sorts"], list(l
 ms932 = [row for row in lists["codepages"] if row["name"] == "MS932"]
 assert len(ms932) == 1 and ms932[0]["id"] == 932 and "CP932" in ms932[0]["aliases"], ms932
 ' || fault 'the list as JSON'
+
+# --- The README's commands do as they are written, in the source directory; compare answers by its exit code.
+while read -r command; do
+  command=${command//build\/m64/$2}
+  (cd "$source_dir" && eval "${command//\/tmp\//$work/}") >out 2>err
+  status=$?
+  [ "$status" = 0 ] || [[ $command == *' compare '* && $status -ge 3 ]] || fault "README: $command: $(cat err)"
+done < <(grep '^build/m64/bin/' "$source_dir/README.md")
 
 [ "$failures" = 0 ] || exit 1
 echo 'The command line does what it says.'
