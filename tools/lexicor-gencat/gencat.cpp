@@ -132,13 +132,14 @@ struct ChosenLocale {
 
 ChosenLocale choose_locale(const Options& options, const Catalog* existing, const std::vector<Source>& sources,
                            Encodings& encodings) {
+  const std::string asked = lexicor_cli::core_name(options.locale);
   if (existing != nullptr) {
-    if (!options.locale.empty() && !lexicor_cli::same_name(options.locale, existing->locale))
+    if (!asked.empty() && !lexicor_cli::same_name(asked, existing->locale))
       throw Failure(kUsageError, options.catalog + ": its texts are in " + existing->locale + ", not in " +
                                      options.locale + "; --new replaces it");
     return {existing->locale, options.catalog};
   }
-  if (!options.locale.empty()) return {options.locale, ""};
+  if (!asked.empty()) return {asked, ""};
   const Source* declaring = first_declaring(sources, &Declarations::locale);
   if (declaring != nullptr) return {declaring->declared.locale, declaring->name};
   std::string codepage = options.source_encoding, who;

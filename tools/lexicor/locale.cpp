@@ -114,6 +114,11 @@ std::string known_native_names(const std::string& name) {
   return known;
 }
 
+/// Whether a name is one of the operating system: no language has such a name.
+bool is_native(const std::string& name) {
+  return load_part(LocaleName(name).parts[LX_LANGUAGE]) == LX_E_NOT_FOUND && !known_native_names(name).empty();
+}
+
 /// The name of the locale that the environment asks for, by the rules of LXGetUserLocale.
 std::string environment_locale() {
   const std::string before = setlocale(LC_ALL, nullptr);
@@ -224,8 +229,11 @@ LocalePtr open_native_locale(const std::string& native_name) {
 
 LocalePtr open_chosen_locale(const std::string& name) {
   if (name.empty()) return open_user_locale();
-  const bool core = load_part(LocaleName(name).parts[LX_LANGUAGE]) != LX_E_NOT_FOUND;
-  return core || known_native_names(name).empty() ? open_locale(name) : open_native_locale(name);
+  return is_native(name) ? open_native_locale(name) : open_locale(name);
+}
+
+std::string core_name(const std::string& name) {
+  return is_native(name) ? map_native_name(name, kUsageError) : name;
 }
 
 std::string map_native_name(const std::string& native_name, ExitCode unknown) {

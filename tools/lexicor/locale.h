@@ -47,6 +47,9 @@ LocalePtr open_chosen_locale(const std::string& name);
 /// sv_SE.UTF-8 is sv_SE.utf8. Throws a Failure with the exit code `unknown` when it stands for none.
 std::string map_native_name(const std::string& native_name, ExitCode unknown);
 
+/// The core name that an option means: of an operating-system name what it stands for, else the name itself.
+std::string core_name(const std::string& name);
+
 /// The value of a number item.
 std::optional<int32_t> number_item(LXLocale* locale, int32_t item);
 /// The value of a text item in UTF-8; none where the directory lacks the object that it would name.
