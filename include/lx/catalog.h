@@ -38,8 +38,8 @@ enum { LX_CATALOG_PATH_BYTES = 4096 };
  * or 71 (not found, too large, and with LX_CATALOG_LOAD damaged). */
 LX_API LXCatalog* LXOpenCatalog(LXLocale* locale, const char* directory, const char* name, uint32_t flags);
 /* As LXOpenCatalog, with packed codes or 16-bit Unicode, both null-terminated; 71 when they cannot be turned
- * into bytes of the locale. These bytes are the list: what is ASCII in Unicode is EBCDIC in an EBCDIC locale, where
- * LXOpenCatalogU hence finds no path that LXOpenCatalog is given in ASCII. */
+ * into bytes of the locale. These bytes are the list: what is ASCII in Unicode is EBCDIC in an EBCDIC locale,
+ * where LXOpenCatalogU hence finds no path that LXOpenCatalog is given in ASCII. */
 LX_API LXCatalog* LXOpenCatalogW(LXLocale* locale, const LXWChar* directory, const LXWChar* name,
                                  uint32_t flags);
 LX_API LXCatalog* LXOpenCatalogU(LXLocale* locale, const LXUChar* directory, const LXUChar* name,
