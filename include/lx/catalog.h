@@ -25,6 +25,11 @@ enum { LX_CATALOG_PATH_BYTES = 4096 };
  * empty, or longer than LX_CATALOG_PATH_BYTES, is passed over. When nothing opens, the list is gone through
  * once more with the locale that LXGetLocale gives for an empty name with LX_FALLBACK.
  *
+ * The bytes of the list are the path as they stand, and the characters of the syntax are ASCII bytes, whatever
+ * the codepage; only %l, %t and %L bring in bytes of the locale's codepage. In EBCDIC they are no names that a
+ * directory has: open the catalog with a locale of the same language and territory in an ASCII codepage, and
+ * convert its messages.
+ *
  * Messages come in the codepage of `locale`, which must outlive the catalog; with null, of the locale that is
  * the default when a message is fetched. Without LX_CATALOG_LOAD the file stays open, and its content is looked
  * at when messages are fetched.
@@ -33,7 +38,8 @@ enum { LX_CATALOG_PATH_BYTES = 4096 };
  * or 71 (not found, too large, and with LX_CATALOG_LOAD damaged). */
 LX_API LXCatalog* LXOpenCatalog(LXLocale* locale, const char* directory, const char* name, uint32_t flags);
 /* As LXOpenCatalog, with packed codes or 16-bit Unicode, both null-terminated; 71 when they cannot be turned
- * into bytes of the locale. */
+ * into bytes of the locale. These bytes are the list: what is ASCII in Unicode is EBCDIC in an EBCDIC locale,
+ * where LXOpenCatalogU hence finds no path that LXOpenCatalog is given in ASCII. */
 LX_API LXCatalog* LXOpenCatalogW(LXLocale* locale, const LXWChar* directory, const LXWChar* name,
                                  uint32_t flags);
 LX_API LXCatalog* LXOpenCatalogU(LXLocale* locale, const LXUChar* directory, const LXUChar* name,

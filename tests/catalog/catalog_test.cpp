@@ -224,6 +224,12 @@ TEST_F(CatalogTest, WhereACatalogIsLookedFor) {
   const CatalogPtr directory(LXOpenCatalog(locale, directory_first.c_str(), "app", 0));
   EXPECT_EQ(message(directory, 1, 1, "default"), "71");
   EXPECT_EQ(LXOpenCatalog(locale, directory_first.c_str(), "app", LX_CATALOG_LOAD), nullptr);
+  // Paths are bytes: what another form turns into EBCDIC is another path.
+  const std::string path = files.file("app");
+  LXLocale* host = library.locale(tiny_shift());
+  EXPECT_NE(CatalogPtr(LXOpenCatalog(host, nullptr, path.c_str(), 0)), nullptr);
+  EXPECT_EQ(LXOpenCatalogU(host, nullptr, std::basic_string<LXUChar>(path.begin(), path.end()).c_str(), 0),
+            nullptr);
 }
 
 }  // namespace

@@ -181,7 +181,9 @@ says 'near alias' 2 'did you mean SHIFT-JIS' "$lexicor" convert --from shift+jis
 says 'no near name' 2 'lexicor list codepages' "$lexicor" convert --from xyzzyplugh --to utf8
 says 'identifier that is none' 2 "unknown codepage '70000'" "$lexicor" convert --from 70000 --to utf8
 says 'no subcommand' 2 'subcommand is required' "$lexicor"
-says 'unknown option' 2 '--jsn' "$lexicor" list --jsn
+says 'unknown option' 2 '^lexicor: unknown option --form; did you mean --from?$' "$lexicor" convert --form utf8
+says 'unknown command' 2 "^lexicor: unknown command 'sotr'; did you mean sort?$" "$lexicor" sotr --locale German
+says 'not yet a codepage' 2 "codepage 'utf-16le' is not supported" "$lexicor" convert --from utf-16le --to utf8
 convert 'no input file' 1 'lexicor: none: No such file or directory' utf8 037 none
 convert 'a directory' 1 'lexicor: .: Is a directory' utf8 037 .
 convert 'no output directory' 1 'lexicor: none/out: No such file or directory' utf8 037 -o none/out plain
@@ -213,6 +215,11 @@ says 'a damaged object is not replaced silently' 1 'codepage IBM037 cannot be lo
   "$lexicor" --locale-dir broken convert --from us-ascii --to 037 plain
 says 'a missing object is not replaced silently' 1 'codepage UTF-8 cannot be loaded: file not found' \
   "$lexicor" --locale-dir broken convert --from us-ascii --to utf-8 plain
+cp -r "$2/locale" damaged && head -c 100 /dev/zero >damaged/so_00001.nls
+says 'a damaged default sort' 1 'sort Default cannot be loaded: the file is damaged .*(code 2000): damaged/so_00001.nls' \
+  "$lexicor" --locale-dir damaged compare --locale German a b
+: >broken/control.nls
+says 'an empty control file' 0 'in broken (broken/control.nls is empty)' "$lexicor" --locale-dir broken list
 head -c 100 /dev/zero >broken/control.nls
 says 'a damaged control file' 0 'in broken (the file is damaged' "$lexicor" --locale-dir broken list
 grep -q '^ *1  US-ASCII$' out || fault 'the built-in codepage is not listed'
@@ -338,12 +345,14 @@ for key in '' --key; do
     --locale Swedish@Swedish $key
   sorts "a line without an end $key" 'b\r\nx\0y\nx\0\r\n\n\r\na' '\n\r\na\r\nb\r\nx\0\r\nx\0y\n' --locale English@BINARY $key
   sorts "equal lines $key" 'b\na\nA\r\nB\na\r\n' 'b\nB\na\nA\r\na\r\n' --locale English@Default --case-insensitive --reverse $key
-  sorts "unequal lines $key" 'b\nA\na\r\nB\na\n' 'A\nb\n' --locale English@Default --case-insensitive --unique $key
+  sorts "unequal lines $key" 'b\nA\na\r\nB\na\n' 'A\nb\n' --locale English@Default --case-insensitive --unique=order $key
+  sorts "lines of other bytes $key" 'a\nco\xc2\xadop\ncoop\nco\xc2\xadop\na\r\nb\ncoop' 'a\na\r\nb\nco\xc2\xadop\ncoop\n' \
+    --locale English@Default --unique $key
   sorts "without case in binary order $key" '\xb1\n\x88\x9f\na\n\nA\n\0\0\0\n' '\n\0\0\0\na\nA\n\xb1\n\x88\x9f\n' \
     --locale English@BINARY --codepage MS932 --case-insensitive $key
   sorts "host text with meeting fields $key" '\x0e\x44\x82\x0f\x0e\x44\x81\x0f\x25\xc1\x25\x0e\x44\x82\x44\x81\x0f\x25\x0e\x44\x81' \
     '\xc1\x25\x0e\x44\x81\x0f\x25\x0e\x44\x82\x0f\x0e\x44\x81\x0f\x25' \
-    --locale Japanese@Japanese --codepage IBM930 --unique $key
+    --locale Japanese@Japanese --codepage IBM930 --unique=order $key
 done
 bytes 'b\na' part1
 bytes 'd\nc\n' part2
@@ -353,7 +362,7 @@ python3 -c '
 import random
 random.seed(1)
 for _ in range(100000):
-    print("".join(random.choices("aàbcdhlnñoôszAÀCHÑ \u0301-", k=random.randrange(9))))' >words
+    print("".join(random.choices("aàbcdhlnñoôszAÀCHÑ \u0301\u00ad-中ガ", k=random.randrange(9))))' >words
 for locale in English@Default Spanish@SpanishTraditional French@FrenchCanadian Vietnamese@Vietnamese; do
   expect "100,000 lines in $locale" 0 '' "$lexicor" sort --locale $locale -o compared words
   expect "100,000 keys in $locale" 0 '' "$lexicor" sort --locale $locale --key -o by_key words
@@ -378,10 +387,16 @@ orders() {
   expect "$*" "$1" '' "$lexicor" "${@:3}"
   [ "$(tail -n 1 out)" = "$2" ] || fault "$*: $(cat out)"
 }
-orders 4 'ö > z' compare --locale Swedish@Swedish ö z
+orders 4 'ö > z' compare --locale sv_SE.UTF-8 ö z
+expect "the user's order" 4 '' env LC_ALL=sv_SE.UTF-8 "$lexicor" compare ö z
+says "the user's unknown system locale" 3 '^lexicor: .* xx_YY.UTF-8: it is not known; English_UnitedStates\..* is used instead$' \
+  env LC_ALL=xx_YY.UTF-8 "$lexicor" compare ö z
 orders 3 'ö < z' compare --locale German@Default ö z
 orders 0 'Zoo = zoo' compare --locale English@Default --case-insensitive Zoo zoo
 orders 0 'Ａ = A' compare --locale Japanese@Japanese --width-insensitive Ａ A
+orders 3 'Ａb < abc' compare --locale Japanese@BINARY --width-insensitive Ａb abc
+orders 3 'ab < abc' compare --locale English@Default --width-insensitive ab abc
+orders 0 $'\xc2\xad- = -: nothing decides' explain --locale English@Default $'\xc2\xad-' -
 expect 'half an argument' 1 "lexicor: 'a"$'\xe3'"' ends inside the character that begins at byte 1" "$lexicor" compare a$'\xe3' b
 says 'case and width' 2 'excludes' "$lexicor" compare --width-insensitive --case-insensitive a b
 orders 0 '61 C3 A9' key --locale English@BINARY aé
@@ -419,7 +434,8 @@ cp "$2/locale/control.nls" broken
 says 'info on no locale' 2 "no language 'Klingon'" "$lexicor" info Klingon
 says 'info on a damaged codepage' 1 'codepage IBM037 cannot be loaded' "$lexicor" --locale-dir broken info English.IBM037
 says 'an unknown system name' 2 "operating-system locale 'c'" "$lexicor" info --native c
-expect 'a whole system locale' 0 '' "$lexicor" native C
+expect 'a whole system locale' 0 '' "$lexicor" native 'LC_CTYPE=ja_JP.EUC-JP;LC_NUMERIC=C;LC_TIME=C;LC_COLLATE=C;'
+grep -q '^codepage   JapanEUC ' out || fault "a whole system locale: $(cat out)"
 expect 'an unknown system locale' 1 \
   "lexicor: unknown operating-system locale 'xx'; 'lexicor list locales' shows those that are known" "$lexicor" native xx
 run 'a system locale with missing objects' 1 "$lexicor" --locale-dir broken native en_US.utf8
@@ -437,6 +453,7 @@ stops() {
   expect "${*:5}" "$1" "$(printf 'lexicor: %s\n  %s\n  %*s^' "$3" "$4" "$2" '')" "$lexicor" "${@:5}"
 }
 answers '-1.234.567' format number -1234567 --locale German.IBM273
+answers '-2,14,74,83,649' format number -2147483649 --locale Hindi_India
 answers '5,000,000,000.23' format number 5000000000.239 --locale English
 answers '-₹12,34,567.50' format money -1234567.5 --locale Hindi_India
 answers 'JPY1,234.' format money 1234 --locale Japanese_Japan --international
@@ -472,6 +489,7 @@ stops 2 1 'a format has no such directive' é%U parse time 5 --format é%U
 stops 1 8 'there is no such time' 2026-02-29 format time 2026-02-29
 stops 1 6 'a time has the form YYYY-MM-DD[THH:MM[:SS]]' 2026-1-1 format time 2026-1-1
 stops 1 1 'reading stopped: not a number like -1234.56' 1,5 format money 1,5
+stops 1 0 'a whole number that a double cannot hold to its last digit' 9007199254740993 format number 9007199254740993
 stops 1 1 'a character that is not UTF-8, or beyond U+FFFF' a😀x parse number a😀x
 stops 1 1 'a character that is not UTF-8, or beyond U+FFFF' a$'\xc3'bc parse number a$'\xc3'bc
 expect 'a format of a number' 2 'lexicor: --format is for times' "$lexicor" format number 1 --format %x
@@ -484,7 +502,7 @@ mkdir -p cats/DE_DEU
 answers Grüße message cats/DE_DEU/app.cat 1 3
 answers Grüße message app 1 3 --load --locale German_Germany --directory 'none;cats/%L/%N.cat'
 answers ersatz message cats/DE_DEU/app.cat 1 4 --default ersatz
-"$lexicor" message cats/DE_DEU/app.cat 1 3 --codepage IBM273 >out
+"$lexicor" message app 1 3 --locale German_Germany --directory 'cats/%L/%N.cat' --codepage IBM273 >out
 same 'a message for a host' out <(printf '\xc7\x99\xd0\xa1\x85\x25')
 "$lexicor" message cats/DE_DEU/app.cat 1 4 --codepage IBM930 --default あ >out
 same 'a default text for a host' out <(printf '\x0e\x44\x81\x0f\x25')
@@ -512,6 +530,14 @@ assert list(lists) == ["codepages", "languages", "territories", "sorts"], list(l
 ms932 = [row for row in lists["codepages"] if row["name"] == "MS932"]
 assert len(ms932) == 1 and ms932[0]["id"] == 932 and "CP932" in ms932[0]["aliases"], ms932
 ' || fault 'the list as JSON'
+
+# --- The README's commands do as they are written, in the source directory; compare answers by its exit code.
+while read -r command; do
+  command=${command//build\/m64/$2}
+  (cd "$source_dir" && eval "${command//\/tmp\//$work/}") >out 2>err
+  status=$?
+  [ "$status" = 0 ] || [[ $command == *' compare '* && $status -ge 3 ]] || fault "README: $command: $(cat err)"
+done < <(grep '^build/m64/bin/' "$source_dir/README.md")
 
 [ "$failures" = 0 ] || exit 1
 echo 'The command line does what it says.'

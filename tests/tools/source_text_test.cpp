@@ -2,6 +2,7 @@
 // and where each fault is reported.
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cstring>
 #include <fstream>
 #include <functional>
@@ -203,13 +204,17 @@ TEST(Sources, FaultsNameTheirPlace) {
       {as_language, with(language, "\"Sun\"", "7"), "f:5:15: expected a text"},
       {as_language, with(language, "\"AM\"", "\"A"), "f:8:"},
       {as_language, with(language, "\"AM\"", "\"A\\u0000\""), "f:8:11: a text cannot hold U+0000"},
-      {as_language, with(language, "morning", "evening = 1\nmorning"), "f:8:11: unknown key evening"},
+      {as_language, with(language, "morning", "evening = 1\nmorning"), "f:8:1: unknown key evening"},
+      {as_language, with(language, "morning", "mornnig"), "f:8:1: unknown key mornnig; did you mean morning?"},
       {as_language, with(language, "morning", "special_upper = [{ from = \"\", to = \"x\" }]\nmorning"),
        "f:8:27: expected one or two characters"},
       {as_territory, with(territory, "= \".\"", "= \"..\""), "f:9:11: expected one character up to U+FFFF"},
       {as_territory, with(territory, "e_position = 3", "e_position = 5"),
        "f:31:21: expected a number from 0 to 4"},
+      {as_territory, with(territory, "\nsymbol =", "\nsymbols ="),
+       "f:25:1: unknown key symbols; did you mean symbol?"},
       {as_territory, with(territory, "flag58 = true", "flag58 = 1"), "f:3:10: expected true or false"},
+      {as_control, "# none\n", "f: lists no objects"},
       {as_control, "language 1", "f:1:1: expected: type identifier name"},
       {as_control, "tongue 1 A", "f:1:1: unknown type tongue"},
       {as_control, "language 0 A", "f:1:10: the identifier"},
@@ -226,12 +231,30 @@ TEST(Sources, FaultsNameTheirPlace) {
       {as_aliases, "\tUS-ASCII C\n", "f:1:1: a line begins with"},
       {as_aliases, "US-ASCII " + std::string(64, 'x') + "\n", "none"},
       {as_aliases, "US-ASCII C " + std::string(65, 'x'), "f:1:12: the alias is longer than 64 bytes"},
-      {as_aliases, "US-ASCII C\r\n", "f:1:11: a carriage return"},
+      {as_aliases, "US-ASCII C\rX\n", "f:1:11: a carriage return"},
+      {as_aliases, "\xEF\xBB\xBFUS-ASCII C\r\n D\r\n", "none"},
   };
   for (const auto& test : cases) {
     std::istringstream in(test.text);
     const std::string fault = fault_of([&] { test.read(in); });
     EXPECT_EQ(fault.substr(0, test.fault.size()), test.fault) << fault;
+  }
+}
+
+// An editor's byte-order mark and carriage returns change nothing.
+TEST(Sources, LineEndsOfAnyKind) {
+  const Control control = read_source_control(LEXICOR_DATA_DIR);
+  for (const ObjectType type :
+       {ObjectType::kLanguage, ObjectType::kTerritory, ObjectType::kCodepage, ObjectType::kSort}) {
+    const ObjectName& name = *std::find_if(control.objects.begin(), control.objects.end(),
+                                           [&](const ObjectName& object) { return object.type == type; });
+    std::ifstream in(std::string(LEXICOR_DATA_DIR) + '/' + source_file_name(name), std::ios::binary);
+    const std::string plain{std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>()};
+    std::string edited = "\xEF\xBB\xBF";
+    for (const char c : plain) edited += c == '\n' ? "\r\n" : std::string(1, c);
+    std::istringstream edited_in(edited), plain_in(plain);
+    EXPECT_EQ(compile_object(edited_in, "e", name, control).bytes,
+              compile_object(plain_in, "p", name, control).bytes);
   }
 }
 

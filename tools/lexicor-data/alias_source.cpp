@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <map>
 
+#include "line_text.h"
 #include "ucm.h"
 
 namespace lexicor_data {
@@ -23,7 +24,7 @@ std::string upper_ascii(std::string text) {
 void check_aliases(std::istream& in, const std::string& file_name, const Control& control) {
   std::map<std::string, std::string> codepage_of;  // by alias
   std::string text, codepage;
-  for (int line = 1; std::getline(in, text); ++line) {
+  for (int line = 0; next_line(in, &text, &line);) {
     auto fail = [&](size_t at, const std::string& what) {
       throw SourceError(file_name, line, static_cast<int>(at) + 1, what);
     };

@@ -12,6 +12,7 @@
 #include "control_source.h"
 #include "core/lxbytes.h"
 #include "core/lxformat.h"
+#include "line_text.h"
 #include "lx.h"
 #include "sense.h"
 #include "sort_check.h"
@@ -139,6 +140,8 @@ std::vector<std::string> check_compiled_directory(const std::string& directory) 
   const std::string alias_file = directory + '/' + format::kAliasFile;
   faults.attempt([&] {
     std::ifstream in = open(alias_file);
+    if (in.peek() == static_cast<unsigned char>(kByteOrderMark[0]))
+      throw SourceError(alias_file, 1, 1, "begins with a byte-order mark, which the library takes for a name");
     check_aliases(in, alias_file, control);
   });
   // Objects that nobody lists are left from an earlier directory.

@@ -15,6 +15,7 @@
 #include "control_source.h"
 #include "core/lxformat.h"
 #include "language_toml.h"
+#include "line_text.h"
 #include "sort_pack.h"
 #include "sort_text.h"
 #include "structure.h"
@@ -73,6 +74,14 @@ std::ifstream open_source(const std::string& path) {
   std::ifstream in(path, std::ios::binary);
   if (!in) throw SourceError(path, 0, 0, "cannot be opened");
   return in;
+}
+
+/// A text file as the library reads it, without a byte-order mark and with line feeds as line ends.
+ByteVector plain_lines(const std::string& path) {
+  std::ifstream in = open_source(path);
+  std::string text, line;
+  for (int number = 0; next_line(in, &line, &number);) text += line + '\n';
+  return to_bytes(text);
 }
 
 void describe(std::ostream& out, const LeftOut& left_out) {
@@ -231,7 +240,7 @@ void compile_directory(const std::string& source, const std::string& out, const 
     }
     files.emplace_back(object_file_name(name), std::move(object.bytes));
   }
-  files.emplace_back(format::kAliasFile, read_file(alias_file));
+  files.emplace_back(format::kAliasFile, plain_lines(alias_file));
   // The control file comes last: until then a reader does not see the new objects.
   files.emplace_back(format::kControlFile, compile_control(control, source + "/control.txt"));
 

@@ -8,6 +8,7 @@
 
 #include "core/lxbytes.h"
 #include "core/lxformat.h"
+#include "line_text.h"
 #include "ucm.h"
 
 namespace lexicor_data {
@@ -113,11 +114,12 @@ const ObjectName* Control::find(ObjectType type, const std::string& name) const 
 Control read_control(std::istream& in, const std::string& file_name) {
   Control control;
   std::string text;
-  for (int line = 1; std::getline(in, text); ++line) {
-    text.resize(std::min(text.find_first_of("#\r"), text.size()));
+  for (int line = 0; next_line(in, &text, &line);) {
+    text.resize(std::min(text.find('#'), text.size()));
     if (text.find_first_not_of(" \t") == std::string::npos) continue;
     control.objects.push_back(parse_line(text, file_name, line));
   }
+  if (control.objects.empty()) throw SourceError(file_name, 0, 0, "lists no objects");
   refuse_duplicates(control, file_name);
   std::sort(control.objects.begin(), control.objects.end(), [](const ObjectName& a, const ObjectName& b) {
     return a.type != b.type ? a.type < b.type : a.id < b.id;

@@ -55,6 +55,7 @@ std::vector<SpecialMapping> read_specials(TomlTable& root, const std::string& ke
   if (!root.has(key)) return specials;
   for (TomlTable& entry : root.tables(key)) {
     SpecialMapping special;
+    entry.allow({"from", "to"});
     auto read = [&](const char* name, char16_t(&units)[2]) {
       const std::u16string text = entry.text(name);
       if (text.empty() || text.size() > 2) entry.fail(entry.node(name), "expected one or two characters");
@@ -62,7 +63,6 @@ std::vector<SpecialMapping> read_specials(TomlTable& root, const std::string& ke
     };
     read("from", special.from);
     read("to", special.to);
-    entry.finish();
     specials.push_back(special);
   }
   return specials;
@@ -117,14 +117,16 @@ size_t month_count(const std::array<std::u16string, 13>& months) {
 LanguageSource read_language(std::istream& in, const std::string& file_name, const Control& control) {
   const toml::table parsed = parse_toml(in, file_name);
   TomlTable root(parsed, file_name);
+  root.allow({"abbreviation", "name", "default", "days", "short_days", "months", "short_months", "morning",
+              "afternoon", "special_upper", "special_lower"});
   LanguageSource language;
   language.abbreviation = root.text("abbreviation");
   language.name = root.text("name");
   TomlTable defaults = root.table("default");
+  defaults.allow({"territory", "codepage", "sort"});
   language.territory = read_default(defaults, "territory", ObjectType::kTerritory, control);
   language.codepage = read_default(defaults, "codepage", ObjectType::kCodepage, control);
   language.sort = read_default(defaults, "sort", ObjectType::kSort, control);
-  defaults.finish();
   auto read_list = [&](const char* key, auto& list, size_t fewest) {
     const auto texts = root.texts(key, fewest, list.size());
     std::copy(texts.begin(), texts.end(), list.begin());
@@ -137,7 +139,6 @@ LanguageSource read_language(std::istream& in, const std::string& file_name, con
   language.afternoon = root.text("afternoon");
   language.special_upper = read_specials(root, "special_upper");
   language.special_lower = read_specials(root, "special_lower");
-  root.finish();
   return language;
 }
 

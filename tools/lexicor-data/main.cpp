@@ -13,6 +13,7 @@
 #include "control_source.h"
 #include "core/lxformat.h"
 #include "lexicor/descriptors.h"
+#include "lexicor/parse_fault.h"
 #include "ucm.h"
 
 namespace {
@@ -79,7 +80,7 @@ int check(const std::string& directory) {
 
 int main(int argc, char** argv) {
   lexicor_cli::open_closed_descriptors();
-  CLI::App app("Compiles, dumps and checks Lexicor locale data.");
+  CLI::App app("Compiles, dumps and checks Lexicor locale data.", "lexicor-data");
   app.require_subcommand(1);
   std::string source, out, file, control_file, directory;
   CompileOptions options;
@@ -101,7 +102,9 @@ int main(int argc, char** argv) {
   try {
     app.parse(argc, argv);
   } catch (const CLI::ParseError& error) {
-    return app.exit(error) == 0 ? kDone : kUsageError;
+    if (error.get_exit_code() == 0) return app.exit(error);
+    std::cerr << "lexicor-data: " << lexicor_cli::parse_fault(app, error) << '\n';
+    return kUsageError;
   }
   try {
     if (*compile_command) compile_directory(source, out, options, std::cerr);
@@ -109,8 +112,12 @@ int main(int argc, char** argv) {
     if (*check_command) return check(directory);
     std::cout.flush();
     if (!std::cout) throw SourceError("standard output", 0, 0, "cannot be written");
+  } catch (const SourceError& error) {
+    // A place in a source stands first, as compilers write it.
+    std::cerr << (error.line > 0 ? "" : "lexicor-data: ") << error.what() << '\n';
+    return kDataError;
   } catch (const std::exception& error) {
-    std::cerr << error.what() << '\n';
+    std::cerr << "lexicor-data: " << error.what() << '\n';
     return kDataError;
   }
   return kDone;

@@ -62,6 +62,7 @@ ByteVector write_object(const ObjectFile& object) {
 
 ObjectFile read_object(const ByteVector& bytes, const std::string& file_name) {
   auto fail = [&](const std::string& what) { throw SourceError(file_name, 0, 0, what); };
+  if (bytes.empty()) fail("the file is empty");
   if (bytes.size() < format::kHeaderBytes) fail("shorter than the 76-byte header");
   if (lx::le32(&bytes[format::kHeaderMagic]) != format::kMagic) fail("the magic number is wrong");
   ObjectFile object;

@@ -2,6 +2,7 @@
 #include "sense.h"
 
 #include <algorithm>
+#include <set>
 
 #include "toml_text.h"
 

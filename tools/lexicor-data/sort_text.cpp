@@ -47,7 +47,7 @@ class Line {
  public:
   Line(const std::string& file, std::string text, int number)
       : file_(file), text_(std::move(text)), number_(number) {
-    text_.resize(std::min(text_.find_first_of("#\r"), text_.size()));
+    text_.resize(std::min(text_.find('#'), text_.size()));
     while (!text_.empty() && is_blank(text_.back())) text_.pop_back();
   }
 
@@ -138,8 +138,8 @@ class Reader {
 
   SortSource read() {
     std::string text;
-    for (; std::getline(in_, text); text.clear()) {
-      Line line(file_, std::move(text), ++line_);
+    while (next_line(in_, &text, &line_)) {
+      Line line(file_, std::move(text), line_);
       if (line.done()) continue;
       if (line.take("@"))
         read_directive(line);

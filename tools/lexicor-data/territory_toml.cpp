@@ -62,7 +62,27 @@ bool same(const char* a, const char* b) {
   return std::string(a) == b;
 }
 
+/// The keys that a table has.
+std::vector<std::string> keys_of(const char* name) {
+  std::vector<std::string> keys;
+  for (const TextKey& text : kTextKeys) {
+    if (same(text.table, name)) keys.push_back(text.key);
+  }
+  for (const FlagKey& flag : kFlagKeys) {
+    if (same(flag.table, name)) keys.push_back(flag.key);
+  }
+  if (same(name, "")) {
+    keys.push_back("value84");
+    keys.insert(keys.end(), std::begin(kTables) + 1, std::end(kTables));
+  }
+  if (same(name, "separators")) keys.insert(keys.end(), std::begin(kSeparatorKeys), std::end(kSeparatorKeys));
+  if (same(name, "digits")) keys.insert(keys.end(), std::begin(kDigitKeys), std::end(kDigitKeys));
+  if (same(name, "signs")) keys.insert(keys.end(), {"positive_position", "negative_position"});
+  return keys;
+}
+
 void read_table(TomlTable& table, const char* name, TerritorySource& territory) {
+  table.allow(keys_of(name));
   for (const TextKey& text : kTextKeys) {
     if (same(text.table, name)) territory.*text.member = table.text(text.key);
   }
@@ -98,9 +118,7 @@ TerritorySource read_territory(std::istream& in, const std::string& file_name) {
     }
     TomlTable table = root.table(name);
     read_table(table, name, territory);
-    table.finish();
   }
-  root.finish();
   return territory;
 }
 

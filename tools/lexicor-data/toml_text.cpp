@@ -1,10 +1,12 @@
 // Reading and writing of TOML values; texts are UTF-8 in the file and 16-bit units in memory.
 #include "toml_text.h"
 
+#include <algorithm>
 #include <cstdio>
 #include <istream>
 #include <iterator>
 
+#include "lexicor/near_names.h"
 #include "ucm.h"
 
 namespace lexicor_data {
@@ -54,7 +56,6 @@ void TomlTable::fail(const toml::node& at, const std::string& what) const {
 }
 
 const toml::node& TomlTable::node(const std::string& key) {
-  asked_.insert(key);
   const toml::node* found = table_.get(key);
   if (found == nullptr) fail(table_, "the key " + key + " is missing");
   return *found;
@@ -121,9 +122,17 @@ std::vector<TomlTable> TomlTable::tables(const std::string& key) {
   return tables;
 }
 
-void TomlTable::finish() const {
+void TomlTable::allow(const std::vector<std::string>& keys) const {
   for (const auto& [key, value] : table_) {
-    if (asked_.count(std::string(key.str())) == 0) fail(value, "unknown key " + std::string(key.str()));
+    const std::string name(key.str());
+    if (std::find(keys.begin(), keys.end(), name) != keys.end()) continue;
+    std::vector<std::string> missing;
+    std::copy_if(keys.begin(), keys.end(), std::back_inserter(missing),
+                 [&](const std::string& known) { return !has(known); });
+    const toml::source_position at = key.source().begin;
+    throw SourceError(
+        file_name_, static_cast<int>(at.line), static_cast<int>(at.column),
+        "unknown key " + name + lexicor_cli::did_you_mean(lexicor_cli::nearest_name(name, missing)));
   }
 }
 

@@ -5,19 +5,19 @@
 
 #include <cstdint>
 #include <iosfwd>
-#include <set>
 #include <string>
 #include <vector>
 
 namespace lexicor_data {
 
-/// Reads one table. Every key is required unless it is asked for with has(); finish() refuses keys that nobody
-/// asked for. All errors are SourceErrors with line and column.
+/// Reads one table. Every key that is read must be there. All errors are SourceErrors with line and column.
 class TomlTable {
  public:
   TomlTable(const toml::table& table, std::string file_name)
       : table_(table), file_name_(std::move(file_name)) {}
 
+  /// Refuses other keys than these, before what is missing is: a misspelt key is both.
+  void allow(const std::vector<std::string>& keys) const;
   bool has(const std::string& key) const { return table_.contains(key); }
   std::u16string text(const std::string& key);
   char16_t character(const std::string& key);  ///< a text of one 16-bit unit
@@ -27,7 +27,6 @@ class TomlTable {
   TomlTable table(const std::string& key);
   std::vector<TomlTable> tables(const std::string& key);
   const toml::node& node(const std::string& key);
-  void finish() const;
 
   [[noreturn]] void fail(const toml::node& at, const std::string& what) const;
 
@@ -36,7 +35,6 @@ class TomlTable {
 
   const toml::table& table_;
   std::string file_name_;
-  std::set<std::string> asked_;
 };
 
 /// Parses a whole file.

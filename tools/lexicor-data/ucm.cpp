@@ -90,7 +90,7 @@ class Cursor {
       if (line_[i] == '"') quoted = !quoted;
       if (line_[i] == '#' && !quoted) line_.resize(i);
     }
-    while (!line_.empty() && (is_blank(line_.back()) || line_.back() == '\r')) line_.pop_back();
+    while (!line_.empty() && is_blank(line_.back())) line_.pop_back();
   }
 
   Position here() const { return {number_, static_cast<int>(at_) + 1}; }
@@ -182,8 +182,8 @@ class Reader {
 
   CodepageSource read() {
     std::string text;
-    for (; std::getline(in_, text); text.clear()) {
-      Cursor cursor(file_, std::move(text), ++line_);
+    while (next_line(in_, &text, &line_)) {
+      Cursor cursor(file_, std::move(text), line_);
       cursor.skip_blanks();
       if (!cursor.done()) read_line(cursor);
     }

@@ -12,7 +12,7 @@ using lexicor_cli::kReplacement;
 
 namespace {
 
-constexpr uint32_t kLineFeed = 0x0A, kNextLine = 0x85;
+constexpr uint32_t kLineFeed = 0x0A, kCarriageReturn = 0x0D, kNextLine = 0x85;
 constexpr unsigned char kFirstDoubleByte = 0x40;  // below it no double-byte character begins
 
 bool has_line_end(const char* text, int32_t bytes) {
@@ -121,7 +121,10 @@ bool LineReader::next(std::vector<Character>& line) {
   ++line_;
   while (!reader_.at_end()) {
     Character character = reader_.next();
-    if (is_line_end(character)) break;
+    if (is_line_end(character)) {
+      if (!line.empty() && line.back().unicode == kCarriageReturn) line.pop_back();
+      break;
+    }
     character.line = line_;
     character.column = static_cast<int>(line.size()) + 1;
     line.push_back(character);

@@ -69,7 +69,7 @@ class CharacterReader {
   LXShiftState state_ = LX_SHIFT_SINGLE;
 };
 
-/// Lines of a source as characters.
+/// Lines of a source as characters. A line ends with a line feed, which may have a carriage return before it.
 class LineReader {
  public:
   LineReader(const Encoding& encoding, const std::string& text);

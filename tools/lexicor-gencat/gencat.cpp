@@ -132,13 +132,14 @@ struct ChosenLocale {
 
 ChosenLocale choose_locale(const Options& options, const Catalog* existing, const std::vector<Source>& sources,
                            Encodings& encodings) {
+  const std::string asked = lexicor_cli::core_name(options.locale);
   if (existing != nullptr) {
-    if (!options.locale.empty() && !lexicor_cli::same_name(options.locale, existing->locale))
+    if (!asked.empty() && !lexicor_cli::same_name(asked, existing->locale))
       throw Failure(kUsageError, options.catalog + ": its texts are in " + existing->locale + ", not in " +
                                      options.locale + "; --new replaces it");
     return {existing->locale, options.catalog};
   }
-  if (!options.locale.empty()) return {options.locale, ""};
+  if (!asked.empty()) return {asked, ""};
   const Source* declaring = first_declaring(sources, &Declarations::locale);
   if (declaring != nullptr) return {declaring->declared.locale, declaring->name};
   std::string codepage = options.source_encoding, who;
@@ -163,13 +164,23 @@ ByteOrder choose_byte_order(const Options& options, const Catalog* existing,
   return native_byte_order();
 }
 
-const Encoding& encoding_of(const Source& source, const Options& options, const Encoding& target,
-                            Encodings& encodings) {
+const Encoding& declared_encoding(const Source& source, const Options& options, const Encoding& target,
+                                  Encodings& encodings) {
   if (!options.source_encoding.empty()) return encodings.get(options.source_encoding, "");
   if (!source.declared.codeset.empty()) return encodings.get(source.declared.codeset, source.name);
   if (source.po) return encodings.get(kDefaultCodepage, source.name);
   if (!source.declared.locale.empty()) return encodings.of_locale(source.declared.locale, source.name);
+  if (has_byte_order_mark(source.text)) return encodings.get(kDefaultCodepage, source.name);
   return target;
+}
+
+const Encoding& encoding_of(const Source& source, const Options& options, const Encoding& target,
+                            Encodings& encodings) {
+  const Encoding& encoding = declared_encoding(source, options, target, encodings);
+  if (has_byte_order_mark(source.text) && !encoding.codepage().utf8())
+    throw Failure(kDataError, source.name + ": begins with the byte-order mark of UTF-8, but its codepage is " +
+                                  encoding.codepage().name());
+  return encoding;
 }
 
 std::string header_text(const std::vector<Symbol>& symbols) {

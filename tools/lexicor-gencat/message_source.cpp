@@ -161,8 +161,7 @@ class SourceReader : SourceParser {
         return error(at_, "expected a name of letters, digits and _, and a blank behind it");
     }
     // A number alone deletes; with a blank behind it the text is empty.
-    if (name.empty() && (at_end() || (peek() == '\r' && at_ + 1 == line_.size())))
-      return builder_.remove(number);
+    if (name.empty() && at_end()) return builder_.remove(number);
     const size_t errors = problems_.errors();
     std::string text = read_message_text(line_, at_ + 1, quote_, file_name_, recoder_, problems_);
     if (problems_.errors() != errors) text.clear();

@@ -55,6 +55,12 @@ Option Arguments::add_option(const char* name, uint32_t& value, const char* help
 Option Arguments::add_flag(const char* name, bool& value, const char* help) {
   return Option(command_.add_flag(name, value, help));
 }
+Option Arguments::add_flag(const char* name, std::string& value, const std::vector<std::string>& values,
+                           const char* help) {
+  CLI::Option* const flag = command_.add_flag(std::string(name) + "{" + values[0] + "}", value, help);
+  flag->check(CLI::IsMember(values));
+  return Option(flag);
+}
 
 void Arguments::footer(const char* text) {
   command_.footer(text);

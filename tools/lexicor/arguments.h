@@ -45,6 +45,9 @@ class Arguments {
   Option add_option(const char* name, int32_t& value, const char* help);
   Option add_option(const char* name, uint32_t& value, const char* help);
   Option add_flag(const char* name, bool& value, const char* help);
+  /// A flag that may be given as --name=VALUE; alone it has the first of the values.
+  Option add_flag(const char* name, std::string& value, const std::vector<std::string>& values,
+                  const char* help);
   /// What the help ends with.
   void footer(const char* text);
 

@@ -1,10 +1,12 @@
-// Reads the catalogue through the enumerating functions, and finds near names by edit distance.
+// Reads the catalogue through the enumerating functions, and finds near names.
 #include "catalogue.h"
 
 #include <lx.h>
 #include <strings.h>
 
 #include <algorithm>
+
+#include "near_names.h"
 
 namespace lexicor_cli {
 
@@ -23,26 +25,6 @@ int32_t add_object(void* user, int32_t type, const char* name) {
 int32_t add_alias(void* user, const char* codepage, const char* alias) {
   static_cast<Catalogue*>(user)->aliases.push_back({codepage, alias});
   return 1;
-}
-
-char lower(char c) {
-  return c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c;
-}
-
-/// Levenshtein distance of two names, without regard to case.
-size_t edit_distance(const std::string& a, const std::string& b) {
-  std::vector<size_t> row(b.size() + 1);
-  for (size_t j = 0; j <= b.size(); ++j) row[j] = j;
-  for (size_t i = 1; i <= a.size(); ++i) {
-    size_t diagonal = row[0];
-    row[0] = i;
-    for (size_t j = 1; j <= b.size(); ++j) {
-      const size_t replaced = diagonal + (lower(a[i - 1]) != lower(b[j - 1]));
-      diagonal = row[j];
-      row[j] = std::min({replaced, row[j] + 1, row[j - 1] + 1});
-    }
-  }
-  return row[b.size()];
 }
 
 }  // namespace
@@ -80,10 +62,9 @@ std::vector<std::string> nearest_codepages(const Catalogue& catalogue, const std
     std::string codepage;
   };
   std::vector<Near> found;
-  const size_t farthest = std::max<size_t>(2, name.size() / 3);
   const auto consider = [&](const std::string& text, const std::string& codepage) {
     const size_t distance = edit_distance(name, text);
-    if (distance <= farthest && distance < text.size()) found.push_back({distance, text, codepage});
+    if (is_near(name, text, distance)) found.push_back({distance, text, codepage});
   };
   for (const CatalogueObject& object : catalogue.objects) {
     if (object.type == LX_CODEPAGE) consider(object.name, object.name);

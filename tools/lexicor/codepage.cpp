@@ -1,8 +1,12 @@
 // Looks codepages up by name, identifier and alias, and opens a locale on the one that is found.
 #include "codepage.h"
 
+#include <algorithm>
 #include <cctype>
 #include <cstdlib>
+#include <iterator>
+
+#include "near_names.h"
 
 namespace lexicor_cli {
 
@@ -32,15 +36,30 @@ std::string find_codepage(const Catalogue& catalogue, const std::string& text) {
   return name != nullptr ? name : "";
 }
 
+/// Whether a name is one of UTF-16 and UTF-32, in any byte order: "utf16", "UCS-2LE", "1200".
+bool is_wide_encoding(const std::string& text) {
+  std::string name;
+  for (const char c : text) {
+    if (std::isalnum(static_cast<unsigned char>(c)) != 0) name += lower_ascii(c);
+  }
+  const std::string end = name.size() > 2 ? name.substr(name.size() - 2) : "";
+  if (end == "le" || end == "be") name.resize(name.size() - 2);
+  constexpr const char* kNames[] = {"utf16", "utf32", "ucs2",  "ucs4", "iso10646",
+                                    "1200",  "1201",  "12000", "12001"};
+  return std::find(std::begin(kNames), std::end(kNames), name) != std::end(kNames);
+}
+
 [[noreturn]] void throw_unknown(const Session& session, const Catalogue& catalogue, const std::string& text) {
   if (session.built_in_only())
     throw Failure(kDataError, "codepage '" + text + "' is not there without a locale directory");
-  std::string message = "unknown codepage '" + text + "'";
-  const std::vector<std::string> near = nearest_codepages(catalogue, text, 3);
-  for (size_t i = 0; i < near.size(); ++i)
-    message += (i == 0 ? "; did you mean " : i + 1 < near.size() ? ", " : " or ") + near[i];
-  message += near.empty() ? "; 'lexicor list codepages' shows those there are" : "?";
-  throw Failure(kUsageError, message);
+  if (is_wide_encoding(text))
+    throw Failure(kUsageError,
+                  "codepage '" + text +
+                      "' is not supported: its characters are no bytes but units of 16 or 32 bits; "
+                      "'lexicor translate' takes UTF-16 in this machine's byte order");
+  const std::string near = did_you_mean(nearest_codepages(catalogue, text, 3));
+  throw Failure(kUsageError, "unknown codepage '" + text + "'" +
+                                 (near.empty() ? "; 'lexicor list codepages' shows those there are" : near));
 }
 
 }  // namespace
@@ -54,7 +73,7 @@ Codepage::Codepage(const Session& session, const Catalogue& catalogue, const std
   object_ = LXGetObjFromName(nullptr, LX_CODEPAGE, name_.c_str(), bytes, LX_FIND_AND_LOAD, &code);
   // With an error code the object holds US-ASCII in place of its own data.
   if (object_ == nullptr || code != LX_OK)
-    throw Failure(kDataError, "codepage " + name_ + " cannot be loaded: " + describe_code(code));
+    throw Failure(kDataError, load_problem(LX_CODEPAGE, "codepage", name_, code));
   id_ = reinterpret_cast<const LXObjDisk*>(object_)->id;
   const std::string locale_name = (!language_territory.empty() ? language_territory
                                                                : catalogue.first_name(LX_LANGUAGE) + "_" +

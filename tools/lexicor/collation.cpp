@@ -38,7 +38,8 @@ Collation::Collation(const Session& session, const LocalePtr& named, const std::
     throw Failure(kDataError, "sort " + std::to_string(id) + " cannot be used: " + describe_code(code));
 }
 
-int32_t Collation::compare(std::string_view text1, std::string_view text2, uint32_t options) const {
+int32_t Collation::compare(std::string_view text1, std::string_view text2, uint32_t options) {
+  if (by_key(options)) return key_of(text1, options, sides_[0]).compare(key_of(text2, options, sides_[1]));
   LXLocale* const locale = codepage_.locale();
   const int32_t result = LXStrcollEx(locale, text1.data(), LX_SHIFT_SINGLE, length_of(text1), text2.data(),
                                      LX_SHIFT_SINGLE, length_of(text2), options);
@@ -46,7 +47,17 @@ int32_t Collation::compare(std::string_view text1, std::string_view text2, uint3
   return result;
 }
 
+const std::string& Collation::key_of(std::string_view text, uint32_t options, Side& side) {
+  if (side.options == options && side.text == text) return side.key;
+  side.key.clear();
+  append_key(text, options, &side.key);
+  side.text = text;
+  side.options = options;
+  return side.key;
+}
+
 void Collation::append_key(std::string_view text, uint32_t options, std::string* keys) {
+  if (binary() && text.empty()) return;
   LXLocale* const locale = codepage_.locale();
   const int32_t length = length_of(text);
   const size_t most = text.size() * kKeyBytesPerByte + kKeySeparators;

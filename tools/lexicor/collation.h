@@ -1,10 +1,13 @@
-// The order that the user named: a codepage with the language and the sort of a locale, and what the public
-// functions tell about the order of texts in it.
+// The order that the user named: a codepage with the language and the sort of a locale. Every subcommand that
+// orders texts orders them by their keys: keys give one order of all texts, in which what is compared one by
+// one and what is sorted by stored keys cannot disagree. The library's comparison in step is another order
+// where a text has weights of the last level alone, or where weights are inserted.
 #pragma once
 
 #include <lx.h>
 
 #include <cstdint>
+#include <optional>
 #include <string>
 #include <string_view>
 
@@ -14,7 +17,7 @@
 
 namespace lexicor_cli {
 
-/// Texts begin in the single-byte state. `options` are those of LXStrcoll.
+/// Texts begin in the single-byte state. `options` are those of LXStrxfrm.
 class Collation {
  public:
   /// `locale_name` empty: the user's locale. Throws a Failure that says what is not there.
@@ -24,8 +27,11 @@ class Collation {
   /// Binary order has no weights.
   bool binary() const { return sort_ == nullptr; }
 
+  /// Whether keys give the order with these options. In binary order they would be the text over again, and
+  /// folded they are in another order than the folded text.
+  bool by_key(uint32_t options) const { return !binary() || options == LX_WIDTH_INSENSITIVE; }
   /// Below 0, 0 or above 0.
-  int32_t compare(std::string_view text1, std::string_view text2, uint32_t options) const;
+  int32_t compare(std::string_view text1, std::string_view text2, uint32_t options);
   /// Appends the key of a text to `keys`.
   void append_key(std::string_view text, uint32_t options, std::string* keys);
   /// Throws a Failure when a text of the command line ends inside a character.
@@ -34,9 +40,19 @@ class Collation {
  private:
   Collation(const Session& session, const LocalePtr& named, const std::string& codepage);
 
+  /// The text that was compared last on one side, with its key: merging holds one side while the other moves
+  /// on.
+  struct Side {
+    std::string text, key;
+    std::optional<uint32_t> options;  // of the key; none: there is no key yet
+  };
+
+  const std::string& key_of(std::string_view text, uint32_t options, Side& side);
+
   Codepage codepage_;
   const LXObject* sort_ = nullptr;
   std::string room_;  // for a key
+  Side sides_[2];
 };
 
 /// The result of a comparison, to stand between what was compared.

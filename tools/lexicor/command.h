@@ -23,6 +23,9 @@ class Failure : public std::runtime_error {
   ExitCode code_;
 };
 
+/// The program that runs, which its messages begin with.
+inline const char* g_program = "lexicor";
+
 /// The options that stand before or behind any subcommand.
 struct CommonOptions {
   std::string locale_dir;  // empty: found by Session

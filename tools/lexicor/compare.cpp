@@ -26,7 +26,7 @@ struct CompareOptions {
 
 int compare(const CompareOptions& options, const CommonOptions& common) {
   const Session session(common);
-  const Collation collation(session, options.locale);
+  Collation collation(session, options.locale);
   collation.check_argument(options.text1);
   collation.check_argument(options.text2);
   const int32_t result = collation.compare(options.text1, options.text2, options.options());
@@ -77,8 +77,7 @@ int show_key(const CompareOptions& options, const CommonOptions& common) {
   Collation collation(session, options.locale);
   collation.check_argument(options.text1);
   std::string key;
-  if (!collation.binary() || !options.text1.empty())
-    collation.append_key(options.text1, options.options(), &key);
+  collation.append_key(options.text1, options.options(), &key);
   Output().write((collation.binary() ? hex_bytes(key) : KeyText(key).levels()) + "\n");
   return kDone;
 }
@@ -102,8 +101,9 @@ Run declare_compare(Arguments& command, const CommonOptions& common) {
   command.add_option("A", options->text1, "a text, in UTF-8").required().type_name("");
   command.add_option("B", options->text2, "another one").required().type_name("");
   command.footer(
-      "Prints A < B, A = B or A > B. Exit codes: 0 equal, 3 A comes first, 4 B comes first; 1 and 2 are "
-      "errors.\n"
+      "Prints A < B, A = B or A > B, in the order of 'lexicor sort'. Exit codes: 0 equal, 3 A comes first, "
+      "4 B comes\n"
+      "first; 1 and 2 are errors.\n"
       "\n"
       "Examples:\n"
       "  lexicor compare --locale Swedish ö z\n"

@@ -28,14 +28,8 @@ struct ExplainOptions {
 struct Level {
   std::vector<uint32_t> weights;
   size_t insert_point = 0;
-  size_t appended_first = 0;  // weights before the first one that was inserted
-  bool inserts = false;
 
   void place(uint32_t weight, bool append) {
-    if (!append && !inserts) {
-      inserts = true;
-      appended_first = weights.size();
-    }
     weights.insert(append ? weights.end() : weights.begin() + static_cast<ptrdiff_t>(insert_point), weight);
     if (append) insert_point = weights.size();
   }
@@ -52,7 +46,7 @@ constexpr LevelKind kLevels[] = {{"primary", 4, LX_APPEND_PRIMARY},
                                  {"tertiary", 2, LX_APPEND_TERTIARY},
                                  {"special", 4, LX_APPEND_SPECIAL}};
 constexpr size_t kLevelCount = 4;
-constexpr size_t kSpecial = 3;
+constexpr size_t kSecondary = 1, kTertiary = 2, kSpecial = 3;
 constexpr LevelKind kBytes = {"bytes", 2, 0};
 
 using Row = std::vector<std::string>;
@@ -94,7 +88,8 @@ std::vector<Char> chars_of(const Codepage& codepage, const std::string& text) {
 
 std::string weight_text(const LevelKind& kind, uint32_t weight) {
   if (kind.append != LX_APPEND_SPECIAL) return hex_text(weight, kind.digits);
-  return hex_text(weight >> 16, kind.digits) + ":" + hex_text(weight & 0xFFFF, kind.digits);
+  const std::string position = weight >> 16 == 0 ? "" : hex_text(weight >> 16, kind.digits) + ":";
+  return position + hex_text(weight & 0xFFFF, kind.digits);
 }
 
 /// The rows and levels of a text under the locale's sort.
@@ -158,6 +153,21 @@ class Weigher {
   Explained text_;
 };
 
+/// Takes off the levels what the text's key leaves out: the usual weights at the end of the second and third
+/// level, and positions where there are no other weights.
+void leave_out(const std::string& key, std::vector<Level>& levels) {
+  size_t begin = 2 * levels[0].weights.size() + 1;
+  size_t others = levels[0].weights.size();
+  for (const size_t level : {kSecondary, kTertiary}) {
+    const size_t end = key.find('\0', begin);
+    levels[level].weights.resize(end - begin);
+    others += end - begin;
+    begin = end + 1;
+  }
+  if (others > 0) return;
+  for (uint32_t& weight : levels[kSpecial].weights) weight &= 0xFFFF;
+}
+
 /// In binary order the bytes are all that counts.
 Explained bytes_of(const std::vector<Char>& chars) {
   Explained text;
@@ -197,11 +207,6 @@ Verdict judge(const LevelKind& kind, const Level& a, const Level& b) {
       a.weights.begin());
   if (place == a.weights.size() && place == b.weights.size())
     return {false, place == 0 ? "no weights" : "equal"};
-  const auto inserts_before = [&](const Level& level) {
-    return level.inserts && level.appended_first < shorter;
-  };
-  if (place == shorter && kind.append == LX_APPEND_PRIMARY && (inserts_before(a) || inserts_before(b)))
-    return {false, "equal as far as both go; behind inserted weights their number does not count"};
   const auto weight = [&](const Level& level) {
     return place < level.weights.size() ? weight_text(kind, level.weights[place]) : "none";
   };
@@ -231,7 +236,7 @@ std::string write_levels(std::ostream& out, const Explained& a, const Explained&
 
 int explain(const ExplainOptions& options, const CommonOptions& common) {
   const Session session(common);
-  const Collation collation(session, options.locale);
+  Collation collation(session, options.locale);
   collation.check_argument(options.text1);
   collation.check_argument(options.text2);
   std::ostringstream out;
@@ -239,6 +244,11 @@ int explain(const ExplainOptions& options, const CommonOptions& common) {
     const std::vector<Char> chars = chars_of(collation.codepage(), text);
     Explained explained =
         collation.binary() ? bytes_of(chars) : Weigher(collation.codepage().locale(), chars).text();
+    if (!collation.binary()) {
+      std::string key;
+      collation.append_key(text, 0, &key);
+      leave_out(key, explained.levels);
+    }
     explained.rows[0][0] = name;
     write_table(out, explained.rows);
     return explained;
@@ -270,9 +280,12 @@ Run declare_explain(Arguments& command, const CommonOptions& common) {
       "one,\n"
       "or the two of an expansion. Appended weights stand behind those before them; inserted ones ahead of the "
       "run\n"
-      "of such. Then come the weights in the order in which they are compared, a special one behind the "
-      "position of\n"
-      "its character. In binary order the bytes of the text take the place of weights.\n"
+      "of such. Then come the weights as the text's key has them, in the order in which they are compared: "
+      "usual\n"
+      "ones at the end of the second and third level are left out, and a special one stands behind the "
+      "position "
+      "of its\n"
+      "character where there are others. In binary order the bytes of the text take the place of weights.\n"
       "\n"
       "Examples:\n"
       "  lexicor explain --locale French@FrenchCanadian côte coté\n"

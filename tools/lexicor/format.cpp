@@ -59,6 +59,18 @@ double c_double(const TextLocale& locale, const std::string& text) {
   return value;
 }
 
+/// Whether a C number has digits only, with a sign or without one.
+bool is_whole(const std::string& text) {
+  return text.find_first_not_of("0123456789", text[0] == '-' ? 1 : 0) == std::string::npos;
+}
+
+/// Whether a whole number is what the double says that was read from it.
+bool is_exact(const std::string& text, double value) {
+  char digits[512];
+  std::snprintf(digits, sizeof digits, "%.0f", value < 0 ? -value : value);
+  return text.substr(std::min(text.find_first_not_of("-0"), text.size() - 1)) == digits;
+}
+
 std::string format_number(const TextLocale& locale, const ValueOptions& options) {
   Units units(kNumberUnits);
   int32_t integer = 0;
@@ -67,7 +79,19 @@ std::string format_number(const TextLocale& locale, const ValueOptions& options)
     return written_text(locale, units,
                         LXLongToStringU(locale.locale(), integer, units.data(), kNumberUnits, 0));
   const double value = c_double(locale, options.text);
-  return written_text(locale, units, LXDoubleToStringU(locale.locale(), value, units.data(), kNumberUnits, 0));
+  const bool whole = is_whole(options.text);
+  if (whole) {
+    if (!is_exact(options.text, value))
+      throw locale.pointing(kDataError, "a whole number that a double cannot hold to its last digit",
+                            locale.units(options.text), 0);
+    LXSetLocaleNumInfo(locale.locale(), LX_ITEM_DIGITS, 0);
+  }
+  int32_t written = LXDoubleToStringU(locale.locale(), value, units.data(), kNumberUnits, 0);
+  // The separator is written also where no digits follow.
+  const Units separator = locale.units(text_item(locale.locale(), LX_ITEM_DECIMAL).value_or(""));
+  if (whole && written > 0 && !separator.empty() && units[static_cast<size_t>(written) - 1] == separator[0])
+    --written;
+  return written_text(locale, units, written);
 }
 
 std::string format_money(const TextLocale& locale, const ValueOptions& options) {
@@ -241,8 +265,10 @@ Run declare_format(Arguments& command, const CommonOptions& common) {
   command.add_flag("--international", options->international,
                    "of money: the international symbol and its fraction digits");
   command.footer(
-      "A VALUE is a number like -1234.56, or a time like 2026-11-21T14:05:09. A whole number of 32 bits is\n"
-      "written without a fraction; other digits are cut behind the locale's fraction digits, not rounded.\n"
+      "A VALUE is a number like -1234.56, or a time like 2026-11-21T14:05:09. A whole number is written "
+      "without "
+      "a\n"
+      "fraction; other digits are cut behind the locale's fraction digits, not rounded.\n"
       "\n"
       "Examples:\n"
       "  lexicor format number 1234567.891 --locale German\n"

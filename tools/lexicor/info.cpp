@@ -1,7 +1,6 @@
 // lexicor info: the items of a locale, as a table or as JSON.
 #include <lx.h>
 
-#include <iostream>
 #include <memory>
 #include <sstream>
 
@@ -123,18 +122,9 @@ std::string info_text(LXLocale* locale, bool json) {
   return json ? json_text({{"items", rows}}) : out.str();
 }
 
-LocalePtr open_asked(const InfoOptions& options) {
-  if (options.native) return open_native_locale(options.name);
-  if (!options.name.empty()) return open_locale(options.name);
-  std::string missing;
-  LocalePtr locale = open_user_locale(&missing);
-  if (!missing.empty()) std::cerr << "lexicor: the user's locale: " << missing << "; defaults take its place\n";
-  return locale;
-}
-
 int info(const InfoOptions& options, const CommonOptions& common) {
   const Session session(common);
-  const LocalePtr locale = open_asked(options);
+  const LocalePtr locale = options.native ? open_native_locale(options.name) : open_chosen_locale(options.name);
   Output output;
   output.write(info_text(locale.get(), options.json));
   return kDone;

@@ -3,8 +3,14 @@
 #include "locale.h"
 
 #include <algorithm>
+#include <cctype>
+#include <clocale>
+#include <cstdlib>
+#include <iostream>
+#include <sstream>
 #include <vector>
 
+#include "catalogue.h"
 #include "session.h"
 
 namespace lexicor_cli {
@@ -13,14 +19,13 @@ namespace {
 
 // A name has at most 33 bytes, a locale name four of them.
 constexpr size_t kNameBytes = 160;
-constexpr char kUnknown[] = "Unknown";
 constexpr const char* kListNames[] = {"languages", "territories", "codepages", "sorts"};
 
 /// Why a part of a locale name cannot be used; an empty text when it can.
 std::string problem_of(const LocalePart& part, int code) {
   if (code == LX_OK) return {};
   if (code == LX_E_NOT_FOUND) return std::string("there is no ") + part.title + " '" + part.name + "'";
-  return std::string(part.title) + " " + part.name + " cannot be loaded: " + describe_code(code);
+  return load_problem(part.type, part.title, part.name, code);
 }
 
 /// Throws a Failure for the first part that cannot be used; `not_found` is its exit code where there is no such
@@ -37,11 +42,130 @@ void check_parts(const std::string& name, ExitCode not_found) {
   }
 }
 
+/// Why a locale cannot be created whose named parts can be used: a default of its language cannot be.
+std::string problem_of_defaults(const std::string& name, int code) {
+  const Catalogue catalogue = read_catalogue();
+  LocaleName parts(name);
+  const std::string language =
+      load_part(parts.parts[LX_LANGUAGE]) == LX_OK ? parts.parts[LX_LANGUAGE].name : "";
+  const std::string sound =
+      language + "_" + catalogue.first_name(LX_TERRITORY) + "." + catalogue.first_name(LX_CODEPAGE) + "@BINARY";
+  const LocalePtr locale(LXGetLocale(sound.c_str(), 0, nullptr));
+  constexpr int32_t kDefaults[] = {LX_ITEM_DEFAULT_TERRITORY, LX_ITEM_DEFAULT_CODEPAGE, LX_ITEM_DEFAULT_SORT};
+  for (const int32_t item : kDefaults) {
+    LocalePart& part = parts.parts[LX_TERRITORY + (item - kDefaults[0])];
+    if (locale == nullptr || load_part(part) == LX_OK) part.name = text_item(locale.get(), item).value_or("");
+    const std::string problem = problem_of(part, load_part(part));
+    if (!problem.empty()) return problem;
+  }
+  return "a default of its language is not there (code " + std::to_string(code) + ")";
+}
+
 LocalePtr opened(LXLocale* locale, int code, const std::string& name) {
   if (locale == nullptr)
-    throw Failure(kDataError, "no locale '" + name + "': " + describe_code(code) +
-                                  ", or a default of the language is not there");
+    throw Failure(kDataError, "no locale '" + name + "': " + problem_of_defaults(name, code));
   return LocalePtr(locale);
+}
+
+/// The codeset of an operating-system name as the system's library compares it: its letters small, its digits,
+/// and "iso" in front of digits alone. Language, territory and modifier stay.
+std::string normalized(const std::string& native_name) {
+  const size_t dot = std::min(native_name.find('.'), native_name.size());
+  const size_t end = std::min(native_name.find('@', dot), native_name.size());
+  std::string codeset;
+  bool letters = false;
+  for (size_t i = dot; i < end; ++i) {
+    const auto c = static_cast<unsigned char>(native_name[i]);
+    if (c >= 0x80 || std::isalnum(c) == 0) continue;
+    letters |= std::isalpha(c) != 0;
+    codeset += static_cast<char>(std::tolower(c));
+  }
+  if (codeset.empty()) return native_name.substr(0, dot) + native_name.substr(end);
+  return native_name.substr(0, dot) + (letters ? "." : ".iso") + codeset + native_name.substr(end);
+}
+
+/// The library's own spelling of an operating-system name, or an empty text where it knows none.
+std::string known_native_name(const std::string& name) {
+  struct Search {
+    std::string normalized, found;
+  } search{normalized(name), ""};
+  LXEnumNativeLocales(
+      [](void* user, const char* native, const char*) {
+        Search& wanted = *static_cast<Search*>(user);
+        if (normalized(native) == wanted.normalized) wanted.found = native;
+        return static_cast<int32_t>(wanted.found.empty());
+      },
+      &search);
+  return search.found;
+}
+
+/// The same of a name that may be composed of one for each category, "LC_CTYPE=de_DE.UTF-8;...". There a
+/// category that is not known stays as it is.
+std::string known_native_names(const std::string& name) {
+  if (name.find(';') == std::string::npos) return known_native_name(name);
+  std::string known;
+  std::istringstream categories(name);
+  for (std::string category; std::getline(categories, category, ';');) {
+    const size_t value = category.find('=') + 1;
+    const std::string found = known_native_name(category.substr(value));
+    known += category.substr(0, value) + (found.empty() ? category.substr(value) : found) + ";";
+  }
+  if (name.back() != ';') known.pop_back();
+  return known;
+}
+
+/// Whether a name is one of the operating system: no language has such a name.
+bool is_native(const std::string& name) {
+  return load_part(LocaleName(name).parts[LX_LANGUAGE]) == LX_E_NOT_FOUND && !known_native_names(name).empty();
+}
+
+/// The name of the locale that the environment asks for, by the rules of LXGetUserLocale.
+std::string environment_locale() {
+  const std::string before = setlocale(LC_ALL, nullptr);
+  const char* const adopted = setlocale(LC_ALL, "");
+  const std::string name = adopted != nullptr ? adopted : "";
+  setlocale(LC_ALL, before.c_str());
+  if (!name.empty()) return name;
+  for (const char* variable : {"LC_ALL", "LANG"}) {
+    const char* const value = std::getenv(variable);
+    if (value != nullptr && *value != '\0') return value;
+  }
+  return "C";
+}
+
+/// The first part of a locale name that cannot be used; an empty text when all can.
+std::string first_problem(const std::string& name) {
+  for (const LocalePart& part : LocaleName(name).parts) {
+    const std::string problem = problem_of(part, load_part(part));
+    if (!problem.empty()) return problem;
+  }
+  return {};
+}
+
+LocalePtr open_user_locale() {
+  const char* const variable = std::getenv("LX_LANG");
+  std::string name, problem;
+  LXLocale* locale = nullptr;
+  int32_t code = LX_OK;
+  if (variable != nullptr) {
+    name = variable;
+    problem = first_problem(name);
+    if (!problem.empty()) problem = "LX_LANG=" + name + ": " + problem;
+    locale = LXGetLocale(nullptr, LX_USER_LOCALE | LX_FALLBACK, &code);
+  } else {
+    const std::string asked = environment_locale();
+    const std::string native = known_native_names(asked);
+    if (!native.empty()) name = map_native_name(native, kDataError);
+    problem = native.empty() ? "it is not known" : first_problem(name);
+    if (!problem.empty()) problem = "the operating system's locale " + asked + ": " + problem;
+    locale = native.empty() ? LXGetLocale(nullptr, LX_USER_LOCALE | LX_FALLBACK, &code)
+                            : LXConvertNativeLocale(native.c_str(), LX_FALLBACK, &code);
+  }
+  LocalePtr user = opened(locale, code, name.empty() ? "English" : name);
+  if (!problem.empty())
+    std::cerr << g_program << ": " << problem << "; "
+              << text_item(user.get(), LX_ITEM_LOCALE_STRING).value_or("") << " is used instead\n";
+  return user;
 }
 
 void append_utf8(std::string& text, LXUChar unit) {
@@ -99,36 +223,26 @@ LocalePtr open_native_locale(const std::string& native_name) {
   const std::string name = map_native_name(native_name, kUsageError);
   check_parts(name, kDataError);
   int32_t code = LX_OK;
-  LXLocale* locale = LXConvertNativeLocale(native_name.c_str(), 0, &code);
+  LXLocale* locale = LXConvertNativeLocale(known_native_names(native_name).c_str(), 0, &code);
   return opened(locale, code, name);
 }
 
-LocalePtr open_user_locale(std::string* missing) {
-  if (missing != nullptr) {
-    char name[kNameBytes] = {};
-    LXGetUserLocale(name, sizeof name - 1);
-    if (name == std::string(kUnknown)) *missing = "the operating system's is not known";
-    for (const LocalePart& part : LocaleName(name).parts) {
-      const std::string problem = problem_of(part, load_part(part));
-      if (missing->empty()) *missing = problem;
-    }
-  }
-  int32_t code = LX_OK;
-  LXLocale* locale = LXGetLocale(nullptr, LX_USER_LOCALE | LX_FALLBACK, &code);
-  return opened(locale, code, "the user's");
+LocalePtr open_chosen_locale(const std::string& name) {
+  if (name.empty()) return open_user_locale();
+  return is_native(name) ? open_native_locale(name) : open_locale(name);
 }
 
-LocalePtr open_chosen_locale(const std::string& name) {
-  return name.empty() ? open_user_locale() : open_locale(name);
+std::string core_name(const std::string& name) {
+  return is_native(name) ? map_native_name(name, kUsageError) : name;
 }
 
 std::string map_native_name(const std::string& native_name, ExitCode unknown) {
-  char name[kNameBytes];
-  const std::string mapped = LXMapNativeLocale(native_name.c_str(), name, sizeof name);
-  if (mapped == kUnknown)
+  const std::string known = known_native_names(native_name);
+  if (known.empty())
     throw Failure(unknown, "unknown operating-system locale '" + native_name +
                                "'; 'lexicor list locales' shows those that are known");
-  return mapped;
+  char name[kNameBytes];
+  return LXMapNativeLocale(known.c_str(), name, sizeof name);
 }
 
 std::optional<int32_t> number_item(LXLocale* locale, int32_t item) {

@@ -38,15 +38,17 @@ using LocalePtr = std::unique_ptr<LXLocale, LocaleReleaser>;
 LocalePtr open_locale(const std::string& name);
 /// The locale of an operating-system name, with the system's conventions. Throws a Failure likewise.
 LocalePtr open_native_locale(const std::string& native_name);
-/// The user's locale, with defaults in place of what is not there; `*missing` tells the first thing that is
-/// not.
-LocalePtr open_user_locale(std::string* missing = nullptr);
-/// The locale of an option: of a core name, or the user's where the name is empty.
+/// The locale of an option: of a core name, else of an operating-system name, or the user's where the name is
+/// empty. Throws a Failure likewise; in the user's locale defaults take the place of what is not there, which
+/// is said on standard error.
 LocalePtr open_chosen_locale(const std::string& name);
 
-/// The locale name that an operating-system name stands for. Throws a Failure with the exit code `unknown` when
-/// it stands for none.
+/// The locale name that an operating-system name stands for, its codeset in any spelling that the system takes:
+/// sv_SE.UTF-8 is sv_SE.utf8. Throws a Failure with the exit code `unknown` when it stands for none.
 std::string map_native_name(const std::string& native_name, ExitCode unknown);
+
+/// The core name that an option means: of an operating-system name what it stands for, else the name itself.
+std::string core_name(const std::string& name);
 
 /// The value of a number item.
 std::optional<int32_t> number_item(LXLocale* locale, int32_t item);

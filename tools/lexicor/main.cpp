@@ -32,6 +32,10 @@ constexpr Subcommand kSubcommands[] = {
 };
 
 constexpr char kFooter[] =
+    "A LOCALE is LANGUAGE[_TERRITORY][.CODEPAGE][@SORT], or a name of the operating system as sv_SE.UTF-8. "
+    "The\n"
+    "user's locale is LX_LANG, else the operating system's.\n"
+    "\n"
     "Examples:\n"
     "  lexicor list codepages\n"
     "  lexicor convert --from MS932 --to UTF-8 -o letter.utf8 letter.sjis\n"

@@ -93,7 +93,7 @@ CatalogPtr open_catalog(const MessageOptions& options, LXLocale* locale) {
                                 SearchReport(options, locale).text());
 }
 
-/// A text of the command line in the codepage of the caller.
+/// A UTF-8 text in the codepage of the caller.
 std::string recoded(const std::string& utf8_text, const Codepage& utf8, const Codepage& caller) {
   std::string text((utf8_text.size() + 1) * kMostCharBytes, '\0');
   const int32_t bytes = LXConvertStringEx(
@@ -127,9 +127,14 @@ std::string fetch(const MessageOptions& options, LXLocale* locale,
 int message(const MessageOptions& options, const CommonOptions& common) {
   const Session session(common);
   const Catalogue catalogue = read_catalogue();
-  const Codepage utf8(session, catalogue, "UTF-8");
-  const Codepage caller(session, catalogue, options.codepage,
-                        language_territory(open_chosen_locale(options.locale).get()));
+  const std::string language = language_territory(open_chosen_locale(options.locale).get());
+  const Codepage utf8(session, catalogue, "UTF-8", language);
+  const Codepage caller(session, catalogue, options.codepage, language);
+  // Abbreviations become part of a path in the codepage of the locale that opens the catalog. Paths are ASCII.
+  if (number_item(caller.locale(), LX_ITEM_CODEPAGE_ASCII) != 1) {
+    Output().write(recoded(fetch(options, utf8.locale(), options.default_text) + "\n", utf8, caller));
+    return kDone;
+  }
   std::optional<std::string> default_text;
   if (options.default_text) default_text = recoded(*options.default_text, utf8, caller);
   Output().write(fetch(options, caller.locale(), default_text) + recoded("\n", utf8, caller));

@@ -12,23 +12,25 @@
 #include "command.h"
 #include "descriptors.h"
 #include "output.h"
+#include "parse_fault.h"
 
 namespace lexicor_cli {
 
-/// A wrong command line, a question for help or the version: prints it and returns the exit code.
+/// A question for help or the version: prints it and returns the exit code. Throws a Failure for a wrong
+/// command line.
 inline int answer_parse(const CLI::App& app, const CLI::ParseError& error) {
   std::ostringstream out, err;
-  const int code = app.exit(error, out, err);
+  if (app.exit(error, out, err) != 0) throw Failure(kUsageError, parse_fault(app, error));
   std::string text = out.str();
   if (!text.empty() && text.back() != '\n') text += '\n';
   Output().write(text);
-  std::cerr << err.str();
-  return code == 0 ? kDone : kUsageError;
+  return kDone;
 }
 
 /// Runs the program; what it throws becomes a message and an exit code.
 inline int run_program(const char* name, int (*run)(int, char**), int argc, char** argv) {
   open_closed_descriptors();
+  g_program = name;
   std::signal(SIGPIPE, SIG_IGN);
   try {
     return run(argc, argv);

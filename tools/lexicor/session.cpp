@@ -20,7 +20,10 @@ namespace fs = std::filesystem;
 
 constexpr char kDirectoryVariable[] = "LX_LOCALEDIR";
 constexpr char kHowToName[] =
-    "lexicor: name a locale directory with --locale-dir DIR or the environment variable LX_LOCALEDIR";
+    "name a locale directory with --locale-dir DIR or the environment variable LX_LOCALEDIR";
+
+// Of the session; empty: the library has found it.
+std::string g_directory;
 
 std::string control_file_of(const std::string& directory) {
   std::vector<char> name(directory.size() + 32);
@@ -53,12 +56,24 @@ std::string choose_directory(const std::string& named) {
   return {};
 }
 
+/// The directory that the library looks in when none is given to it.
+std::string found_directory() {
+  char place[4096];
+  for (const int32_t selector : {0, 1}) {
+    if (LXGetDataLocation(place, sizeof place, selector) > 0) return place;
+  }
+  return {};
+}
+
 /// Why no control file could be used: LXInit says only that it was so.
-int reason_of_defaults(const char* directory) {
+std::string reason_of_defaults(const char* directory) {
+  std::error_code error;
+  const std::string file = control_file_of(directory != nullptr ? directory : found_directory());
+  if (fs::is_regular_file(file, error) && fs::is_empty(file, error)) return file + " is empty";
   int32_t code = LX_OK;
   LXObjManager* manager = LXInitObjManager(directory, 0, &code);
   if (manager != nullptr) LXTermObjManager(manager);
-  return code;
+  return describe_code(code);
 }
 
 }  // namespace
@@ -77,7 +92,7 @@ std::string describe_code(int code) {
                 {LX_E_NOT_FOUND, "object not found"},
                 {LX_E_FILE_NOT_FOUND, "file not found"},
                 {LX_E_FILE_ACCESS, "permission denied"},
-                {LX_E_FILE_IO, "the file cannot be read, or its name is too long"},
+                {LX_E_FILE_IO, "the file is too short or cannot be read, or its name is too long"},
                 {LX_E_CORRUPT, "the file is damaged or not of this kind"}};
   for (const auto& row : kTexts) {
     if (row.code == code) return row.text;
@@ -85,8 +100,23 @@ std::string describe_code(int code) {
   return "error " + std::to_string(code);
 }
 
+std::string load_problem(int type, const std::string& title, const std::string& name, int code) {
+  int32_t found = LX_OK;
+  const LXObject* const object =
+      LXGetObjFromName(nullptr, type, name.c_str(), static_cast<int32_t>(name.size()), LX_FIND_ONLY, &found);
+  std::string text =
+      title + " " + name + " cannot be loaded: " + describe_code(code) + " (code " + std::to_string(code) + ")";
+  if (object == nullptr) return text;
+  const std::string directory = g_directory.empty() ? found_directory() : g_directory;
+  std::vector<char> file(directory.size() + 32);
+  const uint16_t id = reinterpret_cast<const LXObjDisk*>(object)->id;
+  LXGetDataFileName(directory.c_str(), type, id, file.data(), static_cast<int32_t>(file.size()));
+  return text + ": " + file.data();
+}
+
 Session::Session(const CommonOptions& common) {
   const std::string directory = choose_directory(common.locale_dir);
+  g_directory = directory;
   const char* const argument = directory.empty() ? nullptr : directory.c_str();
   const int32_t code = LXInit(argument, nullptr, nullptr, nullptr, 0);
   if (code != LX_OK && code != LX_W_DEFAULTS)
@@ -94,14 +124,14 @@ Session::Session(const CommonOptions& common) {
   built_in_only_ = code == LX_W_DEFAULTS;
   if (!built_in_only_) return;
   const char* const variable = std::getenv(kDirectoryVariable);
-  std::cerr << "lexicor: no usable locale directory";
+  std::cerr << g_program << ": no usable locale directory";
   if (argument != nullptr)
     std::cerr << " in " << directory;
   else if (variable != nullptr)
     std::cerr << " in " << kDirectoryVariable << "=" << variable;
-  std::cerr << " (" << describe_code(reason_of_defaults(argument))
+  std::cerr << " (" << reason_of_defaults(argument)
             << "): only the built-in objects English, UnitedStates and US-ASCII are there\n"
-            << kHowToName << '\n';
+            << g_program << ": " << kHowToName << '\n';
 }
 
 Session::~Session() {

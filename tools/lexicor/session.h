@@ -27,4 +27,7 @@ class Session {
 /// What a return code of the library means.
 std::string describe_code(int code);
 
+/// "sort Default cannot be loaded: file not found (code 1000): DIR/so_00001.nls". `title` names the type.
+std::string load_problem(int type, const std::string& title, const std::string& name, int code);
+
 }  // namespace lexicor_cli

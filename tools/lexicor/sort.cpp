@@ -8,6 +8,7 @@
 #include <functional>
 #include <memory>
 #include <string_view>
+#include <unordered_set>
 #include <vector>
 
 #include "arguments.h"
@@ -22,6 +23,8 @@ namespace lexicor_cli {
 
 namespace {
 
+constexpr char kUniqueBytes[] = "bytes", kUniqueOrder[] = "order";
+
 struct SortOptions {
   std::string locale;  // empty: the user's
   std::string codepage = "UTF-8";
@@ -29,15 +32,40 @@ struct SortOptions {
   bool key = false;
   bool ignore_case = false;
   bool reverse = false;
-  bool unique = false;
+  std::string unique;  // kUniqueBytes or kUniqueOrder; empty: every line is written
   std::vector<std::string> files;
 
   uint32_t options() const { return ignore_case ? LX_CASE_INSENSITIVE : 0; }
 };
 
+/// The beginning of a key. Most lines differ in it, so that few whole keys are looked at.
+class KeyHead {
+ public:
+  KeyHead() = default;
+  /// What is beyond the end counts as zeros.
+  explicit KeyHead(std::string_view key) {
+    for (size_t i = 0; i < std::min(key.size(), sizeof words_); ++i)
+      words_[i / kWordBytes] |= uint64_t{static_cast<uint8_t>(key[i])} << 8 * (kWordBytes - 1 - i % kWordBytes);
+  }
+
+  /// Below 0, 0 or above 0.
+  int compare(const KeyHead& other) const {
+    for (size_t i = 0; i < kWords; ++i) {
+      if (words_[i] != other.words_[i]) return words_[i] < other.words_[i] ? -1 : 1;
+    }
+    return 0;
+  }
+
+ private:
+  static constexpr size_t kWords = 4, kWordBytes = sizeof(uint64_t);
+
+  uint64_t words_[kWords] = {};
+};
+
 struct Line {
   std::string_view whole;  // with its end, as it is written
   std::string_view order;  // what is compared: the text without its end, or its key
+  KeyHead head;            // in binary order all the same
 };
 
 /// The lines of a text, of which every file ends its last one.
@@ -68,7 +96,7 @@ class Lines {
     const size_t next = ended ? feed + 1 : file_end;
     const bool two = ended && feed > begin && text_[feed - 1] == carriage_return_;
     const size_t end = two ? feed - 1 : ended ? feed : file_end;
-    Line line{view(begin, next), view(begin, end)};
+    Line line{view(begin, next), view(begin, end), {}};
     if (codepage_.call_bytes(line.order.data(), line.order.size()) != line.order.size())
       line.order = keep(joined(line.order));
     LXShiftState state;
@@ -195,28 +223,32 @@ void merge_sort(std::vector<Line>* lines, Before before, PassBar* bar) {
   }
 }
 
-/// Puts the key of each line in the place of its text; the keys are kept in `keys`.
+/// Gives each line the head of its key. With `keys`, which keeps the keys, the key takes the place of the text.
 void make_keys(Collation& collation, uint32_t options, std::vector<Line>* lines, std::string* keys,
                const std::function<void()>& made_one) {
   std::vector<size_t> ends;
-  for (const Line& line : *lines) {
-    collation.append_key(line.order, options, keys);
-    ends.push_back(keys->size());
+  std::string key;
+  for (Line& line : *lines) {
+    key.clear();
+    collation.append_key(line.order, options, &key);
+    line.head = KeyHead(key);
+    if (keys != nullptr) {
+      *keys += key;
+      ends.push_back(keys->size());
+    }
     made_one();
   }
   size_t begin = 0;
-  for (size_t i = 0; i < lines->size(); begin = ends[i++])
+  for (size_t i = 0; i < ends.size(); begin = ends[i++])
     (*lines)[i].order = std::string_view(*keys).substr(begin, ends[i] - begin);
 }
 
-/// Writes the lines; `same` tells which are left out behind the one before.
-template <class Same>
-void write_lines(const std::vector<Line>& lines, Output& output, Same same) {
+/// Writes the lines that `keeps` tells of.
+template <class Keeps>
+void write_lines(const std::vector<Line>& lines, Output& output, Keeps keeps) {
   std::string buffer;
-  const Line* kept = nullptr;
   for (const Line& line : lines) {
-    if (kept != nullptr && same(*kept, line)) continue;
-    kept = &line;
+    if (!keeps(line)) continue;
     buffer += line.whole;
     if (buffer.size() < Pieces::kBytes) continue;
     output.write(buffer);
@@ -237,15 +269,19 @@ int sort(const SortOptions& options, const CommonOptions& common) {
   Lines split(collation.codepage(), input, text);
   std::vector<Line>& lines = split.lines();
   std::string keys;
-  // In binary order a key is the text over again, and folded it is in another order than LXStrcoll's.
-  const bool by_key = options.key && !collation.binary();
+  const bool by_key = collation.by_key(options.options());
+  const bool keeps_keys = by_key && options.key;
   const auto compare = [&](const Line& a, const Line& b) {
-    return by_key ? a.order.compare(b.order) : collation.compare(a.order, b.order, options.options());
+    if (const int result = a.head.compare(b.head)) return result;
+    return keeps_keys ? a.order.compare(b.order) : collation.compare(a.order, b.order, options.options());
   };
   const uint64_t passes = count_passes(lines.size());
   {
     PassBar bar(text.size(), lines.size() * (by_key ? 2 * passes : passes));
-    if (by_key) make_keys(collation, options.options(), &lines, &keys, [&] { bar.advance(passes); });
+    if (by_key) {
+      make_keys(collation, options.options(), &lines, keeps_keys ? &keys : nullptr,
+                [&] { bar.advance(passes); });
+    }
     if (options.reverse)
       merge_sort(
           &lines, [&](const Line& a, const Line& b) { return compare(b, a) < 0; }, &bar);
@@ -253,8 +289,14 @@ int sort(const SortOptions& options, const CommonOptions& common) {
       merge_sort(
           &lines, [&](const Line& a, const Line& b) { return compare(a, b) < 0; }, &bar);
   }
-  write_lines(lines, output,
-              [&](const Line& a, const Line& b) { return options.unique && compare(a, b) == 0; });
+  std::unordered_set<std::string_view> written;
+  const Line* last = nullptr;
+  write_lines(lines, output, [&](const Line& line) {
+    if (options.unique == kUniqueBytes) return written.insert(line.whole).second;
+    const bool keeps = options.unique.empty() || last == nullptr || compare(*last, line) != 0;
+    if (keeps) last = &line;
+    return keeps;
+  });
   output.commit();
   return kDone;
 }
@@ -267,17 +309,22 @@ Run declare_sort(Arguments& command, const CommonOptions& common) {
       .type_name("LOCALE");
   command.add_option("--codepage", options->codepage, "codepage of the text; else UTF-8").type_name("CP");
   command.add_flag("--key", options->key,
-                   "make a key of every line and compare those: faster, takes more memory, same result");
+                   "keep the key of every line and compare those: faster, takes more memory, same result");
   command.add_flag("--case-insensitive", options->ignore_case, "letter case does not count");
   command.add_flag("--reverse", options->reverse, "last ones first; equal lines still keep their order");
-  command.add_flag("--unique", options->unique, "of equal lines write the first only");
+  command.add_flag(
+      "--unique", options->unique, {kUniqueBytes, kUniqueOrder},
+      "of lines that are the same bytes, or with =order of those that the order calls equal, write "
+      "the first only");
   command.add_option("-o,--output", options->output, "output file, replaced when it is complete")
       .type_name("OUT");
   command.add_option("FILE", options->files, "input files; - is standard input").type_name("");
   command.footer(
-      "A line ends with a line feed, or with a carriage return and one, which do not count. Equal lines keep "
-      "their\n"
-      "order. A last line without an end gets that of the line before it.\n"
+      "A line ends with a line feed, or with a carriage return and one, which do not count. Lines that the "
+      "order\n"
+      "calls equal stay as they were one behind the other. A last line without an end gets that of the line "
+      "before it.\n"
+      "--unique alone counts line ends as bytes of the line.\n"
       "\n"
       "Examples:\n"
       "  lexicor sort --locale Swedish names.txt\n"
