@@ -84,11 +84,14 @@ std::string normalized(const std::string& native_name) {
   return native_name.substr(0, dot) + (letters ? "." : ".iso") + codeset + native_name.substr(end);
 }
 
-/// The library's own spelling of an operating-system name, or an empty text where it knows none.
+/// The library's own spelling of an operating-system name, or an empty text where it knows none. Of C.UTF-8 it
+/// is C: the program takes text in UTF-8 anyway.
 std::string known_native_name(const std::string& name) {
   struct Search {
     std::string normalized, found;
   } search{normalized(name), ""};
+  for (const char* plain : {"C", "POSIX"})
+    if (search.normalized == plain + std::string(".utf8")) return plain;
   LXEnumNativeLocales(
       [](void* user, const char* native, const char*) {
         Search& wanted = *static_cast<Search*>(user);
