@@ -148,7 +148,7 @@ class Validator {
 
   /// Where UTF-8 is computed: what the formula writes has the lengths of the codepage, which has no states.
   bool formula_fits() const {
-    if (shift_ || width_ < 3) return false;
+    if (shift_) return false;
     for (uint32_t u = 0; u <= UINT16_MAX; u += u < 0x800 ? 1 : 0x1000) {
       uint8_t bytes[lx::kMaxCharBytes];
       const size_t count = lx::utf8_bytes(static_cast<uint16_t>(u));

@@ -237,7 +237,11 @@ TEST_F(Validate, Refused) {
       {"length 2 in a single-byte codepage", tiny_single, [](S& s) { payload(s)[fmt::kLengths] = 2; }},
       {"UTF-8: 3 bytes are read", tiny_utf8, [](S& s) { payload(s)[fmt::kLengths + 0xE0] = 2; }},
       {"UTF-8: 2 bytes are written", tiny_utf8, [](S& s) { payload(s)[fmt::kLengths + 0xC3] = 3; }},
-      {"UTF-8 with shift states", tiny_utf8, [](S& s) { set_word(s, fmt::kFlags, fmt::kFlagShift); }},
+      {"UTF-8 with shift states", tiny_utf8,
+       [](S& s) {
+         set_word(s, fmt::kFlags, fmt::kFlagAscii | fmt::kFlagShift);
+         set_word(s, fmt::kShiftOut, 0x0F0E);
+       }},
       // Texts end, and what is written reads back.
       {"U+0000 is no null", tiny_single, [](S& s) { set_code(s, 0, fmt::kKindByte, 'A'); }},
       {"a null is no U+0000", tiny_single, [](S& s) { set_word(s, fmt::kUnicode, 'A'); }},

@@ -141,12 +141,16 @@ TEST_F(CollateTest, Weights) {
   EXPECT_EQ(std::tie(at, left, counter, ahead), std::make_tuple(start + 2, 1, 2, LX_NO_LOOK_AHEAD));
   EXPECT_EQ(step(), 0);
   EXPECT_EQ(std::tie(at, left, counter), std::make_tuple(start + 2, 0, 2));
-  const LXUChar last[] = {'c', 0xFFFF, 'h'};
-  const LXUChar* unit_at = last;
-  int32_t units_left = 2;
-  EXPECT_EQ(LXStrGetNextWeightU(nullptr, &unit_at, &units_left, &counter, &first, &second, &char_class, &ahead),
-            1);
-  EXPECT_EQ(units_left, 1) << "U+FFFF stands for no character read ahead, so it is left where it is";
+  // A character is read ahead whether a pair begins with the one before it or not. U+FFFF, which stands for
+  // none, is left where it is.
+  const LXUChar units[] = {'a', 'b', 0xFFFF};
+  const LXUChar* unit_at = units;
+  int32_t units_left = 3;
+  for (const LXUChar wanted : {LXUChar{'b'}, LX_NO_LOOK_AHEAD}) {
+    LXStrGetNextWeightU(nullptr, &unit_at, &units_left, &counter, &first, &second, &char_class, &ahead);
+    EXPECT_EQ(std::tie(unit_at, ahead), std::make_tuple(units + 2, wanted));
+  }
+  EXPECT_EQ(units_left, 1);
 }
 
 /// The key of a text as a caller makes it who takes the weights one element at a time.
