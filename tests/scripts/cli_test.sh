@@ -533,8 +533,8 @@ assert len(ms932) == 1 and ms932[0]["id"] == 932 and "CP932" in ms932[0]["aliase
 
 # --- The README's commands do as they are written, in the source directory; compare answers by its exit code.
 while read -r command; do
-  command=${command//build\/m64/$2}
-  (cd "$source_dir" && eval "${command//\/tmp\//$work/}") >out 2>err
+  command=${command// \/tmp\// $work/}
+  (cd "$source_dir" && eval "${command/#build\/m64/$2}") >out 2>err
   status=$?
   [ "$status" = 0 ] || [[ $command == *' compare '* && $status -ge 3 ]] || fault "README: $command: $(cat err)"
 done < <(grep '^build/m64/bin/' "$source_dir/README.md")
