@@ -452,7 +452,7 @@ TEST_F(Strings, NullsAndRefusals) {
   EXPECT_EQ(LXStrspnEx(shift, "\x0F\x81", 0, 2, "\x82", 0, 1, nullptr, 0), 0);  // a shift byte is no span
   // Two texts joined, a Shift-In and a Shift-Out side by side: what is left is counted as it is taken.
   std::vector<char> joined{'\x81', '\x82', '\x0E', 0x44,   0x47, '\x0F', '\x0E',
-                           0x44,   0x48,   '\x0F', '\x0E', 0x44, 0x49};
+                           0x44,   0x48,   '\x0F', '\x0E', 0x44, 0x49,   '\0'};
   int32_t chars = 5, tokens = 0;
   LXShiftState state = 0;
   for (char *rest = joined.data(), *at = nullptr; rest != nullptr && tokens < 9; ++tokens) {
@@ -460,7 +460,7 @@ TEST_F(Strings, NullsAndRefusals) {
     rest = at;
     const int32_t taken =
         at != nullptr ? LXCpStrCharToByteLen(library_.object(lx::test::tiny_shift()), at, state, chars) : 0;
-    ASSERT_LE(taken, joined.data() + joined.size() - at);
+    ASSERT_LE(taken, joined.data() + joined.size() - 1 - at);
   }
   EXPECT_EQ(tokens, 2);
   EXPECT_EQ(LXNextCharEx(shift, joined.data() + 2, 0, nullptr, 0), joined.data() + 6);
