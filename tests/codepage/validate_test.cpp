@@ -3,6 +3,7 @@
 // the flat tables that loading derives are compared with those, walked as they are laid down.
 #include <gtest/gtest.h>
 
+#include <cstring>
 #include <functional>
 #include <random>
 
@@ -125,13 +126,18 @@ struct RawCodepage {
     return le16(payload() + 4372) + 8u * (le16(node + 2) + (node[1] & *p));
   }
 
-  static std::vector<uint8_t> unpacked(uint32_t code) {
-    std::vector<uint8_t> bytes;
-    if (code > 0xFFFFFF) bytes.push_back(static_cast<uint8_t>(code >> 24));
-    if ((code >> 16 & 0xFF) != 0) bytes.push_back(static_cast<uint8_t>(code >> 16));
-    if ((code >> 8 & 0xFF) != 0) bytes.push_back(static_cast<uint8_t>(code >> 8));
-    bytes.push_back(static_cast<uint8_t>(code));
-    return bytes;
+  struct Unpacked {
+    uint8_t bytes[4] = {};
+    size_t count = 0;
+    void add(uint32_t byte) { bytes[count++] = static_cast<uint8_t>(byte); }
+  };
+  static Unpacked unpacked(uint32_t code) {
+    Unpacked made;
+    if (code > 0xFFFFFF) made.add(code >> 24);
+    if ((code >> 16 & 0xFF) != 0) made.add(code >> 16);
+    if ((code >> 8 & 0xFF) != 0) made.add(code >> 8);
+    made.add(code);
+    return made;
   }
 };
 
@@ -139,13 +145,12 @@ void compare_from_unicode(const RawCodepage& raw, const LXObject* object) {
   for (uint32_t u = 0; u <= 0xFFFF; ++u) {
     const uint16_t unit = static_cast<uint16_t>(u);
     const uint32_t code = raw.code(unit);
-    ASSERT_EQ(LXCpUnicodeToCharW(object, unit), code) << std::hex << u;
     char bytes[5] = {1, 1, 1, 1, 1};
-    const auto expected = RawCodepage::unpacked(code);
-    ASSERT_EQ(LXCpUnicodeToChar(object, unit, bytes), static_cast<int32_t>(expected.size())) << std::hex << u;
-    ASSERT_TRUE(std::equal(expected.begin(), expected.end(), reinterpret_cast<uint8_t*>(bytes)))
-        << std::hex << u;
-    ASSERT_EQ(bytes[expected.size()], 1) << std::hex << u;
+    const RawCodepage::Unpacked expected = RawCodepage::unpacked(code);
+    const bool same = LXCpUnicodeToCharW(object, unit) == code &&
+                      LXCpUnicodeToChar(object, unit, bytes) == static_cast<int32_t>(expected.count) &&
+                      memcmp(expected.bytes, bytes, expected.count) == 0 && bytes[expected.count] == 1;
+    ASSERT_TRUE(same) << std::hex << u;
   }
 }
 
@@ -157,11 +162,10 @@ void compare_sequence(const RawCodepage& raw, const LXObject* object, const uint
   const size_t length = 1 + bytes[3] % 4u;
   uint32_t code = 0;
   for (size_t i = 0; i < length; ++i) code = code << 8 | bytes[i];
-  std::vector<uint8_t> unpacked = RawCodepage::unpacked(code);
-  unpacked.resize(4);
-  ASSERT_EQ(LXCpMbToUnicodeW(object, code), raw.unicode(unpacked.data())) << std::hex << code;
+  const RawCodepage::Unpacked unpacked = RawCodepage::unpacked(code);
+  ASSERT_EQ(LXCpMbToUnicodeW(object, code), raw.unicode(unpacked.bytes)) << std::hex << code;
   ASSERT_EQ(LXGetMbCtypeW(object, code) - object->section[0],
-            static_cast<ptrdiff_t>(raw.record(unpacked.data())));
+            static_cast<ptrdiff_t>(raw.record(unpacked.bytes)));
 }
 
 /// Every value and two-byte sequence, and many longer ones; `step` leaves out some.
