@@ -2,7 +2,7 @@
 // their own.
 #include <cstring>
 
-#include "collate/lxcursor.h"
+#include "text/lxcursor.h"
 #include "collate/lxsort.h"
 #include "core/lxcall.h"
 

@@ -1,7 +1,7 @@
 // Line ends in strings: finding the first one, and storing them.
 #include "stream/lxeol.h"
 
-#include "collate/lxcursor.h"
+#include "text/lxcursor.h"
 #include "core/lxcall.h"
 
 namespace {

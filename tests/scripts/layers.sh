@@ -1,5 +1,5 @@
 #!/usr/bin/env bash
-# Includes run one way: platform < core < codepage < locale < collate < format, stream, catalog < nls1; the command
+# Includes run one way: platform < core < codepage < locale < text < collate < format, stream, catalog < nls1; the command
 # line sees public headers only.
 set -euo pipefail
 cd "$1"
@@ -12,11 +12,12 @@ declare -A below=(
   [core]="platform core"
   [codepage]="platform core codepage"
   [locale]="platform core codepage locale"
-  [collate]="platform core codepage locale collate"
-  [format]="platform core codepage locale collate format"
-  [stream]="platform core codepage locale collate stream"
-  [catalog]="platform core codepage locale collate catalog"
-  [nls1]="platform core codepage locale collate format stream catalog nls1"
+  [text]="platform core codepage locale text"
+  [collate]="platform core codepage locale text collate"
+  [format]="platform core codepage locale text collate format"
+  [stream]="platform core codepage locale text collate stream"
+  [catalog]="platform core codepage locale text collate catalog"
+  [nls1]="platform core codepage locale text collate format stream catalog nls1"
 )
 for room in src/*/; do
   room=$(basename "$room")

@@ -3,7 +3,7 @@
 #include <cstring>
 
 #include "codepage/lxcopy.h"
-#include "collate/lxcursor.h"
+#include "text/lxcursor.h"
 #include "core/lxcall.h"
 #include "locale/lxlocale.h"
 

@@ -1,7 +1,7 @@
 // Copying and concatenation of strings by whole characters: what fits, and never a part of one.
 #include <cstring>
 
-#include "collate/lxcursor.h"
+#include "text/lxcursor.h"
 #include "core/lxcall.h"
 
 namespace {

@@ -2,7 +2,7 @@
 // readers of a text; the doors at the end say what kind of text they take.
 #include <cstring>
 
-#include "collate/lxcursor.h"
+#include "text/lxcursor.h"
 #include "core/lxcall.h"
 
 namespace {

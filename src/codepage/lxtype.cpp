@@ -1,0 +1,116 @@
+// Types of characters, and the language's special case mappings. Per-character primitives: no trace.
+#include "codepage/lxprimitive.h"
+#include "codepage/lxunicode.h"
+
+namespace {
+
+namespace fmt = lx::format::codepage;
+using lx::bytes_of;
+using lx::Primitive;
+
+/// The field of a type word that a selector asks for; any other selector gives the classification.
+uint32_t type_field(const Primitive& in, uint32_t word, uint32_t selector) {
+  switch (selector) {
+    case LX_CTYPE1:
+      return word & 0x3FF;
+    case LX_CTYPE2:
+      return (word & 0x3FFC00) >> 10;
+    case LX_CTYPE3:
+      return word >> 22;
+    default:
+      in.fail(LX_E_INVALID);
+      return word & 0x3FF;
+  }
+}
+
+}  // namespace
+
+namespace lx {
+
+const uint8_t* type_record(const Codepage& cp, const uint8_t* p) {
+  if (cp.single_byte) return nullptr;
+  const uint8_t* root = cp.payload + le16(cp.payload + fmt::kTypeTrie);
+  const uint8_t* node = root;
+  while (node[0] == 0) node = root + fmt::kTypeNodeBytes * (le16(node + 2) + (node[1] & *p++));
+  const size_t index = le16(node + 2) + (node[1] & *p);
+  return cp.payload + le16(cp.payload + fmt::kTypeRecords) + fmt::kTypeRecordBytes * index;
+}
+
+const uint8_t* type_record_of_code(const Codepage& cp, uint32_t code) {
+  uint8_t bytes[kMaxCharBytes] = {};
+  const uint32_t stored = without_zero_bytes(code);
+  store_code(bytes, stored, code_bytes(stored));
+  return type_record(cp, bytes);
+}
+
+Specials specials_of(const LXObject& language, bool upper) {
+  namespace words = format::language;
+  const uint8_t* payload = payload_of(language);
+  const size_t count = le16(payload + 2 * (upper ? words::kUpperSpecials : words::kLowerSpecials));
+  const size_t offset = le16(payload + 2 * (upper ? words::kUpperSpecialTable : words::kLowerSpecialTable));
+  return {payload + offset, count};
+}
+
+int32_t Specials::find(uint16_t first, uint16_t second, uint16_t* result1, uint16_t* result2) const {
+  const uint8_t* entry = entries;
+  for (size_t i = 0; i < count; ++i, entry += format::language::kSpecialBytes) {
+    if (le16(entry) != first || le16(entry + 2) != second) continue;
+    *result1 = le16(entry + 4);
+    *result2 = le16(entry + 6);
+    return *result2 == 0 ? 1 : 2;
+  }
+  return 0;
+}
+
+}  // namespace lx
+
+extern "C" {
+
+uint32_t LXGetCharType(LXLocale* locale, const char* text, uint32_t selector) {
+  const Primitive in(locale);
+  if (!in) return 0;
+  const uint8_t* p = bytes_of(text);
+  const bool single = in.single_byte() || in.cp().length(*p) == 1;
+  return type_field(in, single ? in.cp().type(*p) : lx::le32(lx::type_record(in.cp(), p)), selector);
+}
+
+uint32_t LXGetCharTypeW(LXLocale* locale, LXWChar code, uint32_t selector) {
+  const Primitive in(locale);
+  if (!in) return 0;
+  const bool single = in.single_byte() || code <= 0xFF;
+  return type_field(
+      in, single ? in.cp().type(static_cast<uint8_t>(code)) : lx::le32(lx::type_record_of_code(in.cp(), code)),
+      selector);
+}
+
+uint32_t LXGetCharTypeU(LXLocale* locale, LXUChar unicode, uint32_t selector) {
+  const Primitive in(locale);
+  return in ? type_field(in, lx::unicode_type(unicode), selector) : 0;
+}
+
+uint32_t LXGetCharTypeEx(LXLocale* locale, const char* text, LXShiftState state, uint32_t selector) {
+  const Primitive in(locale);
+  if (!in) return 0;
+  if (in.single_byte() || !in.shift_sensitive()) return LXGetCharType(locale, text, selector);
+  const uint8_t* p = bytes_of(text);
+  lx::take_shift(in.cp(), &p, &state);
+  const bool single = state != LX_SHIFT_DOUBLE;
+  return type_field(in, single ? in.cp().type(*p) : lx::le32(lx::type_record(in.cp(), p)), selector);
+}
+
+const uint8_t* LXGetMbCtype(const LXObject* codepage, const char* text) {
+  return lx::initialized() ? lx::type_record(lx::codepage_of(*codepage), bytes_of(text)) : nullptr;
+}
+
+const uint8_t* LXGetMbCtypeW(const LXObject* codepage, LXWChar code) {
+  return lx::initialized() ? lx::type_record_of_code(lx::codepage_of(*codepage), code) : nullptr;
+}
+
+int32_t LXLangGetSpecial(const LXObject* language, LXUChar first, LXUChar second, LXUChar* result1,
+                         LXUChar* result2, int32_t selector) {
+  constexpr int32_t kUpperSelector = 44;
+  if (!lx::initialized()) return 0;
+  return lx::specials_of(*language, selector == kUpperSelector).find(first, second, result1, result2);
+}
+
+}  // extern "C"
