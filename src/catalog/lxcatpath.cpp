@@ -79,8 +79,8 @@ bool add_value(LXWChar letter, const Values& values, Path* path) {
 }
 
 /// Opens the first path of a list of templates that can be opened.
-template <class Reader>
-LXFile* open_first(Reader in, const Values& values, Path path) {
+template <class Cursor>
+LXFile* open_first(Cursor in, const Values& values, Path path) {
   LXWChar code = 0;
   for (const uint8_t* start = in.p; in.next(&code); start = in.p) {
     if (code == kListEnd) {
@@ -102,7 +102,7 @@ struct Search {
 
   LXFile* run(LXLocale* locale) const {
     const Values values(locale, name);
-    return lx::read_bytes(lx::codepage_of(*locale->codepage), lx::Form::kPlain, LX_SHIFT_SINGLE,
+    return lx::with_cursor(lx::codepage_of(*locale->codepage), lx::Form::kPlain, LX_SHIFT_SINGLE,
                           lx::bytes_of(list), list_bytes,
                           [&](const auto& in) { return open_first(in, values, Path(path)); });
   }

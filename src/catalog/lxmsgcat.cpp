@@ -2,7 +2,7 @@
 // bytes of the caller's codepage.
 #include "catalog/lxmsgcat.h"
 
-#include "codepage/lxcopy.h"
+#include "codepage/lxtext.h"
 #include "core/lxcall.h"
 
 namespace {

@@ -101,6 +101,14 @@ inline uint32_t without_zero_bytes(uint32_t code) {
   return kept << 8 | (code & 0xFF);
 }
 
+/// Stores a packed code without its zero bytes: the bytes written.
+inline size_t store_packed(uint8_t* p, uint32_t code) {
+  const uint32_t stored = without_zero_bytes(code);
+  const size_t count = code_bytes(stored);
+  store_code(p, stored, count);
+  return count;
+}
+
 /// UTF-8 of 16-bit values, by formula: nothing is checked and surrogates are values like any other.
 inline uint16_t utf8_unicode(const uint8_t* p) {
   if (p[0] > 0xDF) return static_cast<uint16_t>((p[0] & 0x0F) << 12 | (p[1] & 0x3F) << 6 | (p[2] & 0x3F));
@@ -161,17 +169,6 @@ inline size_t store_unicode(const Codepage& cp, uint16_t u, uint8_t* p) {
   return count;
 }
 
-/// The bytes that `chars` characters take; without `most` no end is checked, else whole characters in that many
-/// bytes count. A shift byte on either side belongs to a character.
-size_t bytes_of_chars(const Codepage& cp, const uint8_t* text, LXShiftState state, int32_t chars,
-                      size_t most = SIZE_MAX);
-/// How many characters those are for which bytes_of_chars() finds at most `bytes` bytes.
-int32_t chars_counted(const Codepage& cp, const uint8_t* text, LXShiftState state, size_t bytes);
-
-/// The whole characters in `bytes` bytes. Of several shift bytes in front of a character one is passed over,
-/// the next one counts as a character.
-int32_t chars_in_bytes(const Codepage& cp, const uint8_t* text, LXShiftState state, size_t bytes);
-
 /// The type record of the character at `p`: the type word, then what added to its packed code gives the other
 /// case. Null in a single-byte codepage. There is no range check: the trie covers every byte sequence.
 const uint8_t* type_record(const Codepage& cp, const uint8_t* p);
@@ -190,6 +187,11 @@ Specials specials_of(const LXObject& language, bool upper);
 /// Where a caller may leave out the place.
 inline void put_state(LXShiftState* to, LXShiftState state) {
   if (to != nullptr) *to = state;
+}
+
+/// The shift byte that leads to a state.
+inline uint8_t shift_byte(const Codepage& cp, LXShiftState state) {
+  return state == LX_SHIFT_DOUBLE ? cp.shift_out : cp.shift_in;
 }
 
 /// Consumes a shift byte at `*p`, if there is one: true, and the state is set.

@@ -2,7 +2,7 @@
 // buffer had no room for, and the shift states of both sides.
 #include <string.h>
 
-#include "codepage/lxtext.h"
+#include "codepage/lxtransfer.h"
 #include "core/lxcall.h"
 #include "core/lxmemory.h"
 
@@ -53,9 +53,9 @@ class Stream {
     } else if (in_ == in_end_) {
       return LX_OK;
     }
-    return lx::read_bytes(in_cp_, lx::Form::kEx, c_->source_state, in_, left_in(), [&](auto reader) {
-      return lx::write_bytes(out_cp_, lx::Form::kEx, c_->target_state, out_, out_end_,
-                             [&](auto writer) { return move(reader, writer, held, u); });
+    return lx::with_cursor(in_cp_, lx::Form::kEx, c_->source_state, in_, left_in(), [&](auto reader) {
+      return lx::with_sink(out_cp_, lx::Form::kEx, c_->target_state, out_, out_end_,
+                           [&](auto writer) { return move(reader, writer, held, u); });
     });
   }
 
@@ -79,6 +79,7 @@ class Stream {
     return false;
   }
 
+  /// A shift byte among them is the first byte of a character: no cursor walks them.
   size_t pending_length() const {
     return in_cp_.shift_sensitive ? in_cp_.width_in(c_->source_state) : in_cp_.length(c_->pending_in[0]);
   }
@@ -97,70 +98,49 @@ class Stream {
     return true;
   }
 
-  template <class Reader, class Writer>
-  int32_t move(Reader reader, Writer writer, bool held, LXUChar u) {
+  template <class Cursor, class Sink>
+  int32_t move(Cursor in, Sink out, bool held, LXUChar u) {
     int32_t result = LX_OK;
-    if (held && !writer.put(u)) {
-      result = spill(writer, u);
+    if (held && !out.put(u)) {
+      result = spill(out, u);
     } else {
-      const auto moved = lx::transfer<LXUChar>(reader, writer, SIZE_MAX);
-      if (moved.stop == lx::Stop::kOutputFull) result = spill(writer, moved.held);
-      if (moved.stop == lx::Stop::kInputCut) result = keep_input(&reader);
+      const auto moved = lx::transfer<LXUChar>(in, out, SIZE_MAX);
+      if (moved.stop == lx::Stop::kOutputFull) result = spill(out, moved.held);
+      if (moved.stop == lx::Stop::kInputCut) result = keep_input(in);
     }
-    in_ = reader.p;
-    out_ = writer.p;
-    keep_state(reader, &c_->source_state);
-    keep_state(writer, &c_->target_state);
+    in_ = in.p;
+    out_ = out.p;
+    c_->source_state = static_cast<uint8_t>(lx::state_at(in, c_->source_state));
+    c_->target_state = static_cast<uint8_t>(lx::state_at(out, c_->target_state));
     return result;
   }
 
   /// Keeps the first bytes of a character that the input cuts.
-  template <class Reader>
-  int32_t keep_input(Reader* reader) {
-    const size_t n = static_cast<size_t>(reader->end - reader->p);
-    copy(c_->pending_in, reader->p, n);
+  template <class Cursor>
+  int32_t keep_input(Cursor& in) {
+    const size_t n = lx::room(in.p, in.end);
+    copy(c_->pending_in, in.p, n);
     c_->pending_in_count = static_cast<uint8_t>(n);
-    reader->p += n;
+    in.p += n;
     return LX_E_INPUT_CUT;
   }
 
   /// Writes what fits of a character that does not fit, and keeps the rest. The target state is switched now:
   /// the pending bytes belong to the new one.
-  template <class Writer>
-  int32_t spill(Writer& writer, LXUChar u) {
+  template <class Sink>
+  int32_t spill(Sink& out, LXUChar u) {
     uint8_t bytes[1 + lx::kMaxCharBytes];
-    size_t count = lx::store_unicode(out_cp_, u, bytes + 1);
-    const uint8_t* p = bytes + 1;
-    if (shift_before(writer, count, bytes)) {
-      p = bytes;
-      ++count;
-    }
-    const size_t room = static_cast<size_t>(writer.end - writer.p);
-    copy(writer.p, p, room);
-    writer.p += room;
-    copy(c_->pending_out, p + room, count - room);
-    c_->pending_out_count = static_cast<uint8_t>(count - room);
+    Sink whole = Sink::over(out_cp_, bytes, bytes + sizeof(bytes), lx::state_at(out, LX_SHIFT_SINGLE));
+    whole.put(u);
+    const size_t count = lx::room(bytes, whole.p);
+    const size_t fitting = lx::room(out.p, out.end);
+    copy(out.p, bytes, fitting);
+    copy(c_->pending_out, bytes + fitting, count - fitting);
+    c_->pending_out_count = static_cast<uint8_t>(count - fitting);
+    whole.p = out.end;
+    lx::go_on_at(out, whole);
     return LX_E_OUTPUT_FULL;
   }
-
-  static bool shift_before(lx::ShiftWriter& writer, size_t count, uint8_t* byte) {
-    if (!writer.shift_due(count)) return false;
-    *byte = writer.take_shift_byte();
-    return true;
-  }
-  template <class Writer>
-  static bool shift_before(Writer&, size_t, uint8_t*) {
-    return false;
-  }
-
-  static void keep_state(const lx::ShiftReader& text, uint8_t* state) {
-    *state = static_cast<uint8_t>(text.state);
-  }
-  static void keep_state(const lx::ShiftWriter& text, uint8_t* state) {
-    *state = static_cast<uint8_t>(text.state);
-  }
-  template <class Text>
-  static void keep_state(const Text&, uint8_t*) {}
 
   LXConversion* c_;
   const Codepage& in_cp_;

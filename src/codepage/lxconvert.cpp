@@ -1,8 +1,6 @@
 // Conversion of whole strings: between two codepages, to and from packed codes, to and from Unicode. One flow
 // for all of them over a reader and a writer; the doors below say what they read and write.
-#include <string.h>
-
-#include "codepage/lxtext.h"
+#include "codepage/lxtransfer.h"
 #include "core/lxcall.h"
 
 namespace {
@@ -14,16 +12,6 @@ using lx::codepage_of;
 using lx::Form;
 
 RAS1_Unit unit = RAS1_UNIT("lxconvert");
-
-size_t terminated_units(const uint8_t* text) {
-  return strlen(reinterpret_cast<const char*>(text));
-}
-template <class Unit>
-size_t terminated_units(const Unit* text) {
-  size_t n = 0;
-  while (text[n] != 0) ++n;
-  return n;
-}
 
 /// What the size, length and flags arguments of a conversion ask for.
 struct Request {
@@ -43,9 +31,7 @@ struct Request {
         null_terminated(length_given < 0),
         nothing((length_given == 0 || size_given <= 0) && (!terminate || size_given <= 0)),
         size(size_given > 0 ? static_cast<size_t>(size_given) - (terminate ? 1 : 0) : 0),
-        length(!valid || nothing  ? 0
-               : length_given < 0 ? terminated_units(input)
-                                  : static_cast<size_t>(length_given)) {}
+        length(!valid || nothing ? 0 : lx::text_units(input, length_given)) {}
 
   /// In character mode a length that was given counts characters: turns it into bytes.
   void count_bytes(const Codepage& cp, const uint8_t* input, LXShiftState state) {
@@ -61,40 +47,41 @@ struct Request {
 };
 
 /// Only byte output can be limited in characters: in the other forms a unit is one.
-template <class Writer>
+template <class Sink>
 bool limits_characters(const Request& request) {
-  return request.characters && sizeof(typename Writer::Unit) == 1;
+  return request.characters && sizeof(typename Sink::Unit) == 1;
 }
 
 /// Returns to the single-byte state before a null. A double-byte character is taken back when the Shift-In does
 /// not fit, and a double-byte run that this leaves empty vanishes with its Shift-Out; with no room for both
 /// bytes the null stands alone.
-template <class Writer>
-void close_state(Writer&, const uint8_t*, const Request&) {}
-void close_state(lx::ShiftWriter& out, const uint8_t* start, const Request& request) {
-  if (out.state != LX_SHIFT_DOUBLE) return;
-  constexpr size_t kClosing = 2;
-  const size_t size = request.size + (request.terminate ? 1 : 0);
-  const auto written = [&] { return static_cast<size_t>(out.p - start); };
-  const auto closing_fits = [&] { return request.characters || written() + kClosing <= size; };
-  if (!closing_fits() && written() >= out.cp.width) out.p -= out.cp.width;
-  if (written() > 0 && out.p[-1] == out.cp.shift_out)
-    --out.p;
-  else if (closing_fits())
-    *out.p++ = out.cp.shift_in;
+template <class Sink>
+void close_state(Sink& out, const typename Sink::Unit* start, const Request& request) {
+  if constexpr (Sink::kShifts) {
+    if (out.state != LX_SHIFT_DOUBLE) return;
+    constexpr size_t kClosing = 2;
+    const size_t size = request.size + (request.terminate ? 1 : 0);
+    const auto written = [&] { return lx::room(start, out.p); };
+    const auto closing_fits = [&] { return request.characters || written() + kClosing <= size; };
+    if (!closing_fits() && written() >= out.cp.width) out.take_back();
+    if (written() > 0 && out.p[-1] == out.cp.shift_out)
+      --out.p;
+    else if (closing_fits())
+      *out.p++ = out.take_shift_byte();
+  }
 }
 
 /// Converts, ends the output, and returns the units or characters written.
-template <class Value, class Reader, class Writer>
-int32_t convert(Reader in, Writer out, const Request& request) {
-  typename Writer::Unit* const start = out.p;
-  const bool by_chars = limits_characters<Writer>(request);
+template <class Value, class Cursor, class Sink>
+int32_t convert(Cursor in, Sink out, const Request& request) {
+  typename Sink::Unit* const start = out.p;
+  const bool by_chars = limits_characters<Sink>(request);
   const auto moved = lx::transfer<Value>(in, out, by_chars ? request.size : SIZE_MAX);
   const size_t used = by_chars ? moved.chars : static_cast<size_t>(out.p - start);
   const bool all = moved.stop == lx::Stop::kInputEnd;
   const bool end = request.terminate || (request.null_terminated && all && used < request.size);
   if (end) {
-    close_state(out, reinterpret_cast<const uint8_t*>(start), request);
+    close_state(out, start, request);
     *out.p++ = 0;
   }
   return static_cast<int32_t>(by_chars ? moved.chars + end : static_cast<size_t>(out.p - start));
@@ -136,9 +123,9 @@ int32_t convert_bytes(LXLocale* target, char* output, LXShiftState target_state,
         const Codepage& in_cp = codepage_of(*from->codepage);
         request.count_bytes(in_cp, bytes_of(input), source_state);
         uint8_t* const out = bytes_of(output);
-        return lx::read_bytes(in_cp, form, source_state, bytes_of(input), request.length, [&](auto reader) {
-          return lx::write_bytes(out_cp, form, target_state, out, end_of(out, request),
-                                 [&](auto writer) { return convert<LXUChar>(reader, writer, request); });
+        return lx::with_cursor(in_cp, form, source_state, bytes_of(input), request.length, [&](auto reader) {
+          return lx::with_sink(out_cp, form, target_state, out, end_of(out, request),
+                               [&](auto writer) { return convert<LXUChar>(reader, writer, request); });
         });
       });
 }
@@ -148,8 +135,8 @@ int32_t to_unicode(LXUChar* output, int32_t size, LXLocale* locale, const char* 
   return carry_out(locale, lx::locale_of(locale), size, bytes_of(input), length, flags, kUnicode,
                    [&](const Codepage& cp, Request& request) {
                      request.count_bytes(cp, bytes_of(input), state);
-                     const lx::UnicodeWriter writer{output, lx::end_of(output, request.size)};
-                     return lx::read_bytes(cp, form, state, bytes_of(input), request.length, [&](auto reader) {
+                     const lx::UnicodeSink writer{output, lx::end_of(output, request.size)};
+                     return lx::with_cursor(cp, form, state, bytes_of(input), request.length, [&](auto reader) {
                        return convert<LXUChar>(reader, writer, request);
                      });
                    });
@@ -159,9 +146,9 @@ int32_t from_unicode(LXLocale* locale, char* output, LXShiftState state, int32_t
                      int32_t length, int32_t flags, Form form) {
   return carry_out(locale, lx::locale_of(locale), size, input, length, flags, kUnicode,
                    [&](const Codepage& cp, Request& request) {
-                     const lx::UnicodeReader reader{input, input + request.length};
+                     const lx::UnicodeCursor reader{input, input + request.length};
                      uint8_t* const out = bytes_of(output);
-                     return lx::write_bytes(cp, form, state, out, end_of(out, request), [&](auto writer) {
+                     return lx::with_sink(cp, form, state, out, end_of(out, request), [&](auto writer) {
                        return convert<LXUChar>(reader, writer, request);
                      });
                    });
@@ -174,8 +161,8 @@ int32_t to_wide(LXLocale* locale, LXWChar* output, int32_t size, const char* inp
                    [&](const Codepage& cp, Request& request) {
                      request.count_bytes(cp, bytes_of(input), state);
                      request.take_terminator();
-                     const lx::CodeWriter writer{cp, output, lx::end_of(output, request.size)};
-                     return lx::read_bytes(cp, form, state, bytes_of(input), request.length, [&](auto reader) {
+                     const lx::CodeSink writer{cp, output, lx::end_of(output, request.size)};
+                     return lx::with_cursor(cp, form, state, bytes_of(input), request.length, [&](auto reader) {
                        return convert<LXWChar>(reader, writer, request);
                      });
                    });
@@ -187,9 +174,9 @@ int32_t from_wide(LXLocale* locale, char* output, LXShiftState state, int32_t si
   return carry_out(locale, lx::locale_of(locale), size, input, length, flags, kPacked,
                    [&](const Codepage& cp, Request& request) {
                      request.take_terminator();
-                     const lx::CodeReader reader{cp, input, input + request.length};
+                     const lx::CodeCursor reader{cp, input, input + request.length};
                      uint8_t* const out = bytes_of(output);
-                     return lx::write_bytes(cp, form, state, out, end_of(out, request), [&](auto writer) {
+                     return lx::with_sink(cp, form, state, out, end_of(out, request), [&](auto writer) {
                        return convert<LXWChar>(reader, writer, request);
                      });
                    });
@@ -199,14 +186,6 @@ int32_t from_wide(LXLocale* locale, char* output, LXShiftState state, int32_t si
 const LXObject* common_codepage() {
   int32_t rc = LX_OK;
   return lx::object_by_id(LX_CODEPAGE, lx::format::codepage::kCommonId, &rc);
-}
-
-/// The units of a text up to a null, or its length where one is given.
-template <class Unit>
-int32_t units_before_null(const Unit* text, int32_t length) {
-  int32_t n = 0;
-  while ((length < 0 || n < length) && text[n] != 0) ++n;
-  return n;
 }
 
 }  // namespace
@@ -232,8 +211,8 @@ int32_t LXConvertStringW(LXLocale* target, LXWChar* output, int32_t size, LXLoca
   return carry_out(
       target, from, size, input, length, flags, kBetweenLocales,
       [&](const Codepage& cp, const Request& request) {
-        const lx::CodeReader reader{codepage_of(*from->codepage), input, input + request.length};
-        return convert<LXUChar>(reader, lx::CodeWriter{cp, output, lx::end_of(output, request.size)}, request);
+        const lx::CodeCursor reader{codepage_of(*from->codepage), input, input + request.length};
+        return convert<LXUChar>(reader, lx::CodeSink{cp, output, lx::end_of(output, request.size)}, request);
       });
 }
 
@@ -272,8 +251,8 @@ int32_t LXStringToUnicodeW(LXUChar* output, int32_t size, LXLocale* locale, cons
   return carry_out(
       locale, lx::locale_of(locale), size, input, length, flags, kUnicode,
       [&](const Codepage& cp, const Request& request) {
-        const lx::CodeReader reader{cp, input, input + request.length};
-        return convert<LXUChar>(reader, lx::UnicodeWriter{output, lx::end_of(output, request.size)}, request);
+        const lx::CodeCursor reader{cp, input, input + request.length};
+        return convert<LXUChar>(reader, lx::UnicodeSink{output, lx::end_of(output, request.size)}, request);
       });
 }
 
@@ -292,38 +271,38 @@ int32_t LXUnicodeToStringW(LXLocale* locale, LXWChar* output, int32_t size, cons
   return carry_out(
       locale, lx::locale_of(locale), size, input, length, flags, kUnicode,
       [&](const Codepage& cp, const Request& request) {
-        const lx::UnicodeReader reader{input, input + request.length};
-        return convert<LXUChar>(reader, lx::CodeWriter{cp, output, lx::end_of(output, request.size)}, request);
+        const lx::UnicodeCursor reader{input, input + request.length};
+        return convert<LXUChar>(reader, lx::CodeSink{cp, output, lx::end_of(output, request.size)}, request);
       });
 }
 
 int32_t LXCpStrToUnicode(const LXObject* codepage, const char* input, int32_t length, LXUChar* output) {
   if (!lx::initialized()) return -1;
-  const size_t bytes = length < 0 ? strlen(input) : strnlen(input, static_cast<size_t>(length));
+  const size_t bytes = lx::units_up_to(input, length);
   if (length < 0 && bytes == 0) return -1;
-  return lx::read_bytes(codepage_of(*codepage), Form::kEx, LX_SHIFT_SINGLE, bytes_of(input), bytes,
-                        [&](auto reader) {
-                          lx::UnicodeWriter writer{output, lx::no_end<LXUChar>()};
-                          lx::transfer<LXUChar>(reader, writer, SIZE_MAX);
-                          return static_cast<int32_t>(writer.p - output);
-                        });
+  return lx::with_cursor(codepage_of(*codepage), Form::kEx, LX_SHIFT_SINGLE, bytes_of(input), bytes,
+                         [&](auto reader) {
+                           lx::UnicodeSink writer{output, lx::no_end<LXUChar>()};
+                           lx::transfer<LXUChar>(reader, writer, SIZE_MAX);
+                           return static_cast<int32_t>(writer.p - output);
+                         });
 }
 
 int32_t LXCpUnicodeToStr(const LXObject* codepage, const LXUChar* input, LXShiftState state, int32_t length,
                          char* output) {
   if (!lx::initialized()) return 0;
-  const size_t units = length < 0 ? terminated_units(input) : static_cast<size_t>(length);
-  return lx::write_bytes(codepage_of(*codepage), Form::kEx, state, bytes_of(output), lx::no_end<uint8_t>(),
-                         [&](auto writer) {
-                           lx::UnicodeReader reader{input, input + units};
-                           lx::transfer<LXUChar>(reader, writer, SIZE_MAX);
-                           return static_cast<int32_t>(writer.p - bytes_of(output));
-                         });
+  const size_t units = lx::text_units(input, length);
+  return lx::with_sink(codepage_of(*codepage), Form::kEx, state, bytes_of(output), lx::no_end<uint8_t>(),
+                       [&](auto writer) {
+                         lx::UnicodeCursor reader{input, input + units};
+                         lx::transfer<LXUChar>(reader, writer, SIZE_MAX);
+                         return static_cast<int32_t>(writer.p - bytes_of(output));
+                       });
 }
 
 int32_t LXComStrToUnicode(const char* input, int32_t length, LXUChar* output) {
   const LXObject* common = common_codepage();
-  const int32_t n = common != nullptr ? units_before_null(input, length) : 0;
+  const int32_t n = common != nullptr ? static_cast<int32_t>(lx::units_up_to(input, length)) : 0;
   for (int32_t i = 0; i < n; ++i) output[i] = codepage_of(*common).unicode[bytes_of(input)[i]];
   output[n] = 0;
   return n != 0 ? n : -1;
@@ -331,7 +310,7 @@ int32_t LXComStrToUnicode(const char* input, int32_t length, LXUChar* output) {
 
 int32_t LXComUnicodeToStr(const LXUChar* input, int32_t length, char* output) {
   const LXObject* common = common_codepage();
-  const int32_t n = common != nullptr ? units_before_null(input, length) : 0;
+  const int32_t n = common != nullptr ? static_cast<int32_t>(lx::units_up_to(input, length)) : 0;
   uint8_t* out = bytes_of(output);
   for (int32_t i = 0; i < n; ++i) out += lx::store_unicode(codepage_of(*common), input[i], out);
   *out = 0;

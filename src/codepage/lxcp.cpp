@@ -1,62 +1,63 @@
-// Characters of a codepage: how long they are, where the next and the previous one start, how many there are, and
-// their packed codes and Unicode values. Per-character primitives: no trace.
+// Characters of a codepage: how long they are, where the next and the previous one start, how many there are,
+// and their packed codes and Unicode values. Per-character primitives: no trace.
 #include <string.h>
 
 #include "codepage/lxprimitive.h"
+#include "codepage/lxtext.h"
 
 namespace {
 
 using lx::bytes_of;
+using lx::ByteText;
 using lx::Codepage;
+using lx::Form;
+using lx::MultiByteCursor;
 using lx::Primitive;
+using lx::ShiftCursor;
 
 char* same(const char* text) {
   return const_cast<char*>(text);
 }
-
-/// Steps over whole characters of `bytes` bytes by lead-byte lengths, at most `limit` of them.
-struct Walk {
-  size_t position = 0;
-  int32_t chars = 0;
-};
-Walk walk(const Codepage& cp, const uint8_t* text, size_t bytes) {
-  Walk at;
-  while (at.position < bytes) {
-    const size_t length = cp.length(text[at.position]);
-    if (length > bytes - at.position) break;
-    at.position += length;
-    ++at.chars;
-  }
-  return at;
+char* same(const uint8_t* text) {
+  return reinterpret_cast<char*>(const_cast<uint8_t*>(text));
 }
 
-/// Steps over characters, each with the shift bytes on both sides of it.
-struct CountedChars {
-  const Codepage& cp;
-  const uint8_t* p;
-  const uint8_t* end;
-  LXShiftState state;
+/// Calls `body` with the cursor of a text whose end is not known: by lead bytes, or where the codepage has them
+/// by shift bytes.
+template <class Body>
+auto with_char(const Primitive& in, const char* text, Body body) {
+  return body(MultiByteCursor{in.cp(), bytes_of(text), lx::no_end<const uint8_t>()});
+}
+template <class Body>
+auto with_char(const Primitive& in, const char* text, LXShiftState state, Body body) {
+  if (!in.shift_sensitive()) return with_char(in, text, body);
+  return body(ShiftCursor{in.cp(), bytes_of(text), lx::no_end<const uint8_t>(), state});
+}
 
-  size_t left(const uint8_t* q) const {
-    return reinterpret_cast<uintptr_t>(end) - reinterpret_cast<uintptr_t>(q);
-  }
-  /// False, with nothing passed, at the end and before a character that it cuts.
-  bool step() {
-    const uint8_t* q = p;
-    LXShiftState behind = state;
-    if (q == end || (cp.shift_sensitive && lx::take_shift(cp, &q, &behind) && q == end)) return false;
-    const size_t length = cp.shift_sensitive ? cp.width_in(behind) : cp.length(*q);
-    if (length > left(q)) return false;
-    q += length;
-    if (cp.shift_sensitive && q != end) lx::take_shift(cp, &q, &behind);
-    p = q;
-    state = behind;
-    return true;
-  }
+constexpr auto kCode = [](auto at) {
+  LXWChar code = 0;
+  at.next(&code);
+  return code;
 };
+constexpr auto kBytes = [](auto at) { return static_cast<int32_t>(at.pass()); };
 
-size_t length_of(const char* text, int32_t bytes) {
-  return bytes < 0 ? strlen(text) : static_cast<size_t>(bytes);
+/// Lead bytes can only be told from the front.
+char* previous_char(const Primitive& in, const char* start, const char* current) {
+  if (in.single_byte()) return same(current - 1);
+  const uint8_t* last = bytes_of(start);
+  for (MultiByteCursor at{in.cp(), last, bytes_of(current)}; at.pass() != 0 && at.p < at.end;) last = at.p;
+  return same(last);
+}
+
+/// Moves by a length above 0, in whole characters.
+char* move_by(const Codepage& cp, Form form, const char* text, LXShiftState state, int32_t length,
+              int32_t flags, LXShiftState* new_state) {
+  const size_t bytes = lx::units_of(cp, ByteText{bytes_of(text), length, state}, (flags & LX_CHARACTERS) != 0);
+  return lx::with_cursor(cp, form, state, bytes_of(text), bytes, [&](auto at) {
+    lx::pass_all(&at);
+    lx::put_state(new_state, lx::state_at(at, state));
+    return same(at.p);
+  });
 }
 
 int32_t valid_bytes(const char* text, size_t length) {
@@ -78,37 +79,8 @@ uint32_t unicode_to_code(const Codepage& cp, uint16_t u) {
 uint16_t code_to_unicode(const Codepage& cp, uint32_t code) {
   if (code <= 0xFF) return cp.unicode[code];
   uint8_t bytes[kMaxCharBytes] = {};
-  const uint32_t stored = without_zero_bytes(code);
-  store_code(bytes, stored, code_bytes(stored));
+  store_packed(bytes, code);
   return multibyte_unicode(cp, bytes);
-}
-
-size_t bytes_of_chars(const Codepage& cp, const uint8_t* text, LXShiftState state, int32_t chars, size_t most) {
-  const auto* const no_end = reinterpret_cast<const uint8_t*>(UINTPTR_MAX);
-  CountedChars at{cp, text, most == SIZE_MAX ? no_end : text + most, state};
-  while (chars > 0 && at.step()) --chars;
-  return static_cast<size_t>(at.p - text);
-}
-
-int32_t chars_counted(const Codepage& cp, const uint8_t* text, LXShiftState state, size_t bytes) {
-  CountedChars at{cp, text, text + bytes, state};
-  int32_t chars = 0;
-  while (at.step()) ++chars;
-  return chars;
-}
-
-int32_t chars_in_bytes(const Codepage& cp, const uint8_t* text, LXShiftState state, size_t bytes) {
-  if (!cp.shift_sensitive) return walk(cp, text, bytes).chars;
-  const uint8_t* p = text;
-  const uint8_t* const end = text + bytes;
-  int32_t chars = 0;
-  while (p < end) {
-    if (take_shift(cp, &p, &state) && p == end) break;
-    if (cp.width_in(state) > end - p) break;
-    p += cp.width_in(state);
-    ++chars;
-  }
-  return chars;
 }
 
 }  // namespace lx
@@ -117,21 +89,17 @@ extern "C" {
 
 LXWChar LXGetChar(LXLocale* locale, const char* text) {
   const Primitive in(locale);
-  return in ? lx::pack(bytes_of(text), in.cp().length(bytes_of(text)[0])) : 0;
+  return in ? with_char(in, text, kCode) : 0;
 }
 
 LXWChar LXGetCharEx(LXLocale* locale, const char* text, LXShiftState state) {
   const Primitive in(locale);
-  if (!in) return 0;
-  const uint8_t* p = bytes_of(text);
-  if (!in.shift_sensitive()) return lx::pack(p, in.cp().length(*p));
-  lx::take_shift(in.cp(), &p, &state);
-  return lx::pack(p, in.cp().width_in(state));
+  return in ? with_char(in, text, state, kCode) : 0;
 }
 
 int32_t LXPutChar(LXLocale* locale, char* text, LXWChar code) {
   const Primitive in(locale);
-  if (in) LXWToMb(text, code);
+  if (in) lx::store_packed(bytes_of(text), code);
   return 0;
 }
 
@@ -139,45 +107,39 @@ void LXPutCharEx(LXLocale* locale, char* text, LXShiftState state, LXWChar code)
   const Primitive in(locale);
   if (!in) return;
   const LXShiftState needed = code > 0xFF ? LX_SHIFT_DOUBLE : LX_SHIFT_SINGLE;
-  if (in.shift_sensitive() && needed != state)
-    *text++ = static_cast<char>(needed == LX_SHIFT_DOUBLE ? in.cp().shift_out : in.cp().shift_in);
-  LXWToMb(text, code);
+  if (in.shift_sensitive() && needed != state) *text++ = static_cast<char>(lx::shift_byte(in.cp(), needed));
+  lx::store_packed(bytes_of(text), code);
 }
 
 char* LXNextChar(LXLocale* locale, const char* text) {
   const Primitive in(locale);
-  return in ? same(text + in.cp().length(bytes_of(text)[0])) : same(text);
+  return same(in ? text + with_char(in, text, kBytes) : text);
 }
 
 char* LXNextCharEx(LXLocale* locale, const char* text, LXShiftState state, LXShiftState* new_state, int32_t) {
   const Primitive in(locale);
-  const uint8_t* p = bytes_of(text);
-  if (in && in.shift_sensitive()) {
-    lx::take_shift(in.cp(), &p, &state);
-    p += in.cp().width_in(state);
-    lx::take_shift(in.cp(), &p, &state);
-  } else if (in) {
-    p += in.cp().length(*p);
-  }
   lx::put_state(new_state, state);
-  return same(text + (p - bytes_of(text)));
+  if (!in) return same(text);
+  return with_char(in, text, state, [&](auto at) {
+    at.pass();
+    if constexpr (decltype(at)::kShifts) at.pass_shift();
+    lx::put_state(new_state, lx::state_at(at, state));
+    return same(at.p);
+  });
 }
 
 char* LXPrevChar(LXLocale* locale, const char* start, const char* current) {
   const Primitive in(locale);
   if (!in) return same(current);
-  if (in.single_byte()) return same(current - 1);
-  // Lead bytes can only be told from the front.
-  const char* p = start;
-  while (p + in.cp().length(bytes_of(p)[0]) < current) p += in.cp().length(bytes_of(p)[0]);
-  return same(p);
+  return previous_char(in, start, current);
 }
 
 char* LXPrevCharEx(LXLocale* locale, const char* start, const char* current, LXShiftState state,
                    LXShiftState* new_state) {
   const Primitive in(locale);
   lx::put_state(new_state, state);
-  if (!in || !in.shift_sensitive()) return LXPrevChar(locale, start, current);
+  if (!in) return same(current);
+  if (!in.shift_sensitive()) return previous_char(in, start, current);
   const Codepage& cp = in.cp();
   const char* p = current;
   if (p > start && cp.is_shift(bytes_of(p)[-1])) {
@@ -194,45 +156,28 @@ char* LXPrevCharEx(LXLocale* locale, const char* start, const char* current, LXS
 int32_t LXNumChars(LXLocale* locale, const char* text, int32_t bytes) {
   const Primitive in(locale);
   if (!in) return 0;
-  const size_t length = length_of(text, bytes);
-  return in.single_byte() ? static_cast<int32_t>(length) : walk(in.cp(), bytes_of(text), length).chars;
+  return lx::with_cursor(in.cp(), Form::kPlain, LX_SHIFT_SINGLE, bytes_of(text), lx::text_units(text, bytes),
+                         [](auto at) { return static_cast<int32_t>(lx::pass_all(&at)); });
 }
 
 int32_t LXNumCharsEx(LXLocale* locale, const char* text, LXShiftState state, int32_t bytes) {
   const Primitive in(locale);
   if (!in) return 0;
-  if (!in.shift_sensitive()) return LXNumChars(locale, text, bytes);
-  return lx::chars_in_bytes(in.cp(), bytes_of(text), state, length_of(text, bytes));
+  return lx::chars_in_bytes(in.cp(), bytes_of(text), state, lx::text_units(text, bytes));
 }
 
 char* LXMoveStringPointer(LXLocale* locale, const char* text, int32_t length, int32_t flags) {
   const Primitive in(locale);
   if (!in || length <= 0) return same(text);
-  size_t bytes = static_cast<size_t>(length);
-  if ((flags & LX_CHARACTERS) != 0)
-    bytes = lx::bytes_of_chars(in.cp(), bytes_of(text), LX_SHIFT_SINGLE, length);
-  if (in.single_byte()) return same(text + bytes);
-  return same(text + walk(in.cp(), bytes_of(text), bytes).position);
+  return move_by(in.cp(), Form::kPlain, text, LX_SHIFT_SINGLE, length, flags, nullptr);
 }
 
 char* LXMoveStringPointerEx(LXLocale* locale, const char* text, LXShiftState state, int32_t length,
                             LXShiftState* new_state, int32_t flags) {
   const Primitive in(locale);
   if (in && !in.shift_sensitive()) lx::put_state(new_state, state);
-  if (!in || !in.shift_sensitive()) return LXMoveStringPointer(locale, text, length, flags);
-  if (length <= 0) return same(text);
-  const Codepage& cp = in.cp();
-  size_t bytes = static_cast<size_t>(length);
-  if ((flags & LX_CHARACTERS) != 0) bytes = lx::bytes_of_chars(cp, bytes_of(text), state, length);
-  const uint8_t* p = bytes_of(text);
-  const uint8_t* const end = p + bytes;
-  while (p < end) {
-    lx::take_shift(cp, &p, &state);
-    if (cp.width_in(state) > end - p) break;
-    p += cp.width_in(state);
-  }
-  lx::put_state(new_state, state);
-  return same(text + (p - bytes_of(text)));
+  if (!in || length <= 0) return same(text);
+  return move_by(in.cp(), Form::kEx, text, state, length, flags, new_state);
 }
 
 int32_t LXValidChar(LXLocale* locale, const char* text) {
@@ -243,27 +188,23 @@ int32_t LXValidChar(LXLocale* locale, const char* text) {
 int32_t LXValidCharEx(LXLocale* locale, const char* text, LXShiftState state) {
   const Primitive in(locale);
   if (!in) return 0;
-  if (!in.shift_sensitive()) return LXValidChar(locale, text);
+  if (!in.shift_sensitive()) return valid_bytes(text, in.cp().length(bytes_of(text)[0]));
   return valid_bytes(text, state != LX_SHIFT_SINGLE ? in.cp().width : 1);
 }
 
 int32_t LXByteLength(LXLocale* locale, const char* text) {
   const Primitive in(locale);
-  return in ? in.cp().length(bytes_of(text)[0]) : 0;
+  return in ? with_char(in, text, kBytes) : 0;
 }
 
 int32_t LXByteLengthW(LXLocale* locale, LXWChar code) {
   const Primitive in(locale);
-  return in ? LXStrByteLength(code) : 0;
+  return in ? static_cast<int32_t>(lx::code_bytes(code)) : 0;
 }
 
 int32_t LXByteLengthEx(LXLocale* locale, const char* text, LXShiftState state) {
   const Primitive in(locale);
-  if (!in) return 0;
-  const uint8_t* p = bytes_of(text);
-  if (!in.shift_sensitive()) return in.cp().length(*p);
-  lx::take_shift(in.cp(), &p, &state);
-  return in.cp().width_in(state);
+  return in ? with_char(in, text, state, kBytes) : 0;
 }
 
 int32_t LXStrByteLength(LXWChar code) {
@@ -293,10 +234,7 @@ LXWChar LXMbToWS(const LXObject* codepage, const char* text, LXShiftState state)
 }
 
 int32_t LXWToMb(char* text, LXWChar code) {
-  const uint32_t stored = lx::without_zero_bytes(code);
-  const size_t count = lx::code_bytes(stored);
-  lx::store_code(bytes_of(text), stored, count);
-  return static_cast<int32_t>(count);
+  return static_cast<int32_t>(lx::store_packed(bytes_of(text), code));
 }
 
 LXUChar LXCpMbToUnicode(const LXObject* codepage, const char* text) {
@@ -305,9 +243,10 @@ LXUChar LXCpMbToUnicode(const LXObject* codepage, const char* text) {
 }
 
 LXUChar LXCpMbToUnicodeW(const LXObject* codepage, LXWChar code) {
-  char text[lx::kMaxCharBytes] = {};
-  LXWToMb(text, code);
-  return LXCpMbToUnicode(codepage, text);
+  if (!lx::initialized()) return lx::kNoUnicode;
+  uint8_t text[lx::kMaxCharBytes] = {};
+  lx::store_packed(text, code);
+  return lx::multibyte_unicode(lx::codepage_of(*codepage), text);
 }
 
 int32_t LXCpUnicodeToChar(const LXObject* codepage, LXUChar unicode, char* text) {
@@ -326,10 +265,7 @@ int32_t LXCpStrCharToByteLen(const LXObject* codepage, const char* text, LXShift
 
 int32_t LXCpStrByteToCharLen(const LXObject* codepage, const char* text, LXShiftState state, int32_t bytes) {
   if (!lx::initialized() || bytes == 0) return 0;
-  const Codepage& cp = lx::codepage_of(*codepage);
-  const size_t length = length_of(text, bytes);
-  if (cp.single_byte) return static_cast<int32_t>(length);
-  return lx::chars_in_bytes(cp, bytes_of(text), state, length);
+  return lx::chars_in_bytes(lx::codepage_of(*codepage), bytes_of(text), state, lx::text_units(text, bytes));
 }
 
 }  // extern "C"

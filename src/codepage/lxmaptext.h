@@ -1,220 +1,165 @@
-// The kinds of text as mapping walks them: input and output side by side. Unlike the readers and writers of
-// conversion they know which bytes a character stood in, because one without a mapping is copied as it is, and
-// shift bytes are passed through.
+// The kinds of text as mapping walks them: a cursor and a sink side by side. Unlike conversion, mapping knows
+// which bytes a character stood in, because one without a mapping is copied as it is.
 #pragma once
-
-#include <cstring>
 
 #include "codepage/lxtext.h"
 
 namespace lx {
 
 struct UnicodeChar {
-  uint16_t u;
+  LXUChar u;
+  void set(const LXUChar* p, size_t) { u = *p; }
 };
 
-/// A character of a codepage. In a shift-stateful text also the states before and behind the shift byte that
-/// stands in front of it, if one does.
+/// A character of a codepage as its bytes.
 struct ByteChar {
   const uint8_t* p;
   size_t length;
+  void set(const uint8_t* at, size_t bytes) { p = at, length = bytes; }
+};
+
+/// A packed code, unpacked into its bytes.
+struct CodeChar : ByteChar {
+  LXWChar code;
+  uint8_t bytes[kMaxCharBytes];
+
+  CodeChar() = default;
+  CodeChar(const CodeChar&) = delete;
+  CodeChar& operator=(const CodeChar&) = delete;
+  void set(const LXWChar* at, size_t) {
+    code = *at;
+    memset(bytes, 0, sizeof(bytes));
+    p = bytes;
+    length = store_packed(bytes, code);
+  }
+};
+
+inline bool put_copy(UnicodeSink& out, const UnicodeChar& c) {
+  return out.put(c.u);
+}
+inline bool put_copy(CodeSink& out, const CodeChar& c) {
+  return out.put(c.code);
+}
+inline bool put_copy(MultiByteSink& out, const ByteChar& c) {
+  return out.put_bytes(c.p, c.length);
+}
+
+// Texts. take() gives the next whole character; put() and copy() write, or are false when there is no room.
+// `taken` is the state behind what was taken, `written` behind what was written: pass_before() passes on what
+// stands before a character that does not fit, finish() ends the output. kRuns: characters of one unit may be
+// mapped side by side.
+
+template <class CursorOf, class SinkOf, class CharOf, bool kRunsOf>
+struct MapText {
+  using Char = CharOf;
+  static constexpr bool kRuns = kRunsOf;
+  CursorOf in;
+  SinkOf out;
+
+  bool take(Char* c) {
+    const size_t units = in.pass();
+    if (units == 0) return false;
+    c->set(in.p - units, units);
+    return true;
+  }
+  template <class Value>
+  bool put(Value value, const Char&) {
+    return out.put(value);
+  }
+  bool copy(const Char& c) { return put_copy(out, c); }
+  void skip_to(const MapText& ahead, const Char&, Char*) { in.p = ahead.in.p; }
+  void note_written(Char*) {}
+  void pass_before() {}
+  void finish() {}
+};
+using UnicodeText = MapText<UnicodeCursor, UnicodeSink, UnicodeChar, true>;
+using WideText = MapText<CodeCursor, CodeSink, CodeChar, false>;
+using LeadByteText = MapText<MultiByteCursor, MultiByteSink, ByteChar, true>;
+
+/// How many units can be mapped unit by unit.
+template <class Text>
+size_t most_units(const Text& text) {
+  return least(room(text.in.p, text.in.end), room(text.out.p, text.out.end));
+}
+
+/// A character of shift-stateful text, and the states before and behind the shift byte in front of it, if there
+/// is one.
+struct ShiftChar : ByteChar {
   LXShiftState before;
   LXShiftState state;
   bool shifted;
 };
 
-// Texts: input and output side by side. take() gives the next whole character and moves the input; put() and
-// copy() write, or are false when there is no room. finish() ends the output. most() is how
-// many units can be mapped unit by unit.
-
-struct UnicodeText {
-  using Char = UnicodeChar;
-  static constexpr bool kRuns = true;
-  const LXUChar* p;
-  const LXUChar* end;
-  LXUChar* out;
-  LXUChar* out_end;
-
-  size_t most() const { return least(room(p, end), room(out, out_end)); }
-  bool take(Char* c) {
-    if (p == end) return false;
-    c->u = *p++;
-    return true;
-  }
-  bool put(LXUChar value, const Char&) {
-    if (out == out_end) return false;
-    *out++ = value;
-    return true;
-  }
-  bool copy(const Char& c) { return put(c.u, c); }
-  void finish(LXShiftState) {}
-};
-
-/// Packed codes; a code is unpacked into its bytes.
-struct CodeText {
-  static constexpr bool kRuns = false;
-  const Codepage& cp;
-  const LXWChar* p;
-  const LXWChar* end;
-  LXWChar* out;
-  LXWChar* out_end;
-
-  struct Char : ByteChar {
-    LXWChar code;
-    uint8_t bytes[kMaxCharBytes];
-    Char() : ByteChar{bytes, 0, 0, 0, false} {}
-    Char(const Char&) = delete;
-    Char& operator=(const Char&) = delete;
-  };
-  bool take(Char* c) {
-    if (p == end) return false;
-    c->code = *p++;
-    const uint32_t stored = without_zero_bytes(c->code);
-    c->length = code_bytes(stored);
-    memset(c->bytes, 0, sizeof(c->bytes));
-    store_code(c->bytes, stored, c->length);
-    return true;
-  }
-  bool put(LXWChar value, const ByteChar&) {
-    if (out == out_end) return false;
-    *out++ = value;
-    return true;
-  }
-  bool copy(const Char& c) { return put(c.code, c); }
-  void finish(LXShiftState) {}
-};
-
-/// Bytes by lead-byte lengths.
-struct LeadByteText {
-  static constexpr bool kRuns = true;
-  const Codepage& cp;
-  const uint8_t* p;
-  const uint8_t* end;
-  uint8_t* out;
-  uint8_t* out_end;
-
-  using Char = ByteChar;
-  size_t most() const { return least(room(p, end), room(out, out_end)); }
-  bool take(Char* c) {
-    if (p == end) return false;
-    const size_t length = cp.length(*p);
-    if (length > static_cast<size_t>(end - p)) return false;
-    *c = {p, length, LX_SHIFT_SINGLE, LX_SHIFT_SINGLE, false};
-    p += length;
-    return true;
-  }
-  bool put(LXWChar value, const Char&) {
-    const uint32_t stored = without_zero_bytes(value);
-    const size_t count = code_bytes(stored);
-    if (count > room(out, out_end)) return false;
-    store_code(out, stored, count);
-    out += count;
-    return true;
-  }
-  bool copy(const Char& c) {
-    if (c.length > room(out, out_end)) return false;
-    for (size_t i = 0; i < c.length; ++i) *out++ = c.p[i];
-    return true;
-  }
-  void finish(LXShiftState) {}
-};
-
-/// Shift-stateful bytes. Shift bytes of the input are passed through while both sides are in the same state. A
-/// character that changes its width gets the shift byte that is due, and must fit together with the one that
-/// leads back to the state of the input, so that finish() always has room for it.
+/// Shift-stateful text is written apart: shift bytes of the input are passed through while both sides are in
+/// the same state, also those that change nothing. A character that changes its width gets the shift byte that
+/// is due, and must fit together with the one that leads back to the state of the input, so that finish()
+/// always has room for it.
 struct ShiftText {
+  using Char = ShiftChar;
   static constexpr bool kRuns = false;
-  const Codepage& cp;
-  const uint8_t* p;
-  const uint8_t* end;
-  uint8_t* out;
-  uint8_t* out_end;
-  LXShiftState in_state = LX_SHIFT_SINGLE;
-  LXShiftState out_state = LX_SHIFT_SINGLE;
-  bool behind_shift_in = false;  // the last character taken, and nothing of it is written
+  ShiftCursor in;
+  ShiftSink out;
+  LXShiftState reached = LX_SHIFT_SINGLE;  // of the input, behind the last character that was written
+  bool behind_shift_in = false;            // the last character taken, and nothing of it is written
 
-  using Char = ByteChar;
   bool take(Char* c) {
-    if (p == end) return false;
-    const uint8_t* q = p;
-    LXShiftState state = in_state;
-    const bool shifted = take_shift(cp, &q, &state);
-    const size_t length = cp.width_in(state);
-    if (length > static_cast<size_t>(end - q)) return false;
-    *c = {q, length, in_state, state, shifted};
-    behind_shift_in = shifted && state == LX_SHIFT_SINGLE && out_state == in_state;
-    p = q + length;
-    in_state = state;
+    ShiftCursor ahead(in);
+    const size_t length = ahead.pass();
+    if (length == 0) return false;
+    c->set(ahead.p - length, length);
+    c->before = in.state;
+    c->state = ahead.state;
+    c->shifted = c->p != in.p;
+    behind_shift_in = c->shifted && c->state == LX_SHIFT_SINGLE && out.state == in.state;
+    go_on_at(in, ahead);
     return true;
   }
   bool put(LXWChar value, const Char& c) {
     uint8_t bytes[kMaxCharBytes];
-    const uint32_t stored = without_zero_bytes(value);
-    const size_t count = code_bytes(stored);
-    store_code(bytes, stored, count);
+    const size_t count = store_packed(bytes, value);
     return write(bytes, count, count == 1 ? LX_SHIFT_SINGLE : LX_SHIFT_DOUBLE, c);
   }
   bool copy(const Char& c) { return write(c.p, c.length, c.state, c); }
 
-  /// Passes the Shift-In before a character that could not be written itself: the state reached by it.
-  LXShiftState pass_shift_in(LXShiftState reached) {
-    if (!behind_shift_in || out == out_end) return reached;
-    *out++ = cp.shift_in;
-    return out_state = LX_SHIFT_SINGLE;
+  /// Goes on behind `next`, which was taken together with `*c`.
+  void skip_to(const ShiftText& ahead, const Char& next, Char* c) {
+    go_on_at(in, ahead.in);
+    c->state = next.state;
+    c->shifted = false;
+  }
+  /// Something that stands for a character was written, and the shift byte in front of it.
+  void note_written(Char* c) {
+    reached = c->state;
+    c->shifted = false;
   }
 
-  /// `reached`: the state of the input behind the last character that was written. A shift byte that ends the
-  /// input belongs to it as well.
-  void finish(LXShiftState reached) {
-    const bool in_step = out_state == reached;
-    const uint8_t* q = p;
-    const bool shifted = end - p == 1 && take_shift(cp, &q, &reached);
-    if (out_state != reached || (in_step && shifted))
-      if (out != out_end) *out++ = shift_byte(reached);
+  /// Passes the Shift-In before a character that could not be written itself.
+  void pass_before() {
+    if (!behind_shift_in || out.p == out.end) return;
+    *out.p++ = in.cp.shift_in;
+    out.state = reached = LX_SHIFT_SINGLE;
+  }
+
+  /// A shift byte that ends the input belongs to the last character that was written as well.
+  void finish() {
+    const bool in_step = out.state == reached;
+    in.state = reached;
+    const bool shifted = in.pass_last_shift();
+    if ((out.state != in.state || (in_step && shifted)) && out.p != out.end)
+      *out.p++ = shift_byte(in.cp, in.state);
   }
 
  private:
-  uint8_t shift_byte(LXShiftState to) const { return to == LX_SHIFT_DOUBLE ? cp.shift_out : cp.shift_in; }
   bool write(const uint8_t* bytes, size_t count, LXShiftState needed, const Char& c) {
-    const bool passed = c.shifted && needed == c.state && out_state == c.before;
-    const bool lead = passed || out_state != needed;
-    if (lead + count + (needed != c.state ? 1 : 0) > room(out, out_end)) return false;
-    if (lead) *out++ = shift_byte(needed);
-    out_state = needed;
+    const bool passed = c.shifted && needed == c.state && out.state == c.before;
+    const bool lead = passed || out.state != needed;
+    if (lead + count + (needed != c.state ? 1 : 0) > room(out.p, out.end)) return false;
+    if (lead) *out.p++ = shift_byte(in.cp, needed);
+    out.state = needed;
     behind_shift_in = false;
-    for (size_t i = 0; i < count; ++i) *out++ = bytes[i];
+    for (size_t i = 0; i < count; ++i) *out.p++ = bytes[i];
     return true;
   }
 };
-
-/// Passes on what stands before a character that does not fit: the state that the input has reached by it.
-template <class Text>
-LXShiftState pass_before(Text&, LXShiftState reached) {
-  return reached;
-}
-inline LXShiftState pass_before(ShiftText& text, LXShiftState reached) {
-  return text.pass_shift_in(reached);
-}
-
-/// What follows a character, for pairs.
-inline LXShiftState state_of(const UnicodeChar&) {
-  return LX_SHIFT_SINGLE;
-}
-inline LXShiftState state_of(const ByteChar& c) {
-  return c.state;
-}
-inline void set_state(UnicodeChar*, LXShiftState) {}
-inline void set_state(ByteChar* c, LXShiftState state) {
-  c->state = state;
-  c->shifted = false;
-}
-template <class Text>
-void skip_to(Text* text, const Text& place) {
-  text->p = place.p;
-}
-inline void skip_to(ShiftText* text, const ShiftText& place) {
-  text->p = place.p;
-  text->in_state = place.in_state;
-}
 
 }  // namespace lx

@@ -15,6 +15,11 @@ uint16_t unicode_upper(uint16_t u);
 uint16_t unicode_half_to_full(uint16_t u);
 uint16_t unicode_full_to_half(uint16_t u);
 
+/// Whether a value stands where none has another case: ideographs, kana, Hangul, private use.
+inline bool unicode_caseless(uint16_t u) {
+  return u >= 0x24EA && u < 0xFF21;
+}
+
 /// The ASCII digit of a decimal digit, superscript or subscript; 0 for any other value. It knows the digits
 /// U+0F20 to U+0F29, whose type word lacks the decimal-digit bit: who maps text tests the bit first.
 uint16_t unicode_digit(uint16_t u);

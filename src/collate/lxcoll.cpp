@@ -26,15 +26,15 @@ constexpr uint32_t kBlanksOption = 0x1;  // part of LX_WIDTH_INSENSITIVE
 constexpr uint32_t kTruncation = 0x00800000u | LX_WIDTH_INSENSITIVE;
 
 /// One text while primaries decide.
-template <class Reader>
+template <class Cursor>
 struct Side {
-  lx::Elements<Reader> elements;
+  lx::Elements<Cursor> elements;
   Element element;
   Element second;
   bool pending = false;  // the second set of an expansion
   bool needs = true;     // an element
 
-  Side(const Sort& sort, const Reader& text) : elements(sort, text) {}
+  Side(const Sort& sort, const Cursor& text) : elements(sort, text) {}
 
   bool used_up() const { return !pending && elements.at_end(); }
   int32_t primary() const { return static_cast<int32_t>(element.primary()); }
@@ -63,10 +63,10 @@ struct Side {
 
 /// Compares primaries in the order of the texts: the difference, or 0 with `*inserted` when the levels must be
 /// compared, all of them or those behind the primaries.
-template <class Reader>
-int32_t compare_directly(const Sort& sort, const Reader& text1, const Reader& text2, bool* inserted) {
-  Side<Reader> a(sort, text1);
-  Side<Reader> b(sort, text2);
+template <class Cursor>
+int32_t compare_directly(const Sort& sort, const Cursor& text1, const Cursor& text2, bool* inserted) {
+  Side<Cursor> a(sort, text1);
+  Side<Cursor> b(sort, text2);
   *inserted = false;
   while (!(a.needs && a.used_up()) && !(b.needs && b.used_up())) {
     if (a.needs) a.take(sort);
@@ -128,8 +128,8 @@ struct LevelSpace {
   }
 };
 
-template <class Reader>
-int32_t compare_levels(const Sort& sort, const Reader& text1, const Reader& text2, bool primaries,
+template <class Cursor>
+int32_t compare_levels(const Sort& sort, const Cursor& text1, const Cursor& text2, bool primaries,
                        int32_t* code) {
   const size_t chars1 = lx::room(text1.p, text1.end);
   const size_t chars2 = lx::room(text2.p, text2.end);
@@ -148,11 +148,11 @@ int32_t compare_levels(const Sort& sort, const Reader& text1, const Reader& text
 
 /// Compares the weights of one level that are not 0, in the order of the texts: the shorter of two equal
 /// beginnings is less. `weight_of(set, position)` is 0 for none.
-template <class Reader, class WeightOf>
-int32_t compare_appended(const Sort& sort, const Reader& text1, const Reader& text2, WeightOf weight_of) {
-  lx::WeightSets<Reader> a(sort, text1);
-  lx::WeightSets<Reader> b(sort, text2);
-  const auto next = [&](lx::WeightSets<Reader>& sets) {
+template <class Cursor, class WeightOf>
+int32_t compare_appended(const Sort& sort, const Cursor& text1, const Cursor& text2, WeightOf weight_of) {
+  lx::WeightSets<Cursor> a(sort, text1);
+  lx::WeightSets<Cursor> b(sort, text2);
+  const auto next = [&](lx::WeightSets<Cursor>& sets) {
     Element set;
     while (sets.next(&set))
       if (const int64_t weight = weight_of(set, sets.position())) return weight;
@@ -229,9 +229,9 @@ template <class Unit>
 }
 
 /// How many of the first `units` units are whole characters.
-template <class Reader>
-size_t whole_units(const Reader& in, size_t units) {
-  if constexpr (Reader::kOneUnit) {
+template <class Cursor>
+size_t whole_units(const Cursor& in, size_t units) {
+  if constexpr (Cursor::kOneUnit) {
     return units;
   } else {
     for (size_t n = units; n + lx::kMaxCharBytes > units && n > 0; --n)
@@ -243,28 +243,27 @@ size_t whole_units(const Reader& in, size_t units) {
 }
 
 /// How many of the `same` units that both texts begin with stand before a place that no element reaches over.
-template <class Reader>
-size_t equal_beginning(const Sort& sort, const Reader& text1, const Reader& text2, size_t same) {
+template <class Cursor>
+size_t equal_beginning(const Sort& sort, const Cursor& text1, const Cursor& text2, size_t same) {
   if (same == 0) return 0;
   const size_t whole = whole_units(text1, same);
   if (whole == 0 || sort.pair_count == 0) return whole;
   const size_t last = whole_units(text1, whole - 1);
   LXUChar u = 0;
-  lx::read_like(text1, text1.p + last, whole - last, LX_SHIFT_SINGLE).next(&u);
+  lx::like(text1, text1.p + last, whole - last, LX_SHIFT_SINGLE).next(&u);
   if (!sort.element(u).starts_pair()) return whole;
-  const auto reaches_on = [&](const Reader& text) {
+  const auto reaches_on = [&](const Cursor& text) {
     LXUChar next = 0;
     Element pair;
-    return lx::read_like(text, text.p + whole, lx::room(text.p, text.end) - whole, LX_SHIFT_SINGLE)
-               .next(&next) &&
+    return lx::like(text, text.p + whole, lx::room(text.p, text.end) - whole, LX_SHIFT_SINGLE).next(&next) &&
            sort.pair(u, next, &pair);
   };
   return reaches_on(text1) || reaches_on(text2) ? 0 : whole;
 }
 
 /// The keys of two texts of at most `chars1` and `chars2` characters, compared.
-template <class Reader>
-int32_t compare_keys(const Sort& sort, const Reader& text1, size_t chars1, const Reader& text2, size_t chars2,
+template <class Cursor>
+int32_t compare_keys(const Sort& sort, const Cursor& text1, size_t chars1, const Cursor& text2, size_t chars2,
                      int32_t* code) {
   const LevelSpace space(chars1, chars2);
   *code = LX_E_MEMORY;
@@ -283,8 +282,8 @@ int32_t compare_keys(const Sort& sort, const Reader& text1, size_t chars1, const
 }
 
 /// Compares texts whose characters weigh one by one on the same levels: false where some do not.
-template <class Reader>
-[[gnu::noinline]] bool compare_in_step(const Sort& sort, const Reader& text1, const Reader& text2,
+template <class Cursor>
+[[gnu::noinline]] bool compare_in_step(const Sort& sort, const Cursor& text1, const Cursor& text2,
                                        int32_t* difference) {
   int32_t secondary = 0;
   int32_t tertiary = 0;
@@ -293,8 +292,8 @@ template <class Reader>
     if (*first == 0) *first = static_cast<int32_t>(weight1) - static_cast<int32_t>(weight2);
     return weight1 == weight2 || (weight1 != 0 && weight2 != 0);
   };
-  lx::Elements<Reader> a(sort, text1);
-  lx::Elements<Reader> b(sort, text2);
+  lx::Elements<Cursor> a(sort, text1);
+  lx::Elements<Cursor> b(sort, text2);
   for (;;) {
     const bool more1 = !a.at_end();
     const bool more2 = !b.at_end();
@@ -317,9 +316,9 @@ template <class Reader>
 }
 
 /// Compares texts that begin alike: `rest1` and `rest2` are what follows.
-template <class Reader>
-[[gnu::noinline]] int32_t compare_rest(const Sort& sort, const Reader& text1, const Reader& text2,
-                                       const Reader& rest1, const Reader& rest2, int32_t* code) {
+template <class Cursor>
+[[gnu::noinline]] int32_t compare_rest(const Sort& sort, const Cursor& text1, const Cursor& text2,
+                                       const Cursor& rest1, const Cursor& rest2, int32_t* code) {
   if (rest1.p == rest1.end && rest2.p == rest2.end) return 0;
   const auto compare = [&](auto weight_of) { return compare_appended(sort, rest1, rest2, weight_of); };
   if (const int32_t difference = compare([](const Element& set, uint16_t) { return set.primary(); }))
@@ -335,8 +334,8 @@ template <class Reader>
   });
 }
 
-template <class Reader>
-[[gnu::noinline]] int32_t compare_inserted(const Sort& sort, const Reader& text1, const Reader& text2,
+template <class Cursor>
+[[gnu::noinline]] int32_t compare_inserted(const Sort& sort, const Cursor& text1, const Cursor& text2,
                                            int32_t* code) {
   bool inserted = false;
   const int32_t difference = compare_directly(sort, text1, text2, &inserted);
@@ -345,18 +344,18 @@ template <class Reader>
 
 /// Compares by the weights alone. Most texts are told apart by the first character that differs. `same`: how
 /// many units they begin with alike.
-template <class Reader>
-int32_t compare_weights(const Sort& sort, const Reader& text1, const Reader& text2, size_t same,
+template <class Cursor>
+int32_t compare_weights(const Sort& sort, const Cursor& text1, const Cursor& text2, size_t same,
                         int32_t* code) {
   if (!sort.appends_primaries) return compare_inserted(sort, text1, text2, code);
   const size_t equal = equal_beginning(sort, text1, text2, same);
-  const auto rest = [equal](const Reader& text) {
+  const auto rest = [equal](const Cursor& text) {
     LXShiftState state = LX_SHIFT_SINGLE;
-    if constexpr (std::is_same_v<Reader, lx::ShiftReader>) state = text.state;
-    return lx::read_like(text, text.p + equal, lx::room(text.p, text.end) - equal, state);
+    if constexpr (Cursor::kShifts) state = text.state;
+    return lx::like(text, text.p + equal, lx::room(text.p, text.end) - equal, state);
   };
-  const Element x = lx::Elements<Reader>(sort, rest(text1)).next();
-  const Element y = lx::Elements<Reader>(sort, rest(text2)).next();
+  const Element x = lx::Elements<Cursor>(sort, rest(text1)).next();
+  const Element y = lx::Elements<Cursor>(sort, rest(text2)).next();
   const bool decided =
       x.sets() == 1 && y.sets() == 1 && x.primary() != 0 && y.primary() != 0 && x.primary() != y.primary();
   if (decided) return static_cast<int32_t>(x.primary()) - static_cast<int32_t>(y.primary());
@@ -367,8 +366,8 @@ int32_t compare_weights(const Sort& sort, const Reader& text1, const Reader& tex
 
 /// Compares two texts of one kind by the locale's sort, as `options` ask. `same`: of how many units it is known
 /// that both begin with them.
-template <class Reader>
-int32_t collate(const LXLocale& locale, const Reader& text1, const Reader& text2, uint32_t options, size_t same,
+template <class Cursor>
+int32_t collate(const LXLocale& locale, const Cursor& text1, const Cursor& text2, uint32_t options, size_t same,
                 int32_t* code) {
   const Sort& sort = lx::sort_of(*locale.sort);
   if (options == 0) return compare_weights(sort, text1, text2, same, code);
@@ -378,9 +377,9 @@ int32_t collate(const LXLocale& locale, const Reader& text1, const Reader& text2
     return 0;
   }
   const lx::Folding folding(locale, fold);
-  const auto chars = [&](const Reader& text) { return folding.most_chars(lx::room(text.p, text.end)); };
-  return compare_keys(sort, lx::FoldReader<Reader>{folding, text1}, chars(text1),
-                      lx::FoldReader<Reader>{folding, text2}, chars(text2), code);
+  const auto chars = [&](const Cursor& text) { return folding.most_chars(lx::room(text.p, text.end)); };
+  return compare_keys(sort, lx::FoldCursor<Cursor>{folding, text1}, chars(text1),
+                      lx::FoldCursor<Cursor>{folding, text2}, chars(text2), code);
 }
 
 /// A byte text that a collation function was given.
@@ -419,8 +418,10 @@ template <class InBinary>
                                         int32_t length2, uint32_t options, Form form, InBinary in_binary) {
   LXLocale* locale = call->locale();
   const Codepage& cp = codepage_of(*locale->codepage);
-  text1.bytes = lx::text_bytes(cp, text1.text, text1.state, length1, options);
-  text2.bytes = lx::text_bytes(cp, text2.text, text2.state, length2, options);
+  text1.bytes = lx::units_of(cp, lx::ByteText{bytes_of(text1.text), length1, text1.state},
+                             (options & LX_CHARACTERS) != 0);
+  text2.bytes = lx::units_of(cp, lx::ByteText{bytes_of(text2.text), length2, text2.state},
+                             (options & LX_CHARACTERS) != 0);
   options &= ~uint32_t{LX_CHARACTERS};
   if (locale->sort == nullptr) {
     // Comparison has its own error code, and its own rule for null-terminated texts.
@@ -436,9 +437,9 @@ template <class InBinary>
   }
   int32_t code = LX_OK;
   const int32_t difference =
-      lx::read_bytes(cp, form, text1.state, bytes_of(text1.text), text1.bytes, [&](const auto& in) {
-        return collate(*locale, in, lx::read_like(in, bytes_of(text2.text), text2.bytes, text2.state), options,
-                       0, &code);
+      lx::with_cursor(cp, form, text1.state, bytes_of(text1.text), text1.bytes, [&](const auto& in) {
+        return collate(*locale, in, lx::like(in, bytes_of(text2.text), text2.bytes, text2.state), options, 0,
+                       &code);
       });
   return call->fail(code, difference);
 }
@@ -504,8 +505,8 @@ int32_t LXStrcoll(LXLocale* locale, const char* text1, int32_t length1, const ch
     int32_t code = LX_OK;
     int32_t difference = compare_beginnings(cp, sort, p1, bytes1, p2, bytes2, &same);
     if (difference == 0)
-      difference = lx::read_bytes(cp, Form::kPlain, LX_SHIFT_SINGLE, p1, bytes1, [&](const auto& in) {
-        return compare_weights(sort, in, lx::read_like(in, p2, bytes2, LX_SHIFT_SINGLE), same, &code);
+      difference = lx::with_cursor(cp, Form::kPlain, LX_SHIFT_SINGLE, p1, bytes1, [&](const auto& in) {
+        return compare_weights(sort, in, lx::like(in, p2, bytes2, LX_SHIFT_SINGLE), same, &code);
       });
     return call.fail(code, difference);
   }
@@ -542,7 +543,7 @@ int32_t LXWcscoll(LXLocale* locale, const LXWChar* text1, int32_t length1, const
   };
   return collate_units(&call, text1, length1, text2, length2, options, full_width,
                        [](const Codepage& cp, const LXWChar* text, size_t count) {
-                         return lx::CodeReader{cp, text, text + count};
+                         return lx::CodeCursor{cp, text, text + count};
                        });
 }
 
@@ -562,7 +563,7 @@ int32_t LXStrcollU(LXLocale* locale, const LXUChar* text1, int32_t length1, cons
   };
   return collate_units(&call, text1, length1, text2, length2, options, full_width,
                        [](const Codepage&, const LXUChar* text, size_t count) {
-                         return lx::UnicodeReader{text, text + count};
+                         return lx::UnicodeCursor{text, text + count};
                        });
 }
 

@@ -31,11 +31,11 @@ struct Folding {
 
 /// Reads a text folded: a special mapping of a character, or else of it and its successor, takes their place.
 template <class In>
-struct FoldReader {
+struct FoldCursor {
   using Unit = uint8_t;
-  static constexpr bool kOneUnit = false;
+  static constexpr bool kOneUnit = false, kShifts = false, kUnicode = false;
   static constexpr bool kRuns = false;
-  using Char = std::conditional_t<std::is_same_v<In, UnicodeReader>, LXUChar, LXWChar>;
+  using Char = std::conditional_t<In::kUnicode, LXUChar, LXWChar>;
 
   const Folding& folding;
   In in;
@@ -76,11 +76,11 @@ struct FoldReader {
 };
 
 template <class In>
-bool exhausted(const FoldReader<In>& folded) {
+bool exhausted(const FoldCursor<In>& folded) {
   return !folded.has_second && !folded.has_ahead && exhausted(folded.in);
 }
 template <class In>
-void drop_rest(FoldReader<In>* folded) {
+void drop_rest(FoldCursor<In>* folded) {
   drop_rest(&folded->in);
 }
 
@@ -88,14 +88,14 @@ void drop_rest(FoldReader<In>* folded) {
 template <class In, class Body>
 auto read_folded(const Folding& folding, const In& in, Body&& body) {
   if (folding.fold == Fold::kNone) return body(in);
-  return body(FoldReader<In>{folding, in});
+  return body(FoldCursor<In>{folding, in});
 }
 
 /// A key: the levels of a text in their space, and how long it will be.
 class Key {
  public:
-  template <class Reader>
-  Key(const Sort& sort, const Reader& text, size_t most_chars, uint8_t* space)
+  template <class Cursor>
+  Key(const Sort& sort, const Cursor& text, size_t most_chars, uint8_t* space)
       : levels_(sort, text, most_chars, space) {
     trim(sort);
   }

@@ -60,13 +60,13 @@ struct Levels {
   static constexpr size_t bytes_for(size_t chars) { return specials_at(chars) + chars * sizeof(PlacedSpecial); }
   static constexpr size_t kMostChars = INT32_MAX / (2 * (kLevelBytes + sizeof(PlacedSpecial)));
 
-  template <class Reader>
-  Levels(const Sort& sort, const Reader& text, size_t most_chars, uint8_t* space)
+  template <class Cursor>
+  Levels(const Sort& sort, const Cursor& text, size_t most_chars, uint8_t* space)
       : primaries(space),
         secondaries(space + most_chars * kPrimaryBytes + 1),
         tertiaries(secondaries.begin + most_chars * kByteLevelBytes + 1),
         specials(space + specials_at(most_chars)) {
-    WeightSets<Reader> sets(sort, text);
+    WeightSets<Cursor> sets(sort, text);
     for (Element set; sets.next(&set);) place(set, sets.position());
     chars = sets.consumed();
     primaries.close_run();

@@ -2,9 +2,9 @@
 // their own.
 #include <cstring>
 
-#include "text/lxcursor.h"
 #include "collate/lxsort.h"
 #include "core/lxcall.h"
+#include "text/lxwalk.h"
 
 namespace {
 
@@ -37,9 +37,9 @@ struct Step {
 };
 
 /// Takes the next element of the text that `in` reads on.
-template <class Reader, class Unit>
-int32_t take(const lx::Sort& sort, const Reader& in, const Step<Unit>& step) {
-  lx::Elements<Reader, lx::LookAhead::kAlways> elements(sort, in, *step.counter, *step.look_ahead);
+template <class Cursor, class Unit>
+int32_t take(const lx::Sort& sort, const Cursor& in, const Step<Unit>& step) {
+  lx::Elements<Cursor, lx::LookAhead::kAlways> elements(sort, in, *step.counter, *step.look_ahead);
   const lx::Element element = elements.next();
   const bool cut = elements.position() == *step.counter;
   *step.remaining = 0;
@@ -70,7 +70,7 @@ int32_t next_weight_of_bytes(LXLocale* given, const Step<char>& step, Form form)
   return next_weight(given, step, [&](const Codepage& cp, auto body) {
     LXShiftState state = LX_SHIFT_SINGLE;
     if (step.state != nullptr) state = *step.state;
-    return lx::read_bytes(cp, form, state, bytes_of(*step.text), step.units(), body);
+    return lx::with_cursor(cp, form, state, bytes_of(*step.text), step.units(), body);
   });
 }
 
@@ -105,7 +105,7 @@ int32_t LXStrGetNextWeightW(LXLocale* locale, const LXWChar** text, int32_t* rem
                             LXWeights* first, LXWeights* second, uint8_t* char_class, LXUChar* look_ahead) {
   const Step<LXWChar> step{text, nullptr, remaining, counter, first, second, char_class, look_ahead};
   return next_weight(locale, step, [&](const Codepage& cp, auto body) {
-    return body(lx::CodeReader{cp, *text, *text + step.units()});
+    return body(lx::CodeCursor{cp, *text, *text + step.units()});
   });
 }
 
@@ -113,7 +113,7 @@ int32_t LXStrGetNextWeightU(LXLocale* locale, const LXUChar** text, int32_t* rem
                             LXWeights* first, LXWeights* second, uint8_t* char_class, LXUChar* look_ahead) {
   const Step<LXUChar> step{text, nullptr, remaining, counter, first, second, char_class, look_ahead};
   return next_weight(locale, step, [&](const Codepage&, auto body) {
-    return body(lx::UnicodeReader{*text, *text + step.units()});
+    return body(lx::UnicodeCursor{*text, *text + step.units()});
   });
 }
 

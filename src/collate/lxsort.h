@@ -116,16 +116,16 @@ inline int32_t weight_sets(const Sort& sort, const Element& element, LXWeights* 
 
 /// Whether a reader has come to the end of its text; a character that the end cuts is still before it, a shift
 /// byte that ends the text is not.
-template <class Reader>
-bool exhausted(const Reader& in) {
-  if constexpr (std::is_same_v<Reader, ShiftReader>)
+template <class Cursor>
+bool exhausted(const Cursor& in) {
+  if constexpr (Cursor::kShifts)
     if (in.end - in.p == 1) return in.cp.is_shift(*in.p);
   return in.p == in.end;
 }
 
 /// Forgets a character that the end cuts.
-template <class Reader>
-void drop_rest(Reader* in) {
+template <class Cursor>
+void drop_rest(Cursor* in) {
   in->p = in->end;
 }
 
@@ -136,16 +136,16 @@ inline constexpr LXUChar kNoAhead = LX_NO_LOOK_AHEAD;
 enum class LookAhead { kNeeded, kAlways };
 
 /// Walks a text element by element. Pairs are matched from the left, two characters at a time.
-template <class Reader, LookAhead kAhead = LookAhead::kNeeded>
+template <class Cursor, LookAhead kAhead = LookAhead::kNeeded>
 class Elements {
  public:
-  Elements(const Sort& sort, const Reader& in) : sort_(sort), in_(in) {}
+  Elements(const Sort& sort, const Cursor& in) : sort_(sort), in_(in) {}
   /// Goes on behind `consumed` characters and the one that was read ahead, if one was.
-  Elements(const Sort& sort, const Reader& in, size_t consumed, LXUChar ahead)
+  Elements(const Sort& sort, const Cursor& in, size_t consumed, LXUChar ahead)
       : sort_(sort), in_(in), consumed_(consumed), has_ahead_(ahead != kNoAhead), ahead_(ahead) {}
 
   bool at_end() const { return !has_ahead_ && exhausted(in_); }
-  const Reader& in() const { return in_; }
+  const Cursor& in() const { return in_; }
   LXUChar ahead() const { return has_ahead_ ? ahead_ : kNoAhead; }
 
   size_t consumed() const { return consumed_; }  // characters
@@ -163,7 +163,7 @@ class Elements {
     ++consumed_;
     const Element element = sort_.element(u);
     const bool looks = kAhead == LookAhead::kAlways ? sort_.pair_count != 0 : element.starts_pair();
-    const Reader before(in_);
+    const Cursor before(in_);
     if (!looks || !in_.next(&ahead_)) return element;
     Element pair;
     if (sort_.pair(u, ahead_, &pair)) {
@@ -181,17 +181,17 @@ class Elements {
 
  private:
   const Sort& sort_;
-  Reader in_;
+  Cursor in_;
   size_t consumed_ = 0;
   bool has_ahead_ = false;
   LXUChar ahead_ = 0;
 };
 
 /// Walks the weight sets of a text, those of an expansion one after the other: elements of one set each.
-template <class Reader>
+template <class Cursor>
 class WeightSets {
  public:
-  WeightSets(const Sort& sort, const Reader& in) : sort_(sort), elements_(sort, in) {}
+  WeightSets(const Sort& sort, const Cursor& in) : sort_(sort), elements_(sort, in) {}
 
   size_t consumed() const { return elements_.consumed(); }
   uint16_t position() const { return elements_.position(); }
@@ -215,7 +215,7 @@ class WeightSets {
 
  private:
   const Sort& sort_;
-  Elements<Reader> elements_;
+  Elements<Cursor> elements_;
   Element second_;
   bool pending_ = false;
 };

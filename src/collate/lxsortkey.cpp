@@ -54,8 +54,8 @@ int32_t key_of_nothing(const Output& output) {
 }
 
 /// Makes the key of a text of at most `most_chars` characters: its bytes, or -1 without memory.
-template <class Reader>
-int32_t make_key(const Sort& sort, const Reader& text, size_t most_chars, const Output& output) {
+template <class Cursor>
+int32_t make_key(const Sort& sort, const Cursor& text, size_t most_chars, const Output& output) {
   if (most_chars > Levels::kMostChars) return -1;
   const bool in_place = output.is_work_area(most_chars);
   const lx::WorkBuffer space(in_place ? 0 : Levels::bytes_for(most_chars));
@@ -86,8 +86,8 @@ int32_t copy_text(uint8_t* output, int32_t size, const Unit* text, size_t units)
 
 /// In binary order with options: each folded character while it fits. `store(u, p)` writes one and returns its
 /// bytes.
-template <class Reader, class Store>
-int32_t write_folded(Reader text, uint8_t* output, int32_t size, Store store) {
+template <class Cursor, class Store>
+int32_t write_folded(Cursor text, uint8_t* output, int32_t size, Store store) {
   size_t total = 0;
   for (LXUChar u = 0; text.next(&u);) {
     uint8_t character[sizeof(LXWChar)];
@@ -105,14 +105,14 @@ size_t store_unit(Unit value, uint8_t* p) {
 }
 
 /// How a form stores a folded character in binary order.
-template <class Reader>
-size_t store_character(const Codepage& cp, const Reader&, LXUChar u, uint8_t* p) {
+template <class Cursor>
+size_t store_character(const Codepage& cp, const Cursor&, LXUChar u, uint8_t* p) {
   return lx::store_unicode(cp, u, p);
 }
-size_t store_character(const Codepage& cp, const lx::CodeReader&, LXUChar u, uint8_t* p) {
+size_t store_character(const Codepage& cp, const lx::CodeCursor&, LXUChar u, uint8_t* p) {
   return store_unit(lx::unicode_to_code(cp, u), p);
 }
-size_t store_character(const Codepage&, const lx::UnicodeReader&, LXUChar u, uint8_t* p) {
+size_t store_character(const Codepage&, const lx::UnicodeCursor&, LXUChar u, uint8_t* p) {
   return store_unit(u, p);
 }
 
@@ -147,9 +147,11 @@ int32_t transform_bytes(LXLocale* locale, uint8_t* output, int32_t size, const c
                         int32_t length, uint32_t options, Form form) {
   return transform(
       locale, output, size, text, options,
-      [&](const Codepage& cp) { return lx::text_bytes(cp, text, state, length, options); },
+      [&](const Codepage& cp) {
+        return lx::units_of(cp, lx::ByteText{bytes_of(text), length, state}, (options & LX_CHARACTERS) != 0);
+      },
       [&](const Codepage& cp, size_t bytes, auto body) {
-        return lx::read_bytes(cp, form, state, bytes_of(text), bytes, body);
+        return lx::with_cursor(cp, form, state, bytes_of(text), bytes, body);
       });
 }
 
@@ -239,7 +241,7 @@ int32_t LXWcsxfrm(LXLocale* locale, uint8_t* output, int32_t size, const LXWChar
   return transform(
       locale, output, size, text, options, [&](const Codepage&) { return lx::text_units(text, length); },
       [&](const Codepage& cp, size_t codes, auto body) {
-        return body(lx::CodeReader{cp, text, text + codes});
+        return body(lx::CodeCursor{cp, text, text + codes});
       });
 }
 
@@ -248,7 +250,7 @@ int32_t LXStrxfrmU(LXLocale* locale, uint8_t* output, int32_t size, const LXUCha
   return transform(
       locale, output, size, text, options, [&](const Codepage&) { return lx::text_units(text, length); },
       [&](const Codepage&, size_t units, auto body) {
-        return body(lx::UnicodeReader{text, text + units});
+        return body(lx::UnicodeCursor{text, text + units});
       });
 }
 
@@ -258,7 +260,7 @@ int32_t LXStrGenSortKey(LXLocale* given, uint8_t* output, int32_t size, const LX
   const LXLocale& locale = *call.locale();
   if (locale.sort == nullptr || count < 0) return call.fail(LX_E_INVALID, -1);
   if (count == 0) return call.exit(key_of_nothing(Output(output, size)));
-  const lx::UnicodeReader reader{text, text + count};
+  const lx::UnicodeCursor reader{text, text + count};
   const int32_t bytes =
       make_key(lx::sort_of(*locale.sort), reader, static_cast<size_t>(count), Output(output, size));
   return bytes < 0 ? call.fail(LX_E_MEMORY, -1) : call.exit(bytes);

@@ -15,17 +15,16 @@ using lx::codepage_of;
 using lx::DecimalDigits;
 using lx::FixedChars;
 using lx::Form;
-using lx::NumberForm;
+using lx::FormUnit;
 using lx::NumberText;
-using lx::NumberUnit;
 using lx::TextKind;
 
 RAS1_Unit unit = RAS1_UNIT("lxnumber");
 
 /// Where a text goes. `state` is the one it begins in, for the Ex forms.
-template <NumberForm kForm>
+template <Form kForm>
 struct Output {
-  NumberUnit<kForm>* buffer;
+  FormUnit<kForm>* buffer;
   int32_t size;
   uint32_t flags;
   LXShiftState state = LX_SHIFT_SINGLE;
@@ -36,23 +35,23 @@ struct Output {
 };
 
 /// Writes single-unit characters: how many fit.
-template <class Writer>
-size_t put_units(Writer& out, const typename Writer::Unit* units, size_t count) {
-  const size_t n = lx::least(count, lx::room(out.p, out.end));
-  auto* const to = out.p;
-  for (size_t i = 0; i < n; ++i) to[i] = units[i];
-  out.p = to + n;
-  return n;
-}
-size_t put_units(lx::ClosedShiftWriter& out, const uint8_t* units, size_t count) {
+template <class Sink>
+size_t put_units(Sink& out, const typename Sink::Unit* units, size_t count) {
   size_t n = 0;
-  while (n < count && out.put(LXWChar{units[n]})) ++n;
+  if constexpr (Sink::kShifts) {
+    while (n < count && out.put(LXWChar{units[n]})) ++n;
+  } else {
+    n = lx::least(count, lx::room(out.p, out.end));
+    auto* const to = out.p;
+    for (size_t i = 0; i < n; ++i) to[i] = units[i];
+    out.p = to + n;
+  }
   return n;
 }
 
 /// False when the number did not fit.
-template <class Writer, class Unit>
-bool put_number(Writer& out, const NumberText<Unit>& number) {
+template <class Sink, class Unit>
+bool put_number(Sink& out, const NumberText<Unit>& number) {
   if (put_units(out, number.begin(), number.units()) < number.units()) return false;
   if (number.zeros() == 0) return true;
   constexpr size_t kRun = 16;
@@ -73,39 +72,33 @@ struct Written {
 
 /// Writes the text that `write(out)` makes into `room` units; it is false for a text that does not fit.
 /// `kDirect`: the text is single bytes, so that all kinds of bytes without shift states are the same.
-template <NumberForm kForm, bool kDirect, class Write>
-Written write_text(const Codepage& cp, NumberUnit<kForm>* p, size_t room, LXShiftState state, Write write) {
+template <Form kForm, bool kDirect, class Write>
+Written write_text(const Codepage& cp, FormUnit<kForm>* p, size_t room, LXShiftState state, Write write) {
   const auto run = [&](auto out) {
     const bool all = write(out);
     lx::close_text(out);
     return Written{static_cast<size_t>(out.p - p), all};
   };
-  NumberUnit<kForm>* const end = lx::end_of(p, room);
-  if constexpr (kForm == NumberForm::kUnicode) {
-    return run(lx::UnicodeWriter{p, end});
-  } else if constexpr (kForm == NumberForm::kCodes) {
-    return run(lx::CodeWriter{cp, p, end});
-  } else {
-    if (kForm == NumberForm::kEx && cp.shift_sensitive) return run(lx::ClosedShiftWriter{cp, p, end, state});
-    if constexpr (kDirect)
-      return run(lx::SingleByteWriter{cp, p, end});
-    else
-      return lx::write_bytes(cp, Form::kPlain, state, p, end, run);
-  }
+  FormUnit<kForm>* const end = lx::end_of(p, room);
+  using Unit = FormUnit<kForm>;
+  if constexpr (kDirect && sizeof(Unit) == 1)
+    if (kForm == Form::kPlain || !cp.shift_sensitive) return run(lx::SingleByteSink{cp, p, end});
+  return lx::with_kind<Unit, lx::ClosedShiftSink>(cp, kForm,
+                                                  [&](auto kind) { return run(kind.sink(cp, p, end, state)); });
 }
 
-template <NumberForm kForm>
+template <Form kForm>
 int32_t finish(Call& call, const Output<kForm>& to, size_t units, size_t count, bool all) {
   if (to.nulls() != 0) to.buffer[units] = 0;
   return call.fail(all ? LX_OK : LX_E_SIZE, static_cast<int32_t>(count + to.nulls()));
 }
 
 /// Copies a number, whose units are characters, to a buffer of at least one unit.
-template <NumberForm kForm>
-int32_t write_number(Call& call, const Output<kForm>& to, const NumberText<NumberUnit<kForm>>& number) {
+template <Form kForm>
+int32_t write_number(Call& call, const Output<kForm>& to, const NumberText<FormUnit<kForm>>& number) {
   const Codepage& cp = codepage_of(call.codepage());
   const size_t most = static_cast<size_t>(to.size) - to.nulls();
-  const bool shifts = kForm == NumberForm::kEx && cp.shift_sensitive && to.state == LX_SHIFT_DOUBLE;
+  const bool shifts = kForm == Form::kEx && cp.shift_sensitive && to.state == LX_SHIFT_DOUBLE;
   const size_t shift_bytes = shifts && to.by_chars() && most != 0 ? 1 : 0;  // a Shift-In, which does not count
   const Written written = write_text<kForm, true>(cp, to.buffer, most + shift_bytes, to.state,
                                                   [&](auto& out) { return put_number(out, number); });
@@ -113,7 +106,7 @@ int32_t write_number(Call& call, const Output<kForm>& to, const NumberText<Numbe
 }
 
 /// The frame of a writing function: `make(call)` is run when there is a buffer to write to.
-template <NumberForm kForm, class Make>
+template <Form kForm, class Make>
 int32_t format(LXLocale* given, const Output<kForm>& to, uint32_t allowed_flags, Make make) {
   Call call(unit, given);
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
@@ -123,13 +116,13 @@ int32_t format(LXLocale* given, const Output<kForm>& to, uint32_t allowed_flags,
   return make(call, *call.locale());
 }
 
-template <NumberForm kForm>
+template <Form kForm>
 int32_t long_to_text(LXLocale* given, int32_t value, const Output<kForm>& to) {
   return format(given, to, LX_UNSIGNED, [&](Call& call, const LXLocale& locale) {
     const bool negative = value < 0 && (to.flags & LX_UNSIGNED) == 0;
     DecimalDigits digits;
     lx::integer_digits(negative ? 0u - static_cast<uint32_t>(value) : static_cast<uint32_t>(value), &digits);
-    NumberText<NumberUnit<kForm>> number(lx::fixed_chars<kForm>(locale));
+    NumberText<FormUnit<kForm>> number(lx::fixed_chars<kForm>(locale));
     number.put_integer(digits, lx::separator_of<kForm>(locale, to.current(), lx::kThousands),
                        lx::GroupSizes<kForm>(locale, to.current(), lx::kGrouping));
     if (negative) number.put_minus();
@@ -150,8 +143,8 @@ constexpr DoubleItems kInternationalItems{lx::kMonetaryDecimal, lx::kMonetaryTho
                                           lx::kInternationalDigits};
 
 /// The number without its sign.
-template <NumberForm kForm>
-void put_magnitude(NumberText<NumberUnit<kForm>>* number, double value, const LXLocale& locale, bool current,
+template <Form kForm>
+void put_magnitude(NumberText<FormUnit<kForm>>* number, double value, const LXLocale& locale, bool current,
                    const DoubleItems& items) {
   DecimalDigits digits;
   lx::double_digits(value < 0 ? -value : value == 0 ? 0.0 : value, &digits);
@@ -159,7 +152,7 @@ void put_magnitude(NumberText<NumberUnit<kForm>>* number, double value, const LX
     const Codepage& cp = codepage_of(*locale.codepage);
     number->put_word(digits, [&](char c) {
       const LXUChar u = static_cast<LXUChar>(c);
-      return static_cast<NumberUnit<kForm>>(kForm == NumberForm::kUnicode ? u : lx::unicode_to_code(cp, u));
+      return static_cast<FormUnit<kForm>>(kForm == Form::kUnicode ? u : lx::unicode_to_code(cp, u));
     });
     return;
   }
@@ -172,10 +165,10 @@ void put_magnitude(NumberText<NumberUnit<kForm>>* number, double value, const LX
                        fraction_digits);
 }
 
-template <NumberForm kForm>
+template <Form kForm>
 int32_t double_to_text(LXLocale* given, double value, const Output<kForm>& to) {
   return format(given, to, 0, [&](Call& call, const LXLocale& locale) {
-    NumberText<NumberUnit<kForm>> number(lx::fixed_chars<kForm>(locale));
+    NumberText<FormUnit<kForm>> number(lx::fixed_chars<kForm>(locale));
     put_magnitude<kForm>(&number, value, locale, to.current(), kPlainItems);
     if (value < 0) number.put_minus();
     return write_number(call, to, number);
@@ -212,8 +205,8 @@ Placement placement_of(const LXLocale& locale, bool current, bool negative, bool
           negative ? LX_ITEM_NEGATIVE_SIGN : LX_ITEM_POSITIVE_SIGN, (own & 2) != 0};
 }
 
-template <class Value, class Writer, class Reader>
-bool put_all(Writer& out, Reader in) {
+template <class Value, class Sink, class Cursor>
+bool put_all(Sink& out, Cursor in) {
   Value value{};
   while (in.next(&value))
     if (!out.put(value)) return false;
@@ -221,25 +214,25 @@ bool put_all(Writer& out, Reader in) {
 }
 
 /// Writes the text of an item.
-template <NumberForm kForm, class Writer>
-bool put_item(Writer& out, const LXLocale& locale, int32_t item, bool current) {
+template <Form kForm, class Sink>
+bool put_item(Sink& out, const LXLocale& locale, int32_t item, bool current) {
   TextKind kind{};
-  if constexpr (kForm == NumberForm::kUnicode) {
+  if constexpr (kForm == Form::kUnicode) {
     const void* text = LXLocaleGetTextItemU(&locale, item, current, &kind);
-    return put_all<LXUChar>(out, lx::PayloadReader{static_cast<const uint8_t*>(text), nullptr});
+    return put_all<LXUChar>(out, lx::PayloadCursor{static_cast<const uint8_t*>(text), nullptr});
   } else {
     const auto* text = static_cast<const uint8_t*>(LXLocaleGetTextItem(&locale, item, current, &kind));
-    if (kind == TextKind::kUnicode) return put_all<LXUChar>(out, lx::PayloadReader{text, nullptr});
-    return lx::read_bytes(codepage_of(*locale.codepage), lx::kTextForm<kForm>, LX_SHIFT_SINGLE, text,
-                          strlen(reinterpret_cast<const char*>(text)),
-                          [&](auto in) { return put_all<LXWChar>(out, in); });
+    if (kind == TextKind::kUnicode) return put_all<LXUChar>(out, lx::PayloadCursor{text, nullptr});
+    return lx::with_cursor(codepage_of(*locale.codepage), lx::kTextForm<kForm>, LX_SHIFT_SINGLE, text,
+                           strlen(reinterpret_cast<const char*>(text)),
+                           [&](auto in) { return put_all<LXWChar>(out, in); });
   }
 }
 
-template <NumberForm kForm, class Writer>
-bool put_pieces(Writer& out, const char* pieces, const LXLocale& locale, bool current,
+template <Form kForm, class Sink>
+bool put_pieces(Sink& out, const char* pieces, const LXLocale& locale, bool current,
                 const Placement& placement) {
-  using Char = std::conditional_t<kForm == NumberForm::kUnicode, LXUChar, LXWChar>;
+  using Char = std::conditional_t<kForm == Form::kUnicode, LXUChar, LXWChar>;
   const FixedChars& chars = lx::fixed_chars<kForm>(locale);
   for (; *pieces != '\0'; ++pieces) {
     bool put = true;
@@ -258,32 +251,16 @@ bool put_pieces(Writer& out, const char* pieces, const LXLocale& locale, bool cu
   return true;
 }
 
-/// The bytes of at most `*chars` characters of a text, with the Shift-In that is due behind them; `*chars`
-/// receives how many there are.
-size_t cut_to_chars(const Codepage& cp, Form form, LXShiftState state, uint8_t* text, size_t bytes,
-                    size_t* chars) {
-  return lx::read_bytes(cp, form, state, text, bytes, [&](auto in) {
-    size_t n = 0;
-    LXWChar code = 0;
-    while (n < *chars && in.next(&code)) ++n;
-    *chars = n;
-    size_t kept = static_cast<size_t>(in.p - text);
-    if constexpr (std::is_same_v<decltype(in), lx::ShiftReader>)
-      if (n != 0 && in.state == LX_SHIFT_DOUBLE && kept < bytes) text[kept++] = cp.shift_in;
-    return kept;
-  });
-}
-
-template <NumberForm kForm>
+template <Form kForm>
 int32_t currency_to_text(LXLocale* given, double value, const Output<kForm>& to) {
   return format(given, to, LX_INTERNATIONAL, [&](Call& call, const LXLocale& locale) {
     const Codepage& cp = codepage_of(*locale.codepage);
     const bool current = to.current();
     const bool international = (to.flags & LX_INTERNATIONAL) != 0;
     const Placement placement = placement_of(locale, current, !(value >= 0), international);
-    NumberText<NumberUnit<kForm>> number(lx::fixed_chars<kForm>(locale));
+    NumberText<FormUnit<kForm>> number(lx::fixed_chars<kForm>(locale));
     put_magnitude<kForm>(&number, value, locale, current, international ? kInternationalItems : kLocalItems);
-    const auto write = [&](NumberUnit<kForm>* p, size_t room) {
+    const auto write = [&](FormUnit<kForm>* p, size_t room) {
       return write_text<kForm, false>(cp, p, room, to.state, [&](auto& out) {
         return put_pieces<kForm>(out, placement.layout.before, locale, current, placement) &&
                put_number(out, number) &&
@@ -291,17 +268,16 @@ int32_t currency_to_text(LXLocale* given, double value, const Output<kForm>& to)
       });
     };
     const size_t size = static_cast<size_t>(to.size);
-    if constexpr (sizeof(NumberUnit<kForm>) == 1) {
+    if constexpr (sizeof(FormUnit<kForm>) == 1) {
       if (to.by_chars()) {
         constexpr size_t kWorkBytes = 512;
         constexpr size_t kWorkBytesPerChar = 6;
         uint8_t work[kWorkBytes] = {};
         const size_t work_bytes = size < kWorkBytes / kWorkBytesPerChar ? size * kWorkBytesPerChar : kWorkBytes;
         const Written written = write(work, work_bytes - to.nulls());
-        size_t chars = size - to.nulls();
-        const size_t bytes = cut_to_chars(cp, lx::kTextForm<kForm>, to.state, work, written.units, &chars);
-        memcpy(to.buffer, work, bytes);
-        return finish(call, to, bytes, chars, written.all);
+        const lx::Part copied =
+            lx::copy_chars(cp, kForm, to.state, work, written.units, size - to.nulls(), to.buffer);
+        return finish(call, to, copied.units, copied.chars, written.all);
       }
     }
     const Written written = write(to.buffer, size - to.nulls());
@@ -309,12 +285,12 @@ int32_t currency_to_text(LXLocale* given, double value, const Output<kForm>& to)
   });
 }
 
-template <NumberForm kForm, class Text>
+template <Form kForm, class Text>
 int32_t first_group_size(LXLocale* given, const Text* text, int32_t* remaining, const Text** next) {
   Call call(unit, given);
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
   if (text == nullptr) return call.exit(-1);
-  using Unit = NumberUnit<kForm>;
+  using Unit = FormUnit<kForm>;
   const FixedChars& chars = lx::fixed_chars<kForm>(*call.locale());
   const auto unit_at = [&](int32_t i) { return static_cast<Unit>(text[i]); };
   int32_t units = 0;
@@ -326,10 +302,10 @@ int32_t first_group_size(LXLocale* given, const Text* text, int32_t* remaining, 
   return call.exit(size);
 }
 
-using PlainOutput = Output<NumberForm::kPlain>;
-using ExOutput = Output<NumberForm::kEx>;
-using CodeOutput = Output<NumberForm::kCodes>;
-using UnicodeOutput = Output<NumberForm::kUnicode>;
+using PlainOutput = Output<Form::kPlain>;
+using ExOutput = Output<Form::kEx>;
+using CodeOutput = Output<Form::kWide>;
+using UnicodeOutput = Output<Form::kUnicode>;
 
 }  // namespace
 
@@ -387,15 +363,15 @@ int32_t LXCurrencyToStringU(LXLocale* locale, double value, LXUChar* buffer, int
 }
 
 int32_t LXStrGroupingSize(LXLocale* locale, const char* text, int32_t* remaining, const char** next) {
-  return first_group_size<NumberForm::kPlain>(locale, text, remaining, next);
+  return first_group_size<Form::kPlain>(locale, text, remaining, next);
 }
 
 int32_t LXStrGroupingSizeW(LXLocale* locale, const LXWChar* text, int32_t* remaining, const LXWChar** next) {
-  return first_group_size<NumberForm::kCodes>(locale, text, remaining, next);
+  return first_group_size<Form::kWide>(locale, text, remaining, next);
 }
 
 int32_t LXStrGroupingSizeU(LXLocale* locale, const LXUChar* text, int32_t* remaining, const LXUChar** next) {
-  return first_group_size<NumberForm::kUnicode>(locale, text, remaining, next);
+  return first_group_size<Form::kUnicode>(locale, text, remaining, next);
 }
 
 }  // extern "C"

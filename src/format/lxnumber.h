@@ -1,5 +1,5 @@
-// What the writing and the reading of numbers share: the forms of a function, the fixed characters of the two
-// families of codepages, the conventions of a locale as a form sees them, and grouping texts.
+// What the writing and the reading of numbers share: the fixed characters of the two families of codepages, the
+// conventions of a locale as a form sees them, and grouping texts.
 #pragma once
 
 #include "codepage/lxtext.h"
@@ -7,16 +7,9 @@
 
 namespace lx {
 
-/// The four forms of a function.
-enum class NumberForm { kPlain, kEx, kCodes, kUnicode };
-
-template <NumberForm kForm>
-using NumberUnit = std::conditional_t<kForm == NumberForm::kCodes, LXWChar,
-                                      std::conditional_t<kForm == NumberForm::kUnicode, LXUChar, uint8_t>>;
-
 /// How a form walks text of the codepage. Packed codes come from text with its shift bytes.
-template <NumberForm kForm>
-inline constexpr Form kTextForm = kForm == NumberForm::kPlain ? Form::kPlain : Form::kEx;
+template <Form kForm>
+inline constexpr Form kTextForm = kForm == Form::kPlain ? Form::kPlain : Form::kEx;
 
 /// The characters that the functions themselves write and know.
 struct FixedChars {
@@ -25,9 +18,9 @@ struct FixedChars {
 inline constexpr FixedChars kAsciiChars{0x30, 0x2B, 0x2D, 0x28, 0x29, 0x20, 0x3B};
 inline constexpr FixedChars kEbcdicChars{0xF0, 0x4E, 0x60, 0x4D, 0x5D, 0x40, 0x5E};
 
-template <NumberForm kForm>
+template <Form kForm>
 const FixedChars& fixed_chars(const LXLocale& locale) {
-  return kForm == NumberForm::kUnicode || keeps_ascii(locale) ? kAsciiChars : kEbcdicChars;
+  return kForm == Form::kUnicode || keeps_ascii(locale) ? kAsciiChars : kEbcdicChars;
 }
 
 inline constexpr int32_t kNoClass = -1;  // of a character in a number
@@ -64,10 +57,10 @@ enum NumberGrouping : size_t { kGrouping = 0, kMonetaryGrouping = 2 };
 enum NumberDigits : size_t { kDigits = 0, kCurrencyDigits = 1, kInternationalDigits = 2 };
 
 /// A separator; 0 for none, which in bytes is also one that does not take a single byte.
-template <NumberForm kForm>
-NumberUnit<kForm> separator_of(const LXLocale& locale, bool current, NumberSeparator index) {
+template <Form kForm>
+FormUnit<kForm> separator_of(const LXLocale& locale, bool current, NumberSeparator index) {
   const size_t word = format::territory::kSeparators + index;
-  if constexpr (kForm == NumberForm::kUnicode) {
+  if constexpr (kForm == Form::kUnicode) {
     return current ? locale.separators_unicode[index] : payload_word(*locale.territory, word);
   } else {
     const Codepage& cp = codepage_of(*locale.codepage);
@@ -78,7 +71,7 @@ NumberUnit<kForm> separator_of(const LXLocale& locale, bool current, NumberSepar
     }
     const LXUChar u = payload_word(*locale.territory, word);
     const uint32_t code = u != 0 ? unicode_to_code(cp, u) : 0;
-    return static_cast<NumberUnit<kForm>>(kForm == NumberForm::kCodes || code <= 0xFF ? code : 0);
+    return static_cast<FormUnit<kForm>>(kForm == Form::kWide || code <= 0xFF ? code : 0);
   }
 }
 
@@ -102,7 +95,7 @@ int32_t group_size(At unit_at, int32_t remaining, const FixedChars& chars, int32
 }
 
 /// The group sizes of a locale's grouping text, from the decimal point leftward.
-template <NumberForm kForm>
+template <Form kForm>
 class GroupSizes {
  public:
   GroupSizes(const LXLocale& locale, bool current, NumberGrouping index)
@@ -112,7 +105,7 @@ class GroupSizes {
         unicode_(nullptr) {
     if (!current)
       unicode_ = payload_text(*locale.territory, kTextWords[index]);
-    else if (kForm == NumberForm::kUnicode)
+    else if (kForm == Form::kUnicode)
       unicode_ = reinterpret_cast<const uint8_t*>(locale.texts_unicode[index]);
   }
 
@@ -137,7 +130,7 @@ class GroupSizes {
   uint32_t unit_at(size_t i) const {
     if (unicode_ == nullptr) return text_[i];
     const LXUChar u = le16(unicode_ + 2 * i);
-    return kForm == NumberForm::kUnicode || u == 0 ? u : unicode_to_code(cp_, u);
+    return kForm == Form::kUnicode || u == 0 ? u : unicode_to_code(cp_, u);
   }
 
   const Codepage& cp_;

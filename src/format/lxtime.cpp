@@ -37,24 +37,24 @@ template <class Text>
 class TimeFormatter {
   using Unit = typename Text::Unit;
   using Value = typename Text::Value;
-  using Reader = typename Text::Reader;
-  using Writer = typename Text::Writer;
+  using Cursor = typename Text::Cursor;
+  using Sink = typename Text::Sink;
 
  public:
   TimeFormatter(const LXLocale& locale, const LXTime& time, bool current)
       : locale_(locale), time_(time), symbols_(lx::time_symbols<Text>(locale)), current_(current) {}
 
   /// Writes as much as there is before a failure: the code.
-  int32_t expand(Reader format, Writer* out, int depth = 0) const {
+  int32_t expand(Cursor format, Sink* out, int depth = 0) const {
     const int32_t code = walk(format, out, depth);
     lx::close_text(*out);
     return code;
   }
 
  private:
-  int32_t walk(Reader format, Writer* out, int depth) const {
-    const Writer start = *out;
-    Writer to = *out;  // a copy, as is what other functions move: this one stays in registers
+  int32_t walk(Cursor format, Sink* out, int depth) const {
+    const Sink start = *out;
+    Sink to = *out;  // a copy, as is what other functions move: this one stays in registers
     Value value{};
     int32_t code = LX_OK;
     while (code == LX_OK && format.p != format.end) {
@@ -75,7 +75,7 @@ class TimeFormatter {
         } else if (directive.action == TimeAction::kPercent) {
           to.put(value);
         } else {
-          Writer moved = to;
+          Sink moved = to;
           code = write_nested(directive, flag, start, &moved, depth);
           lx::go_on_at(to, moved);
         }
@@ -85,7 +85,7 @@ class TimeFormatter {
     return code;
   }
 
-  int32_t write_field(const TimeDirective& directive, bool flag, Writer* out) const {
+  int32_t write_field(const TimeDirective& directive, bool flag, Sink* out) const {
     if (!directive.field.in_range(time_)) return LX_E_NOT_FOUND;
     const int32_t value = time_.*directive.field.member;
     if (directive.items != 0)
@@ -103,7 +103,7 @@ class TimeFormatter {
 
   /// Callers rely on where nested formats go: the date of %c, and %x and %X, to the start of the buffer, and
   /// only the time of %c behind what is there.
-  int32_t write_nested(const TimeDirective& directive, bool flag, const Writer& start, Writer* out,
+  int32_t write_nested(const TimeDirective& directive, bool flag, const Sink& start, Sink* out,
                        int depth) const {
     const int32_t date = flag ? LX_ITEM_LONG_DATE_FORMAT : LX_ITEM_SHORT_DATE_FORMAT;
     switch (directive.action) {
@@ -123,23 +123,23 @@ class TimeFormatter {
   }
 
   /// Expands a format of the locale at `place`, in as many units as `out` has left, and moves `out` on.
-  int32_t expand_item(int32_t item, const Writer& place, Writer* out, int depth) const {
+  int32_t expand_item(int32_t item, const Sink& place, Sink* out, int depth) const {
     if (lx::units_left(*out) == 0) return LX_E_SIZE;
     if (depth == lx::kMostNestedFormats) return LX_E_FORMAT;
     const lx::TimeItem<Text> format(locale_, item, current_);
-    Writer nested = place;
+    Sink nested = place;
     nested.end = nested.p + lx::room(out->p, out->end);
     const Unit* const begin = nested.p;
-    const int32_t code = expand(format.reader(locale_), &nested, depth + 1);
+    const int32_t code = expand(format.cursor(locale_), &nested, depth + 1);
     nested.p = out->p + (nested.p - begin);
     lx::go_on_at(*out, nested);
     return code;
   }
 
-  int32_t write_item(int32_t item, Writer* out) const {
-    Writer word = *out;
+  int32_t write_item(int32_t item, Sink* out) const {
+    Sink word = *out;
     int32_t code = LX_OK;
-    if (!Text::kShift && lx::units_left(word) >= lx::kItemUnits) {
+    if (!Cursor::kShifts && lx::units_left(word) >= lx::kItemUnits) {
       word.end = word.p + lx::kItemUnits;
       lx::write_time_unicode(lx::time_name(locale_, item), &word);
     } else {
@@ -148,9 +148,9 @@ class TimeFormatter {
     lx::go_on_at(*out, word);
     return code;
   }
-  int32_t write_item_cut(int32_t item, Writer* out) const {
+  int32_t write_item_cut(int32_t item, Sink* out) const {
     const lx::TimeItem<Text> text(locale_, item, current_);
-    Reader in = text.reader(locale_);
+    Cursor in = text.cursor(locale_);
     const Unit* before = in.p;
     for (Value value{}; in.next(&value); before = in.p)
       if (!lx::copy_char<Text>(in, before, value, out)) return LX_E_SIZE;
@@ -159,7 +159,7 @@ class TimeFormatter {
 
   /// The last `most_digits` digits; `bare`: without leading zeros. A number that fills the output is 40, also
   /// when all of it is there.
-  int32_t write_number(uint32_t number, uint32_t most_digits, bool bare, Writer* out) const {
+  int32_t write_number(uint32_t number, uint32_t most_digits, bool bare, Sink* out) const {
     uint32_t count = most_digits;
     if (bare) {
       count = 1;
@@ -167,7 +167,7 @@ class TimeFormatter {
     }
     // In place where there is room; copying single units that have just been stored would stall.
     Unit cut[kMostDigits];
-    const bool fits = !Text::kShift && lx::units_left(*out) > kMostDigits;
+    const bool fits = !Cursor::kShifts && lx::units_left(*out) > kMostDigits;
     Unit* const digits = fits ? out->p : cut;
     for (uint32_t i = count; i-- > 0; number /= 10) digits[i] = static_cast<Unit>(symbols_.zero + number % 10);
     if (fits) {
@@ -193,31 +193,14 @@ int32_t refusal(uint32_t flags, int32_t size) {
 /// Writes to `units` units and a null where one is asked for: the units written without the null.
 template <class Text>
 size_t format_time(const LXLocale& locale, const LXTime& time, typename Text::Unit* buffer, size_t units,
-                   typename Text::Reader format, LXShiftState state, uint32_t flags, int32_t* code) {
+                   typename Text::Cursor format, LXShiftState state, uint32_t flags, int32_t* code) {
   const Codepage& cp = codepage_of(*locale.codepage);
   const bool null = (flags & LX_TERMINATE) != 0;
-  auto out = Text::write(cp, buffer, units - null, state);
+  auto out = Text::sink(cp, buffer, lx::end_of(buffer, units - null), state);
   if (format.p != format.end)
     *code = TimeFormatter<Text>(locale, time, (flags & LX_TERRITORY_VALUES) == 0).expand(format, &out);
   if (null) *out.p = 0;
   return static_cast<size_t>(out.p - buffer);
-}
-
-/// Copies at most `chars` whole characters of the work buffer out, the null one of them: how many they are.
-template <class Text>
-size_t cut_to_chars(const Codepage& cp, const uint8_t* work, size_t bytes, LXShiftState state, uint8_t* buffer,
-                    size_t chars, bool null) {
-  auto in = Text::read(cp, work, bytes, state);
-  size_t count = 0;
-  typename Text::Value value{};
-  while (count < chars - null && in.next(&value)) ++count;
-  size_t copied = static_cast<size_t>(in.p - work);
-  memcpy(buffer, work, copied);
-  if constexpr (Text::kShift) {
-    if (in.state == LX_SHIFT_DOUBLE && copied != 0) buffer[copied++] = cp.shift_in;
-  }
-  if (null) buffer[copied] = 0;
-  return count + null;
 }
 
 template <class Text>
@@ -230,7 +213,7 @@ int32_t format_units(LXLocale* given, const LXTime* time, typename Text::Unit* b
   const Codepage& cp = codepage_of(call.codepage());
   const size_t units = lx::text_units(format, format_length);
   const size_t written = format_time<Text>(*call.locale(), *time, buffer, static_cast<size_t>(size),
-                                           Text::read(cp, format, units), LX_SHIFT_SINGLE, flags, &code);
+                                           Text::cursor(cp, format, units), LX_SHIFT_SINGLE, flags, &code);
   return call.fail(code, static_cast<int32_t>(written + ((flags & LX_TERMINATE) != 0)));
 }
 
@@ -246,10 +229,9 @@ int32_t format_bytes(LXLocale* given, const LXTime* time, char* buffer, LXShiftS
   const bool characters = (flags & LX_CHARACTERS) != 0;
   const bool null = (flags & LX_TERMINATE) != 0;
   const size_t most = static_cast<size_t>(size);
-  const size_t written = lx::with_time_bytes(cp, form, [&](auto text) {
+  const size_t written = lx::with_kind<uint8_t, lx::ClosedShiftSink>(cp, form, [&](auto text) {
     using Text = decltype(text);
-    const size_t bytes = lx::given_bytes<Text>(cp, bytes_of(format), format_state, format_length, characters);
-    const auto in = Text::read(cp, bytes_of(format), bytes, format_state);
+    const auto in = lx::given_text<Text>(cp, format, format_state, format_length, characters);
     uint8_t work[kWorkBytes];
     // Cleared, since nested formats may leave places unwritten.
     if (characters) memset(work, 0, sizeof(work));
@@ -258,7 +240,9 @@ int32_t format_bytes(LXLocale* given, const LXTime* time, char* buffer, LXShiftS
     const size_t filled =
         format_time<Text>(locale, *time, characters ? work : bytes_of(buffer), room, in, state, flags, &code);
     if (!characters) return null + filled;
-    return cut_to_chars<Text>(cp, work, filled, state, bytes_of(buffer), most, null);
+    const lx::Part copied = lx::copy_chars(cp, form, state, work, filled, most - null, bytes_of(buffer));
+    if (null) buffer[copied.units] = 0;
+    return copied.chars + null;
   });
   return call.fail(code, static_cast<int32_t>(written));
 }
@@ -275,12 +259,12 @@ int32_t LXTimeToString(LXLocale* locale, const LXTime* time, char* buffer, int32
 
 int32_t LXTimeToStringW(LXLocale* locale, const LXTime* time, LXWChar* buffer, int32_t size,
                         const LXWChar* format, int32_t format_length, uint32_t flags) {
-  return format_units<lx::CodeTime>(locale, time, buffer, size, format, format_length, flags);
+  return format_units<lx::WideKind>(locale, time, buffer, size, format, format_length, flags);
 }
 
 int32_t LXTimeToStringU(LXLocale* locale, const LXTime* time, LXUChar* buffer, int32_t size,
                         const LXUChar* format, int32_t format_length, uint32_t flags) {
-  return format_units<lx::UnicodeTime>(locale, time, buffer, size, format, format_length, flags);
+  return format_units<lx::UnicodeKind>(locale, time, buffer, size, format, format_length, flags);
 }
 
 int32_t LXTimeToStringEx(LXLocale* locale, const LXTime* time, char* buffer, LXShiftState state, int32_t size,

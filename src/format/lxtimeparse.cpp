@@ -24,22 +24,21 @@ enum class Match { kSame, kDifferent, kCut };
 /// Compares the character that `format` has just read with the text and moves over it. kCut: the text ends
 /// before it does.
 template <class Text>
-Match match_char(const typename Text::Reader& format, const typename Text::Unit* before,
-                 typename Text::Value value, typename Text::Reader* text) {
-  if constexpr (Text::Reader::kOneUnit) {
+Match match_char(const typename Text::Cursor& format, const typename Text::Unit* before,
+                 typename Text::Value value, typename Text::Cursor* text) {
+  using Cursor = typename Text::Cursor;
+  if constexpr (Cursor::kOneUnit) {
     typename Text::Value other{};
     return text->next(&other) && other == value ? Match::kSame : Match::kDifferent;
   } else {
-    auto at = *text;
-    size_t count = static_cast<size_t>(format.p - before);
-    if constexpr (Text::kShift) {
+    Cursor at = *text;
+    size_t count = lx::room(before, format.p);
+    if constexpr (Cursor::kShifts) {
       count = format.cp.width_in(format.state);
-      if (at.p != at.end) lx::take_shift(at.cp, &at.p, &at.state);
+      at.pass_shift();
     }
     if (count > lx::room(at.p, at.end)) return Match::kCut;
-    if constexpr (Text::kShift) {
-      if (at.state != format.state) return Match::kDifferent;
-    }
+    if (lx::state_at(at, LX_SHIFT_SINGLE) != lx::state_at(format, LX_SHIFT_SINGLE)) return Match::kDifferent;
     // A single byte apart: not worth a call.
     if (count == 1 ? *at.p != format.p[-1] : memcmp(at.p, format.p - count, count) != 0)
       return Match::kDifferent;
@@ -53,17 +52,17 @@ template <class Text>
 class TimeParser {
   using Unit = typename Text::Unit;
   using Value = typename Text::Value;
-  using Reader = typename Text::Reader;
+  using Cursor = typename Text::Cursor;
 
  public:
   TimeParser(const LXLocale& locale, LXTime* time, bool current)
       : locale_(locale), time_(*time), symbols_(lx::time_symbols<Text>(locale)), current_(current) {}
 
   /// The code; the text stands behind what was read.
-  int32_t match(Reader format, Reader* text, int depth = 0) {
+  int32_t match(Cursor format, Cursor* text, int depth = 0) {
     bool afternoon = false;
     Value value{};
-    Reader at = *text;  // a copy, as is what other functions move: this one stays in registers
+    Cursor at = *text;  // a copy, as is what other functions move: this one stays in registers
     const TimeSymbols& symbols = symbols_;
     int32_t code = LX_OK;
     while (code == LX_OK && has_more(format) && has_more(at)) {
@@ -80,7 +79,7 @@ class TimeParser {
       if (directive.digits != 0) {
         code = read_number(directive, symbols.zero, &at);
       } else {
-        Reader moved = at;
+        Cursor moved = at;
         code = directive.field.member != nullptr ? read_name(directive, &moved, &afternoon)
                                                  : read_nested(directive, flag, value, &moved, depth);
         lx::go_on_at(at, moved);
@@ -89,15 +88,14 @@ class TimeParser {
     lx::go_on_at(*text, at);
     if (code != LX_OK) return code;
     if (afternoon && time_.hours <= 11) time_.hours += 12;
-    if constexpr (Text::kShift) {
+    if constexpr (Cursor::kShifts)
       if (text->state == LX_SHIFT_DOUBLE && text->p != text->end && *text->p == text->cp.shift_in)
-        lx::take_shift(text->cp, &text->p, &text->state);
-    }
+        text->pass_shift();
     return LX_OK;
   }
 
  private:
-  [[gnu::noinline]] int32_t read_name(const TimeDirective& directive, Reader* text, bool* afternoon) {
+  [[gnu::noinline]] int32_t read_name(const TimeDirective& directive, Cursor* text, bool* afternoon) {
     int32_t index = 0;
     if (!read_word(directive, text, &index)) return LX_E_NOT_FOUND;
     if (directive.action == TimeAction::kMarker)
@@ -108,11 +106,11 @@ class TimeParser {
   }
 
   /// A number is stored also when it is too large.
-  int32_t read_number(const TimeDirective& directive, uint32_t zero, Reader* text) {
+  int32_t read_number(const TimeDirective& directive, uint32_t zero, Cursor* text) {
     if (directive.action == TimeAction::kWeek) return LX_E_FORMAT;
     int32_t number = 0;
     int digits = 0;
-    Reader at = *text;
+    Cursor at = *text;
     Value value{};
     for (; digits < directive.digits && at.next(&value) && lx::read_single(at); ++digits) {
       const uint32_t digit = uint32_t{value} - zero;
@@ -126,7 +124,7 @@ class TimeParser {
     return number > directive.read_most ? LX_E_NOT_FOUND : LX_OK;
   }
 
-  [[gnu::noinline]] int32_t read_nested(const TimeDirective& directive, bool flag, Value percent, Reader* text,
+  [[gnu::noinline]] int32_t read_nested(const TimeDirective& directive, bool flag, Value percent, Cursor* text,
                                         int depth) {
     const int32_t date = flag ? LX_ITEM_LONG_DATE_FORMAT : LX_ITEM_SHORT_DATE_FORMAT;
     Value value{};
@@ -148,19 +146,19 @@ class TimeParser {
     }
   }
 
-  int32_t match_item(int32_t item, Reader* text, int depth) {
+  int32_t match_item(int32_t item, Cursor* text, int depth) {
     if (!has_more(*text)) return LX_OK;
     if (depth == lx::kMostNestedFormats) return LX_E_FORMAT;
     const lx::TimeItem<Text> format(locale_, item, current_);
-    return match(format.reader(locale_), text, depth + 1);
+    return match(format.cursor(locale_), text, depth + 1);
   }
 
   /// Reads the longest of the directive's items that the text has, of equal ones the first.
-  bool read_word(const TimeDirective& directive, Reader* text, int32_t* index) {
-    Reader longest = *text;
+  bool read_word(const TimeDirective& directive, Cursor* text, int32_t* index) {
+    Cursor longest = *text;
     for (int32_t i = 0; i < directive.items; ++i) {
       const lx::TimeItem<Text> item(locale_, directive.first_item + i, current_);
-      Reader at = *text;
+      Cursor at = *text;
       if (!passes(item, &at) || at.p <= longest.p) continue;
       lx::go_on_at(longest, at);
       *index = i;
@@ -171,13 +169,13 @@ class TimeParser {
   }
 
   /// Whether the text has an item's characters; `at` moves over them.
-  bool passes(const lx::TimeItem<Text>& item, Reader* at) const {
-    if constexpr (!Text::kShift) {
+  bool passes(const lx::TimeItem<Text>& item, Cursor* at) const {
+    if constexpr (!Cursor::kShifts) {
       if (item.count > lx::room(at->p, at->end)) return false;
       if (memcmp(at->p, item.units, item.count * sizeof(Unit)) != 0) return false;
       at->p += item.count;
     } else {
-      Reader in = item.reader(locale_);
+      Cursor in = item.cursor(locale_);
       Value value{};
       while (in.next(&value))
         if (match_char<Text>(in, in.p, value, at) != Match::kSame) return false;
@@ -193,8 +191,8 @@ class TimeParser {
 
 /// The units read, or -1.
 template <class Text>
-int32_t parse_time(const LXLocale& locale, LXTime* time, const typename Text::Reader& given,
-                   const typename Text::Reader& format, uint32_t flags, int32_t* code) {
+int32_t parse_time(const LXLocale& locale, LXTime* time, const typename Text::Cursor& given,
+                   const typename Text::Cursor& format, uint32_t flags, int32_t* code) {
   if (given.p == given.end || format.p == format.end) return 0;
   auto text = given;
   *code = TimeParser<Text>(locale, time, (flags & LX_TERRITORY_VALUES) == 0).match(format, &text);
@@ -210,17 +208,9 @@ int32_t parse_units(LXLocale* given, LXTime* time, const typename Text::Unit* te
   const Codepage& cp = codepage_of(call.codepage());
   int32_t code = LX_OK;
   const int32_t read =
-      parse_time<Text>(*call.locale(), time, Text::read(cp, text, lx::text_units(text, length)),
-                       Text::read(cp, format, lx::text_units(format, format_length)), flags, &code);
+      parse_time<Text>(*call.locale(), time, Text::cursor(cp, text, lx::text_units(text, length)),
+                       Text::cursor(cp, format, lx::text_units(format, format_length)), flags, &code);
   return call.fail(code, read);
-}
-
-/// The characters that were read.
-template <class Reader>
-int32_t chars_of(Reader in) {
-  int32_t chars = 0;
-  for (LXWChar value = 0; in.next(&value);) ++chars;
-  return chars;
 }
 
 int32_t parse_bytes(LXLocale* given, LXTime* time, const char* text, LXShiftState state, int32_t length,
@@ -233,16 +223,15 @@ int32_t parse_bytes(LXLocale* given, LXTime* time, const char* text, LXShiftStat
   const Codepage& cp = codepage_of(*locale.codepage);
   const bool characters = (flags & LX_CHARACTERS) != 0;
   int32_t code = LX_OK;
-  const int32_t read = lx::with_time_bytes(cp, form, [&](auto kind) {
+  const int32_t read = lx::with_kind<uint8_t, lx::ClosedShiftSink>(cp, form, [&](auto kind) {
     using Text = decltype(kind);
-    const auto reader = [&](const char* p, LXShiftState start, int32_t units) {
-      return Text::read(cp, bytes_of(p), lx::given_bytes<Text>(cp, bytes_of(p), start, units, characters),
-                        start);
-    };
-    const int32_t bytes = parse_time<Text>(locale, time, reader(text, state, length),
-                                           reader(format, format_state, format_length), flags, &code);
+    const auto in = lx::given_text<Text>(cp, text, state, length, characters);
+    const int32_t bytes = parse_time<Text>(
+        locale, time, in, lx::given_text<Text>(cp, format, format_state, format_length, characters), flags,
+        &code);
     if (bytes < 0 || !characters) return bytes;
-    return chars_of(Text::read(cp, bytes_of(text), static_cast<size_t>(bytes), state));
+    auto taken = Text::cursor(cp, in.p, static_cast<size_t>(bytes), state);
+    return static_cast<int32_t>(lx::pass_all(&taken));
   });
   return call.fail(code, read);
 }
@@ -259,12 +248,12 @@ int32_t LXStringToTime(LXLocale* locale, LXTime* time, const char* text, int32_t
 
 int32_t LXStringToTimeW(LXLocale* locale, LXTime* time, const LXWChar* text, int32_t length,
                         const LXWChar* format, int32_t format_length, uint32_t flags) {
-  return parse_units<lx::CodeTime>(locale, time, text, length, format, format_length, flags);
+  return parse_units<lx::WideKind>(locale, time, text, length, format, format_length, flags);
 }
 
 int32_t LXStringToTimeU(LXLocale* locale, LXTime* time, const LXUChar* text, int32_t length,
                         const LXUChar* format, int32_t format_length, uint32_t flags) {
-  return parse_units<lx::UnicodeTime>(locale, time, text, length, format, format_length, flags);
+  return parse_units<lx::UnicodeKind>(locale, time, text, length, format, format_length, flags);
 }
 
 int32_t LXStringToTimeEx(LXLocale* locale, LXTime* time, const char* text, LXShiftState state, int32_t length,

@@ -4,7 +4,7 @@
 #include <cstdio>
 #include <cstring>
 
-#include "codepage/lxtext.h"
+#include "codepage/lxtransfer.h"
 #include "core/lxcall.h"
 #include "core/lxobjman.h"
 #include "locale/lxlocale.h"
@@ -165,20 +165,20 @@ bool read_text(const LXLocale& locale, const ItemText& from, Form form, int32_t*
   const Codepage& cp = codepage_of(*locale.codepage);
   if (from.kind == TextKind::kUnicode) {
     const uint8_t* const end = from.one_unit ? from.text + 2 : nullptr;
-    body(lx::PayloadReader{from.text, end}, LXUChar{});
+    body(lx::PayloadCursor{from.text, end}, LXUChar{});
     return true;
   }
   if (from.kind == TextKind::kCodepage) {
-    lx::read_bytes(cp, form, LX_SHIFT_SINGLE, from.text, from.bytes, [&](auto in) { body(in, Value{}); });
+    lx::with_cursor(cp, form, LX_SHIFT_SINGLE, from.text, from.bytes, [&](auto in) { body(in, Value{}); });
     return true;
   }
   if (lx::keeps_ascii(locale)) {
-    body(lx::SingleByteReader{cp, from.text, from.text + from.bytes}, Value{});
+    body(lx::SingleByteCursor{cp, from.text, from.text + from.bytes}, Value{});
     return true;
   }
   const Codepage* common = lx::common_codepage(rc);
   if (common == nullptr) return false;
-  body(lx::SingleByteReader{*common, from.text, from.text + from.bytes}, LXUChar{});
+  body(lx::SingleByteCursor{*common, from.text, from.text + from.bytes}, LXUChar{});
   return true;
 }
 
@@ -285,21 +285,21 @@ int32_t LXGetLocaleNumInfo(LXLocale* given, int32_t item, int32_t flags) {
 int32_t LXGetLocaleTextInfo(LXLocale* locale, int32_t item, char* buffer, int32_t size, int32_t flags) {
   return get_text<true>(locale, item, bytes_of(buffer), size, flags, Form::kPlain,
                         [&](const Codepage& cp, uint8_t* end, auto body) {
-                          lx::write_bytes(cp, Form::kPlain, LX_SHIFT_SINGLE, bytes_of(buffer), end, body);
+                          lx::with_sink(cp, Form::kPlain, LX_SHIFT_SINGLE, bytes_of(buffer), end, body);
                         });
 }
 
 int32_t LXGetLocaleTextInfoW(LXLocale* locale, int32_t item, LXWChar* buffer, int32_t size, int32_t flags) {
   return get_text<true>(locale, item, buffer, size, flags, Form::kEx,
                         [&](const Codepage& cp, LXWChar* end, auto body) {
-                          body(lx::CodeWriter{cp, buffer, end});
+                          body(lx::CodeSink{cp, buffer, end});
                         });
 }
 
 int32_t LXGetLocaleTextInfoU(LXLocale* locale, int32_t item, LXUChar* buffer, int32_t size, int32_t flags) {
   return get_text<false>(locale, item, buffer, size, flags, Form::kEx,
                          [&](const Codepage&, LXUChar* end, auto body) {
-                           body(lx::UnicodeWriter{buffer, end});
+                           body(lx::UnicodeSink{buffer, end});
                          });
 }
 
@@ -310,7 +310,7 @@ int32_t LXGetLocaleTextInfoEx(LXLocale* locale, int32_t item, char* buffer, LXSh
     return LXGetLocaleTextInfo(locale, item, buffer, size, flags);
   return get_text<true>(locale, item, bytes_of(buffer), size, flags, Form::kEx,
                         [&](const Codepage& cp, uint8_t* end, auto body) {
-                          body(lx::ClosedShiftWriter{cp, bytes_of(buffer), end, state});
+                          body(lx::ClosedShiftSink{cp, bytes_of(buffer), end, state});
                         });
 }
 

@@ -92,17 +92,16 @@ inline const uint8_t* payload_text(const LXObject& object, size_t word) {
 
 /// Reads a null-terminated 16-bit text of a payload, which may stand at any address; also a locale's copy of
 /// one.
-struct PayloadReader {
+struct PayloadCursor {
   using Unit = uint8_t;
-  static constexpr bool kOneUnit = false;
-  static constexpr bool kRuns = false;
+  static constexpr bool kOneUnit = false, kShifts = false, kUnicode = false, kRuns = false;
   const uint8_t* p;
   const uint8_t* end;  // no end but the null: p - 1, which is never reached
 
   bool next(LXUChar* u) {
     if (p == end || le16(p) == 0) return false;
     *u = le16(p);
-    p += 2;
+    p += sizeof(*u);
     return true;
   }
 };

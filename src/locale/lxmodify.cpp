@@ -2,7 +2,7 @@
 // territory, converted when it moves to another codepage. What the caller has set is never overwritten.
 #include <cstring>
 
-#include "codepage/lxtext.h"
+#include "codepage/lxtransfer.h"
 #include "core/lxcall.h"
 #include "core/lxmemory.h"
 #include "locale/lxlocale.h"
@@ -25,8 +25,9 @@ constexpr size_t kCurrencyText = 1;
 
 /// The 16-bit units of a text with its null.
 size_t units_of(const uint8_t* text) {
+  lx::PayloadCursor in{text, nullptr};
   size_t units = 1;
-  for (; lx::le16(text) != 0; text += 2) ++units;
+  for (LXUChar u = 0; in.next(&u);) ++units;
   return units;
 }
 
@@ -38,8 +39,8 @@ void LXLocaleFreeOldText(const LXLocale& kept, LXLocale& dropped) {
 
 /// Converts a text from one codepage to another, shift bytes and null included: the bytes written.
 size_t LXLocaleCnvText(const Codepage& from, const Codepage& to, const char* text, char* output) {
-  return lx::read_bytes(from, Form::kEx, LX_SHIFT_SINGLE, bytes_of(text), strlen(text), [&](auto in) {
-    return lx::write_bytes(to, Form::kEx, LX_SHIFT_SINGLE, bytes_of(output), lx::no_end<uint8_t>(),
+  return lx::with_cursor(from, Form::kEx, LX_SHIFT_SINGLE, bytes_of(text), strlen(text), [&](auto in) {
+    return lx::with_sink(to, Form::kEx, LX_SHIFT_SINGLE, bytes_of(output), lx::no_end<uint8_t>(),
                            [&](auto out) {
                              lx::transfer<LXUChar>(in, out, SIZE_MAX);
                              out.put(LXUChar{0});
@@ -140,8 +141,8 @@ size_t most_text_bytes(const Codepage& cp, size_t units) {
 }
 
 void store_text(const Codepage& cp, const uint8_t* text, uint8_t* output) {
-  write_bytes(cp, Form::kEx, LX_SHIFT_SINGLE, output, no_end<uint8_t>(), [&](auto out) {
-    PayloadReader in{text, nullptr};
+  with_sink(cp, Form::kEx, LX_SHIFT_SINGLE, output, no_end<uint8_t>(), [&](auto out) {
+    PayloadCursor in{text, nullptr};
     transfer<LXUChar>(in, out, SIZE_MAX);
     out.put(LXUChar{0});
   });

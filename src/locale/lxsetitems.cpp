@@ -2,7 +2,7 @@
 // installed. The forms differ in how their text becomes bytes of the codepage and a shift state to start in.
 #include <cstring>
 
-#include "codepage/lxtext.h"
+#include "codepage/lxtransfer.h"
 #include "core/lxcall.h"
 #include "core/lxmemory.h"
 #include "core/lxobjman.h"
@@ -66,8 +66,8 @@ int32_t name_to_ascii(const Codepage& cp, const NewText& text, size_t count, cha
   int32_t rc = LX_OK;
   const Codepage* common = lx::common_codepage(&rc);
   if (common == nullptr) return lx::search_code(rc);
-  lx::SingleByteWriter out{*common, bytes_of(name), bytes_of(name) + kMostNameBytes};
-  lx::read_bytes(cp, Form::kPlain, LX_SHIFT_SINGLE, text.bytes, count,
+  lx::SingleByteSink out{*common, bytes_of(name), bytes_of(name) + kMostNameBytes};
+  lx::with_cursor(cp, Form::kPlain, LX_SHIFT_SINGLE, text.bytes, count,
                  [&](auto in) { lx::transfer<LXUChar>(in, out, SIZE_MAX); });
   *length = static_cast<size_t>(out.p - bytes_of(name));
   return LX_OK;
@@ -104,13 +104,6 @@ int32_t set_separator(LXLocale* locale, size_t index, const NewText& text) {
   return LX_OK;
 }
 
-template <class Unit>
-size_t units_before_null(const Unit* text, int32_t length) {
-  size_t n = 0;
-  while ((length < 0 || n < static_cast<size_t>(length)) && text[n] != 0) ++n;
-  return n;
-}
-
 /// The block that a text of a locale goes to: the one it has where the new text is not longer than the stored
 /// one, else a new one, which takes its place when it is installed.
 template <class Unit>
@@ -137,7 +130,7 @@ class TextBlock {
 int32_t set_string(LXLocale* locale, size_t index, const NewText& text) {
   const Codepage& cp = codepage_of(*locale->codepage);
   const auto read = [&](auto body) {
-    return lx::read_bytes(cp, Form::kEx, text.state, text.bytes, text.count, body);
+    return lx::with_cursor(cp, Form::kEx, text.state, text.bytes, text.count, body);
   };
   size_t chars = 0;
   const uint8_t* end = read([&](auto in) {
@@ -149,13 +142,13 @@ int32_t set_string(LXLocale* locale, size_t index, const NewText& text) {
   const size_t units = text.units != nullptr ? text.unit_count : chars;
 
   const size_t stored = strlen(locale->texts[index]);
-  const size_t stored_units = units_before_null(locale->texts_unicode[index], -1);
+  const size_t stored_units = lx::units_up_to(locale->texts_unicode[index], -1);
   TextBlock<char> narrow(&locale->texts[index], stored, shift + count);
   if (narrow.data() == nullptr) return LX_E_MEMORY;
   TextBlock<LXUChar> wide(&locale->texts_unicode[index], stored_units, units);
   if (wide.data() == nullptr) return LX_E_MEMORY;
 
-  lx::UnicodeWriter out{wide.data(), wide.data() + units};
+  lx::UnicodeSink out{wide.data(), wide.data() + units};
   if (text.units != nullptr)
     memcpy(out.p, text.units, sizeof(LXUChar) * units);
   else
@@ -229,14 +222,14 @@ int32_t set_item(LXLocale* given, int32_t length, int32_t flags, Set set) {
 }
 
 /// Converts units to bytes of the locale's codepage and sets the item from them.
-template <class Reader, class Value>
-int32_t set_converted(LXLocale* locale, int32_t item, Reader in, size_t count, const LXUChar* units) {
+template <class Cursor, class Value>
+int32_t set_converted(LXLocale* locale, int32_t item, Cursor in, size_t count, const LXUChar* units) {
   const Codepage& cp = codepage_of(*locale->codepage);
   if (count > INT32_MAX / (lx::kMaxCharBytes + 1) - 1) return LX_E_MEMORY;
   const lx::WorkBuffer narrow((count + 1) * (lx::kMaxCharBytes + 1));
   if (!narrow) return LX_E_MEMORY;
   uint8_t* const start = narrow.as<uint8_t>();
-  lx::write_bytes(cp, Form::kEx, LX_SHIFT_SINGLE, start, lx::no_end<uint8_t>(), [&](auto out) {
+  lx::with_sink(cp, Form::kEx, LX_SHIFT_SINGLE, start, lx::no_end<uint8_t>(), [&](auto out) {
     lx::transfer<Value>(in, out, SIZE_MAX);
     out.put(Value{0});
   });
@@ -301,18 +294,18 @@ int32_t LXSetLocaleTextInfo(LXLocale* given, int32_t item, const char* text, int
 int32_t LXSetLocaleTextInfoW(LXLocale* given, int32_t item, const LXWChar* text, int32_t length,
                              int32_t flags) {
   return set_item(given, length, flags, [&](LXLocale* locale) {
-    const size_t count = units_before_null(text, length);
-    const lx::CodeReader in{codepage_of(*locale->codepage), text, text + count};
-    return set_converted<lx::CodeReader, LXWChar>(locale, item, in, count, nullptr);
+    const size_t count = lx::units_up_to(text, length);
+    const lx::CodeCursor in{codepage_of(*locale->codepage), text, text + count};
+    return set_converted<lx::CodeCursor, LXWChar>(locale, item, in, count, nullptr);
   });
 }
 
 int32_t LXSetLocaleTextInfoU(LXLocale* given, int32_t item, const LXUChar* text, int32_t length,
                              int32_t flags) {
   return set_item(given, length, flags, [&](LXLocale* locale) {
-    const size_t count = units_before_null(text, length < 0 ? kMostUnicodeUnits + 1 : length);
+    const size_t count = lx::units_up_to(text, length < 0 ? kMostUnicodeUnits + 1 : length);
     if (length > kMostUnicodeUnits || count > kMostUnicodeUnits) return int32_t{LX_E_NOT_FOUND};
-    return set_converted<lx::UnicodeReader, LXUChar>(locale, item, {text, text + count}, count, text);
+    return set_converted<lx::UnicodeCursor, LXUChar>(locale, item, {text, text + count}, count, text);
   });
 }
 

@@ -1,6 +1,6 @@
 // Translation of strings between two codepages that are named by number: conversion as between two locales,
 // with what fields of a fixed size need beside it (padding, blanks that may be lost, a closed shift state).
-#include "codepage/lxcopy.h"
+#include "codepage/lxtransfer.h"
 #include "core/lxtrace.h"
 #include "nls1.h"
 
@@ -87,50 +87,32 @@ Outcome failed(int32_t code) {
 
 // ---- The input
 
-template <class Reader, class Writer>
-lx::Transfer<LXUChar> move(Reader& in, Writer& out, size_t count) {
-  return lx::transfer<LXUChar>(in, out, count);
-}
-/// Units that stay what they are need no runs of equal ones.
-struct UnitReader : lx::UnicodeReader {
-  static constexpr bool kRuns = false;
-};
-lx::Transfer<LXUChar> move(lx::UnicodeReader& in, lx::UnicodeWriter& out, size_t count) {
-  UnitReader units{in};
-  const auto moved = lx::transfer<LXUChar>(units, out, count);
-  in.p = units.p;
-  return moved;
-}
-
 /// The bytes of the characters that were moved: what was read and did not fit stays in the input, with its
 /// Shift-Out, so that the rest of the input is a text of its own.
-template <class Reader>
-size_t bytes_moved(const Reader& in, const typename Reader::Unit* start, Stop stop, size_t bytes) {
+template <class Cursor>
+size_t bytes_moved(const Cursor& in, const typename Cursor::Unit* start, Stop stop, size_t bytes) {
   const size_t read = static_cast<size_t>(in.p - start);
   if (stop == Stop::kInputEnd) return read * sizeof(*start);
   const size_t held = stop == Stop::kInputCut ? 0 : 1;
-  if constexpr (Reader::kOneUnit)
+  if constexpr (Cursor::kOneUnit)
     return (read - held) * sizeof(*start);
   else
-    return lx::whole_chars(in.cp, std::is_same_v<Reader, lx::ShiftReader> ? Form::kEx : Form::kPlain, start,
-                           LX_SHIFT_SINGLE, read - held, bytes)
+    return lx::whole_chars(in.cp, Cursor::kShifts ? Form::kEx : Form::kPlain, start, LX_SHIFT_SINGLE,
+                           read - held, bytes)
         .units;
 }
 
 /// Whether all bytes from `at` on are single-byte characters that are blanks.
-template <class Reader>
-bool only_blanks(const Reader& in, const uint8_t* start, size_t at, size_t bytes) {
-  const int32_t blank = blank_byte(in.cp);
-  if constexpr (std::is_same_v<Reader, lx::ShiftReader>) {
-    if (in.state != LX_SHIFT_SINGLE) return false;
-  } else if (in.cp.length(static_cast<uint8_t>(blank)) != 1) {
-    return false;
+template <class Cursor>
+bool only_blanks(const Cursor& in, const typename Cursor::Unit* start, size_t at, size_t bytes) {
+  using Unit = typename Cursor::Unit;
+  if (lx::state_at(in, LX_SHIFT_SINGLE) != LX_SHIFT_SINGLE) return false;
+  int32_t blank = kBlank;
+  if constexpr (!Cursor::kUnicode) {
+    blank = blank_byte(in.cp);
+    if (!Cursor::kShifts && in.cp.length(static_cast<uint8_t>(blank)) != 1) return false;
   }
-  while (at < bytes && start[at] == blank) ++at;
-  return at == bytes;
-}
-bool only_blanks(const lx::UnicodeReader&, const LXUChar* start, size_t at, size_t bytes) {
-  while (bytes - at >= sizeof(LXUChar) && start[at / sizeof(LXUChar)] == kBlank) at += sizeof(LXUChar);
+  while (bytes - at >= sizeof(Unit) && start[at / sizeof(Unit)] == blank) at += sizeof(Unit);
   return at == bytes;
 }
 
@@ -138,17 +120,18 @@ bool only_blanks(const lx::UnicodeReader&, const LXUChar* start, size_t at, size
 
 /// Returns to the single-byte state. In a full output the last character makes room; it stays consumed, and
 /// the code says nothing of it.
-template <class Writer>
-void close_state(Writer&, const typename Writer::Unit*, const Request&, size_t*) {}
-void close_state(lx::ShiftWriter& out, const uint8_t* start, const Request& request, size_t* chars) {
-  if (out.state != LX_SHIFT_DOUBLE) return;
-  const size_t bytes = static_cast<size_t>(out.p - start);
-  if (request.used(bytes, *chars) >= request.size) {
-    if (bytes < out.cp.width) return;  // codes shorter than the width: nothing can go
-    out.p -= out.cp.width;
-    --*chars;
+template <class Sink>
+void close_state(Sink& out, const typename Sink::Unit* start, const Request& request, size_t* chars) {
+  if constexpr (Sink::kShifts) {
+    if (out.state != LX_SHIFT_DOUBLE) return;
+    const size_t bytes = lx::room(start, out.p);
+    if (request.used(bytes, *chars) >= request.size) {
+      if (bytes < out.cp.width) return;  // codes shorter than the width: nothing can go
+      out.take_back();
+      --*chars;
+    }
+    *out.p++ = out.take_shift_byte();
   }
-  *out.p++ = out.take_shift_byte();
 }
 
 uint8_t pad_unit(const uint8_t*, const Side& target) {
@@ -159,8 +142,8 @@ LXUChar pad_unit(const LXUChar*, const Side&) {
   return kBlank;
 }
 
-template <class Writer>
-void pad(Writer& out, const typename Writer::Unit* start, const Request& request, size_t* chars) {
+template <class Sink>
+void pad(Sink& out, const typename Sink::Unit* start, const Request& request, size_t* chars) {
   const size_t used = request.used(static_cast<size_t>(out.p - start), *chars);
   if (used >= request.size) return;
   const size_t blanks = request.size - used;
@@ -173,11 +156,11 @@ void pad(Writer& out, const typename Writer::Unit* start, const Request& request
 
 // ---- The translation
 
-template <class Reader, class Writer>
-Outcome translate(Reader in, Writer out, const Request& request) {
+template <class Cursor, class Sink>
+Outcome translate(Cursor in, Sink out, const Request& request) {
   const auto* const from = in.p;
   auto* const to = out.p;
-  const auto moved = move(in, out, request.characters ? request.size : SIZE_MAX);
+  const auto moved = lx::transfer<LXUChar>(in, out, request.characters ? request.size : SIZE_MAX);
   size_t chars = moved.chars;
   size_t consumed = bytes_moved(in, from, moved.stop, request.bytes);
   if (request.drop_blanks && only_blanks(in, from, consumed, request.bytes)) consumed = request.bytes;
@@ -199,10 +182,10 @@ template <class Body>
 Outcome read_source(const Request& request, Body body) {
   const Side& source = request.source;
   if (source.cp != nullptr)
-    return lx::read_bytes(*source.cp, source.form(), LX_SHIFT_SINGLE,
-                          static_cast<const uint8_t*>(request.input), request.bytes, body);
+    return lx::with_cursor(*source.cp, source.form(), LX_SHIFT_SINGLE,
+                           static_cast<const uint8_t*>(request.input), request.bytes, body);
   const LXUChar* const units = static_cast<const LXUChar*>(request.input);
-  return body(lx::UnicodeReader{units, units + request.bytes / sizeof(LXUChar)});
+  return body(lx::UnicodeCursor{units, units + request.bytes / sizeof(LXUChar)});
 }
 
 /// A size in characters says nothing about the end of the output.
@@ -212,11 +195,11 @@ Outcome write_target(const Request& request, Body body) {
   if (target.cp == nullptr) {
     LXUChar* const units = static_cast<LXUChar*>(request.output);
     return body(
-        lx::UnicodeWriter{units, request.characters ? lx::no_end<LXUChar>() : lx::end_of(units, request.size)});
+        lx::UnicodeSink{units, request.characters ? lx::no_end<LXUChar>() : lx::end_of(units, request.size)});
   }
   uint8_t* const bytes = static_cast<uint8_t*>(request.output);
-  return lx::write_bytes(*target.cp, target.form(), LX_SHIFT_SINGLE, bytes,
-                         request.characters ? lx::no_end<uint8_t>() : lx::end_of(bytes, request.size), body);
+  return lx::with_sink(*target.cp, target.form(), LX_SHIFT_SINGLE, bytes,
+                       request.characters ? lx::no_end<uint8_t>() : lx::end_of(bytes, request.size), body);
 }
 
 void trace_path(const Side& source, const Side& target) {
@@ -239,7 +222,7 @@ size_t input_bytes(const Side& source, const void* input, int32_t length, int32_
                 ? lx::text_units(static_cast<const LXUChar*>(input), length) * sizeof(LXUChar)
                 : static_cast<size_t>(length);
   else if (characters && !source.cp->single_byte)
-    bytes = lx::text_bytes(*source.cp, static_cast<const char*>(input), LX_SHIFT_SINGLE, length, LX_CHARACTERS);
+    bytes = lx::units_of(*source.cp, lx::ByteText{static_cast<const uint8_t*>(input), length}, true);
   else
     bytes = lx::text_units(static_cast<const char*>(input), length);
   if (length < 0) LX_TRACE(unit, RAS1_LEVEL_DETAIL, "Source length = %d", static_cast<int32_t>(bytes));

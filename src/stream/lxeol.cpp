@@ -1,8 +1,8 @@
 // Line ends in strings: finding the first one, and storing them.
 #include "stream/lxeol.h"
 
-#include "text/lxcursor.h"
 #include "core/lxcall.h"
+#include "text/lxwalk.h"
 
 namespace {
 
@@ -11,10 +11,10 @@ using lx::ByteText;
 using lx::Call;
 using lx::Codepage;
 using lx::codepage_of;
-using lx::Cursor;
 using lx::Form;
 using lx::LineEnds;
 using lx::Text;
+using lx::Walk;
 
 RAS1_Unit unit = RAS1_UNIT("lxeol");
 
@@ -25,10 +25,10 @@ struct Eol {
   int32_t length;
 };
 
-template <class Reader>
-Eol<typename Reader::Unit> first_eol(const Codepage& cp, const Reader& text, uint32_t kinds) {
-  const LineEnds<typename Cursor<Reader>::Value> ends(cp, kinds);
-  for (Cursor at(text); at.next();) {
+template <class Cursor>
+Eol<typename Cursor::Unit> first_eol(const Codepage& cp, const Cursor& text, uint32_t kinds) {
+  const LineEnds<typename Walk<Cursor>::Value> ends(cp, kinds);
+  for (Walk at(text); at.next();) {
     if (at.units() != 1) continue;
     const auto* const next = at.in.p;
     const bool pair = ends.any(LX_EOL_CRLF) && at.value == ends.carriage_return && next != at.in.end;
@@ -52,7 +52,8 @@ Unit* find(LXLocale* given, Form form, const Text<Unit>& text, uint32_t* kind, i
   const Codepage& cp = codepage_of(call.codepage());
   const size_t units = lx::units_of(cp, text, characters);
   const uint32_t kinds = flags != 0 ? flags : LX_EOL_LF;
-  const auto eol = lx::read(cp, form, text, units, [&](const auto& in) { return first_eol(cp, in, kinds); });
+  const auto eol =
+      lx::with_cursor(cp, form, text, units, [&](const auto& in) { return first_eol(cp, in, kinds); });
   *kind = eol.kind;
   *eol_length = eol.length;
   return call.exit(const_cast<Unit*>(eol.end));

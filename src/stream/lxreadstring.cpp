@@ -32,7 +32,7 @@ struct Source {
   Value value = 0;
 
   int32_t next() {
-    if constexpr (std::is_same_v<Value, LXUChar>) {
+    if constexpr (sizeof(Value) == sizeof(LXUChar)) {
       const int32_t code = lx::read_unit(stream, &held);
       if (code == LX_OK) value = lx::unit_of(held);
       return code;
@@ -43,17 +43,17 @@ struct Source {
     }
   }
   /// Whether it can be a line-end character.
-  bool one_unit() const { return std::is_same_v<Value, LXUChar> || held.length == 1; }
+  bool one_unit() const { return sizeof(Value) == sizeof(LXUChar) || held.length == 1; }
   /// There is room: it was taken out of the buffer, or read when that was empty.
   void put_back(const StreamChar& c) { lx::push_back(cp, stream, c); }
 };
 
-template <class Writer>
+template <class Sink>
 class Line {
  public:
-  using Value = std::conditional_t<std::is_same_v<Writer, lx::UnicodeWriter>, LXUChar, LXWChar>;
+  using Value = std::conditional_t<std::is_same_v<Sink, lx::UnicodeSink>, LXUChar, LXWChar>;
 
-  Line(const Codepage& cp, LXStream& stream, const Writer& out, size_t most_chars, uint32_t flags)
+  Line(const Codepage& cp, LXStream& stream, const Sink& out, size_t most_chars, uint32_t flags)
       : in_{cp, stream},
         out_(out),
         most_chars_(most_chars),
@@ -67,7 +67,7 @@ class Line {
       if (code != LX_OK) return code;
       const uint32_t kind = in_.one_unit() ? ends_.kind_of(in_.value) : 0;
       if (is_return() && (drop_returns_ || ends_.any(LX_EOL_CRLF))) {
-        if (!Writer(out_).put(in_.value)) return put_back(in_.held);
+        if (!Sink(out_).put(in_.value)) return put_back(in_.held);
         const Step step = read_behind_return(in_.held, kind);
         if (step.ended) return step.code;
         continue;
@@ -80,8 +80,8 @@ class Line {
 
   size_t chars() const { return chars_; }
   /// Where the text ends, in the single-byte state.
-  typename Writer::Unit* close() {
-    if constexpr (std::is_same_v<Writer, lx::ClosedShiftWriter>) out_.close();
+  typename Sink::Unit* close() {
+    lx::close_text(out_);
     return out_.p;
   }
 
@@ -99,7 +99,7 @@ class Line {
     return true;
   }
   bool pair_fits() const {
-    Writer ahead(out_);
+    Sink ahead(out_);
     return drop_returns_ ||
            (most_chars_ - chars_ > 1 && ahead.put(ends_.carriage_return) && ahead.put(ends_.line_feed));
   }
@@ -128,28 +128,21 @@ class Line {
   }
 
   Source<Value> in_;
-  Writer out_;
+  Sink out_;
   size_t most_chars_;
   LineEnds<Value> ends_;
   bool drop_returns_;
   size_t chars_ = 0;
 };
 
-/// Calls `body` with the form's writer. Packed codes are stored as they are, so that all codepages have the
-/// same plain one.
-template <class Body>
-int32_t with_writer(const Codepage& cp, Form form, uint8_t* p, uint8_t* end, Body body) {
-  if (form == Form::kEx && cp.shift_sensitive)
-    return body(lx::ClosedShiftWriter({cp, p, end, LX_SHIFT_SINGLE}));
-  return body(lx::MultiByteWriter{cp, p, end});
-}
-template <class Body>
-int32_t with_writer(const Codepage& cp, Form, LXWChar* p, LXWChar* end, Body body) {
-  return body(lx::CodeWriter{cp, p, end});
-}
-template <class Body>
-int32_t with_writer(const Codepage&, Form, LXUChar* p, LXUChar* end, Body body) {
-  return body(lx::UnicodeWriter{p, end});
+/// Calls `body` with the form's sink. Packed codes are stored as they are, so that all codepages without shift
+/// states have the same one.
+template <class Unit, class Body>
+int32_t with_line_sink(const Codepage& cp, Form form, Unit* p, Unit* end, Body body) {
+  if constexpr (sizeof(Unit) == 1)
+    if (form != Form::kEx || !cp.shift_sensitive) return body(lx::MultiByteSink{cp, p, end});
+  return lx::with_kind<Unit, lx::ClosedShiftSink>(cp, form,
+                                                  [&](auto kind) { return body(kind.sink(cp, p, end)); });
 }
 
 template <class Unit>
@@ -164,7 +157,7 @@ int32_t read_string(LXStream* stream, LXLocale* given, Form form, Unit* output, 
   const size_t nulls = (flags & LX_TERMINATE) != 0 && given_room != 0 ? 1 : 0;
   const size_t most = given_room - nulls;
   Unit* const end = by_chars ? lx::no_end<Unit>() : lx::end_of(output, most);
-  return with_writer(cp, form, output, end, [&](const auto& out) {
+  return with_line_sink(cp, form, output, end, [&](const auto& out) {
     Line line(cp, *stream, out, most, flags);
     const int32_t code = line.read();
     if (line.chars() == 0 && code != LX_OK) return code > LX_OK ? call.fail(code, kFailed) : call.exit(kAtEnd);

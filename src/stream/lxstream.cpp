@@ -27,10 +27,6 @@ void drop_front(LXStream& s, size_t bytes) {
 uint8_t state_after(const Codepage& cp, uint8_t shift_byte) {
   return shift_byte == cp.shift_out ? LX_SHIFT_DOUBLE : LX_SHIFT_SINGLE;
 }
-uint8_t shift_byte(const Codepage& cp, LXShiftState state) {
-  return state == LX_SHIFT_DOUBLE ? cp.shift_out : cp.shift_in;
-}
-
 int32_t call_back(const LXStream& s, uint8_t* p, size_t bytes) {
   return s.transfer(s.user, reinterpret_cast<char*>(p), static_cast<int32_t>(bytes));
 }
@@ -114,7 +110,7 @@ int32_t flush(LXStream& s) {
 int32_t write_char(const Codepage& cp, LXStream& s, const StreamChar& c) {
   const size_t shift = c.shifts && c.state != s.shift_state ? 1 : 0;
   const size_t bytes = shift + c.length;
-  uint8_t text[1 + lx::kMaxCharBytes] = {shift_byte(cp, c.state)};
+  uint8_t text[1 + lx::kMaxCharBytes] = {lx::shift_byte(cp, c.state)};
   memcpy(text + shift, c.bytes, c.length);
   size_t taken = 0;
   offer_kept(s);
@@ -235,7 +231,7 @@ int32_t push_back(const Codepage& cp, LXStream& s, const StreamChar& c) {
   s.count = static_cast<uint16_t>(s.count + bytes);
   memcpy(s.buffer, c.bytes, c.length);
   if (shift == 0) return LX_OK;
-  s.buffer[c.length] = shift_byte(cp, s.shift_state);
+  s.buffer[c.length] = lx::shift_byte(cp, s.shift_state);
   s.shift_state = static_cast<uint8_t>(c.state);
   return LX_OK;
 }

@@ -4,7 +4,7 @@
 // characters' lengths, or of what the texts are long.
 #include <string.h>
 
-#include "codepage/lxcopy.h"
+#include "codepage/lxtext.h"
 #include "codepage/lxunicode.h"
 #include "core/lxcall.h"
 #include "core/lxmemory.h"
@@ -18,8 +18,8 @@ using lx::Codepage;
 using lx::codepage_of;
 using lx::Form;
 using lx::kMaxCharBytes;
-using lx::MultiByteReader;
-using lx::ShiftReader;
+using lx::MultiByteCursor;
+using lx::ShiftCursor;
 
 RAS1_Unit unit = RAS1_UNIT("lxcompare");
 
@@ -165,24 +165,24 @@ int32_t compare_units(const Text<Unit>& a, const Text<Unit>& b, const Folding& f
 // Walks over byte texts whose characters have lengths. They stand on the readers' places, but do not read:
 // shift bytes count, and so does the length of a character that the end cuts.
 
-size_t length_at(const MultiByteReader& in) {
+size_t length_at(const MultiByteCursor& in) {
   return in.cp.length(*in.p);
 }
-size_t length_at(const ShiftReader& in) {
+size_t length_at(const ShiftCursor& in) {
   return in.cp.width_in(in.state);
 }
-bool pass_shift(MultiByteReader*) {
+bool pass_shift(MultiByteCursor*) {
   return false;
 }
-bool pass_shift(ShiftReader* in) {
+bool pass_shift(ShiftCursor* in) {
   return in->p != in->end && lx::take_shift(in->cp, &in->p, &in->state);
 }
-template <class Reader>
-size_t left(const Reader& in) {
+template <class Cursor>
+size_t left(const Cursor& in) {
   return lx::room(in.p, in.end);
 }
-template <class Reader>
-int32_t left_difference(const Reader& a, const Reader& b) {
+template <class Cursor>
+int32_t left_difference(const Cursor& a, const Cursor& b) {
   return difference(a.end - a.p, b.end - b.p);
 }
 
@@ -207,9 +207,9 @@ size_t first_difference(const Char& x, const Char& y) {
 }
 
 /// A character of several bytes in lower case.
-template <class Reader>
-Char lower(const LXObject& codepage, const Reader& in, size_t length) {
-  constexpr auto kConvert = std::is_same_v<Reader, ShiftReader> ? LXCpMbCaseConvS : LXCpMbCaseConv;
+template <class Cursor>
+Char lower(const LXObject& codepage, const Cursor& in, size_t length) {
+  constexpr auto kConvert = Cursor::kShifts ? LXCpMbCaseConvS : LXCpMbCaseConv;
   Char c{{}, length};
   kConvert(&codepage, reinterpret_cast<const char*>(in.p), reinterpret_cast<char*>(c.bytes), LX_C1_UPPER);
   return c;
@@ -218,7 +218,7 @@ Char lower(const LXObject& codepage, const Reader& in, size_t length) {
 /// Passes over blocks of ASCII that stand at both places and are the same, where room for any character is left
 /// behind them. One that is not is not looked at again before `*from`.
 template <class Same>
-void pass_blocks(MultiByteReader* a, MultiByteReader* b, const Same& same, const uint8_t** from) {
+void pass_blocks(MultiByteCursor* a, MultiByteCursor* b, const Same& same, const uint8_t** from) {
   constexpr unsigned kAscii = 0x80;
   if (a->cp.same_below < kAscii || a->p < *from) return;
   while (lx::least(left(*a), left(*b)) >= lx::kBlock + kMaxCharBytes && lx::is_same_block(a->p, kAscii) &&
@@ -229,23 +229,23 @@ void pass_blocks(MultiByteReader* a, MultiByteReader* b, const Same& same, const
   *from = a->p + lx::least(left(*a), lx::kBlock);
 }
 template <class Same>
-void pass_blocks(ShiftReader*, ShiftReader*, const Same&, const uint8_t**) {}
+void pass_blocks(ShiftCursor*, ShiftCursor*, const Same&, const uint8_t**) {}
 
 /// The result for two characters whose folded forms differ in these bytes.
-int32_t case_difference(const MultiByteReader&, const MultiByteReader&, uint8_t x, uint8_t y) {
+int32_t case_difference(const MultiByteCursor&, const MultiByteCursor&, uint8_t x, uint8_t y) {
   return x - y;
 }
 /// Callers rely on the order that this gives: bytes count as signed, and a text whose double-byte characters
 /// end first is less. Both texts are in the same state here.
-int32_t case_difference(const ShiftReader& a, const ShiftReader& b, uint8_t x, uint8_t y) {
+int32_t case_difference(const ShiftCursor& a, const ShiftCursor& b, uint8_t x, uint8_t y) {
   if (a.state == LX_SHIFT_DOUBLE && a.cp.is_shift(*a.p)) return -1;
   if (a.state == LX_SHIFT_DOUBLE && b.cp.is_shift(*b.p)) return 1;
   return static_cast<int8_t>(x) - static_cast<int8_t>(y);
 }
 
 /// Characters of different lengths, or cut ones, end the comparison: two cut ones of the same length are equal.
-template <class Reader>
-int32_t compare_case(const LXObject& codepage, Reader a, Reader b) {
+template <class Cursor>
+int32_t compare_case(const LXObject& codepage, Cursor a, Cursor b) {
   const ByteCase fold{lower_table(a.cp), has_ascii_case(lower_table(a.cp), lx::least(left(a), left(b)))};
   const auto same = [&](const uint8_t* x, const uint8_t* y) { return fold.same(x, y); };
   const uint8_t* from = a.p;
@@ -287,7 +287,7 @@ Char half_width(const LXObject& codepage, const uint8_t* p, size_t length, size_
 }
 
 /// Compares the characters at both places, which differ: true when that decides, with the result.
-bool width_differs(const LXObject& codepage, const MultiByteReader& a, const MultiByteReader& b,
+bool width_differs(const LXObject& codepage, const MultiByteCursor& a, const MultiByteCursor& b,
                    int32_t* result) {
   const Char x = half_width(codepage, a.p, length_at(a), left(a));
   const Char y = half_width(codepage, b.p, length_at(b), left(b));
@@ -303,7 +303,7 @@ bool width_differs(const LXObject& codepage, const MultiByteReader& a, const Mul
     return false;
   return true;
 }
-bool width_differs(const LXObject& codepage, const ShiftReader& a, const ShiftReader& b, int32_t* result) {
+bool width_differs(const LXObject& codepage, const ShiftCursor& a, const ShiftCursor& b, int32_t* result) {
   const size_t a_length = length_at(a);
   const size_t b_length = length_at(b);
   // A cut character is not entered: what is left decides.
@@ -311,7 +311,7 @@ bool width_differs(const LXObject& codepage, const ShiftReader& a, const ShiftRe
     *result = left_difference(a, b);
     return true;
   }
-  const auto folded = [&](const ShiftReader& in, size_t length) {
+  const auto folded = [&](const ShiftCursor& in, size_t length) {
     return in.state == LX_SHIFT_DOUBLE ? half_width(codepage, in.p, length, length) : Char{{*in.p}, 1};
   };
   const Char x = folded(a, a_length);
@@ -330,8 +330,8 @@ bool width_differs(const LXObject& codepage, const ShiftReader& a, const ShiftRe
 }
 
 /// In the end what is left of the texts is compared, without shift bytes that stand there.
-template <class Reader>
-int32_t compare_width(const LXObject& codepage, Reader a, Reader b) {
+template <class Cursor>
+int32_t compare_width(const LXObject& codepage, Cursor a, Cursor b) {
   const uint8_t* from = a.p;
   for (;;) {
     pass_blocks(&a, &b, same_block<uint8_t>, &from);
@@ -524,8 +524,8 @@ int32_t compare_bytes(LXLocale* given, Form form, const char* text1, LXShiftStat
                                                  : compare_width(call.codepage(), x, y));
   };
   if (form == Form::kEx)
-    return walked(ShiftReader{cp, a.p, a.p + a.units, a.state}, ShiftReader{cp, b.p, b.p + b.units, b.state});
-  return walked(MultiByteReader{cp, a.p, a.p + a.units}, MultiByteReader{cp, b.p, b.p + b.units});
+    return walked(ShiftCursor{cp, a.p, a.p + a.units, a.state}, ShiftCursor{cp, b.p, b.p + b.units, b.state});
+  return walked(MultiByteCursor{cp, a.p, a.p + a.units}, MultiByteCursor{cp, b.p, b.p + b.units});
 }
 
 // Texts whose units are characters.
@@ -570,7 +570,7 @@ struct UnicodeRules {
 
 template <class Unit>
 Text<Unit> unit_text(const Unit* p, int32_t length) {
-  return {p, length < 0 ? lx::units_with_null(p) - 1 : static_cast<size_t>(length)};
+  return {p, length < 0 ? lx::units_before_null(p) : static_cast<size_t>(length)};
 }
 
 template <class Rules, class Unit = typename Rules::Unit>

@@ -1,8 +1,8 @@
 // Copying and concatenation of strings by whole characters: what fits, and never a part of one.
 #include <cstring>
 
-#include "text/lxcursor.h"
 #include "core/lxcall.h"
+#include "text/lxwalk.h"
 
 namespace {
 
@@ -11,9 +11,9 @@ using lx::ByteText;
 using lx::Call;
 using lx::Codepage;
 using lx::codepage_of;
-using lx::Cursor;
 using lx::Form;
 using lx::Text;
+using lx::Walk;
 
 RAS1_Unit unit = RAS1_UNIT("lxstrcopy");
 
@@ -23,18 +23,10 @@ void move_units(Unit* to, const Unit* from, size_t units) {
   if (units != 0) memmove(to, from, units * sizeof(Unit));
 }
 
-lx::Copied copied(const Codepage& cp, Form form, const ByteText& text, int32_t size, bool characters) {
-  return lx::whole_bytes(cp, form, text.p, text.state, text.length, size, characters);
-}
-template <class Unit>
-lx::Copied copied(const Codepage&, Form, const Text<Unit>& text, int32_t size, bool) {
-  return lx::whole_units(text.p, text.length, size);
-}
-
 /// The state behind all characters of a text and the shift byte that may end it.
 LXShiftState state_behind(const Codepage& cp, const ByteText& text, size_t bytes) {
   if (!cp.shift_sensitive) return text.state;
-  lx::ShiftReader in{cp, text.p, text.p + bytes, text.state};
+  lx::ShiftCursor in{cp, text.p, text.p + bytes, text.state};
   LXWChar code = 0;
   while (in.next(&code)) {
   }
@@ -49,7 +41,7 @@ int32_t copy(LXLocale* given, Form form, Unit* output, int32_t size, const Text<
   if ((flags & ~uint32_t{LX_CHARACTERS}) != 0) return call.fail(LX_E_INVALID, -1);
   const Codepage& cp = codepage_of(call.codepage());
   const bool characters = (flags & LX_CHARACTERS) != 0;
-  const lx::Copied taken = copied(cp, form, text, size, characters);
+  const lx::Part taken = lx::part_that_fits(cp, form, text, size, characters);
   if constexpr (sizeof(Unit) == 1)
     if (state != nullptr) *state = state_behind(cp, text, taken.units);
   move_units(output, text.p, taken.units);
@@ -67,19 +59,19 @@ struct Target {
 };
 
 /// What the buffer holds, the null included. `bytes` of text are there.
-lx::Copied append_shifting(const Codepage& cp, const Target<uint8_t>& to, const ByteText& text, size_t bytes) {
-  lx::ShiftReader old{cp, to.p, to.p + to.used, to.state};
-  lx::ShiftWriter out{cp, to.p, to.characters ? lx::no_end<uint8_t>() : to.p + to.most, to.state};
-  lx::Copied held{0, 1};
+lx::Part append_shifting(const Codepage& cp, const Target<uint8_t>& to, const ByteText& text, size_t bytes) {
+  lx::ShiftCursor old{cp, to.p, to.p + to.used, to.state};
+  lx::ShiftSink out{cp, to.p, to.characters ? lx::no_end<uint8_t>() : to.p + to.most, to.state};
+  lx::Part held{0, 1};
   LXWChar code = 0;
   for (; old.next(&code); ++held.chars) {
     out.p = to.p + (old.p - to.p);
     out.state = old.state;
   }
   if (to.characters && held.chars > to.most + 1) return {0, 0};
-  lx::ShiftReader in{cp, text.p, text.p + bytes, text.state};
+  lx::ShiftCursor in{cp, text.p, text.p + bytes, text.state};
   for (; (!to.characters || held.chars <= to.most) && in.next(&code); ++held.chars) {
-    lx::ShiftWriter ahead(out);
+    lx::ShiftSink ahead(out);
     // A Shift-In must fit behind it.
     if (!ahead.put(code) || (ahead.state == LX_SHIFT_DOUBLE && ahead.p == ahead.end)) break;
     lx::go_on_at(out, ahead);
@@ -90,32 +82,31 @@ lx::Copied append_shifting(const Codepage& cp, const Target<uint8_t>& to, const 
   return held;
 }
 
-lx::Copied first_chars(const Codepage& cp, Form form, const ByteText& text, size_t bytes, size_t most) {
-  return lx::read(cp, form, text, bytes, [&](const auto& in) {
-    Cursor at(in);
+lx::Part first_chars(const Codepage& cp, Form form, const ByteText& text, size_t bytes, size_t most) {
+  return lx::with_cursor(cp, form, text, bytes, [&](const auto& in) {
+    Walk at(in);
     size_t chars = 0;
     while (chars < most && at.next()) ++chars;
-    return lx::Copied{lx::room(in.p, at.in.p), chars};
+    return lx::Part{lx::room(in.p, at.in.p), chars};
   });
 }
 
-lx::Copied append(const Codepage& cp, Form form, const Target<uint8_t>& to, const ByteText& text,
-                  size_t bytes) {
+lx::Part append(const Codepage& cp, Form form, const Target<uint8_t>& to, const ByteText& text, size_t bytes) {
   if (form == Form::kEx && cp.shift_sensitive) return append_shifting(cp, to, text, bytes);
-  const lx::Copied old = lx::whole_chars(cp, form, to.p, to.state, to.used, to.used);
+  const lx::Part old = lx::whole_chars(cp, form, to.p, to.state, to.used, to.used);
   const size_t held = to.characters ? old.chars : old.units;
   if (held > to.most) return {0, 0};
   const size_t left = to.most - held;
-  const lx::Copied taken = to.characters
-                               ? first_chars(cp, form, text, bytes, left)
-                               : lx::whole_chars(cp, form, text.p, text.state, lx::least(bytes, left), bytes);
+  const lx::Part taken = to.characters
+                             ? first_chars(cp, form, text, bytes, left)
+                             : lx::whole_chars(cp, form, text.p, text.state, lx::least(bytes, left), bytes);
   move_units(to.p + old.units, text.p, taken.units);
   to.p[old.units + taken.units] = 0;
   return {old.units + taken.units + 1, old.chars + taken.chars + 1};
 }
 
 template <class Unit>
-lx::Copied append(const Codepage&, Form, const Target<Unit>& to, const Text<Unit>& text, size_t units) {
+lx::Part append(const Codepage&, Form, const Target<Unit>& to, const Text<Unit>& text, size_t units) {
   const size_t taken = lx::least(units, to.most - to.used);
   move_units(to.p + to.used, text.p, taken);
   to.p[to.used + taken] = 0;
@@ -135,8 +126,8 @@ int32_t concatenate(LXLocale* given, Form form, Unit* buffer, LXShiftState buffe
   size_t used = 0;
   while ((characters || used < most) && buffer[used] != 0) ++used;
   if (buffer[used] != 0) return call.exit(0);
-  const lx::Copied held = append(cp, form, Target<Unit>{buffer, buffer_state, used, most, characters}, text,
-                                 lx::units_of(cp, text, characters));
+  const lx::Part held = append(cp, form, Target<Unit>{buffer, buffer_state, used, most, characters}, text,
+                               lx::units_of(cp, text, characters));
   return call.exit(static_cast<int32_t>(characters ? held.chars : held.units));
 }
 

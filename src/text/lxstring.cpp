@@ -2,8 +2,8 @@
 // readers of a text; the doors at the end say what kind of text they take.
 #include <cstring>
 
-#include "text/lxcursor.h"
 #include "core/lxcall.h"
+#include "text/lxwalk.h"
 
 namespace {
 
@@ -12,11 +12,11 @@ using lx::ByteText;
 using lx::Call;
 using lx::Codepage;
 using lx::codepage_of;
-using lx::Cursor;
 using lx::Form;
 using lx::put_state;
 using lx::state_at;
 using lx::Text;
+using lx::Walk;
 
 RAS1_Unit unit = RAS1_UNIT("lxstring");
 
@@ -32,8 +32,8 @@ Result search(LXLocale* given, Form form, const Text<Unit>& text, const Text<Uni
   const bool characters = (flags & LX_CHARACTERS) != 0;
   const size_t units = lx::units_of(cp, text, characters);
   const size_t other_units = lx::units_of(cp, other, characters);
-  return lx::read(cp, form, text, units, [&](const auto& in) {
-    return body(call, in, lx::read_like(in, other.p, other_units, other.state));
+  return lx::with_cursor(cp, form, text, units, [&](const auto& in) {
+    return body(call, in, lx::like(in, other.p, other_units, other.state));
   });
 }
 
@@ -46,22 +46,22 @@ char* chars_of(const uint8_t* p) {
 }
 
 /// A character in a text.
-template <class Reader>
+template <class Cursor>
 struct Place {
-  const typename Reader::Unit* p;  // null: none
-  Reader in;                       // in its state
+  const typename Cursor::Unit* p;  // null: none
+  Cursor in;                       // in its state
 };
 
 // Characters, and sets of them.
 
 /// Leaves `at` at the character, or at the end.
-template <class Reader>
-bool find_code(Cursor<Reader>* at, LXWChar code, size_t units) {
+template <class Cursor>
+bool find_code(Walk<Cursor>* at, LXWChar code, size_t units) {
   while (at->next())
     if (at->value == code && at->units() == units) return true;
   return false;
 }
-bool find_code(Cursor<lx::SingleByteReader>* at, LXWChar code, size_t units) {
+bool find_code(Walk<lx::SingleByteCursor>* at, LXWChar code, size_t units) {
   const size_t bytes = lx::room(at->in.p, at->in.end);
   const void* found = bytes != 0 && units == 1 ? memchr(at->in.p, static_cast<int>(code), bytes) : nullptr;
   at->start = static_cast<const uint8_t*>(found);
@@ -76,7 +76,7 @@ Unit* find_character(LXLocale* given, Form form, const Text<Unit>& text, LXWChar
   Unit* const none = nullptr;
   return search(given, form, text, {text.p, 0}, flags, LX_CHARACTERS, none,
                 [&](Call& call, const auto& in, const auto&) {
-                  Cursor at(in);
+                  Walk at(in);
                   const bool found = find_code(&at, code, code_units);
                   if (!found && (code != 0 || text.length >= 0)) return call.exit(none);
                   put_state(state, state_at(at.in, text.state));
@@ -85,51 +85,51 @@ Unit* find_character(LXLocale* given, Form form, const Text<Unit>& text, LXWChar
 }
 
 /// The characters of a text: those of one unit below 256 as bits, the others where they stand.
-template <class Reader>
+template <class Cursor>
 class CharacterSet {
  public:
-  explicit CharacterSet(const Reader& text) : text_(text) {
-    for (Cursor<Reader> at(text); at.next();) {
+  explicit CharacterSet(const Cursor& text) : text_(text) {
+    for (Walk<Cursor> at(text); at.next();) {
       if (is_bit(at))
         bits_[at.value / 32] |= 1u << at.value % 32;
       else
         others_ = true;
     }
   }
-  bool holds(const Cursor<Reader>& character) const {
+  bool holds(const Walk<Cursor>& character) const {
     if (is_bit(character)) return (bits_[character.value / 32] >> character.value % 32 & 1) != 0;
     if (!others_) return false;
-    for (Cursor<Reader> at(text_); at.next();)
+    for (Walk<Cursor> at(text_); at.next();)
       if (at.same_as(character)) return true;
     return false;
   }
 
  private:
-  static bool is_bit(const Cursor<Reader>& c) { return c.value < 0x100 && c.units() == 1; }
-  Reader text_;
+  static bool is_bit(const Walk<Cursor>& c) { return c.value < 0x100 && c.units() == 1; }
+  Cursor text_;
   uint32_t bits_[8] = {};
   bool others_ = false;
 };
 
 /// Takes a shift byte that ends the text.
-bool take_last_shift(lx::ShiftReader* in) {
+bool take_last_shift(lx::ShiftCursor* in) {
   return in->end - in->p == 1 && lx::take_shift(in->cp, &in->p, &in->state);
 }
 
 /// The characters that a text begins with, `wanted` or not in a set.
-template <class Reader>
+template <class Cursor>
 struct Span {
-  Reader behind;
+  Cursor behind;
   size_t chars;
 };
 
-template <class Reader>
-Span<Reader> span(const Reader& text, const CharacterSet<Reader>& set, bool wanted) {
-  Span<Reader> taken{text, 0};
-  for (Cursor<Reader> at(text); at.next() && !at.holds_null() && set.holds(at) == wanted; ++taken.chars)
+template <class Cursor>
+Span<Cursor> span(const Cursor& text, const CharacterSet<Cursor>& set, bool wanted) {
+  Span<Cursor> taken{text, 0};
+  for (Walk<Cursor> at(text); at.next() && !at.holds_null() && set.holds(at) == wanted; ++taken.chars)
     lx::go_on_at(taken.behind, at.in);
-  if constexpr (lx::kShifts<Reader>) {
-    Reader& in = taken.behind;
+  if constexpr (Cursor::kShifts) {
+    Cursor& in = taken.behind;
     if (!take_last_shift(&in) && in.p < in.end && taken.chars != 0 && *in.p == in.cp.shift_in)
       lx::take_shift(in.cp, &in.p, &in.state);
   }
@@ -153,22 +153,22 @@ int32_t span_of_set(LXLocale* given, Form form, const Text<Unit>& text, const Te
 
 /// Overwrites the character that ends a token, with the shift byte before it; one that the end of the text cuts
 /// as far as it goes. Moves to the characters that follow.
-template <class Reader>
-void overwrite_delimiter(Reader* in) {
+template <class Cursor>
+void overwrite_delimiter(Cursor* in) {
   auto* const first = writable(in->p);
-  Cursor at(*in);
+  Walk at(*in);
   const bool whole = at.next();
   lx::go_on_at(*in, at.in);
   if (!whole) in->p = in->end;
   for (auto* p = first; p < in->p; ++p) *p = 0;
-  if constexpr (lx::kShifts<Reader>) take_last_shift(in);
+  if constexpr (Cursor::kShifts) take_last_shift(in);
 }
 
 /// Where the token begins, or null; `*rest` is left at the text that follows it.
-template <class Reader>
-Place<Reader> take_token(Reader* rest, const CharacterSet<Reader>& set) {
-  Reader start(*rest);
-  Span<Reader> token = span(start, set, false);
+template <class Cursor>
+Place<Cursor> take_token(Cursor* rest, const CharacterSet<Cursor>& set) {
+  Cursor start(*rest);
+  Span<Cursor> token = span(start, set, false);
   if (token.chars == 0 && token.behind.p < start.end) {
     lx::go_on_at(start, span(start, set, true).behind);
     lx::go_on_at(*rest, start);
@@ -250,57 +250,57 @@ Folded<LXUChar> folded(LXLocale* locale, LXUChar u, Fold fold) {
 }
 
 /// A candidate, whose characters end at `end`, and the substring by the locale's sort.
-template <class Reader>
-int32_t collate(LXLocale* locale, const Cursor<Reader>& at, const typename Reader::Unit* end,
-                const Reader& part, size_t part_units, uint32_t options) {
+template <class Cursor>
+int32_t collate(LXLocale* locale, const Walk<Cursor>& at, const typename Cursor::Unit* end, const Cursor& part,
+                size_t part_units, uint32_t options) {
   const auto length = static_cast<int32_t>(end - at.start);
   const auto part_length = static_cast<int32_t>(part_units);
-  if constexpr (lx::kShifts<Reader>)
+  if constexpr (Cursor::kShifts)
     return LXStrcollEx(locale, chars_of(at.start), at.in.state, length, chars_of(part.p), part.state,
                        part_length, options);
-  else if constexpr (std::is_same_v<Reader, lx::CodeReader>)
+  else if constexpr (std::is_same_v<Cursor, lx::CodeCursor>)
     return LXWcscoll(locale, at.start, length, part.p, part_length, options);
-  else if constexpr (std::is_same_v<Reader, lx::UnicodeReader>)
+  else if constexpr (Cursor::kUnicode)
     return LXStrcollU(locale, at.start, length, part.p, part_length, options);
   else
     return LXStrcoll(locale, chars_of(at.start), length, chars_of(part.p), part_length, options);
 }
 
-template <class Reader>
-bool begins_with(const Reader& text, const Reader& part) {
-  Cursor at(text);
-  for (Cursor wanted(part); wanted.next();)
+template <class Cursor>
+bool begins_with(const Cursor& text, const Cursor& part) {
+  Walk at(text);
+  for (Walk wanted(part); wanted.next();)
     if (!at.next() || !at.same_as(wanted)) return false;
   return true;
 }
 
-template <class Reader>
-Place<Reader> find_exactly(const Reader& text, const Reader& part) {
-  Cursor first(part);
+template <class Cursor>
+Place<Cursor> find_exactly(const Cursor& text, const Cursor& part) {
+  Walk first(part);
   if (!first.next()) return {text.p, text};
-  for (Cursor at(text); at.next();)
+  for (Walk at(text); at.next();)
     if (at.same_as(first) && begins_with(at.in, first.in)) return {at.start, at.in};
   return {nullptr, text};
 }
-Place<lx::SingleByteReader> find_exactly(const lx::SingleByteReader& text, const lx::SingleByteReader& part) {
+Place<lx::SingleByteCursor> find_exactly(const lx::SingleByteCursor& text, const lx::SingleByteCursor& part) {
   const void* found = memmem(text.p, lx::room(text.p, text.end), part.p, lx::room(part.p, part.end));
   return {static_cast<const uint8_t*>(found), text};
 }
 
 /// `*code` receives the error of a comparison that failed.
-template <class Reader>
-Place<Reader> find_folded(LXLocale* locale, const Reader& text, const Reader& part, Fold fold, uint32_t options,
+template <class Cursor>
+Place<Cursor> find_folded(LXLocale* locale, const Cursor& text, const Cursor& part, Fold fold, uint32_t options,
                           int32_t* code) {
-  Cursor last(part);
+  Walk last(part);
   if (!last.next()) return {text.p, text};
   const auto wanted = folded(locale, last.value, fold);
   // Fewer characters than the substring has are no candidate: one cursor runs ahead, to the last one of each.
-  Cursor ahead(text);
+  Walk ahead(text);
   while (last.next())
     if (!ahead.next()) return {nullptr, text};
   const size_t part_units = lx::room(part.p, last.in.p);
   enum Answer : uint8_t { kUnknown, kNo, kYes } answers[0x100] = {};
-  for (Cursor at(text); ahead.next() && at.next();) {
+  for (Walk at(text); ahead.next() && at.next();) {
     Answer answer = kUnknown;
     Answer& kept = at.value < 0x100 ? answers[at.value] : answer;
     if (kept == kUnknown) kept = folded(locale, at.value, fold).same_as(wanted) ? kYes : kNo;
@@ -314,8 +314,8 @@ Place<Reader> find_folded(LXLocale* locale, const Reader& text, const Reader& pa
 }
 
 /// In a single-byte codepage without regard to case: at every place.
-Place<lx::SingleByteReader> find_by_comparison(LXLocale* locale, const lx::SingleByteReader& text,
-                                               const lx::SingleByteReader& part, int32_t* code) {
+Place<lx::SingleByteCursor> find_by_comparison(LXLocale* locale, const lx::SingleByteCursor& text,
+                                               const lx::SingleByteCursor& part, int32_t* code) {
   const auto bytes = static_cast<int32_t>(part.end - part.p);
   for (const uint8_t* p = text.p; text.end - p >= bytes; ++p) {
     const int32_t difference =
@@ -327,15 +327,15 @@ Place<lx::SingleByteReader> find_by_comparison(LXLocale* locale, const lx::Singl
   return {nullptr, text};
 }
 
-template <class Reader>
-Place<Reader> find_part(LXLocale* locale, const Reader& text, const Reader& part, uint32_t options,
+template <class Cursor>
+Place<Cursor> find_part(LXLocale* locale, const Cursor& text, const Cursor& part, uint32_t options,
                         int32_t* code) {
   if (part.p == part.end) return {text.p, text};
   // Between shift bytes characters count: bytes do not tell which text is longer.
-  if (!lx::kShifts<Reader> && part.end - part.p > text.end - text.p) return {nullptr, text};
+  if (!Cursor::kShifts && part.end - part.p > text.end - text.p) return {nullptr, text};
   const Fold fold = fold_of(options);
   if (fold == Fold::kNone) return find_exactly(text, part);
-  if constexpr (std::is_same_v<Reader, lx::SingleByteReader>)
+  if constexpr (std::is_same_v<Cursor, lx::SingleByteCursor>)
     return fold == Fold::kCase ? find_by_comparison(locale, text, part, code) : find_exactly(text, part);
   else
     return find_folded(locale, text, part, fold, options & LX_WIDTH_INSENSITIVE, code);
@@ -358,7 +358,7 @@ template <class Unit>
 int32_t length_of(LXLocale* given, const Unit* text) {
   Call call(unit, given);
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, 0);
-  return call.exit(static_cast<int32_t>(lx::units_with_null(text) - 1));
+  return call.exit(static_cast<int32_t>(lx::units_before_null(text)));
 }
 
 }  // namespace

@@ -2,10 +2,10 @@
 // end of a string in a stateful codepage.
 #include <cstring>
 
-#include "codepage/lxcopy.h"
-#include "text/lxcursor.h"
+#include "codepage/lxtext.h"
 #include "core/lxcall.h"
 #include "locale/lxlocale.h"
+#include "text/lxwalk.h"
 
 namespace {
 
@@ -13,8 +13,8 @@ using lx::bytes_of;
 using lx::Call;
 using lx::Codepage;
 using lx::codepage_of;
-using lx::Cursor;
 using lx::Form;
+using lx::Walk;
 
 RAS1_Unit unit = RAS1_UNIT("lxtruncate");
 
@@ -53,9 +53,9 @@ size_t cut_single_bytes(const uint8_t* text, size_t size, const Blanks& blanks) 
 }
 
 /// The same of characters of several bytes: `in` reads the `size` - 1 bytes before the place of the null.
-template <class Reader>
-size_t cut_characters(const Reader& in, const Blanks& blanks, const Words& words) {
-  Cursor<Reader> at(in);
+template <class Cursor>
+size_t cut_characters(const Cursor& in, const Blanks& blanks, const Words& words) {
+  Walk<Cursor> at(in);
   const uint8_t* run = nullptr;  // the first of the blanks that end what was read
   while (at.next()) {
     if (!blanks.dropped) continue;
@@ -93,7 +93,7 @@ size_t truncate(LXLocale* locale, Form form, uint8_t* text, LXShiftState state, 
     text[0] = 0;
     return 1;
   }
-  const size_t bytes = lx::units_with_null(text) - 1;
+  const size_t bytes = lx::units_before_null(text);
   size_t size = static_cast<size_t>(given);
   if ((flags & LX_CHARACTERS) != 0) size = size_in_bytes(cp, text, state, bytes, given);
   const Blanks blanks(locale, flags);
@@ -105,8 +105,8 @@ size_t truncate(LXLocale* locale, Form form, uint8_t* text, LXShiftState state, 
     end = cut_single_bytes(text, size, blanks);
   } else {
     const Words& words = form == Form::kEx && cp.shift_sensitive ? kExWords : kPlainWords;
-    end = lx::read_bytes(cp, form, state, text, size - 1,
-                         [&](const auto& in) { return cut_characters(in, blanks, words); });
+    end = lx::with_cursor(cp, form, state, text, size - 1,
+                          [&](const auto& in) { return cut_characters(in, blanks, words); });
   }
   text[end] = 0;
   return end + 1;

@@ -1,0 +1,237 @@
+// Text as it is read: a cursor for each kind. Bytes come in four kinds: single-byte, UTF-8, multibyte (by
+// lead-byte lengths) and shift-stateful; beside them stand packed codes and 16-bit Unicode. With the sinks
+// these are the only places that know lead bytes, shift bytes and units; an algorithm is a template over them.
+//
+//   p, end     the place, and where the text ends
+//   pass()     passes a character: its units. 0 at the end of the text, with p == end, and before a character
+//   that
+//              the end cuts, with p < end
+//   next(&v)   passes a character and gives its Unicode value or its packed code; false where pass() gives 0
+//   Value      what a character is told by where text is compared: its packed code, or its 16-bit unit
+//   kOneUnit   every unit is a character
+//   kShifts    the text has shift states; `state` is that of the character passed last
+//   kUnicode   the units are Unicode values
+//   kRuns      read_run() gives the Unicode values of many characters at once, the ones that next() would give.
+//   It
+//              stops before a block of characters below `below` (0: never), because those are copied. When it
+//              gives none, next() decides what stands there
+//
+// A cursor is small: to look ahead, copy it, and go_on_at() the copy to take what it found.
+#pragma once
+
+#include "codepage/lxblock.h"
+#include "codepage/lxcodepage.h"
+#include "codepage/lxlength.h"
+
+namespace lx {
+
+inline constexpr unsigned kAnySame = 0x10000;  // same_below() of 16-bit Unicode
+
+struct SingleByteCursor {
+  using Unit = uint8_t;
+  using Value = LXWChar;
+  static constexpr bool kOneUnit = true, kShifts = false, kUnicode = false, kRuns = true;
+  const Codepage& cp;
+  const uint8_t* p;
+  const uint8_t* end;
+
+  static SingleByteCursor over(const Codepage& cp, const Unit* p, size_t units, LXShiftState) {
+    return {cp, p, p + units};
+  }
+  unsigned same_below() const { return cp.same_below; }
+  void decode(Unit unit, LXUChar* u) const { *u = cp.unicode[unit]; }
+  void decode(Unit unit, LXWChar* code) const { *code = unit; }
+  size_t read_run(LXUChar* values, size_t most, unsigned below);
+  size_t pass() {
+    if (p == end) return 0;
+    ++p;
+    return 1;
+  }
+  template <class V>
+  bool next(V* value) {
+    if (p == end) return false;
+    decode(*p++, value);
+    return true;
+  }
+};
+
+/// Multibyte text by lead-byte lengths; where UTF-8 is computed, by its formula.
+template <bool kUtf8>
+struct LeadByteCursor {
+  using Unit = uint8_t;
+  using Value = LXWChar;
+  static constexpr bool kOneUnit = false, kShifts = false, kUnicode = false, kRuns = true;
+  const Codepage& cp;
+  const uint8_t* p;
+  const uint8_t* end;
+
+  static LeadByteCursor over(const Codepage& cp, const Unit* p, size_t units, LXShiftState) {
+    return {cp, p, p + units};
+  }
+  unsigned same_below() const { return cp.same_below; }
+  void decode(const uint8_t* c, size_t length, LXUChar* u) const {
+    *u = length == 1 ? cp.unicode[*c] : kUtf8 ? utf8_unicode(c) : row_unicode(cp, c);
+  }
+  void decode(const uint8_t* c, size_t length, LXWChar* code) const { *code = pack(c, length); }
+  size_t read_run(LXUChar* values, size_t most, unsigned below);
+  size_t pass() {
+    if (p == end) return 0;
+    const size_t length = cp.length(*p);
+    if (length > room(p, end)) return 0;
+    p += length;
+    return length;
+  }
+  template <class V>
+  bool next(V* value) {
+    if (p == end) return false;
+    if (kUtf8 && *p < cp.same_below) {  // apart: the next character does not wait for the length of this one
+      *value = *p++;
+      return true;
+    }
+    const size_t length = pass();
+    if (length == 0) return false;
+    decode(p - length, length, value);
+    return true;
+  }
+};
+using Utf8Cursor = LeadByteCursor<true>;
+using MultiByteCursor = LeadByteCursor<false>;
+template <>
+size_t Utf8Cursor::read_run(LXUChar* values, size_t most, unsigned below);
+template <>
+size_t MultiByteCursor::read_run(LXUChar* values, size_t most, unsigned below);
+
+/// One shift byte before a character is eaten, also when the end cuts the character; a second one in a row is a
+/// character. A shift byte at the very end ends the text.
+struct ShiftCursor {
+  using Unit = uint8_t;
+  using Value = LXWChar;
+  static constexpr bool kOneUnit = false, kShifts = true, kUnicode = false, kRuns = true;
+  const Codepage& cp;
+  const uint8_t* p;
+  const uint8_t* end;
+  LXShiftState state;
+
+  static ShiftCursor over(const Codepage& cp, const Unit* p, size_t units, LXShiftState state) {
+    return {cp, p, p + units, state};
+  }
+  unsigned same_below() const { return 0; }
+  void decode(const uint8_t* c, LXUChar* u) const {
+    *u = state == LX_SHIFT_DOUBLE ? row_unicode(cp, c) : cp.unicode[*c];
+  }
+  void decode(const uint8_t* c, LXWChar* code) const { *code = pack(c, cp.width_in(state)); }
+  size_t read_run(LXUChar* values, size_t most, unsigned below);
+  /// Passes a shift byte, if one stands here.
+  bool pass_shift() { return p != end && take_shift(cp, &p, &state); }
+  /// The same where nothing follows it.
+  bool pass_last_shift() { return room(p, end) == 1 && pass_shift(); }
+  size_t pass() {
+    pass_shift();
+    const size_t length = cp.width_in(state);
+    if (length > room(p, end)) return 0;
+    p += length;
+    return length;
+  }
+  template <class V>
+  bool next(V* value) {
+    const size_t length = pass();
+    if (length == 0) return false;
+    decode(p - length, value);
+    return true;
+  }
+};
+
+struct CodeCursor {
+  using Unit = LXWChar;
+  using Value = LXWChar;
+  static constexpr bool kOneUnit = true, kShifts = false, kUnicode = false, kRuns = false;
+  const Codepage& cp;
+  const LXWChar* p;
+  const LXWChar* end;
+
+  static CodeCursor over(const Codepage& cp, const Unit* p, size_t units, LXShiftState) {
+    return {cp, p, p + units};
+  }
+  void decode(Unit unit, LXUChar* u) const { *u = code_to_unicode(cp, unit); }
+  void decode(Unit unit, LXWChar* code) const { *code = unit; }
+  size_t pass() {
+    if (p == end) return 0;
+    ++p;
+    return 1;
+  }
+  template <class V>
+  bool next(V* value) {
+    if (p == end) return false;
+    decode(*p++, value);
+    return true;
+  }
+};
+
+struct UnicodeCursor {
+  using Unit = LXUChar;
+  using Value = LXUChar;
+  static constexpr bool kOneUnit = true, kShifts = false, kUnicode = true, kRuns = true;
+  const LXUChar* p;
+  const LXUChar* end;
+
+  static UnicodeCursor over(const Codepage&, const Unit* p, size_t units, LXShiftState) {
+    return {p, p + units};
+  }
+  unsigned same_below() const { return kAnySame; }
+  void decode(Unit unit, LXUChar* u) const { *u = unit; }
+  /// How many of `most` units stand before a block of units below `below`.
+  size_t run_units(size_t most, unsigned below) const {
+    size_t n = 0;
+    while (most - n >= kBlock && (n == 0 || below == 0 || !is_same_block(p + n, below))) n += kBlock;
+    return most - n < kBlock ? most : n;
+  }
+  size_t pass() {
+    if (p == end) return 0;
+    ++p;
+    return 1;
+  }
+  bool next(LXUChar* u) {
+    if (p == end) return false;
+    *u = *p++;
+    return true;
+  }
+};
+
+/// Takes over the place, and the shift state, from a copy that has gone on; of cursors and of sinks.
+template <class Text>
+inline void go_on_at(Text& text, const Text& place) {
+  text.p = place.p;
+  if constexpr (Text::kShifts) text.state = place.state;
+}
+
+/// A cursor like another one, over another text. Made of its parts: a copy of what was just stored in parts
+/// would wait for the stores.
+template <class Cursor>
+inline Cursor like(const Cursor& first, const typename Cursor::Unit* p, size_t units, LXShiftState state) {
+  return Cursor::over(first.cp, p, units, state);
+}
+inline UnicodeCursor like(const UnicodeCursor&, const LXUChar* p, size_t units, LXShiftState) {
+  return {p, p + units};
+}
+
+/// Passes all characters that are left: how many they are.
+template <class Cursor>
+size_t pass_all(Cursor* in) {
+  size_t chars = 0;
+  if constexpr (Cursor::kOneUnit) {
+    chars = room(in->p, in->end);
+    in->p = in->end;
+  } else {
+    while (in->pass() != 0) ++chars;
+  }
+  return chars;
+}
+
+/// The state at a place of a text; of a text without shift bytes the one that was given.
+template <class Cursor>
+LXShiftState state_at(const Cursor& at, LXShiftState given) {
+  if constexpr (Cursor::kShifts) return at.state;
+  return given;
+}
+
+}  // namespace lx

@@ -1,0 +1,83 @@
+// Counts of characters and bytes, and how much of a text fits.
+#include "codepage/lxtext.h"
+
+namespace lx {
+namespace {
+
+/// Passes a character as LX_CHARACTERS counts it, with the shift bytes on both sides: false, with nothing
+/// passed, at the end and before a character that it cuts.
+template <class Cursor>
+bool pass_counted(Cursor* in) {
+  if constexpr (Cursor::kShifts) {
+    Cursor ahead(*in);
+    if (ahead.pass() == 0) return false;
+    ahead.pass_shift();
+    go_on_at(*in, ahead);
+    return true;
+  } else {
+    return in->pass() != 0;
+  }
+}
+
+}  // namespace
+
+size_t bytes_of_chars(const Codepage& cp, const uint8_t* text, LXShiftState state, int32_t chars, size_t most) {
+  const size_t bytes = least(most, room<uint8_t>(text, no_end<const uint8_t>()));
+  return with_cursor(cp, Form::kEx, state, text, bytes, [&](auto in) {
+    for (int32_t left = chars; left > 0 && pass_counted(&in);) --left;
+    return room(text, in.p);
+  });
+}
+
+int32_t chars_counted(const Codepage& cp, const uint8_t* text, LXShiftState state, size_t bytes) {
+  return with_cursor(cp, Form::kEx, state, text, bytes, [](auto in) {
+    int32_t chars = 0;
+    while (pass_counted(&in)) ++chars;
+    return chars;
+  });
+}
+
+int32_t chars_in_bytes(const Codepage& cp, const uint8_t* text, LXShiftState state, size_t bytes) {
+  return with_cursor(cp, Form::kEx, state, text, bytes,
+                     [](auto in) { return static_cast<int32_t>(pass_all(&in)); });
+}
+
+Part whole_chars(const Codepage& cp, Form form, const uint8_t* text, LXShiftState state, size_t bytes,
+                 size_t text_bytes) {
+  return with_cursor(cp, form, state, text, bytes, [&](auto in) {
+    size_t chars = 0;
+    for (auto ahead(in); ahead.pass() != 0; go_on_at(in, ahead)) ++chars;
+    if constexpr (decltype(in)::kShifts)
+      if (in.p < in.end && cp.is_shift(*in.p) && (*in.p == cp.shift_in || in.p + 1 == text + text_bytes))
+        ++in.p;
+    return Part{room(text, in.p), chars};
+  });
+}
+
+Part copy_chars(const Codepage& cp, Form form, LXShiftState state, const uint8_t* text, size_t bytes,
+                size_t chars, uint8_t* out) {
+  return with_cursor(cp, form, state, text, bytes, [&](auto in) {
+    size_t n = 0;
+    while (n < chars && in.pass() != 0) ++n;
+    size_t copied = room(text, in.p);
+    memcpy(out, text, copied);
+    if (state_at(in, LX_SHIFT_SINGLE) == LX_SHIFT_DOUBLE && copied != 0) out[copied++] = cp.shift_in;
+    return Part{copied, n};
+  });
+}
+
+Part part_that_fits(const Codepage& cp, Form form, const ByteText& text, int32_t size, bool characters) {
+  if (size < 1 || text.length == 0) return {0, 0};
+  const size_t given = text_units_with_null(text.p, text.length);
+  const size_t wanted = static_cast<size_t>(size);
+  if (!characters) return whole_chars(cp, form, text.p, text.state, least(given, wanted), given);
+  const bool to_null = text.length < 0;
+  const size_t there = to_null ? static_cast<size_t>(chars_in_bytes(cp, text.p, text.state, given)) : given;
+  if (to_null && there <= wanted) return {given, there};  // nothing behind the null is looked at
+  const size_t chars = least(there, wanted);
+  // Two shift bytes side by side may be counted as a character; the null still ends the text.
+  const size_t most = to_null ? given : SIZE_MAX;
+  return {bytes_of_chars(cp, text.p, text.state, static_cast<int32_t>(chars), most), chars};
+}
+
+}  // namespace lx

@@ -1,0 +1,110 @@
+// Characters moved from a cursor to a sink.
+#pragma once
+
+#include "codepage/lxtext.h"
+
+namespace lx {
+
+inline constexpr size_t kRunChars = 128;      // moved at a time through a buffer on the stack
+inline constexpr size_t kRunUnits = 48;       // of shorter texts the characters are moved one by one
+inline constexpr size_t kShiftRunUnits = 16;  // the same where shift states are kept
+
+/// Why a transfer of characters stopped.
+enum class Stop { kInputEnd, kInputCut, kOutputFull, kCount };
+
+template <class Value>
+struct Transfer {
+  Stop stop;
+  size_t chars;  // written
+  Value held;    // kOutputFull: the character that was read and did not fit
+};
+
+/// What both sides have the same below.
+template <class Cursor, class Sink>
+inline unsigned same_below(const Cursor& in, const Sink& out) {
+  return in.same_below() < out.same_below() ? in.same_below() : out.same_below();
+}
+
+/// Moves the characters that fit for certain, as Unicode values: how many they were. Not inline: the loops of
+/// transfer(), which short texts take, stay small.
+template <class Cursor, class Sink>
+[[gnu::noinline]] size_t move_runs(Cursor& in, Sink& out, size_t count, unsigned below) {
+  size_t left = count;
+  for (;;) {
+    size_t n = 0;
+    if (below != 0) {
+      n = copy_same_blocks(out.p, in.p, least(left, room(in.p, in.end), room(out.p, out.end)), below);
+      in.p += n;
+      out.p += n;
+      left -= n;
+    }
+    if constexpr (Sink::kUnicode) {
+      n = in.read_run(out.p, least(left, room(out.p, out.end)), below);
+      out.p += n;
+    } else if constexpr (Cursor::kUnicode) {
+      n = least(left, room(in.p, in.end), room(out.p, out.end) / out.most_units());
+      n = in.run_units(least(n, kRunChars), below);
+      out.put_run(in.p, n);
+      in.p += n;
+    } else {
+      LXUChar values[kRunChars];
+      n = in.read_run(values, least(left, kRunChars, room(out.p, out.end) / out.most_units()), below);
+      out.put_run(values, n);
+    }
+    if (n == 0) return count - left;
+    left -= n;
+  }
+}
+
+/// Moves characters from a cursor to a sink, at most `count` of them, as Unicode values or as packed codes.
+template <class Value, class Cursor, class Sink>
+inline Transfer<Value> transfer(Cursor& in, Sink& out, size_t count) {
+  // Units that stay what they are need no runs of equal ones.
+  constexpr bool kRuns = Cursor::kRuns && Sink::kRuns && !(Cursor::kUnicode && Sink::kUnicode);
+  size_t left = count;
+  unsigned below = 0;
+  if constexpr (kRuns) {
+    below = same_below(in, out);
+    constexpr bool kShift = Cursor::kShifts || Sink::kShifts;
+    if (room(in.p, in.end) >= (kShift ? kShiftRunUnits : kRunUnits)) {
+      // On copies: what other functions see in memory cannot stay in registers below.
+      Cursor long_in = in;
+      Sink long_out = out;
+      left -= move_runs(long_in, long_out, left, below);
+      go_on_at(in, long_in);
+      go_on_at(out, long_out);
+    }
+  }
+  if constexpr (Cursor::kOneUnit && Sink::kOneUnit) {
+    const size_t n = least(left, room(in.p, in.end), room(out.p, out.end));
+    const auto* const from = in.p;
+    auto* const to = out.p;
+    for (size_t i = 0; i < n; ++i) {
+      Value value{};
+      in.decode(from[i], &value);
+      to[i] = out.encode(value);
+    }
+    in.p += n;
+    out.p += n;
+    left -= n;
+  }
+  Value value{};
+  for (;;) {
+    if constexpr (kRuns && !(Cursor::kOneUnit && Sink::kOneUnit)) {
+      if (below != 0) {
+        const size_t n = copy_same(out.p, in.p, least(left, room(in.p, in.end), room(out.p, out.end)), below);
+        in.p += n;
+        out.p += n;
+        left -= n;
+      }
+    }
+    do {
+      if (!in.next(&value)) return {in.p == in.end ? Stop::kInputEnd : Stop::kInputCut, count - left, value};
+      if (left == 0) return {Stop::kCount, count, value};
+      if (!out.put(value)) return {Stop::kOutputFull, count - left, value};
+      --left;
+    } while (value >= below);
+  }
+}
+
+}  // namespace lx
