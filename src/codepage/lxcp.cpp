@@ -23,29 +23,27 @@ char* same(const uint8_t* text) {
 }
 
 /// Calls `body` with the cursor of a text whose end is not known: by lead bytes, or where the codepage has them
-/// by shift bytes.
+/// by shift bytes, of which one that stands here is passed.
 template <class Body>
-auto with_char(const Primitive& in, const char* text, Body body) {
+auto at_char(const Primitive& in, const char* text, Body body) {
   return body(MultiByteCursor{in.cp(), bytes_of(text), lx::no_end<const uint8_t>()});
 }
 template <class Body>
-auto with_char(const Primitive& in, const char* text, LXShiftState state, Body body) {
-  if (!in.shift_sensitive()) return with_char(in, text, body);
-  return body(ShiftCursor{in.cp(), bytes_of(text), lx::no_end<const uint8_t>(), state});
+auto at_char(const Primitive& in, const char* text, LXShiftState state, Body body) {
+  if (!in.shift_sensitive()) return at_char(in, text, body);
+  const uint8_t* p = bytes_of(text);
+  lx::take_shift(in.cp(), &p, &state);
+  return body(ShiftCursor{in.cp(), p, lx::no_end<const uint8_t>(), state});
 }
 
-constexpr auto kCode = [](auto at) {
-  LXWChar code = 0;
-  at.next(&code);
-  return code;
-};
-constexpr auto kBytes = [](auto at) { return static_cast<int32_t>(at.pass()); };
+constexpr auto kCode = [](const auto& at) { return LXWChar{lx::pack(at.p, at.length())}; };
+constexpr auto kBytes = [](const auto& at) { return static_cast<int32_t>(at.length()); };
 
 /// Lead bytes can only be told from the front.
 char* previous_char(const Primitive& in, const char* start, const char* current) {
   if (in.single_byte()) return same(current - 1);
   const uint8_t* last = bytes_of(start);
-  for (MultiByteCursor at{in.cp(), last, bytes_of(current)}; at.pass() != 0 && at.p < at.end;) last = at.p;
+  for (MultiByteCursor at{in.cp(), last, bytes_of(current)}; at.pass() && at.p < at.end;) last = at.p;
   return same(last);
 }
 
@@ -89,12 +87,12 @@ extern "C" {
 
 LXWChar LXGetChar(LXLocale* locale, const char* text) {
   const Primitive in(locale);
-  return in ? with_char(in, text, kCode) : 0;
+  return in ? at_char(in, text, kCode) : 0;
 }
 
 LXWChar LXGetCharEx(LXLocale* locale, const char* text, LXShiftState state) {
   const Primitive in(locale);
-  return in ? with_char(in, text, state, kCode) : 0;
+  return in ? at_char(in, text, state, kCode) : 0;
 }
 
 int32_t LXPutChar(LXLocale* locale, char* text, LXWChar code) {
@@ -113,15 +111,15 @@ void LXPutCharEx(LXLocale* locale, char* text, LXShiftState state, LXWChar code)
 
 char* LXNextChar(LXLocale* locale, const char* text) {
   const Primitive in(locale);
-  return same(in ? text + with_char(in, text, kBytes) : text);
+  return same(in ? text + at_char(in, text, kBytes) : text);
 }
 
 char* LXNextCharEx(LXLocale* locale, const char* text, LXShiftState state, LXShiftState* new_state, int32_t) {
   const Primitive in(locale);
   lx::put_state(new_state, state);
   if (!in) return same(text);
-  return with_char(in, text, state, [&](auto at) {
-    at.pass();
+  return at_char(in, text, state, [&](auto at) {
+    at.p += at.length();
     if constexpr (decltype(at)::kShifts) at.pass_shift();
     lx::put_state(new_state, lx::state_at(at, state));
     return same(at.p);
@@ -194,7 +192,7 @@ int32_t LXValidCharEx(LXLocale* locale, const char* text, LXShiftState state) {
 
 int32_t LXByteLength(LXLocale* locale, const char* text) {
   const Primitive in(locale);
-  return in ? with_char(in, text, kBytes) : 0;
+  return in ? at_char(in, text, kBytes) : 0;
 }
 
 int32_t LXByteLengthW(LXLocale* locale, LXWChar code) {
@@ -204,7 +202,7 @@ int32_t LXByteLengthW(LXLocale* locale, LXWChar code) {
 
 int32_t LXByteLengthEx(LXLocale* locale, const char* text, LXShiftState state) {
   const Primitive in(locale);
-  return in ? with_char(in, text, state, kBytes) : 0;
+  return in ? at_char(in, text, state, kBytes) : 0;
 }
 
 int32_t LXStrByteLength(LXWChar code) {

@@ -2,19 +2,16 @@
 // lead-byte lengths) and shift-stateful; beside them stand packed codes and 16-bit Unicode. With the sinks
 // these are the only places that know lead bytes, shift bytes and units; an algorithm is a template over them.
 //
-//   p, end     the place, and where the text ends
-//   pass()     passes a character: its units. 0 at the end of the text, with p == end, and before a character
-//   that
-//              the end cuts, with p < end
-//   next(&v)   passes a character and gives its Unicode value or its packed code; false where pass() gives 0
-//   Value      what a character is told by where text is compared: its packed code, or its 16-bit unit
-//   kOneUnit   every unit is a character
-//   kShifts    the text has shift states; `state` is that of the character passed last
-//   kUnicode   the units are Unicode values
-//   kRuns      read_run() gives the Unicode values of many characters at once, the ones that next() would give.
-//   It
-//              stops before a block of characters below `below` (0: never), because those are copied. When it
-//              gives none, next() decides what stands there
+// p, end: the place, and where the text ends.
+// pass(): passes a character; `units` are those it takes, without a shift byte. False at the end of the text,
+//   with p == end, and before a character that the end cuts, with p < end.
+// next(): passes a character and gives its Unicode value or its packed code.
+// Value: what tells a character where text is compared: its packed code, or its 16-bit unit.
+// kOneUnit: every unit is a character. kUnicode: the units are Unicode values.
+// kShifts: the text has shift states; `state` is that of the character passed last.
+// kRuns: read_run() gives the Unicode values of many characters at once, the ones that next() would give. It
+//   stops before a block of characters below `below` (0: never), because those are copied. Where it gives none,
+//   next() decides what stands there.
 //
 // A cursor is small: to look ahead, copy it, and go_on_at() the copy to take what it found.
 #pragma once
@@ -42,10 +39,10 @@ struct SingleByteCursor {
   void decode(Unit unit, LXUChar* u) const { *u = cp.unicode[unit]; }
   void decode(Unit unit, LXWChar* code) const { *code = unit; }
   size_t read_run(LXUChar* values, size_t most, unsigned below);
-  size_t pass() {
-    if (p == end) return 0;
+  bool pass() {
+    if (p == end) return false;
     ++p;
-    return 1;
+    return true;
   }
   template <class V>
   bool next(V* value) {
@@ -74,12 +71,18 @@ struct LeadByteCursor {
   }
   void decode(const uint8_t* c, size_t length, LXWChar* code) const { *code = pack(c, length); }
   size_t read_run(LXUChar* values, size_t most, unsigned below);
-  size_t pass() {
-    if (p == end) return 0;
-    const size_t length = cp.length(*p);
-    if (length > room(p, end)) return 0;
-    p += length;
-    return length;
+  /// Of the character here, wherever the text ends.
+  size_t length() const { return cp.length(*p); }
+  bool pass() {
+    size_t units;
+    return pass(&units);
+  }
+  bool pass(size_t* units) {
+    if (p == end) return false;
+    *units = length();
+    if (*units > room(p, end)) return false;
+    p += *units;
+    return true;
   }
   template <class V>
   bool next(V* value) {
@@ -88,8 +91,8 @@ struct LeadByteCursor {
       *value = *p++;
       return true;
     }
-    const size_t length = pass();
-    if (length == 0) return false;
+    size_t length;
+    if (!pass(&length)) return false;
     decode(p - length, length, value);
     return true;
   }
@@ -121,21 +124,27 @@ struct ShiftCursor {
   }
   void decode(const uint8_t* c, LXWChar* code) const { *code = pack(c, cp.width_in(state)); }
   size_t read_run(LXUChar* values, size_t most, unsigned below);
+  /// Of the character here, wherever the text ends; a shift byte before it has been passed.
+  size_t length() const { return cp.width_in(state); }
   /// Passes a shift byte, if one stands here.
   bool pass_shift() { return p != end && take_shift(cp, &p, &state); }
   /// The same where nothing follows it.
   bool pass_last_shift() { return room(p, end) == 1 && pass_shift(); }
-  size_t pass() {
-    pass_shift();
-    const size_t length = cp.width_in(state);
-    if (length > room(p, end)) return 0;
-    p += length;
-    return length;
+  bool pass() {
+    size_t units;
+    return pass(&units);
+  }
+  bool pass(size_t* units) {
+    if (p == end || (take_shift(cp, &p, &state) && p == end)) return false;
+    *units = length();
+    if (*units > room(p, end)) return false;
+    p += *units;
+    return true;
   }
   template <class V>
   bool next(V* value) {
-    const size_t length = pass();
-    if (length == 0) return false;
+    size_t length;
+    if (!pass(&length)) return false;
     decode(p - length, value);
     return true;
   }
@@ -154,10 +163,10 @@ struct CodeCursor {
   }
   void decode(Unit unit, LXUChar* u) const { *u = code_to_unicode(cp, unit); }
   void decode(Unit unit, LXWChar* code) const { *code = unit; }
-  size_t pass() {
-    if (p == end) return 0;
+  bool pass() {
+    if (p == end) return false;
     ++p;
-    return 1;
+    return true;
   }
   template <class V>
   bool next(V* value) {
@@ -185,10 +194,10 @@ struct UnicodeCursor {
     while (most - n >= kBlock && (n == 0 || below == 0 || !is_same_block(p + n, below))) n += kBlock;
     return most - n < kBlock ? most : n;
   }
-  size_t pass() {
-    if (p == end) return 0;
+  bool pass() {
+    if (p == end) return false;
     ++p;
-    return 1;
+    return true;
   }
   bool next(LXUChar* u) {
     if (p == end) return false;
@@ -222,7 +231,7 @@ size_t pass_all(Cursor* in) {
     chars = room(in->p, in->end);
     in->p = in->end;
   } else {
-    while (in->pass() != 0) ++chars;
+    while (in->pass()) ++chars;
   }
   return chars;
 }

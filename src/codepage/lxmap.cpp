@@ -150,9 +150,9 @@ int32_t find_special(Text* text, const Mapper& mapper, const Specials& specials,
   const uint16_t u = mapper.unicode(*c);
   int32_t count = specials.find(u, 0, &results[0], &results[1]);
   if (count != 0) return count;
-  Text ahead = *text;
+  typename Text::Cursor ahead(text->in);
   typename Text::Char next;
-  if (!ahead.take(&next)) return 0;
+  if (!Text::take_from(ahead, &next)) return 0;
   count = specials.find(u, mapper.unicode(next), &results[0], &results[1]);
   if (count != 0) text->skip_to(ahead, next, c);
   return count;
@@ -172,18 +172,20 @@ void map_all(Text& text, const Mapper& mapper, const SpecialFilter& filter, cons
     LXUChar results[2];
     const bool maybe = filter.any() && filter.may_begin(mapper.unicode(c));
     const int32_t count = maybe ? find_special(&text, mapper, filter.specials(), &c, results) : 0;
-    typename Mapper::Value value{};
-    if (count != 0)
+    if (count != 0) {
       written = text.put(mapper.value(results[0]), c);
-    else
+      if (written) text.note_written(&c);
+      if (count == 2) written = written && text.put(mapper.value(results[1]), c);
+    } else {
+      typename Mapper::Value value{};
       written = mapper.alone(c, &value) ? text.put(value, c) : text.copy(c);
-    if (written) text.note_written(&c);
-    if (count == 2) written = written && text.put(mapper.value(results[1]), c);
+    }
     if (!written) {
       if constexpr (Mapper::kCase) text.pass_before();
       text.in.p = text.in.end;  // nothing that follows is passed through
       break;
     }
+    text.note_written(&c);
   }
   text.finish();
 }
@@ -274,7 +276,7 @@ int32_t map_bytes(LXLocale* given, char* output, int32_t size, const char* input
   return call.exit(chars);
 }
 
-/// Texts whose units are characters. `map(locale, cursor, sink, mode)` gives the end of the output.
+/// Texts whose units are characters. `map(locale, input, its end, output, its end, mode)` gives where it ends.
 template <class Unit, class Map>
 int32_t map_units(LXLocale* given, Unit* output, int32_t size, const Unit* input, int32_t length,
                   uint32_t given_mode, bool copies_without_mode, Map map) {
@@ -290,11 +292,9 @@ int32_t map_units(LXLocale* given, Unit* output, int32_t size, const Unit* input
     memmove(output, input, copied.units * sizeof(Unit));
     return call.exit(static_cast<int32_t>(copied.units));
   }
-  Unit* const out_end = lx::end_of(output, static_cast<size_t>(size));
   const size_t units = lx::text_units_with_null(input, length);
-  const Unit* const end = lx::with_kind<Unit>(cp, Form::kPlain, [&](auto kind) {
-    return map(*call.locale(), kind.cursor(cp, input, units), kind.sink(cp, output, out_end), mode);
-  });
+  const Unit* const end =
+      map(*call.locale(), input, input + units, output, lx::end_of(output, static_cast<size_t>(size)), mode);
   return call.exit(static_cast<int32_t>(end - output));
 }
 
@@ -372,23 +372,24 @@ int32_t LXMapStringEx(LXLocale* locale, char* output, int32_t size, const char* 
 
 int32_t LXMapStringW(LXLocale* locale, LXWChar* output, int32_t size, const LXWChar* input, int32_t length,
                      uint32_t mode) {
-  return map_units(
-      locale, output, size, input, length, mode, false,
-      [](const LXLocale& in, const lx::CodeCursor& from, const lx::CodeSink& to, const Mode& parsed) {
-        const SpecialFilter filter(*in.language, parsed.specials, parsed.upper);
-        return map_codepage(WideText{from, to}, filter, parsed);
-      });
+  const auto map = [](const LXLocale& in, const LXWChar* p, const LXWChar* end, LXWChar* out, LXWChar* out_end,
+                      const Mode& parsed) {
+    const Codepage& cp = codepage_of(*in.codepage);
+    const SpecialFilter filter(*in.language, parsed.specials, parsed.upper);
+    return map_codepage(WideText{{cp, p, end}, {cp, out, out_end}}, filter, parsed);
+  };
+  return map_units(locale, output, size, input, length, mode, false, map);
 }
 
 int32_t LXMapStringU(LXLocale* locale, LXUChar* output, int32_t size, const LXUChar* input, int32_t length,
                      uint32_t mode) {
-  return map_units(
-      locale, output, size, input, length, mode, true,
-      [](const LXLocale& in, const lx::UnicodeCursor& from, const lx::UnicodeSink& to, const Mode& parsed) {
-        UnicodeText text{from, to};
-        map_unicode(text, SpecialFilter(*in.language, parsed.specials, parsed.upper), parsed);
-        return text.out.p;
-      });
+  const auto map = [](const LXLocale& in, const LXUChar* p, const LXUChar* end, LXUChar* out, LXUChar* out_end,
+                      const Mode& parsed) {
+    UnicodeText text{{p, end}, {out, out_end}};
+    map_unicode(text, SpecialFilter(*in.language, parsed.specials, parsed.upper), parsed);
+    return text.out.p;
+  };
+  return map_units(locale, output, size, input, length, mode, true, map);
 }
 
 }  // extern "C"

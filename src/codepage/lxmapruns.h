@@ -72,8 +72,9 @@ inline uint16_t unicode_of(const LeadByteText& text, uint8_t byte) {
   return text.in.cp.unicode[byte];
 }
 
+/// Inline, so that the text stays in registers.
 template <class Text>
-void map_run(Text& text, const Runs& runs, const SpecialFilter& filter) {
+[[gnu::always_inline]] inline void map_run(Text& text, const Runs& runs, const SpecialFilter& filter) {
   const auto* const from = text.in.p;
   auto* const to = text.out.p;
   const size_t n = most_units(text);

@@ -51,23 +51,25 @@ inline bool put_copy(MultiByteSink& out, const ByteChar& c) {
 
 template <class CursorOf, class SinkOf, class CharOf, bool kRunsOf>
 struct MapText {
+  using Cursor = CursorOf;
   using Char = CharOf;
   static constexpr bool kRuns = kRunsOf;
-  CursorOf in;
+  Cursor in;
   SinkOf out;
 
-  bool take(Char* c) {
-    const size_t units = in.pass();
-    if (units == 0) return false;
-    c->set(in.p - units, units);
+  static bool take_from(Cursor& at, Char* c) {
+    const auto* const p = at.p;
+    if (!at.pass()) return false;
+    c->set(p, room(p, at.p));
     return true;
   }
+  bool take(Char* c) { return take_from(in, c); }
   template <class Value>
   bool put(Value value, const Char&) {
     return out.put(value);
   }
   bool copy(const Char& c) { return put_copy(out, c); }
-  void skip_to(const MapText& ahead, const Char&, Char*) { in.p = ahead.in.p; }
+  void skip_to(const Cursor& ahead, const Char&, Char*) { in.p = ahead.p; }
   void note_written(Char*) {}
   void pass_before() {}
   void finish() {}
@@ -95,6 +97,7 @@ struct ShiftChar : ByteChar {
 /// is due, and must fit together with the one that leads back to the state of the input, so that finish()
 /// always has room for it.
 struct ShiftText {
+  using Cursor = ShiftCursor;
   using Char = ShiftChar;
   static constexpr bool kRuns = false;
   ShiftCursor in;
@@ -102,16 +105,20 @@ struct ShiftText {
   LXShiftState reached = LX_SHIFT_SINGLE;  // of the input, behind the last character that was written
   bool behind_shift_in = false;            // the last character taken, and nothing of it is written
 
-  bool take(Char* c) {
-    ShiftCursor ahead(in);
-    const size_t length = ahead.pass();
-    if (length == 0) return false;
+  static bool take_from(Cursor& at, Char* c) {
+    Cursor ahead(at);
+    size_t length;
+    if (!ahead.pass(&length)) return false;
     c->set(ahead.p - length, length);
-    c->before = in.state;
+    c->before = at.state;
     c->state = ahead.state;
-    c->shifted = c->p != in.p;
-    behind_shift_in = c->shifted && c->state == LX_SHIFT_SINGLE && out.state == in.state;
-    go_on_at(in, ahead);
+    c->shifted = c->p != at.p;
+    go_on_at(at, ahead);
+    return true;
+  }
+  bool take(Char* c) {
+    if (!take_from(in, c)) return false;
+    behind_shift_in = c->shifted && c->state == LX_SHIFT_SINGLE && out.state == c->before;
     return true;
   }
   bool put(LXWChar value, const Char& c) {
@@ -122,8 +129,8 @@ struct ShiftText {
   bool copy(const Char& c) { return write(c.p, c.length, c.state, c); }
 
   /// Goes on behind `next`, which was taken together with `*c`.
-  void skip_to(const ShiftText& ahead, const Char& next, Char* c) {
-    go_on_at(in, ahead.in);
+  void skip_to(const Cursor& ahead, const Char& next, Char* c) {
+    go_on_at(in, ahead);
     c->state = next.state;
     c->shifted = false;
   }

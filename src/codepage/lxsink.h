@@ -1,19 +1,14 @@
 // Text as it is written: a sink for each kind.
 //
-//   p, end     the place, and where the output ends
-//   put(v)     writes a character, of a Unicode value or a packed code, and the shift byte that is due; false,
-//   with
-//              nothing written, when they do not fit
-//   put_bytes  of a sink of bytes whose characters have lengths: writes a character as its bytes
-//   kOneUnit   every character is one unit, encode() of it
-//   kShifts    the text has shift states; `state` is that of what was written last
-//   kCloses    close() ends the text in the single-byte state: room for the Shift-In is kept behind every
-//   double-byte
-//              character
-//   kUnicode   the units are Unicode values
-//   kRuns      put_run() writes characters that are known to fit, each of at most most_units(), and nothing
-//   behind
-//              the last one
+// p, end: the place, and where the output ends.
+// put(): writes a character, of a Unicode value or a packed code, and the shift byte that is due; false, with
+//   nothing written, when they do not fit. put_bytes() writes one as its bytes.
+// kOneUnit: every character is one unit, encode() of it. kUnicode: the units are Unicode values.
+// kShifts: the text has shift states; `state` is that of what was written last.
+// kCloses: close() ends the text in the single-byte state: room for the Shift-In is kept behind every
+//   double-byte character.
+// kRuns: put_run() writes characters that are known to fit, each of at most most_units(), and nothing behind
+//   the last one.
 #pragma once
 
 #include "codepage/lxcursor.h"

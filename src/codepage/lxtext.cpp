@@ -10,12 +10,12 @@ template <class Cursor>
 bool pass_counted(Cursor* in) {
   if constexpr (Cursor::kShifts) {
     Cursor ahead(*in);
-    if (ahead.pass() == 0) return false;
+    if (!ahead.pass()) return false;
     ahead.pass_shift();
     go_on_at(*in, ahead);
     return true;
   } else {
-    return in->pass() != 0;
+    return in->pass();
   }
 }
 
@@ -46,7 +46,7 @@ Part whole_chars(const Codepage& cp, Form form, const uint8_t* text, LXShiftStat
                  size_t text_bytes) {
   return with_cursor(cp, form, state, text, bytes, [&](auto in) {
     size_t chars = 0;
-    for (auto ahead(in); ahead.pass() != 0; go_on_at(in, ahead)) ++chars;
+    for (auto ahead(in); ahead.pass(); go_on_at(in, ahead)) ++chars;
     if constexpr (decltype(in)::kShifts)
       if (in.p < in.end && cp.is_shift(*in.p) && (*in.p == cp.shift_in || in.p + 1 == text + text_bytes))
         ++in.p;
@@ -58,7 +58,7 @@ Part copy_chars(const Codepage& cp, Form form, LXShiftState state, const uint8_t
                 size_t chars, uint8_t* out) {
   return with_cursor(cp, form, state, text, bytes, [&](auto in) {
     size_t n = 0;
-    while (n < chars && in.pass() != 0) ++n;
+    while (n < chars && in.pass()) ++n;
     size_t copied = room(text, in.p);
     memcpy(out, text, copied);
     if (state_at(in, LX_SHIFT_SINGLE) == LX_SHIFT_DOUBLE && copied != 0) out[copied++] = cp.shift_in;

@@ -36,7 +36,7 @@ using UnicodeKind = Kind<UnicodeCursor, UnicodeSink>;
 
 /// Calls `body` with the kind that a text of these units has. Shift-stateful output goes to a `Shifting` sink.
 template <class Unit, class Shifting = ShiftSink, class Body>
-auto with_kind(const Codepage& cp, Form form, Body&& body) {
+[[gnu::always_inline]] inline auto with_kind(const Codepage& cp, Form form, Body&& body) {
   if constexpr (std::is_same_v<Unit, LXUChar>) {
     return body(UnicodeKind{});
   } else if constexpr (std::is_same_v<Unit, LXWChar>) {
@@ -51,11 +51,12 @@ auto with_kind(const Codepage& cp, Form form, Body&& body) {
 
 /// Calls `body` with the cursor of a text of `units` units.
 template <class Unit, class Body>
-auto with_cursor(const Codepage& cp, Form form, LXShiftState state, const Unit* p, size_t units, Body&& body) {
+[[gnu::always_inline]] inline auto with_cursor(const Codepage& cp, Form form, LXShiftState state, const Unit* p,
+                                               size_t units, Body&& body) {
   return with_kind<Unit>(cp, form, [&](auto kind) { return body(kind.cursor(cp, p, units, state)); });
 }
 
-/// Calls `body` with the sink of an output that ends at `end`.
+/// Calls `body` with the sink of an output that ends at `end`. Not inline in all callers: what follows is.
 template <class Unit, class Body>
 auto with_sink(const Codepage& cp, Form form, LXShiftState state, Unit* p, Unit* end, Body&& body) {
   return with_kind<Unit>(cp, form, [&](auto kind) { return body(kind.sink(cp, p, end, state)); });
@@ -111,7 +112,8 @@ size_t units_of(const Codepage& cp, const Text<Unit>& text, bool characters) {
 }
 
 template <class Unit, class Body>
-auto with_cursor(const Codepage& cp, Form form, const Text<Unit>& text, size_t units, Body&& body) {
+[[gnu::always_inline]] inline auto with_cursor(const Codepage& cp, Form form, const Text<Unit>& text,
+                                               size_t units, Body&& body) {
   return with_cursor(cp, form, text.state, text.p, units, body);
 }
 
