@@ -83,7 +83,7 @@ LXCatalog* open_catalog(LXLocale* locale, const Unit* directory, const Unit* nam
                                        has_all(flags, LX_CATALOG_ONE_LOCALE), &rc);
   if (file == nullptr) return call.fail(rc, none);
   LXCatalog* catalog = LXMcLoadCat(file, locale, flags, &rc);
-  return call.fail(rc, catalog);
+  return call.end(rc, catalog);
 }
 
 // Writing a message, and a default text. `size` is above 0; the result is a code.
@@ -151,7 +151,7 @@ int32_t get_message(LXCatalog* catalog, uint32_t set, uint32_t number, Unit* out
     code = write_message(call.locale(), catalog->locale, message, output, size);
   else if (code == LX_E_MESSAGE && default_text != nullptr)
     code = write_default(call.locale(), default_text, output, size);
-  return call.fail(code, code);
+  return call.end(code, code);
 }
 
 }  // namespace

@@ -188,7 +188,7 @@ int32_t LXConvertBuffer(LXConversion* conversion, char** output, int32_t* output
   *input_left = static_cast<int32_t>(stream.left_in());
   *output = reinterpret_cast<char*>(stream.out());
   *output_left = static_cast<int32_t>(stream.left_out());
-  return call.fail(result, result);
+  return call.end(result, result);
 }
 
 int32_t LXConversionRatio(LXLocale* target, LXLocale* source) {

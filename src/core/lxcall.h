@@ -1,5 +1,6 @@
 // The frame of a function that takes a locale: null means the default locale, the entry and exit events, and
-// the last error, which is stored in the locale exactly once, on every path.
+// the last error, which is stored in the locale exactly once, on every path. A function without a locale has
+// the events alone (lxtrace.h), a per-character primitive the locale alone (codepage/lxprimitive.h).
 #pragma once
 
 #include "core/lxrecords.h"
@@ -18,12 +19,17 @@ class Call : private Events {
   LXLocale* locale() const { return locale_; }
   const LXObject& codepage() const { return *locale_->codepage; }
 
+  /// Ends the call: it succeeded, it failed, or `code` says which.
   template <class T>
   T exit(T result, int line = __builtin_LINE()) {
-    return fail(LX_OK, result, line);
+    return end(LX_OK, result, line);
   }
   template <class T>
   T fail(int32_t code, T result, int line = __builtin_LINE()) {
+    return end(code, result, line);
+  }
+  template <class T>
+  T end(int32_t code, T result, int line = __builtin_LINE()) {
     if (locale_ != nullptr) locale_->last_error = code;
     return Events::exit(result, line);
   }

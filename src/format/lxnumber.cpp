@@ -90,7 +90,7 @@ Written write_text(const Codepage& cp, FormUnit<kForm>* p, size_t room, LXShiftS
 template <Form kForm>
 int32_t finish(Call& call, const Output<kForm>& to, size_t units, size_t count, bool all) {
   if (to.nulls() != 0) to.buffer[units] = 0;
-  return call.fail(all ? LX_OK : LX_E_SIZE, static_cast<int32_t>(count + to.nulls()));
+  return call.end(all ? LX_OK : LX_E_SIZE, static_cast<int32_t>(count + to.nulls()));
 }
 
 /// Copies a number, whose units are characters, to a buffer of at least one unit.

@@ -256,7 +256,7 @@ double text_to_double(LXLocale* given, const Input<kForm>& from, const Text** en
   Call call(unit, given);
   double value = 0;
   const auto exit = [&](int32_t code) {
-    call.fail(code, 0);
+    call.end(code, 0);
     return value;
   };
   if (!call) return exit(LX_E_NOT_INITIALIZED);

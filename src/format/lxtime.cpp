@@ -214,7 +214,7 @@ int32_t format_units(LXLocale* given, const LXTime* time, typename Text::Unit* b
   const size_t units = lx::text_units(format, format_length);
   const size_t written = format_time<Text>(*call.locale(), *time, buffer, static_cast<size_t>(size),
                                            Text::cursor(cp, format, units), LX_SHIFT_SINGLE, flags, &code);
-  return call.fail(code, static_cast<int32_t>(written + ((flags & LX_TERMINATE) != 0)));
+  return call.end(code, static_cast<int32_t>(written + ((flags & LX_TERMINATE) != 0)));
 }
 
 int32_t format_bytes(LXLocale* given, const LXTime* time, char* buffer, LXShiftState state, int32_t size,
@@ -244,7 +244,7 @@ int32_t format_bytes(LXLocale* given, const LXTime* time, char* buffer, LXShiftS
     if (null) buffer[copied.units] = 0;
     return copied.chars + null;
   });
-  return call.fail(code, static_cast<int32_t>(written));
+  return call.end(code, static_cast<int32_t>(written));
 }
 
 }  // namespace

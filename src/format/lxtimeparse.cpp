@@ -210,7 +210,7 @@ int32_t parse_units(LXLocale* given, LXTime* time, const typename Text::Unit* te
   const int32_t read =
       parse_time<Text>(*call.locale(), time, Text::cursor(cp, text, lx::text_units(text, length)),
                        Text::cursor(cp, format, lx::text_units(format, format_length)), flags, &code);
-  return call.fail(code, read);
+  return call.end(code, read);
 }
 
 int32_t parse_bytes(LXLocale* given, LXTime* time, const char* text, LXShiftState state, int32_t length,
@@ -233,7 +233,7 @@ int32_t parse_bytes(LXLocale* given, LXTime* time, const char* text, LXShiftStat
     auto taken = Text::cursor(cp, in.p, static_cast<size_t>(bytes), state);
     return static_cast<int32_t>(lx::pass_all(&taken));
   });
-  return call.fail(code, read);
+  return call.end(code, read);
 }
 
 }  // namespace

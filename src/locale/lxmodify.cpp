@@ -211,7 +211,7 @@ int32_t LXLocaleSetModifiable(LXLocale* given) {
   Call call(unit, given);
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, LX_E_NOT_INITIALIZED);
   const int32_t code = lx::change_territory(call.locale(), call.locale()->territory);
-  return call.fail(code, code);
+  return call.end(code, code);
 }
 
 int32_t LXLocaleChangeTerritory(LXLocale* given, LXObject* land) {
@@ -219,7 +219,7 @@ int32_t LXLocaleChangeTerritory(LXLocale* given, LXObject* land) {
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, LX_E_NOT_INITIALIZED);
   if (!is_loaded(land, LX_TERRITORY)) return call.fail(LX_E_NOT_FOUND, LX_E_NOT_FOUND);
   const int32_t code = lx::change_territory(call.locale(), land);
-  return call.fail(code, code);
+  return call.end(code, code);
 }
 
 int32_t LXLocaleChangeCodePage(LXLocale* given, LXObject* codepage) {
@@ -227,7 +227,7 @@ int32_t LXLocaleChangeCodePage(LXLocale* given, LXObject* codepage) {
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, LX_E_NOT_INITIALIZED);
   if (!is_loaded(codepage, LX_CODEPAGE)) return call.fail(LX_E_NOT_FOUND, LX_E_NOT_FOUND);
   const int32_t code = lx::change_codepage(call.locale(), codepage);
-  return call.fail(code, code);
+  return call.end(code, code);
 }
 
 }  // extern "C"

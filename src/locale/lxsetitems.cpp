@@ -218,7 +218,7 @@ int32_t set_item(LXLocale* given, int32_t length, int32_t flags, Set set) {
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, 0);
   if ((flags & ~LX_CHARACTERS) != 0) return call.fail(LX_E_INVALID, 0);
   const int32_t code = length == 0 ? LX_OK : set(call.locale());
-  return call.fail(code, code == LX_OK ? 1 : 0);
+  return call.end(code, code == LX_OK ? 1 : 0);
 }
 
 /// Converts units to bytes of the locale's codepage and sets the item from them.
@@ -278,7 +278,7 @@ int32_t LXSetLocaleNumInfo(LXLocale* given, int32_t item, int32_t value) {
   Call call(unit, given);
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, 0);
   const int32_t code = set_number(call.locale(), item, value);
-  return call.fail(code, code == LX_OK ? 1 : 0);
+  return call.end(code, code == LX_OK ? 1 : 0);
 }
 
 int32_t LXSetLocaleTextInfo(LXLocale* given, int32_t item, const char* text, int32_t length, int32_t flags) {

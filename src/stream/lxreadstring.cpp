@@ -164,7 +164,7 @@ int32_t read_string(LXStream* stream, LXLocale* given, Form form, Unit* output, 
     Unit* const behind = line.close();
     if (nulls != 0) *behind = 0;
     const size_t count = by_chars ? line.chars() : lx::room(output, behind);
-    return call.fail(code > LX_OK ? code : LX_OK, static_cast<int32_t>(count + nulls));
+    return call.end(code > LX_OK ? code : LX_OK, static_cast<int32_t>(count + nulls));
   });
 }
 

@@ -180,7 +180,7 @@ int32_t move_char(LXStream* stream, LXLocale* given, lx::StreamDirection directi
   if (stream->direction != direction) return call.fail(LX_E_STREAM_DIRECTION, 0);
   const Codepage& cp = codepage_of(call.codepage());
   const int32_t code = move(cp, *stream, make(cp));
-  return call.fail(code, code == LX_OK ? 1 : 0);
+  return call.end(code, code == LX_OK ? 1 : 0);
 }
 
 template <class Make>
@@ -260,7 +260,7 @@ int32_t LXCloseStream(LXStream* stream, LXLocale* locale) {
   int32_t code = LX_OK;
   if (stream->direction == lx::kWriteStream) code = finish(codepage_of(call.codepage()), *stream);
   if (!lx::hook_free(stream) && code == LX_OK) code = LX_E_FREE;
-  return call.fail(code, code == LX_OK ? 1 : 0);
+  return call.end(code, code == LX_OK ? 1 : 0);
 }
 
 int32_t LXFlushStream(LXStream* stream, LXLocale* locale) {
@@ -271,7 +271,7 @@ int32_t LXFlushStream(LXStream* stream, LXLocale* locale) {
     code = flush(*stream);
   else
     drop_buffer(codepage_of(call.codepage()), *stream);
-  return call.fail(code, code == LX_OK ? 1 : 0);
+  return call.end(code, code == LX_OK ? 1 : 0);
 }
 
 LXUChar LXReadCharU(LXStream* stream, LXLocale* locale) {
