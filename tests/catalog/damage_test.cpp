@@ -1,5 +1,7 @@
 // Damaged catalogs, every truncation and changed byte, and every allocation failing: 71 or a safe result, no
 // memory that the file does not justify, nothing left behind.
+#include "support/damage.h"
+
 #include <algorithm>
 #include <cstring>
 
@@ -31,13 +33,12 @@ class CatalogDamageTest : public CatalogTest {
         EXPECT_EQ(LXGetError(single()), LX_E_CATALOG);
         continue;
       }
-      for (uint32_t set = 0; set < 5; ++set)
-        for (uint32_t number = 0; number < 6; ++number) {
-          char text[40];
-          memset(text, 'x', sizeof(text));
-          const int32_t code = LXGetMessage(catalog.get(), set, number, text, sizeof(text), nullptr);
+      for (uint32_t set : {0, 1, 3, 4})
+        for (uint32_t number : {0, 1, 2, 4}) {
+          std::string text(40, 'x');
+          const int32_t code = LXGetMessage(catalog.get(), set, number, text.data(), 40, nullptr);
           EXPECT_TRUE(code == LX_OK || code == LX_E_CATALOG || code == LX_E_MESSAGE) << code;
-          EXPECT_NE(memchr(text, 0, sizeof(text)), nullptr);
+          EXPECT_NE(text.find('\0'), std::string::npos);
         }
     }
     EXPECT_LT(library.hooks().largest(), kMostForOpening);
@@ -45,15 +46,7 @@ class CatalogDamageTest : public CatalogTest {
 };
 
 TEST_F(CatalogDamageTest, TruncatedAndChangedFiles) {
-  const ByteString whole = small_catalog();
-  for (size_t bytes = 0; bytes <= whole.size(); ++bytes)
-    use({whole.begin(), whole.begin() + static_cast<ptrdiff_t>(bytes)});
-  for (size_t at = 0; at < whole.size(); ++at)
-    for (int value : {0x00, 0x01, 0x7F, 0x80, 0xFF}) {
-      ByteString file = whole;
-      file[at] = static_cast<uint8_t>(value);
-      use(file);
-    }
+  for_each_damage(small_catalog(), [&](const ByteString& file) { use(file); });
 }
 
 // What a wrong integer does: "open" that a loaded catalog is refused, else the first and the last message. A
@@ -129,45 +122,38 @@ TEST_F(CatalogDamageTest, TheChainEndsAtTheLatestWithTheCountOfSets) {
   for (uint32_t mode : kModes) EXPECT_EQ(message(open(file, mode), 9, 1), "72");
 }
 
-// Everything from opening to closing, with each allocation failing in turn.
+// Everything from opening to closing, with each allocation failing in turn; a failing free hook is not
+// reported.
 TEST_F(CatalogDamageTest, EveryAllocationFailing) {
   files.write("catalog", small_catalog());
   const std::string path = files.file("catalog");
   const std::basic_string<LXUChar> path16(path.begin(), path.end()), long16(400, 'd'), directory16(400, 'x');
-  LXLocale* locale = single();
+  LXLocale* const locale = single();
   Hooks& hooks = library.hooks();
   const size_t before = hooks.live_blocks();
-  for (uint32_t mode : kModes) {
-    size_t n = 1;
-    for (bool failed = true; failed; ++n) {
-      hooks.fail_at(n);
-      LXCatalog* catalog = LXOpenCatalogU(locale, directory16.c_str(), path16.c_str(), mode);
-      int32_t codes[] = {LXGetError(locale), 0, 0, 0};
-      if (catalog != nullptr) {
-        char text[500];
-        LXUChar units[500];
-        codes[1] = LXGetMessage(catalog, 3, 4, text, 500, nullptr);
-        codes[2] = LXGetMessageU(catalog, 3, 4, units, 500, nullptr);
-        codes[3] = LXGetMessageU(catalog, 3, 9, units, 500, long16.c_str());
-        EXPECT_EQ(LXCloseCatalog(catalog), LX_OK);
-      }
-      failed = hooks.failed();
-      const bool all_good = std::all_of(codes, codes + 4, [](int32_t code) { return code == LX_OK; });
-      for (int32_t code : codes) EXPECT_TRUE(code == LX_OK || code == LX_E_CATALOG || code == LX_E_MEMORY);
-      EXPECT_TRUE(failed || all_good);
-      EXPECT_EQ(hooks.live_blocks(), before) << n;
+  for (uint32_t mode : kModes)
+    for (bool frees_fail : {false, true}) {
+      hooks.fail_frees(frees_fail);
+      size_t n = 0;
+      do {
+        hooks.fail_at(++n);
+        LXCatalog* catalog = LXOpenCatalogU(locale, directory16.c_str(), path16.c_str(), mode);
+        std::vector<int32_t> codes = {LXGetError(locale)};
+        if (catalog != nullptr) {
+          char text[500];
+          LXUChar units[500];
+          codes.push_back(LXGetMessage(catalog, 3, 4, text, 500, nullptr));
+          codes.push_back(LXGetMessageU(catalog, 3, 4, units, 500, nullptr));
+          codes.push_back(LXGetMessageU(catalog, 3, 9, units, 500, long16.c_str()));
+          EXPECT_EQ(LXCloseCatalog(catalog), LX_OK);
+        }
+        for (int32_t code : codes)
+          EXPECT_TRUE(code == LX_OK || (hooks.failed() && (code == LX_E_CATALOG || code == LX_E_MEMORY)))
+              << code;
+        EXPECT_EQ(hooks.live_blocks(), before) << n;
+      } while (hooks.failed());
+      EXPECT_GT(n, 5u);
     }
-    EXPECT_GT(n, 6u);
-  }
-  hooks.fail_at(0);
-  hooks.fail_frees(true);
-  for (uint32_t mode : kModes) {
-    LXCatalog* catalog = LXOpenCatalog(locale, nullptr, path.c_str(), mode);
-    char text[20];
-    EXPECT_EQ(LXGetMessage(catalog, 1, 2, text, 20, nullptr), LX_OK);
-    EXPECT_EQ(LXCloseCatalog(catalog), LX_OK) << "a failing free hook is not reported";
-    EXPECT_EQ(hooks.live_blocks(), before);
-  }
   hooks.fail_frees(false);
 }
 

@@ -1,10 +1,9 @@
-// Whole directories: compiling, checking, and what check says when something in a directory is broken.
+// What check says when something in a compiled directory is broken.
 #include <gtest/gtest.h>
 
 #include <filesystem>
 #include <fstream>
 #include <functional>
-#include <map>
 #include <sstream>
 
 #include "check.h"
@@ -73,32 +72,6 @@ class DirectoryTest : public testing::Test {
   fs::path root_;
 };
 
-TEST_F(DirectoryTest, SameBytesForTheSameSourcesAndNothingLeftBehind) {
-  auto contents = [&] {
-    std::map<std::string, ByteVector> files;
-    for (const auto& entry : fs::directory_iterator(out()))
-      files[entry.path().filename().string()] = read_file(entry.path().string());
-    return files;
-  };
-  const auto first = contents();
-  compile();
-  EXPECT_EQ(contents(), first);
-  std::string names;
-  for (const auto& file : first) names += file.first + " ";
-  EXPECT_EQ(names, "alias.txt control.nls cp_00819.nls la_00001.nls so_00001.nls te_00840.nls ");
-  EXPECT_TRUE(check_compiled_directory(out().string()).empty());
-  EXPECT_TRUE(check_source_directory(source().string()).empty());
-}
-
-TEST_F(DirectoryTest, AFaultInASourceWritesNothing) {
-  fs::remove_all(out());
-  write_text(source() / "codepages/Latin1.ucm", "<code_set_name> \"Latin1\"\n<nonsense> 1\n");
-  write_text(source() / "languages/English.toml", "name = 1\n");
-  EXPECT_THROW(compile(), SourceError);
-  EXPECT_FALSE(fs::exists(out()));
-  EXPECT_EQ(check_source_directory(source().string()).size(), 2U) << "each file with its first fault";
-}
-
 TEST_F(DirectoryTest, CheckFindsWhatIsBroken) {
   auto put = [](size_t at, uint16_t value) {
     return [=](ByteVector& bytes) { lx::put_le16(&bytes.at(at), value); };
@@ -150,14 +123,6 @@ TEST_F(DirectoryTest, CheckFindsWhatIsBroken) {
     ASSERT_FALSE(faults.empty());
     EXPECT_NE(faults[0].find(test.fault), std::string::npos) << faults[0];
   }
-  fs::remove(out() / "te_00840.nls");
-  EXPECT_EQ(check_compiled_directory(out().string()).size(), 1U);
-  fs::copy_file(out() / "cp_00819.nls", out() / "cp_00820.nls");
-  EXPECT_EQ(check_compiled_directory(out().string()).size(), 2U) << "an object that nobody lists";
-  write_text(out() / "cp_00821.nls", "of another origin");
-  compile();
-  EXPECT_FALSE(fs::exists(out() / "cp_00820.nls"));
-  EXPECT_TRUE(fs::exists(out() / "cp_00821.nls"));
 }
 
 // Whatever a byte of an object becomes, checking and dumping end with a result or a SourceError.

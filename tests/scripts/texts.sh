@@ -1,0 +1,124 @@
+#!/bin/bash
+# Real and long texts through the command-line programs, beside the system's own iconv, sort and gencat; and the commands
+# of the README. What the programs write and say about small texts stands in tests/cases/cli.
+# Arguments: source directory, build directory.
+set -euE -o pipefail
+source_dir=$1 build_dir=$2 samples=$1/data/samples
+lexicor=$2/bin/lexicor gencat=$2/bin/lexicor-gencat
+[ -x "$lexicor" ] || exit 77
+export LC_ALL=C.UTF-8
+unset LX_LOCALEDIR
+work=$(mktemp -d)
+trap 'rm -rf "$work"' EXIT
+cd "$work"
+trap 'echo "FAILED: line $LINENO: $BASH_COMMAND" >&3; cat said >&3' ERR
+exec 3>&2 2>said
+
+convert() { "$lexicor" convert --strict --from "$1" --to "$2" "${@:3}"; }
+
+# --- Samples: the bytes of the system's converter, and back.
+for case in japanese:MS932:CP932 japanese:JapanEUC:EUC-JP japanese:IBM939:IBM939 chinese-simplified:MS936:CP936 \
+  chinese-traditional:EUC-TW:EUC-TW korean:MS949:CP949 russian:MS1251:CP1251 hebrew:MS1255:CP1255 \
+  thai:MS874:CP874 german:IBM1141:IBM1141; do
+  IFS=: read -r sample codepage system <<<"$case"
+  convert UTF-8 "$codepage" -o there "$samples/$sample.txt"
+  convert "$codepage" UTF-8 there | cmp - "$samples/$sample.txt"
+  if iconv -f UTF-8 -t "$system" "$samples/$sample.txt" >system 2>/dev/null; then cmp there system; fi
+done
+
+# --- A megabyte, shifted so that every character of the sample meets the end of a piece.
+repeated() { yes "$(cat "$1")" | head -n $((3500 * $(wc -l <"$1"))) || [ $? = 141 ]; }
+repeated "$samples/japanese.txt" >text
+"$lexicor" translate --from UTF-8 --to IBM939 text | cmp - <(convert UTF-8 IBM939 text)
+for shift in '' x xx; do
+  { printf '%s' "$shift" && cat text; } >large
+  for pair in MS932:CP932 IBM939:IBM939; do
+    convert utf-8 "${pair%:*}" large >there
+    cmp there <(iconv -f UTF-8 -t "${pair#*:}" large)
+    convert "${pair%:*}" utf-8 there | cmp - large
+  done
+  for mapping in half full upper; do
+    "$lexicor" map "$mapping" "$samples/japanese.txt" >sample
+    "$lexicor" map "$mapping" -o mapped --codepage IBM939 there
+    [ "$mapping" != upper ] || [ "$(stat -c %s there)" = "$(stat -c %s mapped)" ]
+    if LC_ALL=C grep -qaP '[\x0e\x0f]{2}' mapped; then echo 'two shift bytes in a row' >&2 && false; fi
+    convert IBM939 UTF-8 mapped | cmp - <(printf '%s' "$shift" | "$lexicor" map "$mapping" && repeated sample)
+  done
+done
+
+# --- 100,000 lines: keys beside comparison, nothing lost, and the binary order of the system.
+python3 -c '
+import random
+random.seed(1)
+for _ in range(100000):
+    print("".join(random.choices("aàbcdhlnñoôszAÀCHÑ \u0301\u00ad-中ガ", k=random.randrange(9))))' >words
+LC_ALL=C sort words >binary
+"$lexicor" sort --locale English@BINARY words | cmp - binary
+for locale in English@Default Spanish@SpanishTraditional French@FrenchCanadian Vietnamese@Vietnamese; do
+  "$lexicor" sort --locale $locale -o compared words
+  "$lexicor" sort --locale $locale --key words | cmp - compared
+  LC_ALL=C sort compared | cmp - binary
+done
+if script --version >/dev/null 2>&1; then
+  cat words words words >many
+  script -qec "'$lexicor' sort --locale English@Default --key -o out many" /dev/null >shown
+  grep -q ' 100 %' shown
+fi
+
+[ ! -s said ]
+
+# --- The README's commands do as they are written, in the source directory; compare answers by its exit code.
+while read -r command; do
+  command=${command// \/tmp\// $work/}
+  (cd "$source_dir" && eval "${command/#build\/m64/$build_dir}") >out || [[ $command == *' compare '* && $? -ge 3 ]]
+done < <(grep '^build/m64/bin/' "$source_dir/README.md")
+
+# --- Message samples in the codepages that their languages live in, and back.
+for case in english:IBM037 german:IBM273 german:MS1252 japanese:IBM930 japanese:MS932 japanese:JapanEUC russian:KOI8-R \
+  russian:IBM1025; do
+  IFS=: read -r language codepage <<<"$case"
+  "$gencat" --new --locale "English_UnitedStates.$codepage" s.cat "$samples/catalog/$language.msg"
+  for encoding in UTF-8 "$codepage"; do
+    "$gencat" --dump --from "$encoding" -o s.msg s.cat
+    "$gencat" --new --from "$encoding" t.cat s.msg
+    cmp s.cat t.cat
+  done
+done
+
+# --- The system's gencat makes the same catalog of a source and of the dump of what it was compiled to.
+# Left out is where it goes its own way: a number alone, more than three octal digits, $delset. The sets ascend,
+# since it stores texts in the order in which their sets begin.
+command -v gencat >/dev/null || exit 0
+mkdir sources && cp "$samples"/catalog/*.msg sources
+awk 'BEGIN {
+  srand(7)
+  split("a|é|日本|\\n|\\t|\\\\|\\q|\\101|\\60x|\"|\\\"|  |$|#|%d|\\\n|x", piece, "|")
+  for (file = 1; file <= 80; ++file) {
+    name = "sources/" file ".msg"; quoted = 0; split("", used); set = 1
+    for (line = int(rand() * 12); line >= 0; --line) {
+      kind = int(rand() * 10)
+      if (kind == 0) { set += int(rand() * 3); print "$set " set " x" >name }
+      else if (kind == 1) print "$ comment \"" >name
+      else if (kind == 2) { quoted = rand() < 0.7; print quoted ? "$quote \"" : "$quote" >name }
+      else {
+        number = 1 + int(rand() * 40)
+        if (used[set, number]++) continue
+        text = ""
+        for (count = int(rand() * 6); count > 0; --count) text = text piece[1 + int(rand() * 17)]
+        if (quoted) { gsub(/"/, "", text); sub(/\\$/, "", text); text = "\"" text "\"" }
+        printf "%d%s%s\n", number, rand() < 0.5 ? " " : "\t", text >name
+      }
+    }
+    close(name)
+  }
+}'
+compared=0
+for source in sources/*.msg; do
+  # Sources that the system has complaints about are no measure.
+  gencat --new system.cat "$source" 2>/dev/null || continue
+  "$gencat" --new own.cat "$source"
+  "$gencat" --dump own.cat | gencat --new through.cat -
+  cmp through.cat system.cat
+  compared=$((compared + 1))
+done
+[ "$compared" -gt 60 ]
