@@ -8,15 +8,15 @@
 
 #include "core/library_fixture.h"
 #include "core/lxobjtypes.h"
+#include "nls1/failing_init.h"
+
+int32_t lx::test::init_failure;
 
 extern "C" {
-
-// Links in front of LXInit (--wrap): a code to fail with, or 0 to go on.
-static int32_t init_failure;
 int32_t __real_LXInit(const char*, LXAllocHook, LXFreeHook, void*, uint32_t);
 int32_t __wrap_LXInit(const char* directory, LXAllocHook allocate, LXFreeHook release, void* context,
                       uint32_t options) {
-  if (init_failure != 0) return init_failure;
+  if (lx::test::init_failure != 0) return lx::test::init_failure;
   return __real_LXInit(directory, allocate, release, context, options);
 }
 }
