@@ -112,21 +112,6 @@ void use_locale(LXLocale* locale, bool thorough) {
   EXPECT_EQ(LXUnicodeToStringW(locale, codes, 512, units, 512, 0), 512);
 }
 
-/// Reads every item in every form.
-void use_items(LXLocale* locale) {
-  for (int32_t flags : {0, int32_t{LX_TERRITORY_VALUES}})
-    for (int32_t item = 1; item <= LX_ITEM_LOCALE_STRING; ++item) {
-      char bytes[40];
-      LXWChar codes[40];
-      LXUChar units[40];
-      LXGetLocaleNumInfo(locale, item, flags);
-      EXPECT_LE(LXGetLocaleTextInfo(locale, item, bytes, 40, flags), 40);
-      EXPECT_LE(LXGetLocaleTextInfoW(locale, item, codes, 40, flags), 40);
-      EXPECT_LE(LXGetLocaleTextInfoU(locale, item, units, 40, flags), 40);
-      EXPECT_LE(LXGetLocaleTextInfoEx(locale, item, bytes, LX_SHIFT_SINGLE, 40, flags), 40);
-    }
-}
-
 class FaultTest : public LibraryTest {
  protected:
   void write_directory(const std::vector<ByteString>& tested = small_double_byte_codepage(),
@@ -134,71 +119,6 @@ class FaultTest : public LibraryTest {
     directory.write_locale(
         {{id, "Under test", tested}, {static_cast<uint16_t>(id + 1), "Old", version1_ascii_codepage(), 1}});
     directory.write_text("alias.txt", "Under test one two\nOld three\n");
-  }
-
-  void expect_created(LXLocale* locale, int32_t rc) {
-    EXPECT_EQ(locale != nullptr, rc == LX_OK) << rc;
-    if (locale == nullptr) {
-      EXPECT_EQ(rc, LX_E_MEMORY);
-      EXPECT_TRUE(hooks.failed());
-      return;
-    }
-    const size_t before = hooks.live_blocks();
-    LXConversion* conversion = LXOpenConversion(locale, locale);
-    if (conversion != nullptr) {
-      EXPECT_EQ(LXCloseConversion(conversion), 0);
-    } else {
-      EXPECT_EQ(LXGetError(locale), LX_E_MEMORY);
-    }
-    char bytes[8];
-    EXPECT_EQ(LXConvertString(locale, bytes, 8, locale, "abc", 3, 0), 3);
-    use_items(locale);
-    EXPECT_EQ(hooks.live_blocks(), before);
-    EXPECT_EQ(LXReleaseLocale(locale), 0);
-  }
-
-  void use_locales() {
-    const std::string name = kName;
-    const std::vector<LXWChar> wide(name.c_str(), name.c_str() + name.size() + 1);
-    const std::vector<LXUChar> unicode(name.c_str(), name.c_str() + name.size() + 1);
-    const std::vector<LXUChar> spaces(300, 0);
-    int32_t rc = -1;
-    const std::function<LXLocale*()> creations[] = {
-        [&] { return LXGetLocale(name.c_str(), 0, &rc); },
-        [&] { return LXGetLocaleW(wide.data(), LX_FALLBACK, &rc); },
-        [&] { return LXGetLocaleU(unicode.data(), 0, &rc); },
-        [&] { return LXGetLocaleU(spaces.data(), 0, &rc); },
-        [&] { return LXGetLocale("English.Old", 0, &rc); },
-        [&] { return LXGetLocale(nullptr, LX_USER_LOCALE, &rc); },
-    };
-    for (const auto& create : creations) {
-      LXLocale* locale = create();
-      expect_created(locale, rc);
-    }
-    for (int32_t code : {LXSetLocale("", 0), LXSetLocaleW(wide.data(), 0), LXSetLocaleU(unicode.data(), 0)})
-      EXPECT_TRUE(code == LX_OK || (code == LX_E_MEMORY && hooks.failed())) << code;
-    LXObjManager* own = LXInitObjManager(directory.path().c_str(), 0, &rc);
-    EXPECT_EQ(own != nullptr, rc == LX_OK);
-    if (own != nullptr) {
-      EXPECT_EQ(LXTermObjManager(own), LX_OK);
-    } else {
-      EXPECT_EQ(rc, LX_E_MEMORY);
-    }
-  }
-
-  /// A whole life of the library: documented codes, and nothing is left at its end.
-  void live() {
-    const int32_t code = init();
-    if (code == LX_OK) {
-      use_locales();
-      EXPECT_EQ(LXTerm(), LX_OK);
-    } else {
-      EXPECT_TRUE(code == LX_E_MEMORY || code == LX_E_NOT_INITIALIZED) << code;
-      EXPECT_TRUE(hooks.failed());
-      EXPECT_EQ(LXTerm(), LX_E_NOT_INITIALIZED);
-    }
-    EXPECT_EQ(hooks.live_blocks(), 0u);
-    EXPECT_EQ(hooks.wrong_frees(), 0u);
   }
 
   void use_damaged_directory() {
@@ -277,21 +197,6 @@ class FaultTest : public LibraryTest {
     EXPECT_EQ(LXTerm(), LX_OK);
   }
 };
-
-TEST_F(FaultTest, EveryAllocationFails) {
-  write_directory();
-  setenv("LX_LANG", kName, 1);
-  for (bool from_then_on : {false, true}) {
-    size_t n = 1;
-    do {
-      SCOPED_TRACE(std::string(from_then_on ? "from allocation " : "allocation ") + std::to_string(n));
-      hooks.fail_at(n++, from_then_on);
-      live();
-      ASSERT_FALSE(HasFailure());
-    } while (hooks.failed());
-    EXPECT_GT(n, 40u);
-  }
-}
 
 TEST_F(FaultTest, FilesCutAndChangedAnywhere) {
   for (const char* file : {"control.nls", "alias.txt", "la_00001.nls", "te_00840.nls"}) {

@@ -351,30 +351,6 @@ TEST_F(LoadFailure, BuiltInDataStandInAndTheCodeIsKept) {
   close(descriptor);
 }
 
-TEST_F(LoadFailure, NoMemoryLeavesTheEntryForALaterTry) {
-  write_all();
-  for (const Object& object : objects) {
-    SCOPED_TRACE(object.file);
-    for (size_t n = 1;; ++n) {
-      ASSERT_EQ(init(), LX_OK);
-      LXObject* entry = by_id(object.type, object.id, LX_FIND_ONLY);
-      hooks.fail_at(n);
-      LXObject* found = by_id(object.type, object.id);
-      const bool failed = hooks.failed();
-      hooks.fail_at(0);
-      EXPECT_EQ(found, failed ? nullptr : entry);
-      EXPECT_EQ(rc, failed ? LX_E_MEMORY : LX_OK);
-      EXPECT_EQ(entry->section[0] != nullptr, !failed);
-      EXPECT_EQ(by_id(object.type, object.id), entry);
-      EXPECT_EQ(rc, LX_OK);
-      EXPECT_EQ(entry->disk.flags, 0);
-      EXPECT_EQ(LXTerm(), LX_OK);
-      EXPECT_EQ(hooks.live_blocks(), 0u);
-      if (!failed) break;
-    }
-  }
-}
-
 TEST_F(ObjManTest, ManyThreadsLoadAnObjectOnce) {
   directory.write_locale({{850, "Tiny", small_double_byte_codepage()}});
   constexpr int kThreads = 8;
