@@ -21,6 +21,7 @@ struct Visit {
   bool inside;    // the library is there, so handles are usable ones; else they crash when something reads them
   bool ordinary;  // empty texts, and zero for every number; else texts that crash when something reads them
   uint32_t flags = 0;  // the last argument
+  int32_t number = 0;  // every other one, in an ordinary call
 };
 
 template <class T>
@@ -45,7 +46,7 @@ class Arguments {
     if constexpr (std::is_floating_point_v<T>) {
       return T{1};
     } else if constexpr (std::is_integral_v<T>) {
-      return static_cast<T>(last ? visit_.flags : visit_.ordinary ? 0u : 10u);
+      return static_cast<T>(last ? static_cast<int64_t>(visit_.flags) : visit_.ordinary ? visit_.number : 10);
     } else if constexpr (std::is_function_v<std::remove_pointer_t<T>>) {
       T callback;
       fail_when_called(&callback);
@@ -354,6 +355,37 @@ TEST_F(DoorsTest, OutsideTheLibrary) {
   ASSERT_EQ(LXSetLocale("", 0), LX_OK);
   ASSERT_EQ(LXTerm(), LX_OK);
   expect_outside("after the last LXTerm");
+}
+
+// The services' forms do what the functions do whose names they have, within events of their own unit.
+TEST_F(DoorsTest, ServicesForward) {
+  expect_in_child("services", [] {
+    NLS1_PrivateFunction_GetProcessLocale();
+    std::map<std::string, Door> all;
+    for (const Row& row : rows())
+      for (const Door& door : row.doors) all[door.name] = door;
+    size_t pairs = 0;
+    for (const auto& [name, service] : all) {
+      const auto core = all.find("LX" + name.substr(std::min(name.size(), strlen("NLS1_"))));
+      if (name.rfind("NLS1_", 0) != 0 || name.find("Locale") == name.size() - 6 || core == all.end()) continue;
+      ++pairs;
+      for (int32_t number : {0, 1, 10, 63, 64}) {  // items, sizes and lengths, of texts that are empty
+        LXLocale* const locales[] = {LXGetLocale("", 0, nullptr), LXGetLocale("", 0, nullptr)};
+        const std::string expected = core->second.visit({locales[0], true, true, 0, number});
+        RecordingTrace::take();
+        RecordingTrace::set_level(RAS1_LEVEL_EVENTS);
+        EXPECT_EQ(service.visit({locales[1], true, true, 0, number}), expected) << name << ' ' << number;
+        RecordingTrace::set_level(0);
+        const std::vector<TraceRecord> records = RecordingTrace::take();
+        EXPECT_EQ(records.front().unit + records.back().unit, "qrlnls1qrlnls1") << name;
+        EXPECT_EQ(records.back().kind, TraceRecord::kExitValue);
+        EXPECT_EQ(LXGetError(locales[1]), LXGetError(locales[0])) << name;
+        EXPECT_EQ(locales[1]->changed, locales[0]->changed) << name;
+        for (LXLocale* locale : locales) LXReleaseLocale(locale);
+      }
+    }
+    EXPECT_EQ(pairs, 10u);
+  });
 }
 
 TEST_F(DoorsTest, UndefinedFlagsAndNoLocale) {
