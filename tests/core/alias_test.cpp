@@ -1,6 +1,7 @@
 // Codepage aliases: the alias file's lines, its limits, and look-ups.
 #include "core/library_fixture.h"
 #include "core/lxalias.h"
+#include "support/case_rows.h"
 
 namespace lx::test {
 namespace {
@@ -29,31 +30,11 @@ class AliasTest : public LibraryTest {
 };
 
 TEST_F(AliasTest, Lines) {
-  const std::string long_name(32, 'n');
-  const std::string long_alias(64, 'A');
-  struct Case {
-    const char* what;
-    std::string text, aliases;
-  };
-  const Case cases[] = {
-      {"a codepage with aliases", "Utf-8 utf8 Unicode-8\n", "Utf-8=UTF8 Utf-8=UNICODE-8 "},
-      {"tabs separate, many of them, no newline", "UTF-8\t \tutf8\t", "UTF-8=UTF8 "},
-      {"continued lines", "A one\n two\n  three four\nB five\n six\n",
-       "A=ONE A=TWO A=THREE A=FOUR B=FIVE B=SIX "},
-      {"a continuation after comments and empty lines", "A one\n#x y\n\n \t \n two\n", "A=ONE A=TWO "},
-      {"a codepage without aliases of its own", "A\n one\n", "A=ONE "},
-      {"a comment only in column 1", "A one #two\n", "A=ONE A=#TWO "},
-      {"a first line that begins with a blank stops", "\n  \n#\n one\nA two\n", ""},
-      {"a tab in column 1 is no blank", "A one\n\tB two\n", "A=ONE B=TWO "},
-      {"the longest name", long_name + " one\n", long_name + "=ONE "},
-      {"a longer name stops", "A one\n" + long_name + "n two\nB three\n", "A=ONE "},
-      {"the longest alias", "A " + long_alias + " one\n", "A=" + long_alias + " A=ONE "},
-      {"a longer alias stops", "A one " + long_alias + "A two\nB three\n", "A=ONE "},
-  };
-  for (const Case& c : cases) {
-    SCOPED_TRACE(c.what);
-    load(c.text);
-    EXPECT_EQ(all(), c.aliases);
+  for (const CaseRow& row : case_rows("core/alias_lines.txt")) {
+    SCOPED_TRACE(row.where);
+    load(row[0]);
+    const std::string aliases = all();
+    EXPECT_EQ(aliases.substr(0, aliases.find_last_not_of(' ') + 1), row[1]);
     EXPECT_EQ(LXTerm(), LX_OK);
   }
 }

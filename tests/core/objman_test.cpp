@@ -10,11 +10,8 @@
 #include <filesystem>
 #include <thread>
 
-#include "core/library_fixture.h"
-#include "core/lxformat.h"
-#include "core/lxobjtypes.h"
-#include "core/small_codepages.h"
-#include "support/sort_builder.h"
+#include "core/tiny_directory.h"
+#include "support/case_rows.h"
 
 namespace lx::test {
 namespace {
@@ -179,40 +176,20 @@ TEST_F(ObjManTest, ByIdReturnsTheNeighbourOfAnEmptyRange) {
 }
 
 TEST_F(ObjManTest, ByName) {
-  const std::string longest(33, 'L');
-  directory.write("control.nls", control_file({{1, LX_LANGUAGE, "English"},
-                                               {2, LX_LANGUAGE, "English (Old)"},
-                                               {3, LX_LANGUAGE, longest},
-                                               {4, LX_LANGUAGE, "ENGLISH"},
-                                               {5, LX_LANGUAGE, std::string(34, 'M')}}));
+  std::vector<ControlRecord> languages;
+  for (const std::string& name : {std::string("English"), std::string("English (Old)"), std::string(33, 'L'),
+                                  std::string("ENGLISH"), std::string(34, 'M')})
+    languages.push_back({static_cast<uint16_t>(languages.size() + 1), LX_LANGUAGE, name});
+  directory.write("control.nls", control_file(languages));
   ASSERT_EQ(init(), LX_OK);
-  struct Case {
-    const char* name;
-    int32_t length;
-    uint16_t id;  // 0: not found
-  };
-  const std::string cut(33, 'M');
-  const Case cases[] = {{"English", 7, 1},
-                        {"eNGLISH", 8, 1},
-                        {"English", 6, 0},
-                        {"Englishx", 8, 0},
-                        {"ENGLISH (OLD)", 13, 2},
-                        {"English (Old)", 8, 0},
-                        {"", 1, 0},
-                        {"English", -1, 0},
-                        {"Anglish", 7, 0},
-                        {longest.c_str(), 33, 3},
-                        {longest.c_str(), 34, 3},
-                        {cut.c_str(), 33, 5}};
-  for (const Case& c : cases) {
-    SCOPED_TRACE(std::string(c.name) + ", " + std::to_string(c.length));
-    const int32_t code = c.id != 0 ? LX_OK : LX_E_NOT_FOUND;
-    LXObject* object = LXGetObjFromName(nullptr, LX_LANGUAGE, c.name, c.length, LX_FIND_ONLY, &rc);
-    EXPECT_EQ(object != nullptr ? object->disk.id : 0, c.id);
+  for (const CaseRow& row : case_rows("core/names_in_table.txt")) {
+    SCOPED_TRACE(row.where);
+    const int32_t length = row.number(1), code = row.number(2) != 0 ? LX_OK : LX_E_NOT_FOUND;
+    LXObject* object = LXGetObjFromName(nullptr, LX_LANGUAGE, row[0].c_str(), length, LX_FIND_ONLY, &rc);
+    EXPECT_EQ(object != nullptr ? object->disk.id : 0, row.number(2));
     EXPECT_EQ(rc, code);
-    std::vector<LXWChar> wide(c.name, c.name + strlen(c.name));
-    wide.resize(wide.size() + 2);
-    EXPECT_EQ(LXGetObjFromNameW(nullptr, LX_LANGUAGE, wide.data(), c.length, LX_FIND_ONLY, &rc), object);
+    const auto wide = widened<LXWChar>(row[0] + std::string(1, '\0'));
+    EXPECT_EQ(LXGetObjFromNameW(nullptr, LX_LANGUAGE, wide.c_str(), length, LX_FIND_ONLY, &rc), object);
     EXPECT_EQ(rc, code);
   }
   const LXWChar beyond[] = {'E' + 0x100, 'n', 'g', 'l', 'i', 's', 'h', 0};
@@ -238,8 +215,9 @@ TEST_F(ObjManTest, BinaryOrderHasNoObject) {
 }
 
 TEST_F(ObjManTest, LoadsOnFirstUseAndKeeps) {
-  std::vector<ByteString> sections = small_double_byte_codepage();
-  sections.push_back({1, 2, 3});
+  std::vector<ByteString> sections = tiny_shift_jis().file.sections;
+  sections.resize(4);
+  sections[3] = {1, 2, 3};
   directory.write_locale({{850, "Tiny", sections}, {851, "Old", version1_ascii_codepage(), 1}});
   ASSERT_EQ(init(), LX_OK);
   LXObject* found = by_name(LX_CODEPAGE, "tiny", LX_FIND_ONLY);
@@ -261,8 +239,9 @@ TEST_F(ObjManTest, LoadsOnFirstUseAndKeeps) {
 }
 
 TEST_F(ObjManTest, ReadsAsManySectionsAsCounted) {
-  std::vector<ByteString> sections = small_double_byte_codepage();
-  sections.push_back({1, 2, 3});
+  std::vector<ByteString> sections = tiny_shift_jis().file.sections;
+  sections.resize(4);
+  sections[3] = {1, 2, 3};
   ByteString file = object_file(sections);
   directory.write_locale({{850, "Tiny", ascii_codepage()}});
   // A multibyte codepage needs its first three; a count above four counts four.
@@ -295,7 +274,7 @@ class LoadFailure : public ObjManTest {
 
   void write_all() {
     for (const Object& object : objects) std::filesystem::remove(directory.file(object.file));
-    directory.write_locale({{850, "Tiny", small_double_byte_codepage()}});
+    directory.write_locale({{850, "Tiny", tiny_shift_jis().file.sections}});
     directory.write("so_00004.nls", object_file({SortBuilder{}.payload()}));
     directory.write("control.nls", control_file({{1, LX_LANGUAGE, "English"},
                                                  {840, LX_TERRITORY, "UnitedStates"},
@@ -351,32 +330,8 @@ TEST_F(LoadFailure, BuiltInDataStandInAndTheCodeIsKept) {
   close(descriptor);
 }
 
-TEST_F(LoadFailure, NoMemoryLeavesTheEntryForALaterTry) {
-  write_all();
-  for (const Object& object : objects) {
-    SCOPED_TRACE(object.file);
-    for (size_t n = 1;; ++n) {
-      ASSERT_EQ(init(), LX_OK);
-      LXObject* entry = by_id(object.type, object.id, LX_FIND_ONLY);
-      hooks.fail_at(n);
-      LXObject* found = by_id(object.type, object.id);
-      const bool failed = hooks.failed();
-      hooks.fail_at(0);
-      EXPECT_EQ(found, failed ? nullptr : entry);
-      EXPECT_EQ(rc, failed ? LX_E_MEMORY : LX_OK);
-      EXPECT_EQ(entry->section[0] != nullptr, !failed);
-      EXPECT_EQ(by_id(object.type, object.id), entry);
-      EXPECT_EQ(rc, LX_OK);
-      EXPECT_EQ(entry->disk.flags, 0);
-      EXPECT_EQ(LXTerm(), LX_OK);
-      EXPECT_EQ(hooks.live_blocks(), 0u);
-      if (!failed) break;
-    }
-  }
-}
-
 TEST_F(ObjManTest, ManyThreadsLoadAnObjectOnce) {
-  directory.write_locale({{850, "Tiny", small_double_byte_codepage()}});
+  directory.write_locale({{850, "Tiny", tiny_shift_jis().file.sections}});
   constexpr int kThreads = 8;
   for (int round = 0; round < 20; ++round) {
     ASSERT_EQ(init(), LX_OK);
@@ -393,7 +348,7 @@ TEST_F(ObjManTest, ManyThreadsLoadAnObjectOnce) {
           found[i] = i % 2 == 0 ? LXGetObjFromID(nullptr, LX_CODEPAGE, 850, 0, &code)
                                 : LXGetObjFromName(nullptr, LX_CODEPAGE, "Tiny", 4, 0, &code);
           loaded[i] =
-              code == LX_OK && found[i]->section[1] != nullptr && LXMbToW(found[i], "\x81\x40") == 0x8140;
+              code == LX_OK && found[i]->section[1] != nullptr && LXMbToW(found[i], "\x82\x42") == 0x8242;
         });
       for (std::thread& thread : threads) thread.join();
     });

@@ -1,12 +1,9 @@
 // Locale items: what the built-in objects say in every form, buffers of every size, what may be set to what,
 // and that whatever fails leaves the locale as it was.
 #include <algorithm>
-#include <functional>
 
-#include "core/library_fixture.h"
-#include "core/lxformat.h"
-#include "core/lxobjtypes.h"
-#include "support/tiny_codepages.h"
+#include "core/tiny_directory.h"
+#include "support/case_rows.h"
 
 namespace lx::test {
 namespace {
@@ -63,76 +60,10 @@ std::string shifted(LXLocale* locale, int32_t item, LXShiftState state, int32_t 
   return buffer.text(LXGetLocaleTextInfoEx(locale, item, buffer.data.data(), state, size, flags), size);
 }
 
-struct BuiltIn {
-  int32_t item;
-  const char* text;
-};
-const BuiltIn kBuiltInTexts[] = {
-    {2, "English"},
-    {3, "EN"},
-    {4, "English"},
-    {6, "UnitedStates"},
-    {7, "USA"},
-    {8, "United States"},
-    {10, "US-ASCII"},
-    {12, "Binary"},
-    {13, "UnitedStates"},
-    {14, "US-ASCII"},
-    {15, "Binary"},
-    {16, "Sunday"},
-    {22, "Saturday"},
-    {23, "Sun"},
-    {29, "Sat"},
-    {30, "January"},
-    {41, "December"},
-    {42, ""},
-    {43, "Jan"},
-    {54, "Dec"},
-    {55, ""},
-    {56, "AM"},
-    {57, "PM"},
-    {59, "."},
-    {60, ","},
-    {61, ","},
-    {62, "3;0"},
-    {64, "$"},
-    {65, "USD"},
-    {66, "."},
-    {67, ","},
-    {68, "3;0"},
-    {71, ""},
-    {72, "-"},
-    {79, "%#I:%M:%S %p"},
-    {80, "%#m/%#d/%y"},
-    {81, "%A, %B %d, %Y"},
-    {88, "English_UnitedStates.US-ASCII@Binary"},
-};
-const std::pair<int32_t, int32_t> kBuiltInNumbers[] = {
-    {1, 1},  {5, 1},  {9, 1},  {11, 0}, {58, 1}, {63, 2}, {69, 2}, {70, 2}, {73, 1}, {74, 0},
-    {75, 1}, {76, 0}, {77, 3}, {78, 0}, {82, 1}, {83, 1}, {84, 0}, {85, 1}, {86, 1}, {87, 0},
-};
-
 class ItemTest : public LibraryTest {
  protected:
-  /// English; UnitedStates, and Elsewhere with other values; the tiny codepages.
   void open() {
-    std::vector<ScratchDirectory::Codepage> files;
-    for (const TinyCodepage& codepage : tiny_codepages()) files.push_back(codepage.file);
-    std::sort(files.begin(), files.end(), [](const auto& a, const auto& b) { return a.id < b.id; });
-    directory.write_locale(files);
-    std::vector<ControlRecord> records{
-        {1, LX_LANGUAGE, "English"}, {276, LX_TERRITORY, "Elsewhere"}, {840, LX_TERRITORY, "UnitedStates"}};
-    for (const auto& file : files) records.push_back({file.id, LX_CODEPAGE, file.name});
-    directory.write("control.nls", control_file(records));
-    const Bytes built_in = kBuiltInTerritory.sections.section[0];
-    ByteString payload(built_in.data, built_in.data + built_in.size);
-    const uint16_t separators[] = {',', '.', ';', ',', 0xE0};
-    for (size_t i = 0; i < 5; ++i) put_le16(payload.data() + 2 * i, separators[i]);
-    put_le16(payload.data() + 2 * format::territory::kNumbers, 3);
-    put_le16(payload.data() + 2 * format::territory::kFlags, 0);
-    const size_t currency = le16(payload.data() + 2 * 15);
-    put_le16(payload.data() + currency, 0x3041);
-    directory.write("te_00276.nls", object_file({payload}));
+    write_tiny_directory(directory);
     ASSERT_EQ(init(), LX_OK);
   }
   static LXLocale* create(const TinyCodepage& codepage) {
@@ -153,29 +84,29 @@ class ItemTest : public LibraryTest {
 TEST_F(ItemTest, BuiltInValues) {
   ASSERT_EQ(init("/nonexistent"), LX_W_DEFAULTS);
   ASSERT_EQ(LXSetLocale("", 0), LX_OK);
-  for (int32_t flags : {0, int32_t{LX_TERRITORY_VALUES}}) {
-    for (const BuiltIn& built_in : kBuiltInTexts) {
-      SCOPED_TRACE(built_in.item);
-      EXPECT_EQ(plain(nullptr, built_in.item, flags), built_in.text);
-      EXPECT_EQ(plain(nullptr, built_in.item, flags | LX_CHARACTERS), built_in.text);
-      EXPECT_EQ(unicode(nullptr, built_in.item, flags), units(built_in.text));
-      EXPECT_EQ(wide(nullptr, built_in.item, flags | LX_CHARACTERS), units(built_in.text));
+  char buffer[4] = "abc";
+  for (const CaseRow& row : case_rows("locale/built_in_items.txt")) {
+    SCOPED_TRACE(row.where);
+    const int32_t item = row.number(0);
+    const bool is_text = row[1] == "text";
+    for (int32_t flags : {0, int32_t{LX_TERRITORY_VALUES}}) {
+      EXPECT_EQ(LXGetLocaleNumInfo(nullptr, item, flags), is_text ? -1 : row.number(2));
+      EXPECT_EQ(LXGetError(nullptr), is_text ? LX_E_ITEM : LX_OK);
+      if (!is_text) {
+        EXPECT_EQ(LXGetLocaleTextInfo(nullptr, item, buffer, 4, flags), -1);
+        EXPECT_EQ(LXGetError(nullptr), LX_E_ITEM);
+        continue;
+      }
+      EXPECT_EQ(plain(nullptr, item, flags), row[2]);
+      EXPECT_EQ(plain(nullptr, item, flags | LX_CHARACTERS), row[2]);
+      EXPECT_EQ(unicode(nullptr, item, flags), units(row[2]));
+      EXPECT_EQ(wide(nullptr, item, flags | LX_CHARACTERS), units(row[2]));
     }
-    for (const auto& [item, value] : kBuiltInNumbers)
-      EXPECT_EQ(LXGetLocaleNumInfo(nullptr, item, flags), value);
   }
-  // An item is a text or a number.
   for (int32_t item : {-1, 0, 89, INT32_MAX, INT32_MIN}) {
     EXPECT_EQ(LXGetLocaleNumInfo(nullptr, item, 0), -1);
     EXPECT_EQ(LXGetError(nullptr), LX_E_ITEM);
   }
-  for (const auto& number : kBuiltInNumbers) {
-    char buffer[4];
-    EXPECT_EQ(LXGetLocaleTextInfo(nullptr, number.first, buffer, 4, 0), -1);
-    EXPECT_EQ(LXGetError(nullptr), LX_E_ITEM);
-  }
-  EXPECT_EQ(LXGetLocaleNumInfo(nullptr, 2, 0), -1);
-  char buffer[4] = "abc";
   for (int32_t flags : {2, 8, -1}) {
     EXPECT_EQ(LXGetLocaleTextInfo(nullptr, 2, buffer, 4, flags), -1);
     EXPECT_EQ(LXGetError(nullptr), LX_E_INVALID);
@@ -268,57 +199,33 @@ TEST_F(ItemTest, ShiftBytesAreWrittenWhereTheyAreDue) {
 TEST_F(ItemTest, WhatCanBeSet) {
   open();
   LXLocale* locale = create(tiny_utf8());
-  const struct {
-    int32_t item;
-    const char* text;
-    int32_t code;
-  } texts[] = {
-      {59, ";", 0},      {59, "5", 37},       {59, ",", 37},      {60, ".x", 0},       {60, ";", 37},
-      {66, "0", 37},     {67, ".", 37},       {66, "'", 0},       {59, "", 37},        {61, "", 0},
-      {61, "7", 0},      {62, "", 0},         {64, "", 0},        {72, "minus", 0},    {79, "%H", 0},
-      {65, "EUR", 35},   {16, "x", 35},       {57, "x", 35},      {58, "1", 35},       {63, "1", 35},
-      {88, "x", 35},     {0, "x", 35},        {89, "x", 35},      {2, "english", 0},   {2, "French", 37},
-      {2, "", 37},       {6, "Elsewhere", 0}, {6, "English", 37}, {10, "tiny-euc", 0}, {10, "US-ASCII", 0},
-      {12, "BINARY", 0}, {12, "Default", 37},
-  };
-  for (const auto& c : texts) {
-    SCOPED_TRACE(std::to_string(c.item) + ' ' + c.text);
+  for (const CaseRow& row : case_rows("locale/settable_items.txt")) {
+    SCOPED_TRACE(row.where);
+    const int32_t item = row.number(0), code = row.number(3);
     const std::string before = snapshot(locale);
-    EXPECT_EQ(LXSetLocaleTextInfo(locale, c.item, c.text, 0, 0), 1) << "length 0 changes nothing, for any item";
-    EXPECT_EQ(snapshot(locale), before);
-    EXPECT_EQ(LXSetLocaleTextInfo(locale, c.item, c.text, -1, 0), c.code == 0);
-    EXPECT_EQ(LXGetError(locale), c.code);
-    if (c.code != 0) {
+    if (row[1] == "is") {
+      EXPECT_EQ(plain(locale, item), row[2]);
+    } else if (row[1] == "number") {
+      EXPECT_EQ(LXSetLocaleNumInfo(locale, item, row.number(2)), code == LX_OK);
+      EXPECT_EQ(LXGetError(locale), code);
+      if (code == LX_OK) {
+        EXPECT_EQ(LXGetLocaleNumInfo(locale, item, 0), row.number(2) & 0xFFFF);
+      }
+    } else {
+      EXPECT_EQ(LXSetLocaleTextInfo(locale, item, row[2].c_str(), 0, 0), 1) << "length 0 changes nothing";
+      EXPECT_EQ(snapshot(locale), before);
+      EXPECT_EQ(LXSetLocaleTextInfo(locale, item, row[2].c_str(), -1, 0), code == LX_OK);
+      EXPECT_EQ(LXGetError(locale), code);
+      const bool one_byte = item >= 59 && item <= 67 && item != 62 && item != 64;
+      if (code == LX_OK && item > 12) {
+        EXPECT_EQ(plain(locale, item), row[2].substr(0, one_byte ? 1 : std::string::npos));
+      }
+    }
+    if (code != LX_OK) {
       EXPECT_EQ(snapshot(locale), before);
     }
-    const bool one_byte = c.item >= 59 && c.item <= 67 && c.item != 62 && c.item != 64;
-    if (c.code == 0 && c.item > 12) {
-      EXPECT_EQ(plain(locale, c.item), std::string(c.text).substr(0, one_byte ? 1 : 99));
-    }
   }
-  EXPECT_EQ(plain(locale, 88), "English_Elsewhere.US-ASCII@Binary");
-  EXPECT_EQ(plain(locale, 64, LX_TERRITORY_VALUES), "?") << "the territory has a character that ASCII has not";
-
-  const struct {
-    int32_t item, value, code;
-  } numbers[] = {
-      {63, 9, 0},  {69, 65535, 0}, {70, 70000, 0}, {73, 0, 0},   {74, 2, 37}, {76, -1, 37},   {82, 1, 0},
-      {83, 5, 37}, {77, 4, 0},     {77, 5, 37},    {78, -1, 37}, {58, 1, 35}, {84, 1, 35},    {85, 1, 35},
-      {87, 0, 35}, {59, 1, 35},    {0, 1, 35},     {1, 1, 0},    {1, 2, 37},  {1, 65537, 37}, {5, 840, 0},
-      {5, 1, 37},  {9, 57352, 0},  {9, -1, 37},    {11, 0, 0},   {11, 5, 37},
-  };
-  for (const auto& c : numbers) {
-    SCOPED_TRACE(std::to_string(c.item) + ' ' + std::to_string(c.value));
-    const std::string before = snapshot(locale);
-    EXPECT_EQ(LXSetLocaleNumInfo(locale, c.item, c.value), c.code == 0);
-    EXPECT_EQ(LXGetError(locale), c.code);
-    if (c.code != 0) {
-      EXPECT_EQ(snapshot(locale), before);
-    }
-    if (c.code == 0) {
-      EXPECT_EQ(LXGetLocaleNumInfo(locale, c.item, 0), c.value & 0xFFFF);
-    }
-  }
+  EXPECT_EQ(plain(locale, 64, LX_TERRITORY_VALUES), "$");
   EXPECT_EQ(LXReleaseLocale(locale), 0);
 }
 
@@ -394,43 +301,6 @@ TEST_F(ItemTest, OtherTerritoryAndCodepage) {
     EXPECT_EQ(LXGetLocaleNumInfo(locale, 86, 0), !codepage.shift);
   }
   EXPECT_EQ(LXReleaseLocale(locale), 0);
-}
-
-TEST_F(ItemTest, EveryAllocationFails) {
-  open();
-  const LXUChar currency[] = {0x3041, 0x3042, 0x3043, 'A', 0};
-  const std::function<int32_t(LXLocale*)> operations[] = {
-      [&](LXLocale* l) { return set_territory(l, 276); },
-      [](LXLocale* l) { return LXSetLocaleNumInfo(l, 9, tiny_shift().file.id); },
-      [](LXLocale* l) { return LXSetLocaleTextInfo(l, 10, "TINY-EUC", -1, 0); },
-      [](LXLocale* l) { return LXSetLocaleTextInfo(l, 81, std::string(400, 'x').c_str(), -1, 0); },
-      [&](LXLocale* l) { return LXSetLocaleTextInfoU(l, 64, currency, -1, 0); },
-      [](LXLocale* l) { return LXSetLocaleTextInfoW(l, 72, std::vector<LXWChar>(300, 'y').data(), 300, 0); },
-  };
-  for (const char* name : {"_Elsewhere.TINY-SHIFT", ".TINY-EUC"})  // loads the objects
-    LXReleaseLocale(LXGetLocale(name, 0, nullptr));
-  for (size_t i = 0; i < std::size(operations); ++i) {
-    for (size_t n = 1;; ++n) {
-      SCOPED_TRACE(std::to_string(i) + " allocation " + std::to_string(n));
-      LXLocale* locale = create(tiny_utf8());
-      ASSERT_NE(locale, nullptr);
-      const std::string before = snapshot(locale);
-      const size_t blocks = hooks.live_blocks();
-      hooks.fail_at(n);
-      const int32_t result = operations[i](locale);
-      const bool failed = hooks.failed();
-      hooks.fail_at(0);
-      // The exact copy of a converted text may be missing; every other failure is one.
-      if (result == 0) {
-        EXPECT_TRUE(failed);
-        EXPECT_EQ(LXGetError(locale), LX_E_MEMORY);
-        EXPECT_EQ(snapshot(locale), before);
-        EXPECT_EQ(hooks.live_blocks(), blocks);
-      }
-      EXPECT_EQ(LXReleaseLocale(locale), 0);
-      if (!failed) break;
-    }
-  }
 }
 
 }  // namespace

@@ -3,11 +3,8 @@
 #include <cstdio>
 #include <type_traits>
 
-#include "core/library_fixture.h"
-#include "core/lxformat.h"
-#include "core/lxobjtypes.h"
-#include "core/small_codepages.h"
-#include "support/sort_builder.h"
+#include "core/tiny_directory.h"
+#include "support/case_rows.h"
 
 namespace lx::test {
 namespace {
@@ -16,9 +13,6 @@ namespace words = lx::format::language;
 
 class LocaleTest : public LibraryTest {
  protected:
-  static constexpr uint16_t kShiftId = 930;
-  static constexpr uint16_t kSortId = 5;
-
   /// The built-in language with other defaults.
   static ByteString language(uint16_t territory, uint16_t codepage, uint16_t sort) {
     const Bytes built_in = kBuiltInLanguage.sections.section[0];
@@ -32,29 +26,30 @@ class LocaleTest : public LibraryTest {
   // English, French, and three whose defaults are not there, although objects of other types stand where they
   // would be.
   void write_directory() {
-    const Bytes territory = kBuiltInTerritory.sections.section[0];
-    const uint16_t defaults[][3] = {
-        {840, 367, 0}, {250, 850, kSortId}, {9999, 367, 0}, {840, 9999, 0}, {840, 367, 9999}};
-    for (int i = 0; i < 5; ++i)
-      directory.write("la_0000" + std::to_string(i + 1) + ".nls",
-                      language(defaults[i][0], defaults[i][1], defaults[i][2]));
-    for (const char* file : {"te_00250.nls", "te_00840.nls"})
-      directory.write(file, object_file({ByteString(territory.data, territory.data + territory.size)}));
-    directory.write("cp_00367.nls", object_file(ascii_codepage()));
-    directory.write("cp_00850.nls", object_file(small_double_byte_codepage()));
-    directory.write("cp_00930.nls", object_file(small_shift_codepage()));
+    directory.write_locale({{367, "US-ASCII", ascii_codepage()},
+                            {850, "Tiny", tiny_shift_jis().file.sections},
+                            {930, "Shift", tiny_shift().file.sections}});
+    directory.write("te_00250.nls", directory.read("te_00840.nls"));
     directory.write("so_00005.nls", object_file({SortBuilder{}.payload()}));
-    directory.write("control.nls", control_file({{1, LX_LANGUAGE, "English"},
-                                                 {2, LX_LANGUAGE, "French"},
-                                                 {3, LX_LANGUAGE, "NoTerritory"},
-                                                 {4, LX_LANGUAGE, "NoCodepage"},
-                                                 {5, LX_LANGUAGE, "NoSort"},
-                                                 {250, LX_TERRITORY, "France"},
-                                                 {840, LX_TERRITORY, "UnitedStates"},
-                                                 {367, LX_CODEPAGE, "US-ASCII"},
-                                                 {850, LX_CODEPAGE, "Tiny"},
-                                                 {kShiftId, LX_CODEPAGE, "Shift"},
-                                                 {kSortId, LX_SORT, "Default"}}));
+    std::vector<ControlRecord> records;
+    const auto add_language = [&](const char* name, uint16_t territory, uint16_t codepage, uint16_t sort) {
+      const auto id = static_cast<uint16_t>(records.size() + 1);
+      records.push_back({id, LX_LANGUAGE, name});
+      directory.write("la_0000" + std::to_string(id) + ".nls", language(territory, codepage, sort));
+    };
+    add_language("English", 840, 367, 0);
+    add_language("French", 250, 850, 5);
+    add_language("NoTerritory", 9999, 367, 0);
+    add_language("NoCodepage", 840, 9999, 0);
+    add_language("NoSort", 840, 367, 9999);
+    for (const ControlRecord& record : std::vector<ControlRecord>{{250, LX_TERRITORY, "France"},
+                                                                  {840, LX_TERRITORY, "UnitedStates"},
+                                                                  {367, LX_CODEPAGE, "US-ASCII"},
+                                                                  {850, LX_CODEPAGE, "Tiny"},
+                                                                  {930, LX_CODEPAGE, "Shift"},
+                                                                  {5, LX_SORT, "Default"}})
+      records.push_back(record);
+    directory.write("control.nls", control_file(records));
   }
   void init_directory() {
     write_directory();
@@ -74,82 +69,39 @@ class LocaleTest : public LibraryTest {
 
   enum Form { kBytes, kWide, kUnicode, kForms };
   static LXLocale* create(Form form, const std::string& name, int32_t flags, int32_t* rc) {
-    const std::vector<LXWChar> wide(name.c_str(), name.c_str() + name.size() + 1);
-    const std::vector<LXUChar> unicode(name.c_str(), name.c_str() + name.size() + 1);
     switch (form) {
       case kBytes:
         return LXGetLocale(name.c_str(), flags, rc);
       case kWide:
-        return LXGetLocaleW(wide.data(), flags, rc);
+        return LXGetLocaleW(widened<LXWChar>(name).c_str(), flags, rc);
       default:
-        return LXGetLocaleU(unicode.data(), flags, rc);
+        return LXGetLocaleU(widened<LXUChar>(name).c_str(), flags, rc);
     }
   }
 };
 
 TEST_F(LocaleTest, Names) {
   init_directory();
-  struct Case {
-    const char* name;
-    int32_t flags;
-    const char* objects;  // language, territory, codepage, sort, flags
-    int32_t code;
-  };
-  const char kFrench[] = "2 250 850 5 0";
-  const char kEnglish[] = "1 840 367 - C0";
-  const std::string long_name = "French@" + std::string(100000, 'x');
-  const Case cases[] = {
-      {"", 0, kEnglish, LX_OK},
-      {"English", 0, kEnglish, LX_OK},
-      {"French", 0, kFrench, LX_OK},
-      {"fRENCH_france.TINY@default", 0, kFrench, LX_OK},
-      {"English_UnitedStates.US-ASCII@BINARY", 0, kEnglish, LX_OK},
-      {"French.US-ASCII", 0, "2 250 367 5 40", LX_OK},
-      {"French@Binary", 0, "2 250 850 - 80", LX_OK},
-      {"French.Shift", 0, "2 250 930 5 100", LX_OK},
-      {".Tiny", 0, "1 840 850 - 80", LX_OK},
-      {"@Default", 0, "1 840 367 5 40", LX_OK},
-      // Nothing is found under these names.
-      {"German", 0, "none", LX_E_NO_LANGUAGE},
-      {"German_Nowhere.None@None", 0, "none", LX_E_NO_LANGUAGE},
-      {"French_Nowhere.None@None", 0, "none", LX_E_NO_TERRITORY},
-      {"French_France.None@None", 0, "none", LX_E_NO_CODEPAGE},
-      {"French_France.Tiny@None", 0, "none", LX_E_NO_SORT},
-      {"French@Default.Tiny", 0, "none", LX_E_NO_SORT},
-      {"French.Tiny_France", 0, "none", LX_E_NO_CODEPAGE},
-      {"French@Default@", 0, "none", LX_E_NO_SORT},
-      // Fallback: English, and the defaults of the language.
-      {"German", LX_FALLBACK, kEnglish, LX_OK},
-      {"French_UnitedStates.None", LX_FALLBACK, "2 840 850 5 0", LX_OK},
-      {"French_Nowhere.None@None", LX_FALLBACK, kFrench, LX_OK},
-      {"French_France.US-ASCII@BINARY", LX_FALLBACK, "2 250 367 - C0", LX_OK},
-      // Defaults that are not there; an object of another type does not count.
-      {"NoTerritory", LX_FALLBACK, "none", LX_E_NO_TERRITORY},
-      {"NoTerritory_France", 0, "3 250 367 - C0", LX_OK},
-      {"NoCodepage", LX_FALLBACK, "none", LX_E_NO_CODEPAGE},
-      {"NoCodepage.Tiny", 0, "4 840 850 - 80", LX_OK},
-      {"NoSort", LX_FALLBACK, "none", LX_E_NO_SORT},
-      {"NoSort@BINARY", 0, "5 840 367 - C0", LX_OK},
-      // A long name.
-      {long_name.c_str(), 0, "none", LX_E_NO_SORT},
-      {long_name.c_str(), LX_FALLBACK, kFrench, LX_OK},
-      // Undefined flags.
-      {"English", 0x8 | LX_FALLBACK, "none", LX_E_INVALID},
-      {"English", INT32_MIN, "none", LX_E_INVALID},
-  };
-  for (const Case& c : cases) {
+  std::vector<CaseRow> rows = case_rows("locale/locale_names.txt");
+  const std::string long_name(100000, 'x');
+  rows.push_back({"long", {"French@" + long_name, "0", "33"}});
+  rows.push_back({"long, with fallback", {"French@" + long_name, "4", "2 250 850 5 0"}});
+  rows.push_back({"long, of the user", {"French@" + long_name.substr(0, 500), "2", "33"}});
+  for (const CaseRow& row : rows) {
+    const int32_t flags = row.number(1);
+    const bool of_user = (flags & LX_USER_LOCALE) != 0;
+    if (of_user) setenv("LX_LANG", row[0].c_str(), 1);
     for (int form = kBytes; form < kForms; ++form) {
-      SCOPED_TRACE(std::string(c.name).substr(0, 99) + ", " + std::to_string(c.flags) + " " +
-                   std::to_string(form));
+      SCOPED_TRACE(row.where + ", form " + std::to_string(form));
       const size_t blocks = hooks.live_blocks();
       int32_t rc = -1;
-      LXLocale* locale = create(static_cast<Form>(form), c.name, c.flags, &rc);
-      EXPECT_EQ(describe(locale), c.objects);
-      EXPECT_EQ(rc, c.code);
+      LXLocale* locale = create(static_cast<Form>(form), of_user ? "English" : row[0], flags, &rc);
+      EXPECT_EQ(locale != nullptr ? describe(locale) : std::to_string(rc), row[2]);
+      EXPECT_EQ(locale != nullptr, rc == LX_OK);
       if (locale != nullptr) {
         EXPECT_EQ(LXGetError(locale), LX_OK);
         EXPECT_EQ(LXReleaseLocale(locale), 0);
-      } else if (c.code == LX_E_INVALID) {
+      } else if (rc == LX_E_INVALID) {
         EXPECT_EQ(hooks.live_blocks(), blocks);
       }
     }
@@ -204,33 +156,6 @@ TEST_F(LocaleTest, OtherCodesOfLookUps) {
       EXPECT_EQ(LXTerm(), LX_OK);
     }
     directory.write(file, content);
-  }
-}
-
-TEST_F(LocaleTest, UserLocale) {
-  init_directory();
-  struct Case {
-    std::string value;
-    int32_t flags;
-    const char* objects;
-    int32_t code;
-  };
-  setenv("LC_ALL", "C", 1);
-  const Case cases[] = {{"", 0, "1 840 367 - C0", LX_OK},  // what the system says
-                        {"French_UnitedStates", 0, "2 840 850 5 0", LX_OK},
-                        {"German_France", 0, "none", LX_E_NO_LANGUAGE},
-                        {"German_France", LX_FALLBACK, "1 250 367 - C0", LX_OK},
-                        {"French@" + std::string(500, 'x'), 0, "none", LX_E_NO_SORT}};
-  for (const Case& c : cases) {
-    SCOPED_TRACE(c.value);
-    if (!c.value.empty()) setenv("LX_LANG", c.value.c_str(), 1);
-    for (int form = kBytes; form < kForms; ++form) {
-      int32_t rc = -1;
-      LXLocale* locale = create(static_cast<Form>(form), "English", LX_USER_LOCALE | c.flags, &rc);
-      EXPECT_EQ(describe(locale), c.objects);
-      EXPECT_EQ(rc, c.code);
-      LXReleaseLocale(locale);
-    }
   }
 }
 

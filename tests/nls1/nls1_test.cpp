@@ -8,15 +8,16 @@
 
 #include "core/library_fixture.h"
 #include "core/lxobjtypes.h"
+#include "nls1/failing_init.h"
+#include "support/case_rows.h"
+
+int32_t lx::test::init_failure;
 
 extern "C" {
-
-// Links in front of LXInit (--wrap): a code to fail with, or 0 to go on.
-static int32_t init_failure;
 int32_t __real_LXInit(const char*, LXAllocHook, LXFreeHook, void*, uint32_t);
 int32_t __wrap_LXInit(const char* directory, LXAllocHook allocate, LXFreeHook release, void* context,
                       uint32_t options) {
-  if (init_failure != 0) return init_failure;
+  if (lx::test::init_failure != 0) return lx::test::init_failure;
   return __real_LXInit(directory, allocate, release, context, options);
 }
 }
@@ -39,28 +40,16 @@ std::string thread_name() {
   return locale != nullptr ? name_of(locale) : "null";
 }
 
-/// What the services answer when there is no library: codes, and nothing that needs an object.
+/// That there is no library for any service; the table of doors says what each of them answers.
 void expect_refusals() {
   int32_t rc = -1;
-  char name[40] = "#";
   NLS1_PrivateFunction_GetProcessLocale();
   EXPECT_EQ(NLS1_PrivateFunction_GetThreadLocale(), nullptr);
   EXPECT_EQ(NLS1_GetLocale(1, 0, 0, &rc), nullptr);
   EXPECT_EQ(rc, 1) << "a code of its own";
-  EXPECT_EQ(NLS1_ConvertNativeLocale("C", 0, &rc), nullptr);
-  EXPECT_EQ(rc, LX_E_NOT_INITIALIZED);
   EXPECT_EQ(NLS1_SetLocale(1, 0, 0), LX_E_NOT_INITIALIZED);
-  EXPECT_EQ(NLS1_SetLocaleFromNative("C", NLS1_THREAD | NLS1_PROCESS), LX_E_NOT_INITIALIZED);
-  EXPECT_EQ(NLS1_SetNativeLocale(1, 0, LC_ALL, 0), LX_E_NOT_INITIALIZED);
   EXPECT_EQ(NLS1_SetNativeFromLocale(nullptr, LC_ALL, 0), LX_E_NOT_INITIALIZED);
-  for (auto* get_id : {NLS1_GetLanguageId, NLS1_GetTerritoryId, NLS1_GetCodepageId, NLS1_GetSortId}) {
-    rc = -1;
-    EXPECT_EQ(get_id("English", &rc), 0);
-    EXPECT_EQ(rc, LX_E_NOT_INITIALIZED);
-  }
-  for (auto* get_name : {NLS1_GetLanguageName, NLS1_GetTerritoryName, NLS1_GetCodepageName, NLS1_GetSortName})
-    EXPECT_EQ(get_name(1, name, sizeof(name)), LX_E_NOT_INITIALIZED);
-  EXPECT_STREQ(name, "#");
+  EXPECT_EQ(NLS1_GetLanguageId("English", &rc), 0);
   EXPECT_EQ(NLS1_GetLocaleNumInfo(nullptr, LX_ITEM_DEFAULT_CODEPAGE, 0), -1);
 }
 
@@ -189,44 +178,25 @@ TEST_F(Nls1Test, WithoutALibrary) {
 
 TEST_F(Nls1Test, LocalesFromIdentifiers) {
   write_directory();
-  struct Case {
-    int32_t language_territory, codepage, flags;
-    const char* name;
-    int32_t code;
-  };
-  const int32_t far = NLS1_LANGUAGE_TERRITORY(1, 40000);
-  const Case cases[] = {
-      {0, 0, 0, kEnglish, LX_OK},
-      {840 * 65536 + 1, 0, 0, kEnglish, LX_OK},
-      {2, 0, 0, kJapanese, LX_OK},
-      {392 * 65536, 0, 0, "English_Japan.US-ASCII@Binary", LX_OK},
-      {NLS1_LANGUAGE_TERRITORY(2, 840), 367, 0, "Japanese_UnitedStates.US-ASCII@Binary", LX_OK},
-      {392, 0, 0, "none", LX_E_NO_LANGUAGE},
-      {NLS1_LANGUAGE_TERRITORY(1, 367), 0, 0, "none", LX_E_NO_TERRITORY},
-      {1, 840, LX_FALLBACK, "none", LX_E_NO_CODEPAGE},
-      {1, 65536 + 367, 0, "none", LX_E_NO_CODEPAGE},
-      {1, 0, 0x8, "none", LX_E_INVALID},
-      // The signed quotient is one too high, the file of that territory is not there.
-      {far, 0, 0, "English_Far.US-ASCII@Binary", LX_OK},
-  };
-  in_process("creation", [&cases] {
-    for (const Case& c : cases) {
-      SCOPED_TRACE(std::to_string(c.language_territory) + " " + std::to_string(c.codepage));
+  in_process("creation", [] {
+    for (const CaseRow& row : case_rows("nls1/locale_identifiers.txt")) {
+      SCOPED_TRACE(row.where);
+      const int32_t both = NLS1_LANGUAGE_TERRITORY(row.number(0), row.number(1));
+      const int32_t codepage = row.number(2), flags = row.number(3);
       int32_t rc = -1;
-      LXLocale* locale = NLS1_GetLocale(c.language_territory, c.codepage, c.flags, &rc);
-      EXPECT_EQ(rc, c.code);
-      EXPECT_EQ(locale != nullptr ? name_of(locale) : "none", c.name);
+      LXLocale* locale = NLS1_GetLocale(both, codepage, flags, &rc);
+      EXPECT_EQ(locale != nullptr ? name_of(locale) : std::to_string(rc), row[4]);
+      EXPECT_EQ(locale != nullptr, rc == LX_OK);
       LXReleaseLocale(locale);
       // The process's default: undefined flags are taken off.
       ASSERT_EQ(NLS1_SetLocale(0, 0, 0), LX_OK);
-      const bool set = c.code == LX_OK || c.code == LX_E_INVALID;
-      EXPECT_EQ(NLS1_SetLocale(c.language_territory, c.codepage, c.flags | NLS1_PROCESS), set ? LX_OK : c.code);
-      EXPECT_EQ(name_of(nullptr), c.code == LX_OK ? c.name : kEnglish);
+      const int32_t set_code = rc == LX_E_INVALID ? LX_OK : rc;
+      EXPECT_EQ(NLS1_SetLocale(both, codepage, flags | NLS1_PROCESS), set_code);
+      EXPECT_EQ(name_of(nullptr), rc == LX_OK ? row[4] : kEnglish);
       // The thread's locale: never, and the process's then neither.
-      for (int32_t flags : {NLS1_THREAD, NLS1_THREAD | NLS1_PROCESS}) {
+      for (int32_t scope : {NLS1_THREAD, NLS1_THREAD | NLS1_PROCESS}) {
         ASSERT_EQ(NLS1_SetLocale(0, 0, 0), LX_OK);
-        EXPECT_EQ(NLS1_SetLocale(c.language_territory, c.codepage, c.flags | flags),
-                  set ? LX_E_INVALID : c.code);
+        EXPECT_EQ(NLS1_SetLocale(both, codepage, flags | scope), set_code == LX_OK ? LX_E_INVALID : set_code);
         EXPECT_EQ(name_of(nullptr), kEnglish);
         EXPECT_EQ(thread_name(), kEnglish);
       }
@@ -271,82 +241,31 @@ TEST_F(Nls1Test, NativeLocales) {
   });
 }
 
-// Each form is forwarded once, with its own unit's entry and exit around it.
-TEST_F(Nls1Test, Items) {
-  write_directory();
-  in_process("items", [] {
-    LXLocale* locale = NLS1_GetLocale(1, 0, 0, nullptr);
-    constexpr int32_t kItem = LX_ITEM_CURRENCY;
-    char text[8];
-    LXWChar wide[] = {'D', 'M', 0}, wide_out[8];
-    LXUChar unicode[] = {'F', 't', 0}, unicode_out[8];
-    RecordingTrace::set_level(RAS1_LEVEL_EVENTS);
-    EXPECT_EQ(NLS1_SetLocaleTextInfoW(locale, kItem, wide, 2, 0), 1);
-    EXPECT_EQ(NLS1_GetLocaleTextInfoU(locale, kItem, unicode_out, 8, 0), 3);
-    EXPECT_EQ(unicode_out[1], 'M');
-    EXPECT_EQ(NLS1_SetLocaleTextInfoU(locale, kItem, unicode, -1, 0), 1);
-    EXPECT_EQ(NLS1_GetLocaleTextInfoW(locale, kItem, wide_out, 8, 0), 3);
-    EXPECT_EQ(wide_out[1], LXWChar{'t'});
-    EXPECT_EQ(NLS1_SetLocaleTextInfoEx(locale, kItem, "Lei", LX_SHIFT_SINGLE, 3, 0), 1);
-    EXPECT_EQ(NLS1_GetLocaleTextInfo(locale, kItem, text, 8, 0), 4);
-    EXPECT_STREQ(text, "Lei");
-    EXPECT_EQ(NLS1_SetLocaleTextInfo(locale, kItem, "", 0, 0), 1);
-    EXPECT_EQ(NLS1_GetLocaleTextInfoEx(locale, kItem, text, LX_SHIFT_SINGLE, 3, LX_TERRITORY_VALUES), 2);
-    EXPECT_STREQ(text, "$");
-    EXPECT_EQ(NLS1_SetLocaleNumInfo(locale, LX_ITEM_POSITIVE_SPACE, 2), 0);
-    EXPECT_EQ(NLS1_GetLocaleNumInfo(locale, LX_ITEM_DEFAULT_CODEPAGE, 0), 367);
-    RecordingTrace::set_level(0);
-    std::vector<intptr_t> exits;
-    for (const TraceRecord& record : RecordingTrace::take())
-      if (record.unit == "qrlnls1" && record.kind == TraceRecord::kExitValue) exits.push_back(record.value);
-    EXPECT_EQ(exits, (std::vector<intptr_t>{1, 3, 1, 3, 1, 4, 1, 2, 0, 367}));
-    LXReleaseLocale(locale);
-  });
-}
-
 TEST_F(Nls1Test, ObjectsByNameAndIdentifier) {
   write_directory();
   in_process("objects", [] {
-    struct IdCase {
-      int32_t (*get)(const char*, int32_t*);
-      const char* name;
-      int32_t id, code;
-    };
-    for (const IdCase& c : {IdCase{NLS1_GetLanguageId, "jAPANESE", 2, LX_OK},
-                            {NLS1_GetLanguageId, "Japan", 0, LX_E_NOT_FOUND},
-                            {NLS1_GetTerritoryId, "Far", 40001, LX_OK},
-                            {NLS1_GetCodepageId, "UJIS", 954, LX_OK},
-                            {NLS1_GetCodepageId, nullptr, 0, LX_E_NOT_FOUND},
-                            {NLS1_GetSortId, "default", 5, LX_OK},
-                            {NLS1_GetSortId, "Binary", 0, LX_OK}}) {
+    const std::map<std::string, int32_t (*)(const char*, int32_t*)> id_of{{"language", NLS1_GetLanguageId},
+                                                                          {"territory", NLS1_GetTerritoryId},
+                                                                          {"codepage", NLS1_GetCodepageId},
+                                                                          {"sort", NLS1_GetSortId}};
+    for (const CaseRow& row : case_rows("nls1/object_names.txt")) {
+      SCOPED_TRACE(row.where);
+      const char* const name = row[1].empty() ? nullptr : row[1].c_str();
       int32_t rc = -1;
-      EXPECT_EQ(c.get(c.name, &rc), c.id);
-      EXPECT_EQ(rc, c.code);
-      EXPECT_EQ(c.get(c.name, nullptr), c.id);
+      EXPECT_EQ(id_of.at(row[0])(name, &rc), row.number(2));
+      EXPECT_EQ(rc, row.number(3));
+      EXPECT_EQ(id_of.at(row[0])(name, nullptr), row.number(2));
     }
-    struct NameCase {
-      int32_t (*get)(int32_t, char*, int32_t);
-      int32_t id, size;
-      const char* name;
-      int32_t code;
-    };
-    for (const NameCase& c :
-         {NameCase{NLS1_GetLanguageName, 2, 9, "Japanese", LX_OK},
-          {NLS1_GetLanguageName, 2, 8, "#", LX_E_SIZE},
-          {NLS1_GetLanguageName, 2, 0, "#", LX_E_SIZE},
-          {NLS1_GetLanguageName, kJapaneseInJapan, 40, "Japanese", LX_OK},
-          {NLS1_GetTerritoryName, kJapaneseInJapan, 40, "Japan", LX_OK},
-          {NLS1_GetTerritoryName, 392, 40, "Japan", LX_OK},
-          {NLS1_GetTerritoryName, NLS1_LANGUAGE_TERRITORY(1, 40001), 40, "#", LX_E_NOT_FOUND},
-          {NLS1_GetCodepageName, 954, 40, "JapanEUC", LX_OK},
-          {NLS1_GetCodepageName, 65536 + 954, 40, "#", LX_E_NOT_FOUND},
-          {NLS1_GetSortName, 5, 40, "Default", LX_OK},
-          {NLS1_GetSortName, 0, 40, "", LX_OK},
-          {NLS1_GetSortName, 6, 40, "#", LX_E_NOT_FOUND}}) {
-      SCOPED_TRACE(c.id);
+    const std::map<std::string, int32_t (*)(int32_t, char*, int32_t)> name_of_id{
+        {"language", NLS1_GetLanguageName},
+        {"territory", NLS1_GetTerritoryName},
+        {"codepage", NLS1_GetCodepageName},
+        {"sort", NLS1_GetSortName}};
+    for (const CaseRow& row : case_rows("nls1/object_identifiers.txt")) {
+      SCOPED_TRACE(row.where);
       char name[40] = "#";
-      EXPECT_EQ(c.get(c.id, name, c.size), c.code);
-      EXPECT_STREQ(name, c.name);
+      EXPECT_EQ(name_of_id.at(row[0])(row.number(1), name, row.number(2)), row.number(4));
+      EXPECT_EQ(name, row[3]);
     }
   });
   // Without sorts the search by identifier looks at the entry beside them: another type is not found.
@@ -363,13 +282,7 @@ TEST_F(Nls1Test, ObjectsByNameAndIdentifier) {
 // Whatever the environment holds, the first call ends with a usable library.
 TEST_F(Nls1Test, Environment) {
   if (access(kDefaultControl, F_OK) == 0) GTEST_SKIP() << "the default directory exists";
-  std::vector<std::string> values = {"",
-                                     "/",
-                                     "%s%n%99999d",
-                                     "\xFF\x01\n;=;_.@",
-                                     "_._@.;LC_CTYPE=",
-                                     "../../..",
-                                     "German_Germany.UTF-8@Default"};
+  std::vector<std::string> values = {"", "/", "%s%n%99999d", "\xFF\x01\n;=;_.@", "_._@.;LC_CTYPE=", "../../.."};
   // Sizes: locale names are read into 132 bytes, paths into 256 with 13 for the control file's name.
   for (size_t bytes : {10, 11, 131, 132, 133, 242, 243, 244, 255, 256, 257, 65536})
     values.push_back(std::string(bytes, 'x'));
@@ -396,41 +309,50 @@ TEST_F(Nls1Test, Environment) {
   });
 }
 
+/// Each message at its level, and at no other.
 TEST_F(Nls1Test, Messages) {
-  const auto expect_message = [this](uint32_t level, const char* text, const std::function<void()>& action) {
-    in_process(text, [&] {
-      bool found = false;
-      for (const std::string& message : messages(level, action)) found |= message == text;
-      EXPECT_TRUE(found);
-    });
-    in_process(std::string("level of ") + text, [&] {
-      for (const std::string& message : messages(~level, action)) EXPECT_NE(message, text);
-    });
-  };
   const auto initialise = [] { NLS1_PrivateFunction_GetProcessLocale(); };
-  expect_message(RAS1_LEVEL_PROCESS, "Unable to determine location of locale definitions\n", initialise);
-  expect_message(RAS1_LEVEL_PROCESS, "Unable to initialize Lexicor, rc = 11", [&] {
-    init_failure = LX_E_NOT_INITIALIZED;
-    initialise();
-  });
-  write_directory();
-  expect_message(RAS1_LEVEL_DETAIL, "Invalid Language 3", [] { NLS1_GetLocale(3, 0, 0, nullptr); });
-  expect_message(RAS1_LEVEL_DETAIL, "Invalid Territory 9",
-                 [] { NLS1_GetLocale(9 * 65536 + 1, 0, 0, nullptr); });
-  expect_message(RAS1_LEVEL_DETAIL, "Invalid Codepage -7", [] { NLS1_SetLocale(1, -7, 0); });
-  expect_message(RAS1_LEVEL_ERRORS, "LXConvertNativeLocale failed for xx_XX with rc 31",
-                 [] { NLS1_ConvertNativeLocale("xx_XX", 0, nullptr); });
-  expect_message(RAS1_LEVEL_ERRORS, "NLS1_ConvertLocale failed with rc = 32",
-                 [] { NLS1_SetNativeLocale(2, 0, LC_ALL, 0); });
-  expect_message(RAS1_LEVEL_ERRORS, "setlocale failed to setlocale to C",
-                 [] { NLS1_SetNativeFromLocale(nullptr, 99, 0); });
-  expect_message(RAS1_LEVEL_ERRORS, "Object name length (8) for Japanese exceeds output buffer length (8)", [] {
-    char name[8];
-    NLS1_GetLanguageName(2, name, sizeof(name));
-  });
-  directory.write("control.nls", control_file({{2, LX_LANGUAGE, "Japanese"}}));
-  expect_message(RAS1_LEVEL_PROCESS, "Unable to set global locale, rc = 31", initialise);
-  expect_message(RAS1_LEVEL_PROCESS, "Unable to set thread locale, rc = 31", [] { thread_name(); });
+  const struct {
+    uint32_t level;
+    const char* text;
+    std::function<void()> action;
+    enum { kNothing, kNoEnglish, kWhole } directory = kWhole;
+  } cases[] = {
+      {RAS1_LEVEL_PROCESS, "Unable to determine location of locale definitions\n", initialise, cases->kNothing},
+      {RAS1_LEVEL_PROCESS, "Unable to initialize Lexicor, rc = 11",
+       [&] {
+         init_failure = LX_E_NOT_INITIALIZED;
+         initialise();
+       },
+       cases->kNothing},
+      {RAS1_LEVEL_PROCESS, "Unable to set global locale, rc = 31", initialise, cases->kNoEnglish},
+      {RAS1_LEVEL_PROCESS, "Unable to set thread locale, rc = 31", [] { thread_name(); }, cases->kNoEnglish},
+      {RAS1_LEVEL_DETAIL, "Invalid Language 3", [] { NLS1_GetLocale(3, 0, 0, nullptr); }},
+      {RAS1_LEVEL_DETAIL, "Invalid Territory 9", [] { NLS1_GetLocale(9 * 65536 + 1, 0, 0, nullptr); }},
+      {RAS1_LEVEL_DETAIL, "Invalid Codepage -7", [] { NLS1_SetLocale(1, -7, 0); }},
+      {RAS1_LEVEL_ERRORS, "LXConvertNativeLocale failed for xx_XX with rc 31",
+       [] { NLS1_ConvertNativeLocale("xx_XX", 0, nullptr); }},
+      {RAS1_LEVEL_ERRORS, "NLS1_ConvertLocale failed with rc = 32",
+       [] { NLS1_SetNativeLocale(2, 0, LC_ALL, 0); }},
+      {RAS1_LEVEL_ERRORS, "setlocale failed to setlocale to C",
+       [] { NLS1_SetNativeFromLocale(nullptr, 99, 0); }},
+      {RAS1_LEVEL_ERRORS, "Object name length (8) for Japanese exceeds output buffer length (8)",
+       [] {
+         char name[8];
+         NLS1_GetLanguageName(2, name, sizeof(name));
+       }},
+  };
+  for (const auto& c : cases) {
+    if (c.directory != c.kNothing) write_directory();
+    if (c.directory == c.kNoEnglish)
+      directory.write("control.nls", control_file({{2, LX_LANGUAGE, "Japanese"}}));
+    for (bool at_level : {true, false}) {
+      in_process(c.text, [&] {
+        const std::vector<std::string> texts = messages(at_level ? c.level : ~c.level, c.action);
+        EXPECT_EQ(std::count(texts.begin(), texts.end(), c.text) != 0, at_level);
+      });
+    }
+  }
 }
 
 }  // namespace

@@ -5,6 +5,7 @@
 #include "core/library_fixture.h"
 #include "core/lxformat.h"
 #include "nls1.h"
+#include "support/case_rows.h"
 #include "support/tiny_codepages.h"
 
 namespace lx::test {
@@ -124,92 +125,39 @@ TEST(Translate, AgreesWithConversion) {
   });
 }
 
-struct Row {
-  int32_t to, from, size, flags;
-  std::string input, output;
-  int32_t consumed;  // the result too where characters are counted; -1: refused
-  uint32_t code = LX_OK;
-  int32_t length = -2;  // of the whole input
-};
+int32_t codepage_of_letter(const std::string& letter) {
+  return std::map<std::string, int32_t>{{"S", S}, {"J", J}, {"V", V}, {"H", H}, {"U", U}}.at(letter);
+}
+int32_t flags_of_letters(const std::string& letters) {
+  const std::map<char, int32_t> flags{{'p', kPad},  {'d', kDrop}, {'c', kChars},
+                                      {'t', kTerm}, {'1', 1},     {'!', 0x100}};
+  int32_t sum = 0;
+  for (char letter : letters) sum |= flags.at(letter);
+  return sum;
+}
 
 TEST(Translate, Ends) {
-  const std::string k = "\x82\x9F", one = "\x0E\x44\x47", z(1, '\0'), az = "a" + z, hiragana = "\x41\x30";
-  constexpr uint32_t kLeft = LX_E_SIZE;
-  const Row rows[] = {
-      // Blanks that do not fit.
-      {S, S, 2, kDrop, "ab   ", "ab", 5},
-      {S, S, 2, 0, "ab   ", "ab", 2, kLeft},
-      {S, S, 2, kDrop, "ab  c", "ab", 2, kLeft},
-      {S, H, 1, kDrop, "\xC1\x40\x40", "A", 3},
-      {S, S, 3, kDrop | kTerm, "ab  ", "ab" + z, 4},
-      {S, S, 2, kDrop | kChars, "ab  ", "ab", 2},
-      {S, U, 1, kDrop, az + " " + z + " " + z, "a", 6},
-      {S, U, 1, kDrop, az + " " + z + " ", "a", 2, kLeft},
-      {U, H, 2, kDrop, one + "\x0F\x40\x40", hiragana, 6},
-      {U, H, 2, kDrop, one + "\x40\x40", hiragana, 3, kLeft},
-      // Shift bytes and cut characters at the end of what is consumed.
-      {U, H, 2, 0, one + "\x0F", hiragana, 4},
-      {U, H, 2, 0, one + "\x0F\xC1", hiragana, 4, kLeft},
-      {U, H, 2, 0, "\xC1" + one, "A" + z, 1, kLeft},
-      {U, H, 8, 0, "\xC1\x0E\x44", "A" + z, 1, kLeft},
-      {V, J, 8, 0, "a\x82", "a", 1, kLeft},
-      {V, J, 8, 0, "a\x82" + z, "a", 1, kLeft, -1},
-      {S, U, 8, 0, az + "b", "a", 2, kLeft},
-      {U, S, 3, kPad, "ab", az, 1, kLeft},
-      // Padding.
-      {H, S, 3, kPad, "A", "\xC1\x40\x40", 1},
-      {S, S, 5, kPad | kTerm, "ab", "ab  " + z, 2},
-      {S, S, 5, kPad, "ab" + z, "ab   ", 2, LX_OK, -1},
-      {V, J, 4, kPad, k + k, "\xE3\x81\x81 ", 2, kLeft},
-      {J, V, 4, kPad | kChars | kTerm, "a\xE3\x81\x81", "a" + k + " " + z, 4, LX_OK, 2},
-      {U, S, 2, kPad | kChars, "a", az + " " + z, 2},
-      {U, U, 7, kPad, hiragana, hiragana + " " + z + " " + z, 2},
-      {S, S, 2, kPad, z, "  ", 0, LX_OK, -1},
-      {S, S, 2, kPad, "", "", 0},
-      // The state at the end; what is taken back stays consumed.
-      {H, J, 6, kPad, k, one + "\x0F\x40\x40", 2},
-      {H, J, 5, kTerm, k, one + "\x0F" + z, 2},
-      {H, J, 4, 0, k + z, one + "\x0F", 2, LX_OK, -1},
-      {H, J, 5, 0, k + k, one + "\x0F", 4},
-      {H, J, 5, 0, k + k + z, one + "\x0F" + z, 4, LX_OK, -1},
-      {H, J, 5, kPad, k + k + k, one + "\x0F\x40", 4, kLeft},
-      {H, J, 3, 0, k, "\x0E\x0F", 2},
-      {H, J, 2, 0, k, "", 0, kLeft},
-      {H, J, 3, kChars, k + k + k, one + "\x44\x47\x0F", 2, LX_OK, 3},
-      {H, J, 4, kChars, k + k + k, one + "\x44\x47\x44\x47\x0F", 3, LX_OK, 3},
-      // Nothing to translate, or no room.
-      {S, S, 0, kTerm, "ab", "", 0},
-      {S, S, -5, kTerm | kPad, "ab", "", 0},
-      {U, S, 4, kTerm, "", z, 0},
-      {U, S, 4, kTerm | kChars, "", z, 1},
-      {U, U, 2, 0, z + z, z + z, 0, LX_OK, -1},
-      {U, S, 3, kTerm, "ab", z + z, 0, kLeft},
-      {U, U, 1, 0, az, "", -1, kLeft},
-      {U, S, 1, kChars, "a", "", -1, kLeft},
-      {S, S, 2, 1, "ab", "", -1, LX_E_INVALID},
-      {S, S, 0, kDrop | kPad | kChars | kTerm | 0x100, "", "", -1, LX_E_INVALID},
-  };
-  expect_in_child("rows", [&] {
+  expect_in_child("rows", [] {
     // A single-byte codepage has no shift states, whatever it says.
     std::vector<TinyCodepage> codepages = tiny_codepages();
     codepages[0].file.sections[0][format::codepage::kShiftOut] = 'a';
     codepages[0].file.sections[0][format::codepage::kFlags] = format::codepage::kFlagShift;
     TinyLibrary library(codepages);
-    for (const Row& row : rows) {
-      SCOPED_TRACE(&row - rows);
-      const Bytes input(row.input.begin(), row.input.end());
-      const int32_t length = row.length == -2 ? static_cast<int32_t>(input.size()) : row.length;
-      const bool by_chars = (row.flags & kChars) != 0;
+    for (const CaseRow& row : case_rows("nls1/translation_ends.txt")) {
+      SCOPED_TRACE(row.where);
+      const Bytes input(row[4].begin(), row[4].end()), output(row[5].begin(), row[5].end());
+      const int32_t size = row.number(2), flags = flags_of_letters(row[3]), consumed = row.number(6);
+      const int32_t length = row.fields.size() > 8 ? row.number(8) : static_cast<int32_t>(input.size());
+      const bool by_chars = (flags & kChars) != 0;
       // One byte more where a character is taken back for the shift byte.
-      const size_t room = by_chars ? row.output.size() + 1 : static_cast<size_t>(std::max(row.size, 0));
-      Translated t = translate(row.to, row.from, input, length, row.size, row.flags, room);
-      EXPECT_EQ(t.result,
-                by_chars || row.consumed < 0 ? row.consumed : static_cast<int32_t>(row.output.size()));
-      EXPECT_EQ(t.consumed, std::max(row.consumed, 0));
-      EXPECT_EQ(t.rc, row.code);
-      t.output.resize(row.output.size());
-      EXPECT_EQ(testing::PrintToString(std::string(t.output.begin(), t.output.end())),
-                testing::PrintToString(row.output));
+      const size_t room = by_chars ? output.size() + 1 : static_cast<size_t>(std::max(size, 0));
+      Translated t =
+          translate(codepage_of_letter(row[0]), codepage_of_letter(row[1]), input, length, size, flags, room);
+      EXPECT_EQ(t.result, by_chars || consumed < 0 ? consumed : static_cast<int32_t>(output.size()));
+      EXPECT_EQ(t.consumed, std::max(consumed, 0));
+      EXPECT_EQ(t.rc, static_cast<uint32_t>(row.number(7)));
+      t.output.resize(output.size());
+      EXPECT_EQ(t.output, output);
     }
   });
 }

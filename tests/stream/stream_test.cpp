@@ -332,6 +332,9 @@ TEST_F(Streams, PushedBackToTheLimit) {
   EXPECT_EQ(LXUngetChar(stream, jis, "a"), 1);
   EXPECT_EQ(LXFlushStream(stream, jis), 1);
   EXPECT_EQ(LXReadCharW(stream, jis), LX_STREAM_END) << "flushed";
+  peer.script.assign(peer.calls + 1, -1);
+  EXPECT_EQ(LXReadCharW(stream, jis), LX_STREAM_END) << "a failure before the first byte";
+  EXPECT_EQ(LXGetError(jis), LX_OK);
   EXPECT_EQ(LXCloseStream(stream, jis), 1);
 
   // Flushing keeps the state of what follows.

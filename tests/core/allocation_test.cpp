@@ -1,0 +1,281 @@
+// Every function that allocates, with each of its allocations failing in turn: it gives the memory code or
+// succeeds, nothing changes, nothing is lost, and the next try succeeds.
+#include <cstring>
+
+#include "core/tiny_directory.h"
+#include "support/catalog_builder.h"
+#include "support/system_locale.h"
+
+namespace lx::test {
+namespace {
+
+using Wide = std::basic_string<LXWChar>;
+using Unicode = std::basic_string<LXUChar>;
+
+constexpr char kEverything[] = "English_Elsewhere.TINY-SHIFT@Default";
+
+/// What a call may do where memory fails, beside giving LX_E_MEMORY and leaving all as it was.
+enum Leave : uint32_t {
+  kStrict = 0,
+  kLoads = 1,   // objects stay loaded
+  kCopes = 2,   // it works without the block
+  kOutside = 4  // it starts without the library
+};
+
+struct Row {
+  const char* name;
+  uint32_t leave;
+  std::function<int32_t(LXLocale*)> call;  // the code
+  int32_t other = LX_E_MEMORY;             // a code that stands for no memory too
+};
+
+/// The code of what makes a locale, which is released.
+int32_t made(const std::function<LXLocale*(int32_t*)>& make) {
+  int32_t rc = -1;
+  LXLocale* locale = make(&rc);
+  EXPECT_EQ(locale != nullptr, rc == LX_OK);
+  if (locale != nullptr) {
+    EXPECT_EQ(LXReleaseLocale(locale), 0);
+  }
+  return rc;
+}
+/// The error that a call with this result left.
+int32_t left(LXLocale* locale, bool done) {
+  EXPECT_EQ(LXGetError(locale) == LX_OK, done);
+  return LXGetError(locale);
+}
+
+class AllocationTest : public LibraryTest {
+ protected:
+  void SetUp() override {
+    LibraryTest::SetUp();
+    write_tiny_directory(directory);
+    directory.write("catalog", catalog_file({{3, {{4, std::string(300, 'm')}}}}));
+  }
+
+  /// Every item in the forms that show all of it.
+  static std::string state_of(LXLocale* locale) {
+    std::string state = std::to_string(locale->changed) + ' ' + std::to_string(locale->flags);
+    for (int32_t item = 1; item <= LX_ITEM_LOCALE_STRING; ++item) {
+      char bytes[300] = "";
+      LXUChar units[300] = {};
+      LXGetLocaleTextInfo(locale, item, bytes, sizeof(bytes), 0);
+      LXGetLocaleTextInfoU(locale, item, units, 300, 0);
+      state += '|' + std::to_string(LXGetLocaleNumInfo(locale, item, 0)) + bytes;
+      for (const LXUChar* unit = units; *unit != 0; ++unit) state += ' ' + std::to_string(*unit);
+    }
+    return state;
+  }
+
+  LXLocale* begin() {
+    EXPECT_EQ(init(), LX_OK);
+    EXPECT_EQ(LXSetLocale("English", 0), LX_OK);
+    LXLocale* locale = LXGetLocale("English_UnitedStates.TINY-UTF8@Default", 0, nullptr);
+    EXPECT_NE(locale, nullptr);
+    return locale;
+  }
+
+  /// With allocation `n` failing. False when there are fewer.
+  bool fails(const Row& row, size_t n, bool from_then_on) {
+    LXLocale* const locale = (row.leave & kOutside) == 0 ? begin() : nullptr;
+    const std::string before = locale != nullptr ? state_of(locale) : "";
+    const size_t blocks = hooks.live_blocks();
+    hooks.fail_at(n, from_then_on);
+    const int32_t code = row.call(locale);
+    const bool failed = hooks.failed();
+    hooks.fail_at(0);
+    EXPECT_EQ(system.current, "C") << "the system's locale is put back";
+    EXPECT_TRUE(code == LX_OK ? !failed || (row.leave & kCopes) != 0
+                              : failed && (code == LX_E_MEMORY || code == row.other))
+        << code;
+    if (code != LX_OK && locale != nullptr) {
+      EXPECT_EQ(state_of(locale), before);
+      if ((row.leave & kLoads) == 0) {
+        EXPECT_EQ(hooks.live_blocks(), blocks);
+      }
+      EXPECT_EQ(row.call(locale), LX_OK) << "a later try";
+    }
+    LXReleaseLocale(locale);
+    terminate();
+    EXPECT_EQ(hooks.live_blocks(), 0u);
+    EXPECT_EQ(hooks.wrong_frees(), 0u);
+    return failed;
+  }
+
+  void expect_row(const Row& row) {
+    for (bool from_then_on : {false, true}) {
+      for (size_t n = 1;; ++n) {
+        SCOPED_TRACE(std::string(row.name) + (from_then_on ? ", from allocation " : ", allocation ") +
+                     std::to_string(n));
+        if (!fails(row, n, from_then_on)) {
+          EXPECT_GT(n, 1u) << "it allocates nothing";
+          break;
+        }
+        ASSERT_FALSE(HasFailure());
+      }
+    }
+  }
+
+  SystemLocale system;
+};
+
+TEST_F(AllocationTest, EveryAllocationFails) {
+  const std::string path = directory.path(), control = directory.file("control.nls"),
+                    catalog = directory.file("catalog");
+  const std::string long_text(400, 'a'), longer = long_text + "  ";
+  const Unicode long_units = widened<LXUChar>(long_text + 'b'),
+                capitals = widened<LXUChar>(std::string(400, 'A') + 'B'), catalog16 = widened<LXUChar>(catalog),
+                missing16(400, 'd');
+  const Unicode everything16 = widened<LXUChar>(kEverything);
+  const Wide everything32 = widened<LXWChar>(kEverything), long_codes(400, 'a');
+  const LXUChar currency[] = {0x3041, 0x3042, 0x3043, 'A', 0};
+  const LXUChar* const currency16 = currency;
+  system.known["de_DE"] = SystemLocale::nothing();
+  system.environment = "de_DE";
+  const auto object = [](int32_t type, uint16_t id) {
+    int32_t rc = -1;
+    const LXObject* found = LXGetObjFromID(nullptr, type, id, LX_FIND_AND_LOAD, &rc);
+    EXPECT_EQ(found != nullptr, rc == LX_OK);
+    return rc;
+  };
+  const auto locale_of_name = [](const char* name, int32_t flags) {
+    return made([=](int32_t* rc) { return LXGetLocale(name, flags, rc); });
+  };
+  const auto message = [=](uint32_t mode, bool found) {
+    LXCatalog* opened = LXOpenCatalogU(nullptr, long_units.c_str(), catalog16.c_str(), mode);
+    if (opened == nullptr) return LXGetError(nullptr);
+    LXUChar text[500];
+    const int32_t code = LXGetMessageU(opened, 3, found ? 4 : 9, text, 500, missing16.c_str());
+    EXPECT_EQ(LXCloseCatalog(opened), LX_OK);
+    return code;
+  };
+  uint8_t key[16];
+  int32_t rc = -1;
+  const Row rows[] = {
+      {"LXInit", kOutside | kCopes,
+       [&](LXLocale*) {
+         const int32_t code = init();
+         EXPECT_EQ(LXTerm(), code == LX_OK ? LX_OK : LX_E_NOT_INITIALIZED);
+         return code;
+       },
+       LX_E_NOT_INITIALIZED},
+      {"LXInitObjManager", kCopes,
+       [&](LXLocale*) {
+         LXObjManager* own = LXInitObjManager(path.c_str(), 0, &rc);
+         EXPECT_EQ(own != nullptr, rc == LX_OK);
+         if (own != nullptr) {
+           EXPECT_EQ(LXTermObjManager(own), LX_OK);
+         }
+         return rc;
+       }},
+      // Objects of every type, and a codepage that is converted.
+      {"territory", kLoads, [&](LXLocale*) { return object(LX_TERRITORY, kElsewhereId); }},
+      {"codepage", kLoads, [&](LXLocale*) { return object(LX_CODEPAGE, tiny_euc().file.id); }},
+      {"old codepage", kLoads, [&](LXLocale*) { return object(LX_CODEPAGE, kOldId); }},
+      {"sort and language", kOutside | kCopes,
+       [&](LXLocale*) {
+         int32_t code = init();
+         if (code == LX_OK) code = object(LX_SORT, kSortId);
+         if (code == LX_OK) code = object(LX_LANGUAGE, 1);
+         terminate();
+         return code;
+       },
+       LX_E_NOT_INITIALIZED},
+      // Locales.
+      {"LXGetLocale", kLoads, [&](LXLocale*) { return locale_of_name(kEverything, 0); }},
+      {"LXGetLocale, old codepage", kLoads, [&](LXLocale*) { return locale_of_name("English.Old", 0); }},
+      {"LXGetLocale, user", kLoads,
+       [&](LXLocale*) { return locale_of_name(nullptr, LX_USER_LOCALE | LX_FALLBACK); }},
+      {"LXGetLocaleW", kLoads,
+       [&](LXLocale*) {
+         return made([&](int32_t* code) { return LXGetLocaleW(everything32.c_str(), 0, code); });
+       }},
+      {"LXGetLocaleU", kLoads,
+       [&](LXLocale*) {
+         return made([&](int32_t* code) { return LXGetLocaleU(everything16.c_str(), 0, code); });
+       }},
+      {"LXSetLocale", kLoads, [&](LXLocale*) { return LXSetLocale(kEverything, 0); }},
+      {"LXSetLocaleW", kLoads, [&](LXLocale*) { return LXSetLocaleW(everything32.c_str(), LX_FALLBACK); }},
+      {"LXSetLocaleU", kLoads, [&](LXLocale*) { return LXSetLocaleU(everything16.c_str(), 0); }},
+      {"LXConvertNativeLocale", kLoads,
+       [&](LXLocale*) {
+         return made([](int32_t* code) { return LXConvertNativeLocale("de_DE", LX_FALLBACK, code); });
+       }},
+      // Items of a locale.
+      {"territory of a locale", kLoads,
+       [](LXLocale* l) { return left(l, LXSetLocaleNumInfo(l, 5, kElsewhereId)); }},
+      {"codepage of a locale", kLoads | kCopes,
+       [](LXLocale* l) { return left(l, LXSetLocaleNumInfo(l, 9, tiny_shift().file.id)); }},
+      {"codepage by name", kLoads | kCopes,
+       [&](LXLocale* l) { return left(l, LXSetLocaleTextInfo(l, 10, "TINY-EUC", -1, 0)); }},
+      {"LXSetLocaleTextInfo", kCopes,
+       [&](LXLocale* l) { return left(l, LXSetLocaleTextInfo(l, 81, long_text.c_str(), -1, 0)); }},
+      {"LXSetLocaleTextInfoU", kCopes,
+       [&](LXLocale* l) { return left(l, LXSetLocaleTextInfoU(l, 64, currency16, -1, 0)); }},
+      {"LXSetLocaleTextInfoW", kCopes,
+       [&](LXLocale* l) { return left(l, LXSetLocaleTextInfoW(l, 72, long_codes.data(), 300, 0)); }},
+      // Handles.
+      {"LXOpenConversion", 0,
+       [](LXLocale* l) {
+         LXConversion* conversion = LXOpenConversion(l, nullptr);
+         if (conversion != nullptr) {
+           EXPECT_EQ(LXCloseConversion(conversion), LX_OK);
+         }
+         return left(l, conversion != nullptr);
+       }},
+      {"LXOpenStream", 0,
+       [](LXLocale* l) {
+         LXStream* stream = LXOpenStream(
+             l, [](void*, char*, int32_t) { return 0; }, nullptr, LX_STREAM_READ);
+         if (stream != nullptr) {
+           EXPECT_EQ(LXCloseStream(stream, l), 1);
+         }
+         return left(l, stream != nullptr);
+       }},
+      {"LXOpenFile and LXLoadFile", 0,
+       [&](LXLocale*) {
+         LXFile* file = LXOpenFile(1, control.c_str(), LX_READ, 0, &rc);
+         if (file == nullptr) return rc;
+         LXUnloadFile(LXLoadFile(file, 0, 4, &rc));
+         EXPECT_EQ(LXCloseFile(file, 0), 0);
+         return rc;
+       }},
+      {"messages", kCopes, [&](LXLocale*) { return message(0, true); }, LX_E_CATALOG},
+      {"messages of a loaded catalog", kCopes, [&](LXLocale*) { return message(LX_CATALOG_LOAD, true); },
+       LX_E_CATALOG},
+      {"default messages", kCopes, [&](LXLocale*) { return message(0, false); }, LX_E_CATALOG},
+      {"LXMcMalloc and LXMcRealloc", 0,
+       [](LXLocale*) {
+         void* const block = LXMcMalloc(4);
+         if (block == nullptr) return LX_E_MEMORY;
+         void* const larger = LXMcRealloc(block, 4, 8);
+         EXPECT_EQ(LXMcFree(larger != nullptr ? larger : block), 1);
+         return larger != nullptr ? LX_OK : LX_E_MEMORY;
+       }},
+      // Texts that are longer than the stack's room.
+      {"LXStrcmp, blanks", kCopes,
+       [&](LXLocale*) {
+         const int32_t result = LXStrcmp(nullptr, longer.c_str(), -1, long_text.c_str(), -1, LX_IGNORE_BLANKS);
+         EXPECT_TRUE(result == 0 || (result == 2 && hooks.failed())) << "the blanks count";
+         return left(nullptr, true);
+       }},
+      {"LXStrcollU", 0,
+       [&](LXLocale* l) {
+         return left(l, LXStrcollU(l, long_units.c_str(), -1, capitals.c_str(), -1, 0) < 0);
+       }},
+      {"LXStrcollU without case", 0,
+       [&](LXLocale* l) {
+         return left(l, LXStrcollU(l, capitals.c_str(), 400, long_units.c_str(), -1, LX_CASE_INSENSITIVE) < 0);
+       }},
+      {"LXStrxfrmU", 0,
+       [&](LXLocale* l) { return left(l, LXStrxfrmU(l, key, sizeof(key), long_units.c_str(), -1, 0) >= 0); }},
+      {"LXStrGenSortKey", 0,
+       [&](LXLocale* l) {
+         return left(l, LXStrGenSortKey(l, key, sizeof(key), long_units.c_str(), 400) >= 0);
+       }},
+  };
+  for (const Row& row : rows) expect_row(row);
+}
+
+}  // namespace
+}  // namespace lx::test

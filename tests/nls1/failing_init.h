@@ -1,0 +1,11 @@
+// An initialisation that fails: what links this calls LXInit through --wrap.
+#pragma once
+
+#include <cstdint>
+
+namespace lx::test {
+
+/// The code that LXInit fails with; 0: it goes on.
+extern int32_t init_failure;
+
+}  // namespace lx::test
