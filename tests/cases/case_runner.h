@@ -67,7 +67,14 @@ struct CaseRun {
     return static_cast<typename F::Char>(Encoded<F>(cp, text.units()).codes.at(0));
   }
 
-  void number(int64_t got) { EXPECT_EQ(got, std::strtoll(c.expected.word().c_str(), nullptr, 0)); }
+  /// A number, or its sign.
+  void number(int64_t got) {
+    const std::string word = c.expected.word();
+    if (word == "<" || word == ">")
+      EXPECT_EQ(word, got < 0 ? "<" : got > 0 ? ">" : "=") << got;
+    else
+      EXPECT_EQ(got, std::strtoll(word.c_str(), nullptr, 0));
+  }
   /// A place in a text: the number of its character, of a raw text its byte, or "none".
   void place(const Unit* got, const CaseInput<Unit>& in) {
     const std::string word = c.expected.word();
@@ -119,5 +126,6 @@ Family in_bytes(Body body) {
 }
 
 Families string_families();
+Families compare_families();
 
 }  // namespace lx::test

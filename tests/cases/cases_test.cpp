@@ -7,6 +7,7 @@
 #include "cases/case_runner.h"
 #include "platform/ras1.h"
 #include "platform/recording_ras1.h"
+#include "support/library.h"
 
 namespace lx::test {
 
@@ -25,7 +26,11 @@ uint32_t case_flags(const CaseWords& words) {
 namespace {
 
 const Families& families() {
-  static const Families all = string_families();
+  static const Families all = [] {
+    Families made = string_families();
+    made.merge(compare_families());
+    return made;
+  }();
   return all;
 }
 
@@ -36,6 +41,28 @@ std::vector<std::string> case_files() {
   std::sort(paths.begin(), paths.end());
   return paths;
 }
+
+/// The locale that a case asks for, with the values that it sets.
+class CaseLocale {
+ public:
+  CaseLocale(CaseLibrary& library, const Case& c, const TinyCodepage& cp) {
+    std::string language = "English", sort;
+    bool changed = false;
+    for (const CaseWords& with : c.with)
+      for (const CaseWords::Word& w : with.all)
+        if (w.name == "language" || w.name == "sort")
+          (w.name == "sort" ? sort : language) = w.value;
+        else
+          changed = true;
+    locale_ = changed ? library.new_locale(cp, language, sort) : library.locale(cp, language, sort);
+    if (changed) own_.reset(locale_);
+  }
+  LXLocale* get() const { return locale_; }
+
+ private:
+  LXLocale* locale_;
+  LocalePtr own_;
+};
 
 class Cases : public testing::TestWithParam<std::string> {
  protected:
@@ -84,7 +111,8 @@ class Cases : public testing::TestWithParam<std::string> {
     states.text = static_cast<LXShiftState>(c.given.number("state", 0));
     states.second = static_cast<LXShiftState>(c.given.number("state2", 0));
     states.output = static_cast<LXShiftState>(c.given.number("output-state", 0));
-    CaseRun<F> r{c, cp, library_, library_.locale(cp), null, case_flags(c.given)};
+    CaseLocale locale(library_, c, cp);
+    CaseRun<F> r{c, cp, library_, locale.get(), null, case_flags(c.given)};
     const bool says = c.expected.has_text("says");
     const Units messages = says ? c.expected.text("says").units() : Units();
     const int32_t error = c.expected.number("error", LX_OK);
@@ -104,7 +132,8 @@ class Cases : public testing::TestWithParam<std::string> {
   }
   static std::string said() {
     std::string all;
-    for (const TraceRecord& r : RecordingTrace::take()) all += (all.empty() ? "" : "|") + r.text;
+    for (const TraceRecord& r : RecordingTrace::take())
+      all += (all.empty() ? "" : "|") + r.text + shown(Units(r.bytes.begin(), r.bytes.end()));
     return all;
   }
 

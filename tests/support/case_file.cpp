@@ -41,6 +41,8 @@ class Scanner {
     switch (const char c = at_ < line_.size() ? line_[at_++] : '\0') {
       case '>':
         return CaseText::kShiftOut;
+      case '-':
+        return CaseText::kNothing;
       case '<':
         return CaseText::kShiftIn;
       case 'n':
@@ -121,7 +123,9 @@ bool CaseText::raw() const {
 std::string CaseText::bytes(const TinyCodepage& cp) const {
   std::string made;
   for (const uint32_t v : values)
-    if (v == kShiftOut || v == kShiftIn)
+    if (v == kNothing)
+      continue;
+    else if (v == kShiftOut || v == kShiftIn)
       made += v == kShiftOut ? cp.shift_out : cp.shift_in;
     else
       made += v >= kByte ? std::string(1, static_cast<char>(v)) : cp.find(static_cast<uint16_t>(v))->bytes;
@@ -176,7 +180,7 @@ std::vector<Case> read_cases(const std::string& path) {
     ++number;
     if (!line.empty() && line[0] == '#') continue;
     if (!line.empty() && line[0] == ' ' && !lines.empty())
-      lines.back().second += line;
+      lines.back().second += line.substr(line.find_first_not_of(' ') - 1);
     else
       lines.emplace_back(number, line);
   }

@@ -24,8 +24,8 @@ struct CaseError : std::runtime_error {
 };
 
 struct CaseText {
-  enum : uint32_t { kByte = 0x10000, kShiftOut = 0x20000, kShiftIn = 0x30000 };
-  std::vector<uint32_t> values;  // Unicode values; bytes with kByte; kShiftOut and kShiftIn
+  enum : uint32_t { kByte = 0x10000, kShiftOut = 0x20000, kShiftIn = 0x30000, kNothing = 0x40000 };
+  std::vector<uint32_t> values;  // Unicode values; bytes with kByte; the others
 
   bool raw() const;
   Units units() const { return Units(values.begin(), values.end()); }
