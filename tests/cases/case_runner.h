@@ -36,6 +36,8 @@ struct CaseRun {
   LXLocale* l;
   bool null;       // texts are null-terminated; otherwise their lengths are given
   uint32_t flags;  // of the words
+  int32_t error;   // that the locale has at the end
+  bool once;       // what is written is not written again with a null, which would change the room
 
   static constexpr bool kBytes = sizeof(Unit) == 1;
   static constexpr Unit kCanary = static_cast<Unit>(0xA5A5A5A5);
@@ -43,6 +45,7 @@ struct CaseRun {
   const CaseWords& expected() const { return c.expected; }
 
   std::vector<Unit> units(const CaseText& text, LXShiftState state = 0) const {
+    if (text.values.empty()) return {};
     if (!text.raw()) return Encoded<F>(cp, text.units(), state).units;
     const std::string bytes = text.bytes(cp);
     return {bytes.begin(), bytes.end()};
@@ -127,5 +130,8 @@ Family in_bytes(Body body) {
 
 Families string_families();
 Families compare_families();
+Families convert_families();
+Families walk_families();
+Families format_families();
 
 }  // namespace lx::test

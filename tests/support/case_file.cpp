@@ -133,7 +133,8 @@ std::string CaseText::bytes(const TinyCodepage& cp) const {
 }
 bool CaseText::in(const TinyCodepage& cp) const {
   return std::all_of(values.begin(), values.end(), [&](uint32_t v) {
-    return v < kByte ? cp.find(static_cast<uint16_t>(v)) != nullptr : v < kShiftOut || cp.shift;
+    if (v < kByte) return v == 0xFFFD || cp.find(static_cast<uint16_t>(v)) != nullptr;
+    return cp.shift || (v != kShiftOut && v != kShiftIn);
   });
 }
 
@@ -155,6 +156,12 @@ std::string CaseWords::word() const {
   for (const Word& w : all)
     if (!w.used && !w.quoted && w.value.empty()) return w.used = true, w.name;
   throw CaseError("a word is missing");
+}
+std::vector<std::string> CaseWords::rest() const {
+  std::vector<std::string> words;
+  for (const Word& w : all)
+    if (!w.used && !w.quoted && w.value.empty() && w.name != "refused") w.used = true, words.push_back(w.name);
+  return words;
 }
 int32_t CaseWords::number(const std::string& name, int32_t otherwise) const {
   const Word* const found = find(name, false);

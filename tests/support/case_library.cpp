@@ -81,7 +81,7 @@ TinyCodepage utf8() {
       .map(0xE4B880, 0x4E00, 64)
       .map(0xE4BA80, 0x4E80, 64);
   builder.map(0xE4BC80, 0x4F00).map(0xE58686, 0x5186).map(0xEFBC90, 0xFF10, 10).map(0xEFBCA1, 0xFF21, 26);
-  return with_widths(builder.map(0xEFBD81, 0xFF41, 26).build());
+  return with_widths(builder.map(0xEFBD81, 0xFF41, 26).map(0xEFBDA1, 0xFF61, 31).build());
 }
 
 ByteString built_in_language() {
@@ -185,11 +185,15 @@ SortBuilder example_sort() {
                      {'z', letter(0x221, 1, 1, 7)},
                      {'1', letter(0x100, 2, 3, 8)},
                      {'2', letter(0x101, 4, 5, 8)},
+                     {'s', letter(0x214)},
+                     {'S', letter(0x214, 1, 2)},
                      {0xFF21, letter(0x200)}};
   sort.expansions = {{0xE6, {letter(0x200, 2, 1), {0x208, 1, 1, 0}}}};
   sort.pairs = {{'c', 'h', letter(0x203)}, {'c', 'h', letter(0x999)}};
-  sort.computed = {
-      {0x4E, {2, kAppendAll, 0x3000}}, {0x4F, {2, kAppendAll, 0x3100}}, {0x20, {4, kAppendAll, 0x50}}};
+  sort.computed = {{0x4E, {2, kAppendAll, 0x3000}},
+                   {0x4F, {2, kAppendAll, 0x3100}},
+                   {0x51, {2, 7, 0x3200}},
+                   {0x20, {4, kAppendAll, 0x50}}};
   return sort;
 }
 

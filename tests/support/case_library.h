@@ -29,7 +29,7 @@ TestWeight letter(uint16_t primary, uint8_t secondary = 1, uint8_t tertiary = 1,
                   uint8_t char_class = kAppendAll);
 TestWeight special(uint16_t weight);
 /// a to c, A above a on the tertiary level, an acute accent, a hyphen that is special, "ch" after c, ae as an
-/// expansion, digits that insert on the lower levels, and z and y that insert on all but the primary one.
+/// expansion, digits that insert on the lower levels, and z, y and U+51xx that insert primaries.
 SortBuilder example_sort();
 
 /// Languages: English; Special; Kana, whose names begin with kana; Long, whose days run together besides, and
