@@ -122,9 +122,9 @@ TEST(BuiltInCodepage, InForceWithoutADirectory) {
   EXPECT_EQ(derived.rows, nullptr);
   EXPECT_EQ(derived.codes32, nullptr);
   const auto scalars = [](const lx::Codepage& c) {
-    return std::vector<uint32_t>{c.width,       c.substitution,    c.shift_out, c.shift_in,
-                                 c.single_byte, c.shift_sensitive, c.utf8,      c.two_level_rows,
-                                 c.same_below};
+    return std::vector<uint32_t>{c.width,    c.substitution,   c.shift_out,
+                                 c.shift_in, c.single_byte,    c.shift_sensitive,
+                                 c.utf8,     c.two_level_rows, c.same_below};
   };
   EXPECT_EQ(scalars(derived), scalars(built_in));
   EXPECT_TRUE(lx::hook_free(block));

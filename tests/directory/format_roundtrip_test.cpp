@@ -13,8 +13,8 @@
 #include "compile.h"
 #include "directory/listed_differences.h"
 #include "import/locale_table.h"
+#include "support/forms.h"
 #include "support/library.h"
-#include "support/text_forms.h"
 
 namespace lx::test {
 namespace {
@@ -42,13 +42,13 @@ struct Place {
   LXLocale* get() const { return locale.get(); }
   bool is(int32_t number) const { return LXGetLocaleNumInfo(get(), number, 0) == 1; }
   /// A text as the codepage has it.
-  template <class Unit>
-  Units seen(const Form<Unit>& form, const Units& text) const {
+  template <class F>
+  Units seen(const F& form, const Units& text) const {
     return decode(form, get(), encode(form, get(), text));
   }
   /// Whether a form can have this text: the plain one does not know shift bytes.
-  template <class Unit>
-  bool can(const Form<Unit>& form, const Units& text) const {
+  template <class F>
+  bool can(const F& form, const Units& text) const {
     return form.name != kPlain.name || !is(LX_ITEM_CODEPAGE_SHIFT) ||
            encode(kEx, get(), text).find('\x0E') == std::string::npos;
   }
@@ -71,8 +71,8 @@ struct RoundTrip {
   ListedDifferences differences;
   size_t trips = 0, cases = 0;
 
-  template <class Unit>
-  void number(const Form<Unit>& form, const Place& place, const Value& v, const Units& whole) {
+  template <class F>
+  void number(const F& form, const Place& place, const Value& v, const Units& whole) {
     LXLocale* const l = place.get();
     ++trips;
     Units text = decode(form, l, write(form, l, v));
@@ -83,7 +83,7 @@ struct RoundTrip {
       const Units symbol = item(l, local ? LX_ITEM_CURRENCY : LX_ITEM_INTERNATIONAL_CURRENCY);
       text = bare(item(l, LX_ITEM_NEGATIVE_SIGN), text, place.seen(form, symbol));
     }
-    const Text<Unit> bytes = encode(form, l, text);
+    const auto bytes = encode(form, l, text);
     const auto [value, end] = read(form, l, {bytes.begin(), bytes.end()}, v);
     const double most = v.kind == Value::kLong ? 0 : std::pow(10, -v.digits) + std::fabs(v.number) * 1e-14;
     if (end == count_of(bytes) && std::fabs(value - v.number) <= most) return;
@@ -94,23 +94,23 @@ struct RoundTrip {
                     place.pair.substr(place.pair.find('_') + 1), example);
   }
 
-  template <class Unit>
-  void time(const Form<Unit>& form, const Place& place, const LXTime& t, const std::string& ascii_format,
+  template <class F>
+  void time(const F& form, const Place& place, const LXTime& t, const std::string& ascii_format,
             const Units& whole, const LXTime& carried) {
     LXLocale* const l = place.get();
     ++trips;
-    const Text<Unit> format = encode(form, l, units(ascii_format));
-    const Text<Unit> text = write(form, l, t, format);
+    const auto format = encode(form, l, units(ascii_format));
+    const auto text = write(form, l, t, format);
     const int32_t code = LXGetError(l);
-    if (code == LX_E_FORMAT && sizeof(Unit) != 2 && !place.has_directives(form.name == kPlain.name))
+    if (code == LX_E_FORMAT && sizeof(typename F::Unit) != 2 && !place.has_directives(form.name == kPlain.name))
       return differences.add("directives", place.codepage, ascii_format);
     const Units expected = place.seen(form, whole);
     if (const Units written = decode(form, l, text); code != LX_OK || written != expected) {
-      const bool cut = code == LX_OK && written.size() < expected.size() && sizeof(Unit) == 1;
+      const bool cut = code == LX_OK && written.size() < expected.size() && sizeof(typename F::Unit) == 1;
       fail(cut ? "name" : "time_characters", place, cut ? "" : form.name, shown(written));
     }
     LXTime back = kUntouched;
-    const std::vector<Unit> exact(text.begin(), text.end());
+    const std::vector<typename F::Unit> exact(text.begin(), text.end());
     const auto count =
         form.read_time(l, &back, exact.data(), count_of(text), format.data(), count_of(format), 0);
     if (count != count_of(text) || memcmp(&back, &carried, sizeof(back)) != 0)
@@ -125,7 +125,7 @@ struct RoundTrip {
     const auto one = [&](const auto& form) {
       if (place.can(form, whole)) test(form);
     };
-    one(kPlain), one(kEx), one(kWide), one(kUnicode);
+    in_all_forms(one);
   }
 
   void fail(const char* what, const Place& place, const std::string& form, const std::string& example) {

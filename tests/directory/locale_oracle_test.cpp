@@ -20,7 +20,7 @@
 #include "directory/listed_differences.h"
 #include "import/locale_table.h"
 #include "support/library.h"
-#include "support/text_forms.h"
+#include "support/forms.h"
 
 namespace lx::test {
 namespace {

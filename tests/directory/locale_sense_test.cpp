@@ -9,7 +9,7 @@
 #include "import/locale_table.h"
 #include "sense.h"
 #include "support/library.h"
-#include "support/text_forms.h"
+#include "support/forms.h"
 #include "ucm.h"
 
 namespace lexicor_data {

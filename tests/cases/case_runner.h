@@ -1,0 +1,137 @@
+// What a family of cases sees of one case in one form, codepage and way of giving lengths, and how it says what
+// came out.
+#pragma once
+
+#include <gtest/gtest.h>
+
+#include <map>
+#include <string>
+#include <vector>
+
+#include "support/case_file.h"
+#include "support/case_library.h"
+
+namespace lx::test {
+
+/// A text for a call, in a block of its exact size.
+template <class Unit>
+struct CaseInput {
+  std::vector<Unit> block;
+  int32_t length;             // as the call gets it
+  std::vector<size_t> start;  // of each character; empty for a raw text
+  const CaseText* text;
+  const Unit* data() const { return block.data(); }
+};
+
+/// The flags and options that words of cases stand for.
+uint32_t case_flags(const CaseWords& words);
+
+template <class F>
+struct CaseRun {
+  using Form = F;
+  using Unit = typename F::Unit;
+  const Case& c;
+  const TinyCodepage& cp;
+  CaseLibrary& library;
+  LXLocale* l;
+  bool null;       // texts are null-terminated; otherwise their lengths are given
+  uint32_t flags;  // of the words
+  int32_t error;   // that the locale has at the end
+  bool once;       // what is written is not written again with a null, which would change the room
+
+  static constexpr bool kBytes = sizeof(Unit) == 1;
+  static constexpr Unit kCanary = static_cast<Unit>(0xA5A5A5A5);
+  const CaseWords& given() const { return c.given; }
+  const CaseWords& expected() const { return c.expected; }
+
+  std::vector<Unit> units(const CaseText& text, LXShiftState state = 0) const {
+    if (text.values.empty()) return {};
+    if (!text.raw()) return Encoded<F>(cp, text.units(), state).units;
+    const std::string bytes = text.bytes(cp);
+    return {bytes.begin(), bytes.end()};
+  }
+  /// The next text of this name, "length" (with the name behind it) units long or as long as it is.
+  CaseInput<Unit> input(const std::string& name = "", LXShiftState state = 0,
+                        const std::string& number = "length") {
+    const CaseText& text = c.given.text(name);
+    CaseInput<Unit> in{units(text, state), 0, {}, &text};
+    if (!text.raw()) in.start = Encoded<F>(cp, text.units(), state).start;
+    const bool chars = (flags & LX_CHARACTERS) != 0;
+    const int32_t whole = chars ? count_of(text.values) : count_of(in.block);
+    in.length = c.given.number(number, null ? -1 : whole);
+    if (in.length < 0) in.block.push_back(0);
+    in.block.shrink_to_fit();
+    in.block.reserve(1);  // a null pointer is no text
+    return in;
+  }
+  /// The code of a text of one character.
+  typename F::Char character() {
+    const CaseText& text = c.given.text();
+    return static_cast<typename F::Char>(Encoded<F>(cp, text.units()).codes.at(0));
+  }
+
+  /// A number, or its sign.
+  void number(int64_t got) {
+    const std::string word = c.expected.word();
+    if (word == "<" || word == ">")
+      EXPECT_EQ(word, got < 0 ? "<" : got > 0 ? ">" : "=") << got;
+    else
+      EXPECT_EQ(got, std::strtoll(word.c_str(), nullptr, 0));
+  }
+  /// A place in a text: the number of its character, of a raw text its byte, or "none".
+  void place(const Unit* got, const CaseInput<Unit>& in) {
+    const std::string word = c.expected.word();
+    if (word == "none") {
+      EXPECT_EQ(got, nullptr);
+      return;
+    }
+    const size_t at = std::stoul(word);
+    EXPECT_EQ(got - in.data(), static_cast<ptrdiff_t>(at < in.start.size() ? in.start[at] : at));
+  }
+  void text(const std::vector<Unit>& got, LXShiftState state = 0) {
+    EXPECT_EQ(testing::PrintToString(got), testing::PrintToString(units(c.expected.text(), state)));
+  }
+  /// Gives `put` a buffer and its size, and gives back what it wrote: nothing behind the result, or with
+  /// LX_CHARACTERS what is not as it was.
+  template <class Put>
+  std::vector<Unit> output(int32_t size, int32_t* result, Put put) {
+    const bool by_chars = kBytes && (flags & LX_CHARACTERS) != 0;
+    const size_t room = static_cast<size_t>(std::max(size, 0)) * (by_chars ? 6 : 1);
+    std::vector<Unit> buffer(room + 4, kCanary);
+    *result = put(buffer.data(), size);
+    EXPECT_LE(*result, std::max(size, 0));
+    EXPECT_EQ(std::vector<Unit>(buffer.begin() + static_cast<ptrdiff_t>(room), buffer.end()),
+              std::vector<Unit>(4, kCanary))
+        << "behind the size " << size;
+    size_t end = static_cast<size_t>(std::max(*result, 0));
+    if (by_chars)
+      for (end = room; end > 0 && buffer[end - 1] == kCanary;) --end;
+    buffer.resize(end);
+    return buffer;
+  }
+};
+
+/// A family, in the forms that it has.
+struct Family {
+  void (*plain)(CaseRun<Plain>&);
+  void (*ex)(CaseRun<Ex>&);
+  void (*wide)(CaseRun<Wide>&);
+  void (*unicode)(CaseRun<Unicode>&);
+};
+using Families = std::map<std::string, Family>;
+template <class Body>
+Family in_four_forms(Body body) {
+  return {body, body, body, body};
+}
+template <class Body>
+Family in_bytes(Body body) {
+  return {body, body, nullptr, nullptr};
+}
+
+Families string_families();
+Families compare_families();
+Families convert_families();
+Families walk_families();
+Families format_families();
+
+}  // namespace lx::test

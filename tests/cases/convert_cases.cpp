@@ -1,0 +1,152 @@
+// The families of convert.txt and map.txt.
+#include "cases/case_runner.h"
+#include "core/lxrecords.h"
+#include "support/conversion.h"
+
+namespace lx::test {
+
+namespace {
+
+/// What was written, with its null, and what the function said of it.
+template <class R>
+void expect_output(R& r, const std::vector<typename R::Unit>& out, int32_t result) {
+  const auto expected = r.units(r.expected().text(), states.output);
+  EXPECT_EQ(testing::PrintToString(out), testing::PrintToString(expected));
+  EXPECT_EQ(result, r.expected().number("returns", count_of(expected)));
+}
+
+/// Unicode to bytes; the Ex form from the bytes of UTF-8 too.
+template <class R>
+void encode_text(R& r) {
+  const CaseText& text = r.given().text();
+  const int32_t size = r.given().number("size", 40);
+  Units units = text.units();
+  const int32_t length = r.null ? -1 : count_of(units);
+  int32_t result = 0;
+  auto out = r.output(size, &result, [&](auto* to, int32_t room) {
+    return R::Form::encode(r.l, to, room, units.c_str(), length, static_cast<int32_t>(r.flags));
+  });
+  if constexpr (std::is_same_v<typename R::Form, Ex>) {
+    const TinyCodepage& utf8 = case_codepage("UTF8");
+    const std::string bytes = utf8.encode({units.begin(), units.end()});
+    const bool chars = (r.flags & LX_CHARACTERS) != 0;
+    int32_t again = 0;
+    const auto converted = r.output(size, &again, [&](auto* to, int32_t room) {
+      return R::Form::convert(r.l, to, room, r.library.locale(utf8), bytes.c_str(),
+                              r.null  ? -1
+                              : chars ? length
+                                      : count_of(bytes),
+                              static_cast<int32_t>(r.flags));
+    });
+    EXPECT_EQ(again, result);
+    EXPECT_EQ(testing::PrintToString(converted), testing::PrintToString(out));
+  }
+  expect_output(r, out, result);
+}
+
+/// Bytes to Unicode, also by the codepage object, and without and with a null.
+template <class R>
+void decode_text(R& r) {
+  const auto text = r.input("", states.text);
+  Units expected = r.expected().text().units();
+  const bool cut = r.expected().has("cut");
+  if (r.cp.shift == std::is_same_v<typename R::Form, Ex> && states.text == 0 && !r.null) {
+    std::vector<LXUChar> by_object(99, 0);
+    const int32_t count = LXCpStrToUnicode(r.l->codepage, text.data(), text.length, by_object.data());
+    EXPECT_EQ(shown(Units(by_object.data(), static_cast<size_t>(count))), shown(expected));
+  }
+  if (text.length < 0 && !cut) expected.push_back(0);
+  std::vector<LXUChar> out(99, 0xA5A5);
+  const int32_t count = R::Form::decode(out.data(), 98, r.l, text.data(), text.length, 0);
+  EXPECT_EQ(shown(Units(out.data(), static_cast<size_t>(count))), shown(expected));
+  EXPECT_EQ(out[static_cast<size_t>(count)], 0xA5A5);
+}
+
+/// Bytes to packed codes, at every size.
+template <class R>
+void to_codes(R& r) {
+  const auto text = r.input("", states.text);
+  auto codes = Encoded<Wide>(r.cp, r.expected().text().units()).units;
+  if (r.expected().has("null") && r.null) codes.push_back(0);
+  for (int32_t size = 0; size <= count_of(codes) + 1; ++size) {
+    std::vector<LXWChar> out(codes.size() + 2, 7), expected(codes);
+    expected.resize(static_cast<size_t>(std::min(size, count_of(codes))));
+    const int32_t fit = count_of(expected);
+    expected.resize(out.size(), 7);
+    EXPECT_EQ(R::Form::to_codes(r.l, out.data(), size, text.data(), text.length, static_cast<int32_t>(r.flags)),
+              fit);
+    EXPECT_EQ(out, expected);
+  }
+}
+template <class R>
+void from_codes(R& r) {
+  auto codes = Encoded<Wide>(r.cp, r.given().text().units()).units;
+  const int32_t length = r.null ? -1 : count_of(codes);
+  if (r.null) codes.push_back(0);
+  int32_t result = 0;
+  const auto out = r.output(r.given().number("size", 40), &result, [&](auto* to, int32_t size) {
+    return R::Form::from_codes(r.l, to, size, codes.data(), length, static_cast<int32_t>(r.flags));
+  });
+  expect_output(r, out, result);
+}
+/// By the codepage object, which closes nothing.
+void encode_by_object(CaseRun<Ex>& r) {
+  const Units units = r.given().text().units();
+  std::vector<char> out(99, CaseRun<Ex>::kCanary);
+  const int32_t result =
+      LXCpUnicodeToStr(r.l->codepage, units.c_str(), states.output, r.null ? -1 : count_of(units), out.data());
+  EXPECT_EQ(out[static_cast<size_t>(result)], CaseRun<Ex>::kCanary);
+  out.resize(static_cast<size_t>(result));
+  expect_output(r, out, result);
+}
+
+/// A conversion step by step: input and room; output, code and what is taken.
+void stream(CaseRun<Ex>& r) {
+  const TinyCodepage &from = case_codepage(r.given().word()), &to = case_codepage(r.given().word());
+  Conversion conversion(r.library.locale(to), r.library.locale(from));
+  while (r.given().has_text()) {
+    const std::string input = r.given().text().bytes(from);
+    const Conversion::Step step = conversion.call(input, std::stoi(r.given().word()));
+    EXPECT_EQ(testing::PrintToString(step.output), testing::PrintToString(r.expected().text().bytes(to)));
+    EXPECT_EQ(std::to_string(step.code), r.expected().word());
+    EXPECT_EQ(std::to_string(step.taken), r.expected().word());
+  }
+}
+
+uint32_t mode_of(const CaseWords& words) {
+  static const std::pair<const char*, uint32_t> kModes[] = {
+      {"full", LX_MAP_FULL_WIDTH}, {"half", LX_MAP_HALF_WIDTH},
+      {"copy", LX_MAP_COPY},       {"lower", LX_MAP_LOWER},
+      {"upper", LX_MAP_UPPER},     {"lower-simple", LX_MAP_LOWER_SIMPLE},
+      {"digits", LX_MAP_DIGITS},   {"upper-simple", LX_MAP_UPPER_SIMPLE}};
+  for (const auto& [word, mode] : kModes)
+    if (words.has(word)) return mode;
+  return static_cast<uint32_t>(words.number("mode", 0));
+}
+template <class R>
+void map(R& r) {
+  const uint32_t mode = mode_of(r.given());
+  const auto text = r.input();
+  int32_t result = 0;
+  const auto out = r.output(r.given().number("size", 99), &result, [&](auto* to, int32_t size) {
+    return R::Form::map(r.l, to, size, text.data(), text.length, mode | r.flags);
+  });
+  auto expected = r.units(r.expected().text());
+  if (r.expected().has("whole") && text.length < 0) expected.push_back(0);
+  EXPECT_EQ(testing::PrintToString(out), testing::PrintToString(expected));
+  EXPECT_EQ(result, r.expected().number("returns", count_of(expected)));
+}
+
+}  // namespace
+
+Families convert_families() {
+  return {{"encode", in_bytes([](auto& r) { encode_text(r); })},
+          {"decode", in_bytes([](auto& r) { decode_text(r); })},
+          {"to-codes", in_bytes([](auto& r) { to_codes(r); })},
+          {"from-codes", in_bytes([](auto& r) { from_codes(r); })},
+          {"encode-by-object", {nullptr, encode_by_object, nullptr, nullptr}},
+          {"stream", {nullptr, stream, nullptr, nullptr}},
+          {"map", in_four_forms([](auto& r) { map(r); })}};
+}
+
+}  // namespace lx::test

@@ -1,0 +1,127 @@
+// The families of number.txt and time.txt.
+#include <cmath>
+
+#include "cases/case_runner.h"
+
+namespace lx::test {
+
+namespace {
+
+/// What was written at a size, with and without a null: the expected text in the form, the result and the code.
+template <class R, class Put>
+void expect_written(R& r, Put put) {
+  const int32_t size = r.given().number("size", 120);
+  const bool any = r.expected().has("any");
+  static const CaseText nothing;
+  const CaseText& text = any ? nothing : r.expected().text();
+  const auto whole = r.units(text, states.output);
+  const int32_t returns = r.expected().number("returns", 0);
+  for (const uint32_t null : {0u, uint32_t{LX_TERMINATE}}) {
+    if (null != 0 && (size <= 0 || r.once)) continue;
+    int32_t result = 0;
+    const auto out = r.output(size + (null != 0 ? 1 : 0), &result,
+                              [&](auto* to, int32_t room) { return put(to, room, r.flags | null); });
+    auto expected = whole;
+    if (null != 0) expected.push_back(0);
+    EXPECT_EQ(LXGetError(r.l), r.error);
+    if (any) continue;
+    EXPECT_EQ(testing::PrintToString(out), testing::PrintToString(expected));
+    const int32_t count = (r.flags & LX_CHARACTERS) != 0 ? count_of(text.values) : count_of(whole);
+    EXPECT_EQ(result, returns != 0 ? returns : count + (null != 0));
+  }
+}
+
+Value::Kind kind_of(const std::string& word) {
+  if (word == "long") return Value::kLong;
+  if (word == "double") return Value::kDouble;
+  if (word == "amount") return Value::kAmount;
+  throw CaseError("no kind of number: " + word);
+}
+
+template <class R>
+void write_number(R& r) {
+  const Value::Kind kind = kind_of(r.given().word());
+  const Value value{kind, std::strtod(r.given().word().c_str(), nullptr)};
+  expect_written(r, [&](auto* to, int32_t size, uint32_t flags) {
+    return write(typename R::Form(), r.l, value, to, size, flags);
+  });
+}
+
+/// "|" in the text stands where reading ends.
+template <class R>
+void read_number(R& r) {
+  using Form = typename R::Form;
+  const Value::Kind kind = kind_of(r.given().word());
+  const int32_t base = r.given().number("base", 10);
+  Units text = r.given().text().units();
+  const size_t end = text.find('|');
+  if (end == Units::npos) throw CaseError("no end in the text");
+  text.erase(end, 1);
+  const Encoded<Form> whole(r.cp, text);
+  const auto block = r.null ? whole.terminated() : whole.cut(whole.units.size());
+  const typename R::Unit* stopped = nullptr;
+  const int32_t length = r.null ? -1 : whole.size();
+  const double got = kind == Value::kLong ? Form::read_long(r.l, block.data(), length, &stopped, base, r.flags)
+                                          : Form::read_double(r.l, block.data(), length, &stopped, r.flags);
+  const double expected = std::strtod(r.expected().word().c_str(), nullptr);
+  if (std::isnan(expected))
+    EXPECT_TRUE(std::isnan(got)) << got;
+  else
+    EXPECT_EQ(got, expected);
+  EXPECT_TRUE(std::isnan(expected) || std::signbit(got) == std::signbit(expected)) << got;
+  if (r.expected().has("refused")) return;
+  EXPECT_EQ(stopped - block.data(),
+            static_cast<ptrdiff_t>(whole.behind(end, whole.units.size(), whole.units.size())));
+}
+
+template <class R>
+void grouping_size(R& r) {
+  const auto text = r.input();
+  int32_t remaining = std::stoi(r.given().word());
+  const typename R::Unit* next = text.data() + 77;
+  r.number(R::Form::grouping_size(r.l, text.data(), &remaining, &next));
+  r.number(remaining);
+  const std::string word = r.expected().word();
+  EXPECT_EQ(next, word == "none" ? nullptr : text.data() + (word == "untouched" ? 77 : std::stoi(word)));
+}
+
+constexpr std::pair<const char*, int32_t LXTime::*> kFields[] = {
+    {"seconds", &LXTime::seconds}, {"minutes", &LXTime::minutes},
+    {"hours", &LXTime::hours},     {"day", &LXTime::day},
+    {"month", &LXTime::month},     {"year", &LXTime::year},
+    {"weekday", &LXTime::weekday}, {"day-of-year", &LXTime::day_of_year}};
+LXTime time_of(const CaseWords& words, LXTime time) {
+  for (const auto& [name, field] : kFields) time.*field = words.number(name, time.*field);
+  return time;
+}
+
+/// 4 July 2003, 14:05:09, a Friday.
+template <class R>
+void write_time(R& r) {
+  const LXTime time = time_of(r.given(), {9, 5, 14, 4, 6, 103, 5, 184});
+  const auto format = r.input("", states.second);
+  expect_written(r, [&](auto* to, int32_t size, uint32_t flags) {
+    return R::Form::write_time(r.l, &time, to, size, format.data(), format.length, flags);
+  });
+}
+template <class R>
+void read_time(R& r) {
+  constexpr LXTime kUntouched{-1, -2, -3, -4, -5, -6, -7, -8};
+  const auto text = r.input("", states.text), format = r.input("", states.second, "format-length");
+  LXTime got = kUntouched;
+  r.number(R::Form::read_time(r.l, &got, text.data(), text.length, format.data(), format.length, r.flags));
+  const LXTime expected = time_of(r.expected(), kUntouched);
+  for (const auto& [name, field] : kFields) EXPECT_EQ(got.*field, expected.*field) << name;
+}
+
+}  // namespace
+
+Families format_families() {
+  return {{"write", in_four_forms([](auto& r) { write_number(r); })},
+          {"read", in_four_forms([](auto& r) { read_number(r); })},
+          {"grouping-size", in_four_forms([](auto& r) { grouping_size(r); })},
+          {"write-time", in_four_forms([](auto& r) { write_time(r); })},
+          {"read-time", in_four_forms([](auto& r) { read_time(r); })}};
+}
+
+}  // namespace lx::test

@@ -1,0 +1,122 @@
+// The families of string.txt.
+#include "cases/case_runner.h"
+
+namespace lx::test {
+
+namespace {
+
+/// A span: the units of so many characters, with the shift byte that ends them.
+template <class R>
+void expect_span(R& r, int32_t got, const CaseText& text) {
+  const int64_t at = std::stol(r.expected().word());
+  if (at < 0 || text.raw() || (r.flags & LX_CHARACTERS) != 0) {
+    EXPECT_EQ(got, static_cast<int32_t>(at));
+    return;
+  }
+  const Encoded<typename R::Form> whole(r.cp, text.units());
+  EXPECT_EQ(
+      got, static_cast<int32_t>(whole.behind(static_cast<size_t>(at), whole.units.size(), whole.units.size())));
+}
+
+template <class R>
+void find_character(R& r) {
+  const auto text = r.input();
+  r.place(R::Form::chr(r.l, text.data(), text.length, r.character(), r.flags), text);
+}
+template <class R>
+void span(R& r, bool of_the_set) {
+  const auto text = r.input(), set = r.input("", 0, "set-length");
+  const auto door = of_the_set ? R::Form::spn : R::Form::cspn;
+  expect_span(r, door(r.l, text.data(), text.length, set.data(), set.length, r.flags), *text.text);
+}
+template <class R>
+void find(R& r) {
+  const auto text = r.input(), part = r.input("", 0, "part-length");
+  r.place(R::Form::str(r.l, text.data(), text.length, part.data(), part.length, r.flags), text);
+}
+template <class R>
+void copy(R& r) {
+  const auto text = r.input("", states.text);
+  int32_t result = 0;
+  const int32_t room = r.given().number("size", 99);
+  const auto out = r.output(room, &result, [&](auto* to, int32_t size) {
+    return R::Form::cpy(r.l, to, size, text.data(), text.length, r.flags);
+  });
+  auto expected = r.units(r.expected().text(), states.text);
+  if (r.null && expected.size() + 1 == text.block.size() && room == 99) expected.push_back(0);
+  EXPECT_EQ(testing::PrintToString(out), testing::PrintToString(expected));
+}
+template <class R>
+void join(R& r) {
+  auto buffer = r.input().block;
+  const auto text = r.input("", states.text);
+  buffer.resize(buffer.size() - (r.null ? 1 : 0));
+  buffer.push_back(0);
+  const int32_t size = r.given().number("size", 99);
+  buffer.resize(99);
+  const int32_t result = R::Form::cat(r.l, buffer.data(), size, text.data(), text.length, r.flags);
+  const auto end = std::find(buffer.begin(), buffer.end(), 0);
+  EXPECT_EQ(result, r.expected().number("returns", static_cast<int32_t>(end - buffer.begin()) + 1));
+  r.text({buffer.begin(), end});
+}
+template <class R>
+void tokens(R& r) {
+  using Unit = typename R::Unit;
+  auto text = r.input();
+  const auto set = r.input();
+  states.result = 0;
+  Unit* next = nullptr;
+  for (Unit* at = text.block.data(); at != nullptr; at = next) {
+    const Unit* const token = R::Form::tok(r.l, at, &text.length, set.data(), set.length, &next, r.flags);
+    EXPECT_EQ(next == nullptr, text.length == 0);
+    if (token == nullptr) break;
+    const Unit* const end =
+        std::find(token, static_cast<const Unit*>(text.data()) + text.block.size(), Unit{0});
+    states.text = r.cp.shift ? states.token : 0;
+    EXPECT_EQ(shown(decode(typename R::Form(), r.l, Text<Unit>(token, end))),
+              shown(r.expected().text().units()));
+  }
+}
+template <class R>
+void truncate(R& r) {
+  auto text = r.input().block;
+  if (!r.null) text.push_back(0);
+  const std::vector<char> before = text;
+  const int32_t result = R::Form::truncate(r.l, text.data(), r.given().number("size", 99), r.flags);
+  auto expected = r.units(r.expected().text());
+  EXPECT_EQ(result, r.expected().number("returns", count_of(expected) + 1));
+  expected.push_back(0);
+  expected.insert(expected.end(), before.begin() + count_of(expected), before.end());
+  EXPECT_EQ(testing::PrintToString(text), testing::PrintToString(expected));
+}
+template <class R>
+std::vector<typename R::Unit> terminated(R& r) {
+  auto text = r.input().block;
+  text.push_back(0);
+  return text;
+}
+void terminate(CaseRun<Ex>& r) {
+  int32_t result = 0;
+  r.text(r.output(2, &result,
+                  [&](char* to, int32_t) { return LXTerminateStringEx(r.l, to, states.text, r.flags); }));
+  r.number(result);
+}
+
+}  // namespace
+
+Families string_families() {
+  return {{"character", in_four_forms([](auto& r) { find_character(r); })},
+          {"span", in_four_forms([](auto& r) { span(r, true); })},
+          {"span-to", in_four_forms([](auto& r) { span(r, false); })},
+          {"find", in_four_forms([](auto& r) { find(r); })},
+          {"copy", in_four_forms([](auto& r) { copy(r); })},
+          {"join", in_four_forms([](auto& r) { join(r); })},
+          {"tokens", in_four_forms([](auto& r) { tokens(r); })},
+          {"truncate", in_bytes([](auto& r) { truncate(r); })},
+          {"terminate", {nullptr, terminate, nullptr, nullptr}},
+          {"length",
+           {nullptr, nullptr, [](auto& r) { r.number(LXWcslen(r.l, terminated(r).data())); },
+            [](auto& r) { r.number(LXStrlenU(r.l, terminated(r).data())); }}}};
+}
+
+}  // namespace lx::test

@@ -1,0 +1,62 @@
+// The library over a scratch directory that has what text cases need: a small codepage of every kind with case
+// and width tables, languages with special mappings and with kana in their names, and a sort.
+#pragma once
+
+#include <map>
+#include <string>
+#include <vector>
+
+#include "support/hooks.h"
+#include "support/object_files.h"
+#include "support/sort_builder.h"
+#include "support/tiny_codepages.h"
+
+namespace lx::test {
+
+/// SINGLE, SJIS, EUC, FOUR, SHIFT, UTF8; K930, which is EBCDIC with small letters of its own, and ODD, which is
+/// SJIS where "!" has a "half-width" form of two bytes.
+const std::vector<TinyCodepage>& case_codepages();
+const TinyCodepage& case_codepage(const std::string& name);
+
+struct SpecialMapping {
+  uint16_t first, second, result1, result2;  // second and result2 0 for none
+};
+/// Of the language Special. U+2603 is in UTF8 alone.
+const std::vector<SpecialMapping>& upper_specials();
+const std::vector<SpecialMapping>& lower_specials();
+
+TestWeight letter(uint16_t primary, uint8_t secondary = 1, uint8_t tertiary = 1,
+                  uint8_t char_class = kAppendAll);
+TestWeight special(uint16_t weight);
+/// a to c, A above a on the tertiary level, an acute accent, a hyphen that is special, "ch" after c, ae as an
+/// expansion, digits that insert on the lower levels, and z, y and U+51xx that insert primaries.
+SortBuilder example_sort();
+
+/// Languages: English; Special; Kana, whose names begin with kana; Long, whose days run together besides, and
+/// which says AM in the afternoon. The sort is called Test.
+class CaseLibrary {
+ public:
+  explicit CaseLibrary(const SortBuilder& sort = example_sort());
+  ~CaseLibrary() { close(); }
+  CaseLibrary(const CaseLibrary&) = delete;
+  CaseLibrary& operator=(const CaseLibrary&) = delete;
+
+  /// Releases everything: whether each block came back, once.
+  bool close();
+  Hooks& hooks() { return hooks_; }
+
+  /// A locale that is kept to the end, with English or another language and binary order or a sort.
+  LXLocale* locale(const TinyCodepage& codepage, const std::string& language = "English",
+                   const std::string& sort = "");
+  /// A locale to change; the caller releases it.
+  LXLocale* new_locale(const TinyCodepage& codepage, const std::string& language = "English",
+                       const std::string& sort = "");
+
+ private:
+  ScratchDirectory directory_;
+  Hooks hooks_;
+  std::map<std::string, LXLocale*> locales_;
+  bool open_ = false;
+};
+
+}  // namespace lx::test
