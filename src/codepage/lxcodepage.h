@@ -18,10 +18,11 @@ struct PageCodes {
   const uint8_t* low_array;
   const uint8_t* high_array;
 
-  const uint8_t* entry(size_t page) const {
-    return payload + format::codepage::kPages + page * format::codepage::kPageBytes;
+  format::codepage::PageEntry entry(size_t page) const {
+    using format::codepage::PageEntry;
+    return PageEntry::read(payload + format::codepage::kPages + page * PageEntry::kBytes);
   }
-  bool maps(size_t page) const { return entry(page)[2] <= entry(page)[3]; }
+  bool maps(size_t page) const { return entry(page).lowest <= entry(page).highest; }
   /// The packed code, a zero byte inside it still there, or the substitution byte.
   uint32_t code(uint16_t u) const;
 };
@@ -172,8 +173,8 @@ int32_t chars_counted(const Codepage& cp, const uint8_t* text, LXShiftState stat
 /// the next one counts as a character.
 int32_t chars_in_bytes(const Codepage& cp, const uint8_t* text, LXShiftState state, size_t bytes);
 
-/// The type record of the character at `p`: the type word, then what added to its packed code gives the other
-/// case. Null in a single-byte codepage. There is no range check: the trie covers every byte sequence.
+/// The type record of the character at `p`. Null in a single-byte codepage. There is no range check: the trie
+/// covers every byte sequence.
 const uint8_t* type_record(const Codepage& cp, const uint8_t* p);
 const uint8_t* type_record_of_code(const Codepage& cp, uint32_t code);
 
@@ -182,6 +183,9 @@ struct Specials {
   const uint8_t* entries;
   size_t count;
 
+  format::language::SpecialMapping entry(size_t i) const {
+    return format::language::SpecialMapping::read(entries + i * format::language::SpecialMapping::kBytes);
+  }
   /// Looks for one character (`second` 0) or a pair: the number of results stored, 0 for no mapping.
   int32_t find(uint16_t first, uint16_t second, uint16_t* result1, uint16_t* result2) const;
 };

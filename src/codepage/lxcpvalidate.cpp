@@ -17,30 +17,26 @@ constexpr uint8_t kWrittenAscii[] = {0x00, 0x20, 0x28, 0x29, 0x2B, 0x2D, 0x30, 0
                                      0x32, 0x33, 0x34, 0x35, 0x36, 0x37, 0x38, 0x39};
 constexpr uint8_t kWrittenEbcdic[] = {0x00, 0x40, 0x4D, 0x5D, 0x4E, 0x60, 0xF0, 0xF1,
                                       0xF2, 0xF3, 0xF4, 0xF5, 0xF6, 0xF7, 0xF8, 0xF9};
-constexpr size_t kLineEndBytes = 4;
 
-/// One trie of a codepage: the nodes of the type trie have no byte range, so theirs is all bytes.
+/// One trie of a codepage.
+template <class NodeType>
 struct Trie {
+  using Node = NodeType;
   lx::Bytes nodes;    // from the root to the end of the section
-  size_t node_bytes;  // fmt::kNodeBytes or fmt::kTypeNodeBytes
   lx::Bytes entries;  // what leaves index
   size_t entry_bytes;
 
-  bool ranged() const { return node_bytes == fmt::kNodeBytes; }
-  bool has_node(size_t index) const { return nodes.holds(index * node_bytes, node_bytes); }
-  const uint8_t* node(size_t index) const { return nodes.data + index * node_bytes; }
-  bool leaf(const uint8_t* node) const { return node[0] != 0; }
-  unsigned lowest(const uint8_t* node) const { return ranged() ? node[2] : 0; }
-  unsigned highest(const uint8_t* node) const { return ranged() ? node[3] : kAnyByte - 1; }
-  size_t target(const uint8_t* node, unsigned byte) const {
-    return lx::le16(node + node_bytes - 2) + (node[1] & byte);
-  }
+  bool has_node(size_t index) const { return nodes.holds(index * Node::kBytes, Node::kBytes); }
+  Node node(size_t index) const { return Node::read(nodes.data + index * Node::kBytes); }
 };
 
 /// Measures how many bytes a walk from each node takes.
+template <class Trie>
 class TrieCheck {
+  using Node = typename Trie::Node;
+
  public:
-  explicit TrieCheck(const Trie& trie) : trie_(trie), known_(trie.nodes.size / trie.node_bytes) {
+  explicit TrieCheck(const Trie& trie) : trie_(trie), known_(trie.nodes.size / Node::kBytes) {
     if (known_ != 0) heights_ = static_cast<uint8_t*>(lx::hook_allocate_zeroed(known_));
   }
   ~TrieCheck() { lx::hook_free(heights_); }
@@ -53,31 +49,31 @@ class TrieCheck {
   /// or takes more than `limit`.
   size_t walk_bytes(unsigned byte, size_t limit) {
     if (!trie_.has_node(0)) return 0;
-    const uint8_t* root = trie_.node(0);
-    if (byte < trie_.lowest(root) || byte > trie_.highest(root)) return 1;
-    if (trie_.leaf(root)) return entry_exists(root, byte) ? 1 : 0;
+    const Node root = trie_.node(0);
+    if (byte < root.lowest || byte > root.highest) return 1;
+    if (root.leaf != 0) return entry_exists(root, byte) ? 1 : 0;
     if (limit < 2) return 0;
-    const size_t rest = height(trie_.target(root, byte), limit - 1);
+    const size_t rest = height(root.next(byte), limit - 1);
     return rest == 0 || rest + 1 > limit ? 0 : rest + 1;
   }
 
  private:
-  bool entry_exists(const uint8_t* node, unsigned byte) const {
-    return trie_.entries.holds(trie_.target(node, byte) * trie_.entry_bytes, trie_.entry_bytes);
+  bool entry_exists(const Node& node, unsigned byte) const {
+    return trie_.entries.holds(node.next(byte) * trie_.entry_bytes, trie_.entry_bytes);
   }
 
   /// As walk_bytes, from any node. Heights are kept, so each node is looked at once.
   size_t height(size_t index, size_t limit) {
     if (limit == 0 || !trie_.has_node(index)) return 0;
     if (heights_[index] != 0) return heights_[index];
-    const uint8_t* node = trie_.node(index);
+    const Node node = trie_.node(index);
     size_t tallest = 1;
-    for (unsigned byte = trie_.lowest(node); byte <= trie_.highest(node); ++byte) {
-      if (trie_.leaf(node)) {
+    for (unsigned byte = node.lowest; byte <= node.highest; ++byte) {
+      if (node.leaf != 0) {
         if (!entry_exists(node, byte)) return 0;
         continue;
       }
-      const size_t rest = height(trie_.target(node, byte), limit - 1);
+      const size_t rest = height(node.next(byte), limit - 1);
       if (rest == 0) return 0;
       if (rest + 1 > tallest) tallest = rest + 1;
     }
@@ -127,7 +123,7 @@ class Validator {
 
   bool width_tables_fit() const {
     return payload_.holds(word(fmt::kFullWidth), fmt::kFullWidthBytes) &&
-           payload_.holds(word(fmt::kPairs), word(fmt::kPairCount) * fmt::kPairBytes);
+           payload_.holds(word(fmt::kPairs), word(fmt::kPairCount) * fmt::WidthPair::kBytes);
   }
 
   /// Whether a byte that the library writes as a character is one.
@@ -142,7 +138,7 @@ class Validator {
     const bool ascii = (word(fmt::kFlags) & fmt::kFlagAscii) != 0;
     return word(fmt::kUnicode) == 0 &&
            all_single(ascii ? kWrittenAscii : kWrittenEbcdic, sizeof(kWrittenAscii)) &&
-           all_single(payload_.data + fmt::kLineEnds, kLineEndBytes) &&
+           all_single(payload_.data + fmt::kLineEnds, fmt::kLineEndBytes) &&
            single(payload_.data[fmt::kSubstitution]);
   }
 
@@ -163,7 +159,8 @@ class Validator {
     const lx::PageCodes pages{payload_.data, sections_.section[2].data, sections_.section[3].data};
     if (pages.code(0) != 0) return false;
     for (unsigned page = 0; page < kAnyByte; ++page) {
-      for (unsigned low = pages.entry(page)[2]; low <= pages.entry(page)[3]; ++low) {
+      const fmt::PageEntry entry = pages.entry(page);
+      for (unsigned low = entry.lowest; low <= entry.highest; ++low) {
         const uint32_t code = lx::without_zero_bytes(pages.code(static_cast<uint16_t>(page << 8 | low)));
         if (lx::code_bytes(code) > width_) return false;
       }
@@ -173,22 +170,18 @@ class Validator {
 
   bool pages_fit() const {
     for (size_t page = 0; page < kAnyByte; ++page)
-      if (!page_fits(payload_.data + fmt::kPages + page * fmt::kPageBytes)) return false;
+      if (!page_fits(fmt::PageEntry::read(payload_.data + fmt::kPages + page * fmt::PageEntry::kBytes)))
+        return false;
     return true;
   }
 
-  bool page_fits(const uint8_t* entry) const {
-    const size_t low_width = entry[0] == fmt::kKindByte || entry[0] == fmt::kKindByteByte ? 1 : 2;
-    const size_t high_width = entry[0] == fmt::kKindWordWord                                     ? 2
-                              : entry[0] == fmt::kKindByteWord || entry[0] == fmt::kKindByteByte ? 1
-                                                                                                 : 0;
-    if (entry[0] > fmt::kKindByteByte) return true;
-    for (unsigned byte = entry[2]; byte <= entry[3]; ++byte) {
-      const size_t index = byte & entry[1];
-      if (!sections_.section[2].holds((lx::le16(entry + 4) + index) * low_width, low_width)) return false;
-      if (high_width != 0 &&
-          !sections_.section[3].holds((lx::le16(entry + 6) + index) * high_width, high_width))
-        return false;
+  bool page_fits(const fmt::PageEntry& page) const {
+    const size_t low = page.low_bytes();
+    const size_t high = page.high_bytes();
+    for (unsigned byte = page.lowest; byte <= page.highest; ++byte) {
+      const size_t index = byte & page.mask;
+      if (low != 0 && !sections_.section[2].holds((page.low + index) * low, low)) return false;
+      if (high != 0 && !sections_.section[3].holds((page.high + index) * high, high)) return false;
     }
     return true;
   }
@@ -196,18 +189,19 @@ class Validator {
   lx::Bytes rest_of(lx::Bytes section, size_t offset) const {
     return offset <= section.size ? lx::Bytes{section.data + offset, section.size - offset} : lx::Bytes{};
   }
-  Trie type_trie() const {
-    return {rest_of(payload_, word(fmt::kTypeTrie)), fmt::kTypeNodeBytes,
-            rest_of(payload_, word(fmt::kTypeRecords)), fmt::kTypeRecordBytes};
+  Trie<fmt::TypeNode> type_trie() const {
+    return {rest_of(payload_, word(fmt::kTypeTrie)), rest_of(payload_, word(fmt::kTypeRecords)),
+            fmt::TypeRecord::kBytes};
   }
-  Trie unicode_trie() const {
-    return {sections_.section[1], fmt::kNodeBytes, rest_of(sections_.section[1], word(fmt::kUnicodeValues)), 2};
+  Trie<fmt::UnicodeNode> unicode_trie() const {
+    return {sections_.section[1], rest_of(sections_.section[1], word(fmt::kUnicodeValues)), sizeof(uint16_t)};
   }
 
   /// A walk may take as many bytes as the character that begins with its first byte has. One-byte characters
   /// are walked in the double-byte state only, where they begin one of the width.
-  int32_t check_trie(const Trie& trie) const {
-    TrieCheck check(trie);
+  template <class Node>
+  int32_t check_trie(const Trie<Node>& trie) const {
+    TrieCheck<Trie<Node>> check(trie);
     if (check.out_of_memory()) return LX_E_MEMORY;
     for (unsigned byte = 0; byte < kAnyByte; ++byte) {
       const size_t limit = length(byte) < 2 ? width_ : length(byte);

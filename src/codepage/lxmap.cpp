@@ -80,9 +80,8 @@ class SpecialFilter {
  public:
   SpecialFilter(const LXObject& language, const Mode& mode)
       : specials_(mode.specials ? lx::specials_of(language, mode.upper) : Specials{nullptr, 0}) {
-    const uint8_t* entry = specials_.entries;
-    for (size_t i = 0; i < specials_.count; ++i, entry += lx::format::language::kSpecialBytes) {
-      const unsigned slot = slot_of(lx::le16(entry));
+    for (size_t i = 0; i < specials_.count; ++i) {
+      const unsigned slot = slot_of(specials_.entry(i).first);
       bits_[slot / 32] |= 1u << slot % 32;
     }
   }
@@ -102,7 +101,9 @@ class SpecialFilter {
 
 /// A packed code in the other case, when its type record has a bit of the mask; else the code.
 uint32_t other_case(const uint8_t* record, uint32_t code, uint32_t mask) {
-  return record != nullptr && (lx::le32(record) & mask) != 0 ? code + lx::le32(record + 4) : code;
+  if (record == nullptr) return code;
+  const auto type = lx::format::codepage::TypeRecord::read(record);
+  return (type.type & mask) != 0 ? code + type.case_delta : code;
 }
 
 // Mappers: what one character maps to by itself. alone() is false when it stays as it is.
@@ -153,8 +154,10 @@ struct CodepageMapper {
       }
       if (cp.caseless[*c.p] != 0) return false;
       const uint8_t* record = lx::type_record(cp, c.p);  // none where the codepage has no such codes
-      if (record == nullptr || (lx::le32(record) & mask) == 0) return false;
-      *mapped = lx::pack(c.p, c.length) + lx::le32(record + 4);
+      if (record == nullptr) return false;
+      const auto type = lx::format::codepage::TypeRecord::read(record);
+      if ((type.type & mask) == 0) return false;
+      *mapped = lx::pack(c.p, c.length) + type.case_delta;
       return true;
     } else if constexpr (kKind == Kind::kFullWidth) {
       *mapped = c.length == 1 ? widths.full_of_byte(*c.p) : widths.to_full(lx::pack(c.p, c.length));

@@ -81,8 +81,8 @@ struct Sort {
   }
 
   /// The sets of an element that has two, each as an element of one.
-  Element first_set(const Element& element) const { return set_of(element, 2); }
-  Element second_set(const Element& element) const { return set_of(element, 6); }
+  Element first_set(const Element& element) const { return set_of(element, 0); }
+  Element second_set(const Element& element) const { return set_of(element, 1); }
 
   /// The element of a pair: false when the pair is none.
   bool pair(LXUChar first, LXUChar second, Element* element) const {
@@ -95,9 +95,10 @@ struct Sort {
   bool find_pair(LXUChar first, LXUChar second, Element* element) const;
 
  private:
-  Element set_of(const Element& element, size_t offset) const {
-    const uint8_t* w = expansions + format::sort::kExpansionBytes * element.special() + offset;
-    return Element(LXWeights{le16(w), w[2], w[3], 0}, 1, element.char_class());
+  Element set_of(const Element& element, size_t which) const {
+    using format::sort::Expansion;
+    const Expansion::Set set = Expansion::read(expansions + Expansion::kBytes * element.special()).sets[which];
+    return Element(LXWeights{set.primary, set.secondary, set.tertiary, 0}, 1, element.char_class());
   }
 };
 

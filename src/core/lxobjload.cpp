@@ -71,17 +71,16 @@ class Loading {
 
   int32_t read(LXFile* file, uint32_t* version) {
     int32_t rc = LX_OK;
-    lx::HookPtr<uint8_t> header(static_cast<uint8_t*>(LXLoadFile(file, 0, format::kHeaderBytes, &rc)));
-    if (!header) return rc;
-    if (lx::le32(header.get() + format::kHeaderMagic) != format::kMagic) return LX_E_CORRUPT;
-    *version = lx::le32(header.get() + format::kHeaderFormat) >> format::kFormatVersionShift;
-    const size_t count = lx::le16(header.get() + format::kHeaderSections);
-    for (size_t i = 0; i == 0 || (i < count && i < format::kMaxSections); ++i) {
-      const uint16_t size = lx::le16(header.get() + format::header_section_size(i));
-      const uint32_t offset = lx::le32(header.get() + format::header_section_offset(i));
-      sections_.section[i].data = static_cast<uint8_t*>(LXLoadFile(file, offset, size, &rc));
+    lx::HookPtr<uint8_t> block(static_cast<uint8_t*>(LXLoadFile(file, 0, format::kHeaderBytes, &rc)));
+    if (!block) return rc;
+    const format::Header header = format::Header::read(block.get());
+    if (header.magic != format::kMagic) return LX_E_CORRUPT;
+    *version = header.version();
+    for (size_t i = 0; i == 0 || (i < header.sections && i < format::kMaxSections); ++i) {
+      const format::Header::Section& place = header.section[i];
+      sections_.section[i].data = static_cast<uint8_t*>(LXLoadFile(file, place.offset, place.bytes, &rc));
       if (rc != LX_OK) return rc;
-      sections_.section[i].size = size;
+      sections_.section[i].size = place.bytes;
     }
     return LX_OK;
   }

@@ -159,7 +159,7 @@ struct Classifier {
     if constexpr (kForm == NumberForm::kUnicode) return (lx::unicode_type(c) & LX_C1_SPACE) != 0;
     if (c <= 0xFF) return (cp.type(static_cast<uint8_t>(c)) & LX_C1_SPACE) != 0;
     const uint8_t* record = lx::type_record_of_code(cp, c);
-    return record != nullptr && (lx::le32(record) & LX_C1_SPACE) != 0;
+    return record != nullptr && (lx::format::codepage::TypeRecord::read(record).type & LX_C1_SPACE) != 0;
   }
 
   Char<kForm> ascii_digit(Char<kForm> c) const {

@@ -118,7 +118,7 @@ inline int32_t search_code(int32_t rc) {
 const Codepage* common_codepage(int32_t* rc);
 
 /// The room that a locale string can take, in bytes.
-inline constexpr size_t kLocaleStringBytes = format::kTypes * format::kRecordNameBytes;
+inline constexpr size_t kLocaleStringBytes = format::kTypes * sizeof(format::ControlRecord::name);
 
 /// Fills the values that the caller has not set from the territory, changes the territory or the codepage:
 /// 0, 20 or 36; a change that fails leaves the locale as it was.

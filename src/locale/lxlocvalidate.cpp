@@ -38,9 +38,9 @@ int32_t validate_language(Bytes bytes) {
   const TextPayload payload(bytes);
   const bool valid = payload.texts_end(language::kFirstText, language::kLastText) &&
                      bytes.holds(payload.word(language::kUpperSpecialTable),
-                                 payload.word(language::kUpperSpecials) * language::kSpecialBytes) &&
+                                 payload.word(language::kUpperSpecials) * language::SpecialMapping::kBytes) &&
                      bytes.holds(payload.word(language::kLowerSpecialTable),
-                                 payload.word(language::kLowerSpecials) * language::kSpecialBytes);
+                                 payload.word(language::kLowerSpecials) * language::SpecialMapping::kBytes);
   return valid ? LX_OK : LX_E_CORRUPT;
 }
 

@@ -5,9 +5,12 @@
 #include <algorithm>
 #include <functional>
 
+#include "core/lxformat.h"
 #include "support/tiny_codepages.h"
 
 namespace {
+
+namespace fmt = lx::format::codepage;
 
 using lx::test::TinyCodepage;
 using lx::test::TinyLibrary;
@@ -315,9 +318,9 @@ TEST(ConvertAscii, ReadingDiffersFromWriting) {
   TinyCodepage yen = lx::test::tiny_shift_jis();
   yen.file.id = 9300;
   yen.file.name = "TINY-YEN";
-  yen.file.sections[0][778 + 2 * 0x5C] = 0xA5;  // 0x5C is U+00A5; U+005C becomes 0x5C
+  yen.file.sections[0][fmt::kUnicode + 2 * 0x5C] = 0xA5;  // 0x5C is U+00A5; U+005C becomes 0x5C
   TinyCodepage low_lead = lx::test::tiny_shift_jis();
-  low_lead.file.sections[0][10 + 0x7E] = 2;  // U+007E becomes 0x7E, which begins a character
+  low_lead.file.sections[0][fmt::kLengths + 0x7E] = 2;  // U+007E becomes 0x7E, which begins a character
   TinyLibrary library({yen, low_lead});
   const std::string run(20, 'x');
   const std::string text = run + "\x5C" + run + "~a" + run;
@@ -391,11 +394,9 @@ TEST_F(Convert, UndefinedFlags) {
 /// Codes are stored as they are, also by a codepage that no Unicode value becomes two bytes in.
 TEST(ConvertCodes, CodesNeedNoMappingBack) {
   TinyCodepage one_way = lx::test::tiny_shift_jis();
-  for (size_t page = 1; page < 256; ++page) {
-    uint8_t* entry = one_way.file.sections[0].data() + 2316 + 8 * page;
-    entry[2] = 2;  // an empty range
-    entry[3] = 1;
-  }
+  using fmt::PageEntry;
+  for (size_t page = 1; page < 256; ++page)
+    PageEntry().write(one_way.file.sections[0].data() + fmt::kPages + PageEntry::kBytes * page);
   TinyLibrary library({one_way});
   LXLocale* locale = library.locale(one_way);
   const LXWChar codes[] = {0x82A0, 'a', 0x8340};

@@ -44,9 +44,8 @@ TinyCodepage with_widths(TinyCodepage cp) {
       lx::put_le32(payload.data() + table + 4 * c.code, code);
       continue;
     }
-    payload.resize(payload.size() + 8);
-    lx::put_le32(payload.data() + payload.size() - 8, c.code);
-    lx::put_le32(payload.data() + payload.size() - 4, code);
+    payload.resize(payload.size() + fmt::WidthPair::kBytes);
+    fmt::WidthPair{c.code, code}.write(payload.data() + payload.size() - fmt::WidthPair::kBytes);
     lx::put_le16(payload.data() + fmt::kPairCount, ++pairs);
   }
   return cp;
@@ -121,7 +120,8 @@ class Map : public testing::Test {
       const uint16_t upper = lx::unicode_upper(c.unicode);
       const uint16_t other = upper != c.unicode ? upper : lx::unicode_lower(c.unicode);
       auto* record = const_cast<uint8_t*>(LXGetMbCtypeW(locale->codepage, c.code));
-      lx::put_le32(record + 4, cp.find(other) != nullptr ? cp.find(other)->code - c.code : 0);
+      const uint32_t delta = cp.find(other) != nullptr ? cp.find(other)->code - c.code : 0;
+      fmt::TypeRecord{fmt::TypeRecord::read(record).type, delta}.write(record);
     }
     return locale;
   }

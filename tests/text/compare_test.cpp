@@ -34,7 +34,7 @@ TinyCodepage with_widths(TinyCodepage cp) {
   }
   lx::put_le16(payload.data() + fmt::kPairs, static_cast<uint16_t>(payload.size()));
   lx::put_le16(payload.data() + fmt::kPairCount, 1);
-  payload.resize(payload.size() + fmt::kPairBytes);
+  payload.resize(payload.size() + fmt::WidthPair::kBytes);
   lx::put_le32(payload.data() + payload.size() - 8, 0x8141);
   lx::put_le32(payload.data() + payload.size() - 4, '!');
   return cp;
@@ -70,14 +70,17 @@ class Compare : public testing::Test {
     for (const TinyCodepage* cp : {&single_, &four_, &shift_}) library_.locale(*cp)->language = &german_;
   }
 
+  static void set_case_delta(LXLocale* locale, uint32_t code, uint32_t delta) {
+    auto* record = const_cast<uint8_t*>(LXGetMbCtypeW(locale->codepage, code));
+    fmt::TypeRecord{fmt::TypeRecord::read(record).type, delta}.write(record);
+  }
   /// A locale whose characters of several bytes have small letters.
   LXLocale* locale(const TinyCodepage& cp) {
     LXLocale* const in = library_.locale(cp);
     for (const TinyCharacter& c : cp.characters) {
       if (c.code <= 0xFF) continue;
       const TinyCharacter* lower = cp.find(lx::unicode_lower(c.unicode));
-      auto* record = const_cast<uint8_t*>(LXGetMbCtypeW(in->codepage, c.code));
-      lx::put_le32(record + 4, lower != nullptr ? lower->code - c.code : 0);
+      set_case_delta(in, c.code, lower != nullptr ? lower->code - c.code : 0);
     }
     return in;
   }
@@ -224,8 +227,7 @@ TEST_F(Compare, ExactResults) {
   };
   for (const Row& row : rows) {
     LXLocale* const in = locale(*row.cp);
-    if (row.cp == shift)
-      lx::put_le32(const_cast<uint8_t*>(LXGetMbCtypeW(in->codepage, 0x42C1)) + 4, 0x4447 - 0x42C1);
+    if (row.cp == shift) set_case_delta(in, 0x42C1, 0x4447 - 0x42C1);
     EXPECT_EQ(
         LXStrcmpEx(in, row.text1, row.state1, row.length1, row.text2, row.state2, row.length2, row.options),
         row.expected)

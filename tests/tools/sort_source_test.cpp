@@ -75,7 +75,7 @@ TEST(Sort, BecomesItsPayloadAndComesBack) {
             payload);
 
   auto word = [&](size_t at) { return size_t{lx::le16(&payload.at(at))}; };
-  auto page = [&](size_t number) { return layout::kPages + layout::kPageBytes * number; };
+  auto page = [&](size_t number) { return layout::kPages + layout::Page::kBytes * number; };
   EXPECT_EQ(payload[0], 2);
   EXPECT_EQ(payload[1], 3);
   EXPECT_EQ(word(2), 1U) << "expansions";
@@ -113,7 +113,7 @@ TEST(Sort, PagesShareWhatTheyHaveAlike) {
   std::string text = "@defaults 0001 0001\n@uncovered 0400..FFFF\n";
   for (const char* code : {"0041", "0141", "0241", "03FF"})
     text += code + std::string(" ; [.0300.0001.0001]\n");
-  EXPECT_LT(payload_of(text).size(), layout::kFixedBytes + 2 * 256 * layout::kWeightBytes);
+  EXPECT_LT(payload_of(text).size(), layout::kFixedBytes + 2 * 256 * layout::WeightRecord::kBytes);
   text = "@defaults 0001 0001\n@uncovered 3000..FFFF\n";
   for (unsigned code = 0; code < 0x3000; ++code) {
     char line[32];

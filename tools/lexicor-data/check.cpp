@@ -80,7 +80,9 @@ void check_object(const std::string& path, const ObjectName& name, const Control
   if (name.type == ObjectType::kLanguage) check_defaults(object.sections[0], control, path);
   if (name.type == ObjectType::kCodepage) {
     if (is_utf8_object(object) != (name.id == format::codepage::kUtf8Id)) {
-      throw SourceError(path, 0, 0, "the identifier 57352 and a computed mapping go together");
+      throw SourceError(path, 0, 0,
+                        "the identifier " + std::to_string(format::codepage::kUtf8Id) +
+                            " and a computed mapping go together");
     }
     check_codes(unpack_codepage(object, name.name), path);
   }

@@ -48,7 +48,8 @@ ObjectFile pack_source(const CodepageSource& source, const ObjectName& name, con
     throw SourceError(file_name, 1, 1, "the code set name is " + source.name + ", not " + name.name);
   }
   if (source.utf8 != (name.id == format::codepage::kUtf8Id)) {
-    throw SourceError(file_name, 1, 1, "UTF-8, and only UTF-8, has the identifier 57352");
+    throw SourceError(file_name, 1, 1,
+                      "UTF-8, and only UTF-8, has the identifier " + std::to_string(format::codepage::kUtf8Id));
   }
   for (uint32_t byte = 0; source.utf8 && byte < 256; ++byte) {
     const uint8_t length = byte >= 0xC2 && byte <= 0xDF ? 2 : byte >= 0xE0 && byte <= 0xEF ? 3 : 1;

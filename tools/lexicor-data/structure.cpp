@@ -76,7 +76,7 @@ class TrieWalk {
     if (left == 0) bad("has a walk that is longer than its character");
     if (!nodes_.holds(index * node_bytes_, node_bytes_)) bad("leads to a node outside its section");
     const uint8_t* node = nodes_.data + index * node_bytes_;
-    if (node_bytes_ == cp::kNodeBytes) {
+    if (node_bytes_ == cp::UnicodeNode::kBytes) {
       from = from < node[2] ? node[2] : from;
       to = to > node[3] ? node[3] : to;
     }
@@ -107,7 +107,7 @@ void check_pages(const ObjectFile& object, const std::string& file_name) {
   const lx::Bytes low = view(object.sections.size() > 2 ? object.sections[2] : kNone);
   const lx::Bytes high = view(object.sections.size() > 3 ? object.sections[3] : kNone);
   for (unsigned number = 0; number < 256; ++number) {
-    const uint8_t* page = &payload[cp::kPages + cp::kPageBytes * number];
+    const uint8_t* page = &payload[cp::kPages + cp::PageEntry::kBytes * number];
     const uint8_t kind = page[0];
     if (kind > cp::kKindByteByte) continue;
     const size_t low_bytes = kind == cp::kKindByte || kind == cp::kKindByteByte ? 1 : 2;
@@ -140,9 +140,9 @@ void check_language_structure(const ByteVector& payload, const std::string& file
   check_texts(payload, lang::kHeaderBytes, lang::kFirstText, lang::kLastText, file_name);
   const lx::Bytes bytes = view(payload);
   if (!bytes.holds(word(payload, lang::kUpperSpecialTable),
-                   word(payload, lang::kUpperSpecials) * lang::kSpecialBytes) ||
+                   word(payload, lang::kUpperSpecials) * lang::SpecialMapping::kBytes) ||
       !bytes.holds(word(payload, lang::kLowerSpecialTable),
-                   word(payload, lang::kLowerSpecials) * lang::kSpecialBytes)) {
+                   word(payload, lang::kLowerSpecials) * lang::SpecialMapping::kBytes)) {
     fail(file_name, "a table of special mappings lies outside the payload");
   }
 }
@@ -185,23 +185,25 @@ void check_codepage_structure(const ObjectFile& object, const std::string& file_
   if (!view(payload).holds(offset(cp::kFullWidth), cp::kFullWidthBytes)) {
     fail(file_name, "the full-width table lies outside the payload");
   }
-  if (!view(payload).holds(offset(cp::kPairs), offset(cp::kPairCount) * cp::kPairBytes)) {
+  if (!view(payload).holds(offset(cp::kPairs), offset(cp::kPairCount) * cp::WidthPair::kBytes)) {
     fail(file_name, "the width pairs lie outside the payload");
   }
   for (size_t i = 1; i < offset(cp::kPairCount); ++i) {
-    const uint8_t* pair = &payload[offset(cp::kPairs) + i * cp::kPairBytes];
-    if (lx::le32(pair) <= lx::le32(pair - cp::kPairBytes)) fail(file_name, "the width pairs are not sorted");
+    const uint8_t* pair = &payload[offset(cp::kPairs) + i * cp::WidthPair::kBytes];
+    if (lx::le32(pair) <= lx::le32(pair - cp::WidthPair::kBytes))
+      fail(file_name, "the width pairs are not sorted");
   }
 
-  TrieWalk types(tail(payload, offset(cp::kTypeTrie)), cp::kTypeNodeBytes,
-                 tail(payload, offset(cp::kTypeRecords)), cp::kTypeRecordBytes, "type", file_name);
+  TrieWalk types(tail(payload, offset(cp::kTypeTrie)), cp::TypeNode::kBytes,
+                 tail(payload, offset(cp::kTypeRecords)), cp::TypeRecord::kBytes, "type", file_name);
   for (unsigned byte = 0; byte < 256; ++byte) {
     const uint8_t length = payload[cp::kLengths + byte];
     types.check(byte, shift || length == 1 ? width : length);
   }
   if (is_utf8_object(object)) return;
   const ByteVector& trie = object.sections[1];
-  TrieWalk values(view(trie), cp::kNodeBytes, tail(trie, offset(cp::kUnicodeValues)), 2, "Unicode", file_name);
+  TrieWalk values(view(trie), cp::UnicodeNode::kBytes, tail(trie, offset(cp::kUnicodeValues)), 2, "Unicode",
+                  file_name);
   for (unsigned byte = 0; byte < 256; ++byte) {
     const uint8_t length = payload[cp::kLengths + byte];
     if (shift || length > 1) values.check(byte, shift ? width : length);
@@ -219,29 +221,29 @@ void check_sort_structure(const ObjectFile& object, const std::string& file_name
       fail(file_name, "the " + what + " lie outside the payload");
   };
   const size_t expansions = value(sort::kExpansionCount), contractions = value(sort::kContractionCount);
-  check_table(sort::kExpansions, expansions, sort::kExpansionBytes, "expansions");
-  check_table(sort::kContractions, contractions, sort::kContractionBytes, "contractions");
+  check_table(sort::kExpansions, expansions, sort::Expansion::kBytes, "expansions");
+  check_table(sort::kContractions, contractions, sort::Contraction::kBytes, "contractions");
   std::vector<bool> expands(0x10000);
   for (size_t i = 0; i < expansions; ++i) {
-    const size_t at = value(sort::kExpansions) + i * sort::kExpansionBytes;
+    const size_t at = value(sort::kExpansions) + i * sort::Expansion::kBytes;
     expands[value(at)] = true;
-    if (i > 0 && value(at) <= value(at - sort::kExpansionBytes))
+    if (i > 0 && value(at) <= value(at - sort::Expansion::kBytes))
       fail(file_name, "the expansions are not sorted");
   }
   for (size_t i = 1; i < contractions; ++i) {
-    const size_t at = value(sort::kContractions) + i * sort::kContractionBytes,
-                 before = at - sort::kContractionBytes;
+    const size_t at = value(sort::kContractions) + i * sort::Contraction::kBytes,
+                 before = at - sort::Contraction::kBytes;
     if (value(at) < value(before) || (value(at) == value(before) && value(at + 2) <= value(before + 2)))
       fail(file_name, "the contractions are not sorted");
   }
   for (unsigned number = 0; number < 256; ++number) {
-    const size_t page = sort::kPages + number * sort::kPageBytes;
+    const size_t page = sort::kPages + number * sort::Page::kBytes;
     if ((payload[page] & (sort::kPageUncovered | sort::kPagePrimary | sort::kPageSpecial)) != 0) continue;
-    check_table(sort::kWeights, value(page + 2) + 256, sort::kWeightBytes,
+    check_table(sort::kWeights, value(page + 2) + 256, sort::WeightRecord::kBytes,
                 "weights of page " + std::to_string(number));
     for (size_t low = 0; low < 256; ++low) {
-      const size_t flags = value(sort::kWeights) + (value(page + 2) + low) * sort::kWeightBytes + 4;
-      if ((value(flags) & sort::kWeightExpansion) != 0 && !expands[number << 8 | low])
+      const size_t flags = value(sort::kWeights) + (value(page + 2) + low) * sort::WeightRecord::kBytes + 4;
+      if ((value(flags) & sort::WeightRecord::kExpansion) != 0 && !expands[number << 8 | low])
         fail(file_name, "character " + std::to_string(number << 8 | low) + " has no expansion");
     }
   }
