@@ -1,11 +1,12 @@
-// A codepage as the code works with it: tables that derive_codepage() lays flat when the object is loaded, and
-// the operations on single characters that everything else is built from. All of them trust the tables, which
-// validate_codepage() has checked.
+// A codepage as the code works with it: tables that are laid flat when the object is loaded, and the operations
+// on single characters that everything else is built from. All of them trust the tables, which were validated
+// then.
 #pragma once
 
 #include "core/lxbytes.h"
 #include "core/lxformat.h"
 #include "core/lxobjman.h"
+#include "core/lxobjtypes.h"
 
 namespace lx {
 
@@ -64,6 +65,11 @@ struct Codepage {
   uint8_t width_in(LXShiftState state) const { return state == LX_SHIFT_DOUBLE ? width : 1; }
   uint32_t type(uint8_t byte) const { return le32(payload + format::codepage::kTypes + 4 * byte); }
 };
+
+extern const ObjectType kCodepageType;
+extern const BuiltIn kBuiltInCodepage;
+void* derive_codepage(uint16_t id, const Sections& sections);
+int32_t upgrade_codepage(const Sections& version1, Sections* upgraded);
 
 /// The derived data of a loaded codepage object.
 inline const Codepage& codepage_of(const LXObject& object) {

@@ -2,7 +2,6 @@
 // else. Payload, arrays and derived data are laid out at compile time.
 #include "codepage/lxcodepage.h"
 #include "codepage/lxunicode_tables.inc"
-#include "core/lxobjtypes.h"
 
 namespace {
 

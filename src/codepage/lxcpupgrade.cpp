@@ -4,7 +4,6 @@
 
 #include "codepage/lxcodepage.h"
 #include "core/lxmemory.h"
-#include "core/lxobjtypes.h"
 #include "core/lxtrace.h"
 
 namespace {

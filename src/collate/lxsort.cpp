@@ -4,7 +4,6 @@
 #include <cstring>
 
 #include "core/lxmemory.h"
-#include "core/lxobjtypes.h"
 
 namespace {
 
@@ -177,34 +176,33 @@ void fill_deciding(Sort* sort) {
   }
 }
 
-}  // namespace
-
-namespace lx {
-
-int32_t validate_sort(Bytes bytes) {
-  if (!bytes.holds(0, fmt::kFixedBytes)) return LX_E_CORRUPT;
+lx::Fault validate_sort(uint16_t, const lx::Sections& sections) {
+  const Bytes bytes = sections.section[0];
+  if (!bytes.holds(0, fmt::kFixedBytes)) return lx::corrupt("the payload is shorter than its fixed part", 0);
   const uint8_t* payload = bytes.data;
   const auto table_fits = [&](size_t offset_field, size_t count, size_t record_bytes) {
     return bytes.holds(le16(payload + offset_field), count * record_bytes);
   };
-  if (!table_fits(fmt::kExpansions, le16(payload + fmt::kExpansionCount), fmt::Expansion::kBytes) ||
-      !table_fits(fmt::kContractions, le16(payload + fmt::kContractionCount), fmt::Contraction::kBytes))
-    return LX_E_CORRUPT;
-  for (size_t page = 0; page < kPages; ++page) {
-    const fmt::Page record = page_at(payload, page);
-    if (record.is_table() && !table_fits(fmt::kWeights, record.base + kPageElements, fmt::WeightRecord::kBytes))
-      return LX_E_CORRUPT;
+  if (!table_fits(fmt::kExpansions, le16(payload + fmt::kExpansionCount), fmt::Expansion::kBytes))
+    return lx::corrupt("the expansions lie outside the payload", fmt::kExpansions);
+  if (!table_fits(fmt::kContractions, le16(payload + fmt::kContractionCount), fmt::Contraction::kBytes))
+    return lx::corrupt("the contractions lie outside the payload", fmt::kContractions);
+  for (size_t number = 0; number < kPages; ++number) {
+    const fmt::Page page = page_at(payload, number);
+    if (page.is_table() && !table_fits(fmt::kWeights, page.base + kPageElements, fmt::WeightRecord::kBytes))
+      return lx::corrupt("the weights of a page lie outside the payload",
+                         fmt::kPages + fmt::Page::kBytes * number);
   }
-  return LX_OK;
+  return {};
 }
 
-void* derive_sort(Bytes bytes) {
-  const uint8_t* payload = bytes.data;
+void* derive_sort(uint16_t, const lx::Sections& sections) {
+  const uint8_t* payload = sections.section[0].data;
   bool flat[kPages];
   const size_t pages = flat_pages(payload, flat);
   const size_t pairs = le16(payload + fmt::kContractionCount);
   auto* sort = static_cast<Sort*>(
-      hook_allocate_zeroed(sizeof(Sort) + pairs * sizeof(Pair) + pages * kPageElements * sizeof(Element)));
+      lx::hook_allocate_zeroed(sizeof(Sort) + pairs * sizeof(Pair) + pages * kPageElements * sizeof(Element)));
   if (sort == nullptr) return nullptr;
   sort->payload = payload;
   sort->expansions = payload + le16(payload + fmt::kExpansions);
@@ -219,6 +217,12 @@ void* derive_sort(Bytes bytes) {
   fill_deciding(sort);
   return sort;
 }
+
+}  // namespace
+
+namespace lx {
+
+const ObjectType kSortType{validate_sort, derive_sort, nullptr, nullptr};
 
 bool Sort::find_pair(LXUChar first, LXUChar second, Element* element) const {
   const uint32_t characters = static_cast<uint32_t>(first) << 16 | second;

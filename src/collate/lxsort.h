@@ -1,11 +1,12 @@
 // A sort as collation works with it: weights laid flat when the object is loaded, and the walk over a text that
-// gives one collation element after the other. All of it trusts the tables, which validate_sort() has checked.
+// gives one collation element after the other. All of it trusts the tables, which were validated then.
 #pragma once
 
 #include "codepage/lxtext.h"
 #include "core/lxbytes.h"
 #include "core/lxformat.h"
 #include "core/lxobjman.h"
+#include "core/lxobjtypes.h"
 
 namespace lx {
 
@@ -101,6 +102,8 @@ struct Sort {
     return Element(LXWeights{set.primary, set.secondary, set.tertiary, 0}, 1, element.char_class());
   }
 };
+
+extern const ObjectType kSortType;
 
 /// The derived data of a loaded sort object.
 inline const Sort& sort_of(const LXObject& object) {

@@ -4,9 +4,15 @@
 
 #include "codepage/lxcodepage.h"
 #include "core/lxobjman.h"
+#include "core/lxobjtypes.h"
 #include "core/lxrecords.h"
 
 namespace lx {
+
+extern const ObjectType kLanguageType;
+extern const ObjectType kTerritoryType;
+extern const BuiltIn kBuiltInLanguage;
+extern const BuiltIn kBuiltInTerritory;
 
 /// Where an item's value stands. The comment says what an item's index counts.
 enum class ItemKind : uint8_t {

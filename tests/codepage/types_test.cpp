@@ -111,7 +111,7 @@ TEST(BuiltInCodepage, InForceWithoutADirectory) {
   ASSERT_EQ(LXInit("/nonexistent", lx::test::Hooks::allocate, lx::test::Hooks::release, &hooks, 0),
             LX_W_DEFAULTS);
   const lx::Sections& sections = lx::kBuiltInCodepage.sections;
-  EXPECT_EQ(lx::validate_codepage(1, sections), LX_OK);
+  EXPECT_EQ(lx::kCodepageType.validate(1, sections).code, LX_OK);
   void* block = lx::derive_codepage(1, sections);
   ASSERT_NE(block, nullptr);
   const auto& derived = *static_cast<const lx::Codepage*>(block);
@@ -122,9 +122,9 @@ TEST(BuiltInCodepage, InForceWithoutADirectory) {
   EXPECT_EQ(derived.rows, nullptr);
   EXPECT_EQ(derived.codes32, nullptr);
   const auto scalars = [](const lx::Codepage& c) {
-    return std::vector<uint32_t>{c.width,       c.substitution,    c.shift_out, c.shift_in,
-                                 c.single_byte, c.shift_sensitive, c.utf8,      c.two_level_rows,
-                                 c.same_below};
+    return std::vector<uint32_t>{c.width,    c.substitution,   c.shift_out,
+                                 c.shift_in, c.single_byte,    c.shift_sensitive,
+                                 c.utf8,     c.two_level_rows, c.same_below};
   };
   EXPECT_EQ(scalars(derived), scalars(built_in));
   EXPECT_TRUE(lx::hook_free(block));

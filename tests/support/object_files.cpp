@@ -10,7 +10,6 @@
 
 #include "core/lxbytes.h"
 #include "core/lxformat.h"
-#include "core/lxobjtypes.h"
 
 namespace lx::test {
 namespace {

@@ -438,7 +438,7 @@ CodepageObject::CodepageObject(uint16_t id, const std::vector<ByteString>& secti
   object_.disk.id = id;
   object_.disk.type = LX_CODEPAGE;
   locale_.codepage = &object_;
-  code_ = validate_codepage(id, exact);
+  code_ = kCodepageType.validate(id, exact).code;
   if (code_ != LX_OK) return;
   object_.derived = derive_codepage(id, exact);
   if (object_.derived == nullptr) throw std::runtime_error("no memory for a codepage");

@@ -8,9 +8,9 @@
 
 #include "compile.h"
 #include "core/lxbytes.h"
+#include "object_check.h"
 #include "sort_check.h"
 #include "sort_pack.h"
-#include "structure.h"
 #include "ucm.h"
 
 namespace lexicor_data {
@@ -61,9 +61,11 @@ std::string fault_of(const std::string& text) {
   return "none";
 }
 
+const ObjectName kName{ObjectType::kSort, 1, "s", 0};
+
 ByteVector payload_of(const std::string& text) {
   ByteVector payload = pack_sort(read_text(text), "s.txt");
-  check_sort_structure({{payload}, 2, ""}, "s");
+  check_object({{payload}, 2, ""}, kName, "s");
   return payload;
 }
 
@@ -203,9 +205,9 @@ TEST(Sort, CheckFindsWhatIsBrokenInAPayload) {
   } cases[] = {
       {layout::kExpansionCount, 0x7FFF, "expansions lie outside"},
       {layout::kContractionCount, 0x7FFF, "contractions lie outside"},
-      {layout::kWeights, 0xFFF0, "weights of page 0 lie outside"},
-      {layout::kWeights, 0, "weights of page 0 lie outside"},
-      {layout::kPages + 2, 0xFFFF, "weights of page 0 lie outside"},
+      {layout::kWeights, 0xFFF0, "section 0, offset 6: the weights of a page lie outside"},
+      {layout::kWeights, 0, "weights of page 0 lie inside"},
+      {layout::kPages + 2, 0xFFFF, "weights of a page lie outside"},
       {layout::kExpansionCount, 1, "has no expansion"},
       {expansions, 0xE7, "expansions are not sorted"},
       {contractions + 2, 0x69, "contractions are not sorted"},
@@ -215,7 +217,7 @@ TEST(Sort, CheckFindsWhatIsBrokenInAPayload) {
     ByteVector broken = sound;
     lx::put_le16(&broken[test.at], static_cast<uint16_t>(test.value));
     try {
-      check_sort_structure({{broken}, 2, ""}, "s");
+      check_object({{broken}, 2, ""}, kName, "s");
       ADD_FAILURE() << test.fault;
     } catch (const SourceError& error) {
       EXPECT_NE(std::string(error.what()).find(test.fault), std::string::npos) << error.what();
@@ -226,7 +228,7 @@ TEST(Sort, CheckFindsWhatIsBrokenInAPayload) {
     ByteVector bytes = sound;
     bytes[at] = static_cast<uint8_t>(~bytes[at]);
     try {
-      check_sort_structure({{bytes}, 2, ""}, "s");
+      check_object({{bytes}, 2, ""}, kName, "s");
       const SortSource sort = unpack_sort(bytes);
       check_sort(sort, "s");
       EXPECT_EQ(written(read_text(written(sort))), written(sort)) << at;

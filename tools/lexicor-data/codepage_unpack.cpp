@@ -5,7 +5,6 @@
 
 #include "core/lxbytes.h"
 #include "core/lxformat.h"
-#include "structure.h"
 
 namespace lexicor_data {
 namespace {
@@ -52,12 +51,12 @@ class TrieReader {
 
 }  // namespace
 
-CodepageModel unpack_codepage(const ObjectFile& object, const std::string& name) {
+CodepageModel unpack_codepage(const ObjectFile& object, const ObjectName& name) {
   const ByteVector& payload = object.sections[0];
   const uint16_t flags = lx::le16(&payload[cp::kFlags]);
   CodepageModel model;
   CodepageSource& header = model.header;
-  header.name = name;
+  header.name = name.name;
   header.width = payload[cp::kWidth];
   header.kind = (flags & cp::kFlagShift) != 0 ? CodepageClass::kShiftStateful
                 : header.width > 1            ? CodepageClass::kMultiByte
@@ -66,7 +65,7 @@ CodepageModel unpack_codepage(const ObjectFile& object, const std::string& name)
   std::copy_n(&payload[cp::kLineEnds], header.line_ends.size(), header.line_ends.begin());
   header.ascii = (flags & cp::kFlagAscii) != 0;
   std::copy_n(&payload[cp::kLengths], header.leads.size(), header.leads.begin());
-  header.utf8 = is_utf8_object(object);
+  header.utf8 = name.id == cp::kUtf8Id;
   if (header.utf8) {
     fill_utf8(model);
     return model;
