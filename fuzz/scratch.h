@@ -48,18 +48,18 @@ inline std::vector<uint8_t> control_file() {
     const char* name;
   } records[] = {{1, LX_LANGUAGE, "English"}, {kId, LX_LANGUAGE, "Fuzz"}, {1, LX_TERRITORY, "UnitedStates"},
                  {kId, LX_TERRITORY, "Fuzz"}, {kId, LX_CODEPAGE, "Fuzz"}, {kId, LX_SORT, "Fuzz"}};
-  std::vector<uint8_t> file(format::kHeaderBytes + std::size(records) * format::kRecordBytes);
-  lx::put_le32(file.data(), format::kMagic);
-  lx::put_le16(file.data() + format::kHeaderSections, 1);
-  lx::put_le16(file.data() + format::header_section_size(0),
-               static_cast<uint16_t>(std::size(records) * format::kRecordBytes));
-  lx::put_le32(file.data() + format::header_section_offset(0), format::kHeaderBytes);
+  const size_t table_bytes = std::size(records) * format::ControlRecord::kBytes;
+  std::vector<uint8_t> file(format::kHeaderBytes + table_bytes);
+  format::Header header;
+  header.sections = 1;
+  header.section[0] = {static_cast<uint16_t>(table_bytes), format::kHeaderBytes};
+  header.write(file.data());
   uint8_t* at = file.data() + format::kHeaderBytes;
-  for (const auto& record : records) {
-    lx::put_le16(at + format::kRecordId, record.id);
-    at[format::kRecordType] = record.type;
-    strcpy(reinterpret_cast<char*>(at) + format::kRecordName, record.name);
-    at += format::kRecordBytes;
+  for (const auto& listed : records) {
+    format::ControlRecord record{listed.id, listed.type};
+    strcpy(record.name, listed.name);
+    record.write(at);
+    at += record.kBytes;
   }
   return file;
 }

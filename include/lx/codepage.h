@@ -52,6 +52,9 @@ enum {
   LX_C3_KASHIDA = 0x200
 };
 
+/* The identifier of UTF-8, whose conversion is computed. */
+enum { LX_CODEPAGE_UTF8 = 57352 };
+
 /* The functions of this header trust their pointers: text must be there, and whole characters must
  * be whole unless a function is said to stop before a cut one. A null locale is the default locale.
  * Those that take a locale leave 0 as its last error; without a locale they return 0 (or the pointer

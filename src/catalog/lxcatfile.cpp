@@ -8,7 +8,7 @@
 namespace {
 
 namespace format = lx::format::catalog;
-using lx::catalog_word;
+using lx::SetRecord;
 
 // Index entries are read as many at a time as a work buffer on the stack holds.
 constexpr size_t kEntriesAtATime = 256 / format::kEntryBytes;
@@ -32,34 +32,39 @@ bool read_at(const LXCatalog& catalog, uint32_t offset, void* to, size_t bytes) 
 /// Reads and checks the header, and gets the locale of the texts. A number of sets that the file cannot hold is
 /// refused: it bounds the walk along the chain.
 int32_t read_header(LXCatalog* catalog) {
-  uint8_t header[format::kHeaderBytes];
-  if (!read_at(*catalog, 0, header, sizeof(header))) return LX_E_CATALOG;
-  const uint32_t sets = catalog_word(header + format::kHeaderSets);
-  const char* const name = reinterpret_cast<const char*>(header) + format::kHeaderLocale;
-  if (catalog_word(header + format::kHeaderMagic) != format::kMagic ||
-      catalog_word(header + format::kHeaderVersion) != format::kVersion ||
-      catalog_word(header + format::kHeaderByteOrder) != LXMcGetByteOrder() || sets == 0 ||
-      !holds(catalog->file_bytes, format::kHeaderBytes, uint64_t{sets} * format::kSetBytes) ||
-      memchr(name, 0, format::kHeaderLocaleBytes) == nullptr)
+  uint8_t bytes[format::kHeaderBytes];
+  if (!read_at(*catalog, 0, bytes, sizeof(bytes))) return LX_E_CATALOG;
+  const format::Header header = format::Header::read(bytes);
+  if (header.magic != format::kMagic || header.version != format::kVersion ||
+      header.byte_order != LXMcGetByteOrder() || header.sets == 0 ||
+      !holds(catalog->file_bytes, format::kHeaderBytes, uint64_t{header.sets} * format::kSetBytes) ||
+      memchr(header.locale, 0, sizeof(header.locale)) == nullptr)
     return LX_E_CATALOG;
-  catalog->locale = LXGetLocale(name, 0, nullptr);
+  catalog->locale = LXGetLocale(header.locale, 0, nullptr);
   if (catalog->locale == nullptr) return LX_E_CATALOG;
-  catalog->set_count = sets;
-  catalog->first_set = catalog_word(header + format::kHeaderFirstSet);
+  catalog->set_count = header.sets;
+  catalog->first_set = header.first_set;
   return LX_OK;
 }
 
-/// Looks for a number in an array of records of `stride` bytes that begin with ascending numbers, first where
-/// it stands when all numbers from 1 on are there. Null when it is not there.
-const uint8_t* find_number(const uint8_t* records, uint32_t count, size_t stride, uint32_t wanted) {
+bool read_set(const LXCatalog& catalog, uint32_t offset, SetRecord* record) {
+  uint8_t bytes[format::kSetBytes];
+  if (!read_at(catalog, offset, bytes, sizeof(bytes))) return false;
+  *record = SetRecord::read(bytes);
+  return true;
+}
+
+/// Looks for a number among `count` ascending ones, first where it stands when all numbers from 1 on are there.
+/// `count` when it is not there.
+template <class NumberAt>
+uint32_t find_number(NumberAt number_at, uint32_t count, uint32_t wanted) {
   const bool dense = wanted - 1 < count;
   uint32_t low = 0;
   uint32_t high = dense ? wanted : count;
   uint32_t at = dense ? wanted - 1 : count / 2;
   while (low < high) {
-    const uint8_t* const record = records + at * stride;
-    const uint32_t number = catalog_word(record);
-    if (number == wanted) return record;
+    const uint32_t number = number_at(at);
+    if (number == wanted) return at;
     const bool above = number > wanted;
     if (above) {
       high = at;
@@ -71,19 +76,17 @@ const uint8_t* find_number(const uint8_t* records, uint32_t count, size_t stride
     const uint32_t step = high - low == 1 ? 1 : (high - low) / 2;
     at = above ? at - step : at + step;
   }
-  return nullptr;
+  return count;
 }
-static_assert(format::kSetNumber == 0 && format::kEntryNumber == 0, "find_number() reads records' first words");
 
 /// Loads all sets: as many as the header counts.
 int32_t load_sets(LXCatalog* catalog) {
-  catalog->sets = static_cast<uint8_t*>(lx::hook_allocate(catalog->set_count * format::kSetBytes));
+  catalog->sets = static_cast<SetRecord*>(lx::hook_allocate(catalog->set_count * sizeof(SetRecord)));
   if (catalog->sets == nullptr) return LX_E_MEMORY;
   uint32_t offset = catalog->first_set;
   for (uint32_t i = 0; i < catalog->set_count; ++i) {
-    uint8_t* const record = catalog->sets + i * format::kSetBytes;
-    if ((i != 0 && offset == 0) || !LXMcLoadSet(*catalog, offset, record)) return LX_E_CATALOG;
-    offset = catalog_word(record + format::kSetNext);
+    if ((i != 0 && offset == 0) || !LXMcLoadSet(*catalog, offset, &catalog->sets[i])) return LX_E_CATALOG;
+    offset = catalog->sets[i].next;
   }
   return LX_OK;
 }
@@ -101,18 +104,17 @@ int32_t load(LXCatalog* catalog) {
 }
 
 /// Reads index entries in order until one has the number: 0, 71 or 72.
-int32_t read_entry(const LXCatalog& catalog, const uint8_t* record, uint32_t number, uint8_t* entry) {
-  uint32_t offset = catalog_word(record + format::kSetIndex);
-  for (size_t left = catalog_word(record + format::kSetMessages); left != 0;) {
+int32_t read_entry(const LXCatalog& catalog, const SetRecord& set, uint32_t number, format::IndexEntry* entry) {
+  uint32_t offset = set.index;
+  for (size_t left = set.messages; left != 0;) {
     if (offset > catalog.file_bytes) return LX_E_CATALOG;
     uint8_t entries[kEntriesAtATime * format::kEntryBytes];
     const size_t count = lx::least(left, kEntriesAtATime, (catalog.file_bytes - offset) / format::kEntryBytes);
     const size_t bytes = count * format::kEntryBytes;
     if (count == 0 || !read_at(catalog, offset, entries, bytes)) return LX_E_CATALOG;
     for (size_t at = 0; at != bytes; at += format::kEntryBytes) {
-      if (catalog_word(entries + at) != number) continue;
-      memcpy(entry, entries + at, format::kEntryBytes);
-      return LX_OK;
+      *entry = format::IndexEntry::read(entries + at);
+      if (entry->number == number) return LX_OK;
     }
     left -= count;
     offset += static_cast<uint32_t>(bytes);
@@ -121,22 +123,21 @@ int32_t read_entry(const LXCatalog& catalog, const uint8_t* record, uint32_t num
 }
 
 /// The text of an index entry, which must lie in the set's texts.
-int32_t get_text(const LXCatalog& catalog, const uint8_t* record, const uint8_t* entry,
+int32_t get_text(const LXCatalog& catalog, const SetRecord& set, const format::IndexEntry& entry,
                  lx::MessageText* message) {
-  const uint32_t texts = catalog_word(record + format::kSetTexts);
-  const uint32_t all_bytes = catalog_word(record + format::kSetTextBytes);
-  const uint32_t offset = catalog_word(entry + format::kEntryText);
-  const uint32_t bytes = catalog_word(entry + format::kEntryTextBytes);
-  if (!holds(catalog.file_bytes, texts, all_bytes) || !holds(all_bytes, offset, bytes)) return LX_E_CATALOG;
+  if (!holds(catalog.file_bytes, set.texts, set.text_bytes) ||
+      !holds(set.text_bytes, entry.text, entry.text_bytes))
+    return LX_E_CATALOG;
+  const uint32_t offset = set.texts + entry.text;
   if (catalog.image != nullptr) {
-    message->text = reinterpret_cast<const char*>(catalog.image) + texts + offset;
+    message->text = reinterpret_cast<const char*>(catalog.image) + offset;
   } else {
-    message->copy = static_cast<char*>(lx::hook_allocate(size_t{bytes} + 1));
-    if (message->copy == nullptr || !read_at(catalog, texts + offset, message->copy, bytes))
+    message->copy = static_cast<char*>(lx::hook_allocate(size_t{entry.text_bytes} + 1));
+    if (message->copy == nullptr || !read_at(catalog, offset, message->copy, entry.text_bytes))
       return LX_E_CATALOG;
     message->text = message->copy;
   }
-  message->bytes = static_cast<int32_t>(strnlen(message->text, bytes));
+  message->bytes = static_cast<int32_t>(strnlen(message->text, entry.text_bytes));
   return LX_OK;
 }
 
@@ -172,22 +173,20 @@ LXCatalog* LXMcLoadCat(LXFile* file, LXLocale* opener, uint32_t flags, int32_t* 
   return nullptr;
 }
 
-bool LXMcLoadSet(const LXCatalog& catalog, uint32_t offset, uint8_t* record) {
-  if (!read_at(catalog, offset, record, format::kSetBytes)) return false;
-  const uint32_t index = catalog_word(record + format::kSetIndex);
-  const uint64_t index_bytes = uint64_t{catalog_word(record + format::kSetMessages)} * format::kEntryBytes;
+bool LXMcLoadSet(const LXCatalog& catalog, uint32_t offset, SetRecord* record) {
+  if (!read_set(catalog, offset, record)) return false;
   // The first entry must be there even where the set has no messages.
-  return holds(catalog.file_bytes, index, format::kEntryBytes) &&
-         holds(catalog.file_bytes, index, index_bytes) &&
-         holds(catalog.file_bytes, catalog_word(record + format::kSetTexts),
-               catalog_word(record + format::kSetTextBytes));
+  return holds(catalog.file_bytes, record->index, format::kEntryBytes) &&
+         holds(catalog.file_bytes, record->index, uint64_t{record->messages} * format::kEntryBytes) &&
+         holds(catalog.file_bytes, record->texts, record->text_bytes);
 }
 
-int32_t MCGetSet(LXCatalog* catalog, uint32_t number, uint8_t* record) {
+int32_t MCGetSet(LXCatalog* catalog, uint32_t number, SetRecord* record) {
   if (catalog->sets != nullptr) {
-    const uint8_t* found = find_number(catalog->sets, catalog->set_count, format::kSetBytes, number);
-    if (found == nullptr) return LX_E_MESSAGE;
-    memcpy(record, found, format::kSetBytes);
+    const SetRecord* sets = catalog->sets;
+    const uint32_t at = find_number([&](uint32_t i) { return sets[i].number; }, catalog->set_count, number);
+    if (at == catalog->set_count) return LX_E_MESSAGE;
+    *record = sets[at];
     return LX_OK;
   }
   if (catalog->locale == nullptr) {
@@ -195,23 +194,24 @@ int32_t MCGetSet(LXCatalog* catalog, uint32_t number, uint8_t* record) {
   }
   uint32_t offset = catalog->first_set;
   for (uint32_t i = 0; i < catalog->set_count; ++i) {
-    if (!read_at(*catalog, offset, record, format::kSetBytes)) return LX_E_CATALOG;
-    if (catalog_word(record + format::kSetNumber) == number) return LX_OK;
-    offset = catalog_word(record + format::kSetNext);
+    if (!read_set(*catalog, offset, record)) return LX_E_CATALOG;
+    if (record->number == number) return LX_OK;
+    offset = record->next;
     if (offset == 0) return LX_E_MESSAGE;
   }
   return LX_E_MESSAGE;
 }
 
-int32_t MCGetMsg(const LXCatalog& catalog, const uint8_t* record, uint32_t number, lx::MessageText* message) {
-  uint8_t read[format::kEntryBytes];
-  const uint8_t* entry = read;
+int32_t MCGetMsg(const LXCatalog& catalog, const SetRecord& set, uint32_t number, lx::MessageText* message) {
+  format::IndexEntry entry;
   if (catalog.image != nullptr) {
-    entry = find_number(catalog.image + catalog_word(record + format::kSetIndex),
-                        catalog_word(record + format::kSetMessages), format::kEntryBytes, number);
-    if (entry == nullptr) return LX_E_MESSAGE;
-  } else if (const int32_t code = read_entry(catalog, record, number, read)) {
+    const uint8_t* index = catalog.image + set.index;
+    const auto entry_at = [&](uint32_t i) { return format::IndexEntry::read(index + i * format::kEntryBytes); };
+    const uint32_t at = find_number([&](uint32_t i) { return entry_at(i).number; }, set.messages, number);
+    if (at == set.messages) return LX_E_MESSAGE;
+    entry = entry_at(at);
+  } else if (const int32_t code = read_entry(catalog, set, number, &entry)) {
     return code;
   }
-  return get_text(catalog, record, entry, message);
+  return get_text(catalog, set, entry, message);
 }

@@ -3,14 +3,14 @@
 
 #include <cstring>
 
-#include "core/lxformat.h"
+#include "core/lxcatformat.h"
 #include "core/lxmemory.h"
 
 /// Loaded: `image` and `sets` are there and no file. File mode: `file` is open, and the header is read and
 /// checked when the first message is asked for.
 struct LXCatalog {
-  uint8_t* image;       // the whole file
-  uint8_t* sets;        // the set records, one behind the other
+  uint8_t* image;  // the whole file
+  lx::format::catalog::SetRecord* sets;
   uint32_t file_bytes;  // when it was opened
   uint32_t set_count;
   uint32_t first_set;  // offset
@@ -21,12 +21,7 @@ struct LXCatalog {
 
 namespace lx {
 
-/// An integer of a catalog, in this machine's byte order.
-inline uint32_t catalog_word(const uint8_t* p) {
-  uint32_t word;
-  memcpy(&word, p, sizeof(word));
-  return word;
-}
+using SetRecord = format::catalog::SetRecord;
 
 /// A message in the codepage of the catalog's locale: in the image, or a copy of its own.
 struct MessageText {
@@ -52,10 +47,11 @@ void free_catalog(LXCatalog* catalog);
 /// or 71.
 LXCatalog* LXMcLoadCat(LXFile* file, LXLocale* opener, uint32_t flags, int32_t* rc);
 
-/// Copies the set record at an offset of a loaded catalog. False when it, its index or its texts do not lie in
+/// Reads the set record at an offset of a loaded catalog. False when it, its index or its texts do not lie in
 /// the file.
-bool LXMcLoadSet(const LXCatalog& catalog, uint32_t offset, uint8_t* record);
+bool LXMcLoadSet(const LXCatalog& catalog, uint32_t offset, lx::SetRecord* record);
 
-/// Finds a set and copies its record, finds a message of a set: 0, 71, or 72 when there is none.
-int32_t MCGetSet(LXCatalog* catalog, uint32_t number, uint8_t* record);
-int32_t MCGetMsg(const LXCatalog& catalog, const uint8_t* record, uint32_t number, lx::MessageText* message);
+/// Finds a set, finds a message of a set: 0, 71, or 72 when there is none.
+int32_t MCGetSet(LXCatalog* catalog, uint32_t number, lx::SetRecord* record);
+int32_t MCGetMsg(const LXCatalog& catalog, const lx::SetRecord& record, uint32_t number,
+                 lx::MessageText* message);

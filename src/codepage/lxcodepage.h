@@ -1,11 +1,12 @@
-// A codepage as the code works with it: tables that derive_codepage() lays flat when the object is loaded, and
-// the operations on single characters that everything else is built from. All of them trust the tables, which
-// validate_codepage() has checked.
+// A codepage as the code works with it: tables that are laid flat when the object is loaded, and the operations
+// on single characters that everything else is built from. All of them trust the tables, which were validated
+// then.
 #pragma once
 
 #include "core/lxbytes.h"
 #include "core/lxformat.h"
 #include "core/lxobjman.h"
+#include "core/lxobjtypes.h"
 
 namespace lx {
 
@@ -18,10 +19,11 @@ struct PageCodes {
   const uint8_t* low_array;
   const uint8_t* high_array;
 
-  const uint8_t* entry(size_t page) const {
-    return payload + format::codepage::kPages + page * format::codepage::kPageBytes;
+  format::codepage::PageEntry entry(size_t page) const {
+    using format::codepage::PageEntry;
+    return PageEntry::read(payload + format::codepage::kPages + page * PageEntry::kBytes);
   }
-  bool maps(size_t page) const { return entry(page)[2] <= entry(page)[3]; }
+  bool maps(size_t page) const { return entry(page).lowest <= entry(page).highest; }
   /// The packed code, a zero byte inside it still there, or the substitution byte.
   uint32_t code(uint16_t u) const;
 };
@@ -63,6 +65,11 @@ struct Codepage {
   uint8_t width_in(LXShiftState state) const { return state == LX_SHIFT_DOUBLE ? width : 1; }
   uint32_t type(uint8_t byte) const { return le32(payload + format::codepage::kTypes + 4 * byte); }
 };
+
+extern const ObjectType kCodepageType;
+extern const BuiltIn kBuiltInCodepage;
+void* derive_codepage(uint16_t id, const Sections& sections);
+int32_t upgrade_codepage(const Sections& version1, Sections* upgraded);
 
 /// The derived data of a loaded codepage object.
 inline const Codepage& codepage_of(const LXObject& object) {
@@ -169,8 +176,7 @@ inline size_t store_unicode(const Codepage& cp, uint16_t u, uint8_t* p) {
   return count;
 }
 
-/// The type record of the character at `p`: the type word, then what added to its packed code gives the other
-/// case. Null in a single-byte codepage. There is no range check: the trie covers every byte sequence.
+/// The type record of the character at `p`. Null in a single-byte codepage. There is no range check: the trie covers every byte sequence.
 const uint8_t* type_record(const Codepage& cp, const uint8_t* p);
 const uint8_t* type_record_of_code(const Codepage& cp, uint32_t code);
 
@@ -179,6 +185,9 @@ struct Specials {
   const uint8_t* entries;
   size_t count;
 
+  format::language::SpecialMapping entry(size_t i) const {
+    return format::language::SpecialMapping::read(entries + i * format::language::SpecialMapping::kBytes);
+  }
   /// Looks for one character (`second` 0) or a pair: the number of results stored, 0 for no mapping.
   int32_t find(uint16_t first, uint16_t second, uint16_t* result1, uint16_t* result2) const;
 };

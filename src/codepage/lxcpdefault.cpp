@@ -2,7 +2,6 @@
 // else. Payload, arrays and derived data are laid out at compile time.
 #include "codepage/lxcodepage.h"
 #include "codepage/lxunicode_tables.inc"
-#include "core/lxobjtypes.h"
 
 namespace {
 
@@ -32,11 +31,9 @@ constexpr DefaultPayload make_default_payload() {
     p.bytes[fmt::kLower + b] = static_cast<uint8_t>(upper ? b + 0x20 : b);
     lx::put_le16(p.bytes + fmt::kUnicode + 2 * b, static_cast<uint16_t>(ascii ? b : lx::kNoUnicode));
     lx::put_le32(p.bytes + fmt::kTypes + 4 * b, ascii ? lx::LX_UNICODE_Ctype1[b] : 0);
-    uint8_t* page = p.bytes + fmt::kPages + b * fmt::kPageBytes;
-    page[0] = fmt::kKindByte;
-    page[1] = b == 0 ? 0xFF : 0;
-    page[2] = b == 0 ? 0x00 : 2;
-    page[3] = b == 0 ? 0xFF : 1;
+    fmt::PageEntry page;
+    if (b == 0) page = {fmt::kKindByte, 0xFF, 0x00, 0xFF, 0, 0};
+    page.write(p.bytes + fmt::kPages + b * fmt::PageEntry::kBytes);
   }
   lx::put_le16(p.bytes + fmt::kFlags, fmt::kFlagAscii);
   return p;

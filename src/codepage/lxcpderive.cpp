@@ -4,7 +4,6 @@
 
 #include "codepage/lxcodepage.h"
 #include "core/lxmemory.h"
-#include "core/lxobjtypes.h"
 
 namespace {
 
@@ -18,7 +17,7 @@ class ReachableNodes {
  public:
   explicit ReachableNodes(lx::Bytes trie)
       : trie_(trie),
-        known_(trie.size / fmt::kNodeBytes),
+        known_(trie.size / fmt::UnicodeNode::kBytes),
         block_(static_cast<uint16_t*>(known_ != 0 ? lx::hook_allocate_zeroed(2 * known_ * sizeof(uint16_t))
                                                   : nullptr)) {
     if (!block_) return;
@@ -28,7 +27,9 @@ class ReachableNodes {
 
   bool out_of_memory() const { return known_ != 0 && !block_; }
   size_t count() const { return count_; }
-  const uint8_t* node(size_t i) const { return trie_.data + order()[i] * fmt::kNodeBytes; }
+  fmt::UnicodeNode node(size_t i) const {
+    return fmt::UnicodeNode::read(trie_.data + order()[i] * fmt::UnicodeNode::kBytes);
+  }
   /// The place in the order of the node with this index in the file.
   uint16_t place(size_t index) const { return static_cast<uint16_t>(block_.get()[index] - 1); }
 
@@ -39,9 +40,9 @@ class ReachableNodes {
     order()[count_++] = static_cast<uint16_t>(index);
     block_.get()[index] = static_cast<uint16_t>(count_);
   }
-  void add_children(const uint8_t* node) {
-    if (node[0] != 0) return;
-    for (unsigned byte = node[2]; byte <= node[3]; ++byte) add(lx::le16(node + 4) + (node[1] & byte));
+  void add_children(const fmt::UnicodeNode& node) {
+    if (node.leaf != 0) return;
+    for (unsigned byte = node.lowest; byte <= node.highest; ++byte) add(node.next(byte));
   }
 
   lx::Bytes trie_;
@@ -82,12 +83,12 @@ void fill_rows(const ReachableNodes& nodes, lx::Bytes trie, const uint8_t* paylo
                uint8_t* leaf) {
   const uint8_t* values = trie.data + lx::le16(payload + fmt::kUnicodeValues);
   for (size_t i = 0; i < nodes.count(); ++i) {
-    const uint8_t* node = nodes.node(i);
-    leaf[i] = node[0] != 0;
+    const fmt::UnicodeNode node = nodes.node(i);
+    leaf[i] = node.leaf != 0;
     uint16_t* row = rows + i * kRow;
     for (size_t b = 0; b < kRow; ++b) row[b] = leaf[i] != 0 ? lx::kNoUnicode : 0;
-    for (unsigned b = node[2]; b <= node[3]; ++b) {
-      const size_t index = lx::le16(node + 4) + (node[1] & b);
+    for (unsigned b = node.lowest; b <= node.highest; ++b) {
+      const size_t index = node.next(b);
       row[b] = leaf[i] != 0 ? lx::le16(values + 2 * index) : nodes.place(index);
     }
   }
@@ -139,20 +140,20 @@ class TypeTrie {
         records_(payload + lx::le16(payload + fmt::kTypeRecords)) {}
 
   bool has_case(uint8_t first_byte) const {
-    return nodes_[0] != 0 || has_case_under(lx::le16(nodes_ + 2) + (nodes_[1] & first_byte));
+    const fmt::TypeNode root = fmt::TypeNode::read(nodes_);
+    return root.leaf != 0 || has_case_under(root.next(first_byte));
   }
 
  private:
   // No deeper than a character has bytes.
   bool has_case_under(size_t index) const {
     constexpr uint32_t kCase = LX_C1_UPPER | LX_C1_LOWER;
-    const uint8_t* node = nodes_ + fmt::kTypeNodeBytes * index;
-    const unsigned mask = node[1];
-    for (unsigned byte = 0; byte <= mask; ++byte) {
-      if ((byte & ~mask) != 0) continue;
-      const size_t next = lx::le16(node + 2) + byte;
-      if (node[0] != 0 ? (lx::le32(records_ + fmt::kTypeRecordBytes * next) & kCase) != 0
-                       : has_case_under(next))
+    const fmt::TypeNode node = fmt::TypeNode::read(nodes_ + fmt::TypeNode::kBytes * index);
+    for (unsigned byte = 0; byte <= node.mask; ++byte) {
+      if ((byte & ~unsigned{node.mask}) != 0) continue;
+      const size_t next = node.next(byte);
+      const uint8_t* record = records_ + fmt::TypeRecord::kBytes * next;
+      if (node.leaf != 0 ? (fmt::TypeRecord::read(record).type & kCase) != 0 : has_case_under(next))
         return true;
     }
     return false;
@@ -215,26 +216,9 @@ void* derive_codepage(uint16_t id, const Sections& sections) {
 }
 
 uint32_t PageCodes::code(uint16_t u) const {
-  const uint8_t* of_page = entry(u >> 8);
+  const fmt::PageEntry page = entry(u >> 8);
   const uint8_t low_byte = static_cast<uint8_t>(u);
-  if (low_byte < of_page[2] || low_byte > of_page[3]) return payload[fmt::kSubstitution];
-  const size_t index = low_byte & of_page[1];
-  const size_t low = le16(of_page + 4) + index;
-  const size_t high = le16(of_page + 6) + index;
-  switch (of_page[0]) {
-    case fmt::kKindByte:
-      return low_array[low];
-    case fmt::kKindWord:
-      return le16(low_array + 2 * low);
-    case fmt::kKindByteWord:
-      return static_cast<uint32_t>(high_array[high]) << 16 | le16(low_array + 2 * low);
-    case fmt::kKindWordWord:
-      return static_cast<uint32_t>(le16(high_array + 2 * high)) << 16 | le16(low_array + 2 * low);
-    case fmt::kKindByteByte:
-      return static_cast<uint32_t>(high_array[high]) << 8 | low_array[low];
-    default:
-      return 0;
-  }
+  return page.maps(low_byte) ? page.code(low_byte, low_array, high_array) : payload[fmt::kSubstitution];
 }
 
 }  // namespace lx

@@ -4,13 +4,11 @@
 
 #include "codepage/lxcodepage.h"
 #include "core/lxmemory.h"
-#include "core/lxobjtypes.h"
 #include "core/lxtrace.h"
 
 namespace {
 
 namespace fmt = lx::format::codepage;
-namespace v1 = lx::format::codepage::v1;
 
 RAS1_Unit unit = RAS1_UNIT("lxcpupgrade");
 
@@ -19,38 +17,33 @@ size_t aligned(size_t bytes) {
   return (bytes + unit_bytes - 1) / unit_bytes * unit_bytes;
 }
 
+constexpr size_t kFixedBytes1 = fmt::in_version1(fmt::kFixedBytes);
+
+// What stands in one piece in both versions: up to the shift bytes, up to the types, and on to the offsets.
 struct TableMove {
-  size_t from;
   size_t to;
-  size_t bytes;
+  size_t end;
 };
-
 constexpr TableMove kFixedMoves[] = {
-    {0, 0, fmt::kPairCount + 2},  // substitution, line ends, width, pair count
-    {v1::kLengths, fmt::kLengths, 256}, {v1::kUpper, fmt::kUpper, 256},  {v1::kLower, fmt::kLower, 256},
-    {v1::kUnicode, fmt::kUnicode, 512}, {v1::kTypes, fmt::kTypes, 1024}, {v1::kPages, fmt::kPages, 2048},
-    {v1::kFlags, fmt::kFlags, 2},
-};
-
-// The offsets into the payload; each stands four bytes before its version-2 place.
-constexpr size_t kPayloadOffsets[] = {v1::kFullWidth, v1::kPairs, v1::kTypeTrie, v1::kTypeRecords};
-constexpr size_t kOffsetMove = fmt::kFixedBytes - v1::kFixedBytes;
+    {0, fmt::kShiftOut}, {fmt::kLengths, fmt::kUnicode + 2 * 256}, {fmt::kTypes, fmt::kFullWidth}};
+constexpr size_t kPayloadOffsets[] = {fmt::kFullWidth, fmt::kPairs, fmt::kTypeTrie, fmt::kTypeRecords};
 
 /// The new payload; a block of `*bytes` bytes, or null. False when an offset does not fit.
 bool upgrade_payload(lx::Bytes old, bool single_byte, uint8_t** block, size_t* bytes) {
   const size_t fixed_bytes = single_byte ? fmt::kFixedBytes : aligned(fmt::kFixedBytes);
-  *bytes = fixed_bytes + (single_byte ? 0 : old.size - v1::kFixedBytes);
+  *bytes = fixed_bytes + (single_byte ? 0 : old.size - kFixedBytes1);
   uint8_t* fresh = static_cast<uint8_t*>(lx::hook_allocate_zeroed(*bytes));
   *block = fresh;
   if (fresh == nullptr) return true;
-  for (const TableMove& move : kFixedMoves) memcpy(fresh + move.to, old.data + move.from, move.bytes);
+  for (const TableMove& move : kFixedMoves)
+    memcpy(fresh + move.to, old.data + fmt::in_version1(move.to), move.end - move.to);
   if (single_byte) return true;
-  memcpy(fresh + fixed_bytes, old.data + v1::kFixedBytes, old.size - v1::kFixedBytes);
-  for (size_t place : kPayloadOffsets) {
-    const size_t offset = lx::le16(old.data + place);
-    const size_t moved = offset != 0 ? offset + (fixed_bytes - v1::kFixedBytes) : 0;
+  memcpy(fresh + fixed_bytes, old.data + kFixedBytes1, old.size - kFixedBytes1);
+  for (size_t field : kPayloadOffsets) {
+    const size_t offset = lx::le16(old.data + fmt::in_version1(field));
+    const size_t moved = offset != 0 ? offset + (fixed_bytes - kFixedBytes1) : 0;
     if (moved > UINT16_MAX) return false;
-    lx::put_le16(fresh + place + kOffsetMove, static_cast<uint16_t>(moved));
+    lx::put_le16(fresh + field, static_cast<uint16_t>(moved));
   }
   return true;
 }
@@ -59,8 +52,8 @@ bool upgrade_payload(lx::Bytes old, bool single_byte, uint8_t** block, size_t* b
 /// payload tells how many nodes there are.
 bool upgrade_trie(lx::Bytes old, size_t old_values, uint8_t** block, size_t* bytes, size_t* values) {
   if (old_values > old.size) return false;
-  const size_t nodes = old_values / v1::kNodeBytes;
-  *values = aligned(nodes * fmt::kNodeBytes);
+  const size_t nodes = old_values / fmt::TypeNode::kBytes;
+  *values = aligned(nodes * fmt::UnicodeNode::kBytes);
   if (*values > UINT16_MAX) return false;
   const size_t value_bytes = old.size - old_values;
   *bytes = *values + value_bytes;
@@ -68,12 +61,9 @@ bool upgrade_trie(lx::Bytes old, size_t old_values, uint8_t** block, size_t* byt
   *block = fresh;
   if (fresh == nullptr) return true;
   for (size_t i = 0; i < nodes; ++i) {
-    const uint8_t* from = old.data + i * v1::kNodeBytes;
-    uint8_t* to = fresh + i * fmt::kNodeBytes;
-    memcpy(to, from, 2);
-    to[2] = 0x00;
-    to[3] = 0xFF;
-    memcpy(to + 4, from + 2, 2);
+    const auto node = fmt::TypeNode::read(old.data + i * fmt::TypeNode::kBytes);
+    const fmt::UnicodeNode ranged{node.leaf, node.mask, node.lowest, node.highest, node.base};
+    ranged.write(fresh + i * fmt::UnicodeNode::kBytes);
   }
   if (value_bytes != 0) memcpy(fresh + *values, old.data + old_values, value_bytes);
   return true;
@@ -85,7 +75,7 @@ namespace lx {
 
 int32_t upgrade_codepage(const Sections& version1, Sections* upgraded) {
   const Bytes old = version1.section[0];
-  if (!old.holds(0, v1::kFixedBytes)) return LX_E_CORRUPT;
+  if (!old.holds(0, kFixedBytes1)) return LX_E_CORRUPT;
   const bool single_byte = old.data[fmt::kWidth] < 2;
   *upgraded = version1;
 
@@ -98,7 +88,8 @@ int32_t upgrade_codepage(const Sections& version1, Sections* upgraded) {
   upgraded->section[0] = {payload.get(), bytes};
   if (!single_byte) {
     size_t values = 0;
-    if (!upgrade_trie(version1.section[1], le16(old.data + v1::kUnicodeValues), &block, &bytes, &values))
+    if (!upgrade_trie(version1.section[1], le16(old.data + fmt::in_version1(fmt::kUnicodeValues)), &block,
+                      &bytes, &values))
       return LX_E_CORRUPT;
     if (block == nullptr) return LX_E_MEMORY;
     put_le16(payload.get() + fmt::kUnicodeValues, static_cast<uint16_t>(values));

@@ -4,7 +4,6 @@
 // refused.
 #include "codepage/lxcodepage.h"
 #include "core/lxmemory.h"
-#include "core/lxobjtypes.h"
 
 namespace {
 
@@ -17,30 +16,32 @@ constexpr uint8_t kWrittenAscii[] = {0x00, 0x20, 0x28, 0x29, 0x2B, 0x2D, 0x30, 0
                                      0x32, 0x33, 0x34, 0x35, 0x36, 0x37, 0x38, 0x39};
 constexpr uint8_t kWrittenEbcdic[] = {0x00, 0x40, 0x4D, 0x5D, 0x4E, 0x60, 0xF0, 0xF1,
                                       0xF2, 0xF3, 0xF4, 0xF5, 0xF6, 0xF7, 0xF8, 0xF9};
-constexpr size_t kLineEndBytes = 4;
 
-/// One trie of a codepage: the nodes of the type trie have no byte range, so theirs is all bytes.
+/// One trie of a codepage, and what to say when it leads outside.
+template <class NodeType>
 struct Trie {
-  lx::Bytes nodes;    // from the root to the end of the section
-  size_t node_bytes;  // fmt::kNodeBytes or fmt::kTypeNodeBytes
+  using Node = NodeType;
+  size_t section;
+  size_t start;       // of the root in the section
+  lx::Bytes nodes;    // from there to the end of the section
   lx::Bytes entries;  // what leaves index
   size_t entry_bytes;
+  const char* no_node;
+  const char* no_entry;
+  const char* too_long;
 
-  bool ranged() const { return node_bytes == fmt::kNodeBytes; }
-  bool has_node(size_t index) const { return nodes.holds(index * node_bytes, node_bytes); }
-  const uint8_t* node(size_t index) const { return nodes.data + index * node_bytes; }
-  bool leaf(const uint8_t* node) const { return node[0] != 0; }
-  unsigned lowest(const uint8_t* node) const { return ranged() ? node[2] : 0; }
-  unsigned highest(const uint8_t* node) const { return ranged() ? node[3] : kAnyByte - 1; }
-  size_t target(const uint8_t* node, unsigned byte) const {
-    return lx::le16(node + node_bytes - 2) + (node[1] & byte);
-  }
+  bool has_node(size_t index) const { return nodes.holds(index * Node::kBytes, Node::kBytes); }
+  Node node(size_t index) const { return Node::read(nodes.data + index * Node::kBytes); }
+  bool has_entry(size_t index) const { return entries.holds(index * entry_bytes, entry_bytes); }
 };
 
 /// Measures how many bytes a walk from each node takes.
+template <class Trie>
 class TrieCheck {
+  using Node = typename Trie::Node;
+
  public:
-  explicit TrieCheck(const Trie& trie) : trie_(trie), known_(trie.nodes.size / trie.node_bytes) {
+  explicit TrieCheck(const Trie& trie) : trie_(trie), known_(trie.nodes.size / Node::kBytes) {
     if (known_ != 0) heights_ = static_cast<uint8_t*>(lx::hook_allocate_zeroed(known_));
   }
   ~TrieCheck() { lx::hook_free(heights_); }
@@ -49,35 +50,39 @@ class TrieCheck {
 
   bool out_of_memory() const { return known_ != 0 && heights_ == nullptr; }
 
-  /// The most bytes that a walk from the root takes when it begins with `byte`; 0 when one leaves the section
-  /// or takes more than `limit`.
-  size_t walk_bytes(unsigned byte, size_t limit) {
-    if (!trie_.has_node(0)) return 0;
-    const uint8_t* root = trie_.node(0);
-    if (byte < trie_.lowest(root) || byte > trie_.highest(root)) return 1;
-    if (trie_.leaf(root)) return entry_exists(root, byte) ? 1 : 0;
-    if (limit < 2) return 0;
-    const size_t rest = height(trie_.target(root, byte), limit - 1);
-    return rest == 0 || rest + 1 > limit ? 0 : rest + 1;
+  /// Whether every walk from the root that begins with `byte` stays in the section and takes at most `limit`
+  /// bytes; else fault() says why.
+  bool check(unsigned byte, size_t limit) {
+    if (!trie_.has_node(0)) return refuse(trie_.no_node, 0);
+    const Node root = trie_.node(0);
+    if (byte < root.lowest || byte > root.highest) return true;
+    if (root.leaf != 0) return trie_.has_entry(root.next(byte)) || refuse(trie_.no_entry, 0);
+    if (limit < 2) return refuse(trie_.too_long, 0);
+    const size_t rest = height(root.next(byte), limit - 1, 0);
+    return rest != 0 && (rest + 1 <= limit || refuse(trie_.too_long, 0));
   }
+  const lx::Fault& fault() const { return fault_; }
 
  private:
-  bool entry_exists(const uint8_t* node, unsigned byte) const {
-    return trie_.entries.holds(trie_.target(node, byte) * trie_.entry_bytes, trie_.entry_bytes);
+  bool refuse(const char* reason, size_t index) {
+    fault_ = lx::corrupt(reason, trie_.start + index * Node::kBytes, trie_.section);
+    return false;
   }
 
-  /// As walk_bytes, from any node. Heights are kept, so each node is looked at once.
-  size_t height(size_t index, size_t limit) {
-    if (limit == 0 || !trie_.has_node(index)) return 0;
+  /// The most bytes that a walk from a node takes; 0 when one leaves the section or cannot end within `limit`.
+  /// Heights are kept, so each node is looked at once.
+  size_t height(size_t index, size_t limit, size_t parent) {
+    if (limit == 0) return refuse(trie_.too_long, parent);
+    if (!trie_.has_node(index)) return refuse(trie_.no_node, parent);
     if (heights_[index] != 0) return heights_[index];
-    const uint8_t* node = trie_.node(index);
+    const Node node = trie_.node(index);
     size_t tallest = 1;
-    for (unsigned byte = trie_.lowest(node); byte <= trie_.highest(node); ++byte) {
-      if (trie_.leaf(node)) {
-        if (!entry_exists(node, byte)) return 0;
+    for (unsigned byte = node.lowest; byte <= node.highest; ++byte) {
+      if (node.leaf != 0) {
+        if (!trie_.has_entry(node.next(byte))) return refuse(trie_.no_entry, index);
         continue;
       }
-      const size_t rest = height(trie_.target(node, byte), limit - 1);
+      const size_t rest = height(node.next(byte), limit - 1, index);
       if (rest == 0) return 0;
       if (rest + 1 > tallest) tallest = rest + 1;
     }
@@ -89,6 +94,7 @@ class TrieCheck {
   const Trie& trie_;
   size_t known_;
   uint8_t* heights_ = nullptr;  // by node; 0: not measured
+  lx::Fault fault_;
 };
 
 class Validator {
@@ -96,16 +102,18 @@ class Validator {
   Validator(uint16_t id, const lx::Sections& sections)
       : sections_(sections), payload_(sections.section[0]), utf8_(id == fmt::kUtf8Id) {}
 
-  int32_t run() {
-    if (!payload_.holds(0, fmt::kFixedBytes)) return LX_E_CORRUPT;
+  lx::Fault run() {
+    if (!payload_.holds(0, fmt::kFixedBytes))
+      return lx::corrupt("the payload is shorter than its fixed part", 0);
     width_ = payload_.data[fmt::kWidth];
     shift_ = (word(fmt::kFlags) & fmt::kFlagShift) != 0 && width_ > 1;  // else no state differs
-    if (!lengths_fit() || !width_tables_fit() || !written_bytes_fit()) return LX_E_CORRUPT;
-    if (utf8_ ? !formula_fits() : !pages_fit() || !codes_fit()) return LX_E_CORRUPT;
-    if (width_ == 1) return LX_OK;
-    const int32_t rc = check_trie(type_trie());
-    if (rc != LX_OK || utf8_) return rc;
-    return check_trie(unicode_trie());
+    if (const lx::Fault fault = check_lengths()) return fault;
+    if (const lx::Fault fault = check_width_tables()) return fault;
+    if (const lx::Fault fault = check_written_bytes()) return fault;
+    if (const lx::Fault fault = utf8_ ? check_formula() : check_pages()) return fault;
+    if (width_ == 1) return {};
+    if (const lx::Fault fault = check_trie(type_trie())) return fault;
+    return utf8_ ? lx::Fault{} : check_trie(unicode_trie());
   }
 
  private:
@@ -116,104 +124,115 @@ class Validator {
   }
 
   /// Lengths are 1 to the width; where UTF-8 is computed, as long as the bytes that the formula reads.
-  bool lengths_fit() const {
-    if (width_ < 1 || width_ > lx::kMaxCharBytes) return false;
+  lx::Fault check_lengths() const {
+    if (width_ < 1 || width_ > lx::kMaxCharBytes) return lx::corrupt("the width is not 1 to 4", fmt::kWidth);
     for (unsigned byte = 0; byte < kAnyByte; ++byte) {
-      if (length(byte) < 1 || length(byte) > width_) return false;
-      if (utf8_ && length(byte) == 2 && byte > 0xDF) return false;
+      if (length(byte) < 1 || length(byte) > width_)
+        return lx::corrupt("the length of a byte is not 1 to the width", fmt::kLengths + byte);
+      if (utf8_ && length(byte) == 2 && byte > 0xDF)
+        return lx::corrupt("the length of a byte is 2 where UTF-8 reads 3 bytes", fmt::kLengths + byte);
     }
-    return true;
+    return {};
   }
 
-  bool width_tables_fit() const {
-    return payload_.holds(word(fmt::kFullWidth), fmt::kFullWidthBytes) &&
-           payload_.holds(word(fmt::kPairs), word(fmt::kPairCount) * fmt::kPairBytes);
+  lx::Fault check_width_tables() const {
+    if (!payload_.holds(word(fmt::kFullWidth), fmt::kFullWidthBytes))
+      return lx::corrupt("the full-width table lies outside the payload", fmt::kFullWidth);
+    if (!payload_.holds(word(fmt::kPairs), word(fmt::kPairCount) * fmt::WidthPair::kBytes))
+      return lx::corrupt("the width pairs lie outside the payload", fmt::kPairs);
+    return {};
   }
 
   /// Whether a byte that the library writes as a character is one.
   bool single(unsigned byte) const { return length(byte) == 1 && !is_shift(byte); }
-  bool all_single(const uint8_t* bytes, size_t count) const {
-    for (size_t i = 0; i < count; ++i)
-      if (!single(bytes[i])) return false;
-    return true;
-  }
 
-  bool written_bytes_fit() const {
+  lx::Fault check_written_bytes() const {
+    if (word(fmt::kUnicode) != 0) return lx::corrupt("the byte 00 is not U+0000", fmt::kUnicode);
     const bool ascii = (word(fmt::kFlags) & fmt::kFlagAscii) != 0;
-    return word(fmt::kUnicode) == 0 &&
-           all_single(ascii ? kWrittenAscii : kWrittenEbcdic, sizeof(kWrittenAscii)) &&
-           all_single(payload_.data + fmt::kLineEnds, kLineEndBytes) &&
-           single(payload_.data[fmt::kSubstitution]);
+    for (uint8_t byte : ascii ? kWrittenAscii : kWrittenEbcdic)
+      if (!single(byte))
+        return lx::corrupt("a null, blank, digit or sign is no character of one byte", fmt::kLengths + byte);
+    for (size_t i = 0; i < fmt::kLineEndBytes; ++i)
+      if (!single(payload_.data[fmt::kLineEnds + i]))
+        return lx::corrupt("a line end is no character of one byte", fmt::kLineEnds + i);
+    if (!single(payload_.data[fmt::kSubstitution]))
+      return lx::corrupt("the substitution is no character of one byte", fmt::kSubstitution);
+    return {};
   }
 
   /// Where UTF-8 is computed: what the formula writes has the lengths of the codepage, which has no states.
-  bool formula_fits() const {
-    if (shift_) return false;
+  lx::Fault check_formula() const {
+    if (shift_) return lx::corrupt("UTF-8 has shift states", fmt::kFlags);
     for (uint32_t u = 0; u <= UINT16_MAX; u += u < 0x800 ? 1 : 0x1000) {
       uint8_t bytes[lx::kMaxCharBytes];
       const size_t count = lx::utf8_bytes(static_cast<uint16_t>(u));
       lx::store_utf8(bytes, static_cast<uint16_t>(u), count);
-      if (length(bytes[0]) != count) return false;
+      if (length(bytes[0]) != count)
+        return lx::corrupt("the length of a byte is not what UTF-8 writes", fmt::kLengths + bytes[0]);
     }
-    return true;
+    return {};
   }
 
-  /// Codes are no longer than the width says, and U+0000 is the null.
-  bool codes_fit() const {
+  /// Pages stay in their arrays, codes are no longer than the width says, and U+0000 is the null.
+  lx::Fault check_pages() const {
     const lx::PageCodes pages{payload_.data, sections_.section[2].data, sections_.section[3].data};
-    if (pages.code(0) != 0) return false;
-    for (unsigned page = 0; page < kAnyByte; ++page) {
-      for (unsigned low = pages.entry(page)[2]; low <= pages.entry(page)[3]; ++low) {
-        const uint32_t code = lx::without_zero_bytes(pages.code(static_cast<uint16_t>(page << 8 | low)));
-        if (lx::code_bytes(code) > width_) return false;
+    for (size_t number = 0; number < kAnyByte; ++number) {
+      const fmt::PageEntry page = pages.entry(number);
+      const size_t place = fmt::kPages + number * fmt::PageEntry::kBytes;
+      for (unsigned byte = page.lowest; byte <= page.highest; ++byte) {
+        if (!holds_element(2, page.low + (byte & page.mask), page.low_bytes()))
+          return lx::corrupt("a page leads outside the low array", place);
+        if (!holds_element(3, page.high + (byte & page.mask), page.high_bytes()))
+          return lx::corrupt("a page leads outside the high array", place);
+        const uint32_t code = page.code(byte, pages.low_array, pages.high_array);
+        if (lx::code_bytes(lx::without_zero_bytes(code)) > width_)
+          return lx::corrupt("a page has a code that is longer than the width", place);
       }
     }
-    return true;
+    if (pages.code(0) != 0) return lx::corrupt("U+0000 is not the byte 00", fmt::kPages);
+    return {};
   }
-
-  bool pages_fit() const {
-    for (size_t page = 0; page < kAnyByte; ++page)
-      if (!page_fits(payload_.data + fmt::kPages + page * fmt::kPageBytes)) return false;
-    return true;
-  }
-
-  bool page_fits(const uint8_t* entry) const {
-    const size_t low_width = entry[0] == fmt::kKindByte || entry[0] == fmt::kKindByteByte ? 1 : 2;
-    const size_t high_width = entry[0] == fmt::kKindWordWord                                     ? 2
-                              : entry[0] == fmt::kKindByteWord || entry[0] == fmt::kKindByteByte ? 1
-                                                                                                 : 0;
-    if (entry[0] > fmt::kKindByteByte) return true;
-    for (unsigned byte = entry[2]; byte <= entry[3]; ++byte) {
-      const size_t index = byte & entry[1];
-      if (!sections_.section[2].holds((lx::le16(entry + 4) + index) * low_width, low_width)) return false;
-      if (high_width != 0 &&
-          !sections_.section[3].holds((lx::le16(entry + 6) + index) * high_width, high_width))
-        return false;
-    }
-    return true;
+  bool holds_element(size_t section, size_t index, size_t bytes) const {
+    return bytes == 0 || sections_.section[section].holds(index * bytes, bytes);
   }
 
   lx::Bytes rest_of(lx::Bytes section, size_t offset) const {
     return offset <= section.size ? lx::Bytes{section.data + offset, section.size - offset} : lx::Bytes{};
   }
-  Trie type_trie() const {
-    return {rest_of(payload_, word(fmt::kTypeTrie)), fmt::kTypeNodeBytes,
-            rest_of(payload_, word(fmt::kTypeRecords)), fmt::kTypeRecordBytes};
+  Trie<fmt::TypeNode> type_trie() const {
+    const size_t start = word(fmt::kTypeTrie);
+    return {0,
+            start,
+            rest_of(payload_, start),
+            rest_of(payload_, word(fmt::kTypeRecords)),
+            fmt::TypeRecord::kBytes,
+            "the type trie leads to a node outside the payload",
+            "the type trie leads to a record outside the payload",
+            "the type trie has a walk that is longer than its character"};
   }
-  Trie unicode_trie() const {
-    return {sections_.section[1], fmt::kNodeBytes, rest_of(sections_.section[1], word(fmt::kUnicodeValues)), 2};
+  Trie<fmt::UnicodeNode> unicode_trie() const {
+    const lx::Bytes section = sections_.section[1];
+    return {1,
+            0,
+            section,
+            rest_of(section, word(fmt::kUnicodeValues)),
+            sizeof(uint16_t),
+            "the Unicode trie leads to a node outside its section",
+            "the Unicode trie leads to a value outside its section",
+            "the Unicode trie has a walk that is longer than its character"};
   }
 
   /// A walk may take as many bytes as the character that begins with its first byte has. One-byte characters
   /// are walked in the double-byte state only, where they begin one of the width.
-  int32_t check_trie(const Trie& trie) const {
-    TrieCheck check(trie);
-    if (check.out_of_memory()) return LX_E_MEMORY;
+  template <class Node>
+  lx::Fault check_trie(const Trie<Node>& trie) const {
+    TrieCheck<Trie<Node>> check(trie);
+    if (check.out_of_memory()) return {LX_E_MEMORY};
     for (unsigned byte = 0; byte < kAnyByte; ++byte) {
       const size_t limit = length(byte) < 2 ? width_ : length(byte);
-      if (check.walk_bytes(byte, limit) == 0) return LX_E_CORRUPT;
+      if (!check.check(byte, limit)) return check.fault();
     }
-    return LX_OK;
+    return {};
   }
 
   const lx::Sections& sections_;
@@ -223,12 +242,14 @@ class Validator {
   uint8_t width_ = 0;
 };
 
+lx::Fault validate_codepage(uint16_t id, const lx::Sections& sections) {
+  return Validator(id, sections).run();
+}
+
 }  // namespace
 
 namespace lx {
 
-int32_t validate_codepage(uint16_t id, const Sections& sections) {
-  return Validator(id, sections).run();
-}
+const ObjectType kCodepageType{validate_codepage, derive_codepage, upgrade_codepage, &kBuiltInCodepage};
 
 }  // namespace lx

@@ -76,7 +76,9 @@ uint16_t ascii_digit(uint16_t u) {
 
 /// A packed code in the other case, when its type record has a bit of the mask; else the code.
 uint32_t other_case(const uint8_t* record, uint32_t code, uint32_t mask) {
-  return record != nullptr && (lx::le32(record) & mask) != 0 ? code + lx::le32(record + 4) : code;
+  if (record == nullptr) return code;
+  const auto type = lx::format::codepage::TypeRecord::read(record);
+  return (type.type & mask) != 0 ? code + type.case_delta : code;
 }
 
 // Mappers: what one character maps to by itself. alone() is false when it stays as it is.
@@ -127,8 +129,10 @@ struct CodepageMapper {
       }
       if (cp.caseless[*c.p] != 0) return false;
       const uint8_t* record = lx::type_record(cp, c.p);  // none where the codepage has no such codes
-      if (record == nullptr || (lx::le32(record) & mask) == 0) return false;
-      *mapped = lx::pack(c.p, c.length) + lx::le32(record + 4);
+      if (record == nullptr) return false;
+      const auto type = lx::format::codepage::TypeRecord::read(record);
+      if ((type.type & mask) == 0) return false;
+      *mapped = lx::pack(c.p, c.length) + type.case_delta;
       return true;
     } else if constexpr (kKind == Kind::kFullWidth) {
       *mapped = c.length == 1 ? widths.full_of_byte(*c.p) : widths.to_full(lx::pack(c.p, c.length));

@@ -14,9 +14,8 @@ class SpecialFilter {
  public:
   SpecialFilter(const LXObject& language, bool used, bool upper)
       : specials_(used ? specials_of(language, upper) : Specials{nullptr, 0}) {
-    const uint8_t* entry = specials_.entries;
-    for (size_t i = 0; i < specials_.count; ++i, entry += format::language::kSpecialBytes) {
-      const unsigned slot = slot_of(le16(entry));
+    for (size_t i = 0; i < specials_.count; ++i) {
+      const unsigned slot = slot_of(specials_.entry(i).first);
       bits_[slot / 32] |= 1u << slot % 32;
     }
   }

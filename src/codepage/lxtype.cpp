@@ -12,15 +12,19 @@ using lx::Primitive;
 uint32_t type_field(const Primitive& in, uint32_t word, uint32_t selector) {
   switch (selector) {
     case LX_CTYPE1:
-      return word & 0x3FF;
+      return fmt::type1_of(word);
     case LX_CTYPE2:
-      return (word & 0x3FFC00) >> 10;
+      return fmt::type2_of(word);
     case LX_CTYPE3:
-      return word >> 22;
+      return fmt::type3_of(word);
     default:
       in.fail(LX_E_INVALID);
-      return word & 0x3FF;
+      return fmt::type1_of(word);
   }
+}
+
+uint32_t type_of(const uint8_t* record) {
+  return fmt::TypeRecord::read(record).type;
 }
 
 }  // namespace
@@ -29,11 +33,10 @@ namespace lx {
 
 const uint8_t* type_record(const Codepage& cp, const uint8_t* p) {
   if (cp.single_byte) return nullptr;
-  const uint8_t* root = cp.payload + le16(cp.payload + fmt::kTypeTrie);
-  const uint8_t* node = root;
-  while (node[0] == 0) node = root + fmt::kTypeNodeBytes * (le16(node + 2) + (node[1] & *p++));
-  const size_t index = le16(node + 2) + (node[1] & *p);
-  return cp.payload + le16(cp.payload + fmt::kTypeRecords) + fmt::kTypeRecordBytes * index;
+  const uint8_t* nodes = cp.payload + le16(cp.payload + fmt::kTypeTrie);
+  fmt::TypeNode node = fmt::TypeNode::read(nodes);
+  while (node.leaf == 0) node = fmt::TypeNode::read(nodes + fmt::TypeNode::kBytes * node.next(*p++));
+  return cp.payload + le16(cp.payload + fmt::kTypeRecords) + fmt::TypeRecord::kBytes * node.next(*p);
 }
 
 const uint8_t* type_record_of_code(const Codepage& cp, uint32_t code) {
@@ -52,12 +55,12 @@ Specials specials_of(const LXObject& language, bool upper) {
 }
 
 int32_t Specials::find(uint16_t first, uint16_t second, uint16_t* result1, uint16_t* result2) const {
-  const uint8_t* entry = entries;
-  for (size_t i = 0; i < count; ++i, entry += format::language::kSpecialBytes) {
-    if (le16(entry) != first || le16(entry + 2) != second) continue;
-    *result1 = le16(entry + 4);
-    *result2 = le16(entry + 6);
-    return *result2 == 0 ? 1 : 2;
+  for (size_t i = 0; i < count; ++i) {
+    const format::language::SpecialMapping mapping = entry(i);
+    if (mapping.first != first || mapping.second != second) continue;
+    *result1 = mapping.result1;
+    *result2 = mapping.result2;
+    return mapping.result2 == 0 ? 1 : 2;
   }
   return 0;
 }
@@ -71,7 +74,7 @@ uint32_t LXGetCharType(LXLocale* locale, const char* text, uint32_t selector) {
   if (!in) return 0;
   const uint8_t* p = bytes_of(text);
   const bool single = in.single_byte() || in.cp().length(*p) == 1;
-  return type_field(in, single ? in.cp().type(*p) : lx::le32(lx::type_record(in.cp(), p)), selector);
+  return type_field(in, single ? in.cp().type(*p) : type_of(lx::type_record(in.cp(), p)), selector);
 }
 
 uint32_t LXGetCharTypeW(LXLocale* locale, LXWChar code, uint32_t selector) {
@@ -79,7 +82,7 @@ uint32_t LXGetCharTypeW(LXLocale* locale, LXWChar code, uint32_t selector) {
   if (!in) return 0;
   const bool single = in.single_byte() || code <= 0xFF;
   return type_field(
-      in, single ? in.cp().type(static_cast<uint8_t>(code)) : lx::le32(lx::type_record_of_code(in.cp(), code)),
+      in, single ? in.cp().type(static_cast<uint8_t>(code)) : type_of(lx::type_record_of_code(in.cp(), code)),
       selector);
 }
 
@@ -95,7 +98,7 @@ uint32_t LXGetCharTypeEx(LXLocale* locale, const char* text, LXShiftState state,
   const uint8_t* p = bytes_of(text);
   lx::take_shift(in.cp(), &p, &state);
   const bool single = state != LX_SHIFT_DOUBLE;
-  return type_field(in, single ? in.cp().type(*p) : lx::le32(lx::type_record(in.cp(), p)), selector);
+  return type_field(in, single ? in.cp().type(*p) : type_of(lx::type_record(in.cp(), p)), selector);
 }
 
 const uint8_t* LXGetMbCtype(const LXObject* codepage, const char* text) {

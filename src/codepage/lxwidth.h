@@ -9,8 +9,8 @@
 namespace lx {
 
 struct WidthTables {
-  const uint8_t* full;   // by single byte; null: the codepage has none
-  const uint8_t* pairs;  // half-width code, full-width code
+  const uint8_t* full;  // by single byte; null: the codepage has none
+  const uint8_t* pairs;
   size_t pair_count;
 
   explicit WidthTables(const Codepage& cp)
@@ -18,8 +18,10 @@ struct WidthTables {
         pairs(table(cp, format::codepage::kPairs)),
         pair_count(pairs != nullptr ? le16(cp.payload + format::codepage::kPairCount) : 0) {}
 
-  uint32_t half_of_pair(size_t i) const { return le32(pairs + format::codepage::kPairBytes * i); }
-  uint32_t full_of_pair(size_t i) const { return le32(pairs + format::codepage::kPairBytes * i + 4); }
+  format::codepage::WidthPair pair(size_t i) const {
+    using format::codepage::WidthPair;
+    return WidthPair::read(pairs + WidthPair::kBytes * i);
+  }
   uint32_t full_of_byte(size_t byte) const { return full != nullptr ? le32(full + 4 * byte) : 0; }
 
   uint32_t to_full(uint32_t half) const {
@@ -27,8 +29,8 @@ struct WidthTables {
     size_t high = pair_count;
     while (low < high) {
       const size_t middle = low + (high - low) / 2;
-      if (half_of_pair(middle) == half) return full_of_pair(middle);
-      if (half_of_pair(middle) < half)
+      if (pair(middle).half == half) return pair(middle).full;
+      if (pair(middle).half < half)
         low = middle + 1;
       else
         high = middle;
@@ -41,7 +43,7 @@ struct WidthTables {
     for (size_t byte = 0; full != nullptr && byte < 256; ++byte)
       if (full_of_byte(byte) == code) return static_cast<uint32_t>(byte);
     for (size_t i = 0; i < pair_count; ++i)
-      if (full_of_pair(i) == code) return half_of_pair(i);
+      if (pair(i).full == code) return pair(i).half;
     return 0;
   }
 
@@ -74,7 +76,7 @@ class HalfWidthIndex {
     if (!used_ || code == 0) return tables_.to_half(code);
     for (size_t at = heads_[code % kChains]; at != 0; at = next_[at - 1])
       if (full_of(at - 1) == code)
-        return at <= 256 ? static_cast<uint32_t>(at - 1) : tables_.half_of_pair(at - 257);
+        return at <= 256 ? static_cast<uint32_t>(at - 1) : tables_.pair(at - 257).half;
     return 0;
   }
 
@@ -82,7 +84,7 @@ class HalfWidthIndex {
   static constexpr size_t kChains = 251;
   static constexpr size_t kMostEntries = 1024;
   uint32_t full_of(size_t entry) const {
-    return entry < 256 ? tables_.full_of_byte(entry) : tables_.full_of_pair(entry - 256);
+    return entry < 256 ? tables_.full_of_byte(entry) : tables_.pair(entry - 256).full;
   }
   const WidthTables& tables_;
   bool used_;

@@ -4,7 +4,6 @@
 #include <cstring>
 
 #include "core/lxmemory.h"
-#include "core/lxobjtypes.h"
 
 namespace {
 
@@ -18,34 +17,31 @@ using lx::Sort;
 constexpr size_t kPages = 256;
 constexpr size_t kPageElements = 256;
 
-const uint8_t* page_at(const uint8_t* payload, size_t page) {
-  return payload + fmt::kPages + fmt::kPageBytes * page;
+fmt::Page page_at(const uint8_t* payload, size_t page) {
+  return fmt::Page::read(payload + fmt::kPages + fmt::Page::kBytes * page);
 }
-bool is_table(uint8_t flags) {
-  return (flags & (fmt::kPageUncovered | fmt::kPagePrimary | fmt::kPageSpecial)) == 0;
+fmt::WeightRecord table_record(const uint8_t* payload, LXUChar u) {
+  const size_t number = page_at(payload, u >> 8).base + (u & 0xFFu);
+  return fmt::WeightRecord::read(payload + le16(payload + fmt::kWeights) + fmt::WeightRecord::kBytes * number);
 }
-
-/// A weight of a table or contraction record.
-Element element_of(const uint8_t* record, unsigned sets = 1) {
-  const uint16_t flags = le16(record + 4);
-  const bool special = (flags & fmt::kWeightSpecial) != 0;
-  const LXWeights weights =
-      special ? LXWeights{0, 0, 0, le16(record)} : LXWeights{le16(record), record[2], record[3], 0};
-  return Element(weights, sets, (flags & fmt::kWeightClass) >> fmt::kWeightClassShift);
+fmt::Expansion expansion_at(const uint8_t* payload, size_t i) {
+  return fmt::Expansion::read(payload + le16(payload + fmt::kExpansions) + fmt::Expansion::kBytes * i);
+}
+fmt::Contraction contraction_at(const uint8_t* payload, size_t i) {
+  return fmt::Contraction::read(payload + le16(payload + fmt::kContractions) + fmt::Contraction::kBytes * i);
 }
 
-const uint8_t* table_record(const uint8_t* payload, LXUChar u) {
-  const size_t base = le16(page_at(payload, u >> 8) + 2);
-  return payload + le16(payload + fmt::kWeights) + fmt::kWeightBytes * (base + (u & 0xFFu));
-}
-bool is_expansion(const uint8_t* record) {
-  return (le16(record + 4) & fmt::kWeightExpansion) != 0;
+Element element_of(const fmt::WeightRecord& record) {
+  const LXWeights weights = record.is_special()
+                                ? LXWeights{0, 0, 0, record.weight}
+                                : LXWeights{record.weight, record.secondary, record.tertiary, 0};
+  return Element(weights, 1, record.char_class());
 }
 
 /// An expansion has no weights until its record is found.
 Element table_element(const uint8_t* payload, LXUChar u) {
-  const uint8_t* record = table_record(payload, u);
-  return is_expansion(record) ? Element() : element_of(record);
+  const fmt::WeightRecord record = table_record(payload, u);
+  return record.is_expansion() ? Element() : element_of(record);
 }
 
 /// Notes what an element of one set inserts. Only weights that it has count.
@@ -66,10 +62,9 @@ void note_insertion(Sort* sort, const Element& element) {
 
 /// The pages that are laid flat: those of the weight table, and those where a pair begins.
 size_t flat_pages(const uint8_t* payload, bool (&flat)[kPages]) {
-  for (size_t page = 0; page < kPages; ++page) flat[page] = is_table(page_at(payload, page)[0]);
-  const uint8_t* record = payload + le16(payload + fmt::kContractions);
+  for (size_t page = 0; page < kPages; ++page) flat[page] = page_at(payload, page).is_table();
   const size_t count = le16(payload + fmt::kContractionCount);
-  for (size_t i = 0; i < count; ++i, record += fmt::kContractionBytes) flat[le16(record) >> 8] = true;
+  for (size_t i = 0; i < count; ++i) flat[contraction_at(payload, i).first >> 8] = true;
   size_t pages = 0;
   for (bool is_flat : flat) pages += is_flat;
   return pages;
@@ -82,10 +77,10 @@ Element& flat_element(const Sort& sort, LXUChar u) {
 void fill_pages(Sort* sort, Element* elements, const bool (&flat)[kPages]) {
   const uint8_t* payload = sort->payload;
   for (size_t number = 0; number < kPages; ++number) {
-    const uint8_t* entry = page_at(payload, number);
+    const fmt::Page record = page_at(payload, number);
     Sort::Page& page = sort->pages[number];
-    page = {nullptr, entry[0], entry[1], le16(entry + 2)};
-    const bool computed = !is_table(page.flags);
+    page = {nullptr, record.flags, record.char_class, record.base};
+    const bool computed = !record.is_table();
     // Of a whole page some character has a weight, whatever its base.
     if (computed) note_insertion(sort, Sort::computed(page, 0));
     if (computed) note_insertion(sort, Sort::computed(page, 1));
@@ -104,9 +99,10 @@ void fill_expansions(Sort* sort) {
   const uint8_t* payload = sort->payload;
   // From the back: of several records of a character the first counts.
   for (size_t i = le16(payload + fmt::kExpansionCount); i-- > 0;) {
-    const LXUChar u = le16(sort->expansions + fmt::kExpansionBytes * i);
-    if (!is_table(sort->pages[u >> 8].flags) || !is_expansion(table_record(payload, u))) continue;
-    const Element pointing = element_of(table_record(payload, u));
+    const LXUChar u = expansion_at(payload, i).character;
+    if (!page_at(payload, u >> 8).is_table()) continue;
+    const fmt::WeightRecord pointing = table_record(payload, u);
+    if (!pointing.is_expansion()) continue;
     const Element element({0, 0, 0, static_cast<uint16_t>(i)}, 2, pointing.char_class());
     flat_element(*sort, u) = element;
     note_insertion(sort, element);
@@ -128,21 +124,19 @@ size_t place_of(const Pair* pairs, size_t count, uint32_t characters) {
 }
 
 void fill_pairs(Sort* sort, Pair* pairs) {
-  const uint8_t* record = sort->payload + le16(sort->payload + fmt::kContractions);
   const size_t count = le16(sort->payload + fmt::kContractionCount);
   sort->pairs = pairs;
-  for (size_t i = 0; i < count; ++i, record += fmt::kContractionBytes) {
-    const LXUChar first = le16(record);
-    const LXUChar second = le16(record + 2);
-    const uint32_t characters = static_cast<uint32_t>(first) << 16 | second;
+  for (size_t i = 0; i < count; ++i) {
+    const fmt::Contraction record = contraction_at(sort->payload, i);
+    const uint32_t characters = static_cast<uint32_t>(record.first) << 16 | record.second;
     const size_t place = place_of(pairs, sort->pair_count, characters);
     if (place < sort->pair_count && pairs[place].characters == characters) continue;  // the first counts
     memmove(pairs + place + 1, pairs + place, (sort->pair_count - place) * sizeof(Pair));
-    pairs[place] = {characters, element_of(record + 4)};
+    pairs[place] = {characters, element_of(record.weights)};
     ++sort->pair_count;
     note_insertion(sort, pairs[place].element);
-    flat_element(*sort, first).set_starts_pair();
-    sort->second_bits[(second & 0xFF) / 32] |= 1u << second % 32;
+    flat_element(*sort, record.first).set_starts_pair();
+    sort->second_bits[(record.second & 0xFF) / 32] |= 1u << record.second % 32;
   }
 }
 
@@ -182,34 +176,33 @@ void fill_deciding(Sort* sort) {
   }
 }
 
-}  // namespace
-
-namespace lx {
-
-int32_t validate_sort(Bytes bytes) {
-  if (!bytes.holds(0, fmt::kFixedBytes)) return LX_E_CORRUPT;
+lx::Fault validate_sort(uint16_t, const lx::Sections& sections) {
+  const Bytes bytes = sections.section[0];
+  if (!bytes.holds(0, fmt::kFixedBytes)) return lx::corrupt("the payload is shorter than its fixed part", 0);
   const uint8_t* payload = bytes.data;
   const auto table_fits = [&](size_t offset_field, size_t count, size_t record_bytes) {
     return bytes.holds(le16(payload + offset_field), count * record_bytes);
   };
-  if (!table_fits(fmt::kExpansions, le16(payload + fmt::kExpansionCount), fmt::kExpansionBytes) ||
-      !table_fits(fmt::kContractions, le16(payload + fmt::kContractionCount), fmt::kContractionBytes))
-    return LX_E_CORRUPT;
-  for (size_t page = 0; page < kPages; ++page) {
-    const uint8_t* entry = page_at(payload, page);
-    if (is_table(entry[0]) && !table_fits(fmt::kWeights, le16(entry + 2) + kPageElements, fmt::kWeightBytes))
-      return LX_E_CORRUPT;
+  if (!table_fits(fmt::kExpansions, le16(payload + fmt::kExpansionCount), fmt::Expansion::kBytes))
+    return lx::corrupt("the expansions lie outside the payload", fmt::kExpansions);
+  if (!table_fits(fmt::kContractions, le16(payload + fmt::kContractionCount), fmt::Contraction::kBytes))
+    return lx::corrupt("the contractions lie outside the payload", fmt::kContractions);
+  for (size_t number = 0; number < kPages; ++number) {
+    const fmt::Page page = page_at(payload, number);
+    if (page.is_table() && !table_fits(fmt::kWeights, page.base + kPageElements, fmt::WeightRecord::kBytes))
+      return lx::corrupt("the weights of a page lie outside the payload",
+                         fmt::kPages + fmt::Page::kBytes * number);
   }
-  return LX_OK;
+  return {};
 }
 
-void* derive_sort(Bytes bytes) {
-  const uint8_t* payload = bytes.data;
+void* derive_sort(uint16_t, const lx::Sections& sections) {
+  const uint8_t* payload = sections.section[0].data;
   bool flat[kPages];
   const size_t pages = flat_pages(payload, flat);
   const size_t pairs = le16(payload + fmt::kContractionCount);
   auto* sort = static_cast<Sort*>(
-      hook_allocate_zeroed(sizeof(Sort) + pairs * sizeof(Pair) + pages * kPageElements * sizeof(Element)));
+      lx::hook_allocate_zeroed(sizeof(Sort) + pairs * sizeof(Pair) + pages * kPageElements * sizeof(Element)));
   if (sort == nullptr) return nullptr;
   sort->payload = payload;
   sort->expansions = payload + le16(payload + fmt::kExpansions);
@@ -224,6 +217,12 @@ void* derive_sort(Bytes bytes) {
   fill_deciding(sort);
   return sort;
 }
+
+}  // namespace
+
+namespace lx {
+
+const ObjectType kSortType{validate_sort, derive_sort, nullptr, nullptr};
 
 bool Sort::find_pair(LXUChar first, LXUChar second, Element* element) const {
   const uint32_t characters = static_cast<uint32_t>(first) << 16 | second;

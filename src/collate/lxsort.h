@@ -1,11 +1,12 @@
 // A sort as collation works with it: weights laid flat when the object is loaded, and the walk over a text that
-// gives one collation element after the other. All of it trusts the tables, which validate_sort() has checked.
+// gives one collation element after the other. All of it trusts the tables, which were validated then.
 #pragma once
 
 #include "codepage/lxtext.h"
 #include "core/lxbytes.h"
 #include "core/lxformat.h"
 #include "core/lxobjman.h"
+#include "core/lxobjtypes.h"
 
 namespace lx {
 
@@ -81,8 +82,8 @@ struct Sort {
   }
 
   /// The sets of an element that has two, each as an element of one.
-  Element first_set(const Element& element) const { return set_of(element, 2); }
-  Element second_set(const Element& element) const { return set_of(element, 6); }
+  Element first_set(const Element& element) const { return set_of(element, 0); }
+  Element second_set(const Element& element) const { return set_of(element, 1); }
 
   /// The element of a pair: false when the pair is none.
   bool pair(LXUChar first, LXUChar second, Element* element) const {
@@ -95,11 +96,14 @@ struct Sort {
   bool find_pair(LXUChar first, LXUChar second, Element* element) const;
 
  private:
-  Element set_of(const Element& element, size_t offset) const {
-    const uint8_t* w = expansions + format::sort::kExpansionBytes * element.special() + offset;
-    return Element(LXWeights{le16(w), w[2], w[3], 0}, 1, element.char_class());
+  Element set_of(const Element& element, size_t which) const {
+    using format::sort::Expansion;
+    const Expansion::Set set = Expansion::read(expansions + Expansion::kBytes * element.special()).sets[which];
+    return Element(LXWeights{set.primary, set.secondary, set.tertiary, 0}, 1, element.char_class());
   }
 };
+
+extern const ObjectType kSortType;
 
 /// The derived data of a loaded sort object.
 inline const Sort& sort_of(const LXObject& object) {

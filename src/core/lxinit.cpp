@@ -45,7 +45,7 @@ bool create_area(LXAllocHook allocate, LXFreeHook release, void* context) {
     return false;
   }
   memset(block, 0, sizeof(lx::GlobalArea));
-  lx::globals = lx::Globals{static_cast<lx::GlobalArea*>(block), allocate, release, nullptr};
+  lx::globals = lx::Globals{static_cast<lx::GlobalArea*>(block), allocate, release, nullptr, nullptr};
   lx::globals.area->context = context;
   return true;
 }
@@ -131,7 +131,7 @@ int32_t LXTerm(void) {
   int32_t result = LX_OK;
   if (LXLocale* locale = lx::globals.default_locale) {
     lx::globals.default_locale = nullptr;
-    result = LXReleaseLocale(locale);
+    result = lx::globals.release_default(locale);
   }
   LXObjManager* manager = area->manager;
   area->manager = nullptr;

@@ -19,17 +19,9 @@ RAS1_Unit unit = RAS1_UNIT("lxobjload");
 // The directory fills at most its field; a data file's name adds "/cp_00001.nls" and a null.
 constexpr size_t kNameBytes = sizeof(LXObjManager::directory) + 16;
 
-const lx::BuiltIn* built_in(uint8_t type) {
-  switch (type) {
-    case LX_LANGUAGE:
-      return &lx::kBuiltInLanguage;
-    case LX_TERRITORY:
-      return &lx::kBuiltInTerritory;
-    case LX_CODEPAGE:
-      return &lx::kBuiltInCodepage;
-    default:
-      return nullptr;
-  }
+/// Null for a type that a control file may name but that there is none of.
+const lx::ObjectType* object_type(uint8_t type) {
+  return type < format::kTypes ? lx::kObjectTypes[type] : nullptr;
 }
 
 /// The sections of an object while it is loaded: freed unless they are handed to the entry.
@@ -43,12 +35,16 @@ class Loading {
   Loading& operator=(const Loading&) = delete;
 
   /// Reads, converts and checks: 0 when the sections can be handed over.
-  int32_t load(LXFile* file, const LXObjDisk& disk) {
+  int32_t load(LXFile* file, const LXObjDisk& disk, const lx::ObjectType& type) {
     uint32_t version = 0;
     int32_t rc = read(file, &version);
-    if (rc == LX_OK && disk.type == LX_CODEPAGE && version == 1) rc = upgrade();
-    if (rc == LX_OK) rc = validate(disk);
-    return rc;
+    if (rc == LX_OK && type.upgrade != nullptr && version == 1) rc = upgrade(type);
+    if (rc != LX_OK) return rc;
+    const lx::Fault fault = type.validate(disk.id, sections_);
+    if (fault.code == LX_E_CORRUPT)
+      LX_TRACE(unit, RAS1_LEVEL_ERRORS, "Object %s is refused: %s (section %d, offset %d)", disk.name,
+               fault.reason, static_cast<int>(fault.section), static_cast<int>(fault.offset));
+    return fault.code;
   }
 
   /// Gives the sections to the entry. The payload pointer is stored last: it says that the entry is loaded.
@@ -71,24 +67,23 @@ class Loading {
 
   int32_t read(LXFile* file, uint32_t* version) {
     int32_t rc = LX_OK;
-    lx::HookPtr<uint8_t> header(static_cast<uint8_t*>(LXLoadFile(file, 0, format::kHeaderBytes, &rc)));
-    if (!header) return rc;
-    if (lx::le32(header.get() + format::kHeaderMagic) != format::kMagic) return LX_E_CORRUPT;
-    *version = lx::le32(header.get() + format::kHeaderFormat) >> format::kFormatVersionShift;
-    const size_t count = lx::le16(header.get() + format::kHeaderSections);
-    for (size_t i = 0; i == 0 || (i < count && i < format::kMaxSections); ++i) {
-      const uint16_t size = lx::le16(header.get() + format::header_section_size(i));
-      const uint32_t offset = lx::le32(header.get() + format::header_section_offset(i));
-      sections_.section[i].data = static_cast<uint8_t*>(LXLoadFile(file, offset, size, &rc));
+    lx::HookPtr<uint8_t> block(static_cast<uint8_t*>(LXLoadFile(file, 0, format::kHeaderBytes, &rc)));
+    if (!block) return rc;
+    const format::Header header = format::Header::read(block.get());
+    if (header.magic != format::kMagic) return LX_E_CORRUPT;
+    *version = header.version();
+    for (size_t i = 0; i == 0 || (i < header.sections && i < format::kMaxSections); ++i) {
+      const format::Header::Section& place = header.section[i];
+      sections_.section[i].data = static_cast<uint8_t*>(LXLoadFile(file, place.offset, place.bytes, &rc));
       if (rc != LX_OK) return rc;
-      sections_.section[i].size = size;
+      sections_.section[i].size = place.bytes;
     }
     return LX_OK;
   }
 
-  int32_t upgrade() {
+  int32_t upgrade(const lx::ObjectType& type) {
     lx::Sections upgraded;
-    const int32_t rc = lx::upgrade_codepage(sections_, &upgraded);
+    const int32_t rc = type.upgrade(sections_, &upgraded);
     if (rc != LX_OK) return rc;
     for (size_t i = 0; i < format::kMaxSections; ++i) {
       if (upgraded.section[i].data == sections_.section[i].data) continue;
@@ -99,42 +94,27 @@ class Loading {
     return LX_OK;
   }
 
-  int32_t validate(const LXObjDisk& disk) const {
-    switch (disk.type) {
-      case LX_LANGUAGE:
-        return lx::validate_language(sections_.section[0]);
-      case LX_TERRITORY:
-        return lx::validate_territory(sections_.section[0]);
-      case LX_CODEPAGE:
-        return lx::validate_codepage(disk.id, sections_);
-      default:
-        return lx::validate_sort(sections_.section[0]);
-    }
-  }
-
   lx::Sections sections_;
   uint8_t owned_ = 0;
 };
 
-/// Builds the acceleration data of the types that have any; false without memory.
-bool derive(const LXObjDisk& disk, const lx::Sections& sections, void** derived) {
-  if (disk.type == LX_CODEPAGE) *derived = lx::derive_codepage(disk.id, sections);
-  if (disk.type == LX_SORT) *derived = lx::derive_sort(sections.section[0]);
-  return *derived != nullptr || disk.type == LX_LANGUAGE || disk.type == LX_TERRITORY;
-}
-
 /// Loads an entry from its file; the entry stays as it was on failure.
 int32_t load_from_file(const LXObjManager* manager, LXObject* entry) {
   char name[kNameBytes];
-  if (LXGetDataFileName(manager->directory, entry->disk.type, entry->disk.id, name, sizeof(name)) == nullptr)
+  const lx::ObjectType* type = object_type(entry->disk.type);
+  if (type == nullptr ||
+      LXGetDataFileName(manager->directory, entry->disk.type, entry->disk.id, name, sizeof(name)) == nullptr)
     return LX_E_FILE_IO;
   int32_t rc = LX_OK;
   LXFile* file = lx::open_for_reading(name, &rc);
   if (file == nullptr) return rc;
   Loading loading;
   void* derived = nullptr;
-  rc = loading.load(file, entry->disk);
-  if (rc == LX_OK && !derive(entry->disk, loading.sections(), &derived)) rc = LX_E_MEMORY;
+  rc = loading.load(file, entry->disk, *type);
+  if (rc == LX_OK && type->derive != nullptr) {
+    derived = type->derive(entry->disk.id, loading.sections());
+    if (derived == nullptr) rc = LX_E_MEMORY;
+  }
   if (rc == LX_OK)
     loading.hand_over(entry, file, derived);
   else
@@ -177,7 +157,8 @@ int32_t LXUnloadObj(LXObjManager*, LXObject* entry) {
 }
 
 LXObject* LXLoadDefaultObj(LXObjManager*, LXObject* entry) {
-  const lx::BuiltIn* data = built_in(entry->disk.type);
+  const lx::ObjectType* type = object_type(entry->disk.type);
+  const lx::BuiltIn* data = type != nullptr ? type->built_in : nullptr;
   if (data == nullptr) return nullptr;
   // Flagged as built-in, the compiled-in data are never freed and never written.
   entry->disk.flags = lx::kObjectBuiltIn;
@@ -189,20 +170,22 @@ LXObject* LXLoadDefaultObj(LXObjManager*, LXObject* entry) {
 }
 
 bool LXLoadDefaults(LXObjManager* manager) {
-  constexpr uint8_t kBuiltInTypes[] = {LX_LANGUAGE, LX_TERRITORY, LX_CODEPAGE};
-  constexpr uint16_t kCount = sizeof(kBuiltInTypes);
-  manager->entries = static_cast<LXObject*>(lx::hook_allocate_zeroed(kCount * sizeof(LXObject)));
+  uint16_t count = 0;
+  for (const lx::ObjectType* type : lx::kObjectTypes)
+    count = static_cast<uint16_t>(count + (type->built_in != nullptr));
+  manager->entries = static_cast<LXObject*>(lx::hook_allocate_zeroed(count * sizeof(LXObject)));
   if (manager->entries == nullptr) return false;
-  for (uint16_t i = 0; i < kCount; ++i) {
-    LXObject* entry = &manager->entries[i];
+  manager->count = 0;
+  for (uint8_t type = 0; type < format::kTypes; ++type) {
+    manager->first[type] = manager->count;
+    const lx::BuiltIn* data = lx::kObjectTypes[type]->built_in;
+    if (data == nullptr) continue;
+    LXObject* entry = &manager->entries[manager->count++];
     entry->disk.id = 1;
-    entry->disk.type = kBuiltInTypes[i];
-    strcpy(entry->disk.name, built_in(entry->disk.type)->name);
+    entry->disk.type = type;
+    strcpy(entry->disk.name, data->name);
     LXLoadDefaultObj(manager, entry);
-    manager->first[i] = i;
   }
-  manager->first[LX_SORT] = kCount;
-  manager->count = kCount;
   manager->no_fallback = 1;
   manager->directory[0] = '\0';
   return true;

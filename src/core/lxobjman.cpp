@@ -71,15 +71,16 @@ LXFile* find_control(LXObjManager* manager, const char* directory, int32_t* rc) 
 /// Reads the records of an open control file into a new block. `*bytes` receives its size; null with a code, or
 /// with code 0 when the table is empty.
 uint8_t* read_records(LXFile* file, size_t* bytes, int32_t* rc) {
-  lx::HookPtr<uint8_t> header(static_cast<uint8_t*>(LXLoadFile(file, 0, format::kHeaderBytes, rc)));
-  if (!header) return nullptr;
-  if (lx::le32(header.get() + format::kHeaderMagic) != format::kMagic) {
+  lx::HookPtr<uint8_t> block(static_cast<uint8_t*>(LXLoadFile(file, 0, format::kHeaderBytes, rc)));
+  if (!block) return nullptr;
+  const format::Header header = format::Header::read(block.get());
+  if (header.magic != format::kMagic) {
     LX_TRACE(unit, RAS1_LEVEL_ERRORS, "Control file header is corrupted");
     *rc = LX_E_CORRUPT;
     return nullptr;
   }
-  const int size = lx::le16(header.get() + format::header_section_size(0));
-  const int32_t offset = static_cast<int32_t>(lx::le32(header.get() + format::header_section_offset(0)));
+  const int size = header.section[0].bytes;
+  const int32_t offset = static_cast<int32_t>(header.section[0].offset);
   *bytes = static_cast<size_t>(size);
   if (size == 0) return nullptr;
   lx::HookPtr<uint8_t> records(static_cast<uint8_t*>(lx::hook_allocate(static_cast<size_t>(size))));
@@ -105,14 +106,14 @@ uint8_t* read_records(LXFile* file, size_t* bytes, int32_t* rc) {
 /// Fills the entry table and the type ranges. Types without entries get the index of the next type that has
 /// some. A record of an unknown type stands in a range of another one, where look-ups by name pass it over.
 void fill_entries(LXObjManager* manager, const uint8_t* records) {
-  LX_TRACE(unit, RAS1_LEVEL_DETAIL, "LXObjDisk size = %d", static_cast<int>(format::kRecordBytes));
+  LX_TRACE(unit, RAS1_LEVEL_DETAIL, "LXObjDisk size = %d", static_cast<int>(format::ControlRecord::kBytes));
   size_t next_type = 0;
   for (uint16_t i = 0; i < manager->count; ++i) {
-    const uint8_t* record = records + i * format::kRecordBytes;
+    const auto record = format::ControlRecord::read(records + i * format::ControlRecord::kBytes);
     LXObjDisk* disk = &manager->entries[i].disk;
-    disk->id = lx::le16(record + format::kRecordId);
-    disk->type = record[format::kRecordType];
-    memcpy(disk->name, record + format::kRecordName, sizeof(disk->name));
+    disk->id = record.id;
+    disk->type = record.type;
+    memcpy(disk->name, record.name, sizeof(disk->name));
     disk->name[sizeof(disk->name) - 1] = '\0';
     LX_TRACE(unit, RAS1_LEVEL_DETAIL, "Entry = %d, Object Type = %d, Object Id = %d, Object Name = %s", i,
              disk->type, disk->id, disk->name);
@@ -133,7 +134,7 @@ int32_t read_directory(LXObjManager* manager, const char* directory) {
   size_t bytes = 0;
   lx::HookPtr<uint8_t> records(read_records(file, &bytes, &rc));
   if (rc != LX_OK) return rc;
-  const size_t count = bytes / format::kRecordBytes;
+  const size_t count = bytes / format::ControlRecord::kBytes;
   const size_t table_bytes = (count != 0 ? count : 1) * sizeof(LXObject);
   manager->entries = static_cast<LXObject*>(lx::hook_allocate_zeroed(table_bytes));
   if (manager->entries == nullptr) {

@@ -1,5 +1,5 @@
-// What an object type must provide to the object manager. Declared here and implemented in the room that owns
-// the type, so that core includes nothing above it.
+// What the object manager asks of an object type. Each room describes its types with one constant; the table of
+// them is filled above the rooms, so that core includes and calls nothing above it.
 #pragma once
 
 #include "core/lxbytes.h"
@@ -13,30 +13,44 @@ struct Sections {
   Bytes section[format::kMaxSections];
 };
 
-// Validation: whether every offset, count, index and text that a look-up can reach lies inside its section.
-// Codes: 0; 2000 refused; 20 no memory for the check.
-int32_t validate_language(Bytes payload);
-int32_t validate_territory(Bytes payload);
-int32_t validate_codepage(uint16_t id, const Sections& sections);
-int32_t validate_sort(Bytes payload);
+/// What a validator found: nothing, what is wrong and where, or no memory for the check.
+struct Fault {
+  int32_t code = LX_OK;  // LX_E_CORRUPT, LX_E_MEMORY
+  const char* reason = nullptr;
+  size_t section = 0;
+  size_t offset = 0;  // in the section: of the field or record that is wrong
 
-/// Turns a version-1 codepage into a version-2 one: new blocks for section 0 and, in a multibyte codepage, 1.
-/// `upgraded` receives the new sections; a section that was not replaced stays as it was.
-/// Codes: 0; 20; 2000 when the sections are not a version-1 codepage.
-int32_t upgrade_codepage(const Sections& version1, Sections* upgraded);
+  explicit operator bool() const { return code != LX_OK; }
+};
+inline Fault corrupt(const char* reason, size_t offset, size_t section = 0) {
+  return {LX_E_CORRUPT, reason, section, offset};
+}
 
-/// Builds the derived data of a validated codepage in one block from the allocation hook. Null: no memory.
-void* derive_codepage(uint16_t id, const Sections& sections);
-void* derive_sort(Bytes payload);  // the same for a sort
-
-/// The payloads that are compiled into the library, by type.
+/// A payload that is compiled into the library.
 struct BuiltIn {
   const char* name;
   Sections sections;
   const void* derived;
 };
-extern const BuiltIn kBuiltInLanguage;
-extern const BuiltIn kBuiltInTerritory;
-extern const BuiltIn kBuiltInCodepage;
+
+struct ObjectType {
+  /// Whether every offset, count, index and text that a look-up can reach lies inside its section. Allocates no
+  /// more than the sections have bytes, from the hook.
+  Fault (*validate)(uint16_t id, const Sections& sections);
+
+  /// Builds the derived data of validated sections in one block from the allocation hook; null: no memory. Null
+  /// for a type without any.
+  void* (*derive)(uint16_t id, const Sections& sections);
+
+  /// Turns sections of version 1 into those of version 2: new blocks for section 0 and perhaps others; a
+  /// section that was not replaced stays as it was. Codes: 0; 20; 2000 when they are not of version 1. Null for
+  /// a type that has one version.
+  int32_t (*upgrade)(const Sections& version1, Sections* upgraded);
+
+  const BuiltIn* built_in;  // null: none
+};
+
+/// By type.
+extern const ObjectType* const kObjectTypes[format::kTypes];
 
 }  // namespace lx

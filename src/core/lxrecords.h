@@ -105,6 +105,7 @@ struct Globals {
   LXAllocHook allocate;
   LXFreeHook release;
   LXLocale* default_locale;
+  int32_t (*release_default)(LXLocale*);  // set with it: locales are released above, and LXTerm has to
 };
 extern Globals globals;
 

@@ -143,7 +143,7 @@ struct Classifier {
     if constexpr (kForm == Form::kUnicode) return (unicode_type(c) & LX_C1_SPACE) != 0;
     if (c <= 0xFF) return (cp.type(static_cast<uint8_t>(c)) & LX_C1_SPACE) != 0;
     const uint8_t* record = type_record_of_code(cp, c);
-    return record != nullptr && (le32(record) & LX_C1_SPACE) != 0;
+    return record != nullptr && (format::codepage::TypeRecord::read(record).type & LX_C1_SPACE) != 0;
   }
 
   Char<kForm> ascii_digit(Char<kForm> c) const {

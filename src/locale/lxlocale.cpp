@@ -175,6 +175,7 @@ int32_t install(Create create_locale) {
   if (locale == nullptr) return events.exit(rc);
   LXLocale* previous = lx::globals.default_locale;
   lx::globals.default_locale = locale;
+  lx::globals.release_default = LXReleaseLocale;
   if (previous != nullptr) LXReleaseLocale(previous);
   return events.exit(LX_OK);
 }

@@ -4,9 +4,15 @@
 
 #include "codepage/lxcodepage.h"
 #include "core/lxobjman.h"
+#include "core/lxobjtypes.h"
 #include "core/lxrecords.h"
 
 namespace lx {
+
+extern const ObjectType kLanguageType;
+extern const ObjectType kTerritoryType;
+extern const BuiltIn kBuiltInLanguage;
+extern const BuiltIn kBuiltInTerritory;
 
 /// Where an item's value stands. The comment says what an item's index counts.
 enum class ItemKind : uint8_t {
@@ -117,7 +123,7 @@ inline int32_t search_code(int32_t rc) {
 const Codepage* common_codepage(int32_t* rc);
 
 /// The room that a locale string can take, in bytes.
-inline constexpr size_t kLocaleStringBytes = format::kTypes * format::kRecordNameBytes;
+inline constexpr size_t kLocaleStringBytes = format::kTypes * sizeof(format::ControlRecord::name);
 
 /// Fills the values that the caller has not set from the territory, changes the territory or the codepage:
 /// 0, 20 or 36; a change that fails leaves the locale as it was.

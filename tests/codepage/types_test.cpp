@@ -111,7 +111,7 @@ TEST(BuiltInCodepage, InForceWithoutADirectory) {
   ASSERT_EQ(LXInit("/nonexistent", lx::test::Hooks::allocate, lx::test::Hooks::release, &hooks, 0),
             LX_W_DEFAULTS);
   const lx::Sections& sections = lx::kBuiltInCodepage.sections;
-  EXPECT_EQ(lx::validate_codepage(1, sections), LX_OK);
+  EXPECT_EQ(lx::kCodepageType.validate(1, sections).code, LX_OK);
   void* block = lx::derive_codepage(1, sections);
   ASSERT_NE(block, nullptr);
   const auto& derived = *static_cast<const lx::Codepage*>(block);

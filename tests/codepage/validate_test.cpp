@@ -40,13 +40,13 @@ void set_word(S& s, size_t offset, size_t value) {
   put_le16(payload(s) + offset, static_cast<uint16_t>(value));
 }
 uint8_t* page(S& s, size_t n) {
-  return payload(s) + fmt::kPages + n * fmt::kPageBytes;
+  return payload(s) + fmt::kPages + n * fmt::PageEntry::kBytes;
 }
 uint8_t* node(S& s, size_t n) {
-  return s[1].data() + n * fmt::kNodeBytes;
+  return s[1].data() + n * fmt::UnicodeNode::kBytes;
 }
 uint8_t* type_node(S& s, size_t n) {
-  return payload(s) + word(s, fmt::kTypeTrie) + n * fmt::kTypeNodeBytes;
+  return payload(s) + word(s, fmt::kTypeTrie) + n * fmt::TypeNode::kBytes;
 }
 /// The trie node that a first byte leads to.
 uint8_t* child(S& s, uint8_t byte) {
@@ -260,7 +260,7 @@ TEST_F(Validate, Refused) {
       {"a pair table behind the end", tiny_shift_jis,
        [](S& s) {
          set_word(s, fmt::kPairCount, 3);
-         set_word(s, fmt::kPairs, s[0].size() - 3 * fmt::kPairBytes + 1);
+         set_word(s, fmt::kPairs, s[0].size() - 3 * fmt::WidthPair::kBytes + 1);
        }},
       {"a pair count behind the end", tiny_single,
        [](S& s) { set_word(s, fmt::kPairCount, fmt::kFixedBytes / 8 + 1); }},
@@ -277,7 +277,7 @@ TEST_F(Validate, Refused) {
       {"a high array that is not there", tiny_shift_jis, [](S& s) { set_page(s, 5, 4, 0, 0, 0, 0, 0); }},
       // The trie towards Unicode.
       {"no trie", tiny_shift_jis, [](S& s) { s[1].clear(); }},
-      {"half a root", tiny_shift_jis, [](S& s) { s[1].resize(fmt::kNodeBytes - 1); }},
+      {"half a root", tiny_shift_jis, [](S& s) { s[1].resize(fmt::UnicodeNode::kBytes - 1); }},
       {"a child behind the end", tiny_shift_jis,
        [](S& s) { put_le16(node(s, 0) + 4, static_cast<uint16_t>(s[1].size() / 6)); }},
       {"the root is its own child", tiny_shift_jis,
@@ -292,7 +292,7 @@ TEST_F(Validate, Refused) {
          put_le16(at + 4, static_cast<uint16_t>((at - s[1].data()) / 6));
        }},
       {"a walk of three from two", tiny_euc,
-       [](S& s) { std::copy_n(child(s, 0x8F), fmt::kNodeBytes, child(s, 0xA4)); }},
+       [](S& s) { std::copy_n(child(s, 0x8F), fmt::UnicodeNode::kBytes, child(s, 0xA4)); }},
       {"a length below the walk", tiny_euc, [](S& s) { payload(s)[fmt::kLengths + 0x8F] = 2; }},
       {"values behind the end, by one", tiny_shift_jis, [](S& s) { s[1].resize(s[1].size() - 1); }},
       {"values behind the end", tiny_shift_jis,
@@ -354,7 +354,7 @@ TEST_F(Validate, NotRefused) {
          node(s, 0)[1] = 0;
        }},
       {"nodes that share values", tiny_shift_jis,
-       [](S& s) { std::copy_n(child(s, 0x82), fmt::kNodeBytes, child(s, 0x83)); }},
+       [](S& s) { std::copy_n(child(s, 0x82), fmt::UnicodeNode::kBytes, child(s, 0x83)); }},
       {"a root that is a leaf", tiny_shift_jis,
        [](S& s) {
          const uint8_t leaf[] = {7, 0x00, 0, 0xFF, 0, 0};
@@ -366,7 +366,8 @@ TEST_F(Validate, NotRefused) {
       {"a shift byte in front", tiny_shift, [](S& s) { set_code(s, 5, fmt::kKindWord, 0x0F41); }},
       {"one byte to shift out and in", tiny_shift, [](S& s) { payload(s)[fmt::kShiftIn] = 0x0E; }},
       {"a longer walk from a single byte", tiny_euc, [](S& s) { payload(s)[fmt::kLengths + 0x8F] = 1; }},
-      {"a short walk", tiny_euc, [](S& s) { std::copy_n(child(s, 0xA4), fmt::kNodeBytes, child(s, 0x8F)); }},
+      {"a short walk", tiny_euc,
+       [](S& s) { std::copy_n(child(s, 0xA4), fmt::UnicodeNode::kBytes, child(s, 0x8F)); }},
       {"bytes behind everything", tiny_shift_jis,
        [](S& s) {
          for (ByteString& section : s) section.push_back(0xEE);

@@ -79,7 +79,7 @@ inline std::vector<ByteString> small_double_byte_codepage(uint8_t lead = 0x81) {
   // Page 0 keeps its bytes; the page of the double-byte characters gets words behind them.
   SectionWriter low(sections[2]);
   if (low.size() % 2 != 0) low.byte(0);
-  uint8_t* page = payload.data() + cp::kPages + (kFirstUnicode >> 8) * cp::kPageBytes;
+  uint8_t* page = payload.data() + cp::kPages + (kFirstUnicode >> 8) * cp::PageEntry::kBytes;
   page[0] = cp::kKindWord;
   page[1] = 0x07;
   page[2] = kFirstUnicode & 0xFF;

@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
-# Includes run one way: platform < core < codepage < locale < text < collate < format, stream, catalog < nls1; the command
-# line sees public headers only.
+# Includes and symbols run one way: platform < core < codepage < locale < text < collate < format, stream, catalog < nls1;
+# the command line sees public headers only.
 set -euo pipefail
 cd "$1"
 
@@ -29,6 +29,28 @@ for room in src/*/; do
       *) complain "$file:$line: src/$room may not include $text" ;;
     esac
   done < <(grep -rn '^#include "' "src/$room" || true)
+done
+
+# Symbols: what a room leaves undefined may stand in it, below it, or outside. Of what stands above all rooms the
+# linker puts in the table of object types, which core knows by name.
+objects="$2/src/CMakeFiles/lexicor_objects.dir"
+defined() { nm -g --defined-only --format=just-symbols "$@" | grep -v ':$' | sort -u; }
+allowed() {
+  case "$1" in
+    "core . lx::kObjectTypes") ;;
+    "text collate LXStrcoll" | "text collate LXStrcollEx" | "text collate LXStrcollU" | "text collate LXWcscoll") ;;  # the substring search compares by the sort
+    *) return 1 ;;
+  esac
+}
+for room in "${!below[@]}"; do
+  [ "$room" != platform ] || continue
+  for other in . "${!below[@]}"; do
+    case " platform ${below[$room]} " in *" $other "*) continue ;; esac
+    while read -r symbol; do
+      allowed "$room $other $(c++filt "$symbol")" || complain "src/$room uses $(c++filt "$symbol") of src/$other"
+    done < <(comm -12 <(nm -u --format=just-symbols "$objects/$room"/*.o | grep -v ':$' | sort -u) \
+                      <(defined "$objects/$other"/*.o))
+  done
 done
 
 while IFS=: read -r file line text; do

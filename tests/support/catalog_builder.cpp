@@ -2,7 +2,7 @@
 
 #include <cstring>
 
-#include "core/lxformat.h"
+#include "core/lxcatformat.h"
 
 namespace lx::test {
 namespace {

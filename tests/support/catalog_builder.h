@@ -6,6 +6,7 @@
 #include <utility>
 #include <vector>
 
+#include "core/lxcatformat.h"
 #include "support/object_files.h"
 
 namespace lx::test {

@@ -10,7 +10,6 @@
 
 #include "core/lxbytes.h"
 #include "core/lxformat.h"
-#include "core/lxobjtypes.h"
 
 namespace lx::test {
 namespace {
@@ -23,25 +22,23 @@ ByteString copy(Bytes bytes) {
 
 ByteString object_file(const std::vector<ByteString>& sections, uint32_t version) {
   ByteString file(format::kHeaderBytes);
-  put_le32(file.data() + format::kHeaderMagic, format::kMagic);
-  put_le32(file.data() + format::kHeaderFormat, version << format::kFormatVersionShift);
-  put_le16(file.data() + format::kHeaderSections, static_cast<uint16_t>(sections.size()));
+  format::Header header;
+  header.format = version << format::Header::kVersionShift;
+  header.sections = static_cast<uint16_t>(sections.size());
   for (size_t i = 0; i < sections.size(); ++i) {
-    const uint32_t offset = static_cast<uint32_t>(file.size());
+    header.section[i] = {static_cast<uint16_t>(sections[i].size()), static_cast<uint32_t>(file.size())};
     file.insert(file.end(), sections[i].begin(), sections[i].end());
-    put_le16(file.data() + format::header_section_size(i), static_cast<uint16_t>(sections[i].size()));
-    put_le32(file.data() + format::header_section_offset(i), offset);
   }
+  header.write(file.data());
   return file;
 }
 
 ByteString control_file(const std::vector<ControlRecord>& records) {
-  ByteString table(records.size() * format::kRecordBytes);
+  ByteString table(records.size() * format::ControlRecord::kBytes);
   for (size_t i = 0; i < records.size(); ++i) {
-    uint8_t* record = table.data() + i * format::kRecordBytes;
-    put_le16(record + format::kRecordId, records[i].id);
-    record[format::kRecordType] = records[i].type;
-    records[i].name.copy(reinterpret_cast<char*>(record) + format::kRecordName, format::kRecordNameBytes);
+    format::ControlRecord record{records[i].id, records[i].type};
+    records[i].name.copy(record.name, sizeof(record.name));
+    record.write(table.data() + i * record.kBytes);
   }
   return object_file({table});
 }

@@ -5,6 +5,8 @@
 #include <string>
 #include <vector>
 
+#include "locale/lxlocale.h"
+
 namespace lx::test {
 
 using ByteString = std::vector<uint8_t>;

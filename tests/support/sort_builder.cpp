@@ -19,8 +19,8 @@ void append_weight(ByteString* bytes, const TestWeight& weight, unsigned flags) 
   append16(bytes, w.special != 0 ? w.special : w.primary);
   bytes->push_back(w.secondary);
   bytes->push_back(w.tertiary);
-  append16(bytes, flags | (w.special != 0 ? fmt::kWeightSpecial : 0u) |
-                      static_cast<unsigned>(weight.char_class << fmt::kWeightClassShift));
+  append16(bytes, flags | (w.special != 0 ? fmt::WeightRecord::kSpecial : 0u) |
+                      static_cast<unsigned>(weight.char_class << fmt::WeightRecord::kClassShift));
 }
 
 }  // namespace
@@ -43,13 +43,13 @@ ByteString SortBuilder::payload() const {
       const auto expansion = expansions.find(u);
       const auto character = characters.find(u);
       if (expansion != expansions.end())
-        append_weight(&bytes, {{}, expansion->second.first.char_class}, fmt::kWeightExpansion);
+        append_weight(&bytes, {{}, expansion->second.first.char_class}, fmt::WeightRecord::kExpansion);
       else
         append_weight(&bytes, character != characters.end() ? character->second : TestWeight{}, 0);
     }
   }
   for (unsigned page = 0; page < 256; ++page) {
-    uint8_t* entry = &bytes[fmt::kPages + fmt::kPageBytes * page];
+    uint8_t* entry = &bytes[fmt::kPages + fmt::Page::kBytes * page];
     const auto number = static_cast<uint8_t>(page);
     entry[0] = fmt::kPageUncovered;
     if (const auto base = bases.find(number); base != bases.end()) {

@@ -155,20 +155,21 @@ void CodepageBuilder::add_type_trie(ByteString* payload, const Node& root) const
 }
 
 ByteString CodepageBuilder::unicode_trie(ByteString* payload, const Node& root) const {
-  constexpr uint8_t kEmptyLeaf[fmt::kNodeBytes] = {1, 0, 2, 1, 0, 0};
-  ByteString nodes(fmt::kNodeBytes);
+  constexpr uint8_t kEmptyLeaf[fmt::UnicodeNode::kBytes] = {1, 0, 2, 1, 0, 0};
+  ByteString nodes(fmt::UnicodeNode::kBytes);
   ByteString values;
   const auto fill = [&](const auto& self, size_t place, const Node& node) -> void {
-    uint8_t entry[fmt::kNodeBytes];
+    uint8_t entry[fmt::UnicodeNode::kBytes];
     std::copy(std::begin(kEmptyLeaf), std::end(kEmptyLeaf), entry);
     if (!node.next.empty()) {
       const uint8_t lowest = node.next.begin()->first;
       const uint8_t highest = node.next.rbegin()->first;
       const uint8_t mask = mask_of(lowest, highest);
       const bool leaf = node.next.begin()->second.has_value;
-      const size_t before = leaf ? values.size() / 2 : nodes.size() / fmt::kNodeBytes;
-      const Row row = add_row(leaf ? &values : &nodes, leaf ? 2 : fmt::kNodeBytes, lowest, highest, mask);
-      const size_t after = leaf ? values.size() / 2 : nodes.size() / fmt::kNodeBytes;
+      const size_t before = leaf ? values.size() / 2 : nodes.size() / fmt::UnicodeNode::kBytes;
+      const Row row =
+          add_row(leaf ? &values : &nodes, leaf ? 2 : fmt::UnicodeNode::kBytes, lowest, highest, mask);
+      const size_t after = leaf ? values.size() / 2 : nodes.size() / fmt::UnicodeNode::kBytes;
       for (size_t i = before; i < after; ++i) {
         if (leaf)
           put_le16(values.data() + 2 * i, kUnmapped);
@@ -188,7 +189,8 @@ ByteString CodepageBuilder::unicode_trie(ByteString* payload, const Node& root) 
       entry[3] = highest;
       put_le16(entry + 4, row.offset);
     }
-    std::copy(std::begin(entry), std::end(entry), nodes.begin() + static_cast<long>(place * fmt::kNodeBytes));
+    std::copy(std::begin(entry), std::end(entry),
+              nodes.begin() + static_cast<long>(place * fmt::UnicodeNode::kBytes));
   };
   fill(fill, 0, root);
   put_le16(payload->data() + fmt::kUnicodeValues, checked16(nodes.size()));
@@ -198,7 +200,7 @@ ByteString CodepageBuilder::unicode_trie(ByteString* payload, const Node& root) 
 
 void CodepageBuilder::add_pages(ByteString* payload, ByteString* low, ByteString* high) const {
   for (unsigned page = 0; page < kBytes; ++page) {
-    uint8_t* entry = payload->data() + fmt::kPages + page * fmt::kPageBytes;
+    uint8_t* entry = payload->data() + fmt::kPages + page * fmt::PageEntry::kBytes;
     const auto begin = to_code_.lower_bound(static_cast<uint16_t>(page << 8));
     const auto end = to_code_.upper_bound(static_cast<uint16_t>(page << 8 | 0xFF));
     if (begin == end) {
@@ -436,7 +438,7 @@ CodepageObject::CodepageObject(uint16_t id, const std::vector<ByteString>& secti
   object_.disk.id = id;
   object_.disk.type = LX_CODEPAGE;
   locale_.codepage = &object_;
-  code_ = validate_codepage(id, exact);
+  code_ = kCodepageType.validate(id, exact).code;
   if (code_ != LX_OK) return;
   object_.derived = derive_codepage(id, exact);
   if (object_.derived == nullptr) throw std::runtime_error("no memory for a codepage");

@@ -312,7 +312,7 @@ CompiledObject compile(const CodepageSource& source, uint16_t id = 1) {
 CodepageSource make_source(CodepageClass kind, uint8_t width) {
   CodepageSource source;
   source.name = "Test", source.kind = kind, source.width = width;
-  for (uint32_t byte = 0x20; byte < 0x7F; ++byte) source.mappings.push_back({byte, byte, 1, 0});
+  for (uint32_t byte = 0; byte < 0x7F; ++byte) source.mappings.push_back({byte, byte, 1, 0});
   return source;
 }
 

@@ -7,9 +7,9 @@
 
 #include "compile.h"
 #include "core/lxbytes.h"
+#include "object_check.h"
 #include "sort_check.h"
 #include "sort_pack.h"
-#include "structure.h"
 #include "ucm.h"
 
 namespace lexicor_data {
@@ -53,7 +53,7 @@ std::string written(const SortSource& sort) {
 
 ByteVector payload_of(const std::string& text) {
   ByteVector payload = pack_sort(read_text(text), "s.txt");
-  check_sort_structure({{payload}, 2, ""}, "s");
+  check_object({{payload}, 2, ""}, kName, "s");
   return payload;
 }
 
@@ -65,7 +65,7 @@ TEST(Sort, BecomesItsPayloadAndComesBack) {
             payload);
 
   auto word = [&](size_t at) { return size_t{lx::le16(&payload.at(at))}; };
-  auto page = [&](size_t number) { return layout::kPages + layout::kPageBytes * number; };
+  auto page = [&](size_t number) { return layout::kPages + layout::Page::kBytes * number; };
   EXPECT_EQ(payload[0], 2);
   EXPECT_EQ(payload[1], 3);
   EXPECT_EQ(word(2), 1U) << "expansions";
@@ -103,7 +103,7 @@ TEST(Sort, PagesShareWhatTheyHaveAlike) {
   std::string text = "@defaults 0001 0001\n@uncovered 0400..FFFF\n";
   for (const char* code : {"0041", "0141", "0241", "03FF"})
     text += code + std::string(" ; [.0300.0001.0001]\n");
-  EXPECT_LT(payload_of(text).size(), layout::kFixedBytes + 2 * 256 * layout::kWeightBytes);
+  EXPECT_LT(payload_of(text).size(), layout::kFixedBytes + 2 * 256 * layout::WeightRecord::kBytes);
   text = "@defaults 0001 0001\n@uncovered 3000..FFFF\n";
   for (unsigned code = 0; code < 0x3000; ++code) {
     char line[32];
@@ -132,9 +132,9 @@ TEST(Sort, CheckFindsWhatIsBrokenInAPayload) {
   } cases[] = {
       {layout::kExpansionCount, 0x7FFF, "expansions lie outside"},
       {layout::kContractionCount, 0x7FFF, "contractions lie outside"},
-      {layout::kWeights, 0xFFF0, "weights of page 0 lie outside"},
-      {layout::kWeights, 0, "weights of page 0 lie outside"},
-      {layout::kPages + 2, 0xFFFF, "weights of page 0 lie outside"},
+      {layout::kWeights, 0xFFF0, "section 0, offset 6: the weights of a page lie outside"},
+      {layout::kWeights, 0, "weights of page 0 lie inside"},
+      {layout::kPages + 2, 0xFFFF, "weights of a page lie outside"},
       {layout::kExpansionCount, 1, "has no expansion"},
       {expansions, 0xE7, "expansions are not sorted"},
       {contractions + 2, 0x69, "contractions are not sorted"},
@@ -144,7 +144,7 @@ TEST(Sort, CheckFindsWhatIsBrokenInAPayload) {
     ByteVector broken = sound;
     lx::put_le16(&broken[test.at], static_cast<uint16_t>(test.value));
     try {
-      check_sort_structure({{broken}, 2, ""}, "s");
+      check_object({{broken}, 2, ""}, kName, "s");
       ADD_FAILURE() << test.fault;
     } catch (const SourceError& error) {
       EXPECT_NE(std::string(error.what()).find(test.fault), std::string::npos) << error.what();
@@ -155,7 +155,7 @@ TEST(Sort, CheckFindsWhatIsBrokenInAPayload) {
     ByteVector bytes = sound;
     bytes[at] = static_cast<uint8_t>(~bytes[at]);
     try {
-      check_sort_structure({{bytes}, 2, ""}, "s");
+      check_object({{bytes}, 2, ""}, kName, "s");
       const SortSource sort = unpack_sort(bytes);
       check_sort(sort, "s");
       EXPECT_EQ(written(read_text(written(sort))), written(sort)) << at;

@@ -13,11 +13,9 @@
 #include "core/lxbytes.h"
 #include "core/lxformat.h"
 #include "line_text.h"
-#include "lx.h"
 #include "sense.h"
 #include "sort_check.h"
 #include "sort_pack.h"
-#include "structure.h"
 
 namespace lexicor_data {
 namespace {
@@ -73,43 +71,15 @@ void check_defaults(const ByteVector& payload, const Control& control, const std
   }
 }
 
-void check_object(const std::string& path, const ObjectName& name, const Control& control) {
+void check_file(const std::string& path, const ObjectName& name, const Control& control) {
   const ObjectFile object = read_object(read_file(path), path);
   const std::string dumped = dump_object(object, name, &control, path);
   if (name.type == ObjectType::kSort) check_sort(unpack_sort(object.sections[0]), path);
   if (name.type == ObjectType::kLanguage) check_defaults(object.sections[0], control, path);
-  if (name.type == ObjectType::kCodepage) {
-    if (is_utf8_object(object) != (name.id == format::codepage::kUtf8Id)) {
-      throw SourceError(path, 0, 0, "the identifier 57352 and a computed mapping go together");
-    }
-    check_codes(unpack_codepage(object, name.name), path);
-  }
+  if (name.type == ObjectType::kCodepage) check_codes(unpack_codepage(object, name), path);
   if (is_own_origin(object.origin) && object.origin != origin_of(dumped)) {
     throw SourceError(path, 0, 0, "the checksum in the header is not that of the content");
   }
-}
-
-/// Loads every object as a program does, so that the library's own validation has its say.
-void check_loading(const std::string& directory, const Control& control, Faults& faults) {
-  const std::string control_file = directory + '/' + format::kControlFile;
-  int32_t rc = LXInit(directory.c_str(), nullptr, nullptr, nullptr, LX_NO_DEFAULTS);
-  LXObjManager* manager = LXInitObjManager(directory.c_str(), LX_NO_DEFAULTS, &rc);
-  faults.attempt([&] {
-    if (rc != LX_OK)
-      throw SourceError(control_file, 0, 0, "the library cannot read it: code " + std::to_string(rc));
-  });
-  for (const ObjectName& name : control.objects) {
-    faults.attempt([&] {
-      const LXObject* object =
-          LXGetObjFromID(manager, static_cast<int32_t>(name.type), name.id, LX_FIND_AND_LOAD, &rc);
-      if (object == nullptr || rc != LX_OK) {
-        throw SourceError(directory + '/' + object_file_name(name), 0, 0,
-                          "the library cannot load it: code " + std::to_string(rc));
-      }
-    });
-  }
-  LXTermObjManager(manager);
-  LXTerm();
 }
 
 std::ifstream open(const std::string& path) {
@@ -134,9 +104,8 @@ std::vector<std::string> check_compiled_directory(const std::string& directory) 
   if (!has_control) return faults.messages;
 
   for (const ObjectName& name : control.objects) {
-    faults.attempt([&] { check_object(directory + '/' + object_file_name(name), name, control); });
+    faults.attempt([&] { check_file(directory + '/' + object_file_name(name), name, control); });
   }
-  if (faults.messages.empty()) check_loading(directory, control, faults);
   const std::string alias_file = directory + '/' + format::kAliasFile;
   faults.attempt([&] {
     std::ifstream in = open(alias_file);

@@ -16,25 +16,14 @@ namespace {
 
 namespace cp = lx::format::codepage;
 
-constexpr uint16_t kNoPageLowest = 2, kNoPageHighest = 1;  // a range that no byte lies in
-
 enum class TwoByteKind { kWords, kByteArrays };
 
 // -- Unicode pages ------------------------------------------------------------------------------------------
 
-struct Page {
-  uint8_t kind = cp::kKindByte, mask = 0, lowest = kNoPageLowest, highest = kNoPageHighest;
-  uint16_t low = 0, high = 0;
-};
-
 struct Pages {
-  std::array<Page, 256> pages;
+  std::array<cp::PageEntry, 256> pages;
   ByteVector low, high;
 };
-
-bool low_is_words(uint8_t kind) {
-  return kind == cp::kKindWord || kind == cp::kKindByteWord || kind == cp::kKindWordWord;
-}
 
 /// The page's kind by its longest character.
 uint8_t kind_of_page(const uint32_t* codes, TwoByteKind two_byte) {
@@ -110,13 +99,13 @@ Pages build_pages(const CodepageModel& model, TwoByteKind two_byte) {
     while (lowest < 256 && codes[lowest] == kNoCode) ++lowest;
     if (lowest == 256) continue;
     while (codes[highest] == kNoCode) --highest;
-    Page& page = result.pages[number];
+    cp::PageEntry& page = result.pages[number];
     page.kind = kind_of_page(codes, two_byte);
     page.lowest = static_cast<uint8_t>(lowest);
     page.highest = static_cast<uint8_t>(highest);
     page.mask = mask_for_range(page.lowest, page.highest);
 
-    const int low_bits = low_is_words(page.kind) ? 16 : 8;
+    const size_t low_bits = 8 * page.low_bytes();
     std::vector<uint32_t> low_row, high_row;
     for (int i = lowest; i <= highest; ++i) {
       const uint32_t code = codes[i] == kNoCode ? model.substitution() : codes[i];
@@ -124,10 +113,8 @@ Pages build_pages(const CodepageModel& model, TwoByteKind two_byte) {
       high_row.push_back(code >> low_bits);
     }
     const size_t first_index = page.lowest & page.mask;
-    low.add(page.low, low_is_words(page.kind), std::move(low_row), first_index);
-    if (page.kind != cp::kKindByte && page.kind != cp::kKindWord) {
-      high.add(page.high, page.kind == cp::kKindWordWord, std::move(high_row), first_index);
-    }
+    low.add(page.low, page.low_bytes() == 2, std::move(low_row), first_index);
+    if (page.high_bytes() != 0) high.add(page.high, page.high_bytes() == 2, std::move(high_row), first_index);
   }
   result.low = low.pack();
   result.high = high.pack();
@@ -164,14 +151,7 @@ ByteVector fixed_part(const CodepageModel& model, const Pages& pages) {
     out[cp::kLower + byte] = other_case(model, static_cast<uint8_t>(byte), lx::unicode_lower(unicode));
     lx::put_le16(&out[cp::kUnicode + 2 * byte], unicode);
     lx::put_le32(&out[cp::kTypes + 4 * byte], unicode == kNoValue ? 0 : lx::unicode_type(unicode));
-    const Page& page = pages.pages[byte];
-    uint8_t* entry = &out[cp::kPages + cp::kPageBytes * byte];
-    entry[0] = page.kind;
-    entry[1] = page.mask;
-    entry[2] = page.lowest;
-    entry[3] = page.highest;
-    lx::put_le16(entry + 4, page.low);
-    lx::put_le16(entry + 6, page.high);
+    pages.pages[byte].write(&out[cp::kPages + cp::PageEntry::kBytes * byte]);
   }
   lx::put_le16(&out[cp::kFlags], static_cast<uint16_t>((header.ascii ? cp::kFlagAscii : 0) |
                                                        (model.is_shift() ? cp::kFlagShift : 0)));
@@ -202,8 +182,7 @@ size_t append_variable_part(ByteVector& out, const CodepageModel& model, TypeRow
     if (code <= 0xFF || model.round_trip(unicode) != code) continue;
     const uint32_t full = full_width_code(model, unicode);
     if (full == 0) continue;
-    append_le32(out, code);
-    append_le32(out, full);
+    append_record(out, cp::WidthPair{code, full});
     ++pair_count;
   }
   lx::put_le16(&out[cp::kPairCount], pair_count);

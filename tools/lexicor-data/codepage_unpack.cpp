@@ -5,7 +5,6 @@
 
 #include "core/lxbytes.h"
 #include "core/lxformat.h"
-#include "structure.h"
 
 namespace lexicor_data {
 namespace {
@@ -27,12 +26,12 @@ class TrieReader {
   void visit(size_t index, uint32_t code, unsigned first, unsigned last, unsigned left) {
     if (++visits_ > kMaxVisits)
       throw SourceError(model_.header.name, 0, 0, "the Unicode trie has too many paths");
-    const uint8_t* node = &section_[index * cp::kNodeBytes];
-    for (unsigned byte = std::max<unsigned>(first, node[2]); byte <= std::min<unsigned>(last, node[3]);
-         ++byte) {
-      const size_t next = lx::le16(node + 4) + (byte & node[1]);
+    const auto node = record_at<cp::UnicodeNode>(section_, index * cp::UnicodeNode::kBytes);
+    last = std::min<unsigned>(last, node.highest);
+    for (unsigned byte = std::max<unsigned>(first, node.lowest); byte <= last; ++byte) {
+      const size_t next = node.next(byte);
       const uint32_t longer = code << 8 | byte;
-      if (node[0] == 0) {
+      if (node.leaf == 0) {
         visit(next, longer, 0, 255, left - 1);
       } else if (left == 1) {
         const uint16_t unicode = lx::le16(&section_[values_ + 2 * next]);
@@ -50,35 +49,14 @@ class TrieReader {
   size_t visits_ = 0;
 };
 
-uint32_t page_code(const ObjectFile& object, const uint8_t* page, unsigned byte) {
-  const size_t index = byte & page[1];
-  const size_t low = lx::le16(page + 4) + index, high = lx::le16(page + 6) + index;
-  auto low_byte = [&] { return object.sections[2][low]; };
-  auto low_word = [&] { return lx::le16(&object.sections[2][2 * low]); };
-  switch (page[0]) {
-    case cp::kKindByte:
-      return low_byte();
-    case cp::kKindWord:
-      return low_word();
-    case cp::kKindByteWord:
-      return static_cast<uint32_t>(object.sections[3][high]) << 16 | low_word();
-    case cp::kKindWordWord:
-      return static_cast<uint32_t>(lx::le16(&object.sections[3][2 * high])) << 16 | low_word();
-    case cp::kKindByteByte:
-      return static_cast<uint32_t>(object.sections[3][high]) << 8 | low_byte();
-    default:
-      return 0;
-  }
-}
-
 }  // namespace
 
-CodepageModel unpack_codepage(const ObjectFile& object, const std::string& name) {
+CodepageModel unpack_codepage(const ObjectFile& object, const ObjectName& name) {
   const ByteVector& payload = object.sections[0];
   const uint16_t flags = lx::le16(&payload[cp::kFlags]);
   CodepageModel model;
   CodepageSource& header = model.header;
-  header.name = name;
+  header.name = name.name;
   header.width = payload[cp::kWidth];
   header.kind = (flags & cp::kFlagShift) != 0 ? CodepageClass::kShiftStateful
                 : header.width > 1            ? CodepageClass::kMultiByte
@@ -87,7 +65,7 @@ CodepageModel unpack_codepage(const ObjectFile& object, const std::string& name)
   std::copy_n(&payload[cp::kLineEnds], header.line_ends.size(), header.line_ends.begin());
   header.ascii = (flags & cp::kFlagAscii) != 0;
   std::copy_n(&payload[cp::kLengths], header.leads.size(), header.leads.begin());
-  header.utf8 = is_utf8_object(object);
+  header.utf8 = name.id == cp::kUtf8Id;
   if (header.utf8) {
     fill_utf8(model);
     return model;
@@ -107,11 +85,14 @@ CodepageModel unpack_codepage(const ObjectFile& object, const std::string& name)
       }
     }
   }
+  const auto array = [&](size_t section) {
+    return section < object.sections.size() ? object.sections[section].data() : nullptr;
+  };
   model.from_unicode.assign(0x10000, kNoCode);
   for (unsigned unicode = 0; unicode < 0x10000; ++unicode) {
-    const uint8_t* page = &payload[cp::kPages + cp::kPageBytes * (unicode >> 8)];
+    const auto page = record_at<cp::PageEntry>(payload, cp::kPages + cp::PageEntry::kBytes * (unicode >> 8));
     const unsigned byte = unicode & 0xFF;
-    if (byte >= page[2] && byte <= page[3]) model.from_unicode[unicode] = page_code(object, page, byte);
+    if (page.maps(byte)) model.from_unicode[unicode] = page.code(byte, array(2), array(3));
   }
   settle_substitution(model);
   return model;

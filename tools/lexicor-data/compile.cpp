@@ -16,9 +16,9 @@
 #include "core/lxformat.h"
 #include "language_toml.h"
 #include "line_text.h"
+#include "object_check.h"
 #include "sort_pack.h"
 #include "sort_text.h"
-#include "structure.h"
 #include "territory_toml.h"
 
 namespace lexicor_data {
@@ -48,7 +48,8 @@ ObjectFile pack_source(const CodepageSource& source, const ObjectName& name, con
     throw SourceError(file_name, 1, 1, "the code set name is " + source.name + ", not " + name.name);
   }
   if (source.utf8 != (name.id == format::codepage::kUtf8Id)) {
-    throw SourceError(file_name, 1, 1, "UTF-8, and only UTF-8, has the identifier 57352");
+    throw SourceError(file_name, 1, 1,
+                      "UTF-8, and only UTF-8, has the identifier " + std::to_string(format::codepage::kUtf8Id));
   }
   for (uint32_t byte = 0; source.utf8 && byte < 256; ++byte) {
     const uint8_t length = byte >= 0xC2 && byte <= 0xDF ? 2 : byte >= 0xE0 && byte <= 0xEF ? 3 : 1;
@@ -59,8 +60,8 @@ ObjectFile pack_source(const CodepageSource& source, const ObjectName& name, con
       pack_codepage(to_model(source, file_name, result.left_out), file_name, result.left_out);
   result.retyped_chars = packed.retyped_chars;
   result.type_rows = packed.type_rows;
-  check_codepage_structure(packed.object, file_name);
-  if (!same_mappings(to_source(packed.model), to_source(unpack_codepage(packed.object, name.name)))) {
+  check_object(packed.object, name, file_name);
+  if (!same_mappings(to_source(packed.model), to_source(unpack_codepage(packed.object, name)))) {
     throw std::logic_error(file_name + ": the packed tables do not say what the source says");
   }
   return std::move(packed.object);
@@ -155,7 +156,6 @@ CompiledObject compile_object(std::istream& in, const std::string& file_name, co
       break;
     case ObjectType::kSort:
       object.sections = {pack_sort(read_sort(in, file_name), file_name)};
-      check_sort_structure(object, file_name);
       break;
   }
   object.origin = origin_of(dump_object(object, name, &control, file_name));
@@ -177,23 +177,19 @@ ByteVector compile_control(const Control& control, const std::string& file_name)
 
 std::string dump_object(const ObjectFile& object, const ObjectName& name, const Control* control,
                         const std::string& file_name) {
-  check_container(object, name.type, file_name);
+  check_object(object, name, file_name);
   std::ostringstream out;
   switch (name.type) {
     case ObjectType::kLanguage:
-      check_language_structure(object.sections[0], file_name);
       write_language(out, unpack_language(object.sections[0]), control);
       break;
     case ObjectType::kTerritory:
-      check_territory_structure(object.sections[0], file_name);
       write_territory(out, unpack_territory(object.sections[0]));
       break;
     case ObjectType::kCodepage:
-      check_codepage_structure(object, file_name);
-      write_ucm(out, to_source(unpack_codepage(object, name.name)));
+      write_ucm(out, to_source(unpack_codepage(object, name)));
       break;
     case ObjectType::kSort:
-      check_sort_structure(object, file_name);
       write_sort(out, unpack_sort(object.sections[0]));
       break;
   }

@@ -16,7 +16,7 @@ namespace {
 
 namespace format = lx::format;
 
-constexpr size_t kMaxNameBytes = format::kRecordNameBytes - 1;
+constexpr size_t kMaxNameBytes = sizeof(format::ControlRecord::name) - 1;
 
 std::string lower_ascii(std::string text) {
   for (char& c : text) {
@@ -136,34 +136,29 @@ void write_control(std::ostream& out, const Control& control) {
 ByteVector pack_control(const Control& control) {
   ByteVector table;
   for (const ObjectName& object : control.objects) {
-    ByteVector record(format::kRecordBytes);
-    lx::put_le16(&record[format::kRecordId], object.id);
-    record[format::kRecordType] = static_cast<uint8_t>(object.type);
-    std::copy(object.name.begin(), object.name.end(), record.begin() + format::kRecordName);
-    table.insert(table.end(), record.begin(), record.end());
+    format::ControlRecord record{object.id, static_cast<uint8_t>(object.type)};
+    object.name.copy(record.name, sizeof(record.name));
+    append_record(table, record);
   }
   return table;
 }
 
 Control unpack_control(const ByteVector& section, const std::string& file_name) {
   Control control;
-  if (section.size() % format::kRecordBytes != 0) {
+  if (section.size() % format::ControlRecord::kBytes != 0) {
     throw SourceError(file_name, 0, 0, "the entry table is not a whole number of 38-byte records");
   }
-  for (size_t at = 0; at < section.size(); at += format::kRecordBytes) {
+  for (size_t at = 0; at < section.size(); at += format::ControlRecord::kBytes) {
     auto fail = [&](const std::string& what) {
-      throw SourceError(file_name, 0, 0, "record " + std::to_string(at / format::kRecordBytes) + ": " + what);
+      throw SourceError(file_name, 0, 0,
+                        "record " + std::to_string(at / format::ControlRecord::kBytes) + ": " + what);
     };
-    const uint8_t* record = &section[at];
-    if (record[format::kRecordType] >= format::kTypes) fail("the type is not 0 to 3");
-    if (record[format::kRecordFlags] != 0) fail("the flags byte is not 0");
-    const auto* name = reinterpret_cast<const char*>(record + format::kRecordName);
-    const char* end = std::find(name, name + format::kRecordNameBytes, '\0');
-    if (end == name + format::kRecordNameBytes) fail("the name has no terminator");
-    ObjectName object;
-    object.type = static_cast<ObjectType>(record[format::kRecordType]);
-    object.id = lx::le16(record + format::kRecordId);
-    object.name.assign(name, end);
+    const auto record = record_at<format::ControlRecord>(section, at);
+    if (record.type >= format::kTypes) fail("the type is not 0 to 3");
+    if (record.flags != 0) fail("the flags byte is not 0");
+    const size_t name_bytes = strnlen(record.name, sizeof(record.name));
+    if (name_bytes == sizeof(record.name)) fail("the name has no terminator");
+    ObjectName object{static_cast<ObjectType>(record.type), record.id, {record.name, name_bytes}, 0};
     if (object.id == 0) fail("the identifier is 0");
     const std::string fault = name_fault(object.type, object.name);
     if (!fault.empty()) fail(fault);

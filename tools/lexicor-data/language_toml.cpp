@@ -92,17 +92,18 @@ void append_specials(ByteVector& payload, size_t count_word, size_t offset_word,
   put_word(payload, count_word, specials.size());
   put_word(payload, offset_word, payload.size());
   for (const SpecialMapping& special : specials) {
-    for (char16_t unit : special.from) append_le16(payload, unit);
-    for (char16_t unit : special.to) append_le16(payload, unit);
+    append_record(payload,
+                  lang::SpecialMapping{special.from[0], special.from[1], special.to[0], special.to[1]});
   }
 }
 
 std::vector<SpecialMapping> specials_at(const ByteVector& payload, size_t count_word, size_t offset_word) {
   std::vector<SpecialMapping> specials(word_at(payload, count_word));
-  const uint8_t* at = payload.data() + word_at(payload, offset_word);
+  size_t at = word_at(payload, offset_word);
   for (SpecialMapping& special : specials) {
-    for (char16_t& unit : special.from) unit = lx::le16(at), at += 2;
-    for (char16_t& unit : special.to) unit = lx::le16(at), at += 2;
+    const auto record = record_at<lang::SpecialMapping>(payload, at);
+    special = {{record.first, record.second}, {record.result1, record.result2}};
+    at += record.kBytes;
   }
   return specials;
 }

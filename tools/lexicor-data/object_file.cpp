@@ -41,22 +41,22 @@ bool is_own_origin(const std::string& origin) {
 
 ByteVector write_object(const ObjectFile& object) {
   if (object.sections.empty() || object.sections.size() > format::kMaxSections ||
-      object.origin.size() > format::kHeaderUnreadBytes) {
+      object.origin.size() > sizeof(format::Header::origin)) {
     throw std::logic_error("an object has 1 to 4 sections and a short origin");
   }
   ByteVector out(format::kHeaderBytes);
-  lx::put_le32(&out[format::kHeaderMagic], format::kMagic);
-  lx::put_le32(&out[format::kHeaderFormat], object.version << format::kFormatVersionShift);
-  lx::put_le16(&out[format::kHeaderSections], static_cast<uint16_t>(object.sections.size()));
-  std::memcpy(&out[format::kHeaderUnread], object.origin.data(), object.origin.size());
+  format::Header header;
+  header.format = object.version << format::Header::kVersionShift;
+  header.sections = static_cast<uint16_t>(object.sections.size());
+  object.origin.copy(header.origin, sizeof(header.origin));
   for (size_t i = 0; i < object.sections.size(); ++i) {
     const ByteVector& section = object.sections[i];
     if (section.size() > format::kMaxSectionBytes) throw std::logic_error("a section is too large");
     while (out.size() % 4 != 0) out.push_back(0);
-    lx::put_le16(&out[format::header_section_size(i)], static_cast<uint16_t>(section.size()));
-    lx::put_le32(&out[format::header_section_offset(i)], static_cast<uint32_t>(out.size()));
+    header.section[i] = {static_cast<uint16_t>(section.size()), static_cast<uint32_t>(out.size())};
     out.insert(out.end(), section.begin(), section.end());
   }
+  header.write(out.data());
   return out;
 }
 
@@ -64,22 +64,19 @@ ObjectFile read_object(const ByteVector& bytes, const std::string& file_name) {
   auto fail = [&](const std::string& what) { throw SourceError(file_name, 0, 0, what); };
   if (bytes.empty()) fail("the file is empty");
   if (bytes.size() < format::kHeaderBytes) fail("shorter than the 76-byte header");
-  if (lx::le32(&bytes[format::kHeaderMagic]) != format::kMagic) fail("the magic number is wrong");
+  const format::Header header = format::Header::read(bytes.data());
+  if (header.magic != format::kMagic) fail("the magic number is wrong");
   ObjectFile object;
-  object.version = lx::le32(&bytes[format::kHeaderFormat]) >> format::kFormatVersionShift;
-  const size_t count = lx::le16(&bytes[format::kHeaderSections]);
-  if (count < 1 || count > format::kMaxSections) fail("the section count is not 1 to 4");
+  object.version = header.version();
+  if (header.sections < 1 || header.sections > format::kMaxSections) fail("the section count is not 1 to 4");
   const lx::Bytes file{bytes.data(), bytes.size()};
-  for (size_t i = 0; i < count; ++i) {
-    const size_t size = lx::le16(&bytes[format::header_section_size(i)]);
-    const size_t offset = lx::le32(&bytes[format::header_section_offset(i)]);
-    if (!file.holds(offset, size)) fail("section " + std::to_string(i) + " lies outside the file");
-    const uint8_t* begin = bytes.data() + offset;
-    object.sections.emplace_back(begin, begin + size);
+  for (size_t i = 0; i < header.sections; ++i) {
+    const format::Header::Section& place = header.section[i];
+    if (!file.holds(place.offset, place.bytes)) fail("section " + std::to_string(i) + " lies outside the file");
+    const uint8_t* begin = bytes.data() + place.offset;
+    object.sections.emplace_back(begin, begin + place.bytes);
   }
-  for (size_t i = 0; i < format::kHeaderUnreadBytes && bytes[format::kHeaderUnread + i] != 0; ++i) {
-    object.origin.push_back(static_cast<char>(bytes[format::kHeaderUnread + i]));
-  }
+  object.origin.assign(header.origin, strnlen(header.origin, sizeof(header.origin)));
   return object;
 }
 

@@ -35,6 +35,17 @@ ByteVector read_file(const std::string& path);
 /// Writes under a temporary name and renames, so that an interrupted run leaves no half file.
 void write_file(const std::string& path, const ByteVector& bytes);
 
+/// A record of the format behind the others, and the one at an offset.
+template <class Record>
+void append_record(ByteVector& out, const Record& record) {
+  out.resize(out.size() + Record::kBytes);
+  record.write(&out[out.size() - Record::kBytes]);
+}
+template <class Record>
+Record record_at(const ByteVector& bytes, size_t offset) {
+  return Record::read(&bytes[offset]);
+}
+
 inline void append_le16(ByteVector& out, uint16_t v) {
   out.push_back(static_cast<uint8_t>(v));
   out.push_back(static_cast<uint8_t>(v >> 8));

@@ -3,9 +3,11 @@
 #include "sort_pack.h"
 
 #include <algorithm>
+#include <tuple>
 #include <vector>
 
 #include "core/lxbytes.h"
+#include "core/lxformat.h"
 #include "row_packer.h"
 #include "ucm.h"
 
@@ -14,52 +16,36 @@ namespace {
 
 namespace layout = lx::format::sort;
 
-/// A weight record as one number: weight, secondary, tertiary and flags, the lowest bits first.
-using Record = uint64_t;
+/// A weight record that rows can be ordered by.
+struct Record : layout::WeightRecord {
+  auto key() const { return std::tie(flags, tertiary, secondary, weight); }
+  bool operator==(const Record& other) const { return key() == other.key(); }
+  bool operator!=(const Record& other) const { return key() != other.key(); }
+  bool operator<(const Record& other) const { return key() < other.key(); }
+};
 
 uint16_t flags_of(const SortElement& element) {
-  unsigned flags = static_cast<unsigned>(element.char_class) << layout::kWeightClassShift;
-  if (element.count == 2) flags |= layout::kWeightExpansion;
-  if (element.count == 1 && element.sets[0].special != 0) flags |= layout::kWeightSpecial;
+  unsigned flags = static_cast<unsigned>(element.char_class) << layout::WeightRecord::kClassShift;
+  if (element.count == 2) flags |= layout::WeightRecord::kExpansion;
+  if (element.count == 1 && element.sets[0].special != 0) flags |= layout::WeightRecord::kSpecial;
   return static_cast<uint16_t>(flags);
 }
 
-uint16_t weight_of(const SortSet& set) {
-  return set.special != 0 ? set.special : set.primary;
-}
-
 Record record_of(const SortElement& element) {
-  if (element.ignored()) return 0;
-  const Record flags = Record{flags_of(element)} << 32;
-  if (element.count == 2) return flags;
-  const SortSet& set = element.sets[0];
-  return flags | Record{set.tertiary} << 24 | Record{set.secondary} << 16 | weight_of(set);
+  if (element.ignored()) return {};
+  const SortSet set = element.count == 2 ? SortSet{} : element.sets[0];
+  const uint16_t weight = set.special != 0 ? set.special : set.primary;
+  return {{weight, set.secondary, set.tertiary, flags_of(element)}};
 }
 
-void append_record(ByteVector& out, Record record) {
-  for (size_t i = 0; i < layout::kWeightBytes; ++i) out.push_back(static_cast<uint8_t>(record >> 8 * i));
-}
-
-void append_set(ByteVector& out, const SortSet& set) {
-  append_le16(out, set.primary);
-  out.push_back(set.secondary);
-  out.push_back(set.tertiary);
-}
-
-SortSet set_at(const ByteVector& payload, size_t at) {
-  return {lx::le16(&payload[at]), payload[at + 2], payload[at + 3], 0};
-}
-
-/// The weights of a weight record, or of a contraction record behind its characters.
-SortElement element_at(const ByteVector& payload, size_t at) {
+/// The weights of a table page's character, or of a contraction.
+SortElement element_of(const layout::WeightRecord& record) {
   SortElement element;
-  const uint16_t flags = lx::le16(&payload[at + 4]);
-  element.char_class = static_cast<uint8_t>((flags & layout::kWeightClass) >> layout::kWeightClassShift);
-  SortSet& set = element.sets[0];
-  if ((flags & layout::kWeightSpecial) != 0) {
-    set.special = lx::le16(&payload[at]);
+  element.char_class = record.char_class();
+  if (record.is_special()) {
+    element.sets[0].special = record.weight;
   } else {
-    set = set_at(payload, at);
+    element.sets[0] = {record.weight, record.secondary, record.tertiary, 0};
   }
   return element;
 }
@@ -79,7 +65,7 @@ std::vector<Record> pack_rows(const SortSource& sort, std::array<uint16_t, 256>&
     requests.push_back({std::move(row), 0});
     numbers.push_back(number);
   }
-  Packer packer(0);
+  Packer packer(Record{});
   const std::vector<size_t> positions = packer.place(requests);
   for (size_t i = 0; i < numbers.size(); ++i) bases[numbers[i]] = static_cast<uint16_t>(positions[i]);
   return packer.pool();
@@ -92,17 +78,20 @@ constexpr uint8_t kPageFlags[] = {layout::kPageUncovered, 0, layout::kPagePrimar
 ByteVector pack_sort(const SortSource& sort, const std::string& file_name) {
   std::array<uint16_t, 256> bases{};
   ByteVector weights, expansions, contractions;
-  for (Record record : pack_rows(sort, bases)) append_record(weights, record);
+  for (Record record : pack_rows(sort, bases)) append_record<layout::WeightRecord>(weights, record);
   for (const auto& [character, element] : sort.characters) {
     if (element.count != 2) continue;
-    append_le16(expansions, character);
-    for (const SortSet& set : element.sets) append_set(expansions, set);
-    append_le32(expansions, 0);
+    layout::Expansion record{character};
+    for (size_t i = 0; i < element.sets.size(); ++i) {
+      const SortSet& set = element.sets[i];
+      record.sets[i] = {set.primary, set.secondary, set.tertiary};
+    }
+    append_record(expansions, record);
   }
   for (const auto& [pair, element] : sort.contractions) {
-    append_le16(contractions, pair.first);
-    append_le16(contractions, pair.second);
-    append_record(contractions, Record{flags_of(element)} << 32 | record_of(element));
+    layout::Contraction record{pair.first, pair.second, record_of(element)};
+    record.weights.flags = flags_of(element);
+    append_record(contractions, record);
   }
 
   const size_t bytes = layout::kFixedBytes + weights.size() + expansions.size() + contractions.size();
@@ -116,14 +105,13 @@ ByteVector pack_sort(const SortSource& sort, const std::string& file_name) {
   payload[layout::kDefaultSecondary] = sort.default_secondary;
   payload[layout::kDefaultTertiary] = sort.default_tertiary;
   auto put = [&](size_t at, size_t value) { lx::put_le16(&payload[at], static_cast<uint16_t>(value)); };
-  put(layout::kExpansionCount, expansions.size() / layout::kExpansionBytes);
-  put(layout::kContractionCount, contractions.size() / layout::kContractionBytes);
+  put(layout::kExpansionCount, expansions.size() / layout::Expansion::kBytes);
+  put(layout::kContractionCount, contractions.size() / layout::Contraction::kBytes);
   for (size_t number = 0; number < sort.pages.size(); ++number) {
     const SortPage& page = sort.pages[number];
-    const size_t at = layout::kPages + layout::kPageBytes * number;
-    payload[at] = kPageFlags[static_cast<size_t>(page.kind)];
-    if (page.computed()) payload[at + 1] = page.char_class;
-    put(at + 2, page.computed() ? page.base : bases[number]);
+    layout::Page record{kPageFlags[static_cast<size_t>(page.kind)], 0, bases[number]};
+    if (page.computed()) record = {record.flags, page.char_class, page.base};
+    record.write(&payload[layout::kPages + layout::Page::kBytes * number]);
   }
   const struct {
     size_t field;
@@ -142,41 +130,43 @@ SortSource unpack_sort(const ByteVector& payload) {
   sort.default_secondary = payload[layout::kDefaultSecondary];
   sort.default_tertiary = payload[layout::kDefaultTertiary];
   auto word = [&](size_t at) { return size_t{lx::le16(&payload[at])}; };
-  std::map<char16_t, size_t> expansions;
+  std::map<char16_t, layout::Expansion> expansions;
   for (size_t i = 0; i < word(layout::kExpansionCount); ++i) {
-    const size_t at = word(layout::kExpansions) + i * layout::kExpansionBytes;
-    expansions.emplace(static_cast<char16_t>(word(at)), at);
+    const size_t at = word(layout::kExpansions) + i * layout::Expansion::kBytes;
+    const auto record = record_at<layout::Expansion>(payload, at);
+    expansions.emplace(static_cast<char16_t>(record.character), record);
   }
   for (size_t number = 0; number < sort.pages.size(); ++number) {
-    const size_t at = layout::kPages + layout::kPageBytes * number;
+    const auto entry = record_at<layout::Page>(payload, layout::kPages + layout::Page::kBytes * number);
     SortPage& page = sort.pages[number];
-    const uint8_t flags = payload[at];
-    page.kind = (flags & layout::kPageUncovered) != 0 ? SortPageKind::kUncovered
-                : (flags & layout::kPagePrimary) != 0 ? SortPageKind::kPrimary
-                : (flags & layout::kPageSpecial) != 0 ? SortPageKind::kSpecial
-                                                      : SortPageKind::kTable;
+    page.kind = (entry.flags & layout::kPageUncovered) != 0 ? SortPageKind::kUncovered
+                : (entry.flags & layout::kPagePrimary) != 0 ? SortPageKind::kPrimary
+                : (entry.flags & layout::kPageSpecial) != 0 ? SortPageKind::kSpecial
+                                                            : SortPageKind::kTable;
     if (page.computed()) {
-      page.base = static_cast<uint16_t>(word(at + 2));
-      page.char_class = payload[at + 1] & kAppendAll;
+      page.base = entry.base;
+      page.char_class = entry.char_class & kAppendAll;
     }
     if (page.kind != SortPageKind::kTable) continue;
     for (size_t low = 0; low < 256; ++low) {
       const auto character = static_cast<char16_t>(number << 8 | low);
-      const size_t record = word(layout::kWeights) + (word(at + 2) + low) * layout::kWeightBytes;
-      SortElement element = element_at(payload, record);
-      if ((word(record + 4) & layout::kWeightExpansion) != 0) {
-        const size_t expansion = expansions.at(character);
+      const auto record = record_at<layout::WeightRecord>(
+          payload, word(layout::kWeights) + (entry.base + low) * layout::WeightRecord::kBytes);
+      SortElement element = element_of(record);
+      if (record.is_expansion()) {
         element.count = 2;
-        element.sets = {set_at(payload, expansion + 2), set_at(payload, expansion + 6)};
+        for (size_t i = 0; i < element.sets.size(); ++i) {
+          const layout::Expansion::Set& set = expansions.at(character).sets[i];
+          element.sets[i] = {set.primary, set.secondary, set.tertiary, 0};
+        }
       }
       if (!element.ignored()) sort.characters.emplace(character, element);
     }
   }
   for (size_t i = 0; i < word(layout::kContractionCount); ++i) {
-    const size_t at = word(layout::kContractions) + i * layout::kContractionBytes;
-    sort.contractions.emplace(
-        std::make_pair(static_cast<char16_t>(word(at)), static_cast<char16_t>(word(at + 2))),
-        element_at(payload, at + 4));
+    const auto record =
+        record_at<layout::Contraction>(payload, word(layout::kContractions) + i * layout::Contraction::kBytes);
+    sort.contractions.emplace(std::make_pair(record.first, record.second), element_of(record.weights));
   }
   return sort;
 }

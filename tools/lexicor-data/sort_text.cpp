@@ -25,10 +25,10 @@ struct LevelName {
   uint8_t bit;
 };
 constexpr LevelName kLevels[] = {
-    {"primary", lx::format::sort::kAppendPrimary},
-    {"secondary", lx::format::sort::kAppendSecondary},
-    {"tertiary", lx::format::sort::kAppendTertiary},
-    {"special", lx::format::sort::kAppendSpecial},
+    {"primary", LX_APPEND_PRIMARY},
+    {"secondary", LX_APPEND_SECONDARY},
+    {"tertiary", LX_APPEND_TERTIARY},
+    {"special", LX_APPEND_SPECIAL},
 };
 constexpr const char* kNoLevels = "none";
 

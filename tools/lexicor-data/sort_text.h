@@ -30,12 +30,12 @@
 #include <string>
 #include <utility>
 
-#include "core/lxformat.h"
+#include "lx/collate.h"
 
 namespace lexicor_data {
 
-inline constexpr uint8_t kAppendAll = lx::format::sort::kAppendPrimary | lx::format::sort::kAppendSecondary |
-                                      lx::format::sort::kAppendTertiary | lx::format::sort::kAppendSpecial;
+inline constexpr uint8_t kAppendAll =
+    LX_APPEND_PRIMARY | LX_APPEND_SECONDARY | LX_APPEND_TERTIARY | LX_APPEND_SPECIAL;
 
 /// Where a source says something, 1-based; 0: nowhere, as it was read from an object.
 struct SortPlace {

@@ -10,16 +10,16 @@
 
 #include "byte_tree.h"
 #include "codepage/lxunicode.h"
+#include "core/lxformat.h"
 #include "row_packer.h"
 
 namespace lexicor_data {
 namespace {
 
-/// A node of either trie; the type trie's has no range.
-struct TrieNode {
-  uint8_t leaf = 0, mask = 0, lowest = 0, highest = 0;
-  uint16_t base = 0;
+namespace cp = lx::format::codepage;
 
+/// A node of either trie; the type trie's has no range.
+struct TrieNode : cp::UnicodeNode {
   auto key() const { return std::tie(leaf, mask, lowest, highest, base); }
   bool operator==(const TrieNode& other) const { return key() == other.key(); }
   bool operator!=(const TrieNode& other) const { return key() != other.key(); }
@@ -134,9 +134,9 @@ class TypeRecords {
   uint32_t of(uint32_t code, uint16_t unicode) {
     const uint32_t type = lx::unicode_type(unicode);
     uint16_t other = unicode;
-    if (type & kUpper) {
+    if (type & LX_C1_UPPER) {
       other = lx::unicode_lower(unicode);
-    } else if (type & kLower) {
+    } else if (type & LX_C1_LOWER) {
       other = lx::unicode_upper(unicode);
     }
     const uint32_t other_code = other == unicode ? kNoCode : model_.round_trip(other);
@@ -144,25 +144,20 @@ class TypeRecords {
     return number(type, has_other ? other_code - code : 0);
   }
 
-  bool is_assigned(uint32_t number) const { return records_[number] >> 32 != lx::kTypeUnassigned; }
+  bool is_assigned(uint32_t number) const { return records_[number].type != lx::kTypeUnassigned; }
 
-  void append_to(ByteVector& out, uint32_t number) const {
-    append_le32(out, static_cast<uint32_t>(records_[number] >> 32));
-    append_le32(out, static_cast<uint32_t>(records_[number]));
-  }
+  void append_to(ByteVector& out, uint32_t number) const { append_record(out, records_[number]); }
 
  private:
-  static constexpr uint32_t kUpper = 0x002, kLower = 0x004;  // type 1 bits
-
   uint32_t number(uint32_t type, uint32_t delta) {
-    const uint64_t record = static_cast<uint64_t>(type) << 32 | delta;
-    const auto [entry, is_new] = numbers_.try_emplace(record, static_cast<uint32_t>(records_.size()));
-    if (is_new) records_.push_back(record);
+    const uint64_t key = static_cast<uint64_t>(type) << 32 | delta;
+    const auto [entry, is_new] = numbers_.try_emplace(key, static_cast<uint32_t>(records_.size()));
+    if (is_new) records_.push_back({type, delta});
     return entry->second;
   }
 
   const CodepageModel& model_;
-  std::vector<uint64_t> records_;
+  std::vector<cp::TypeRecord> records_;
   std::unordered_map<uint64_t, uint32_t> numbers_;
 };
 
@@ -227,8 +222,7 @@ UnicodeTrie build_unicode_trie(const CodepageModel& model) {
       });
   UnicodeTrie trie;
   for (const TrieNode& node : nodes) {
-    trie.section.insert(trie.section.end(), {node.leaf, node.mask, node.lowest, node.highest});
-    append_le16(trie.section, node.base);
+    append_record(trie.section, cp::UnicodeNode(node));
   }
   trie.values_offset = trie.section.size();
   for (uint16_t value : values.pool()) append_le16(trie.section, value);
@@ -274,8 +268,7 @@ TypeTrie build_type_trie(const CodepageModel& model, TypeRows rows) {
   });
 
   for (const TrieNode& node : nodes) {
-    trie.nodes.insert(trie.nodes.end(), {node.leaf, node.mask});
-    append_le16(trie.nodes, node.base);
+    append_record(trie.nodes, cp::TypeNode{node.leaf, node.mask, node.base});
   }
   for (uint32_t number : records.pool()) types.append_to(trie.records, number);
   return trie;

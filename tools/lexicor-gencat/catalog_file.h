@@ -5,7 +5,7 @@
 #include <map>
 #include <string>
 
-#include "core/lxformat.h"
+#include "core/lxcatformat.h"
 
 namespace lexicor_gencat {
 

@@ -26,7 +26,7 @@ class Codepage {
   const LXObject* object() const { return object_; }
   const std::string& name() const { return name_; }
   unsigned id() const { return id_; }
-  bool utf8() const { return id_ == kUtf8Id; }
+  bool utf8() const { return id_ == LX_CODEPAGE_UTF8; }
 
   bool shift_sensitive() const { return shift_sensitive_; }
   /// Whether a byte is Shift-Out or Shift-In.
@@ -46,8 +46,6 @@ class Codepage {
   size_t whole_bytes(const char* text, size_t bytes, LXShiftState state, LXShiftState* end_state) const;
 
  private:
-  static constexpr unsigned kUtf8Id = 57352;
-
   void learn_shift_bytes();
 
   std::string name_;

@@ -420,8 +420,7 @@ class Importer {
   }
 
   uint8_t char_class() const {
-    return collator_.backwards() ? lexicor_data::kAppendAll & ~lx::format::sort::kAppendSecondary
-                                 : lexicor_data::kAppendAll;
+    return collator_.backwards() ? lexicor_data::kAppendAll & ~LX_APPEND_SECONDARY : lexicor_data::kAppendAll;
   }
 
   uint16_t number_of(const Primary& primary) const {
