@@ -43,6 +43,10 @@ const uint8_t* type_record_of_code(const Codepage& cp, uint32_t code) {
   return type_record(cp, bytes);
 }
 
+uint32_t other_case(const uint8_t* record, uint32_t code, uint32_t mask) {
+  return record != nullptr && (le32(record) & mask) != 0 ? code + le32(record + 4) : code;
+}
+
 Specials specials_of(const LXObject& language, bool upper) {
   namespace words = format::language;
   const uint8_t* payload = payload_of(language);

@@ -1,8 +1,8 @@
 // Copying and concatenation of strings by whole characters: what fits, and never a part of one.
 #include <cstring>
 
-#include "text/lxcursor.h"
 #include "core/lxcall.h"
+#include "text/lxcursor.h"
 
 namespace {
 
