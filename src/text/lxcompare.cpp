@@ -142,12 +142,12 @@ CountedText<uint8_t> upper(LXLocale* locale, Form form, const CountedText<uint8_
   return {out + shifted, static_cast<size_t>(written - shifted)};
 }
 
-template <class Unit, class AnyText>
-int32_t compare_mapped(Call& call, Form form, const AnyText& a, const AnyText& b) {
+template <class Unit>
+int32_t compare_mapped(Call& call, Form form, const CountedText<Unit>& a, const CountedText<Unit>& b) {
   // Functions that map and swap count in 32 bits, bytes too.
   constexpr size_t kMostUnits = INT32_MAX / sizeof(Unit) - 1;
   if (a.units > kMostUnits || b.units > kMostUnits) return call.fail(LX_E_MEMORY, 0);
-  const auto bytes_for = [](const AnyText& text) {
+  const auto bytes_for = [](const CountedText<Unit>& text) {
     return (static_cast<size_t>(upper_units(text)) + copy_units(text)) * sizeof(Unit);
   };
   const lx::WorkBuffer a_buffer(bytes_for(a));
@@ -216,8 +216,7 @@ int32_t compare_bytes(LXLocale* given, Form form, const char* text1, LXShiftStat
   }
   lx::dump_texts(unit, a, b);
   if (a.units == 0 || b.units == 0) return call.exit(length_difference(a, b));
-  if (fold == Fold::kCase && has_special_upper(*call.locale()))
-    return compare_mapped<uint8_t>(call, form, a, b);
+  if (fold == Fold::kCase && has_special_upper(*call.locale())) return compare_mapped(call, form, a, b);
   const bool single = form == Form::kPlain && cp.single_byte;
   if (fold == Fold::kNone || (single && fold == Fold::kWidth)) return call.exit(compare_units(a, b, Exact{}));
   if (single) return call.exit(compare_units(a, b, ByteCase{lx::lower_table(cp)}));
@@ -276,7 +275,7 @@ int32_t compare_text(LXLocale* given, const Unit* text1, int32_t length1, const 
   if (Rules::kTraced) lx::dump_texts(unit, a, b);
   if (a.units == 0 || b.units == 0) return call.exit(length_difference(a, b));
   if (fold == Fold::kNone) return call.exit(compare_units(a, b, Exact{}));
-  if (fold == Fold::kCase && has_special_upper(locale)) return compare_mapped<Unit>(call, Form::kPlain, a, b);
+  if (fold == Fold::kCase && has_special_upper(locale)) return compare_mapped(call, Form::kPlain, a, b);
   return call.exit(compare_units(a, b, Rules::folding(codepage_of(call.codepage()), fold)));
 }
 
