@@ -1,8 +1,10 @@
 // Collation beside ICU and, where the system has the locale, glibc: words compared in random pairs and with
-// their neighbours in sorted order, sorted, and made into keys.
+// their neighbours in sorted order, sorted, and made into keys. Comparison by code value and search stand
+// beside them, on the same words.
 #include <locale.h>
 #include <string.h>
 #include <unicode/ucol.h>
+#include <unicode/ustring.h>
 
 #include <algorithm>
 #include <cstdio>
@@ -57,6 +59,9 @@ struct Library {
   const char* name;
   Compare utf16, utf8;  // null: it cannot
   std::function<size_t(const Word&, char*)> key;
+  Compare caseless;  // by code value, UTF-16
+  /// Looks for a word in a text.
+  std::function<bool(const std::u16string& text, const Word&)> find;
 };
 
 int32_t length(size_t n) {
@@ -71,20 +76,28 @@ std::vector<Library> libraries_of(const Text& text) {
   std::vector<Library> libraries;
   const std::shared_ptr<LXLocale> locale(LXGetLocale(text.locale, 0, nullptr), LXReleaseLocale);
   if (locale == nullptr) return libraries;
-  libraries.push_back({kOurs,
-                       [locale](const Word& a, const Word& b) {
-                         return LXStrcollU(locale.get(), lx_units(a), length(a.units.size()), lx_units(b),
-                                           length(b.units.size()), 0);
-                       },
-                       [locale](const Word& a, const Word& b) {
-                         return LXStrcoll(locale.get(), a.utf8.data(), length(a.utf8.size()), b.utf8.data(),
-                                          length(b.utf8.size()), 0);
-                       },
-                       [locale](const Word& word, char* out) {
-                         return static_cast<size_t>(LXStrxfrmU(locale.get(), reinterpret_cast<uint8_t*>(out),
-                                                               kKeyBytes, lx_units(word),
-                                                               length(word.units.size()), 0));
-                       }});
+  libraries.push_back(
+      {kOurs,
+       [locale](const Word& a, const Word& b) {
+         return LXStrcollU(locale.get(), lx_units(a), length(a.units.size()), lx_units(b),
+                           length(b.units.size()), 0);
+       },
+       [locale](const Word& a, const Word& b) {
+         return LXStrcoll(locale.get(), a.utf8.data(), length(a.utf8.size()), b.utf8.data(),
+                          length(b.utf8.size()), 0);
+       },
+       [locale](const Word& word, char* out) {
+         return static_cast<size_t>(LXStrxfrmU(locale.get(), reinterpret_cast<uint8_t*>(out), kKeyBytes,
+                                               lx_units(word), length(word.units.size()), 0));
+       },
+       [locale](const Word& a, const Word& b) {
+         return LXStrcmpU(locale.get(), lx_units(a), length(a.units.size()), lx_units(b),
+                          length(b.units.size()), LX_CASE_INSENSITIVE);
+       },
+       [locale](const std::u16string& all, const Word& word) {
+         return LXStrstrU(locale.get(), reinterpret_cast<const LXUChar*>(all.data()), length(all.size()),
+                          lx_units(word), length(word.units.size()), 0) != nullptr;
+       }});
   UErrorCode error = U_ZERO_ERROR;
   const std::shared_ptr<UCollator> icu(ucol_open(text.icu, &error), ucol_close);
   // The order that the shipped sorts have: punctuation counts only where all else is equal.
@@ -104,12 +117,21 @@ std::vector<Library> libraries_of(const Text& text) {
        [icu](const Word& word, char* out) {
          return static_cast<size_t>(ucol_getSortKey(icu.get(), word.units.data(), length(word.units.size()),
                                                     reinterpret_cast<uint8_t*>(out), kKeyBytes));
+       },
+       [](const Word& a, const Word& b) {
+         UErrorCode failed = U_ZERO_ERROR;
+         return static_cast<int>(u_strCaseCompare(a.units.data(), length(a.units.size()), b.units.data(),
+                                                  length(b.units.size()), U_FOLD_CASE_DEFAULT, &failed));
+       },
+       [](const std::u16string& all, const Word& word) {
+         return u_strFindFirst(all.data(), length(all.size()), word.units.data(), length(word.units.size())) !=
+                nullptr;
        }});
   if (const locale_t system = newlocale(LC_COLLATE_MASK | LC_CTYPE_MASK, text.glibc, nullptr)) {
     libraries.push_back(
         {kGlibc, nullptr,
          [system](const Word& a, const Word& b) { return strcoll_l(a.utf8.c_str(), b.utf8.c_str(), system); },
-         nullptr});
+         nullptr, nullptr, nullptr});
   }
   return libraries;
 }
@@ -173,8 +195,10 @@ Peer optional_peer(Peer peer, bool there) {
 }  // namespace
 
 void add_collation_rows(std::vector<Row>* rows, const std::string& filter) {
-  if (std::string("collate/").find(filter) == std::string::npos && filter.find("collate") == std::string::npos)
-    return;
+  const auto wanted = [&](const std::string& family) {
+    return family.find(filter) != std::string::npos || filter.find(family) != std::string::npos;
+  };
+  if (!wanted("collate") && !wanted("compare") && !wanted("find")) return;
   Rows table(rows, filter);
   for (const Text& text : kTexts) {
     const std::vector<Library> libraries = libraries_of(text);
@@ -197,6 +221,19 @@ void add_collation_rows(std::vector<Row>* rows, const std::string& filter) {
     }
     table.add(stem + "sort_utf8", every, libraries, [&](const Library& l) {
       return optional_peer(sort_peer(l.name, every, l.utf8), l.utf8 != nullptr);
+    });
+    table.add(std::string("compare/") + text.label + "/caseless_utf16", sorted, libraries,
+              [&](const Library& l) {
+                return optional_peer(compare_peer(l.name, sorted, l.caseless), l.caseless != nullptr);
+              });
+    table.add(std::string("find/") + text.label + "/utf16", random, libraries, [&](const Library& l) {
+      return optional_peer({l.name,
+                            [random, find = l.find](char*) {
+                              std::u16string joined;
+                              for (const Word& word : *random) joined += word.units;
+                              return size_t{1} + find(joined, {u"not to be found", ""});
+                            }},
+                           l.find != nullptr);
     });
     table.add(stem + "keys", random, libraries, [&](const Library& l) {
       return optional_peer({l.name,

@@ -180,6 +180,9 @@ inline size_t store_unicode(const Codepage& cp, uint16_t u, uint8_t* p) {
 const uint8_t* type_record(const Codepage& cp, const uint8_t* p);
 const uint8_t* type_record_of_code(const Codepage& cp, uint32_t code);
 
+/// A packed code in the other case, when its type record, if it has one, has a bit of the mask; else the code.
+uint32_t other_case(const uint8_t* record, uint32_t code, uint32_t mask);
+
 /// A language's special mappings of one direction.
 struct Specials {
   const uint8_t* entries;

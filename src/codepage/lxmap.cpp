@@ -74,12 +74,6 @@ uint16_t ascii_digit(uint16_t u) {
   return (lx::unicode_type(u) & LX_C1_DIGIT) != 0 ? lx::unicode_digit(u) : 0;
 }
 
-/// A packed code in the other case, when its type record has a bit of the mask; else the code.
-uint32_t other_case(const uint8_t* record, uint32_t code, uint32_t mask) {
-  if (record == nullptr) return code;
-  const auto type = lx::format::codepage::TypeRecord::read(record);
-  return (type.type & mask) != 0 ? code + type.case_delta : code;
-}
 
 // Mappers: what one character maps to by itself. alone() is false when it stays as it is.
 
@@ -312,7 +306,7 @@ int32_t store_other_case(const Codepage& cp, const char* text, size_t length, ch
   uint8_t bytes[lx::kMaxCharBytes] = {};
   memcpy(bytes, text, length);
   const uint32_t code = lx::pack(bytes, length);
-  const uint32_t other = other_case(lx::type_record(cp, bytes), code, mask);
+  const uint32_t other = lx::other_case(lx::type_record(cp, bytes), code, mask);
   if (other != code && lx::code_bytes(other) <= cp.width)
     return static_cast<int32_t>(lx::store_packed(bytes_of(output), other));
   memmove(output, text, length);
@@ -341,7 +335,7 @@ LXUChar LXUnicodeToF2H(LXLocale* locale, LXUChar unicode) {
 
 LXWChar LXCpMbCaseConvW(const LXObject* codepage, LXWChar code, uint32_t mask) {
   if (!lx::initialized()) return code;
-  return other_case(lx::type_record_of_code(codepage_of(*codepage), code), code, mask);
+  return lx::other_case(lx::type_record_of_code(codepage_of(*codepage), code), code, mask);
 }
 
 int32_t LXCpMbCaseConv(const LXObject* codepage, const char* text, char* output, uint32_t mask) {

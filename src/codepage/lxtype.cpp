@@ -46,6 +46,12 @@ const uint8_t* type_record_of_code(const Codepage& cp, uint32_t code) {
   return type_record(cp, bytes);
 }
 
+uint32_t other_case(const uint8_t* record, uint32_t code, uint32_t mask) {
+  if (record == nullptr) return code;
+  const auto type = fmt::TypeRecord::read(record);
+  return (type.type & mask) != 0 ? code + type.case_delta : code;
+}
+
 Specials specials_of(const LXObject& language, bool upper) {
   namespace words = format::language;
   const uint8_t* payload = payload_of(language);

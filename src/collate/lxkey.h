@@ -2,28 +2,23 @@
 #pragma once
 
 #include "collate/lxlevels.h"
-#include "core/lxrecords.h"
+#include "text/lxfold.h"
 
 namespace lx {
 
-enum class Fold { kNone, kCase, kWidth };
-
-/// False for options that keys do not know.
-bool fold_of(uint32_t options, Fold* fold);
-
 /// What a character is folded to, and the special mappings that come first.
 struct Folding {
-  const LXObject& codepage;
   const Codepage& cp;
   Fold fold;
   Specials specials;  // none unless case is folded and the language has some
 
   Folding(const LXLocale& locale, Fold fold);
 
-  uint16_t unicode(LXWChar code) const { return code_to_unicode(cp, code); }
-  uint16_t unicode(LXUChar u) const { return u; }
-  uint16_t folded(LXWChar code) const;
-  uint16_t folded(LXUChar u) const;
+  LXUChar folded(LXWChar code) const {
+    if (fold == Fold::kCase) return unicode_of(cp, small_letter(cp, code));
+    return unicode_of(cp, code <= 0xFF ? code : half_width(cp, code));
+  }
+  LXUChar folded(LXUChar u) const { return fold == Fold::kCase ? capital(cp, u) : half_width(cp, u); }
 
   /// How many characters a text of `units` units can have when it is folded.
   size_t most_chars(size_t units) const { return specials.count != 0 ? 2 * units : units; }
@@ -33,9 +28,9 @@ struct Folding {
 template <class In>
 struct FoldCursor {
   using Unit = uint8_t;
-  static constexpr bool kOneUnit = false, kShifts = false, kUnicode = false;
+  static constexpr bool kOneUnit = false;
   static constexpr bool kRuns = false;
-  using Char = std::conditional_t<In::kUnicode, LXUChar, LXWChar>;
+  using Char = typename CharOf<typename In::Unit>::Type;
 
   const Folding& folding;
   In in;
@@ -62,12 +57,12 @@ struct FoldCursor {
 
  private:
   bool special(Char c, LXUChar* u) {
-    const uint16_t value = folding.unicode(c);
+    const uint16_t value = unicode_of(folding.cp, c);
     int32_t results = folding.specials.find(value, 0, u, &second);
     if (results == 0) {
       has_ahead = in.next(&ahead);
       if (!has_ahead) return false;
-      results = folding.specials.find(value, folding.unicode(ahead), u, &second);
+      results = folding.specials.find(value, unicode_of(folding.cp, ahead), u, &second);
       if (results != 0) has_ahead = false;
     }
     has_second = results == 2;

@@ -1,4 +1,4 @@
-// The weights of a text, level by level, as keys and the full comparison need them.
+// The weights of a text laid out level by level, as keys need them, and comparison where weights are inserted.
 #pragma once
 
 #include "codepage/lxtext.h"
@@ -18,9 +18,10 @@ struct Level {
   explicit Level(void* space) : begin(static_cast<Weight*>(space)), run(begin), end(begin) {}
 
   size_t count() const { return static_cast<size_t>(end - begin); }
-  void add(Weight weight, bool append) {
+  void add(uint32_t weight, bool append) {
+    if (weight == 0) return;
     if (append) close_run();
-    *end++ = weight;
+    *end++ = static_cast<Weight>(weight);
     if (append) run = end;
   }
   void close_run() {
@@ -33,32 +34,31 @@ struct Level {
   }
 };
 
-struct PlacedSpecial {
-  uint16_t position;
-  uint16_t weight;
-};
-
 /// The four levels of a text of at most `most_chars` characters, in a space of bytes_for(most_chars) bytes that
 /// is aligned to 4 bytes. The levels stand in the order of a key, a byte between two of them, so that one can
-/// be made of them in place.
+/// be made of them in place:
+///
+///   primaries     |0| secondaries |0| tertiaries |0| up to 3 bytes | specials, each with its position
+///   4 bytes a char    2               2                              4
 struct Levels {
   Level<uint16_t> primaries;
   Level<uint8_t> secondaries;
   Level<uint8_t> tertiaries;
-  Level<PlacedSpecial> specials;
-  size_t chars;  // of the text
+  Level<uint32_t> specials;  // placed_special() of each
+  size_t chars;              // of the text
 
   // A character has up to two weight sets, or one special weight.
   static constexpr size_t kPrimaryBytes = 2 * sizeof(uint16_t);
   static constexpr size_t kByteLevelBytes = 2;
   static constexpr size_t kLevelBytes = kPrimaryBytes + 2 * kByteLevelBytes;
+  static constexpr size_t kSpecialBytes = sizeof(uint32_t);
   static constexpr size_t kSeparators = 3;
 
   static constexpr size_t specials_at(size_t chars) {
     return (chars * kLevelBytes + kSeparators + 3) & ~size_t{3};
   }
-  static constexpr size_t bytes_for(size_t chars) { return specials_at(chars) + chars * sizeof(PlacedSpecial); }
-  static constexpr size_t kMostChars = INT32_MAX / (2 * (kLevelBytes + sizeof(PlacedSpecial)));
+  static constexpr size_t bytes_for(size_t chars) { return specials_at(chars) + chars * kSpecialBytes; }
+  static constexpr size_t kMostChars = INT32_MAX / (2 * (kLevelBytes + kSpecialBytes));
 
   template <class Cursor>
   Levels(const Sort& sort, const Cursor& text, size_t most_chars, uint8_t* space)
@@ -67,7 +67,10 @@ struct Levels {
         tertiaries(secondaries.begin + most_chars * kByteLevelBytes + 1),
         specials(space + specials_at(most_chars)) {
     WeightSets<Cursor> sets(sort, text);
-    for (Element set; sets.next(&set);) place(set, sets.position());
+    while (!sets.at_end()) {
+      const Element set = sets.next();
+      place(set, sets.position());
+    }
     chars = sets.consumed();
     primaries.close_run();
     secondaries.close_run();
@@ -77,14 +80,27 @@ struct Levels {
 
  private:
   void place(const Element& set, uint16_t position) {
-    const auto appends = [&](unsigned bit) { return (set.char_class() & bit) != 0; };
-    if (set.primary() != 0) primaries.add(static_cast<uint16_t>(set.primary()), appends(LX_APPEND_PRIMARY));
-    if (set.secondary() != 0)
-      secondaries.add(static_cast<uint8_t>(set.secondary()), appends(LX_APPEND_SECONDARY));
-    if (set.tertiary() != 0) tertiaries.add(static_cast<uint8_t>(set.tertiary()), appends(LX_APPEND_TERTIARY));
-    if (set.special() != 0)
-      specials.add({position, static_cast<uint16_t>(set.special())}, appends(LX_APPEND_SPECIAL));
+    primaries.add(set.primary(), set.appends(LX_APPEND_PRIMARY));
+    secondaries.add(set.secondary(), set.appends(LX_APPEND_SECONDARY));
+    tertiaries.add(set.tertiary(), set.appends(LX_APPEND_TERTIARY));
+    specials.add(set.placed_special(position), set.appends(LX_APPEND_SPECIAL));
   }
+};
+
+/// Room for the levels of two texts of at most so many characters each; false where there is none.
+struct LevelSpace {
+  WorkBuffer first;
+  WorkBuffer second;
+  bool counted;
+
+  LevelSpace(size_t chars1, size_t chars2)
+      : first(bytes_for(chars1)),
+        second(bytes_for(chars2)),
+        counted(chars1 <= Levels::kMostChars && chars2 <= Levels::kMostChars) {}
+  explicit operator bool() const { return first && second && counted; }
+
+ private:
+  static size_t bytes_for(size_t chars) { return Levels::bytes_for(least(chars, Levels::kMostChars)); }
 };
 
 }  // namespace lx

@@ -10,7 +10,6 @@ namespace {
 
 using lx::bytes_of;
 using lx::Call;
-using lx::Codepage;
 using lx::codepage_of;
 using lx::Form;
 
@@ -55,23 +54,26 @@ int32_t take(const lx::Sort& sort, const Cursor& in, const Step<Unit>& step) {
   return lx::weight_sets(sort, element, step.first, step.second);
 }
 
-/// The frame of all forms: `read(cp, body)` calls `body` with the reader of what is left of the text.
-template <class Unit, class Read>
-int32_t next_weight(LXLocale* given, const Step<Unit>& step, Read read) {
+lx::ByteText text_at(const char* p, LXShiftState state) {
+  return {bytes_of(p), 0, state};
+}
+template <class Unit>
+lx::Text<Unit> text_at(const Unit* p, LXShiftState state) {
+  return {p, 0, state};
+}
+
+/// The frame of all forms.
+template <class Unit>
+int32_t next_weight(LXLocale* given, Form form, const Step<Unit>& step) {
   Call call(unit, given);
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, 0);
   const LXLocale& locale = *call.locale();
   if (locale.sort == nullptr) return call.fail(LX_E_INVALID, 0);
   const lx::Sort& sort = lx::sort_of(*locale.sort);
-  return call.exit(read(codepage_of(*locale.codepage), [&](const auto& in) { return take(sort, in, step); }));
-}
-
-int32_t next_weight_of_bytes(LXLocale* given, const Step<char>& step, Form form) {
-  return next_weight(given, step, [&](const Codepage& cp, auto body) {
-    LXShiftState state = LX_SHIFT_SINGLE;
-    if (step.state != nullptr) state = *step.state;
-    return lx::with_cursor(cp, form, state, bytes_of(*step.text), step.units(), body);
-  });
+  LXShiftState state = LX_SHIFT_SINGLE;
+  if (step.state != nullptr) state = *step.state;
+  return call.exit(lx::with_cursor(codepage_of(*locale.codepage), form, text_at(*step.text, state), step.units(),
+                            [&](const auto& in) { return take(sort, in, step); }));
 }
 
 /// Places `places` values, which are one weight, into a level.
@@ -90,31 +92,27 @@ extern "C" {
 
 int32_t LXStrGetNextWeight(LXLocale* locale, const char** text, int32_t* remaining, uint16_t* counter,
                            LXWeights* first, LXWeights* second, uint8_t* char_class, LXUChar* look_ahead) {
-  return next_weight_of_bytes(
-      locale, {text, nullptr, remaining, counter, first, second, char_class, look_ahead}, Form::kPlain);
+  return next_weight<char>(locale, Form::kPlain,
+                           {text, nullptr, remaining, counter, first, second, char_class, look_ahead});
 }
 
 int32_t LXStrGetNextWeightEx(LXLocale* locale, const char** text, LXShiftState* state, int32_t* remaining,
                              uint16_t* counter, LXWeights* first, LXWeights* second, uint8_t* char_class,
                              LXUChar* look_ahead) {
-  return next_weight_of_bytes(locale, {text, state, remaining, counter, first, second, char_class, look_ahead},
-                              Form::kEx);
+  return next_weight<char>(locale, Form::kEx,
+                           {text, state, remaining, counter, first, second, char_class, look_ahead});
 }
 
 int32_t LXStrGetNextWeightW(LXLocale* locale, const LXWChar** text, int32_t* remaining, uint16_t* counter,
                             LXWeights* first, LXWeights* second, uint8_t* char_class, LXUChar* look_ahead) {
-  const Step<LXWChar> step{text, nullptr, remaining, counter, first, second, char_class, look_ahead};
-  return next_weight(locale, step, [&](const Codepage& cp, auto body) {
-    return body(lx::CodeCursor{cp, *text, *text + step.units()});
-  });
+  return next_weight<LXWChar>(locale, Form::kPlain,
+                              {text, nullptr, remaining, counter, first, second, char_class, look_ahead});
 }
 
 int32_t LXStrGetNextWeightU(LXLocale* locale, const LXUChar** text, int32_t* remaining, uint16_t* counter,
                             LXWeights* first, LXWeights* second, uint8_t* char_class, LXUChar* look_ahead) {
-  const Step<LXUChar> step{text, nullptr, remaining, counter, first, second, char_class, look_ahead};
-  return next_weight(locale, step, [&](const Codepage&, auto body) {
-    return body(lx::UnicodeCursor{*text, *text + step.units()});
-  });
+  return next_weight<LXUChar>(locale, Form::kPlain,
+                              {text, nullptr, remaining, counter, first, second, char_class, look_ahead});
 }
 
 void LXStrInsertWeights(uint16_t primary, uint16_t** primary_insert, uint16_t** primary_end, uint8_t secondary,

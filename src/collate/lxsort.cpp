@@ -46,9 +46,7 @@ Element table_element(const uint8_t* payload, LXUChar u) {
 
 /// Notes what an element of one set inserts. Only weights that it has count.
 void note_set(Sort* sort, const Element& set) {
-  const auto inserts = [&](uint32_t weight, unsigned bit) {
-    return weight != 0 && (set.char_class() & bit) == 0;
-  };
+  const auto inserts = [&](uint32_t weight, unsigned bit) { return weight != 0 && !set.appends(bit); };
   if (inserts(set.primary(), LX_APPEND_PRIMARY)) sort->appends_primaries = false;
   if (inserts(set.primary(), LX_APPEND_PRIMARY) || inserts(set.secondary(), LX_APPEND_SECONDARY) ||
       inserts(set.tertiary(), LX_APPEND_TERTIARY) || inserts(set.special(), LX_APPEND_SPECIAL))
@@ -140,6 +138,17 @@ void fill_pairs(Sort* sort, Pair* pairs) {
   }
 }
 
+void note_alone(Sort* sort) {
+  for (size_t page = 0; page < kPages; ++page) {
+    for (size_t low = 0; sort->pages[page].elements != nullptr && low < kPageElements; ++low) {
+      const auto u = static_cast<LXUChar>(page << 8 | low);
+      Element& element = flat_element(*sort, u);
+      const bool in_pair = element.starts_pair() || sort->may_end_pair(u);
+      if (!in_pair && element.sets() == 1 && element.primary() != 0) element.set_stands_alone();
+    }
+  }
+}
+
 /// Where a public look-up stores a weight set.
 struct SetOut {
   uint16_t* primary;
@@ -165,15 +174,6 @@ int32_t give(const Sort& sort, const Element& element, const SetOut& first, cons
   if (sets == 2) second.store(weights[1]);
   *char_class = static_cast<uint8_t>(element.char_class());
   return sets;
-}
-
-void fill_deciding(Sort* sort) {
-  for (LXUChar u = 0; u < lx::kAsciiUnits; ++u) {
-    const Element element = sort->element(u);
-    const bool alone = element.sets() == 1 && !sort->may_end_pair(u);
-    sort->deciding[u] =
-        alone && sort->appends_primaries ? static_cast<uint16_t>(element.primary()) : uint16_t{0};
-  }
 }
 
 lx::Fault validate_sort(uint16_t, const lx::Sections& sections) {
@@ -214,7 +214,7 @@ void* derive_sort(uint16_t, const lx::Sections& sections) {
   fill_pages(sort, reinterpret_cast<Element*>(first_pair + pairs), flat);
   fill_expansions(sort);
   fill_pairs(sort, first_pair);
-  fill_deciding(sort);
+  note_alone(sort);
   return sort;
 }
 

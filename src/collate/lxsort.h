@@ -10,9 +10,15 @@
 
 namespace lx {
 
-/// What a character weighs, in one word: the weights of one level each, how many weight sets there are, whether
-/// some contraction begins with the character, and its class. Of two sets the expansion table holds both; the
-/// special weight is then the number of the record.
+/// What a character weighs, in one word:
+///
+///   bits   0..15    primary   16..23 secondary   24..31 tertiary   32..47 special
+///         48..49    the number of weight sets, 0 to 2
+///         50        some pair begins with the character
+///         51        it stands alone, in no pair, with one set and a primary
+///         52..55    its class
+///
+/// Of two sets the expansion table holds both; the special weight is then the number of the record.
 class Element {
  public:
   Element() = default;
@@ -31,11 +37,22 @@ class Element {
   unsigned sets() const { return bits_ >> 48 & 3; }  // 0: the character is ignored
   bool starts_pair() const { return (bits_ & kStartsPair) != 0; }
   unsigned char_class() const { return bits_ >> 52 & 0xF; }  // LX_APPEND_ bits
+  bool appends(unsigned bit) const { return (char_class() & bit) != 0; }
+
+  /// The special weight behind its position, by which it counts first; 0 for none.
+  uint32_t placed_special(uint16_t position) const {
+    return special() != 0 ? uint32_t{position} << 16 | special() : 0;
+  }
+
+  /// Known of characters with a table; false of others.
+  bool stands_alone() const { return (bits_ & kStandsAlone) != 0; }
 
   void set_starts_pair() { bits_ |= kStartsPair; }
+  void set_stands_alone() { bits_ |= kStandsAlone; }
 
  private:
   static constexpr uint64_t kStartsPair = uint64_t{1} << 50;
+  static constexpr uint64_t kStandsAlone = uint64_t{1} << 51;
   uint64_t bits_ = 0;
 };
 
@@ -44,8 +61,6 @@ struct Pair {
   uint32_t characters;  // the first one in the upper half
   Element element;
 };
-
-inline constexpr size_t kAsciiUnits = 128;
 
 /// Derived data of a sort object, one block with the pairs and elements behind it.
 struct Sort {
@@ -58,9 +73,6 @@ struct Sort {
   uint8_t default_tertiary;
   bool appends_primaries;  // no character inserts its primary ahead of others
   bool appends_all;        // ... nor any other weight
-  // Of the ASCII characters the primaries that decide where the character stands for itself: not of expansions,
-  // nor of what can end a pair; else 0.
-  uint16_t deciding[kAsciiUnits];
   struct Page {
     const Element* elements;  // 256; null: computed from the fields below
     uint8_t flags;
@@ -122,9 +134,10 @@ inline int32_t weight_sets(const Sort& sort, const Element& element, LXWeights* 
 /// byte that ends the text is not.
 template <class Cursor>
 bool exhausted(const Cursor& in) {
-  if constexpr (Cursor::kShifts)
-    if (in.end - in.p == 1) return in.cp.is_shift(*in.p);
   return in.p == in.end;
+}
+inline bool exhausted(const ShiftCursor& in) {
+  return in.p == in.end || (in.end - in.p == 1 && in.cp.is_shift(*in.p));
 }
 
 /// Forgets a character that the end cuts.
@@ -191,30 +204,27 @@ class Elements {
   LXUChar ahead_ = 0;
 };
 
-/// Walks the weight sets of a text, those of an expansion one after the other: elements of one set each.
+/// Walks the weight sets of a text, those of an expansion one after the other: elements of at most one set
+/// each.
 template <class Cursor>
 class WeightSets {
  public:
   WeightSets(const Sort& sort, const Cursor& in) : sort_(sort), elements_(sort, in) {}
 
+  bool at_end() const { return !pending_ && elements_.at_end(); }
   size_t consumed() const { return elements_.consumed(); }
   uint16_t position() const { return elements_.position(); }
 
-  bool next(Element* set) {
+  [[gnu::always_inline]] Element next() {
     if (pending_) {
       pending_ = false;
-      *set = second_;
-      return true;
+      return second_;
     }
-    while (!elements_.at_end()) {
-      const Element element = elements_.next();
-      if (element.sets() == 0) continue;
-      pending_ = element.sets() == 2;
-      if (pending_) second_ = sort_.second_set(element);
-      *set = pending_ ? sort_.first_set(element) : element;
-      return true;
-    }
-    return false;
+    const Element element = elements_.next();
+    if (element.sets() != 2) return element;
+    pending_ = true;
+    second_ = sort_.second_set(element);
+    return sort_.first_set(element);
   }
 
  private:

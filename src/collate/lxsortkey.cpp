@@ -2,9 +2,9 @@
 // zero byte between two levels; in binary order it is the text, folded as the options ask.
 #include <cstring>
 
-#include "codepage/lxunicode.h"
 #include "collate/lxkey.h"
 #include "core/lxcall.h"
+#include "text/lxwalk.h"
 
 namespace {
 
@@ -18,6 +18,7 @@ using lx::Form;
 using lx::Key;
 using lx::Levels;
 using lx::Sort;
+using lx::Text;
 
 RAS1_Unit unit = RAS1_UNIT("lxsortkey");
 
@@ -43,7 +44,7 @@ struct Output {
   bool is_work_area(size_t chars) const {
     const size_t levels =
         (chars * Levels::kLevelBytes + Levels::kSeparators + alignment() - 1) & ~(alignment() - 1);
-    return usable >= levels + chars * 2 * sizeof(lx::PlacedSpecial);
+    return usable >= levels + chars * 2 * Levels::kSpecialBytes;
   }
 };
 
@@ -116,23 +117,22 @@ size_t store_character(const Codepage&, const lx::UnicodeCursor&, LXUChar u, uin
   return store_unit(u, p);
 }
 
-/// The frame of all forms. `units_of(cp)` counts the text; `read(cp, units, body)` calls `body` with its
-/// reader.
-template <class Unit, class UnitsOf, class Read>
-int32_t transform(LXLocale* given, uint8_t* output, int32_t size, const Unit* text, uint32_t options,
-                  UnitsOf units_of, Read read) {
+/// The frame of all forms.
+template <class Unit>
+int32_t transform(LXLocale* given, Form form, uint8_t* output, int32_t size, const Text<Unit>& text,
+                  uint32_t options) {
   Call call(unit, given);
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
   const LXLocale& locale = *call.locale();
   const Codepage& cp = codepage_of(*locale.codepage);
-  Fold fold;
-  if (!lx::fold_of(options & ~uint32_t{LX_CHARACTERS}, &fold)) return call.fail(LX_E_INVALID, -1);
-  const size_t units = units_of(cp);
+  if (!lx::is_fold(options & ~uint32_t{LX_CHARACTERS})) return call.fail(LX_E_INVALID, -1);
+  const Fold fold = lx::fold_of(options);
+  const size_t units = lx::units_of(cp, text, (options & LX_CHARACTERS) != 0);
   if (units == 0) return call.exit(empty_key(output, size));
   if (units > INT32_MAX / sizeof(Unit)) return call.fail(LX_E_MEMORY, -1);
-  if (locale.sort == nullptr && fold == Fold::kNone) return call.exit(copy_text(output, size, text, units));
+  if (locale.sort == nullptr && fold == Fold::kNone) return call.exit(copy_text(output, size, text.p, units));
   const Folding folding(locale, fold);
-  const int32_t bytes = read(cp, units, [&](const auto& in) {
+  const int32_t bytes = lx::with_cursor(cp, form, text, units, [&](const auto& in) {
     return lx::read_folded(folding, in, [&](const auto& reader) {
       if (locale.sort != nullptr)
         return make_key(lx::sort_of(*locale.sort), reader, folding.most_chars(units), Output(output, size));
@@ -143,49 +143,14 @@ int32_t transform(LXLocale* given, uint8_t* output, int32_t size, const Unit* te
   return bytes < 0 ? call.fail(LX_E_MEMORY, -1) : call.exit(bytes);
 }
 
-int32_t transform_bytes(LXLocale* locale, uint8_t* output, int32_t size, const char* text, LXShiftState state,
-                        int32_t length, uint32_t options, Form form) {
-  return transform(
-      locale, output, size, text, options,
-      [&](const Codepage& cp) {
-        return lx::units_of(cp, lx::ByteText{bytes_of(text), length, state}, (options & LX_CHARACTERS) != 0);
-      },
-      [&](const Codepage& cp, size_t bytes, auto body) {
-        return lx::with_cursor(cp, form, state, bytes_of(text), bytes, body);
-      });
-}
-
 }  // namespace
 
 namespace lx {
 
-bool fold_of(uint32_t options, Fold* fold) {
-  *fold = options == LX_CASE_INSENSITIVE    ? Fold::kCase
-          : options == LX_WIDTH_INSENSITIVE ? Fold::kWidth
-                                            : Fold::kNone;
-  return options == 0 || *fold != Fold::kNone;
-}
-
 Folding::Folding(const LXLocale& locale, Fold asked)
-    : codepage(*locale.codepage),
-      cp(codepage_of(codepage)),
+    : cp(codepage_of(*locale.codepage)),
       fold(asked),
       specials(asked == Fold::kCase ? specials_of(*locale.language, true) : Specials{nullptr, 0}) {}
-
-uint16_t Folding::folded(LXWChar code) const {
-  if (code <= 0xFF) {
-    const uint8_t* lower = cp.payload + format::codepage::kLower;
-    return cp.unicode[fold == Fold::kCase ? lower[code] : code];
-  }
-  if (fold == Fold::kCase) return code_to_unicode(cp, LXCpMbCaseConvW(&codepage, code, LX_C1_UPPER));
-  const LXWChar half = LXCpFullToHalfW(&codepage, code);
-  return code_to_unicode(cp, half != 0 ? half : code);
-}
-
-// To upper case, unlike the other forms: existing keys are made so.
-uint16_t Folding::folded(LXUChar u) const {
-  return fold == Fold::kCase ? unicode_upper(u) : unicode_full_to_half(u);
-}
 
 void Key::trim(const Sort& sort) {
   const auto drop = [](Level<uint8_t>* level, uint8_t weight) {
@@ -216,9 +181,10 @@ void Key::write(uint8_t* output) const {
   };
   put_level(levels_.secondaries);
   put_level(levels_.tertiaries);
-  for (const PlacedSpecial* p = levels_.specials.begin; p != levels_.specials.end; ++p) {
-    if (positions_) put(p->position);
-    put(p->weight);
+  for (const uint32_t* p = levels_.specials.begin; p != levels_.specials.end; ++p) {
+    const uint32_t placed = *p;  // what is written may reach over it
+    if (positions_) put(static_cast<uint16_t>(placed >> 16));
+    put(static_cast<uint16_t>(placed));
   }
 }
 
@@ -228,30 +194,22 @@ extern "C" {
 
 int32_t LXStrxfrm(LXLocale* locale, uint8_t* output, int32_t size, const char* text, int32_t length,
                   uint32_t options) {
-  return transform_bytes(locale, output, size, text, LX_SHIFT_SINGLE, length, options, Form::kPlain);
+  return transform<uint8_t>(locale, Form::kPlain, output, size, {bytes_of(text), length}, options);
 }
 
 int32_t LXStrxfrmEx(LXLocale* locale, uint8_t* output, int32_t size, const char* text, LXShiftState state,
                     int32_t length, uint32_t options) {
-  return transform_bytes(locale, output, size, text, state, length, options, Form::kEx);
+  return transform<uint8_t>(locale, Form::kEx, output, size, {bytes_of(text), length, state}, options);
 }
 
 int32_t LXWcsxfrm(LXLocale* locale, uint8_t* output, int32_t size, const LXWChar* text, int32_t length,
                   uint32_t options) {
-  return transform(
-      locale, output, size, text, options, [&](const Codepage&) { return lx::text_units(text, length); },
-      [&](const Codepage& cp, size_t codes, auto body) {
-        return body(lx::CodeCursor{cp, text, text + codes});
-      });
+  return transform<LXWChar>(locale, Form::kPlain, output, size, {text, length}, options);
 }
 
 int32_t LXStrxfrmU(LXLocale* locale, uint8_t* output, int32_t size, const LXUChar* text, int32_t length,
                    uint32_t options) {
-  return transform(
-      locale, output, size, text, options, [&](const Codepage&) { return lx::text_units(text, length); },
-      [&](const Codepage&, size_t units, auto body) {
-        return body(lx::UnicodeCursor{text, text + units});
-      });
+  return transform<LXUChar>(locale, Form::kPlain, output, size, {text, length}, options);
 }
 
 int32_t LXStrGenSortKey(LXLocale* given, uint8_t* output, int32_t size, const LXUChar* text, int32_t count) {

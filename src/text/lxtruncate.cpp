@@ -4,8 +4,8 @@
 
 #include "codepage/lxtext.h"
 #include "core/lxcall.h"
-#include "locale/lxlocale.h"
 #include "text/lxwalk.h"
+#include "text/lxfold.h"
 
 namespace {
 
@@ -13,8 +13,8 @@ using lx::bytes_of;
 using lx::Call;
 using lx::Codepage;
 using lx::codepage_of;
-using lx::Form;
 using lx::Walk;
+using lx::Form;
 
 RAS1_Unit unit = RAS1_UNIT("lxtruncate");
 
@@ -24,11 +24,9 @@ struct Blanks {
   uint8_t blank;
   LXWChar full;
 
-  Blanks(LXLocale* locale, uint32_t flags)
-      : dropped((flags & LX_DROP_BLANKS) != 0), blank(lx::keeps_ascii(*locale) ? 0x20 : 0x40), full(0) {
-    if ((flags & LX_DROP_FULL_BLANKS) != LX_DROP_FULL_BLANKS) return;
-    const LXWChar code = blank;
-    LXMapStringW(locale, &full, 1, &code, 1, LX_MAP_FULL_WIDTH);
+  Blanks(const LXLocale& locale, uint32_t flags)
+      : dropped((flags & LX_DROP_BLANKS) != 0), blank(lx::blank_of(locale)), full(0) {
+    if ((flags & LX_DROP_FULL_BLANKS) == LX_DROP_FULL_BLANKS) lx::find_full_width_blank(locale, &full);
   }
 };
 
@@ -96,7 +94,7 @@ size_t truncate(LXLocale* locale, Form form, uint8_t* text, LXShiftState state, 
   const size_t bytes = lx::units_before_null(text);
   size_t size = static_cast<size_t>(given);
   if ((flags & LX_CHARACTERS) != 0) size = size_in_bytes(cp, text, state, bytes, given);
-  const Blanks blanks(locale, flags);
+  const Blanks blanks(*locale, flags);
   if (bytes < size && !blanks.dropped) return bytes + 1;
   if (bytes < size) size = bytes + 1;
   size_t end = 0;
@@ -106,7 +104,7 @@ size_t truncate(LXLocale* locale, Form form, uint8_t* text, LXShiftState state, 
   } else {
     const Words& words = form == Form::kEx && cp.shift_sensitive ? kExWords : kPlainWords;
     end = lx::with_cursor(cp, form, state, text, size - 1,
-                          [&](const auto& in) { return cut_characters(in, blanks, words); });
+                         [&](const auto& in) { return cut_characters(in, blanks, words); });
   }
   text[end] = 0;
   return end + 1;
