@@ -81,8 +81,9 @@ LX_API LXWChar LXReadCharW(LXStream* stream, LXLocale* locale);
  * that (LX_E_STREAM_DIRECTION, LX_E_INVALID, or a code of LXReadCharW). With -1 and -2 nothing is stored. An
  * error behind that ends the string too and is left as the last error beside the bytes stored. A character that
  * does not fit stays in the stream. `flags`:
- * LX_EOL_LF to LX_EOL_FOURTH  line ends that end the string; they are stored. Without any it reads through line
- *                               ends. A carriage return and line feed are not parted, unless nothing else fits.
+ *   LX_EOL_LF to LX_EOL_FOURTH  line ends that end the string; they are stored. Without any it reads through
+ *                               line ends. A carriage return and line feed are not parted, unless nothing else
+ *                               fits.
  *   LX_DROP_RETURNS             takes carriage returns before line feeds out
  *   LX_TERMINATE                keeps a byte of the size for a null, and counts it
  *   LX_CHARACTERS               size and result count characters
@@ -115,8 +116,8 @@ LX_API int32_t LXUngetCharEx(LXStream* stream, LXLocale* locale, const char* cha
  *   LX_E_STREAM_KEPT       the callback failed or took nothing LX_STREAM_OFFERS times in a row; what it did not
  *                          take is kept, the next write or flush offers it again: do not write the character
  *                          again;
- * LX_E_SIZE              the same, and there is no room to keep the character: nothing of it is written, write
- *                          it again;
+ *   LX_E_SIZE              the same, and there is no room to keep the character: nothing of it is written,
+ *                          write it again;
  *   LX_E_STREAM_DIRECTION  a read stream. */
 LX_API int32_t LXWriteChar(LXStream* stream, LXLocale* locale, const char* character);
 /* As LXWriteChar for a 16-bit unit, in the machine's byte order. */
