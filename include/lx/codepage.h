@@ -101,7 +101,7 @@ LX_API int32_t LXNumCharsEx(LXLocale* locale, const char* text, LXShiftState sta
 LX_API char* LXMoveStringPointer(LXLocale* locale, const char* text, int32_t length, int32_t flags);
 
 /* As LXMoveStringPointer; the text begins in `state`. `new_state`, which may be null, receives the state at the
- * place; it is not written for a length of 0 or less. */
+ * place; in a shift-sensitive codepage it is not written for a length of 0 or less. */
 LX_API char* LXMoveStringPointerEx(LXLocale* locale, const char* text, LXShiftState state, int32_t length,
                                    LXShiftState* new_state, int32_t flags);
 

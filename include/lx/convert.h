@@ -17,7 +17,7 @@ LX_API int32_t LXCloseConversion(LXConversion* conversion);
 /* Converts from `*input` of `*input_left` bytes to `*output` of `*output_left` bytes; the four values are
  * advanced. A count below 0 is 0. Returns, and leaves as the target locale's last error,
  *   LX_OK             all input is consumed and nothing is pending;
- *   LX_E_OUTPUT_FULL  the output is full and bytes are pending: call again with fresh output;
+ *   LX_E_OUTPUT_FULL  the output is full: call again with the rest of the input and fresh output;
  *   LX_E_INPUT_CUT    the input ended inside a character, whose bytes are kept: call again with more input;
  * or LX_E_NOT_INITIALIZED with nothing touched. The target's double-byte state is left open at the end.
  *
@@ -37,8 +37,8 @@ LX_API int32_t LXConversionRatio(LXLocale* target, LXLocale* source);
  *          have room for their bytes).
  *  length  below 0: null-terminated. Without LX_TERMINATE a null is then stored and counted when all
  *          input was converted and there is room.
- *  result  what was written; -1 with last error LX_E_INVALID for other flags, in LX_CHARACTERS mode 0 where
- *          marked.
+ *  result  what was written; -1 with last error LX_E_INVALID for other flags, with LX_CHARACTERS 0 where that
+ *          is said; -1 when the library is not initialised.
  * A character that does not fit, or is cut by the end of the input, is not converted: conversion stops
  * before it. A length or size of 0 gives 0; with LX_TERMINATE and a size above 0 a null is stored. */
 
