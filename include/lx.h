@@ -6,7 +6,7 @@
  *
  * Conventions:
  *  1. Null locale. A null LXLocale means the default locale, set by LXSetLocale.
- *  2. Errors. Each function that takes a locale leaves its return code there; LXGetError reads it.
+ *  2. Errors. Each function that takes a locale leaves a code of lx/base.h there; LXGetError reads it.
  *     A call before LXInit or after the last LXTerm is refused and touches nothing.
  *  3. Forms. No suffix: a byte string in the locale's codepage. W: packed codes (LXWChar). U: 16-bit
  *     Unicode (LXUChar). Ex: a byte string of a shift-sensitive codepage with a shift state. S: takes a

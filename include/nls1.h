@@ -21,64 +21,84 @@ extern "C" {
 #define NLS1_THREAD 0x40000000
 #define NLS1_PROCESS ((int32_t)-0x7FFFFFFF - 1) /* bit 0x80000000 */
 
-/* Creates a locale from identifiers (0: not given); the caller releases it with LXReleaseLocale. Null with
- * `*rc` (may be null) 1 (the process could not be initialised), 30, 31 or 34 (unknown identifier), or as for
- * LXGetLocale, which receives `flags`. */
+/* Creates a locale from identifiers (0: not given); the caller releases it with LXReleaseLocale. `flags` are
+ * those of LXGetLocale. Null with `*rc` (may be null) 1 (the process could not be initialised),
+ * LX_E_NO_CODEPAGE, LX_E_NO_LANGUAGE or LX_E_NO_TERRITORY (unknown identifier), or as for LXGetLocale. */
 LX_API LXLocale* NLS1_GetLocale(int32_t language_territory, int32_t codepage, int32_t flags, int32_t* rc);
 
 /* Sets the process's default locale from identifiers. With NLS1_THREAD it is the thread's locale that is asked
- * for, and the result is 2: the flag is passed on to LXGetLocale, which does not know it. Use
- * NLS1_SetLocaleFromNative to set a thread's locale. Codes: 0, 11 (not initialised), or as for NLS1_GetLocale.
- */
+ * for, and the result is LX_E_INVALID: the flag is passed on to LXGetLocale, which does not know it. Use
+ * NLS1_SetLocaleFromNative to set a thread's locale. Returns LX_OK, LX_E_NOT_INITIALIZED, or as for
+ * NLS1_GetLocale. */
 LX_API int32_t NLS1_SetLocale(int32_t language_territory, int32_t codepage, int32_t flags);
 
 /* Sets the thread's locale (NLS1_THREAD) and the process's default (NLS1_PROCESS) from an operating-system
  * name. The name that is built for the process begins with the territory: it is found only where a language has
- * that name, or with LX_FALLBACK, which gives English. Codes: 0, 11, or as for LXConvertNativeLocale. */
+ * that name, or with LX_FALLBACK, which gives English. Returns LX_OK, LX_E_NOT_INITIALIZED, LX_E_MEMORY, or as
+ * for LXConvertNativeLocale. */
 LX_API int32_t NLS1_SetLocaleFromNative(const char* native_name, int32_t flags);
 
-/* Sets the operating system's locale for a category of setlocale: from identifiers, or from a locale (null: the
- * default). Codes: 0, 11 (not initialised), 32 (no such locale), or as for NLS1_GetLocale. */
+/* Sets the operating system's locale for a category of setlocale from identifiers. Returns LX_OK,
+ * LX_E_NOT_INITIALIZED, LX_E_NO_NATIVE (no such locale), or as for NLS1_GetLocale. */
 LX_API int32_t NLS1_SetNativeLocale(int32_t language_territory, int32_t codepage, int32_t category,
                                     int32_t flags);
+
+/* As NLS1_SetNativeLocale from a locale (null: the default). Returns LX_OK, LX_E_NOT_INITIALIZED or
+ * LX_E_NO_NATIVE. */
 LX_API int32_t NLS1_SetNativeFromLocale(LXLocale* locale, int32_t category, int32_t flags);
 
-/* LXConvertNativeLocale. */
+/* LXConvertNativeLocale, which see; `*rc` (may be null) can also be LX_E_NOT_INITIALIZED. A null name is the
+ * empty one. */
 LX_API LXLocale* NLS1_ConvertNativeLocale(const char* native_name, int32_t flags, int32_t* rc);
 
-/* The identifier of the object of a name, or 0 with `*rc` (may be null) 11 or 37. A codepage's name may be an
- * alias. */
+/* The identifier of the language of a null-terminated name (any case), or 0 with `*rc` (may be null)
+ * LX_E_NOT_INITIALIZED or LX_E_NOT_FOUND. */
 LX_API int32_t NLS1_GetLanguageId(const char* name, int32_t* rc);
+/* As NLS1_GetLanguageId for a territory. */
 LX_API int32_t NLS1_GetTerritoryId(const char* name, int32_t* rc);
+/* As NLS1_GetLanguageId for a codepage, whose name may be an alias. */
 LX_API int32_t NLS1_GetCodepageId(const char* name, int32_t* rc);
+/* As NLS1_GetLanguageId for a sort. BINARY gives 0 with `*rc` LX_OK. */
 LX_API int32_t NLS1_GetSortId(const char* name, int32_t* rc);
 
-/* Writes the name of the object of an identifier to `buffer` of `size` bytes. The first two also take a
- * language and a territory in one value. Codes: 0, 11, 37 (no such object), 40 (the name and its null do not
- * fit). */
+/* Writes the name of the language of an identifier, or of a language and a territory in one value, with its
+ * null to `buffer` of `size` bytes. Returns LX_OK, LX_E_NOT_INITIALIZED, LX_E_NOT_FOUND (no such object) or
+ * LX_E_SIZE (the name and its null do not fit; nothing is written). */
 LX_API int32_t NLS1_GetLanguageName(int32_t id, char* buffer, int32_t size);
+/* As NLS1_GetLanguageName for the territory, also of a language and a territory in one value. */
 LX_API int32_t NLS1_GetTerritoryName(int32_t id, char* buffer, int32_t size);
+/* As NLS1_GetLanguageName for a codepage's identifier. */
 LX_API int32_t NLS1_GetCodepageName(int32_t id, char* buffer, int32_t size);
+/* As NLS1_GetLanguageName for a sort's identifier; 0, binary order, gives LX_OK and an empty name. */
 LX_API int32_t NLS1_GetSortName(int32_t id, char* buffer, int32_t size);
 
-/* The functions of the same name in lx/item.h, except that item 14 is the identifier of the language's default
- * codepage. `source` is the flags argument there. */
+/* LXGetLocaleNumInfo (lx/item.h), except that LX_ITEM_DEFAULT_CODEPAGE is the identifier of the language's
+ * default codepage. `source` is the flags argument there. */
 LX_API int32_t NLS1_GetLocaleNumInfo(LXLocale* locale, int32_t item, int32_t source);
+/* LXSetLocaleNumInfo (lx/item.h). */
 LX_API int32_t NLS1_SetLocaleNumInfo(LXLocale* locale, int32_t item, int32_t value);
+/* LXGetLocaleTextInfo (lx/item.h). */
 LX_API int32_t NLS1_GetLocaleTextInfo(LXLocale* locale, int32_t item, char* buffer, int32_t size,
                                       int32_t flags);
+/* LXGetLocaleTextInfoW (lx/item.h). */
 LX_API int32_t NLS1_GetLocaleTextInfoW(LXLocale* locale, int32_t item, LXWChar* buffer, int32_t size,
                                        int32_t flags);
+/* LXGetLocaleTextInfoU (lx/item.h). */
 LX_API int32_t NLS1_GetLocaleTextInfoU(LXLocale* locale, int32_t item, LXUChar* buffer, int32_t size,
                                        int32_t flags);
+/* LXGetLocaleTextInfoEx (lx/item.h). */
 LX_API int32_t NLS1_GetLocaleTextInfoEx(LXLocale* locale, int32_t item, char* buffer, LXShiftState state,
                                         int32_t size, int32_t flags);
+/* LXSetLocaleTextInfo (lx/item.h). */
 LX_API int32_t NLS1_SetLocaleTextInfo(LXLocale* locale, int32_t item, const char* text, int32_t length,
                                       int32_t flags);
+/* LXSetLocaleTextInfoW (lx/item.h). */
 LX_API int32_t NLS1_SetLocaleTextInfoW(LXLocale* locale, int32_t item, const LXWChar* text, int32_t length,
                                        int32_t flags);
+/* LXSetLocaleTextInfoU (lx/item.h). */
 LX_API int32_t NLS1_SetLocaleTextInfoU(LXLocale* locale, int32_t item, const LXUChar* text, int32_t length,
                                        int32_t flags);
+/* LXSetLocaleTextInfoEx (lx/item.h). */
 LX_API int32_t NLS1_SetLocaleTextInfoEx(LXLocale* locale, int32_t item, const char* text, LXShiftState state,
                                         int32_t length, int32_t flags);
 
@@ -109,13 +129,13 @@ LX_API int32_t NLS1_SetLocaleTextInfoEx(LXLocale* locale, int32_t item, const ch
  *                  NLS1_PAD          the output is filled up with blanks of the target, which count;
  *                  NLS1_DROP_BLANKS  when the output is full and only single-byte blanks are left of the
  *                                    input, it counts as translated.
- *  rc            may be null. 0; 2 other flags; 30 the codepage's file is not there, or built-in data stand in
- *                for it; 37 no such codepage; 40 input is left over: it does not fit, or ends inside a
- *                character, or the output of UTF-16 has a size of 1; or why a codepage could not be loaded, or
- *                11 (not initialised).
+ *  rc            may be null. LX_OK; LX_E_INVALID other flags; LX_E_NO_CODEPAGE the codepage's file is not
+ *                there, or built-in data stand in for it; LX_E_NOT_FOUND no such codepage; LX_E_SIZE input is
+ *                left over: it does not fit, or ends inside a character, or the output of UTF-16 has a size of
+ *                1; or why a codepage could not be loaded, or LX_E_NOT_INITIALIZED.
  *
  * Returns the bytes written (characters with LX_CHARACTERS), or -1 with nothing written when a codepage cannot
- * be had, the flags are invalid, or the output of UTF-16 has a size of 1. With code 40 what fits is written,
+ * be had, the flags are invalid, or the output of UTF-16 has a size of 1. With LX_E_SIZE what fits is written,
  * never half a character.
  *
  * Without LX_TERMINATE a null-terminated input still gives a null that counts, when all of it was translated
@@ -127,9 +147,11 @@ LX_API int32_t NLS1_TranslateString(int32_t target_codepage, int32_t source_code
                                     int32_t output_size, const void* input, int32_t input_length,
                                     int32_t* consumed, int32_t flags, uint32_t* rc);
 
-/* Initialises the process. And the calling thread's locale, null when it could not be made; it belongs to the
- * thread's services: do not release it. */
+/* Initialises the process, when nothing has. */
 LX_API void NLS1_PrivateFunction_GetProcessLocale(void);
+
+/* The calling thread's locale, or null when it could not be made. It belongs to the thread's services: do not
+ * release it. */
 LX_API LXLocale* NLS1_PrivateFunction_GetThreadLocale(void);
 
 #ifdef __cplusplus

@@ -41,20 +41,20 @@ LX_API int32_t LXSortGetCombination(const LXObject* sort, LXUChar first, LXUChar
  * because it might have made a pair, is kept there and counts 1 in `*remaining`: a text has ended when that is
  * 0. Returns the number of weight sets: 0 (an ignored character, or one that the end of the text cuts, which
  * ends the text; nothing is written), 1 (in `first`) or 2 (in both), with the class in `char_class`. 0 with
- * last error 2 in binary order, which has no weights: nothing moves. */
+ * last error LX_E_INVALID in binary order, which has no weights: nothing moves. */
 LX_API int32_t LXStrGetNextWeight(LXLocale* locale, const char** text, int32_t* remaining, uint16_t* counter,
                                   LXWeights* first, LXWeights* second, uint8_t* char_class,
                                   LXUChar* look_ahead);
-/* The same in a shift-sensitive codepage: `*state` moves along. A shift byte that ends the text goes with the
- * character before it. */
+/* As LXStrGetNextWeight in a shift-sensitive codepage: `*state` moves along. A shift byte that ends the text
+ * goes with the character before it. */
 LX_API int32_t LXStrGetNextWeightEx(LXLocale* locale, const char** text, LXShiftState* state,
                                     int32_t* remaining, uint16_t* counter, LXWeights* first, LXWeights* second,
                                     uint8_t* char_class, LXUChar* look_ahead);
-/* Packed codes; `*remaining` counts codes. */
+/* As LXStrGetNextWeight; packed codes, `*remaining` counts codes. */
 LX_API int32_t LXStrGetNextWeightW(LXLocale* locale, const LXWChar** text, int32_t* remaining,
                                    uint16_t* counter, LXWeights* first, LXWeights* second, uint8_t* char_class,
                                    LXUChar* look_ahead);
-/* 16-bit Unicode; `*remaining` counts units. */
+/* As LXStrGetNextWeight; 16-bit Unicode, `*remaining` counts units. */
 LX_API int32_t LXStrGetNextWeightU(LXLocale* locale, const LXUChar** text, int32_t* remaining,
                                    uint16_t* counter, LXWeights* first, LXWeights* second, uint8_t* char_class,
                                    LXUChar* look_ahead);
@@ -72,7 +72,7 @@ LX_API void LXStrInsertWeights(uint16_t primary, uint16_t** primary_insert, uint
 /* Compares two strings by the locale's sort: below 0, 0 or above 0. Lengths count bytes, with LX_CHARACTERS
  * characters; below 0: null-terminated. `options` are those of LXStrcmp; with any, sort keys of those options
  * are compared, and LX_WIDTH_INSENSITIVE also ignores trailing blanks. In binary order the result is that of
- * LXStrcmp. 0 with last error 2 (options) or 20. */
+ * LXStrcmp. 0 with last error LX_E_INVALID (options) or LX_E_MEMORY. */
 LX_API int32_t LXStrcoll(LXLocale* locale, const char* text1, int32_t length1, const char* text2,
                          int32_t length2, uint32_t options);
 /* As LXStrcoll for a shift-sensitive codepage, with the state that each text begins in. */
@@ -86,22 +86,28 @@ LX_API int32_t LXStrcollU(LXLocale* locale, const LXUChar* text1, int32_t length
                           int32_t length2, uint32_t options);
 
 /* Writes the sort key of a string to `output` of `size` bytes: keys compared as bytes, the shorter first where
- * one begins the other, order as LXStrcoll does. Lengths as for LXStrcoll; `options` 0, LX_CASE_INSENSITIVE or
- * LX_WIDTH_INSENSITIVE, and LX_CHARACTERS. Returns the bytes of the whole key; when they do not fit `size`
- * the output is not a key. An empty text has a key of 3 bytes (0 when `size` is 0). -1 with last error 2
- * (options) or 20. In binary order the key is the text, with options folded: in the U and W forms units as the
- * machine stores them, which are not in the order of their bytes. */
+ * one begins the other, order as LXStrcoll does. `length` counts bytes, with LX_CHARACTERS characters; below 0:
+ * null-terminated. `options` are 0, LX_CASE_INSENSITIVE or LX_WIDTH_INSENSITIVE, and LX_CHARACTERS. Returns the
+ * bytes of the whole key; when they do not fit `size` the output is not a key. An empty text has a key of 3
+ * bytes (0 when `size` is 0). -1 with last error LX_E_INVALID (options) or LX_E_MEMORY. In binary order the key
+ * is the text, with options folded: in the U and W forms units as the machine stores them, which are not in the
+ * order of their bytes. */
 LX_API int32_t LXStrxfrm(LXLocale* locale, uint8_t* output, int32_t size, const char* text, int32_t length,
                          uint32_t options);
+/* As LXStrxfrm for a shift-sensitive codepage; the text begins in `state`. The key has no shift bytes but in
+ * binary order without options, where it is the text as it stands. */
 LX_API int32_t LXStrxfrmEx(LXLocale* locale, uint8_t* output, int32_t size, const char* text,
                            LXShiftState state, int32_t length, uint32_t options);
+/* As LXStrxfrm; packed codes, `length` counts codes and `size` bytes. LX_CHARACTERS changes nothing. */
 LX_API int32_t LXWcsxfrm(LXLocale* locale, uint8_t* output, int32_t size, const LXWChar* text, int32_t length,
                          uint32_t options);
-/* As LXStrxfrm, but letters are folded to upper case. */
+/* As LXStrxfrm; 16-bit Unicode, `length` counts units and `size` bytes. Letters are folded to upper case.
+ * LX_CHARACTERS changes nothing. */
 LX_API int32_t LXStrxfrmU(LXLocale* locale, uint8_t* output, int32_t size, const LXUChar* text, int32_t length,
                           uint32_t options);
-/* The key of `count` 16-bit Unicode values under the locale's sort object: its bytes, written when they fit, or
- * -1 without memory or in binary order. */
+/* Writes the key of `count` 16-bit Unicode values under the locale's sort to `output` of `size` bytes, when it
+ * fits. Returns the bytes of the whole key, or -1 with last error LX_E_INVALID (binary order, or a count below
+ * 0) or LX_E_MEMORY. */
 LX_API int32_t LXStrGenSortKey(LXLocale* locale, uint8_t* output, int32_t size, const LXUChar* text,
                                int32_t count);
 

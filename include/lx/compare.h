@@ -16,8 +16,8 @@ extern "C" {
 /* Compares two strings by the values of their characters: below 0, 0 or above 0, a difference of bytes, of
  * characters' lengths or of the strings' lengths. Lengths count bytes, with LX_CHARACTERS characters; below 0:
  * null-terminated. A character that the length cuts does not count. Bits 0x80000000, 0x40 and 0x1 of `options`
- * in any other combination than LX_WIDTH_INSENSITIVE mean LX_CASE_INSENSITIVE. 0 with last error 2 (another
- * bit) or 20. */
+ * in any other combination than LX_WIDTH_INSENSITIVE mean LX_CASE_INSENSITIVE. 0 with last error
+ * LX_E_INVALID (another bit) or LX_E_MEMORY. */
 LX_API int32_t LXStrcmp(LXLocale* locale, const char* text1, int32_t length1, const char* text2,
                         int32_t length2, uint32_t options);
 /* As LXStrcmp for a shift-sensitive codepage, with the state that each text begins in. */

@@ -17,31 +17,35 @@ typedef int32_t (*LXFreeHook)(void* context, void* block);
 /* Option of LXInit: never use the built-in objects. */
 #define LX_NO_DEFAULTS 0x80000001u
 
-/* Initialises the library, or counts one more use of it. The first call reads the control file of
- * the locale directory: `directory`, else the one named by the environment variable LX_LOCALEDIR,
- * else the compiled-in default directory. Null hooks mean malloc and free. A further call ignores all
- * arguments and returns 0. The first call must return before other threads call the library.
+/* Initialises the library, or counts one more use of it. The first call reads the control file of the locale
+ * directory: `directory`, else the one named by the environment variable LX_LOCALEDIR, else the compiled-in
+ * default directory. Null hooks mean malloc and free. A further call ignores all arguments and returns LX_OK.
+ * The first call must return before other threads call the library.
  *
- * Returns 0; 10 when no control file could be used and the built-in objects are in force (with
- * LX_NO_DEFAULTS: no objects at all); 11 when the object manager could not be created; 20 when
- * memory is exhausted. After 11 and 20 the library is not initialised. */
+ * Returns LX_OK; LX_W_DEFAULTS when no control file could be used and the built-in objects are in force (with
+ * LX_NO_DEFAULTS: no objects at all); LX_E_NOT_INITIALIZED when the object manager could not be created;
+ * LX_E_MEMORY when there is no memory for the library's global area. After the last two the library is not
+ * initialised. */
 LX_API int32_t LXInit(const char* directory, LXAllocHook allocate, LXFreeHook release, void* context,
                       uint32_t options);
 
-/* Undoes one LXInit. The last one releases the default locale and every loaded object; locale and
- * conversion handles that callers still hold are dead from then on. Returns 0, the first non-zero
- * code of a release that failed, or 11 when the library is not initialised. */
+/* Undoes one LXInit. The last one releases the default locale and every loaded object; locale and conversion
+ * handles that callers still hold are dead from then on. Returns LX_OK, the first other code of a release that
+ * failed (LX_E_FREE, or 1), or LX_E_NOT_INITIALIZED. */
 LX_API int32_t LXTerm(void);
 
-/* The code that the last call left in `locale` (null: the default locale); 11 when there is none. */
+/* The code that the last call left in `locale` (null: the default locale); LX_E_NOT_INITIALIZED when there is
+ * none. */
 LX_API int32_t LXGetError(const LXLocale* locale);
 
-/* The default hooks: malloc and free. LXDefFree returns 1. */
+/* The default allocation hook: malloc. `context` is not used. */
 LX_API void* LXDefAlloc(void* context, size_t bytes);
+
+/* The default free hook: free. `context` is not used. Returns 1. */
 LX_API int32_t LXDefFree(void* context, void* block);
 
-/* Reads an environment variable. Returns 0 when it is not set, else the bytes of its value with the
- * terminating null; the value is copied only when that is not greater than `size` (bytes). */
+/* Reads an environment variable. Returns 0 when it is not set, else the bytes of its value with the terminating
+ * null; the value is copied only when that is not greater than `size` (bytes). */
 LX_API int32_t LXGetEnv(const char* name, char* buffer, int32_t size);
 
 #ifdef __cplusplus

@@ -70,28 +70,28 @@ enum LXItem {
  * current value, or with LX_TERRITORY_VALUES from the territory. Day and month names, names of objects and
  * so on have one value only. */
 
-/* The value of a number item, or -1 with last error 35 (not a number item) or 2 (flags other than
- * LX_TERRITORY_VALUES). */
+/* The value of a number item, or -1 with last error LX_E_ITEM (not a number item) or LX_E_INVALID (flags other
+ * than LX_TERRITORY_VALUES). */
 LX_API int32_t LXGetLocaleNumInfo(LXLocale* locale, int32_t item, int32_t flags);
 
-/* Sets a number item of this locale alone. A new territory (5) or codepage (9) recomputes the values that the
- * caller has not set. Returns 1, or 0 with last error 35 (not a number item, or one that cannot be set), 37
- * (value refused, no such object), 36 (a separator has no single byte in the new codepage) or 20; the locale is
- * then as it was. */
+/* Sets a number item of this locale alone. A new LX_ITEM_TERRITORY_ID or LX_ITEM_CODEPAGE_ID recomputes the
+ * values that the caller has not set. Returns 1, or 0 with last error LX_E_ITEM (not a number item, or one that
+ * cannot be set), LX_E_NOT_FOUND (value refused, no such object), LX_E_SEPARATOR (a separator has no single
+ * byte in the new codepage) or LX_E_MEMORY; the locale is then as it was. */
 LX_API int32_t LXSetLocaleNumInfo(LXLocale* locale, int32_t item, int32_t value);
 
 /* Copies a text item into `buffer` of `size` bytes in the locale's codepage, cut at a whole character and
  * always null-terminated. With LX_CHARACTERS `size` counts characters with the null, and `buffer` must hold the
  * bytes that those can take. Separators take part with one character; one that has no single byte in the
  * codepage reads as an empty text. Returns the bytes (characters) written with the null; 0 when `size` is 0; -1
- * with last error 35 (no such text item; 13 to 15: the directory has no such object) or 2 (other flags than
- * LX_TERRITORY_VALUES and LX_CHARACTERS). */
+ * with last error LX_E_ITEM (no such text item; LX_ITEM_DEFAULT_TERRITORY to LX_ITEM_DEFAULT_SORT: the
+ * directory has no such object) or LX_E_INVALID (other flags than LX_TERRITORY_VALUES and LX_CHARACTERS). */
 LX_API int32_t LXGetLocaleTextInfo(LXLocale* locale, int32_t item, char* buffer, int32_t size, int32_t flags);
 /* As LXGetLocaleTextInfo; writes packed codes, `size` and the result count codes. LX_CHARACTERS is ignored. */
 LX_API int32_t LXGetLocaleTextInfoW(LXLocale* locale, int32_t item, LXWChar* buffer, int32_t size,
                                     int32_t flags);
-/* As LXGetLocaleTextInfo; writes 16-bit Unicode, `size` and the result count units. LX_CHARACTERS is ignored.
- */
+/* As LXGetLocaleTextInfo; writes 16-bit Unicode, `size` and the result count units. LX_CHARACTERS is
+ * ignored. */
 LX_API int32_t LXGetLocaleTextInfoU(LXLocale* locale, int32_t item, LXUChar* buffer, int32_t size,
                                     int32_t flags);
 /* As LXGetLocaleTextInfo for a shift-sensitive codepage: the text begins in the given state, shift bytes are
@@ -100,33 +100,38 @@ LX_API int32_t LXGetLocaleTextInfoEx(LXLocale* locale, int32_t item, char* buffe
                                      int32_t size, int32_t flags);
 
 /* Sets a text item of this locale alone. `text` is in the locale's codepage; `length` counts bytes, with
- * LX_CHARACTERS characters; below 0: null-terminated; 0: nothing is changed. 2, 6, 10 and 12 take the name of
- * an object. 59, 60, 66 and 67 take their first byte, which may be neither a digit nor the separator that it
- * stands beside (59 and 60, 66 and 67). Returns 1, or 0 with last error 2 (flags other than LX_CHARACTERS), 35
- * (no such text item, or one that cannot be set), 37 (value refused, no such object), 36 (a separator has no
- * single byte in the new codepage) or 20; the locale is then as it was. */
+ * LX_CHARACTERS characters; below 0: null-terminated; 0: nothing is changed. LX_ITEM_LANGUAGE,
+ * LX_ITEM_TERRITORY, LX_ITEM_CODEPAGE and LX_ITEM_SORT take the name of an object. LX_ITEM_DECIMAL,
+ * LX_ITEM_THOUSANDS, LX_ITEM_MONETARY_DECIMAL and LX_ITEM_MONETARY_THOUSANDS take their first byte, which may
+ * be neither a digit nor the other separator of the pair. Returns 1, or 0 with last error LX_E_INVALID (flags
+ * other than LX_CHARACTERS), LX_E_ITEM (no such text item, or one that cannot be set), LX_E_NOT_FOUND (value
+ * refused, no such object), LX_E_SEPARATOR (a separator has no single byte in the new codepage) or LX_E_MEMORY;
+ * the locale is then as it was. */
 LX_API int32_t LXSetLocaleTextInfo(LXLocale* locale, int32_t item, const char* text, int32_t length,
                                    int32_t flags);
 /* As LXSetLocaleTextInfo; `text` is packed codes, `length` counts codes. */
 LX_API int32_t LXSetLocaleTextInfoW(LXLocale* locale, int32_t item, const LXWChar* text, int32_t length,
                                     int32_t flags);
-/* As LXSetLocaleTextInfo; `text` is 16-bit Unicode of fewer than 264 units (else 37), `length` counts units.
- * The text itself is kept as the item's Unicode form. A separator must be exactly one unit (else 37). */
+/* As LXSetLocaleTextInfo; `text` is 16-bit Unicode of fewer than 264 units (else LX_E_NOT_FOUND), `length`
+ * counts units. The text itself is kept as the item's Unicode form. A separator must be exactly one unit (else
+ * LX_E_NOT_FOUND). */
 LX_API int32_t LXSetLocaleTextInfoU(LXLocale* locale, int32_t item, const LXUChar* text, int32_t length,
                                     int32_t flags);
 /* As LXSetLocaleTextInfo for a shift-sensitive codepage; a shift byte at the start of `text` sets the state.
- * Names and separators must be in the single-byte state (else 37). */
+ * Names and separators must be in the single-byte state (else LX_E_NOT_FOUND). */
 LX_API int32_t LXSetLocaleTextInfoEx(LXLocale* locale, int32_t item, const char* text, LXShiftState state,
                                      int32_t length, int32_t flags);
 
 /* What the set functions do to the values of a locale; the objects must be loaded. Fills every value that the
- * caller has not set from the territory; returns 0, or 20 with the values filled so far. Meant for new locales:
- * texts that are replaced are not freed. */
+ * caller has not set from the territory. Returns, and leaves as the last error, LX_OK, or LX_E_MEMORY with the
+ * locale as it was. The Unicode texts that are replaced stay readable until the locale is released. */
 LX_API int32_t LXLocaleSetModifiable(LXLocale* locale);
-/* Moves a locale to another territory: 0, or 20 with the locale as it was. The replaced Unicode texts are not
- * freed. */
+/* Moves a locale to another territory. Returns, and leaves as the last error, LX_OK, or LX_E_NOT_FOUND (no
+ * loaded territory) or LX_E_MEMORY with the locale as it was. The Unicode texts that are replaced stay readable
+ * until the locale is released. */
 LX_API int32_t LXLocaleChangeTerritory(LXLocale* locale, LXObject* territory);
-/* Converts a locale's values to another codepage: 0, or 20 or 36 with the locale as it was. */
+/* Converts a locale's values to another codepage. Returns, and leaves as the last error, LX_OK, or
+ * LX_E_NOT_FOUND (no loaded codepage), LX_E_SEPARATOR or LX_E_MEMORY with the locale as it was. */
 LX_API int32_t LXLocaleChangeCodePage(LXLocale* locale, LXObject* codepage);
 
 #ifdef __cplusplus

@@ -24,19 +24,22 @@ LX_API int32_t LXGetUserLocale(char* buffer, int32_t size);
  * language of LC_TIME and the sort of LC_COLLATE, each "Unknown" on its own. Returns `buffer`. */
 LX_API char* LXMapNativeLocale(const char* native_name, char* buffer, int32_t size);
 
-/* Copies the operating system's numeric and monetary conventions of a native locale (empty: the current one)
- * into `locale`: fraction digits, sign and symbol places, groupings and, where the codepages agree, separators,
- * currency symbol and signs. Changes nothing when the system does not know the name. */
+/* Copies the operating system's numeric and monetary conventions of a native locale (empty or null: the current
+ * one) into `locale`: fraction digits, sign and symbol places, groupings and, where the codepages agree,
+ * separators, currency symbol and signs. Changes nothing when the system does not know the name. The last error
+ * becomes LX_OK or LX_E_MEMORY. */
 LX_API void LXMapNativeInfo(const char* native_name, LXLocale* locale);
 
 /* Creates a locale from an operating-system name, with the system's conventions as LXMapNativeInfo copies them.
  * Flags: LX_FALLBACK as for LXGetLocale, and 0x1, which changes nothing. Returns the locale, to be released
- * with LXReleaseLocale, or null with `*rc` (may be null) 2 or as for LXGetLocale; an unknown name gives 31. */
+ * with LXReleaseLocale, or null with `*rc` (may be null) LX_E_INVALID (flags) or as for LXGetLocale; an unknown
+ * name gives LX_E_NO_LANGUAGE. */
 LX_API LXLocale* LXConvertNativeLocale(const char* native_name, int32_t flags, int32_t* rc);
 
-/* Calls `callback` for every operating-system name known, in the order of the search, with the locale name that
- * it maps to, until it returns 0. Returns 0. */
+/* Gets an operating-system name and the locale name that it maps to; 0 ends the enumeration. */
 typedef int32_t (*LXNativeCallback)(void* user, const char* native_name, const char* locale_name);
+/* Calls `callback` for every operating-system name known, in the order of the search, until it returns 0.
+ * Returns LX_OK. */
 LX_API int32_t LXEnumNativeLocales(LXNativeCallback callback, void* user);
 
 #ifdef __cplusplus

@@ -24,7 +24,7 @@ enum {
 };
 
 /* What the reading functions return when there is no character. */
-#define LX_STREAM_NO_UNIT 0xFFFFu     /* LXReadCharU: end of the input (last error 0) or failure */
+#define LX_STREAM_NO_UNIT 0xFFFFu     /* LXReadCharU: end of the input (last error LX_OK) or failure */
 #define LX_STREAM_END 0xFFFFFFFFu     /* LXReadCharW: end of the input */
 #define LX_STREAM_FAILURE 0xFFFFFFFEu /* LXReadCharW: failure */
 
@@ -50,35 +50,40 @@ enum {
  * failure. */
 
 /* Opens a stream that moves its bytes through `transfer`; to be closed with LXCloseStream. Null with last error
- * 2 (another mode, or no callback) or 20. */
+ * LX_E_INVALID (another mode, or no callback) or LX_E_MEMORY. */
 LX_API LXStream* LXOpenStream(LXLocale* locale, LXTransfer transfer, void* user, uint32_t mode);
 
 /* Closes a stream; that of a write stream offers the kept bytes first and ends shift-sensitive text in the
- * single-byte state. Returns 1, or 0 with last error 62 (the callback did not take all of it; the rest is
- * dropped) or 21. The stream is gone in any case. */
+ * single-byte state. Returns 1, or 0 with last error LX_E_STREAM_FLUSH (the callback did not take all of it;
+ * the rest is dropped) or LX_E_FREE. The stream is gone in any case, but when the library is not
+ * initialised. */
 LX_API int32_t LXCloseStream(LXStream* stream, LXLocale* locale);
 
 /* Offers the kept bytes of a write stream to the callback; drops those pushed back on a read stream. Returns 1,
- * or 0 with last error 62 (the callback failed: the kept bytes are dropped) or 65 (it took nothing
- * LX_STREAM_OFFERS times: the rest is kept). */
+ * or 0 with last error LX_E_STREAM_FLUSH (the callback failed: the kept bytes are dropped) or LX_E_STREAM_KEPT
+ * (it took nothing LX_STREAM_OFFERS times: the rest is kept). */
 LX_API int32_t LXFlushStream(LXStream* stream, LXLocale* locale);
 
 /* The next 16-bit unit, or LX_STREAM_NO_UNIT. With two bytes wanted, a callback that returns -1 ends the input
- * (last error 0), 1 is half a unit, which is kept (63: read on to complete it), and any other count is 64. With
- * the other half wanted, -1 gives 61 and any other count 63. Last error 60 on a write stream. */
+ * (last error LX_OK), 1 is half a unit, which is kept (LX_E_STREAM_HALF: read on to complete it), and any other
+ * count is LX_E_STREAM_COUNT. With the other half wanted, -1 gives LX_E_STREAM_READ and any other count
+ * LX_E_STREAM_HALF. Last error LX_E_STREAM_DIRECTION on a write stream. */
 LX_API LXUChar LXReadCharU(LXStream* stream, LXLocale* locale);
 /* The next character as a packed code, however many calls it takes to get its bytes. A callback that returns 0
- * or -1 before its first byte ends the input: LX_STREAM_END, last error 0, and another call reads on. Otherwise
- * LX_STREAM_FAILURE with last error 63 (0 inside a character), 61 (-1 inside a character), 64 (a count that
- * cannot be) or 60 (write stream). The bytes read are kept for the next call. */
+ * or -1 before its first byte ends the input: LX_STREAM_END, last error LX_OK, and another call reads on.
+ * Otherwise LX_STREAM_FAILURE with last error LX_E_STREAM_HALF (0 inside a character), LX_E_STREAM_READ (-1
+ * inside a character), LX_E_STREAM_COUNT (a count that cannot be) or LX_E_STREAM_DIRECTION (write stream). The
+ * bytes read are kept for the next call. */
 LX_API LXWChar LXReadCharW(LXStream* stream, LXLocale* locale);
 
 /* Reads characters into `output` of `size` bytes until it is full, a line ends or the input does. Returns the
  * bytes stored, the terminator included; -1 when the input ends before anything is read; -2 for an error before
- * that (60, 2, or a code of LXReadCharW). With -1 and -2 nothing is stored. An error behind that ends the
- * string too and is left as the last error beside the bytes stored. A character that does not fit stays in the
- * stream. `flags`: LX_EOL_LF to LX_EOL_FOURTH  line ends that end the string; they are stored. Without any it
- * reads through line ends. A carriage return and line feed are not parted, unless nothing else fits.
+ * that (LX_E_STREAM_DIRECTION, LX_E_INVALID, or a code of LXReadCharW). With -1 and -2 nothing is stored. An
+ * error behind that ends the string too and is left as the last error beside the bytes stored. A character that
+ * does not fit stays in the stream. `flags`:
+ *   LX_EOL_LF to LX_EOL_FOURTH  line ends that end the string; they are stored. Without any it reads through
+ *                               line ends. A carriage return and line feed are not parted, unless nothing else
+ *                               fits.
  *   LX_DROP_RETURNS             takes carriage returns before line feeds out
  *   LX_TERMINATE                keeps a byte of the size for a null, and counts it
  *   LX_CHARACTERS               size and result count characters
@@ -95,26 +100,30 @@ LX_API int32_t LXReadStringW(LXStream* stream, LXLocale* locale, LXWChar* output
 LX_API int32_t LXReadStringU(LXStream* stream, LXLocale* locale, LXUChar* output, int32_t size, uint32_t flags);
 
 /* Puts a character back, to be read before anything else; the last one put back comes first. The length of
- * `character` comes from its first byte. Returns 1, or 0 with last error 60 (write stream) or 40 (more than
- * LX_STREAM_BUFFER bytes would be kept). */
+ * `character` comes from its first byte. Returns 1, or 0 with last error LX_E_STREAM_DIRECTION (write stream)
+ * or LX_E_SIZE (more than LX_STREAM_BUFFER bytes would be kept). */
 LX_API int32_t LXUngetChar(LXStream* stream, LXLocale* locale, const char* character);
+/* As LXUngetChar for a 16-bit unit, in the machine's byte order. */
 LX_API int32_t LXUngetCharU(LXStream* stream, LXLocale* locale, LXUChar unit);
-/* As LXUngetChar. In a shift-sensitive codepage a code of more than one byte is double-byte; a shift byte is
- * kept with the character where the stream is in the other state. */
+/* As LXUngetChar for a packed code. In a shift-sensitive codepage a code of more than one byte is double-byte;
+ * a shift byte is kept with the character where the stream is in the other state. */
 LX_API int32_t LXUngetCharW(LXStream* stream, LXLocale* locale, LXWChar code);
 /* As LXUngetCharW, with the state of the character, which tells its length. */
 LX_API int32_t LXUngetCharEx(LXStream* stream, LXLocale* locale, const char* character, LXShiftState state);
 
 /* Writes a character, behind bytes that were kept earlier. The length of `character` comes from its first byte.
  * Returns 1, or 0 with last error
- *   65  the callback failed or took nothing LX_STREAM_OFFERS times in a row; what it did not take is kept, the
- *       next write or flush offers it again: do not write the character again;
- *   40  the same, and there is no room to keep the character: nothing of it is written, write it again;
- *   60  a read stream. */
+ *   LX_E_STREAM_KEPT       the callback failed or took nothing LX_STREAM_OFFERS times in a row; what it did not
+ *                          take is kept, the next write or flush offers it again: do not write the character
+ *                          again;
+ *   LX_E_SIZE              the same, and there is no room to keep the character: nothing of it is written,
+ *                          write it again;
+ *   LX_E_STREAM_DIRECTION  a read stream. */
 LX_API int32_t LXWriteChar(LXStream* stream, LXLocale* locale, const char* character);
+/* As LXWriteChar for a 16-bit unit, in the machine's byte order. */
 LX_API int32_t LXWriteCharU(LXStream* stream, LXLocale* locale, LXUChar unit);
-/* As LXWriteChar; in a shift-sensitive codepage as LXWriteCharEx, where a code of more than one byte is
- * double-byte. `unused` is not used. */
+/* As LXWriteChar for a packed code; in a shift-sensitive codepage as LXWriteCharEx, where a code of more than
+ * one byte is double-byte. `unused` is not used. */
 LX_API int32_t LXWriteCharW(LXStream* stream, LXLocale* locale, LXWChar code, int32_t unused);
 /* As LXWriteChar, behind the shift byte that is due; `double_byte` tells whether the character has the width of
  * the double-byte state, or one byte. `unused` is not used. */
@@ -125,27 +134,32 @@ LX_API int32_t LXWriteCharEx(LXStream* stream, LXLocale* locale, const char* cha
  * 0: null-terminated), or null. `*kind` and `*eol_length` receive its kind and its length in bytes: LX_EOL_NONE
  * and 0 when there is none. `flags` are LX_CHARACTERS and the kinds to look for; none means LX_EOL_LF. Where
  * several kinds fit, the first of LX_EOL_CRLF, LX_EOL_LF, LX_EOL_THIRD and LX_EOL_FOURTH is found. Other flags:
- * null, last error 2, LX_EOL_INVALID and 0. */
+ * null, last error LX_E_INVALID, LX_EOL_INVALID and 0. */
 LX_API char* LXGetEol(LXLocale* locale, const char* text, int32_t length, uint32_t* kind, int32_t* eol_length,
                       uint32_t flags);
 /* As LXGetEol; the text begins in the single-byte state, and the bytes of double-byte characters end no line.
  */
 LX_API char* LXGetEolEx(LXLocale* locale, const char* text, int32_t length, uint32_t* kind, int32_t* eol_length,
                         uint32_t flags);
-/* Lengths count packed codes, in the U form 16-bit units, which are compared with the Unicode values of the
- * line-end bytes. */
+/* As LXGetEol; packed codes, `length` and `*eol_length` count codes. */
 LX_API LXWChar* LXGetEolW(LXLocale* locale, const LXWChar* text, int32_t length, uint32_t* kind,
                           int32_t* eol_length, uint32_t flags);
+/* As LXGetEol; 16-bit Unicode, `length` and `*eol_length` count units, which are compared with the Unicode
+ * values of the line-end bytes. */
 LX_API LXUChar* LXGetEolU(LXLocale* locale, const LXUChar* text, int32_t length, uint32_t* kind,
                           int32_t* eol_length, uint32_t flags);
 
 /* Stores the line ends that `flags` name and returns the place right behind them; nothing is terminated. Room
- * for 5 units is always enough. `flags` are the kinds and LX_EOL_DEFAULT; none means that one. The order is
+ * for 5 bytes is always enough. `flags` are the kinds and LX_EOL_DEFAULT; none means that one. The order is
  * fixed: fourth byte, third byte, line feed (LX_EOL_LF), carriage return, and one more line feed for
- * LX_EOL_CRLF and LX_EOL_DEFAULT together. Other flags: null and last error 2. Ex: in the single-byte state. */
+ * LX_EOL_CRLF and LX_EOL_DEFAULT together. Other flags: null and last error LX_E_INVALID, with nothing
+ * stored. */
 LX_API char* LXPutEol(LXLocale* locale, char* output, uint32_t flags);
+/* As LXPutEol, in the single-byte state. */
 LX_API char* LXPutEolEx(LXLocale* locale, char* output, uint32_t flags);
+/* As LXPutEol; stores packed codes, at most 5. */
 LX_API LXWChar* LXPutEolW(LXLocale* locale, LXWChar* output, uint32_t flags);
+/* As LXPutEol; stores the Unicode values of the line-end bytes, at most 5 units. */
 LX_API LXUChar* LXPutEolU(LXLocale* locale, LXUChar* output, uint32_t flags);
 
 #ifdef __cplusplus

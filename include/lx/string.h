@@ -14,7 +14,7 @@ extern "C" {
 /* Common to the functions of this header:
  *  lengths  bytes, with LX_CHARACTERS in `flags` characters; below 0: null-terminated. Sizes and results count
  *           the same. In the W forms all of them count codes, in the U forms 16-bit units.
- *  flags    0 or LX_CHARACTERS, and what a function lists; others leave 2 as the last error.
+ *  flags    0 or LX_CHARACTERS, and what a function lists; others leave LX_E_INVALID as the last error.
  *  Ex       for a shift-sensitive codepage: each text begins in the state given behind its pointer. Of the
  * shift bytes between two parts of a text, a Shift-In belongs to the part before it and a Shift-Out to the part
  * behind it. An out state may be null; it is written where the function returns a position. A character that
@@ -31,19 +31,23 @@ LX_API int32_t LXStrcat(LXLocale* locale, char* buffer, int32_t size, const char
  * it was in the other one before and leaves no room for a Shift-In. */
 LX_API int32_t LXStrcatEx(LXLocale* locale, char* buffer, LXShiftState buffer_state, int32_t size,
                           const char* text, LXShiftState text_state, int32_t length, uint32_t flags);
+/* As LXStrcat; packed codes, lengths and result count codes. */
 LX_API int32_t LXWcscat(LXLocale* locale, LXWChar* buffer, int32_t size, const LXWChar* text, int32_t length,
                         uint32_t flags);
+/* As LXStrcat; 16-bit Unicode, lengths and result count units. */
 LX_API int32_t LXStrcatU(LXLocale* locale, LXUChar* buffer, int32_t size, const LXUChar* text, int32_t length,
                          uint32_t flags);
 
-/* The first place of a character in a text, or null. `character` is its packed code, in the U form its 16-bit
- * value; 0 finds the null that ends a null-terminated text. Ex: the place is behind the shift byte, and its
- * state comes in `state`. */
+/* The first place of a character in a text, or null. `character` is its packed code; 0 finds the null that ends
+ * a null-terminated text. */
 LX_API char* LXStrchr(LXLocale* locale, const char* text, int32_t length, LXWChar character, uint32_t flags);
+/* As LXStrchr. The place is behind the shift byte, and its state comes in `state`, which may be null. */
 LX_API char* LXStrchrEx(LXLocale* locale, const char* text, LXShiftState text_state, int32_t length,
                         LXWChar character, LXShiftState* state, uint32_t flags);
+/* As LXStrchr; packed codes, `length` counts codes. */
 LX_API LXWChar* LXWcschr(LXLocale* locale, const LXWChar* text, int32_t length, LXWChar character,
                          uint32_t flags);
+/* As LXStrchr; 16-bit Unicode, `length` counts units, and `character` is a 16-bit value. */
 LX_API LXUChar* LXStrchrU(LXLocale* locale, const LXUChar* text, int32_t length, LXUChar character,
                           uint32_t flags);
 
@@ -56,35 +60,47 @@ LX_API int32_t LXStrcpy(LXLocale* locale, char* output, int32_t size, const char
 /* As LXStrcpy; the copy begins in the state of the text. `state` receives the one that it ends in. */
 LX_API int32_t LXStrcpyEx(LXLocale* locale, char* output, int32_t size, const char* text,
                           LXShiftState text_state, int32_t length, LXShiftState* state, uint32_t flags);
+/* As LXStrcpy; packed codes, lengths and result count codes. */
 LX_API int32_t LXWcscpy(LXLocale* locale, LXWChar* output, int32_t size, const LXWChar* text, int32_t length,
                         uint32_t flags);
+/* As LXStrcpy; 16-bit Unicode, lengths and result count units. */
 LX_API int32_t LXStrcpyU(LXLocale* locale, LXUChar* output, int32_t size, const LXUChar* text, int32_t length,
                          uint32_t flags);
 
-/* The length of a null-terminated string: characters, which are packed codes or 16-bit units. 0 without an
- * initialised library. LXNumChars (lx/codepage.h) counts those of a byte string. */
+/* The codes before the zero that ends a string of packed codes: its characters. 0 without an initialised
+ * library. LXNumChars (lx/codepage.h) counts those of a byte string. */
 LX_API int32_t LXWcslen(LXLocale* locale, const LXWChar* text);
+
+/* The 16-bit units before the null that ends a string. 0 without an initialised library. */
 LX_API int32_t LXStrlenU(LXLocale* locale, const LXUChar* text);
 
-/* How much of the beginning of a text consists of characters that are not in the set (cspn), or that are (spn).
- * A null ends the text, also within its length, and so does a character with a null byte in it. Returns bytes,
- * or -1 for invalid flags. Ex: `state` receives the state behind them. */
+/* How much of the beginning of a text consists of characters that are not in the set. A null ends the text,
+ * also within its length, and so does a character with a null byte in it. Returns bytes, with LX_CHARACTERS
+ * characters, or -1 for invalid flags. */
 LX_API int32_t LXStrcspn(LXLocale* locale, const char* text, int32_t length, const char* set,
                          int32_t set_length, uint32_t flags);
+/* As LXStrcspn; `state`, which may be null, receives the state behind those characters. */
 LX_API int32_t LXStrcspnEx(LXLocale* locale, const char* text, LXShiftState text_state, int32_t length,
                            const char* set, LXShiftState set_state, int32_t set_length, LXShiftState* state,
                            uint32_t flags);
+/* As LXStrcspn; packed codes, lengths and result count codes. */
 LX_API int32_t LXWcscspn(LXLocale* locale, const LXWChar* text, int32_t length, const LXWChar* set,
                          int32_t set_length, uint32_t flags);
+/* As LXStrcspn; 16-bit Unicode, lengths and result count units. */
 LX_API int32_t LXStrcspnU(LXLocale* locale, const LXUChar* text, int32_t length, const LXUChar* set,
                           int32_t set_length, uint32_t flags);
+
+/* As LXStrcspn, of characters that are in the set. */
 LX_API int32_t LXStrspn(LXLocale* locale, const char* text, int32_t length, const char* set, int32_t set_length,
                         uint32_t flags);
+/* As LXStrspn; `state`, which may be null, receives the state behind those characters. */
 LX_API int32_t LXStrspnEx(LXLocale* locale, const char* text, LXShiftState text_state, int32_t length,
                           const char* set, LXShiftState set_state, int32_t set_length, LXShiftState* state,
                           uint32_t flags);
+/* As LXStrspn; packed codes, lengths and result count codes. */
 LX_API int32_t LXWcsspn(LXLocale* locale, const LXWChar* text, int32_t length, const LXWChar* set,
                         int32_t set_length, uint32_t flags);
+/* As LXStrspn; 16-bit Unicode, lengths and result count units. */
 LX_API int32_t LXStrspnU(LXLocale* locale, const LXUChar* text, int32_t length, const LXUChar* set,
                          int32_t set_length, uint32_t flags);
 
@@ -92,7 +108,7 @@ LX_API int32_t LXStrspnU(LXLocale* locale, const LXUChar* text, int32_t length, 
  * those of LXStrcmp but LX_IGNORE_BLANKS, and LX_CHARACTERS; with them as many characters as the substring has
  * are compared by LXStrcoll, from each one on that begins as the substring does; in a single-byte codepage as
  * many bytes by LXStrcmp, without regard to case only. A substring of more bytes than the text is not in it.
- * Null with last error 2 (options) or 20. */
+ * Null with last error LX_E_INVALID (options) or LX_E_MEMORY. */
 LX_API char* LXStrstr(LXLocale* locale, const char* text, int32_t length, const char* part, int32_t part_length,
                       uint32_t options);
 /* As LXStrstr. Characters are compared, not the shift bytes between them; the place is behind the shift byte,
@@ -100,10 +116,10 @@ LX_API char* LXStrstr(LXLocale* locale, const char* text, int32_t length, const 
 LX_API char* LXStrstrEx(LXLocale* locale, const char* text, LXShiftState text_state, int32_t length,
                         const char* part, LXShiftState part_state, int32_t part_length, LXShiftState* state,
                         uint32_t options);
-/* As LXStrstr, and in a single-byte codepage too by LXWcscoll. */
+/* As LXStrstr; packed codes, lengths count codes. In a single-byte codepage too it compares by LXWcscoll. */
 LX_API LXWChar* LXWcsstr(LXLocale* locale, const LXWChar* text, int32_t length, const LXWChar* part,
                          int32_t part_length, uint32_t options);
-/* As LXStrstr, by LXStrcollU. */
+/* As LXStrstr; 16-bit Unicode, lengths count units. It compares by LXStrcollU. */
 LX_API LXUChar* LXStrstrU(LXLocale* locale, const LXUChar* text, int32_t length, const LXUChar* part,
                           int32_t part_length, uint32_t options);
 
@@ -120,8 +136,10 @@ LX_API char* LXStrtok(LXLocale* locale, char* text, int32_t* length, const char*
 LX_API char* LXStrtokEx(LXLocale* locale, char* text, LXShiftState* state, int32_t* length, const char* set,
                         LXShiftState set_state, int32_t set_length, char** next, LXShiftState* token_state,
                         uint32_t flags);
+/* As LXStrtok; packed codes, lengths count codes. */
 LX_API LXWChar* LXWcstok(LXLocale* locale, LXWChar* text, int32_t* length, const LXWChar* set,
                          int32_t set_length, LXWChar** next, uint32_t flags);
+/* As LXStrtok; 16-bit Unicode, lengths count units. */
 LX_API LXUChar* LXStrtokU(LXLocale* locale, LXUChar* text, int32_t* length, const LXUChar* set,
                           int32_t set_length, LXUChar** next, uint32_t flags);
 
@@ -140,7 +158,8 @@ LX_API int32_t LXTruncateStringEx(LXLocale* locale, char* buffer, LXShiftState s
                                   uint32_t flags);
 
 /* Ends a text: stores a Shift-In where a shift-sensitive codepage is in the double-byte state, and with
- * LX_TERMINATE a null. Returns the bytes stored (0 to 2), or -1 with last error 2 for other flags. */
+ * LX_TERMINATE a null. Returns the bytes stored (0 to 2), or -1 with last error LX_E_INVALID for other flags.
+ */
 LX_API int32_t LXTerminateStringEx(LXLocale* locale, char* output, LXShiftState state, uint32_t flags);
 
 #ifdef __cplusplus

@@ -53,9 +53,9 @@ typedef struct LXTime {
  * its magnitude.
  *
  * Names and the formats of %c, %x and %X are used up to 31 bytes (codes in the W forms, units in the U forms).
- * Formats are expanded three deep: one that expands itself gives 51. The date of %c, and %x and %X as a whole,
- * are written from the START OF THE BUFFER and not behind what is there; the text goes on behind the sum of
- * both lengths. Use them at the start of a format only. */
+ * Formats are expanded three deep: one that expands itself gives LX_E_FORMAT. The date of %c, and %x and %X as
+ * a whole, are written from the START OF THE BUFFER and not behind what is there; the text goes on behind the
+ * sum of both lengths. Use them at the start of a format only. */
 
 /* Writes `time` by `format` into `buffer` of `size` bytes. `format_length` counts bytes; below 0:
  * null-terminated. `flags`: LX_TERRITORY_VALUES reads the formats from the territory; LX_TERMINATE ends the
@@ -63,10 +63,11 @@ typedef struct LXTime {
  * the result count characters: at most 512 bytes are worked on, what is beyond `size` characters (the null one
  * of them) is dropped without a code, and `buffer` must hold the bytes that `size` characters can take.
  *
- * Last errors: 2, result -1, for other flags; 40 when the buffer is full, also where the last digit of a number
- * just fitted; 40, result 0, for a size below 1; 37 for a field that a directive uses and that is out of its
- * range; 51 for a "%" or "%#" at the end, an unknown directive, or a character that the end of the format cuts.
- * With 37, 40 and 51 the buffer holds whole characters up to the failure, which the result counts. */
+ * Last errors: LX_E_INVALID, result -1, for other flags; LX_E_SIZE when the buffer is full, also where the last
+ * digit of a number just fitted; LX_E_SIZE, result 0, for a size below 1; LX_E_NOT_FOUND for a field that a
+ * directive uses and that is out of its range; LX_E_FORMAT for a "%" or "%#" at the end, an unknown directive,
+ * or a character that the end of the format cuts. With the last three the buffer holds whole characters up to
+ * the failure, which the result counts. */
 LX_API int32_t LXTimeToString(LXLocale* locale, const LXTime* time, char* buffer, int32_t size,
                               const char* format, int32_t format_length, uint32_t flags);
 /* As LXTimeToString; packed codes, lengths and result count codes. LX_CHARACTERS is ignored. */
@@ -88,10 +89,10 @@ LX_API int32_t LXTimeToStringEx(LXLocale* locale, const LXTime* time, char* buff
  * -1. A length of 0 gives 0. `flags`: LX_TERRITORY_VALUES; with LX_CHARACTERS lengths and result count
  * characters.
  *
- * Last errors: 2 for other flags; 37 when the text does not match, or a number is above its maximum; 51 for a
- * "%" or "%#" at the end of the format, or a directive that cannot be read. Fields that were read before the
- * failure keep their new values, a number above its maximum is stored too, and without a digit the field
- * stays. */
+ * Last errors: LX_E_INVALID for other flags; LX_E_NOT_FOUND when the text does not match, or a number is above
+ * its maximum; LX_E_FORMAT for a "%" or "%#" at the end of the format, or a directive that cannot be read.
+ * Fields that were read before the failure keep their new values, a number above its maximum is stored too, and
+ * without a digit the field stays. */
 LX_API int32_t LXStringToTime(LXLocale* locale, LXTime* time, const char* text, int32_t length,
                               const char* format, int32_t format_length, uint32_t flags);
 /* As LXStringToTime; packed codes, lengths and result count codes. LX_CHARACTERS is ignored. */
