@@ -75,7 +75,8 @@ inline Char small_letter(const Codepage& cp, const uint8_t* p, size_t length) {
   return other != code && code_bytes(other) <= cp.width ? unpacked(other) : c;
 }
 
-/// Passes over what is the same in both, as long as room for any character is left behind it.
+/// Passes over what is the same in both, as long as room for any character is left behind it. Asked for now and
+/// then: behind one difference there is often another.
 inline void pass_equal(MultiByteReader* a, MultiByteReader* b) {
   const size_t most = least(left(*a), left(*b));
   if (most <= kMaxCharBytes) return;
@@ -102,8 +103,8 @@ inline int32_t case_difference(const ShiftReader& a, const ShiftReader& b, uint8
 template <class Reader>
 int32_t compare_case(Reader a, Reader b) {
   const uint8_t* const fold = lower_table(a.cp);
-  while (a.p != a.end && b.p != b.end) {
-    pass_equal(&a, &b);
+  for (size_t chars = 0; a.p != a.end && b.p != b.end; ++chars) {
+    if (chars % kBlock == 0) pass_equal(&a, &b);
     if (*a.p == *b.p && pass_shift(&a)) {
       pass_shift(&b);
       continue;
@@ -179,8 +180,8 @@ inline bool width_differs(RAS1_Unit& unit, const ShiftReader& a, const ShiftRead
 /// In the end what is left of the texts is compared, without shift bytes that stand there.
 template <class Reader>
 int32_t compare_width(RAS1_Unit& unit, Reader a, Reader b) {
-  for (;;) {
-    pass_equal(&a, &b);
+  for (size_t chars = 0;; ++chars) {
+    if (chars % kBlock == 0) pass_equal(&a, &b);
     while (pass_shift(&a)) continue;
     while (pass_shift(&b)) continue;
     if (a.p == a.end || b.p == b.end) return left_difference(a, b);
