@@ -75,7 +75,8 @@ inline Char small_letter(const Codepage& cp, const uint8_t* p, size_t length) {
   return other != code && code_bytes(other) <= cp.width ? unpacked(other) : c;
 }
 
-/// Passes over what is the same in both, as long as room for any character is left behind it.
+/// Passes over what is the same in both, as long as room for any character is left behind it. Asked for now and
+/// then: behind one difference there is often another.
 inline void pass_equal(MultiByteCursor* a, MultiByteCursor* b) {
   const size_t most = least(left(*a), left(*b));
   if (most <= kMaxCharBytes) return;
@@ -102,8 +103,8 @@ inline int32_t case_difference(const ShiftCursor& a, const ShiftCursor& b, uint8
 template <class Cursor>
 int32_t compare_case(Cursor a, Cursor b) {
   const uint8_t* const fold = lower_table(a.cp);
-  while (a.p != a.end && b.p != b.end) {
-    pass_equal(&a, &b);
+  for (size_t chars = 0; a.p != a.end && b.p != b.end; ++chars) {
+    if (chars % kBlock == 0) pass_equal(&a, &b);
     if (*a.p == *b.p && pass_shift(&a)) {
       pass_shift(&b);
       continue;
@@ -127,7 +128,7 @@ int32_t compare_case(Cursor a, Cursor b) {
 
 /// A character in its half-width form, or as it is: as much of it as is there.
 inline Char half_width(const Codepage& cp, const uint8_t* p, size_t length, size_t there) {
-  const uint32_t half = length > there ? 0 : WidthTables(cp).to_half(pack(p, length));
+  const uint32_t half = length > there ? 0 : find_half_width(cp, pack(p, length));
   if (half != 0) return unpacked(half);
   Char c{{}, length};
   memcpy(c.bytes, p, least(length, there));
@@ -179,8 +180,8 @@ inline bool width_differs(RAS1_Unit& unit, const ShiftCursor& a, const ShiftCurs
 /// In the end what is left of the texts is compared, without shift bytes that stand there.
 template <class Cursor>
 int32_t compare_width(RAS1_Unit& unit, Cursor a, Cursor b) {
-  for (;;) {
-    pass_equal(&a, &b);
+  for (size_t chars = 0;; ++chars) {
+    if (chars % kBlock == 0) pass_equal(&a, &b);
     while (pass_shift(&a)) continue;
     while (pass_shift(&b)) continue;
     if (a.p == a.end || b.p == b.end) return left_difference(a, b);
