@@ -9,8 +9,8 @@
 
 #include "core/library_fixture.h"
 #include "core/lxformat.h"
-#include "core/lxobjtypes.h"
 #include "core/small_codepages.h"
+#include "support/tiny_codepages.h"
 
 namespace lx::test {
 namespace {
@@ -114,7 +114,7 @@ void use_locale(LXLocale* locale, bool thorough) {
 
 class FaultTest : public LibraryTest {
  protected:
-  void write_directory(const std::vector<ByteString>& tested = small_double_byte_codepage(),
+  void write_directory(const std::vector<ByteString>& tested = tiny_shift_jis().file.sections,
                        uint16_t id = kTestedId) {
     directory.write_locale(
         {{id, "Under test", tested}, {static_cast<uint16_t>(id + 1), "Old", version1_ascii_codepage(), 1}});
@@ -143,11 +143,11 @@ class FaultTest : public LibraryTest {
     EXPECT_EQ(hooks.live_blocks(), 0u);
   }
 
-  /// Whether a fault is made at this byte: in all of a file's beginning and end, and in every seventh byte of
-  /// the long tables between, which so are met at every place of their records. `turn_` picks other sevenths.
+  /// Whether a fault is made at this byte: in all of a file's beginning and end, and in every 17th byte of the
+  /// long tables between, which so are met at every place of their records. `turn_` picks others each time.
   bool is_tested(size_t at, size_t file_bytes) const {
-    constexpr size_t kBeginning = format::kHeaderBytes + 256, kEnd = 128;
-    return at < kBeginning || at + kEnd >= file_bytes || at % 7 == turn_;
+    constexpr size_t kBeginning = format::kHeaderBytes + 128, kEnd = 64;
+    return at < kBeginning || at + kEnd >= file_bytes || at % 17 == turn_;
   }
 
   void cut_everywhere(const std::string& file, bool refused) {
@@ -205,7 +205,7 @@ class FaultTest : public LibraryTest {
     use_locale(locale, true);
     EXPECT_EQ(LXReleaseLocale(locale), 0);
     EXPECT_EQ(LXTerm(), LX_OK);
-    turn_ = (turn_ + 2) % 7;
+    turn_ = (turn_ + 5) % 17;
   }
 
  private:
@@ -217,7 +217,7 @@ TEST_F(FaultTest, FilesCutAndChangedAnywhere) {
     write_directory();
     ASSERT_NO_FATAL_FAILURE(sweep(file, file != std::string("alias.txt")));
   }
-  for (const auto& codepage : {ascii_codepage(), small_double_byte_codepage(), small_shift_codepage()}) {
+  for (const auto& codepage : {ascii_codepage(), tiny_shift_jis().file.sections, tiny_shift().file.sections}) {
     write_directory(codepage);
     ASSERT_NO_FATAL_FAILURE(sweep("cp_00900.nls", true));
   }
@@ -226,18 +226,16 @@ TEST_F(FaultTest, FilesCutAndChangedAnywhere) {
   cut_everywhere("cp_00900.nls", true);
 }
 
-// The formula reads up to three bytes, whatever the width of a double-byte state would be.
 TEST_F(FaultTest, ComputedUtf8HasNoShiftState) {
-  std::vector<ByteString> sections = small_shift_codepage();
-  put_le16(sections[0].data() + format::codepage::kFlags,
-           format::codepage::kFlagAscii | format::codepage::kFlagShift);
-  for (uint16_t id : {kTestedId, format::codepage::kUtf8Id}) {
-    write_directory(sections, id);
+  std::vector<ByteString> sections = tiny_utf8().file.sections;
+  for (int32_t code : {LX_OK, LX_E_CORRUPT}) {
+    write_directory(sections, format::codepage::kUtf8Id);
     ASSERT_EQ(init(directory.path().c_str(), LX_NO_DEFAULTS), LX_OK);
     int32_t rc = -1;
-    LXGetObjFromID(nullptr, LX_CODEPAGE, id, LX_FIND_AND_LOAD, &rc);
-    EXPECT_EQ(rc, id == kTestedId ? LX_OK : LX_E_CORRUPT);
+    LXGetObjFromID(nullptr, LX_CODEPAGE, format::codepage::kUtf8Id, LX_FIND_AND_LOAD, &rc);
+    EXPECT_EQ(rc, code);
     EXPECT_EQ(LXTerm(), LX_OK);
+    sections[0][format::codepage::kFlags] |= format::codepage::kFlagShift;
   }
 }
 

@@ -193,6 +193,8 @@ TEST_F(ItemTest, ShiftBytesAreWrittenWhereTheyAreDue) {
   EXPECT_EQ(LXSetLocaleTextInfo(locale, 59, "\x35", 1, 0), 1);
   EXPECT_EQ(LXSetLocaleTextInfo(locale, 2, "\xC1\x0E\xC1", 3, 0), 0);
   EXPECT_EQ(LXGetError(locale), LX_E_NOT_FOUND);
+  EXPECT_EQ(LXSetLocaleTextInfo(locale, 10, "\xD6\xD3\xC4", -1, 0), 1);
+  EXPECT_EQ(plain(locale, 10), "Old");
   EXPECT_EQ(LXReleaseLocale(locale), 0);
 }
 

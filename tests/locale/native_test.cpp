@@ -159,6 +159,11 @@ TEST_F(NativeTest, ConventionsOfTheSystem) {
   EXPECT_EQ(item(locale, 62) + item(locale, 59) + item(locale, 60) + item(locale, 64), "3;3;0.,$");
   EXPECT_EQ(LXReleaseLocale(locale), 0);
   locale = LXGetLocale("English.Latin1", 0, nullptr);
+  system.known["xx_YY"] = german;
+  LXMapNativeInfo("xx_YY", locale);
+  EXPECT_EQ(item(locale, 62) + item(locale, 59), "3;3;0.") << "a name of no known codepage";
+  EXPECT_EQ(LXReleaseLocale(locale), 0);
+  locale = LXGetLocale("English.Latin1", 0, nullptr);
   LXMapNativeInfo("xx_XX", locale);
   EXPECT_EQ(item(locale, 62) + item(locale, 59), "3;0.");
   EXPECT_EQ(LXReleaseLocale(locale), 0);
