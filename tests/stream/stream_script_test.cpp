@@ -78,18 +78,17 @@ class StreamScript : public testing::Test {
     }
   }
 
-  template <auto kRead>
-  std::string lines(int32_t size, uint32_t flags) {
+  /// Strings to the end, at most 20.
+  std::string lines(decltype(LXReadString)* read, int32_t size, uint32_t flags) {
     const bool characters = (flags & LX_CHARACTERS) != 0;
     std::string all;
-    for (int32_t n = 0, calls = 0; n >= 0 && calls < 20; ++calls) {
+    for (int calls = 0; calls < 20; ++calls) {
       std::string block(static_cast<size_t>(size) * (characters ? 4 : 1), '#');
       block.shrink_to_fit();
-      n = kRead(stream_, locale_, block.data(), size, flags);
+      const int32_t n = read(stream_, locale_, block.data(), size, flags);
       if (n < 0) return all + std::to_string(n);
-      all += characters ? block.substr(0, block.find('#')) + '=' + std::to_string(n)
-                        : block.substr(0, static_cast<size_t>(n));
-      all += '|';
+      all += block.substr(0, characters ? block.find('#') : static_cast<size_t>(n));
+      all += characters ? '=' + std::to_string(n) + '|' : "|";
     }
     return all;
   }
@@ -105,8 +104,7 @@ class StreamScript : public testing::Test {
     const std::vector<char> exact(words.size() > 1 ? words[1].begin() : call.end(),
                                   words.size() > 1 ? words[1].end() : call.end());
     if (call == "lines" || call == "linesEx") {
-      std::string all =
-          call == "lines" ? lines<LXReadString>(size(), flags()) : lines<LXReadStringEx>(size(), flags());
+      std::string all = lines(call == "lines" ? LXReadString : LXReadStringEx, size(), flags());
       std::replace(all.begin(), all.end(), '\0', '.');
       return all;
     }
