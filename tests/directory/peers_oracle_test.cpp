@@ -65,10 +65,7 @@ class IcuPeer : public Peer {
   }
 
  private:
-  struct Closer {
-    void operator()(UConverter* converter) const { ucnv_close(converter); }
-  };
-  std::unique_ptr<UConverter, Closer> converter_;
+  lexicor_import::IcuPtr<UConverter, ucnv_close> converter_;
 };
 
 class IconvPeer : public Peer {
@@ -166,20 +163,13 @@ std::string family(uint32_t written, uint32_t read) {
   return u_isdigit(w) && u_isdigit(r) ? "digit" : "sign";
 }
 
-std::string hex_of(const std::string& text) {
-  std::string hex;
-  char digits[3];
-  for (char c : text) {
-    snprintf(digits, sizeof(digits), "%02X", static_cast<uint8_t>(c));
-    hex += digits;
-  }
-  return hex.empty() ? "none" : hex;
-}
-
-std::string hex_of(uint32_t u) {
+std::string shown(uint32_t u) {
   char digits[12];
   snprintf(digits, sizeof(digits), "U+%04X", u);
   return u == kNone ? "none" : digits;
+}
+std::string shown(const std::string& bytes) {
+  return testing::PrintToString(bytes);
 }
 
 /// Counts of differences by "peer codepage direction kind", with examples of each: "character:ours/theirs".
@@ -188,7 +178,7 @@ class Differences {
   template <class Value>
   void add(const std::string& line, const std::string& character, const Value& ours, const Value& theirs) {
     auto& [count, examples] = groups_[line];
-    if (count++ < 6) examples += character + ":" + hex_of(ours) + "/" + hex_of(theirs) + " ";
+    if (count++ < 6) examples += character + ":" + shown(ours) + "/" + shown(theirs) + " ";
   }
   void expect_listed() const {
     ListedDifferences all(5);
@@ -228,7 +218,7 @@ void compare(const ShippedCodepage& codepage, const std::string& peer_name, Peer
                        : ours == kNone                        ? "only-theirs"
                        : theirs == kNone                      ? "only-ours"
                                                               : "other-value";
-    differences->add(head + "to-unicode " + kind, hex_of(text), ours, theirs);
+    differences->add(head + "to-unicode " + kind, shown(text), ours, theirs);
   });
   for (uint32_t u = 0; u <= 0xFFFF; ++u) {
     if (u >= 0xD800 && u <= 0xDFFF) continue;
@@ -241,10 +231,10 @@ void compare(const ShippedCodepage& codepage, const std::string& peer_name, Peer
       const bool one_way = read != u && read != kNone;
       const std::string line = one_way ? peer_name + " * from-unicode " + side + "-" + family(u, read)
                                        : head + "from-unicode " + side;
-      differences->add(line, codepage.source.name + " " + hex_of(u), ours, theirs);
+      differences->add(line, codepage.source.name + " " + shown(u), ours, theirs);
     } else {
       const char* kind = is_private(u) ? "private-use" : "other-bytes";
-      differences->add(head + "from-unicode " + kind, hex_of(u), ours, theirs);
+      differences->add(head + "from-unicode " + kind, shown(u), ours, theirs);
     }
   }
 }
@@ -261,21 +251,19 @@ std::string icu_name(const ShippedCodepage& codepage) {
 /// glibc's charsets that a codepage may be: its own name and customary ones, CP and the number where no
 /// multibyte table of another maker has that name.
 std::vector<std::string> iconv_names(const ShippedCodepage& codepage) {
-  static const std::map<std::string, std::string> others = {
-      {"Latin1", "ISO-8859-1"},
-      {"IBM838", "IBM9030"},
-      {"IBM942", "IBM932"},
-      {"IBM1363", "UHC"},
-      {"IBM1386", "GBK"},
-      {"JapanEUC", "EUC-JP"},
-      {"MS932", "CP932"},
-      {"MS936", "CP936"},
-      {"MS949", "UHC"},
-      {"MS950", "BIG5"},
-      {"MacRoman", "MACINTOSH"},
-      {"MacCyrillic", "MAC-CYRILLIC"},
-      {"MacCentralEurope", "MAC-CENTRALEUROPE"},
-  };
+  static const std::map<std::string, std::string> others = {{"Latin1", "ISO-8859-1"},
+                                                            {"IBM838", "IBM9030"},
+                                                            {"IBM942", "IBM932"},
+                                                            {"IBM1363", "UHC"},
+                                                            {"IBM1386", "GBK"},
+                                                            {"JapanEUC", "EUC-JP"},
+                                                            {"MS932", "CP932"},
+                                                            {"MS936", "CP936"},
+                                                            {"MS949", "UHC"},
+                                                            {"MS950", "BIG5"},
+                                                            {"MacRoman", "MACINTOSH"},
+                                                            {"MacCyrillic", "MAC-CYRILLIC"},
+                                                            {"MacCentralEurope", "MAC-CENTRALEUROPE"}};
   const std::string& name = codepage.source.name;
   const auto known = others.find(name);
   if (known != others.end()) return {known->second};

@@ -12,42 +12,6 @@ namespace {
 
 using namespace lx::test;
 
-constexpr int32_t kAll = 1000;       // moves what it is asked to
-constexpr int32_t kNonsense = 2000;  // claims more than that
-
-/// The far end of a stream: what each call does, and behind the script all that is asked for.
-struct Peer {
-  std::string bytes;  // what a write stream sent, or what a read stream is to get
-  std::vector<int32_t> script;
-  size_t calls = 0;
-  size_t given = 0;
-
-  static int32_t transfer(void* user, char* buffer, int32_t wanted) {
-    Peer& peer = *static_cast<Peer*>(user);
-    const int32_t step = peer.calls < peer.script.size() ? peer.script[peer.calls] : kAll;
-    ++peer.calls;
-    EXPECT_GE(wanted, 1);
-    if (step == kNonsense) return wanted + 1;
-    return step < 0 ? step : peer.move(buffer, std::min(step, wanted));
-  }
-  virtual ~Peer() = default;
-  virtual int32_t move(char* buffer, int32_t count) = 0;
-};
-struct Sender : Peer {
-  int32_t move(char* buffer, int32_t count) override {
-    const size_t n = std::min(static_cast<size_t>(count), bytes.size() - given);
-    bytes.copy(buffer, n, given);
-    given += n;
-    return static_cast<int32_t>(n);
-  }
-};
-struct Receiver : Peer {
-  int32_t move(char* buffer, int32_t count) override {
-    bytes.append(buffer, static_cast<size_t>(count));
-    return count;
-  }
-};
-
 std::string printed(const std::string& bytes) {
   return testing::PrintToString(bytes);
 }
@@ -233,191 +197,19 @@ TEST_F(Streams, LinesAreThoseOfTheModel) {
   }
 }
 
-/// "LINE|LINE|..." of a text that is read with this size, nulls as dots; "=COUNT" behind lines of characters.
-template <auto kRead>
-std::string lines(LXLocale* locale, const std::string& text, int32_t size, uint32_t flags) {
-  Sender peer;
-  peer.bytes = text;
-  LXStream* stream = LXOpenStream(locale, Peer::transfer, &peer, LX_STREAM_READ);
-  const bool characters = (flags & LX_CHARACTERS) != 0;
-  std::string all;
-  for (int32_t n = 0, calls = 0; n >= 0 && calls < 20; ++calls) {
-    std::string block(static_cast<size_t>(size) * (characters ? 4 : 1), '#');
-    block.shrink_to_fit();
-    n = kRead(stream, locale, block.data(), size, flags);
-    if (n < 0) all += std::to_string(n);
-    if (n >= 0 && !characters) all += block.substr(0, static_cast<size_t>(n)) + '|';
-    if (n >= 0 && characters) all += block.substr(0, block.find('#')) + '=' + std::to_string(n) + '|';
-  }
-  LXCloseStream(stream, locale);
-  std::replace(all.begin(), all.end(), '\0', '.');
-  return all;
-}
-
-TEST_F(Streams, SizesOfStrings) {
-  LXLocale* jis = library_.locale(codepages_[1]);
-  LXLocale* shift = library_.locale(codepages_[4]);
-  const auto plain = lines<LXReadString>;
-  const auto ex = lines<LXReadStringEx>;
-  const uint32_t kDrop = LX_DROP_RETURNS;
-  const uint32_t kChars = LX_CHARACTERS;
-  // A pair that does not fit waits; alone in a room of one it is parted.
-  EXPECT_EQ(plain(jis, "ab\r\nc", 3, LX_EOL_CRLF), "ab|\r\n|c|-1");
-  EXPECT_EQ(plain(jis, "\r\na", 1, LX_EOL_CRLF), "\r|\n|a|-1");
-  EXPECT_EQ(plain(jis, "ab\r\nc", 3, LX_EOL_CRLF | kDrop), "ab\n|c|-1");
-  EXPECT_EQ(plain(jis, "a\r\r\nb\r", 9, kDrop), "a\r\nb\r|-1");
-  EXPECT_EQ(plain(jis, "\x82\xA0\x82\xA0z", 3, 0), "\x82\xA0|\x82\xA0z|-1");
-  EXPECT_EQ(plain(jis, "\x82\xA0\x82\xA0z", 3, LX_TERMINATE), "\x82\xA0.|\x82\xA0.|z.|-1");
-  EXPECT_EQ(plain(jis, "\x82\xA0zz", 2, kChars), "\x82\xA0z=2|z=1|-1");
-  EXPECT_EQ(plain(jis, "\x82\xA0zz", 2, kChars | LX_TERMINATE), "\x82\xA0.=2|z.=2|z.=2|-1");
-  EXPECT_EQ(plain(jis, "ab", 1, LX_TERMINATE).substr(0, 4), ".|.|") << "no room for a character";
-  EXPECT_EQ(plain(jis, "a\x82", 9, 0), "a|-2") << "half a character";
-  EXPECT_EQ(plain(jis, "a", 9, 0x1000), "-2");
-  // A string of the Ex form has room for its Shift-In.
-  EXPECT_EQ(ex(shift, "\x0E\x44\x47\x44\x48\x0F\xC1", 6, 0), "\x0E\x44\x47\x44\x48\x0F|\xC1|-1");
-  EXPECT_EQ(ex(shift, "\x0E\x44\x47\x44\x48\x0F\xC1", 5, 0), "\x0E\x44\x47\x0F|\x0E\x44\x48\x0F\xC1|-1");
-  EXPECT_EQ(ex(shift, "\x0E\x44\x47\x0F\x0E\x44\x48", 1, kChars), "\x0E\x44\x47\x0F=1|\x0E\x44\x48\x0F=1|-1");
-  EXPECT_EQ(ex(shift, "\x0E\x44\x47\x44\x25\x0F\x25\xC1", 9, LX_EOL_LF),
-            "\x0E\x44\x47\x44\x25\x0F\x25|\xC1|-1");
-  EXPECT_EQ(ex(shift, "\x0E\x44\x47", 3, 0).substr(0, 2), "||") << "no room for a character";
-}
-
-TEST_F(Streams, UnitsByHalves) {
-  struct Row {
-    std::vector<int32_t> script;  // the first read takes the first step
-    int32_t first, second;        // codes; 0xFFFF comes with them, or the unit 'AB'
-    bool end;                     // the first one: no unit, and no error
-  };
-  const Row rows[] = {{{1}, 63, 0, false},     {{-1}, 0, 0, true},
-                      {{0}, 64, 0, false},     {{kNonsense}, 64, 0, false},
-                      {{-2}, 64, 0, false},    {{1, -1}, 63, 61, false},
-                      {{1, 0}, 63, 63, false}, {{1, kNonsense}, 63, 63, false},
-                      {{1, -2}, 63, 63, false}};
-  LXLocale* locale = library_.locale(codepages_[0]);
-  for (const Row& row : rows) {
-    SCOPED_TRACE(&row - rows);
-    Sender peer;
-    peer.bytes = "AB";
-    peer.script = row.script;
-    LXStream* stream = open(locale, peer, LX_STREAM_READ);
-    LXUChar unit = 0;
-    memcpy(&unit, "AB", 2);
-    EXPECT_EQ(LXReadCharU(stream, locale), LX_STREAM_NO_UNIT);
-    EXPECT_EQ(LXGetError(locale), row.end ? LX_OK : row.first);
-    EXPECT_EQ(LXReadCharU(stream, locale), row.second == 0 ? unit : LX_STREAM_NO_UNIT);
-    EXPECT_EQ(LXGetError(locale), row.second);
-    if (row.second != 0) {
-      EXPECT_EQ(LXReadCharU(stream, locale), unit) << "the half is kept";
-    }
-    EXPECT_EQ(LXCloseStream(stream, locale), 1);
-  }
-}
-
-TEST_F(Streams, PushedBackToTheLimit) {
-  LXLocale* jis = library_.locale(codepages_[1]);
-  Sender peer;
-  LXStream* stream = open(jis, peer, LX_STREAM_READ);
-  for (int i = 0; i < 39; ++i) EXPECT_EQ(LXUngetChar(stream, jis, "\x82\xA0"), 1);
-  EXPECT_EQ(LXUngetChar(stream, jis, "a"), 1);
-  EXPECT_EQ(LXUngetCharU(stream, jis, 0x4141), 0);
-  EXPECT_EQ(LXGetError(jis), LX_E_SIZE);
-  EXPECT_EQ(LXUngetCharEx(stream, jis, "b", 1), 1)
-      << "the 80th byte; without shift states the state says nothing";
-  EXPECT_EQ(LXUngetCharW(stream, jis, 'c'), 0);
-  EXPECT_EQ(LXGetError(jis), LX_E_SIZE);
-  EXPECT_EQ(LXReadCharW(stream, jis), LXWChar{'b'});
-  EXPECT_EQ(LXReadCharW(stream, jis), LXWChar{'a'});
-  for (int i = 0; i < 39; ++i) EXPECT_EQ(LXReadCharW(stream, jis), LXWChar{0x82A0});
-  EXPECT_EQ(LXReadCharW(stream, jis), LX_STREAM_END);
-  EXPECT_EQ(LXUngetChar(stream, jis, "a"), 1);
-  EXPECT_EQ(LXFlushStream(stream, jis), 1);
-  EXPECT_EQ(LXReadCharW(stream, jis), LX_STREAM_END) << "flushed";
-  peer.script.assign(peer.calls + 1, -1);
-  EXPECT_EQ(LXReadCharW(stream, jis), LX_STREAM_END) << "a failure before the first byte";
-  EXPECT_EQ(LXGetError(jis), LX_OK);
-  EXPECT_EQ(LXCloseStream(stream, jis), 1);
-
-  // Flushing keeps the state of what follows.
-  LXLocale* shift = library_.locale(codepages_[4]);
-  peer.bytes = "\x0E\x44\x47\x44\x48";
-  stream = open(shift, peer, LX_STREAM_READ);
-  EXPECT_EQ(LXReadCharW(stream, shift), LXWChar{0x4447});
-  EXPECT_EQ(LXUngetCharW(stream, shift, 0xC1), 1);
-  EXPECT_EQ(LXFlushStream(stream, shift), 1);
-  EXPECT_EQ(LXReadCharW(stream, shift), LXWChar{0x4448});
-  EXPECT_EQ(LXCloseStream(stream, shift), 1);
-}
-
-TEST_F(Streams, WhatTheCallbackDoesNotTake) {
-  LXLocale* shift = library_.locale(codepages_[4]);
-  Receiver peer;
-  LXStream* stream = open(shift, peer, LX_STREAM_WRITE);
-  peer.script = {-1};
-  EXPECT_EQ(LXWriteCharW(stream, shift, 0x4447, 0), 0);
-  EXPECT_EQ(LXGetError(shift), LX_E_STREAM_KEPT);
-  peer.script.assign(1000, -1);
-  for (int i = 0; i < 38; ++i) EXPECT_EQ(LXWriteCharEx(stream, shift, "\x44\x48", 1, 0), 0);
-  EXPECT_EQ(LXWriteCharW(stream, shift, 0xC1, 0), 0) << "79 bytes are kept; a Shift-In and a byte do not fit";
-  EXPECT_EQ(LXGetError(shift), LX_E_SIZE);
-  EXPECT_EQ(LXWriteChar(stream, shift, "\xC2"), 0);
-  EXPECT_EQ(LXGetError(shift), LX_E_STREAM_KEPT) << "the plain form knows no shift byte: 80";
-  peer.script.assign(2 * LX_STREAM_OFFERS, 0);
-  peer.script[LX_STREAM_OFFERS - 1] = 1;  // in a row: it counts from here again
-  peer.calls = 0;
-  EXPECT_EQ(LXFlushStream(stream, shift), 0);
-  EXPECT_EQ(peer.calls, peer.script.size());
-  EXPECT_EQ(LXGetError(shift), LX_E_STREAM_KEPT);
-  EXPECT_EQ(LXFlushStream(stream, shift), 1);
-  std::string expected = "\x0E\x44\x47";
-  for (int i = 0; i < 38; ++i) expected += "\x44\x48";
-  EXPECT_EQ(printed(peer.bytes), printed(expected + "\xC2"));
-  peer.bytes.clear();
-  peer.calls = 0;
-  peer.script = {0, -1, -1};
-  EXPECT_EQ(LXWriteCharW(stream, shift, 0x4448, 0), 0);
-  EXPECT_EQ(LXFlushStream(stream, shift), 0);
-  EXPECT_EQ(LXGetError(shift), LX_E_STREAM_FLUSH);
-  EXPECT_EQ(LXFlushStream(stream, shift), 1) << "dropped";
-  // Closing: the Shift-In in a call of its own.
-  const size_t calls = peer.calls;
-  EXPECT_EQ(LXCloseStream(stream, shift), 1);
-  EXPECT_EQ(peer.bytes, "\x0F");
-  EXPECT_EQ(peer.calls, calls + 1);
-  for (bool kept : {false, true}) {
-    peer.script.assign(kept ? peer.calls + 99 : 0, -1);
-    stream = open(shift, peer, LX_STREAM_WRITE);
-    EXPECT_EQ(LXWriteCharW(stream, shift, 0x4447, 0), kept ? 0 : 1);
-    peer.script.assign(peer.calls + 99, -1);
-    EXPECT_EQ(LXCloseStream(stream, shift), 0);
-    EXPECT_EQ(LXGetError(shift), LX_E_STREAM_FLUSH);
-  }
-}
-
-TEST_F(Streams, RefusedCalls) {
+TEST_F(Streams, ModesAndMemory) {
   LXLocale* locale = library_.locale(codepages_[1]);
-  Sender from;
-  Receiver to;
-  EXPECT_EQ(LXOpenStream(locale, Peer::transfer, &to, 0x80000052u), nullptr);
+  Receiver peer;
+  EXPECT_EQ(LXOpenStream(locale, Peer::transfer, &peer, 0x80000052u), nullptr);
   EXPECT_EQ(LXGetError(locale), LX_E_INVALID);
   library_.hooks().fail_at(1);
-  EXPECT_EQ(LXOpenStream(locale, Peer::transfer, &to, LX_STREAM_WRITE), nullptr);
+  EXPECT_EQ(LXOpenStream(locale, Peer::transfer, &peer, LX_STREAM_WRITE), nullptr);
   EXPECT_EQ(LXGetError(locale), LX_E_MEMORY);
-  LXStream* in = open(locale, from, LX_STREAM_READ);
-  LXStream* out = open(locale, to, LX_STREAM_WRITE);
-  char byte = 0;
-  EXPECT_EQ(LXReadCharU(out, locale), LX_STREAM_NO_UNIT);
-  EXPECT_EQ(LXReadCharW(out, locale), LX_STREAM_FAILURE);
-  EXPECT_EQ(LXReadStringEx(out, locale, &byte, 1, 0), -2);
-  EXPECT_EQ(LXUngetChar(out, locale, "a"), 0);
-  EXPECT_EQ(LXWriteChar(in, locale, "a"), 0);
-  EXPECT_EQ(LXGetError(locale), LX_E_STREAM_DIRECTION);
-  EXPECT_EQ(in->count + out->count, 0);
-  EXPECT_EQ(from.calls + to.calls, 0u);
+  LXStream* stream = open(locale, peer, LX_STREAM_WRITE);
   library_.hooks().fail_frees(true);
-  EXPECT_EQ(LXCloseStream(in, locale), 0);
+  EXPECT_EQ(LXCloseStream(stream, locale), 0);
   EXPECT_EQ(LXGetError(locale), LX_E_FREE);
   library_.hooks().fail_frees(false);
-  EXPECT_EQ(LXCloseStream(out, locale), 1);
 }
 
 }  // namespace

@@ -1,7 +1,10 @@
-// Texts of the small codepages in all forms, full of line ends of every kind, and a model of line ends that
-// works on characters.
+// Texts of the small codepages in all forms, full of line ends of every kind, a model of line ends that works
+// on characters, and the far end of a stream.
 #pragma once
 
+#include <gtest/gtest.h>
+
+#include <algorithm>
 #include <functional>
 #include <random>
 
@@ -98,6 +101,42 @@ inline std::vector<char> closed_bytes(const TinyCodepage& cp, const Text& text) 
   if (state == LX_SHIFT_DOUBLE) bytes += cp.shift_in;
   return {bytes.begin(), bytes.end()};
 }
+
+inline constexpr int32_t kAll = 1000;       // moves what it is asked to
+inline constexpr int32_t kNonsense = 2000;  // claims more than that
+
+/// The far end of a stream: what each call does, and behind the script all that is asked for.
+struct Peer {
+  std::string bytes;  // what a write stream sent, or what a read stream is to get
+  std::vector<int32_t> script;
+  size_t calls = 0;
+  size_t given = 0;
+
+  static int32_t transfer(void* user, char* buffer, int32_t wanted) {
+    Peer& peer = *static_cast<Peer*>(user);
+    const int32_t step = peer.calls < peer.script.size() ? peer.script[peer.calls] : kAll;
+    ++peer.calls;
+    EXPECT_GE(wanted, 1);
+    if (step == kNonsense) return wanted + 1;
+    return step < 0 ? step : peer.move(buffer, std::min(step, wanted));
+  }
+  virtual ~Peer() = default;
+  virtual int32_t move(char* buffer, int32_t count) = 0;
+};
+struct Sender : Peer {
+  int32_t move(char* buffer, int32_t count) override {
+    const size_t n = std::min(static_cast<size_t>(count), bytes.size() - given);
+    bytes.copy(buffer, n, given);
+    given += n;
+    return static_cast<int32_t>(n);
+  }
+};
+struct Receiver : Peer {
+  int32_t move(char* buffer, int32_t count) override {
+    bytes.append(buffer, static_cast<size_t>(count));
+    return count;
+  }
+};
 
 /// The doors of the four forms under one name each.
 template <class U, auto kEncode, auto kRead, auto kGetEol, auto kPutEol>
