@@ -186,6 +186,31 @@ TEST_F(Convert, BetweenCodepages) {
     }
 }
 
+/// Error 2 and -1, but 0 from the functions between locales where LX_CHARACTERS is among the flags: callers
+/// rely on it.
+TEST_F(Convert, UndefinedFlags) {
+  LXLocale* const l = locale(case_codepage("SJIS"));
+  const LXUChar units[] = {'a', 'b', 0};
+  const LXWChar codes[] = {'a', 'b', 0};
+  LXWChar wide[4] = {7};
+  LXUChar unicode[4] = {7};
+  char out[4] = {7};
+  for (const I flags : {1, 2, 0x10, 0x8000, 0x4001, 0x4010, -1}) {
+    const I between = (flags & LX_CHARACTERS) != 0 ? 0 : -1;
+    for (const auto& [result, expected] : {std::pair(LXConvertString(l, out, 4, l, "ab", 2, flags), between),
+                                           {LXConvertStringEx(l, out, 0, 4, l, "ab", 0, 2, flags), between},
+                                           {LXConvertStringW(l, wide, 4, l, codes, 2, flags), between},
+                                           {LXStringToUnicode(unicode, 4, l, "ab", 2, flags), -1},
+                                           {LXUnicodeToString(l, out, 4, units, 2, flags), -1},
+                                           {LXMbToWide(l, wide, 4, "ab", 2, flags | LX_TERMINATE), -1},
+                                           {LXWideToMb(l, out, 4, codes, 2, LX_TERMINATE), -1}}) {
+      EXPECT_EQ(result, expected) << flags;
+      EXPECT_EQ(LXGetError(l), LX_E_INVALID);
+    }
+  }
+  EXPECT_EQ(wide[0] + unicode[0] + static_cast<unsigned>(out[0]), 21u) << "nothing is written";
+}
+
 /// ASCII is moved in blocks: another character at every place of a text that is longer than two of them; from
 /// Unicode also values whose low byte looks like ASCII.
 TEST_F(Convert, RunsOfAsciiAroundOtherCharacters) {

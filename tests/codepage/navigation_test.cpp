@@ -4,176 +4,146 @@
 
 #include <random>
 
-#include "support/tiny_codepages.h"
+#include "core/lxrecords.h"
+#include "support/case_library.h"
+#include "support/encoded_text.h"
 
 namespace lx::test {
 namespace {
 
 constexpr LXShiftState kUntouched = 77;
 
-/// A text and where its tokens end: shift bytes and characters, in order.
-struct Token {
-  size_t begin, end;
-  LXShiftState state_after;
-  const TinyCharacter* character;  // null: a shift byte
-};
-struct Walk {
-  std::vector<char> bytes;  // with a null behind the last token
-  std::vector<Token> tokens;
-
-  size_t size() const { return bytes.size() - 1; }
-  const char* begin() const { return bytes.data(); }
-  /// Whole characters, the last token's end and the state there, in the first `bytes` bytes.
-  int32_t chars_in(size_t count) const {
-    int32_t n = 0;
-    for (const Token& t : tokens) n += t.character != nullptr && t.end <= count;
-    return n;
-  }
-  Token last_in(size_t count, LXShiftState initial) const {
-    Token last{0, 0, initial, nullptr};
-    for (const Token& t : tokens)
-      if (t.end <= count) last = t;
-    return last;
-  }
-};
-
-/// Random characters but the null, with shift bytes between them where needed, and here and there where not.
-Walk random_text(const TinyCodepage& cp, std::mt19937* random, size_t chars, LXShiftState state) {
-  Walk text;
-  std::string bytes;
-  const auto add_shift = [&] {
-    state = state == LX_SHIFT_SINGLE ? LX_SHIFT_DOUBLE : LX_SHIFT_SINGLE;
-    text.tokens.push_back({bytes.size(), bytes.size() + 1, state, nullptr});
-    bytes.push_back(state == LX_SHIFT_DOUBLE ? cp.shift_out : cp.shift_in);
-  };
-  for (size_t i = 0; i < chars; ++i) {
-    const TinyCharacter* c = nullptr;
-    do c = &cp.characters[(*random)() % cp.characters.size()];
-    while (c->unicode == 0);
-    if (cp.shift && (c->bytes.size() > 1) != (state == LX_SHIFT_DOUBLE)) add_shift();
-    text.tokens.push_back({bytes.size(), bytes.size() + c->bytes.size(), state, c});
-    bytes += c->bytes;
-  }
-  if (cp.shift && state == LX_SHIFT_DOUBLE && (*random)() % 2 == 0) add_shift();
-  text.bytes.assign(bytes.c_str(), bytes.c_str() + bytes.size() + 1);
-  return text;
-}
-
 class Navigation : public testing::Test {
  protected:
   void TearDown() override { EXPECT_TRUE(library_.close()); }
 
+  /// Random characters but the null; in a shift-sensitive codepage from a state on, the last shift byte only
+  /// now and then.
+  Encoded<Ex> random_text(const TinyCodepage& cp, size_t chars, LXShiftState state) {
+    Units text;
+    while (text.size() < chars) {
+      const LXUChar u = cp.characters[random_() % cp.characters.size()].unicode;
+      if (u != 0) text.push_back(u);
+    }
+    Encoded<Ex> made(cp, text, state);
+    if (!made.shifts.empty() && made.shifts.back() + 1 == made.units.size() && random_() % 2 == 0) {
+      made.units.pop_back();
+      made.shifts.pop_back();
+    }
+    return made;
+  }
+  /// The last place behind a character or shift byte of the first units, and the state there.
+  static std::pair<size_t, LXShiftState> last_in(const Encoded<Ex>& text, size_t units, LXShiftState state) {
+    size_t at = 0;
+    for (const size_t end : text.end) at = end <= units ? std::max(at, end) : at;
+    for (const size_t shift : text.shifts) {
+      if (shift >= units) break;
+      at = std::max(at, shift + 1);
+      state = text.units[shift] == text.shift_in ? LX_SHIFT_SINGLE : LX_SHIFT_DOUBLE;
+    }
+    return {at, state};
+  }
+
   /// Whole characters of every beginning of a text, and their end.
-  void counts(const TinyCodepage& cp, const Walk& text, LXShiftState initial) {
-    LXLocale* locale = library_.locale(cp);
-    const LXObject* object = library_.object(cp);
-    for (size_t n = 0; n <= text.size() + 1; ++n) {
-      const bool null = n > text.size();
-      const size_t size = null ? text.size() : n;
+  void counts(const TinyCodepage& cp, const Encoded<Ex>& text, LXShiftState initial) {
+    LXLocale* const in = library_.locale(cp);
+    for (size_t n = 0; n <= text.units.size() + 1; ++n) {
+      const bool null = n > text.units.size();
       const int32_t bytes = null ? -1 : static_cast<int32_t>(n);
-      const std::vector<char> cut(text.begin(), text.begin() + n);  // nothing behind the end may be read
-      const int32_t chars = text.chars_in(size);
-      const Token last = text.last_in(size, initial);
-      EXPECT_EQ(LXNumCharsEx(locale, cut.data(), initial, bytes), chars);
-      EXPECT_EQ(LXCpStrByteToCharLen(object, cut.data(), initial, bytes), chars);
-      if (!cp.shift) {
-        EXPECT_EQ(LXNumChars(locale, cut.data(), bytes), chars);
-      }
+      const std::vector<char> cut =
+          null ? text.terminated() : text.cut(n);  // nothing behind the end may be read
+      const auto chars = static_cast<int32_t>(text.whole(n));
+      EXPECT_EQ(LXNumCharsEx(in, cut.data(), initial, bytes), chars);
+      EXPECT_EQ(LXCpStrByteToCharLen(in->codepage, cut.data(), initial, bytes), chars);
+      EXPECT_EQ(cp.shift ? chars : LXNumChars(in, cut.data(), bytes), chars);
       if (null) continue;
+      const auto [last, state_there] = last_in(text, n, initial);
       LXShiftState state = kUntouched;
-      EXPECT_EQ(LXMoveStringPointerEx(locale, cut.data(), initial, bytes, &state, 0), cut.data() + last.end);
-      EXPECT_EQ(state, n == 0 && cp.shift ? kUntouched : last.state_after);
-      if (!cp.shift) {
-        EXPECT_EQ(LXMoveStringPointer(locale, cut.data(), bytes, 0), cut.data() + last.end);
-      }
+      EXPECT_EQ(LXMoveStringPointerEx(in, cut.data(), initial, bytes, &state, 0), cut.data() + last);
+      EXPECT_EQ(state, n == 0 && cp.shift ? kUntouched : state_there);
+      EXPECT_EQ(cp.shift ? cut.data() + last : LXMoveStringPointer(in, cut.data(), bytes, 0),
+                cut.data() + last);
     }
   }
-  TinyLibrary library_;
+
+  CaseLibrary library_;
+  std::mt19937 random_{1};
 };
 
 TEST_F(Navigation, StatelessTextInPlainAndExForms) {
-  std::mt19937 random(1);
-  for (const TinyCodepage& cp : tiny_codepages()) {
+  for (const TinyCodepage& cp : case_codepages()) {
     if (cp.shift) continue;
     SCOPED_TRACE(cp.file.name);
-    LXLocale* locale = library_.locale(cp);
-    const LXObject* object = library_.object(cp);
+    LXLocale* const in = library_.locale(cp);
     for (int round = 0; round < 60; ++round) {
-      const LXShiftState given = random() % 2;
-      const Walk text = random_text(cp, &random, random() % 12, given);
-      const char* start = text.begin();
-      LXShiftState state = kUntouched;
-      int32_t index = 0;
-      for (const Token& t : text.tokens) {
-        const char* p = start + t.begin;
-        const char* next = start + t.end;
-        EXPECT_EQ(LXNextChar(locale, p), next);
-        EXPECT_EQ(LXNextCharEx(locale, p, given, &state, 0), next);
-        EXPECT_EQ(state, given);
-        EXPECT_EQ(LXPrevChar(locale, start, next), p);
-        EXPECT_EQ(LXPrevCharEx(locale, start, next, given, &state), p);
-        EXPECT_EQ(LXGetChar(locale, p), t.character->code);
-        EXPECT_EQ(LXGetCharEx(locale, p, given), t.character->code);
-        EXPECT_EQ(LXMbToW(object, p), t.character->code);
-        const int32_t length = static_cast<int32_t>(t.end - t.begin);
-        EXPECT_EQ(LXByteLength(locale, p), length);
-        EXPECT_EQ(LXByteLengthEx(locale, p, given), length);
-        EXPECT_EQ(LXByteLengthW(locale, t.character->code), length);
-        EXPECT_EQ(LXValidChar(locale, p), length);
-        EXPECT_EQ(LXValidCharEx(locale, p, given), length);
-        ++index;
-        EXPECT_EQ(LXCpStrCharToByteLen(object, start, given, index), static_cast<int32_t>(t.end));
-        EXPECT_EQ(LXMoveStringPointer(locale, start, index, LX_CHARACTERS), next);
-        EXPECT_EQ(LXMoveStringPointerEx(locale, start, given, index, &state, LX_CHARACTERS), next);
+      states.text = random_() % 2;
+      const Encoded<Ex> text = random_text(cp, random_() % 12, states.text);
+      const std::vector<char> bytes = text.terminated();
+      const char* const start = bytes.data();
+      for (size_t i = 0; i < text.count(); ++i) {
+        const char *const p = start + text.start[i], *const next = start + text.end[i];
+        const auto walk = [&](const auto& form) {
+          const auto index = static_cast<int32_t>(i + 1);
+          states.result = kUntouched;
+          EXPECT_EQ(form.next(in, p), next);
+          EXPECT_EQ(form.previous(in, start, next), p);
+          EXPECT_EQ(form.code(in, p), text.codes[i]);
+          EXPECT_EQ(form.length(in, p), next - p);
+          EXPECT_EQ(form.valid(in, p), next - p);
+          EXPECT_EQ(form.move(in, start, index, LX_CHARACTERS), next);
+          EXPECT_TRUE(form.name != kEx.name || states.result == states.text);
+        };
+        walk(kPlain), walk(kEx);
+        EXPECT_EQ(LXMbToW(in->codepage, p), text.codes[i]);
+        EXPECT_EQ(LXByteLengthW(in, text.codes[i]), next - p);
+        EXPECT_EQ(LXCpStrCharToByteLen(in->codepage, start, states.text, static_cast<int32_t>(i + 1)),
+                  next - start);
       }
-      counts(cp, text, given);
+      counts(cp, text, states.text);
     }
   }
+  states = {};
 }
 
 TEST_F(Navigation, ShiftSensitiveText) {
-  std::mt19937 random(2);
-  const TinyCodepage cp = tiny_shift();
-  LXLocale* locale = library_.locale(cp);
-  const LXObject* object = library_.object(cp);
+  const TinyCodepage& cp = case_codepage("SHIFT");
+  LXLocale* const in = library_.locale(cp);
   for (int round = 0; round < 400; ++round) {
-    const LXShiftState initial = random() % 2;
-    const Walk text = random_text(cp, &random, random() % 10, initial);
-    const char* start = text.begin();
-    int32_t count = 0;
-    const char* p = start;
+    const LXShiftState initial = random_() % 2;
+    const Encoded<Ex> text = random_text(cp, random_() % 10, initial);
+    const std::vector<char> bytes = text.terminated();
+    const char *const start = bytes.data(), *p = start;
     LXShiftState state = initial;
-    for (const Token& t : text.tokens) {
-      if (t.character == nullptr) continue;
-      const bool shift_behind = &t != &text.tokens.back() && (&t)[1].character == nullptr;
-      const Token& last = shift_behind ? (&t)[1] : t;
-      EXPECT_EQ(LXGetCharEx(locale, p, state), t.character->code);
-      EXPECT_EQ(LXByteLengthEx(locale, p, state), static_cast<int32_t>(t.end - t.begin));
-      EXPECT_EQ(LXMbToWS(object, start + t.begin, t.state_after), t.character->code);
-      LXShiftState next_state = kUntouched;
-      const char* next = LXNextCharEx(locale, p, state, &next_state, 0);
-      EXPECT_EQ(next, start + last.end);
-      EXPECT_EQ(next_state, last.state_after);
-      LXShiftState prev_state = kUntouched;
-      EXPECT_EQ(LXPrevCharEx(locale, start, next, next_state, &prev_state), start + t.begin);
-      EXPECT_EQ(prev_state, t.state_after);
-      ++count;
-      EXPECT_EQ(LXCpStrCharToByteLen(object, start, initial, count), static_cast<int32_t>(last.end));
-      EXPECT_EQ(LXMoveStringPointerEx(locale, start, initial, count, &state, LX_CHARACTERS), start + last.end);
-      EXPECT_EQ(state, last.state_after);
-      p = next;
+    for (size_t i = 0; i < text.count(); ++i) {
+      const char* const character = start + text.start[i];
+      const auto width = static_cast<LXShiftState>(text.end[i] - text.start[i]);
+      const bool shift_behind = std::count(text.shifts.begin(), text.shifts.end(), text.end[i]) != 0;
+      const char* const behind = start + text.end[i] + shift_behind;
+      const LXShiftState own = width - 1, state_behind = shift_behind ? 1 - own : own;
+      EXPECT_EQ(LXGetCharEx(in, p, state), text.codes[i]);
+      EXPECT_EQ(LXByteLengthEx(in, p, state), static_cast<int32_t>(width));
+      EXPECT_EQ(LXMbToWS(in->codepage, character, own), text.codes[i]);
+      LXShiftState next_state = kUntouched, previous_state = kUntouched;
+      EXPECT_EQ(LXNextCharEx(in, p, state, &next_state, 0), behind);
+      EXPECT_EQ(next_state, state_behind);
+      EXPECT_EQ(LXPrevCharEx(in, start, behind, next_state, &previous_state), character);
+      EXPECT_EQ(previous_state, own);
+      const auto count = static_cast<int32_t>(i + 1);
+      EXPECT_EQ(LXCpStrCharToByteLen(in->codepage, start, initial, count), behind - start);
+      EXPECT_EQ(LXMoveStringPointerEx(in, start, initial, count, &state, LX_CHARACTERS), behind);
+      EXPECT_EQ(state, state_behind);
+      p = behind;
     }
     counts(cp, text, initial);
   }
 }
 
 TEST_F(Navigation, PackedCodes) {
-  struct Row {
+  const struct {
     uint32_t code;
     std::string bytes;
     int32_t code_length;  // zero bytes counted
-  };
-  const Row rows[] = {
+  } rows[] = {
       {0x00, std::string("\0", 1), 1},
       {0x41, "A", 1},
       {0x82A0, "\x82\xA0", 2},
@@ -185,8 +155,8 @@ TEST_F(Navigation, PackedCodes) {
       {0x90300030, "\x90\x30\x30", 4},
       {0x90008100, std::string("\x90\x81\0", 3), 4},
   };
-  LXLocale* locale = library_.locale(tiny_single());
-  for (const Row& row : rows) {
+  LXLocale* locale = library_.locale(case_codepage("SINGLE"));
+  for (const auto& row : rows) {
     SCOPED_TRACE(row.code);
     EXPECT_EQ(LXStrByteLength(row.code), row.code_length);
     EXPECT_EQ(LXByteLengthW(locale, row.code), row.code_length);

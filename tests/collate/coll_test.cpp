@@ -272,20 +272,6 @@ TEST_F(CollateTest, SpecialsBehindPairs) {
   EXPECT_EQ(compare("ch-a", "x-b"), -1);
 }
 
-TEST_F(CollateTest, MemoryThatFails) {
-  open(example_sort());
-  const Units lower(300, 'a'), upper(300, 'A');
-  uint8_t buffer[16];
-  library->hooks().fail_at(1, true);
-  EXPECT_EQ(compare(kUnicode, lower, upper), 0);
-  EXPECT_EQ(LXGetError(in), LX_E_MEMORY);
-  EXPECT_EQ(LXStrxfrmU(in, buffer, 16, lower.data(), 300, 0), -1);
-  EXPECT_EQ(LXGetError(in), LX_E_MEMORY);
-  EXPECT_EQ(LXStrGenSortKey(in, buffer, 16, lower.data(), 300), -1);
-  library->hooks().fail_at(0);
-  EXPECT_EQ(compare(kUnicode, lower, upper), -1);
-}
-
 /// Every table lies inside the payload, or the sort is refused.
 TEST_F(LibraryTest, BadSorts) {
   directory.write_locale({{367, "US-ASCII", ascii_codepage()}});

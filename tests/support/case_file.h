@@ -4,10 +4,15 @@
 //
 //   [U W @SJIS] family word name=value "text" name="text" = result
 //
-// A mark is a form, or behind "@" a codepage, to which the case is restricted. A text is UTF-8 with the escapes
-// \n,
-// \", \\, \uNNNN for a Unicode value, \xNN for a byte of the codepage, \> for Shift-Out and \< for Shift-In. A
-// text with bytes or shifts is taken as its bytes are, in the plain and the Ex form alone.
+// A mark is a form, or behind "@" a codepage, to which the case is restricted; "unshifted" is the plain form in
+// shift-sensitive codepages. A text is UTF-8 with the escapes \n, \", \\, \uNNNN for a Unicode value, \xNN for
+// a byte of the codepage, \> for Shift-Out, \< for Shift-In, and \- for nothing. A text with one of the last
+// four is taken as its bytes are, in the plain and the Ex form alone.
+//
+// Every case runs with the lengths of its texts and with nulls behind them, unless it gives "length", or says
+// "by-length" or "by-null". Texts that are written are written with LX_TERMINATE too, unless it says "once".
+// "state", "state2" and "output-state" are the shift states that a call begins in. Behind "=" all families know
+// "error" for the stored code, "state" for the shift state that comes back, and "says" for the trace.
 #pragma once
 
 #include <stdexcept>

@@ -24,44 +24,39 @@ struct ShiftStates {
 };
 inline ShiftStates states;
 
-/// The functions of a form under one name each. `C` is a single character as an argument.
-template <class U, class C, auto kCat, auto kChr, auto kCpy, auto kCspn, auto kSpn, auto kStr, auto kTok,
-          auto kCmp, auto kColl, auto kXfrm, auto kNextWeight, auto kMap, auto kEncode, auto kDecode,
-          auto kConvert, auto kGroupingSize, auto kWriteLong, auto kWriteDouble, auto kWriteAmount,
-          auto kReadLong, auto kReadDouble, auto kWriteTime, auto kReadTime>
-struct Form {
-  using Unit = U;
-  using Char = C;
-  static constexpr auto cat = kCat;
-  static constexpr auto chr = kChr;
-  static constexpr auto cpy = kCpy;
-  static constexpr auto cspn = kCspn;
-  static constexpr auto spn = kSpn;
-  static constexpr auto str = kStr;
-  static constexpr auto tok = kTok;
-  static constexpr auto cmp = kCmp;
-  static constexpr auto coll = kColl;
-  static constexpr auto xfrm = kXfrm;
-  static constexpr auto next_weight = kNextWeight;
-  static constexpr auto map = kMap;
-  static constexpr auto encode = kEncode;
-  static constexpr auto decode = kDecode;
-  static constexpr auto convert = kConvert;
-  static constexpr auto grouping_size = kGroupingSize;
-  static constexpr auto write_long = kWriteLong;
-  static constexpr auto write_double = kWriteDouble;
-  static constexpr auto write_amount = kWriteAmount;
-  static constexpr auto read_long = kReadLong;
-  static constexpr auto read_double = kReadDouble;
-  static constexpr auto write_time = kWriteTime;
-  static constexpr auto read_time = kReadTime;
-};
+/// The functions of a form under one name each. `STR` and `S` are what stands before and behind the name of a
+/// string function, `FORM` what stands behind the name of any other; `CHAR` is a single character as an
+/// argument.
+#define LX_TEST_FORM(NAME, UNIT, CHAR, STR, S, FORM)             \
+  using Unit = UNIT;                                             \
+  using Char = CHAR;                                             \
+  static constexpr const char* name = NAME;                      \
+  static constexpr auto cat = STR##cat##S;                       \
+  static constexpr auto chr = STR##chr##S;                       \
+  static constexpr auto cpy = STR##cpy##S;                       \
+  static constexpr auto cspn = STR##cspn##S;                     \
+  static constexpr auto spn = STR##spn##S;                       \
+  static constexpr auto str = STR##str##S;                       \
+  static constexpr auto tok = STR##tok##S;                       \
+  static constexpr auto cmp = STR##cmp##S;                       \
+  static constexpr auto coll = STR##coll##S;                     \
+  static constexpr auto xfrm = STR##xfrm##S;                     \
+  static constexpr auto next_weight = LXStrGetNextWeight##FORM;  \
+  static constexpr auto map = LXMapString##FORM;                 \
+  static constexpr auto grouping_size = LXStrGroupingSize##FORM; \
+  static constexpr auto write_long = LXLongToString##FORM;       \
+  static constexpr auto write_double = LXDoubleToString##FORM;   \
+  static constexpr auto write_amount = LXCurrencyToString##FORM; \
+  static constexpr auto read_long = LXStringToLong##FORM;        \
+  static constexpr auto read_double = LXStringToDouble##FORM;    \
+  static constexpr auto write_time = LXTimeToString##FORM;       \
+  static constexpr auto read_time = LXStringToTime##FORM
 
-struct Plain : Form<char, LXWChar, LXStrcat, LXStrchr, LXStrcpy, LXStrcspn, LXStrspn, LXStrstr, LXStrtok,
-                    LXStrcmp, LXStrcoll, LXStrxfrm, LXStrGetNextWeight, LXMapString, LXUnicodeToString,
-                    LXStringToUnicode, LXConvertString, LXStrGroupingSize, LXLongToString, LXDoubleToString,
-                    LXCurrencyToString, LXStringToLong, LXStringToDouble, LXTimeToString, LXStringToTime> {
-  static constexpr const char* name = "plain";
+struct Plain {
+  LX_TEST_FORM("plain", char, LXWChar, LXStr, , );
+  static constexpr auto encode = LXUnicodeToString;
+  static constexpr auto decode = LXStringToUnicode;
+  static constexpr auto convert = LXConvertString;
   static constexpr auto truncate = LXTruncateString;
   static constexpr auto count = LXNumChars;
   static constexpr auto move = LXMoveStringPointer;
@@ -75,26 +70,23 @@ struct Plain : Form<char, LXWChar, LXStrcat, LXStrchr, LXStrcpy, LXStrcspn, LXSt
   static constexpr auto from_codes = LXWideToMb;
 };
 
-struct Wide : Form<LXWChar, LXWChar, LXWcscat, LXWcschr, LXWcscpy, LXWcscspn, LXWcsspn, LXWcsstr, LXWcstok,
-                   LXWcscmp, LXWcscoll, LXWcsxfrm, LXStrGetNextWeightW, LXMapStringW, LXUnicodeToStringW,
-                   LXStringToUnicodeW, LXConvertStringW, LXStrGroupingSizeW, LXLongToStringW, LXDoubleToStringW,
-                   LXCurrencyToStringW, LXStringToLongW, LXStringToDoubleW, LXTimeToStringW, LXStringToTimeW> {
-  static constexpr const char* name = "W";
+struct Wide {
+  LX_TEST_FORM("W", LXWChar, LXWChar, LXWcs, , W);
+  static constexpr auto encode = LXUnicodeToStringW;
+  static constexpr auto decode = LXStringToUnicodeW;
+  static constexpr auto convert = LXConvertStringW;
 };
 
-inline int32_t unicode_of_unicode(LXLocale*, LXUChar* to, int32_t, const LXUChar* from, int32_t n, int32_t) {
-  return std::copy_n(from, n, to), n;
-}
-inline int32_t unicode_to_unicode(LXUChar* to, int32_t, LXLocale*, const LXUChar* from, int32_t n, int32_t) {
-  return std::copy_n(from, n, to), n;
-}
-struct Unicode
-    : Form<LXUChar, LXUChar, LXStrcatU, LXStrchrU, LXStrcpyU, LXStrcspnU, LXStrspnU, LXStrstrU, LXStrtokU,
-           LXStrcmpU, LXStrcollU, LXStrxfrmU, LXStrGetNextWeightU, LXMapStringU, unicode_of_unicode,
-           unicode_to_unicode, nullptr, LXStrGroupingSizeU, LXLongToStringU, LXDoubleToStringU,
-           LXCurrencyToStringU, LXStringToLongU, LXStringToDoubleU, LXTimeToStringU, LXStringToTimeU> {
-  static constexpr const char* name = "U";
+struct Unicode {
+  LX_TEST_FORM("U", LXUChar, LXUChar, LXStr, U, U);
+  static int32_t encode(LXLocale*, LXUChar* to, int32_t, const LXUChar* from, int32_t n, int32_t) {
+    return std::copy_n(from, n, to), n;
+  }
+  static int32_t decode(LXUChar* to, int32_t, LXLocale*, const LXUChar* from, int32_t n, int32_t) {
+    return std::copy_n(from, n, to), n;
+  }
 };
+#undef LX_TEST_FORM
 
 /// As the plain form, with the states of `states`.
 struct Ex {
