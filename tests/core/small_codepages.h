@@ -3,39 +3,32 @@
 // U+3047, everything else is US-ASCII.
 #pragma once
 
-#include <cstdint>
-#include <vector>
-
-#include "core/lxbytes.h"
 #include "core/lxformat.h"
 #include "support/object_files.h"
 
 namespace lx::test {
 
-/// Appends little-endian values to a section.
+/// Appends to a section.
 class SectionWriter {
  public:
   explicit SectionWriter(ByteString& bytes) : bytes_(bytes) {}
 
   size_t size() const { return bytes_.size(); }
-  void byte(unsigned value) { bytes_.push_back(static_cast<uint8_t>(value)); }
+  template <class Record>
+  void add(const Record& record) {
+    bytes_.resize(bytes_.size() + Record::kBytes);
+    record.write(&bytes_[bytes_.size() - Record::kBytes]);
+  }
   void word(unsigned value) {
-    byte(value & 0xFF);
-    byte(value >> 8);
+    bytes_.insert(bytes_.end(), {static_cast<uint8_t>(value), static_cast<uint8_t>(value >> 8)});
   }
-  void dword(uint32_t value) {
-    word(value & 0xFFFF);
-    word(value >> 16);
-  }
-  /// A node of the multibyte-to-Unicode trie, and one of the type trie.
+  void dword(uint32_t value) { word(value), word(value >> 16); }
   void node(bool leaf, unsigned mask, unsigned lowest, unsigned highest, unsigned base) {
-    for (unsigned value : {unsigned{leaf}, mask, lowest, highest}) byte(value);
-    word(base);
+    add(format::codepage::UnicodeNode{leaf, static_cast<uint8_t>(mask), static_cast<uint8_t>(lowest),
+                                      static_cast<uint8_t>(highest), static_cast<uint16_t>(base)});
   }
   void type_node(bool leaf, unsigned mask, unsigned base) {
-    byte(leaf);
-    byte(mask);
-    word(base);
+    add(format::codepage::TypeNode{leaf, static_cast<uint8_t>(mask), static_cast<uint16_t>(base)});
   }
 
  private:
@@ -46,45 +39,38 @@ class SectionWriter {
 /// 0x40 to 0x43. The type trie has one record for all of them.
 inline std::vector<ByteString> small_double_byte_codepage(uint8_t lead = 0x81) {
   namespace cp = lx::format::codepage;
-  constexpr unsigned kFirstUnicode = 0x3040;
-  constexpr unsigned kChars = 8;
+  constexpr unsigned kFirstUnicode = 0x3040, kChars = 8;
   std::vector<ByteString> sections = ascii_codepage();
   ByteString& payload = sections[0];
   payload[cp::kWidth] = 2;
   payload[cp::kLengths + lead] = payload[cp::kLengths + lead + 1u] = 2;
-  SectionWriter variable(payload);
-  const auto offset_here = [&](size_t place) {
-    put_le16(payload.data() + place, static_cast<uint16_t>(payload.size()));
+  SectionWriter variable(payload), trie(sections[1]), low(sections[2]);
+  const auto offset_here = [&](size_t field, const SectionWriter& section) {
+    put_le16(&payload[field], static_cast<uint16_t>(section.size()));
   };
-  offset_here(cp::kFullWidth);
+  offset_here(cp::kFullWidth, variable);
   for (unsigned b = 0; b < 256; ++b) variable.dword(b);
-  put_le16(payload.data() + cp::kPairCount, 1);
-  offset_here(cp::kPairs);
-  variable.dword(static_cast<uint32_t>(lead << 8 | 0x40));
-  variable.dword(static_cast<uint32_t>(lead << 8 | 0x41));
-  offset_here(cp::kTypeTrie);
+  payload[cp::kPairCount] = 1;
+  offset_here(cp::kPairs, variable);
+  variable.add(cp::WidthPair{lead << 8 | 0x40u, lead << 8 | 0x41u});
+  offset_here(cp::kTypeTrie, variable);
   variable.type_node(false, 0x00, 1);
   variable.type_node(true, 0x00, 0);
-  offset_here(cp::kTypeRecords);
-  variable.dword(0x40000001);
-  variable.dword(0);
+  offset_here(cp::kTypeRecords, variable);
+  variable.add(cp::TypeRecord{0x40000001, 0});
 
-  SectionWriter trie(sections[1]);
   trie.node(false, 0x03, lead, lead + 1u, 0);
   trie.node(true, 0x03, 0x40, 0x43, 0);
   trie.node(true, 0x03, 0x40, 0x43, 4);
-  put_le16(payload.data() + cp::kUnicodeValues, static_cast<uint16_t>(trie.size()));
+  offset_here(cp::kUnicodeValues, trie);
   for (unsigned i = 0; i < kChars; ++i) trie.word(kFirstUnicode + i);
 
   // Page 0 keeps its bytes; the page of the double-byte characters gets words behind them.
-  SectionWriter low(sections[2]);
-  if (low.size() % 2 != 0) low.byte(0);
-  uint8_t* page = payload.data() + cp::kPages + (kFirstUnicode >> 8) * cp::PageEntry::kBytes;
-  page[0] = cp::kKindWord;
-  page[1] = 0x07;
-  page[2] = kFirstUnicode & 0xFF;
-  page[3] = (kFirstUnicode & 0xFF) + kChars - 1;
-  put_le16(page + 4, static_cast<uint16_t>(low.size() / 2));
+  sections[2].resize((low.size() + 1) / 2 * 2);
+  constexpr uint8_t kFirst = kFirstUnicode & 0xFF;
+  const cp::PageEntry page{
+      cp::kKindWord, 0x07, kFirst, kFirst + kChars - 1, static_cast<uint16_t>(low.size() / 2), 0};
+  page.write(&payload[cp::kPages + (kFirstUnicode >> 8) * page.kBytes]);
   for (unsigned i = 0; i < kChars; ++i) low.word((lead + i / 4) << 8 | (0x40 + i % 4));
   return sections;
 }
@@ -101,14 +87,8 @@ inline std::vector<ByteString> small_shift_codepage() {
   return sections;
 }
 
-/// ascii_codepage() in the form of version 1, which lacks the shift bytes and two unused ones.
 inline std::vector<ByteString> version1_ascii_codepage() {
-  namespace cp = lx::format::codepage;
-  std::vector<ByteString> sections = ascii_codepage();
-  ByteString& payload = sections[0];
-  payload.erase(payload.begin() + cp::kTypes - 2, payload.begin() + cp::kTypes);
-  payload.erase(payload.begin() + cp::kShiftOut, payload.begin() + cp::kLengths);
-  return sections;
+  return version1_codepage(ascii_codepage());
 }
 
 }  // namespace lx::test
