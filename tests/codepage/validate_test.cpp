@@ -8,6 +8,8 @@
 
 #include "codepage/lxcodepage.h"
 #include "core/lxformat.h"
+#include "platform/ras1.h"
+#include "platform/recording_ras1.h"
 #include "support/tiny_codepages.h"
 
 namespace {
@@ -163,7 +165,7 @@ TEST_F(Validate, Refused) {
       {"length 0", tiny_shift_jis, [](S& s) { payload(s)[fmt::kLengths + 0x41] = 0; }},
       {"a length above the width", tiny_shift_jis, [](S& s) { payload(s)[fmt::kLengths + 0xFF] = 3; }},
       {"length 2 in a single-byte codepage", tiny_single, [](S& s) { payload(s)[fmt::kLengths] = 2; }},
-      {"UTF-8: 3 bytes are read", tiny_utf8, [](S& s) { payload(s)[fmt::kLengths + 0xE0] = 2; }},
+      {"UTF-8: 3 bytes are read", tiny_utf8, [](S& s) { payload(s)[fmt::kLengths + 0xF5] = 2; }},
       {"UTF-8: 2 bytes are written", tiny_utf8, [](S& s) { payload(s)[fmt::kLengths + 0xC3] = 3; }},
       {"UTF-8 with shift states", tiny_utf8,
        [](S& s) {
@@ -217,6 +219,11 @@ TEST_F(Validate, Refused) {
        }},
       {"a walk of three from two", tiny_euc,
        [](S& s) { copy_record<fmt::UnicodeNode>(s[1], child(s, 0x8F), child(s, 0xA4)); }},
+      {"a child that is found sound for a longer character", tiny_euc,
+       [](S& s) {
+         set_only_child(s, child(s, 0x8F));
+         edit<fmt::UnicodeNode>(s[1], 0, [](auto& node) { node.lowest = 0x8F; });
+       }},
       {"a length below the walk", tiny_euc, [](S& s) { payload(s)[fmt::kLengths + 0x8F] = 2; }},
       {"values behind the end, by one", tiny_shift_jis, [](S& s) { s[1].resize(s[1].size() - 1); }},
       {"values behind the end", tiny_shift_jis,
@@ -396,8 +403,18 @@ TEST(ValidateAtLoad, ARefusedFileIsNotLoaded) {
   bad.file.sections[1].pop_back();
   TinyLibrary library({lx::test::tiny_single(), bad});
   int32_t rc = LX_OK;
+  lx::test::RecordingTrace::set_level(RAS1_LEVEL_ERRORS);
   EXPECT_EQ(library.object(bad.file.id, &rc), nullptr);
   EXPECT_EQ(rc, LX_E_CORRUPT);
+  lx::test::RecordingTrace::set_level(0);
+  const auto trace = lx::test::RecordingTrace::take();
+  ASSERT_EQ(trace.size(), 1u);
+  EXPECT_EQ(
+      trace[0].text.rfind("Object TINY-SJIS is refused: the Unicode trie leads to a value outside its section "
+                          "(section 1, offset ",
+                          0),
+      0u)
+      << trace[0].text;
   EXPECT_NE(library.object(lx::test::tiny_single()), nullptr);
   EXPECT_TRUE(library.close());
 }
