@@ -165,7 +165,11 @@ TEST_F(Validate, Refused) {
       {"length 0", tiny_shift_jis, [](S& s) { payload(s)[fmt::kLengths + 0x41] = 0; }},
       {"a length above the width", tiny_shift_jis, [](S& s) { payload(s)[fmt::kLengths + 0xFF] = 3; }},
       {"length 2 in a single-byte codepage", tiny_single, [](S& s) { payload(s)[fmt::kLengths] = 2; }},
-      {"UTF-8: 3 bytes are read", tiny_utf8, [](S& s) { payload(s)[fmt::kLengths + 0xF5] = 2; }},
+      {"UTF-8: 3 bytes are read", tiny_utf8,
+       [](S& s) {
+         payload(s)[fmt::kLengths + 0xF5] = 2;
+         copy_record<fmt::TypeNode>(s[0], type_child(s, 0xC3), type_child(s, 0xF5));
+       }},
       {"UTF-8: 2 bytes are written", tiny_utf8, [](S& s) { payload(s)[fmt::kLengths + 0xC3] = 3; }},
       {"UTF-8 with shift states", tiny_utf8,
        [](S& s) {
