@@ -1,5 +1,6 @@
 // Any bytes as a message catalog: refused, or every message comes terminated, in both modes. Numbers to ask for
 // are taken from the input.
+#include "core/lxcatformat.h"
 #include "lx.h"
 #include "scratch.h"
 

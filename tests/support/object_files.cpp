@@ -8,8 +8,9 @@
 #include <iterator>
 #include <stdexcept>
 
-#include "core/lxbytes.h"
+#include "control_source.h"
 #include "core/lxformat.h"
+#include "object_file.h"
 
 namespace lx::test {
 namespace {
@@ -21,26 +22,38 @@ ByteString copy(Bytes bytes) {
 }  // namespace
 
 ByteString object_file(const std::vector<ByteString>& sections, uint32_t version) {
-  ByteString file(format::kHeaderBytes);
-  format::Header header;
-  header.format = version << format::Header::kVersionShift;
-  header.sections = static_cast<uint16_t>(sections.size());
-  for (size_t i = 0; i < sections.size(); ++i) {
-    header.section[i] = {static_cast<uint16_t>(sections[i].size()), static_cast<uint32_t>(file.size())};
-    file.insert(file.end(), sections[i].begin(), sections[i].end());
-  }
-  header.write(file.data());
-  return file;
+  return lexicor_data::write_object({sections, version, ""});
 }
 
 ByteString control_file(const std::vector<ControlRecord>& records) {
-  ByteString table(records.size() * format::ControlRecord::kBytes);
-  for (size_t i = 0; i < records.size(); ++i) {
-    format::ControlRecord record{records[i].id, records[i].type};
-    records[i].name.copy(record.name, sizeof(record.name));
-    record.write(table.data() + i * record.kBytes);
+  lexicor_data::Control control;
+  for (const ControlRecord& r : records)
+    control.objects.push_back({static_cast<lexicor_data::ObjectType>(r.type), r.id, r.name, 0});
+  return object_file({pack_control(control)});
+}
+
+std::vector<ByteString> version1_codepage(std::vector<ByteString> sections) {
+  namespace cp = format::codepage;
+  ByteString& payload = sections[0];
+  ByteString& trie = sections[1];
+  const auto word = [&](size_t field) { return le16(&payload[field]); };
+  if (payload[cp::kWidth] > 1) {
+    constexpr size_t kMoved = cp::kFixedBytes - cp::in_version1(cp::kFixedBytes);
+    for (size_t field : {cp::kFullWidth, cp::kPairs, cp::kTypeTrie, cp::kTypeRecords})
+      if (word(field) != 0) put_le16(&payload[field], static_cast<uint16_t>(word(field) - kMoved));
+    ByteString nodes;
+    for (size_t at = 0; at + cp::UnicodeNode::kBytes <= word(cp::kUnicodeValues);
+         at += cp::UnicodeNode::kBytes) {
+      const auto node = cp::UnicodeNode::read(&trie[at]);
+      lexicor_data::append_record(nodes, cp::TypeNode{node.leaf, node.mask, node.base});
+    }
+    trie.erase(trie.begin(), trie.begin() + word(cp::kUnicodeValues));
+    put_le16(&payload[cp::kUnicodeValues], static_cast<uint16_t>(nodes.size()));
+    trie.insert(trie.begin(), nodes.begin(), nodes.end());
   }
-  return object_file({table});
+  payload.erase(payload.begin() + cp::kTypes - 2, payload.begin() + cp::kTypes);
+  payload.erase(payload.begin() + cp::kShiftOut, payload.begin() + cp::kLengths);
+  return sections;
 }
 
 ScratchDirectory::ScratchDirectory() {

@@ -11,8 +11,7 @@ namespace lx::test {
 
 using ByteString = std::vector<uint8_t>;
 
-/// An object or control file: header and up to four sections, sections[0] being the payload. `sections` behind
-/// the last one are not counted in the header.
+/// An object or control file: header and up to four sections, sections[0] being the payload.
 ByteString object_file(const std::vector<ByteString>& sections, uint32_t version = 2);
 
 struct ControlRecord {
@@ -54,5 +53,8 @@ class ScratchDirectory {
 /// Payload and low array of a single-byte codepage that is US-ASCII in its first half; a base to change in
 /// tests.
 std::vector<ByteString> ascii_codepage();
+
+/// A codepage in the form of version 1, which lacks the shift bytes, two unused ones, and the ranges of nodes.
+std::vector<ByteString> version1_codepage(std::vector<ByteString> sections);
 
 }  // namespace lx::test

@@ -1,82 +1,42 @@
 #include "support/sort_builder.h"
 
-#include "core/lxbytes.h"
 #include "core/lxformat.h"
+#include "sort_pack.h"
 
 namespace lx::test {
 
 namespace fmt = lx::format::sort;
 
-namespace {
-
-void append16(ByteString* bytes, unsigned value) {
-  bytes->push_back(static_cast<uint8_t>(value));
-  bytes->push_back(static_cast<uint8_t>(value >> 8));
-}
-
-void append_weight(ByteString* bytes, const TestWeight& weight, unsigned flags) {
-  const LXWeights& w = weight.weights;
-  append16(bytes, w.special != 0 ? w.special : w.primary);
-  bytes->push_back(w.secondary);
-  bytes->push_back(w.tertiary);
-  append16(bytes, flags | (w.special != 0 ? fmt::WeightRecord::kSpecial : 0u) |
-                      static_cast<unsigned>(weight.char_class << fmt::WeightRecord::kClassShift));
-}
-
-}  // namespace
-
 ByteString SortBuilder::payload() const {
-  ByteString bytes(fmt::kFixedBytes);
-  bytes[fmt::kDefaultSecondary] = default_secondary;
-  bytes[fmt::kDefaultTertiary] = default_tertiary;
-  put_le16(&bytes[fmt::kExpansionCount], static_cast<uint16_t>(expansions.size()));
+  using lexicor_data::SortElement;
+  using lexicor_data::SortPageKind;
+  const auto set_of = [](const LXWeights& w) {
+    return lexicor_data::SortSet{w.primary, w.secondary, w.tertiary, w.special};
+  };
+  lexicor_data::SortSource sort;
+  sort.default_secondary = default_secondary;
+  sort.default_tertiary = default_tertiary;
+  for (const auto& [page, found] : computed) {
+    const bool primary = (found.flags & fmt::kPagePrimary) != 0;
+    sort.pages[page] = {
+        primary ? SortPageKind::kPrimary : SortPageKind::kSpecial, found.base, found.char_class, {}};
+  }
+  const auto add = [&](LXUChar u, uint8_t count, const TestWeight& weight, const LXWeights& second) {
+    sort.pages[u >> 8].kind = SortPageKind::kTable;
+    sort.characters[u] = {{set_of(weight.weights), set_of(second)}, count, weight.char_class, {}};
+  };
+  for (const auto& [u, weight] : characters) add(u, 1, weight, {});
+  for (const auto& [u, sets] : expansions) add(u, 2, sets.first, sets.second);
+  ByteString bytes = pack_sort(sort, "a test's sort");
+  // Pairs in any order and more than once, which the compiler would not write: their table is the last one.
   put_le16(&bytes[fmt::kContractionCount], static_cast<uint16_t>(pairs.size()));
-  std::map<uint8_t, uint16_t> bases;
-  for (const auto& entry : characters) bases[static_cast<uint8_t>(entry.first >> 8)] = 0;
-  for (const auto& entry : expansions) bases[static_cast<uint8_t>(entry.first >> 8)] = 0;
-  put_le16(&bytes[fmt::kWeights], static_cast<uint16_t>(bytes.size()));
-  uint16_t records = 0;
-  for (auto& [page, base] : bases) {
-    base = records;
-    for (unsigned low = 0; low < 256; ++low, ++records) {
-      const auto u = static_cast<LXUChar>(page << 8 | low);
-      const auto expansion = expansions.find(u);
-      const auto character = characters.find(u);
-      if (expansion != expansions.end())
-        append_weight(&bytes, {{}, expansion->second.first.char_class}, fmt::WeightRecord::kExpansion);
-      else
-        append_weight(&bytes, character != characters.end() ? character->second : TestWeight{}, 0);
-    }
-  }
-  for (unsigned page = 0; page < 256; ++page) {
-    uint8_t* entry = &bytes[fmt::kPages + fmt::Page::kBytes * page];
-    const auto number = static_cast<uint8_t>(page);
-    entry[0] = fmt::kPageUncovered;
-    if (const auto base = bases.find(number); base != bases.end()) {
-      entry[0] = 0;
-      put_le16(entry + 2, base->second);
-    } else if (const auto found = computed.find(number); found != computed.end()) {
-      entry[0] = found->second.flags;
-      entry[1] = found->second.char_class;
-      put_le16(entry + 2, found->second.base);
-    }
-  }
-  put_le16(&bytes[fmt::kExpansions], static_cast<uint16_t>(bytes.size()));
-  for (const auto& [u, sets] : expansions) {
-    append16(&bytes, u);
-    for (const LXWeights& w : {sets.first.weights, sets.second}) {
-      append16(&bytes, w.primary);
-      bytes.push_back(w.secondary);
-      bytes.push_back(w.tertiary);
-    }
-    append16(&bytes, 0);
-    append16(&bytes, 0);
-  }
-  put_le16(&bytes[fmt::kContractions], static_cast<uint16_t>(bytes.size()));
   for (const Pair& pair : pairs) {
-    append16(&bytes, pair.first);
-    append16(&bytes, pair.second);
-    append_weight(&bytes, pair.weight, 0);
+    const LXWeights& w = pair.weight.weights;
+    const unsigned flags = (w.special != 0 ? fmt::WeightRecord::kSpecial : 0u) |
+                           static_cast<unsigned>(pair.weight.char_class << fmt::WeightRecord::kClassShift);
+    const uint16_t weight = w.special != 0 ? w.special : w.primary;
+    const fmt::WeightRecord record{weight, w.secondary, w.tertiary, static_cast<uint16_t>(flags)};
+    lexicor_data::append_record(bytes, fmt::Contraction{pair.first, pair.second, record});
   }
   return bytes;
 }

@@ -5,11 +5,10 @@
 #include <utility>
 
 #include "codepage/lxcodepage.h"
-#include "codepage/lxunicode.h"
+#include "codepage_pack.h"
 #include "core/lxbytes.h"
 #include "core/lxformat.h"
 #include "core/lxmemory.h"
-#include "core/lxobjtypes.h"
 
 namespace lx::test {
 namespace {
@@ -17,48 +16,12 @@ namespace {
 namespace fmt = format::codepage;
 
 constexpr unsigned kBytes = 256;
-constexpr uint16_t kUnmapped = 0xFFFD;
 
 std::string code_text(uint32_t code) {
   std::string bytes;
   for (int shift = 24; shift >= 0; shift -= 8)
     if (shift == 0 || code >> shift != 0) bytes.push_back(static_cast<char>(code >> shift));
   return bytes;
-}
-
-/// The fewest low bits that tell the bytes of a range apart.
-uint8_t mask_of(uint8_t lowest, uint8_t highest) {
-  unsigned mask = 0;
-  while ((lowest & ~mask) != (highest & ~mask)) mask = mask << 1 | 1;
-  return static_cast<uint8_t>(mask);
-}
-
-uint16_t checked16(size_t value) {
-  if (value > UINT16_MAX) throw std::length_error("a tiny codepage does not fit");
-  return static_cast<uint16_t>(value);
-}
-
-void append16(ByteString* to, uint16_t value) {
-  to->resize(to->size() + 2);
-  put_le16(to->data() + to->size() - 2, value);
-}
-
-void append32(ByteString* to, uint32_t value) {
-  to->resize(to->size() + 4);
-  put_le32(to->data() + to->size() - 4, value);
-}
-
-/// Room for a row of an array: its first element stands at `lowest & mask` behind the offset.
-struct Row {
-  uint16_t offset;
-  size_t first;
-};
-Row add_row(ByteString* array, size_t element_bytes, uint8_t lowest, uint8_t highest, uint8_t mask) {
-  const size_t skipped = lowest & mask;
-  size_t first = (array->size() + element_bytes - 1) / element_bytes;
-  first = std::max(first, skipped);
-  array->resize((first + highest - lowest + 1u) * element_bytes);
-  return {checked16(first - skipped), first};
 }
 
 }  // namespace
@@ -79,191 +42,36 @@ CodepageBuilder& CodepageBuilder::map(uint32_t code, uint16_t unicode, unsigned 
   return *this;
 }
 
-CodepageBuilder::Node CodepageBuilder::tree() const {
-  Node root;
-  for (const auto& [code, unicode] : to_unicode_) {
-    if (code <= 0xFF) continue;
-    Node* node = &root;
-    for (char byte : code_text(code)) node = &node->next[static_cast<uint8_t>(byte)];
-    node->has_value = true;
-    node->unicode = unicode;
-  }
-  return root;
-}
-
-void CodepageBuilder::add_payload_tables(ByteString* payload) const {
-  uint8_t* p = payload->data();
-  const uint8_t fixed[] = {substitution_, 0x0A, 0x0D, 0x0A, 0x0A, width_, 0, 0, shift_out_, shift_in_};
-  std::copy(std::begin(fixed), std::end(fixed), p);
-  for (unsigned b = 0; b < kBytes; ++b) {
-    const auto found = to_unicode_.find(b);
-    const uint16_t u = found != to_unicode_.end() ? found->second : kUnmapped;
-    p[fmt::kLengths + b] = lengths_[b];
-    const auto other_case = [&](uint16_t other) {
-      const auto code = to_code_.find(other);
-      return static_cast<uint8_t>(code != to_code_.end() && code->second <= 0xFF ? code->second : b);
-    };
-    p[fmt::kUpper + b] = other_case(unicode_upper(u));
-    p[fmt::kLower + b] = other_case(unicode_lower(u));
-    put_le16(p + fmt::kUnicode + 2 * b, u);
-    put_le32(p + fmt::kTypes + 4 * b, u != kUnmapped ? unicode_type(u) : 0);
-  }
-  put_le16(p + fmt::kFlags, shift_ ? fmt::kFlagShift : fmt::kFlagAscii);
-}
-
-/// Type nodes have no byte range: every byte needs a node of the right height, so those without a character
-/// share one row of record 0. Node 0 is the root, 1 to 256 its children, then the grandchildren.
-void CodepageBuilder::add_type_trie(ByteString* payload, const Node& root) const {
-  struct TypeNode {
-    bool leaf;
-    uint8_t mask;
-    uint16_t base;
-  };
-  std::vector<TypeNode> nodes{{false, 0xFF, 1}};
-  nodes.resize(1 + kBytes, {true, 0, 0});
-  std::vector<std::pair<uint32_t, uint32_t>> records{{kTypeUnassigned, 0}};
-  const auto fill = [&](const auto& self, size_t place, const Node& node) -> void {
-    if (node.next.begin()->second.has_value) {
-      const size_t first = records.size();
-      records.resize(first + kBytes, records[0]);
-      for (const auto& [byte, leaf] : node.next) {
-        // The case delta tells the records apart as well.
-        records[first + byte] = {unicode_type(leaf.unicode), leaf.unicode};
-      }
-      nodes[place] = {true, 0xFF, checked16(first)};
-      return;
-    }
-    const size_t first = nodes.size();
-    nodes.resize(first + kBytes, {true, 0, 0});
-    nodes[place] = {false, 0xFF, checked16(first)};
-    for (const auto& [byte, child] : node.next) self(self, first + byte, child);
-  };
-  for (const auto& [byte, child] : root.next) fill(fill, 1u + byte, child);
-
-  put_le16(payload->data() + fmt::kTypeTrie, checked16(payload->size()));
-  for (const TypeNode& node : nodes) {
-    payload->push_back(node.leaf ? 1 : 0);
-    payload->push_back(node.mask);
-    append16(payload, node.base);
-  }
-  put_le16(payload->data() + fmt::kTypeRecords, checked16(payload->size()));
-  for (const auto& [type, delta] : records) {
-    append32(payload, type);
-    append32(payload, delta);
-  }
-  checked16(payload->size());
-}
-
-ByteString CodepageBuilder::unicode_trie(ByteString* payload, const Node& root) const {
-  constexpr uint8_t kEmptyLeaf[fmt::UnicodeNode::kBytes] = {1, 0, 2, 1, 0, 0};
-  ByteString nodes(fmt::UnicodeNode::kBytes);
-  ByteString values;
-  const auto fill = [&](const auto& self, size_t place, const Node& node) -> void {
-    uint8_t entry[fmt::UnicodeNode::kBytes];
-    std::copy(std::begin(kEmptyLeaf), std::end(kEmptyLeaf), entry);
-    if (!node.next.empty()) {
-      const uint8_t lowest = node.next.begin()->first;
-      const uint8_t highest = node.next.rbegin()->first;
-      const uint8_t mask = mask_of(lowest, highest);
-      const bool leaf = node.next.begin()->second.has_value;
-      const size_t before = leaf ? values.size() / 2 : nodes.size() / fmt::UnicodeNode::kBytes;
-      const Row row =
-          add_row(leaf ? &values : &nodes, leaf ? 2 : fmt::UnicodeNode::kBytes, lowest, highest, mask);
-      const size_t after = leaf ? values.size() / 2 : nodes.size() / fmt::UnicodeNode::kBytes;
-      for (size_t i = before; i < after; ++i) {
-        if (leaf)
-          put_le16(values.data() + 2 * i, kUnmapped);
-        else
-          std::copy(std::begin(kEmptyLeaf), std::end(kEmptyLeaf), nodes.begin() + static_cast<long>(i * 6));
-      }
-      for (const auto& [byte, child] : node.next) {
-        const size_t index = row.first + byte - lowest;
-        if (leaf)
-          put_le16(values.data() + 2 * index, child.unicode);
-        else
-          self(self, index, child);
-      }
-      entry[0] = leaf ? 1 : 0;
-      entry[1] = mask;
-      entry[2] = lowest;
-      entry[3] = highest;
-      put_le16(entry + 4, row.offset);
-    }
-    std::copy(std::begin(entry), std::end(entry),
-              nodes.begin() + static_cast<long>(place * fmt::UnicodeNode::kBytes));
-  };
-  fill(fill, 0, root);
-  put_le16(payload->data() + fmt::kUnicodeValues, checked16(nodes.size()));
-  nodes.insert(nodes.end(), values.begin(), values.end());
-  return nodes;
-}
-
-void CodepageBuilder::add_pages(ByteString* payload, ByteString* low, ByteString* high) const {
-  for (unsigned page = 0; page < kBytes; ++page) {
-    uint8_t* entry = payload->data() + fmt::kPages + page * fmt::PageEntry::kBytes;
-    const auto begin = to_code_.lower_bound(static_cast<uint16_t>(page << 8));
-    const auto end = to_code_.upper_bound(static_cast<uint16_t>(page << 8 | 0xFF));
-    if (begin == end) {
-      entry[2] = 2;
-      entry[3] = 1;
-      continue;
-    }
-    uint32_t largest = 0;
-    for (auto it = begin; it != end; ++it) largest = std::max(largest, it->second);
-    const uint8_t kind = largest > 0xFFFFFF ? fmt::kKindWordWord
-                         : largest > 0xFFFF ? fmt::kKindByteWord
-                         : largest <= 0xFF  ? fmt::kKindByte
-                         : two_arrays_      ? fmt::kKindByteByte
-                                            : fmt::kKindWord;
-    const size_t low_bytes = kind == fmt::kKindByte || kind == fmt::kKindByteByte ? 1 : 2;
-    const size_t high_bytes = kind == fmt::kKindWordWord                         ? 2
-                              : kind == fmt::kKindByte || kind == fmt::kKindWord ? 0
-                                                                                 : 1;
-    const uint8_t lowest = static_cast<uint8_t>(begin->first);
-    const uint8_t highest = static_cast<uint8_t>(std::prev(end)->first);
-    const uint8_t mask = mask_of(lowest, highest);
-    const Row low_row = add_row(low, low_bytes, lowest, highest, mask);
-    const Row high_row = high_bytes != 0 ? add_row(high, high_bytes, lowest, highest, mask) : Row{0, 0};
-    for (unsigned b = lowest; b <= highest; ++b) {
-      const auto found = to_code_.find(static_cast<uint16_t>(page << 8 | b));
-      const uint32_t code = found != to_code_.end() ? found->second : substitution_;
-      const size_t low_place = (low_row.first + b - lowest) * low_bytes;
-      (*low)[low_place] = static_cast<uint8_t>(code);
-      if (low_bytes == 2) (*low)[low_place + 1] = static_cast<uint8_t>(code >> 8);
-      const size_t high_place = (high_row.first + b - lowest) * high_bytes;
-      const uint32_t above = kind == fmt::kKindByteByte ? code >> 8 : code >> 16;
-      if (high_bytes != 0) (*high)[high_place] = static_cast<uint8_t>(above);
-      if (high_bytes == 2) (*high)[high_place + 1] = static_cast<uint8_t>(above >> 8);
-    }
-    entry[0] = kind;
-    entry[1] = mask;
-    entry[2] = lowest;
-    entry[3] = highest;
-    put_le16(entry + 4, low_row.offset);
-    put_le16(entry + 6, high_row.offset);
-  }
-}
-
 TinyCodepage CodepageBuilder::build() const {
-  ByteString payload(fmt::kFixedBytes), trie, low, high;
-  add_payload_tables(&payload);
-  if (width_ > 1) {
-    put_le16(payload.data() + fmt::kFullWidth, static_cast<uint16_t>(payload.size()));
-    payload.resize(payload.size() + fmt::kFullWidthBytes);
-    put_le16(payload.data() + fmt::kPairs, static_cast<uint16_t>(payload.size()));
-    const Node root = tree();
-    add_type_trie(&payload, root);
-    trie = unicode_trie(&payload, root);
-  }
-  add_pages(&payload, &low, &high);
-  TinyCodepage made{{id_, name_, {payload, trie, low, high}},
-                    width_,
-                    shift_,
-                    static_cast<char>(shift_out_),
-                    static_cast<char>(shift_in_),
-                    substitution_,
-                    lengths_,
-                    {}};
+  using lexicor_data::CodepageClass;
+  lexicor_data::CodepageModel model;
+  lexicor_data::CodepageSource& header = model.header;
+  header.name = name_;
+  header.kind = shift_       ? CodepageClass::kShiftStateful
+                : width_ > 1 ? CodepageClass::kMultiByte
+                             : CodepageClass::kSingleByte;
+  header.width = width_;
+  header.substitution = substitution_;
+  header.ascii = !shift_;
+  header.utf8 = id_ == fmt::kUtf8Id;
+  std::copy(lengths_.begin(), lengths_.end(), header.leads.begin());
+  model.to_unicode = to_unicode_;
+  model.from_unicode.assign(0x10000, lexicor_data::kNoCode);
+  for (const auto& [unicode, code] : to_code_) model.from_unicode[unicode] = code;
+  if (header.utf8) fill_utf8(model);
+  std::vector<lexicor_data::LeftOut> left_out;
+  std::vector<ByteString> sections = pack_codepage(model, name_, left_out).object.sections;
+  if (!left_out.empty()) throw std::length_error("a tiny codepage does not fit");
+  sections.resize(format::kMaxSections);
+  uint8_t* payload = sections[0].data();
+  // Tests that map widths add the tables that they want.
+  if (width_ > 1) std::fill_n(payload + le16(payload + fmt::kFullWidth), fmt::kFullWidthBytes, uint8_t{0});
+  put_le16(payload + fmt::kPairCount, 0);
+  payload[fmt::kShiftOut] = shift_out_;
+  payload[fmt::kShiftIn] = shift_in_;
+
+  TinyCodepage made{{id_, name_, sections},       width_,        shift_,   static_cast<char>(shift_out_),
+                    static_cast<char>(shift_in_), substitution_, lengths_, {}};
   for (const auto& [code, unicode] : to_unicode_)
     if (to_code_.at(unicode) == code) made.characters.push_back({code_text(code), code, unicode});
   return made;
@@ -341,7 +149,6 @@ TinyCodepage tiny_four() {
       .map(0x90308130, 0x0100, 10)
       .map(0x90318130, 0x010A, 10)
       .map(0x91398139, 0x01FF)
-      .two_arrays()
       .build();
 }
 

@@ -1,5 +1,4 @@
-// Small codepages built in memory, one of every kind of text, and a library that runs on a directory of them.
-// Together they use all five kinds of Unicode pages, masks of every width and nodes that are never reached.
+// Small codepages packed in memory, one of every kind of text, and a library that runs on a directory of them.
 #pragma once
 
 #include <cstdint>
@@ -35,7 +34,8 @@ struct TinyCodepage {
   const TinyCharacter* find(uint16_t unicode) const;
 };
 
-/// Makes the sections of a version-2 codepage from its mappings.
+/// Packs a codepage from its mappings as the locale-data compiler does, but for the width tables, which stay
+/// empty.
 class CodepageBuilder {
  public:
   CodepageBuilder(uint16_t id, std::string name, uint8_t width);
@@ -48,29 +48,15 @@ class CodepageBuilder {
     return shift_out_ = out, shift_in_ = in, shift_ = true, *this;
   }
   CodepageBuilder& substitution(uint8_t byte) { return substitution_ = byte, *this; }
-  /// Pages of two-byte characters are split into two arrays of bytes.
-  CodepageBuilder& two_arrays() { return two_arrays_ = true, *this; }
   TinyCodepage build() const;
 
  private:
-  struct Node {
-    std::map<uint8_t, Node> next;
-    bool has_value = false;
-    uint16_t unicode = 0;
-  };
-  Node tree() const;
-  void add_payload_tables(ByteString* payload) const;
-  void add_type_trie(ByteString* payload, const Node& root) const;
-  ByteString unicode_trie(ByteString* payload, const Node& root) const;
-  void add_pages(ByteString* payload, ByteString* low, ByteString* high) const;
-
   uint16_t id_;
   std::string name_;
   uint8_t width_;
   uint8_t substitution_ = '?';
   uint8_t shift_out_ = 0, shift_in_ = 0;
   bool shift_ = false;
-  bool two_arrays_ = false;
   std::vector<uint8_t> lengths_;
   std::map<uint32_t, uint16_t> to_unicode_;
   std::map<uint16_t, uint32_t> to_code_;

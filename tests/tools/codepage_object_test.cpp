@@ -1,5 +1,5 @@
 // Every codepage of data/, and small ones that reach the corners: what an object's tables say against what its
-// source says, by look-ups of the test's own.
+// source says, by the library's look-ups.
 #include <gtest/gtest.h>
 
 #include <bitset>
@@ -10,82 +10,47 @@
 #include <sstream>
 
 #include "codepage/lxunicode.h"
+#include "codepage/lxwidth.h"
 #include "compile.h"
 #include "object_file.h"
+#include "support/tiny_codepages.h"
 #include "ucm.h"
 
 namespace lexicor_data {
 namespace {
 
-/// Look-ups in a codepage object, each written as the format describes it and none the packer's own. Every read
-/// is bounds-checked: a table that leads outside its section ends the test with std::out_of_range.
+namespace cp = lx::format::codepage;
+
+/// A codepage object as the library reads it: loaded, and by the fields of its payload.
 class CodepageTables {
  public:
-  explicit CodepageTables(const ByteVector& file) : object_(read_object(file, "object")) {
-    object_.sections.resize(4);
+  CodepageTables(const ByteVector& file, uint16_t id)
+      : object_(read_object(file, "object")), made_(id, object_.sections) {
+    object_.sections.resize(lx::format::kMaxSections);
   }
 
   const ByteVector& section(size_t n) const { return object_.sections[n]; }
-  uint8_t u8(size_t offset) const { return byte(0, offset); }
-  uint32_t u16(size_t offset) const { return word(0, offset); }
-  uint32_t u32(size_t offset) const { return word(0, offset) | word(0, offset + 2) << 16; }
-
-  /// The Unicode value of a byte, and of a longer character by its trie.
-  uint32_t single(uint8_t byte) const { return u16(778 + 2 * byte); }
-  uint32_t to_unicode(const uint8_t* p) const {
-    size_t node = 0;
-    for (;; ++p) {
-      if (*p < byte(1, node + 2) || *p > byte(1, node + 3)) return 0xFFFD;
-      const size_t next = word(1, node + 4) + (byte(1, node + 1) & *p);
-      if (byte(1, node) != 0) return word(1, u16(4374) + 2 * next);
-      node = 6 * next;
-    }
+  uint8_t u8(size_t field) const { return section(0)[field]; }
+  uint32_t u16(size_t field) const { return lx::le16(&section(0)[field]); }
+  uint32_t u32(size_t field) const { return lx::le32(&section(0)[field]); }
+  cp::PageEntry page(size_t n) const {
+    return cp::PageEntry::read(&section(0)[cp::kPages + n * cp::PageEntry::kBytes]);
   }
 
-  /// The packed code of a Unicode value.
+  uint32_t to_unicode(const uint8_t* p) const { return LXCpMbToUnicode(made_.object(), text(p)); }
   uint32_t from_unicode(uint32_t u) const {
-    const size_t page = 2316 + 8 * (u >> 8);
-    const uint32_t low = u & 0xFF;
-    if (low < u8(page + 2) || low > u8(page + 3)) return u8(0);
-    const size_t at = u16(page + 4) + (low & u8(page + 1)), high = u16(page + 6) + (low & u8(page + 1));
-    switch (u8(page)) {
-      case 0:
-        return byte(2, at);
-      case 1:
-        return word(2, 2 * at);
-      case 2:
-        return static_cast<uint32_t>(byte(3, high)) << 16 | word(2, 2 * at);
-      case 3:
-        return word(3, 2 * high) << 16 | word(2, 2 * at);
-      case 4:
-        return byte(3, high) * 256U + byte(2, at);
-      default:
-        return 0;
-    }
+    return LXCpUnicodeToCharW(made_.object(), static_cast<LXUChar>(u));
   }
-
-  struct TypeRecord {
-    uint32_t type;
-    uint32_t delta;
-    size_t bytes;  ///< that the walk took
-  };
-  TypeRecord type_of(const uint8_t* p) const {
-    const size_t root = u16(4370);
-    size_t node = root;
-    for (size_t bytes = 1;; ++bytes, ++p) {
-      const size_t next = u16(node + 2) + (u8(node + 1) & *p);
-      if (u8(node) != 0) return {u32(u16(4372) + 8 * next), u32(u16(4372) + 8 * next + 4), bytes};
-      node = root + 4 * next;
-    }
+  cp::TypeRecord type_of(const uint8_t* p) const {
+    return cp::TypeRecord::read(LXGetMbCtype(made_.object(), text(p)));
   }
+  lx::WidthTables widths() const { return lx::WidthTables(lx::codepage_of(*made_.object())); }
 
  private:
-  uint8_t byte(size_t section, size_t offset) const { return object_.sections[section].at(offset); }
-  uint32_t word(size_t section, size_t offset) const {
-    return byte(section, offset) | static_cast<uint32_t>(byte(section, offset + 1)) << 8;
-  }
+  static const char* text(const uint8_t* p) { return reinterpret_cast<const char*>(p); }
 
   ObjectFile object_;
+  lx::test::CodepageObject made_;
 };
 
 /// The bytes of a packed code, first byte first.
@@ -135,29 +100,29 @@ struct Expected {
 
 void check_header_and_single_bytes(const Expected& expected, const CodepageTables& tables) {
   const CodepageSource& source = expected.source;
-  EXPECT_EQ(tables.u8(0), source.substitution);
-  for (size_t i = 0; i < 4; ++i) EXPECT_EQ(tables.u8(1 + i), source.line_ends[i]);
-  EXPECT_EQ(tables.u8(5), source.width);
-  EXPECT_EQ(tables.u8(8), expected.shift() ? 0x0E : 0);
-  EXPECT_EQ(tables.u8(9), expected.shift() ? 0x0F : 0);
-  EXPECT_EQ(tables.u16(4364), (source.ascii ? 1U : 0U) | (expected.shift() ? 2U : 0U));
+  EXPECT_EQ(tables.u8(cp::kSubstitution), source.substitution);
+  for (size_t i = 0; i < 4; ++i) EXPECT_EQ(tables.u8(cp::kLineEnds + i), source.line_ends[i]);
+  EXPECT_EQ(tables.u8(cp::kWidth), source.width);
+  EXPECT_EQ(tables.u8(cp::kShiftOut), expected.shift() ? 0x0E : 0);
+  EXPECT_EQ(tables.u8(cp::kShiftIn), expected.shift() ? 0x0F : 0);
+  EXPECT_EQ(tables.u16(cp::kFlags), (source.ascii ? 1U : 0U) | (expected.shift() ? 2U : 0U));
   for (uint32_t byte = 0; byte < 256; ++byte) {
     const auto value = static_cast<uint16_t>(expected.value(byte));
     const auto other = [&](uint16_t u) {
       const uint32_t code = value == 0xFFFD || u == value ? 0xFFFFFFFF : expected.round_trip(u, false);
       return code == 0xFFFFFFFF ? byte : code;
     };
-    ASSERT_EQ(tables.u8(10 + byte), source.leads[byte]) << byte;
-    ASSERT_EQ(tables.single(static_cast<uint8_t>(byte)), value) << byte;
-    ASSERT_EQ(tables.u8(266 + byte), other(lx::unicode_upper(value))) << byte;
-    ASSERT_EQ(tables.u8(522 + byte), other(lx::unicode_lower(value))) << byte;
-    ASSERT_EQ(tables.u32(1292 + 4 * byte), value == 0xFFFD ? 0 : lx::unicode_type(value)) << byte;
+    ASSERT_EQ(tables.u8(cp::kLengths + byte), source.leads[byte]) << byte;
+    ASSERT_EQ(tables.u16(cp::kUnicode + 2 * byte), value) << byte;
+    ASSERT_EQ(tables.u8(cp::kUpper + byte), other(lx::unicode_upper(value))) << byte;
+    ASSERT_EQ(tables.u8(cp::kLower + byte), other(lx::unicode_lower(value))) << byte;
+    ASSERT_EQ(tables.u32(cp::kTypes + 4 * byte), value == 0xFFFD ? 0 : lx::unicode_type(value)) << byte;
   }
 }
 
 void check_from_unicode(const Expected& expected, const CodepageTables& tables) {
   if (expected.source.utf8) {
-    for (size_t page = 2316; page < 4364; page += 8) ASSERT_EQ(tables.u32(page), 0x01020000U);
+    for (size_t n = 0; n < 256; ++n) ASSERT_GT(tables.page(n).lowest, tables.page(n).highest);
     return;
   }
   for (uint32_t u = 0; u < 0x10000; ++u) {
@@ -169,17 +134,15 @@ void check_from_unicode(const Expected& expected, const CodepageTables& tables) 
 }
 
 void check_width_tables(const Expected& expected, const CodepageTables& tables) {
-  for (uint32_t byte = 0; byte < 256; ++byte) {
-    ASSERT_EQ(tables.u32(tables.u16(4366) + 4 * byte), expected.full_width(expected.value(byte))) << byte;
-  }
+  const lx::WidthTables widths = tables.widths();
+  for (uint32_t byte = 0; byte < 256; ++byte)
+    ASSERT_EQ(widths.full_of_byte(byte), expected.full_width(expected.value(byte))) << byte;
   std::vector<std::pair<uint32_t, uint32_t>> pairs, stored;
   for (const auto& [code, u] : expected.to) {
     const uint32_t full = expected.full_width(u);
     if (full != 0 && expected.round_trip(u, true) == code) pairs.push_back({code, full});
   }
-  for (uint32_t i = 0; i < tables.u16(6); ++i) {
-    stored.push_back({tables.u32(tables.u16(4368) + 8 * i), tables.u32(tables.u16(4368) + 8 * i + 4)});
-  }
+  for (size_t i = 0; i < widths.pair_count; ++i) stored.push_back({widths.pair(i).half, widths.pair(i).full});
   EXPECT_EQ(stored, pairs);
 }
 
@@ -209,7 +172,7 @@ void check_longer_characters(const Expected& expected, const CodepageTables& tab
       continue;
     }
     ASSERT_EQ(record.type, lx::unicode_type(static_cast<uint16_t>(u))) << std::hex << code;
-    ASSERT_EQ(record.delta, case_delta(expected, code, static_cast<uint16_t>(u))) << std::hex << code;
+    ASSERT_EQ(record.case_delta, case_delta(expected, code, static_cast<uint16_t>(u))) << std::hex << code;
   }
   EXPECT_EQ(retyped, object.retyped_chars);
 
@@ -221,7 +184,6 @@ void check_longer_characters(const Expected& expected, const CodepageTables& tab
       const uint8_t bytes[4] = {static_cast<uint8_t>(prefix >> 8), static_cast<uint8_t>(prefix),
                                 static_cast<uint8_t>(third), 0xA1};
       const auto record = tables.type_of(bytes);
-      ASSERT_LE(record.bytes, std::max<size_t>(count, 2)) << std::hex << prefix;
       if (count == 1 || expected.source.utf8) continue;
       uint32_t code = 0;
       bool all_trails = true;
@@ -275,17 +237,19 @@ void check_formatting_characters(const CodepageSource& source) {
   EXPECT_EQ(byte_of(0x7F), 0x7Fu);
 }
 
-void check_object(const CodepageSource& source, const CompiledObject& object) {
-  const CodepageTables tables(object.bytes);
+void check_codepage(const CodepageSource& source, const CompiledObject& object, uint16_t id) {
+  const CodepageTables tables(object.bytes, id);
   const Expected expected(source, object.left_out);
   check_header_and_single_bytes(expected, tables);
   check_from_unicode(expected, tables);
   if (source.width == 1) {
-    for (size_t offset = 4366; offset < 4376; offset += 2) EXPECT_EQ(tables.u16(offset), 0U);
-    EXPECT_TRUE(tables.section(0).size() == 4376 && tables.section(1).empty() && tables.section(3).empty());
+    for (size_t field = cp::kFullWidth; field < cp::kFixedBytes; field += 2) EXPECT_EQ(tables.u16(field), 0U);
+    EXPECT_TRUE(tables.section(0).size() == cp::kFixedBytes && tables.section(1).empty() &&
+                tables.section(3).empty());
     return;
   }
-  for (size_t offset = 4366; offset < 4374; offset += 2) EXPECT_EQ(tables.u16(offset) % 4, 0U);
+  for (size_t field : {cp::kFullWidth, cp::kPairs, cp::kTypeTrie, cp::kTypeRecords})
+    EXPECT_EQ(tables.u16(field) % 4, 0U);
   check_width_tables(expected, tables);
   check_longer_characters(expected, tables, object);
 }
@@ -321,7 +285,12 @@ void add(CodepageSource& source, uint32_t unicode, uint32_t code, uint8_t precis
   source.mappings.push_back({unicode, code, bytes, precision});
 }
 
-TEST(CodepageObject, EveryShippedCodepageSaysWhatItsSourceSays) {
+/// The library with memory for what is derived.
+class CodepageObject : public testing::Test {
+  lx::test::TinyLibrary library_{std::vector<lx::test::TinyCodepage>{}};
+};
+
+TEST_F(CodepageObject, EveryShippedCodepageSaysWhatItsSourceSays) {
   const std::string data = LEXICOR_DATA_DIR;
   const Control control = read_source_control(data);
   std::set<std::string> files, listed;
@@ -341,11 +310,11 @@ TEST(CodepageObject, EveryShippedCodepageSaysWhatItsSourceSays) {
     check_formatting_characters(source);
 
     const CompiledObject object = compile_object(written, path, name, control);
-    check_object(source, object);
+    check_codepage(source, object, name.id);
     check_dump(object, name);
     row_forms.insert(static_cast<int>(object.type_rows));
-    const CodepageTables tables(object.bytes);
-    for (size_t page = 0; page < 256; ++page) page_kinds.insert(tables.u8(2316 + 8 * page));
+    const CodepageTables tables(object.bytes, name.id);
+    for (size_t n = 0; n < 256; ++n) page_kinds.insert(tables.page(n).kind);
     if (source.utf8) check_utf8_types(source, tables);
   }
   EXPECT_EQ(files, listed);
@@ -355,7 +324,7 @@ TEST(CodepageObject, EveryShippedCodepageSaysWhatItsSourceSays) {
 
 // The places where an object cannot say what a table says: U+FFFD, the substitution byte, 16 bits, a
 // zero byte, UTF-8 that is none.
-TEST(CodepageObject, CanonicalForm) {
+TEST_F(CodepageObject, CanonicalForm) {
   CodepageSource source = make_source(CodepageClass::kMultiByte, 2);
   source.leads[0xA1] = 2;
   add(source, 0xFFFD, 0xA1A1);     // becomes one-way
@@ -365,7 +334,7 @@ TEST(CodepageObject, CanonicalForm) {
   add(source, 0x4E00, 0xA1A3);
   const CompiledObject object = compile(source);
   EXPECT_EQ(object.left_out.size(), 2U);
-  const CodepageTables tables(object.bytes);
+  const CodepageTables tables(object.bytes, 1);
   const uint8_t replacement[] = {0xA1, 0xA1};
   EXPECT_EQ(tables.type_of(replacement).type, 0U);
   EXPECT_EQ(tables.from_unicode(0xFFFD), 0xA1A1U);
@@ -376,11 +345,11 @@ TEST(CodepageObject, CanonicalForm) {
   zero.leads[0xA1] = 3;
   add(zero, 0x4E00, 0xA100A1);
   EXPECT_THROW(compile(zero), SourceError);
-  EXPECT_THROW(compile(make_source(CodepageClass::kSingleByte, 1), 57352), SourceError);
+  EXPECT_THROW(compile(make_source(CodepageClass::kSingleByte, 1), cp::kUtf8Id), SourceError);
 }
 
 // A section that is too small loses private use first, then the loneliest characters, from both directions.
-TEST(CodepageObject, WhatDoesNotFitIsDroppedAndListed) {
+TEST_F(CodepageObject, WhatDoesNotFitIsDroppedAndListed) {
   CodepageSource source = make_source(CodepageClass::kMultiByte, 3);
   for (unsigned lead = 0xA1; lead < 0xC0; ++lead) source.leads[lead] = 3;
   auto code = [](uint32_t i) {
@@ -398,7 +367,7 @@ TEST(CodepageObject, WhatDoesNotFitIsDroppedAndListed) {
   add(source, 0x3600, code(2), 1);              // leads to a character that stays
   add(source, 0x3500, code(row * 128 - 1), 1);  // leads to the character that goes first
   const CompiledObject object = compile(source);
-  check_object(source, object);
+  check_codepage(source, object, 1);
   size_t private_use = 0, lonely = 0;
   for (const LeftOut& entry : object.left_out) {
     (entry.mapping.unicode >= 0xE000 ? private_use : lonely) += 1;
