@@ -103,8 +103,8 @@ struct Search {
   LXFile* run(LXLocale* locale) const {
     const Values values(locale, name);
     return lx::with_cursor(lx::codepage_of(*locale->codepage), lx::Form::kPlain, LX_SHIFT_SINGLE,
-                          lx::bytes_of(list), list_bytes,
-                          [&](const auto& in) { return open_first(in, values, Path(path)); });
+                           lx::bytes_of(list), list_bytes,
+                           [&](const auto& in) { return open_first(in, values, Path(path)); });
   }
 };
 

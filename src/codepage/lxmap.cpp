@@ -74,7 +74,6 @@ uint16_t ascii_digit(uint16_t u) {
   return (lx::unicode_type(u) & LX_C1_DIGIT) != 0 ? lx::unicode_digit(u) : 0;
 }
 
-
 // Mappers: what one character maps to by itself. alone() is false when it stays as it is.
 
 template <Kind kKind>

@@ -96,7 +96,7 @@ template <class Unit>
                                          Text<Unit> text2, size_t units2, size_t same, int32_t* code) {
   const auto rest = [same](const auto& text) {
     return lx::like(text, text.p + same, lx::room(text.p, text.end) - same,
-                         lx::state_at(text, LX_SHIFT_SINGLE));
+                    lx::state_at(text, LX_SHIFT_SINGLE));
   };
   return lx::with_cursor(codepage_of(*locale.codepage), form, text1, units1, [&](const auto& in) {
     const auto other = lx::like(in, text2.p, units2, text2.state);
@@ -129,8 +129,8 @@ template <class Unit>
       codepage_of(*locale.codepage), form, Text<Unit>{a.p, 0, a.state}, a.units, [&](const auto& in) {
         using Folded = lx::FoldCursor<std::decay_t<decltype(in)>>;
         return compare_keys(lx::sort_of(*locale.sort), Folded{folding, in}, folding.most_chars(a.units),
-                            Folded{folding, lx::like(in, b.p, b.units, b.state)},
-                            folding.most_chars(b.units), code);
+                            Folded{folding, lx::like(in, b.p, b.units, b.state)}, folding.most_chars(b.units),
+                            code);
       });
 }
 

@@ -4,8 +4,8 @@
 #pragma once
 
 #include "collate/lxlevels.h"
-#include "text/lxwalk.h"
 #include "text/lxfold.h"
+#include "text/lxwalk.h"
 
 namespace lx {
 

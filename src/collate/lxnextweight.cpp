@@ -72,8 +72,8 @@ int32_t next_weight(LXLocale* given, Form form, const Step<Unit>& step) {
   const lx::Sort& sort = lx::sort_of(*locale.sort);
   LXShiftState state = LX_SHIFT_SINGLE;
   if (step.state != nullptr) state = *step.state;
-  return call.exit(lx::with_cursor(codepage_of(*locale.codepage), form, text_at(*step.text, state), step.units(),
-                            [&](const auto& in) { return take(sort, in, step); }));
+  return call.exit(lx::with_cursor(codepage_of(*locale.codepage), form, text_at(*step.text, state),
+                                   step.units(), [&](const auto& in) { return take(sort, in, step); }));
 }
 
 /// Places `places` values, which are one weight, into a level.

@@ -9,9 +9,9 @@ namespace {
 using lx::bytes_of;
 using lx::ByteText;
 using lx::Call;
-using lx::Walk;
 using lx::Form;
 using lx::Text;
+using lx::Walk;
 
 RAS1_Unit unit = RAS1_UNIT("lxstrstr");
 

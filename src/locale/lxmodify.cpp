@@ -41,11 +41,11 @@ void LXLocaleFreeOldText(const LXLocale& kept, LXLocale& dropped) {
 size_t LXLocaleCnvText(const Codepage& from, const Codepage& to, const char* text, char* output) {
   return lx::with_cursor(from, Form::kEx, LX_SHIFT_SINGLE, bytes_of(text), strlen(text), [&](auto in) {
     return lx::with_sink(to, Form::kEx, LX_SHIFT_SINGLE, bytes_of(output), lx::no_end<uint8_t>(),
-                           [&](auto out) {
-                             lx::transfer<LXUChar>(in, out, SIZE_MAX);
-                             out.put(LXUChar{0});
-                             return static_cast<size_t>(out.p - bytes_of(output));
-                           });
+                         [&](auto out) {
+                           lx::transfer<LXUChar>(in, out, SIZE_MAX);
+                           out.put(LXUChar{0});
+                           return static_cast<size_t>(out.p - bytes_of(output));
+                         });
   });
 }
 

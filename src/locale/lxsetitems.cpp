@@ -68,7 +68,7 @@ int32_t name_to_ascii(const Codepage& cp, const NewText& text, size_t count, cha
   if (common == nullptr) return lx::search_code(rc);
   lx::SingleByteSink out{*common, bytes_of(name), bytes_of(name) + kMostNameBytes};
   lx::with_cursor(cp, Form::kPlain, LX_SHIFT_SINGLE, text.bytes, count,
-                 [&](auto in) { lx::transfer<LXUChar>(in, out, SIZE_MAX); });
+                  [&](auto in) { lx::transfer<LXUChar>(in, out, SIZE_MAX); });
   *length = static_cast<size_t>(out.p - bytes_of(name));
   return LX_OK;
 }

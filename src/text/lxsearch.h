@@ -19,8 +19,9 @@ Result search(RAS1_Unit& unit, LXLocale* given, Form form, const Text<Unit>& tex
   const bool characters = (flags & LX_CHARACTERS) != 0;
   const size_t units = units_of(cp, text, characters);
   const size_t other_units = units_of(cp, other, characters);
-  return with_cursor(cp, form, text, units,
-              [&](const auto& in) { return body(call, in, like(in, other.p, other_units, other.state)); });
+  return with_cursor(cp, form, text, units, [&](const auto& in) {
+    return body(call, in, like(in, other.p, other_units, other.state));
+  });
 }
 
 template <class Unit>

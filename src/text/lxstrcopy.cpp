@@ -11,9 +11,9 @@ using lx::ByteText;
 using lx::Call;
 using lx::Codepage;
 using lx::codepage_of;
-using lx::Walk;
 using lx::Form;
 using lx::Text;
+using lx::Walk;
 
 RAS1_Unit unit = RAS1_UNIT("lxstrcopy");
 
@@ -89,16 +89,15 @@ lx::Part first_chars(const Codepage& cp, Form form, const ByteText& text, size_t
   });
 }
 
-lx::Part append(const Codepage& cp, Form form, const Target<uint8_t>& to, const ByteText& text,
-                  size_t bytes) {
+lx::Part append(const Codepage& cp, Form form, const Target<uint8_t>& to, const ByteText& text, size_t bytes) {
   if (form == Form::kEx && cp.shift_sensitive) return append_shifting(cp, to, text, bytes);
   const lx::Part old = lx::whole_chars(cp, form, to.p, to.state, to.used, to.used);
   const size_t held = to.characters ? old.chars : old.units;
   if (held > to.most) return {0, 0};
   const size_t left = to.most - held;
   const lx::Part taken = to.characters
-                               ? first_chars(cp, form, text, bytes, left)
-                               : lx::whole_chars(cp, form, text.p, text.state, lx::least(bytes, left), bytes);
+                             ? first_chars(cp, form, text, bytes, left)
+                             : lx::whole_chars(cp, form, text.p, text.state, lx::least(bytes, left), bytes);
   move_units(to.p + old.units, text.p, taken.units);
   to.p[old.units + taken.units] = 0;
   return {old.units + taken.units + 1, old.chars + taken.chars + 1};
@@ -126,7 +125,7 @@ int32_t concatenate(LXLocale* given, Form form, Unit* buffer, LXShiftState buffe
   while ((characters || used < most) && buffer[used] != 0) ++used;
   if (buffer[used] != 0) return call.exit(0);
   const lx::Part held = append(cp, form, Target<Unit>{buffer, buffer_state, used, most, characters}, text,
-                                 lx::units_of(cp, text, characters));
+                               lx::units_of(cp, text, characters));
   return call.exit(static_cast<int32_t>(characters ? held.chars : held.units));
 }
 

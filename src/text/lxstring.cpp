@@ -11,11 +11,11 @@ using lx::ByteText;
 using lx::Call;
 using lx::Codepage;
 using lx::codepage_of;
-using lx::Walk;
 using lx::Form;
 using lx::put_state;
 using lx::state_at;
 using lx::Text;
+using lx::Walk;
 
 RAS1_Unit unit = RAS1_UNIT("lxstring");
 

@@ -4,8 +4,8 @@
 
 #include "codepage/lxtext.h"
 #include "core/lxcall.h"
-#include "text/lxwalk.h"
 #include "text/lxfold.h"
+#include "text/lxwalk.h"
 
 namespace {
 
@@ -13,8 +13,8 @@ using lx::bytes_of;
 using lx::Call;
 using lx::Codepage;
 using lx::codepage_of;
-using lx::Walk;
 using lx::Form;
+using lx::Walk;
 
 RAS1_Unit unit = RAS1_UNIT("lxtruncate");
 
@@ -104,7 +104,7 @@ size_t truncate(LXLocale* locale, Form form, uint8_t* text, LXShiftState state, 
   } else {
     const Words& words = form == Form::kEx && cp.shift_sensitive ? kExWords : kPlainWords;
     end = lx::with_cursor(cp, form, state, text, size - 1,
-                         [&](const auto& in) { return cut_characters(in, blanks, words); });
+                          [&](const auto& in) { return cut_characters(in, blanks, words); });
   }
   text[end] = 0;
   return end + 1;

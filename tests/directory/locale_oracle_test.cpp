@@ -19,8 +19,8 @@
 #include "directory/icu_peer.h"
 #include "directory/listed_differences.h"
 #include "import/locale_table.h"
-#include "support/library.h"
 #include "support/forms.h"
+#include "support/library.h"
 
 namespace lx::test {
 namespace {

@@ -8,8 +8,8 @@
 #include "compile.h"
 #include "import/locale_table.h"
 #include "sense.h"
-#include "support/library.h"
 #include "support/forms.h"
+#include "support/library.h"
 #include "ucm.h"
 
 namespace lexicor_data {

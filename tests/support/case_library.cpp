@@ -21,9 +21,8 @@ void add_pair(TinyCodepage* cp, uint32_t half, uint32_t full) {
   const uint16_t count = le16(payload.data() + fmt::kPairCount);
   if (count == 0) put_le16(payload.data() + fmt::kPairs, static_cast<uint16_t>(payload.size()));
   put_le16(payload.data() + fmt::kPairCount, static_cast<uint16_t>(count + 1));
-  payload.resize(payload.size() + fmt::kPairBytes);
-  put_le32(payload.data() + payload.size() - 8, half);
-  put_le32(payload.data() + payload.size() - 4, full);
+  payload.resize(payload.size() + fmt::WidthPair::kBytes);
+  fmt::WidthPair{half, full}.write(payload.data() + payload.size() - fmt::WidthPair::kBytes);
 }
 
 /// Fills the width tables by the Unicode rule.

@@ -40,6 +40,8 @@ const std::string kExample =
     "0065 ; [.0210.0002.0003] # e\n"
     "0101 ; [.0211.0002.0003] # ā\n";
 
+const ObjectName kName{ObjectType::kSort, 1, "s", 0};
+
 SortSource read_text(const std::string& text) {
   std::istringstream in(text);
   return read_sort(in, "s.txt");
