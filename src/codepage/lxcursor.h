@@ -32,8 +32,8 @@ struct SingleByteCursor {
   const uint8_t* p;
   const uint8_t* end;
 
-  static SingleByteCursor over(const Codepage& cp, const Unit* p, size_t units, LXShiftState) {
-    return {cp, p, p + units};
+  static SingleByteCursor over(const Codepage& cp, const Unit* p, const Unit* end, LXShiftState) {
+    return {cp, p, end};
   }
   unsigned same_below() const { return cp.same_below; }
   void decode(Unit unit, LXUChar* u) const { *u = cp.unicode[unit]; }
@@ -62,8 +62,8 @@ struct LeadByteCursor {
   const uint8_t* p;
   const uint8_t* end;
 
-  static LeadByteCursor over(const Codepage& cp, const Unit* p, size_t units, LXShiftState) {
-    return {cp, p, p + units};
+  static LeadByteCursor over(const Codepage& cp, const Unit* p, const Unit* end, LXShiftState) {
+    return {cp, p, end};
   }
   unsigned same_below() const { return cp.same_below; }
   void decode(const uint8_t* c, size_t length, LXUChar* u) const {
@@ -115,8 +115,8 @@ struct ShiftCursor {
   const uint8_t* end;
   LXShiftState state;
 
-  static ShiftCursor over(const Codepage& cp, const Unit* p, size_t units, LXShiftState state) {
-    return {cp, p, p + units, state};
+  static ShiftCursor over(const Codepage& cp, const Unit* p, const Unit* end, LXShiftState state) {
+    return {cp, p, end, state};
   }
   unsigned same_below() const { return 0; }
   void decode(const uint8_t* c, LXUChar* u) const {
@@ -158,8 +158,8 @@ struct CodeCursor {
   const LXWChar* p;
   const LXWChar* end;
 
-  static CodeCursor over(const Codepage& cp, const Unit* p, size_t units, LXShiftState) {
-    return {cp, p, p + units};
+  static CodeCursor over(const Codepage& cp, const Unit* p, const Unit* end, LXShiftState) {
+    return {cp, p, end};
   }
   void decode(Unit unit, LXUChar* u) const { *u = code_to_unicode(cp, unit); }
   void decode(Unit unit, LXWChar* code) const { *code = unit; }
@@ -183,9 +183,7 @@ struct UnicodeCursor {
   const LXUChar* p;
   const LXUChar* end;
 
-  static UnicodeCursor over(const Codepage&, const Unit* p, size_t units, LXShiftState) {
-    return {p, p + units};
-  }
+  static UnicodeCursor over(const Codepage&, const Unit* p, const Unit* end, LXShiftState) { return {p, end}; }
   unsigned same_below() const { return kAnySame; }
   void decode(Unit unit, LXUChar* u) const { *u = unit; }
   /// How many of `most` units stand before a block of units below `below`.
@@ -217,7 +215,7 @@ inline void go_on_at(Text& text, const Text& place) {
 /// would wait for the stores.
 template <class Cursor>
 inline Cursor like(const Cursor& first, const typename Cursor::Unit* p, size_t units, LXShiftState state) {
-  return Cursor::over(first.cp, p, units, state);
+  return Cursor::over(first.cp, p, p + units, state);
 }
 inline UnicodeCursor like(const UnicodeCursor&, const LXUChar* p, size_t units, LXShiftState) {
   return {p, p + units};

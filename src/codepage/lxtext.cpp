@@ -22,8 +22,9 @@ bool pass_counted(Cursor* in) {
 }  // namespace
 
 size_t bytes_of_chars(const Codepage& cp, const uint8_t* text, LXShiftState state, int32_t chars, size_t most) {
-  const size_t bytes = least(most, room<uint8_t>(text, no_end<const uint8_t>()));
-  return with_cursor(cp, Form::kEx, state, text, bytes, [&](auto in) {
+  const uint8_t* const end = most == SIZE_MAX ? no_end<const uint8_t>() : text + most;
+  return with_kind<uint8_t>(cp, Form::kEx, [&](auto kind) {
+    auto in = decltype(kind)::Cursor::over(cp, text, end, state);
     for (int32_t left = chars; left > 0 && pass_counted(&in);) --left;
     return room(text, in.p);
   });

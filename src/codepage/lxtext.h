@@ -25,7 +25,7 @@ struct Kind {
   using Value = typename Cursor::Value;
 
   static Cursor cursor(const Codepage& cp, const Unit* p, size_t units, LXShiftState state = LX_SHIFT_SINGLE) {
-    return Cursor::over(cp, p, units, state);
+    return Cursor::over(cp, p, p + units, state);
   }
   static Sink sink(const Codepage& cp, Unit* p, Unit* end, LXShiftState state = LX_SHIFT_SINGLE) {
     return Sink::over(cp, p, end, state);

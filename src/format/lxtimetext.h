@@ -53,7 +53,7 @@ typename Text::Cursor given_text(const Codepage& cp, const char* text, LXShiftSt
                                  bool characters) {
   const uint8_t* const p = bytes_of(text);
   if (length < 0 || !characters) return Text::cursor(cp, p, text_units(p, length), state);
-  auto in = Text::cursor(cp, p, room<uint8_t>(p, no_end<const uint8_t>()), state);
+  auto in = Text::Cursor::over(cp, p, no_end<const uint8_t>(), state);
   for (int32_t left = length; left > 0; --left) in.pass();
   return Text::cursor(cp, p, room(p, in.p), state);
 }
