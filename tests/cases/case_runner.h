@@ -60,6 +60,8 @@ struct CaseRun {
     const int32_t whole = chars ? count_of(text.values) : count_of(in.block);
     in.length = c.given.number(number, null ? -1 : whole);
     if (in.length < 0) in.block.push_back(0);
+    // A count of characters looks at the byte behind the last one.
+    if (kBytes && chars && in.length >= 0) in.block.push_back(kCanary);
     in.block.shrink_to_fit();
     in.block.reserve(1);  // a null pointer is no text
     return in;

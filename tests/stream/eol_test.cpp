@@ -24,7 +24,8 @@ class LineEnds : public testing::Test {
     const bool terminated = behind.empty() && std::count(units.begin(), units.end(), 0) == 0;
     const auto rest = Form::encode(cp, behind);
     units.insert(units.end(), rest.begin(), rest.end());
-    if (terminated) units.push_back(0);
+    // A count of characters looks at the byte behind the last one.
+    if (terminated || rest.empty()) units.push_back(terminated ? 0 : 0x41);
     units.shrink_to_fit();
     const std::pair<int32_t, uint32_t> lengths[] = {{in_units, 0}, {in_chars, LX_CHARACTERS}, {-1, 0}};
     for (const auto& [length, flag] : lengths) {
