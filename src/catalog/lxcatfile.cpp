@@ -5,13 +5,14 @@
 #include "core/lxbytes.h"
 #include "locale/lxlocale.h"
 
+using namespace lx;
+
 namespace {
 
-namespace format = lx::format::catalog;
-using lx::SetRecord;
+namespace fmt = format::catalog;
 
 // Index entries are read as many at a time as a work buffer on the stack holds.
-constexpr size_t kEntriesAtATime = 256 / format::kEntryBytes;
+constexpr size_t kEntriesAtATime = 256 / fmt::kEntryBytes;
 
 /// Whether `bytes` bytes at `offset` lie in a space of `space` bytes.
 constexpr bool holds(uint32_t space, uint64_t offset, uint64_t bytes) {
@@ -32,12 +33,12 @@ bool read_at(const LXCatalog& catalog, uint32_t offset, void* to, size_t bytes) 
 /// Reads and checks the header, and gets the locale of the texts. A number of sets that the file cannot hold is
 /// refused: it bounds the walk along the chain.
 int32_t read_header(LXCatalog* catalog) {
-  uint8_t bytes[format::kHeaderBytes];
+  uint8_t bytes[fmt::kHeaderBytes];
   if (!read_at(*catalog, 0, bytes, sizeof(bytes))) return LX_E_CATALOG;
-  const format::Header header = format::Header::read(bytes);
-  if (header.magic != format::kMagic || header.version != format::kVersion ||
+  const fmt::Header header = fmt::Header::read(bytes);
+  if (header.magic != fmt::kMagic || header.version != fmt::kVersion ||
       header.byte_order != LXMcGetByteOrder() || header.sets == 0 ||
-      !holds(catalog->file_bytes, format::kHeaderBytes, uint64_t{header.sets} * format::kSetBytes) ||
+      !holds(catalog->file_bytes, fmt::kHeaderBytes, uint64_t{header.sets} * fmt::kSetBytes) ||
       memchr(header.locale, 0, sizeof(header.locale)) == nullptr)
     return LX_E_CATALOG;
   catalog->locale = LXGetLocale(header.locale, 0, nullptr);
@@ -48,7 +49,7 @@ int32_t read_header(LXCatalog* catalog) {
 }
 
 bool read_set(const LXCatalog& catalog, uint32_t offset, SetRecord* record) {
-  uint8_t bytes[format::kSetBytes];
+  uint8_t bytes[fmt::kSetBytes];
   if (!read_at(catalog, offset, bytes, sizeof(bytes))) return false;
   *record = SetRecord::read(bytes);
   return true;
@@ -81,7 +82,7 @@ uint32_t find_number(NumberAt number_at, uint32_t count, uint32_t wanted) {
 
 /// Loads all sets: as many as the header counts.
 int32_t load_sets(LXCatalog* catalog) {
-  catalog->sets = static_cast<SetRecord*>(lx::hook_allocate(catalog->set_count * sizeof(SetRecord)));
+  catalog->sets = static_cast<SetRecord*>(hook_allocate(catalog->set_count * sizeof(SetRecord)));
   if (catalog->sets == nullptr) return LX_E_MEMORY;
   uint32_t offset = catalog->first_set;
   for (uint32_t i = 0; i < catalog->set_count; ++i) {
@@ -104,16 +105,16 @@ int32_t load(LXCatalog* catalog) {
 }
 
 /// Reads index entries in order until one has the number: 0, 71 or 72.
-int32_t read_entry(const LXCatalog& catalog, const SetRecord& set, uint32_t number, format::IndexEntry* entry) {
+int32_t read_entry(const LXCatalog& catalog, const SetRecord& set, uint32_t number, fmt::IndexEntry* entry) {
   uint32_t offset = set.index;
   for (size_t left = set.messages; left != 0;) {
     if (offset > catalog.file_bytes) return LX_E_CATALOG;
-    uint8_t entries[kEntriesAtATime * format::kEntryBytes];
-    const size_t count = lx::least(left, kEntriesAtATime, (catalog.file_bytes - offset) / format::kEntryBytes);
-    const size_t bytes = count * format::kEntryBytes;
+    uint8_t entries[kEntriesAtATime * fmt::kEntryBytes];
+    const size_t count = least(left, kEntriesAtATime, (catalog.file_bytes - offset) / fmt::kEntryBytes);
+    const size_t bytes = count * fmt::kEntryBytes;
     if (count == 0 || !read_at(catalog, offset, entries, bytes)) return LX_E_CATALOG;
-    for (size_t at = 0; at != bytes; at += format::kEntryBytes) {
-      *entry = format::IndexEntry::read(entries + at);
+    for (size_t at = 0; at != bytes; at += fmt::kEntryBytes) {
+      *entry = fmt::IndexEntry::read(entries + at);
       if (entry->number == number) return LX_OK;
     }
     left -= count;
@@ -123,8 +124,8 @@ int32_t read_entry(const LXCatalog& catalog, const SetRecord& set, uint32_t numb
 }
 
 /// The text of an index entry, which must lie in the set's texts.
-int32_t get_text(const LXCatalog& catalog, const SetRecord& set, const format::IndexEntry& entry,
-                 lx::MessageText* message) {
+int32_t get_text(const LXCatalog& catalog, const SetRecord& set, const fmt::IndexEntry& entry,
+                 MessageText* message) {
   if (!holds(catalog.file_bytes, set.texts, set.text_bytes) ||
       !holds(set.text_bytes, entry.text, entry.text_bytes))
     return LX_E_CATALOG;
@@ -132,7 +133,7 @@ int32_t get_text(const LXCatalog& catalog, const SetRecord& set, const format::I
   if (catalog.image != nullptr) {
     message->text = reinterpret_cast<const char*>(catalog.image) + offset;
   } else {
-    message->copy = static_cast<char*>(lx::hook_allocate(size_t{entry.text_bytes} + 1));
+    message->copy = static_cast<char*>(hook_allocate(size_t{entry.text_bytes} + 1));
     if (message->copy == nullptr || !read_at(catalog, offset, message->copy, entry.text_bytes))
       return LX_E_CATALOG;
     message->text = message->copy;
@@ -158,8 +159,7 @@ void free_catalog(LXCatalog* catalog) {
 LXCatalog* LXMcLoadCat(LXFile* file, LXLocale* opener, uint32_t flags, int32_t* rc) {
   const int32_t file_bytes = LXFileSize(file);
   *rc = file_bytes < 0 ? LX_E_CATALOG : LX_E_MEMORY;
-  auto* catalog =
-      static_cast<LXCatalog*>(file_bytes < 0 ? nullptr : lx::hook_allocate_zeroed(sizeof(LXCatalog)));
+  auto* catalog = static_cast<LXCatalog*>(file_bytes < 0 ? nullptr : hook_allocate_zeroed(sizeof(LXCatalog)));
   if (catalog == nullptr) {
     LXCloseFile(file, 0);
     return nullptr;
@@ -169,15 +169,15 @@ LXCatalog* LXMcLoadCat(LXFile* file, LXLocale* opener, uint32_t flags, int32_t* 
   catalog->opener = opener;
   *rc = (flags & LX_CATALOG_LOAD) == LX_CATALOG_LOAD ? load(catalog) : LX_OK;
   if (*rc == LX_OK) return catalog;
-  lx::free_catalog(catalog);
+  free_catalog(catalog);
   return nullptr;
 }
 
 bool LXMcLoadSet(const LXCatalog& catalog, uint32_t offset, SetRecord* record) {
   if (!read_set(catalog, offset, record)) return false;
   // The first entry must be there even where the set has no messages.
-  return holds(catalog.file_bytes, record->index, format::kEntryBytes) &&
-         holds(catalog.file_bytes, record->index, uint64_t{record->messages} * format::kEntryBytes) &&
+  return holds(catalog.file_bytes, record->index, fmt::kEntryBytes) &&
+         holds(catalog.file_bytes, record->index, uint64_t{record->messages} * fmt::kEntryBytes) &&
          holds(catalog.file_bytes, record->texts, record->text_bytes);
 }
 
@@ -202,11 +202,11 @@ int32_t MCGetSet(LXCatalog* catalog, uint32_t number, SetRecord* record) {
   return LX_E_MESSAGE;
 }
 
-int32_t MCGetMsg(const LXCatalog& catalog, const SetRecord& set, uint32_t number, lx::MessageText* message) {
-  format::IndexEntry entry;
+int32_t MCGetMsg(const LXCatalog& catalog, const SetRecord& set, uint32_t number, MessageText* message) {
+  fmt::IndexEntry entry;
   if (catalog.image != nullptr) {
     const uint8_t* index = catalog.image + set.index;
-    const auto entry_at = [&](uint32_t i) { return format::IndexEntry::read(index + i * format::kEntryBytes); };
+    const auto entry_at = [&](uint32_t i) { return fmt::IndexEntry::read(index + i * fmt::kEntryBytes); };
     const uint32_t at = find_number([&](uint32_t i) { return entry_at(i).number; }, set.messages, number);
     if (at == set.messages) return LX_E_MESSAGE;
     entry = entry_at(at);

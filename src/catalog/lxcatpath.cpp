@@ -5,6 +5,8 @@
 #include "core/lxfile.h"
 #include "locale/lxlocale.h"
 
+using namespace lx;
+
 namespace {
 
 constexpr char kSearchVariable[] = "LX_NLSPATH";
@@ -32,7 +34,7 @@ class Path {
     used_ = 0;
     fits_ = true;
     int32_t rc = LX_OK;
-    return is_path ? lx::open_for_reading(buffer_, &rc) : nullptr;
+    return is_path ? open_for_reading(buffer_, &rc) : nullptr;
   }
 
  private:
@@ -102,9 +104,8 @@ struct Search {
 
   LXFile* run(LXLocale* locale) const {
     const Values values(locale, name);
-    return lx::with_cursor(lx::codepage_of(*locale->codepage), lx::Form::kPlain, LX_SHIFT_SINGLE,
-                           lx::bytes_of(list), list_bytes,
-                           [&](const auto& in) { return open_first(in, values, Path(path)); });
+    return with_cursor(codepage_of(*locale->codepage), Form::kPlain, LX_SHIFT_SINGLE, bytes_of(list),
+                       list_bytes, [&](const auto& in) { return open_first(in, values, Path(path)); });
   }
 };
 

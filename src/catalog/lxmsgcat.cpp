@@ -5,17 +5,16 @@
 #include "codepage/lxtext.h"
 #include "core/lxcall.h"
 
-namespace {
+using namespace lx;
 
-using lx::Call;
-using lx::MessageText;
+namespace {
 
 RAS1_Unit unit = RAS1_UNIT("lxmsgcat");
 
 constexpr uint32_t kOrderProbe = 0x00010203;
 
 // Of any codepage, its shift byte included, and how many of them a size counts.
-constexpr size_t kMostCharBytes = lx::kMaxCharBytes + 1;
+constexpr size_t kMostCharBytes = kMaxCharBytes + 1;
 constexpr size_t kMostChars = INT32_MAX / kMostCharBytes - 1;
 
 constexpr bool has_all(uint32_t flags, uint32_t bits) {
@@ -33,7 +32,7 @@ class ByteRoom {
 
  private:
   size_t bytes_;
-  lx::WorkBuffer room_;
+  WorkBuffer room_;
 };
 
 void to_bytes(LXLocale* locale, const LXWChar* text, const ByteRoom& room) {
@@ -48,7 +47,7 @@ template <class Unit>
 class Argument {
  public:
   Argument(LXLocale* locale, const Unit* text)
-      : given_(text != nullptr), room_(given_ ? lx::text_units(text, -1) : 0) {
+      : given_(text != nullptr), room_(given_ ? text_units(text, -1) : 0) {
     if (given_ && room_) to_bytes(locale, text, room_);
   }
   explicit operator bool() const { return static_cast<bool>(room_); }
@@ -79,8 +78,8 @@ LXCatalog* open_catalog(LXLocale* locale, const Unit* directory, const Unit* nam
   const Argument<Unit> name_bytes(call.locale(), name);
   if (!directory_bytes || !name_bytes) return call.fail(LX_E_CATALOG, none);
   int32_t rc = LX_OK;
-  LXFile* file = lx::open_catalog_file(call.locale(), directory_bytes.bytes(), name_bytes.bytes(),
-                                       has_all(flags, LX_CATALOG_ONE_LOCALE), &rc);
+  LXFile* file = open_catalog_file(call.locale(), directory_bytes.bytes(), name_bytes.bytes(),
+                                   has_all(flags, LX_CATALOG_ONE_LOCALE), &rc);
   if (file == nullptr) return call.fail(rc, none);
   LXCatalog* catalog = LXMcLoadCat(file, locale, flags, &rc);
   return call.end(rc, catalog);
@@ -98,7 +97,7 @@ int32_t write_message(LXLocale* locale, LXLocale* from, const MessageText& messa
 /// A text that does not fit is cut so that it can be ended.
 int32_t write_default(LXLocale* locale, const char* text, char* output, int32_t size) {
   const bool fits = strlen(text) < static_cast<size_t>(size);
-  const int32_t closing = lx::codepage_of(*locale->codepage).shift_sensitive ? 2 : 1;
+  const int32_t closing = codepage_of(*locale->codepage).shift_sensitive ? 2 : 1;
   LXShiftState state = LX_SHIFT_SINGLE;
   const int32_t bytes =
       LXStrcpyEx(locale, output, fits ? size : size - closing, text, LX_SHIFT_SINGLE, -1, &state, 0);
@@ -119,7 +118,7 @@ template <class Unit>
 int32_t write_message(LXLocale* locale, LXLocale* from, const MessageText& message, Unit* output,
                       int32_t size) {
   // No more characters than the message has bytes, or the output has units.
-  const ByteRoom room(lx::least(static_cast<size_t>(message.bytes), static_cast<size_t>(size), kMostChars));
+  const ByteRoom room(least(static_cast<size_t>(message.bytes), static_cast<size_t>(size), kMostChars));
   if (!room) return LX_E_CATALOG;
   write_message(locale, from, message, room.text(), room.size());
   from_bytes(locale, room.text(), output, size);
@@ -138,12 +137,12 @@ template <class Unit>
 int32_t get_message(LXCatalog* catalog, uint32_t set, uint32_t number, Unit* output, int32_t size,
                     const Unit* default_text) {
   // A catalog that outlived the library is not touched.
-  Call call(unit, catalog != nullptr && lx::initialized() ? catalog->opener : nullptr);
+  Call call(unit, catalog != nullptr && initialized() ? catalog->opener : nullptr);
   if (catalog == nullptr) return call.fail(LX_E_CATALOG_NULL, LX_E_CATALOG_NULL);
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, LX_E_NOT_INITIALIZED);
   output[0] = 0;
   if (size <= 0) return call.exit(LX_OK);
-  lx::SetRecord record;
+  SetRecord record;
   MessageText message;
   int32_t code = MCGetSet(catalog, set, &record);
   if (code == LX_OK) code = MCGetMsg(*catalog, record, number, &message);
@@ -186,23 +185,23 @@ int32_t LXCloseCatalog(LXCatalog* catalog) {
     Call call(unit, nullptr);
     return call.fail(LX_E_CATALOG_NULL, LX_E_CATALOG_NULL);
   }
-  lx::Events events(unit);
-  if (!lx::initialized()) return events.exit(LX_E_NOT_INITIALIZED);
-  lx::free_catalog(catalog);
+  Events events(unit);
+  if (!initialized()) return events.exit(LX_E_NOT_INITIALIZED);
+  free_catalog(catalog);
   return events.exit(LX_OK);
 }
 
 void* LXMcMalloc(size_t bytes) {
-  return lx::initialized() ? lx::hook_allocate(bytes) : nullptr;
+  return initialized() ? hook_allocate(bytes) : nullptr;
 }
 int32_t LXMcFree(void* block) {
-  return lx::initialized() && lx::hook_free(block) ? 1 : 0;
+  return initialized() && hook_free(block) ? 1 : 0;
 }
 void* LXMcRealloc(void* block, size_t old_bytes, size_t bytes) {
   void* const larger = LXMcMalloc(bytes);
   if (larger == nullptr || block == nullptr) return larger;
-  memcpy(larger, block, lx::least(old_bytes, bytes));
-  lx::hook_free(block);
+  memcpy(larger, block, least(old_bytes, bytes));
+  hook_free(block);
   return larger;
 }
 void LXMcSetZero(void* block, size_t bytes) {
@@ -214,9 +213,8 @@ void LXMcMemcpy(void* to, const void* from, size_t bytes) {
 
 uint32_t LXMcGetByteOrder(void) {
   static constexpr uint8_t kBigEndian[] = {0, 1, 2, 3};
-  namespace format = lx::format::catalog;
-  return memcmp(&kOrderProbe, kBigEndian, sizeof(kOrderProbe)) == 0 ? format::kBigEndian
-                                                                    : format::kLittleEndian;
+  return memcmp(&kOrderProbe, kBigEndian, sizeof(kOrderProbe)) == 0 ? format::catalog::kBigEndian
+                                                                    : format::catalog::kLittleEndian;
 }
 
 }  // extern "C"

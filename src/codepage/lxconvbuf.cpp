@@ -6,6 +6,8 @@
 #include "core/lxcall.h"
 #include "core/lxmemory.h"
 
+using namespace lx;
+
 /// The handle. A pending character has up to 4 bytes, a pending output a shift byte before them.
 struct LXConversion {
   LXLocale* source;
@@ -20,9 +22,6 @@ struct LXConversion {
 static_assert(sizeof(void*) != 4 || sizeof(LXConversion) == 24, "conversion handle");
 
 namespace {
-
-using lx::Codepage;
-using lx::codepage_of;
 
 RAS1_Unit unit = RAS1_UNIT("lxconvbuf");
 
@@ -53,9 +52,9 @@ class Stream {
     } else if (in_ == in_end_) {
       return LX_OK;
     }
-    return lx::with_cursor(in_cp_, lx::Form::kEx, c_->source_state, in_, left_in(), [&](auto reader) {
-      return lx::with_sink(out_cp_, lx::Form::kEx, c_->target_state, out_, out_end_,
-                           [&](auto writer) { return move(reader, writer, held, u); });
+    return with_cursor(in_cp_, Form::kEx, c_->source_state, in_, left_in(), [&](auto reader) {
+      return with_sink(out_cp_, Form::kEx, c_->target_state, out_, out_end_,
+                       [&](auto writer) { return move(reader, writer, held, u); });
     });
   }
 
@@ -92,8 +91,7 @@ class Stream {
     in_ += n;
     c_->pending_in_count = static_cast<uint8_t>(c_->pending_in_count + n);
     if (n < need) return false;
-    *u = pending_length() == 1 ? in_cp_.unicode[c_->pending_in[0]]
-                               : lx::multibyte_unicode(in_cp_, c_->pending_in);
+    *u = pending_length() == 1 ? in_cp_.unicode[c_->pending_in[0]] : multibyte_unicode(in_cp_, c_->pending_in);
     c_->pending_in_count = 0;
     return true;
   }
@@ -104,21 +102,21 @@ class Stream {
     if (held && !out.put(u)) {
       result = spill(out, u);
     } else {
-      const auto moved = lx::transfer<LXUChar>(in, out, SIZE_MAX);
-      if (moved.stop == lx::Stop::kOutputFull) result = spill(out, moved.held);
-      if (moved.stop == lx::Stop::kInputCut) result = keep_input(in);
+      const auto moved = transfer<LXUChar>(in, out, SIZE_MAX);
+      if (moved.stop == Stop::kOutputFull) result = spill(out, moved.held);
+      if (moved.stop == Stop::kInputCut) result = keep_input(in);
     }
     in_ = in.p;
     out_ = out.p;
-    c_->source_state = static_cast<uint8_t>(lx::state_at(in, c_->source_state));
-    c_->target_state = static_cast<uint8_t>(lx::state_at(out, c_->target_state));
+    c_->source_state = static_cast<uint8_t>(state_at(in, c_->source_state));
+    c_->target_state = static_cast<uint8_t>(state_at(out, c_->target_state));
     return result;
   }
 
   /// Keeps the first bytes of a character that the input cuts.
   template <class Cursor>
   int32_t keep_input(Cursor& in) {
-    const size_t n = lx::room(in.p, in.end);
+    const size_t n = room(in.p, in.end);
     copy(c_->pending_in, in.p, n);
     c_->pending_in_count = static_cast<uint8_t>(n);
     in.p += n;
@@ -129,16 +127,16 @@ class Stream {
   /// the pending bytes belong to the new one.
   template <class Sink>
   int32_t spill(Sink& out, LXUChar u) {
-    uint8_t bytes[1 + lx::kMaxCharBytes];
-    Sink whole = Sink::over(out_cp_, bytes, bytes + sizeof(bytes), lx::state_at(out, LX_SHIFT_SINGLE));
+    uint8_t bytes[1 + kMaxCharBytes];
+    Sink whole = Sink::over(out_cp_, bytes, bytes + sizeof(bytes), state_at(out, LX_SHIFT_SINGLE));
     whole.put(u);
-    const size_t count = lx::room(bytes, whole.p);
-    const size_t fitting = lx::room(out.p, out.end);
+    const size_t count = room(bytes, whole.p);
+    const size_t fitting = room(out.p, out.end);
     copy(out.p, bytes, fitting);
     copy(c_->pending_out, bytes + fitting, count - fitting);
     c_->pending_out_count = static_cast<uint8_t>(count - fitting);
     whole.p = out.end;
-    lx::go_on_at(out, whole);
+    go_on_at(out, whole);
     return LX_E_OUTPUT_FULL;
   }
 
@@ -160,11 +158,11 @@ size_t length_left(int32_t left) {
 extern "C" {
 
 LXConversion* LXOpenConversion(LXLocale* target, LXLocale* source) {
-  lx::Call call(unit, target);
+  Call call(unit, target);
   LXConversion* const none = nullptr;
-  LXLocale* from = lx::locale_of(source);
+  LXLocale* from = locale_of(source);
   if (!call || from == nullptr) return call.fail(LX_E_NOT_INITIALIZED, none);
-  auto* conversion = static_cast<LXConversion*>(lx::hook_allocate_zeroed(sizeof(LXConversion)));
+  auto* conversion = static_cast<LXConversion*>(hook_allocate_zeroed(sizeof(LXConversion)));
   if (conversion == nullptr) return call.fail(LX_E_MEMORY, none);
   conversion->source = from;
   conversion->target = call.locale();
@@ -172,16 +170,16 @@ LXConversion* LXOpenConversion(LXLocale* target, LXLocale* source) {
 }
 
 int32_t LXCloseConversion(LXConversion* conversion) {
-  lx::Events events(unit);
-  if (!lx::initialized()) return events.exit(LX_E_NOT_INITIALIZED);
-  return events.exit(lx::hook_free(conversion) ? LX_OK : LX_E_FREE);
+  Events events(unit);
+  if (!initialized()) return events.exit(LX_E_NOT_INITIALIZED);
+  return events.exit(hook_free(conversion) ? LX_OK : LX_E_FREE);
 }
 
 int32_t LXConvertBuffer(LXConversion* conversion, char** output, int32_t* output_left, const char** input,
                         int32_t* input_left) {
-  lx::Call call(unit, lx::initialized() ? conversion->target : nullptr);
+  Call call(unit, initialized() ? conversion->target : nullptr);
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, LX_E_NOT_INITIALIZED);
-  Stream stream(conversion, lx::bytes_of(*input), length_left(*input_left), lx::bytes_of(*output),
+  Stream stream(conversion, bytes_of(*input), length_left(*input_left), bytes_of(*output),
                 length_left(*output_left));
   const int32_t result = stream.run();
   *input = reinterpret_cast<const char*>(stream.in());
@@ -192,8 +190,8 @@ int32_t LXConvertBuffer(LXConversion* conversion, char** output, int32_t* output
 }
 
 int32_t LXConversionRatio(LXLocale* target, LXLocale* source) {
-  lx::Call call(unit, target);
-  const LXLocale* from = lx::locale_of(source);
+  Call call(unit, target);
+  const LXLocale* from = locale_of(source);
   if (!call || from == nullptr) return call.fail(LX_E_NOT_INITIALIZED, 1);
   if (call.codepage().disk.id == from->codepage->disk.id) return call.exit(1);
   const Codepage& cp = codepage_of(call.codepage());

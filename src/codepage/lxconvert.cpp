@@ -3,13 +3,9 @@
 #include "codepage/lxtransfer.h"
 #include "core/lxcall.h"
 
-namespace {
+using namespace lx;
 
-using lx::bytes_of;
-using lx::Call;
-using lx::Codepage;
-using lx::codepage_of;
-using lx::Form;
+namespace {
 
 RAS1_Unit unit = RAS1_UNIT("lxconvert");
 
@@ -31,12 +27,11 @@ struct Request {
         null_terminated(length_given < 0),
         nothing((length_given == 0 || size_given <= 0) && (!terminate || size_given <= 0)),
         size(size_given > 0 ? static_cast<size_t>(size_given) - (terminate ? 1 : 0) : 0),
-        length(!valid || nothing ? 0 : lx::text_units(input, length_given)) {}
+        length(!valid || nothing ? 0 : text_units(input, length_given)) {}
 
   /// In character mode a length that was given counts characters: turns it into bytes.
   void count_bytes(const Codepage& cp, const uint8_t* input, LXShiftState state) {
-    if (characters && !null_terminated)
-      length = lx::bytes_of_chars(cp, input, state, static_cast<int32_t>(length));
+    if (characters && !null_terminated) length = bytes_of_chars(cp, input, state, static_cast<int32_t>(length));
   }
 
   /// Makes the terminator of a text without a length one of its characters.
@@ -61,7 +56,7 @@ void close_state(Sink& out, const typename Sink::Unit* start, const Request& req
     if (out.state != LX_SHIFT_DOUBLE) return;
     constexpr size_t kClosing = 2;
     const size_t size = request.size + (request.terminate ? 1 : 0);
-    const auto written = [&] { return lx::room(start, out.p); };
+    const auto written = [&] { return room(start, out.p); };
     const auto closing_fits = [&] { return request.characters || written() + kClosing <= size; };
     if (!closing_fits() && written() >= out.cp.width) out.take_back();
     if (written() > 0 && out.p[-1] == out.cp.shift_out)
@@ -76,9 +71,9 @@ template <class Value, class Cursor, class Sink>
 int32_t convert(Cursor in, Sink out, const Request& request) {
   typename Sink::Unit* const start = out.p;
   const bool by_chars = limits_characters<Sink>(request);
-  const auto moved = lx::transfer<Value>(in, out, by_chars ? request.size : SIZE_MAX);
+  const auto moved = transfer<Value>(in, out, by_chars ? request.size : SIZE_MAX);
   const size_t used = by_chars ? moved.chars : static_cast<size_t>(out.p - start);
-  const bool all = moved.stop == lx::Stop::kInputEnd;
+  const bool all = moved.stop == Stop::kInputEnd;
   const bool end = request.terminate || (request.null_terminated && all && used < request.size);
   if (end) {
     close_state(out, start, request);
@@ -88,8 +83,8 @@ int32_t convert(Cursor in, Sink out, const Request& request) {
 }
 
 /// The end of an output of `size` units; a size in characters says nothing about its bytes.
-uint8_t* end_of(uint8_t* output, const Request& request) {
-  return request.characters ? lx::no_end<uint8_t>() : lx::end_of(output, request.size);
+uint8_t* output_end(uint8_t* output, const Request& request) {
+  return request.characters ? no_end<uint8_t>() : end_of(output, request.size);
 }
 
 /// Which flags a conversion knows, and what it returns for others when LX_CHARACTERS is among them.
@@ -116,76 +111,72 @@ int32_t carry_out(LXLocale* locale, const LXLocale* other, int32_t size, const U
 
 int32_t convert_bytes(LXLocale* target, char* output, LXShiftState target_state, int32_t size, LXLocale* source,
                       const char* input, LXShiftState source_state, int32_t length, int32_t flags, Form form) {
-  const LXLocale* from = lx::locale_of(source);
+  const LXLocale* from = locale_of(source);
   return carry_out(
       target, from, size, bytes_of(input), length, flags, kBetweenLocales,
       [&](const Codepage& out_cp, Request& request) {
         const Codepage& in_cp = codepage_of(*from->codepage);
         request.count_bytes(in_cp, bytes_of(input), source_state);
         uint8_t* const out = bytes_of(output);
-        return lx::with_cursor(in_cp, form, source_state, bytes_of(input), request.length, [&](auto reader) {
-          return lx::with_sink(out_cp, form, target_state, out, end_of(out, request),
-                               [&](auto writer) { return convert<LXUChar>(reader, writer, request); });
+        return with_cursor(in_cp, form, source_state, bytes_of(input), request.length, [&](auto reader) {
+          return with_sink(out_cp, form, target_state, out, output_end(out, request),
+                           [&](auto writer) { return convert<LXUChar>(reader, writer, request); });
         });
       });
 }
 
 int32_t to_unicode(LXUChar* output, int32_t size, LXLocale* locale, const char* input, LXShiftState state,
                    int32_t length, int32_t flags, Form form) {
-  return carry_out(locale, lx::locale_of(locale), size, bytes_of(input), length, flags, kUnicode,
+  return carry_out(locale, locale_of(locale), size, bytes_of(input), length, flags, kUnicode,
                    [&](const Codepage& cp, Request& request) {
                      request.count_bytes(cp, bytes_of(input), state);
-                     const lx::UnicodeSink writer{output, lx::end_of(output, request.size)};
-                     return lx::with_cursor(cp, form, state, bytes_of(input), request.length, [&](auto reader) {
-                       return convert<LXUChar>(reader, writer, request);
-                     });
+                     const UnicodeSink writer{output, end_of(output, request.size)};
+                     return with_cursor(cp, form, state, bytes_of(input), request.length,
+                                        [&](auto reader) { return convert<LXUChar>(reader, writer, request); });
                    });
 }
 
 int32_t from_unicode(LXLocale* locale, char* output, LXShiftState state, int32_t size, const LXUChar* input,
                      int32_t length, int32_t flags, Form form) {
-  return carry_out(locale, lx::locale_of(locale), size, input, length, flags, kUnicode,
+  return carry_out(locale, locale_of(locale), size, input, length, flags, kUnicode,
                    [&](const Codepage& cp, Request& request) {
-                     const lx::UnicodeCursor reader{input, input + request.length};
+                     const UnicodeCursor reader{input, input + request.length};
                      uint8_t* const out = bytes_of(output);
-                     return lx::with_sink(cp, form, state, out, end_of(out, request), [&](auto writer) {
-                       return convert<LXUChar>(reader, writer, request);
-                     });
+                     return with_sink(cp, form, state, out, output_end(out, request),
+                                      [&](auto writer) { return convert<LXUChar>(reader, writer, request); });
                    });
 }
 
 /// Bytes to packed codes. The terminating null of a text without a length is a character of it.
 int32_t to_wide(LXLocale* locale, LXWChar* output, int32_t size, const char* input, LXShiftState state,
                 int32_t length, int32_t flags, Form form) {
-  return carry_out(locale, lx::locale_of(locale), size, bytes_of(input), length, flags, kPacked,
+  return carry_out(locale, locale_of(locale), size, bytes_of(input), length, flags, kPacked,
                    [&](const Codepage& cp, Request& request) {
                      request.count_bytes(cp, bytes_of(input), state);
                      request.take_terminator();
-                     const lx::CodeSink writer{cp, output, lx::end_of(output, request.size)};
-                     return lx::with_cursor(cp, form, state, bytes_of(input), request.length, [&](auto reader) {
-                       return convert<LXWChar>(reader, writer, request);
-                     });
+                     const CodeSink writer{cp, output, end_of(output, request.size)};
+                     return with_cursor(cp, form, state, bytes_of(input), request.length,
+                                        [&](auto reader) { return convert<LXWChar>(reader, writer, request); });
                    });
 }
 
 /// Packed codes to bytes; the zero that ends codes without a length is one of them.
 int32_t from_wide(LXLocale* locale, char* output, LXShiftState state, int32_t size, const LXWChar* input,
                   int32_t length, int32_t flags, Form form) {
-  return carry_out(locale, lx::locale_of(locale), size, input, length, flags, kPacked,
+  return carry_out(locale, locale_of(locale), size, input, length, flags, kPacked,
                    [&](const Codepage& cp, Request& request) {
                      request.take_terminator();
-                     const lx::CodeCursor reader{cp, input, input + request.length};
+                     const CodeCursor reader{cp, input, input + request.length};
                      uint8_t* const out = bytes_of(output);
-                     return lx::with_sink(cp, form, state, out, end_of(out, request), [&](auto writer) {
-                       return convert<LXWChar>(reader, writer, request);
-                     });
+                     return with_sink(cp, form, state, out, output_end(out, request),
+                                      [&](auto writer) { return convert<LXWChar>(reader, writer, request); });
                    });
 }
 
 /// The object of the common codepage, or null.
 const LXObject* common_codepage() {
   int32_t rc = LX_OK;
-  return lx::object_by_id(LX_CODEPAGE, lx::format::codepage::kCommonId, &rc);
+  return object_by_id(LX_CODEPAGE, format::codepage::kCommonId, &rc);
 }
 
 }  // namespace
@@ -207,12 +198,12 @@ int32_t LXConvertStringEx(LXLocale* target, char* output, LXShiftState target_st
 
 int32_t LXConvertStringW(LXLocale* target, LXWChar* output, int32_t size, LXLocale* source,
                          const LXWChar* input, int32_t length, int32_t flags) {
-  const LXLocale* from = lx::locale_of(source);
+  const LXLocale* from = locale_of(source);
   return carry_out(
       target, from, size, input, length, flags, kBetweenLocales,
       [&](const Codepage& cp, const Request& request) {
-        const lx::CodeCursor reader{codepage_of(*from->codepage), input, input + request.length};
-        return convert<LXUChar>(reader, lx::CodeSink{cp, output, lx::end_of(output, request.size)}, request);
+        const CodeCursor reader{codepage_of(*from->codepage), input, input + request.length};
+        return convert<LXUChar>(reader, CodeSink{cp, output, end_of(output, request.size)}, request);
       });
 }
 
@@ -249,10 +240,10 @@ int32_t LXStringToUnicodeEx(LXUChar* output, int32_t size, LXLocale* locale, con
 int32_t LXStringToUnicodeW(LXUChar* output, int32_t size, LXLocale* locale, const LXWChar* input,
                            int32_t length, int32_t flags) {
   return carry_out(
-      locale, lx::locale_of(locale), size, input, length, flags, kUnicode,
+      locale, locale_of(locale), size, input, length, flags, kUnicode,
       [&](const Codepage& cp, const Request& request) {
-        const lx::CodeCursor reader{cp, input, input + request.length};
-        return convert<LXUChar>(reader, lx::UnicodeSink{output, lx::end_of(output, request.size)}, request);
+        const CodeCursor reader{cp, input, input + request.length};
+        return convert<LXUChar>(reader, UnicodeSink{output, end_of(output, request.size)}, request);
       });
 }
 
@@ -269,40 +260,40 @@ int32_t LXUnicodeToStringEx(LXLocale* locale, char* output, LXShiftState state, 
 int32_t LXUnicodeToStringW(LXLocale* locale, LXWChar* output, int32_t size, const LXUChar* input,
                            int32_t length, int32_t flags) {
   return carry_out(
-      locale, lx::locale_of(locale), size, input, length, flags, kUnicode,
+      locale, locale_of(locale), size, input, length, flags, kUnicode,
       [&](const Codepage& cp, const Request& request) {
-        const lx::UnicodeCursor reader{input, input + request.length};
-        return convert<LXUChar>(reader, lx::CodeSink{cp, output, lx::end_of(output, request.size)}, request);
+        const UnicodeCursor reader{input, input + request.length};
+        return convert<LXUChar>(reader, CodeSink{cp, output, end_of(output, request.size)}, request);
       });
 }
 
 int32_t LXCpStrToUnicode(const LXObject* codepage, const char* input, int32_t length, LXUChar* output) {
-  if (!lx::initialized()) return -1;
-  const size_t bytes = lx::units_up_to(input, length);
+  if (!initialized()) return -1;
+  const size_t bytes = units_up_to(input, length);
   if (length < 0 && bytes == 0) return -1;
-  return lx::with_cursor(codepage_of(*codepage), Form::kEx, LX_SHIFT_SINGLE, bytes_of(input), bytes,
-                         [&](auto reader) {
-                           lx::UnicodeSink writer{output, lx::no_end<LXUChar>()};
-                           lx::transfer<LXUChar>(reader, writer, SIZE_MAX);
-                           return static_cast<int32_t>(writer.p - output);
-                         });
+  return with_cursor(codepage_of(*codepage), Form::kEx, LX_SHIFT_SINGLE, bytes_of(input), bytes,
+                     [&](auto reader) {
+                       UnicodeSink writer{output, no_end<LXUChar>()};
+                       transfer<LXUChar>(reader, writer, SIZE_MAX);
+                       return static_cast<int32_t>(writer.p - output);
+                     });
 }
 
 int32_t LXCpUnicodeToStr(const LXObject* codepage, const LXUChar* input, LXShiftState state, int32_t length,
                          char* output) {
-  if (!lx::initialized()) return 0;
-  const size_t units = lx::text_units(input, length);
-  return lx::with_sink(codepage_of(*codepage), Form::kEx, state, bytes_of(output), lx::no_end<uint8_t>(),
-                       [&](auto writer) {
-                         lx::UnicodeCursor reader{input, input + units};
-                         lx::transfer<LXUChar>(reader, writer, SIZE_MAX);
-                         return static_cast<int32_t>(writer.p - bytes_of(output));
-                       });
+  if (!initialized()) return 0;
+  const size_t units = text_units(input, length);
+  return with_sink(codepage_of(*codepage), Form::kEx, state, bytes_of(output), no_end<uint8_t>(),
+                   [&](auto writer) {
+                     UnicodeCursor reader{input, input + units};
+                     transfer<LXUChar>(reader, writer, SIZE_MAX);
+                     return static_cast<int32_t>(writer.p - bytes_of(output));
+                   });
 }
 
 int32_t LXComStrToUnicode(const char* input, int32_t length, LXUChar* output) {
   const LXObject* common = common_codepage();
-  const int32_t n = common != nullptr ? static_cast<int32_t>(lx::units_up_to(input, length)) : 0;
+  const int32_t n = common != nullptr ? static_cast<int32_t>(units_up_to(input, length)) : 0;
   for (int32_t i = 0; i < n; ++i) output[i] = codepage_of(*common).unicode[bytes_of(input)[i]];
   output[n] = 0;
   return n != 0 ? n : -1;
@@ -310,9 +301,9 @@ int32_t LXComStrToUnicode(const char* input, int32_t length, LXUChar* output) {
 
 int32_t LXComUnicodeToStr(const LXUChar* input, int32_t length, char* output) {
   const LXObject* common = common_codepage();
-  const int32_t n = common != nullptr ? static_cast<int32_t>(lx::units_up_to(input, length)) : 0;
+  const int32_t n = common != nullptr ? static_cast<int32_t>(units_up_to(input, length)) : 0;
   uint8_t* out = bytes_of(output);
-  for (int32_t i = 0; i < n; ++i) out += lx::store_unicode(codepage_of(*common), input[i], out);
+  for (int32_t i = 0; i < n; ++i) out += store_unicode(codepage_of(*common), input[i], out);
   *out = 0;
   return n != 0 ? n : -1;
 }

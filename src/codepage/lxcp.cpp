@@ -5,15 +5,9 @@
 #include "codepage/lxprimitive.h"
 #include "codepage/lxtext.h"
 
-namespace {
+using namespace lx;
 
-using lx::bytes_of;
-using lx::ByteText;
-using lx::Codepage;
-using lx::Form;
-using lx::MultiByteCursor;
-using lx::Primitive;
-using lx::ShiftCursor;
+namespace {
 
 char* same(const char* text) {
   return const_cast<char*>(text);
@@ -26,17 +20,17 @@ char* same(const uint8_t* text) {
 /// by shift bytes, of which one that stands here is passed.
 template <class Body>
 auto at_char(const Primitive& in, const char* text, Body body) {
-  return body(MultiByteCursor{in.cp(), bytes_of(text), lx::no_end<const uint8_t>()});
+  return body(MultiByteCursor{in.cp(), bytes_of(text), no_end<const uint8_t>()});
 }
 template <class Body>
 auto at_char(const Primitive& in, const char* text, LXShiftState state, Body body) {
   if (!in.shift_sensitive()) return at_char(in, text, body);
   const uint8_t* p = bytes_of(text);
-  lx::take_shift(in.cp(), &p, &state);
-  return body(ShiftCursor{in.cp(), p, lx::no_end<const uint8_t>(), state});
+  take_shift(in.cp(), &p, &state);
+  return body(ShiftCursor{in.cp(), p, no_end<const uint8_t>(), state});
 }
 
-constexpr auto kCode = [](const auto& at) { return LXWChar{lx::pack(at.p, at.length())}; };
+constexpr auto kCode = [](const auto& at) { return LXWChar{pack(at.p, at.length())}; };
 constexpr auto kBytes = [](const auto& at) { return static_cast<int32_t>(at.length()); };
 
 /// Lead bytes can only be told from the front.
@@ -50,10 +44,10 @@ char* previous_char(const Primitive& in, const char* start, const char* current)
 /// Moves by a length above 0, in whole characters.
 char* move_by(const Codepage& cp, Form form, const char* text, LXShiftState state, int32_t length,
               int32_t flags, LXShiftState* new_state) {
-  const size_t bytes = lx::units_of(cp, ByteText{bytes_of(text), length, state}, (flags & LX_CHARACTERS) != 0);
-  return lx::with_cursor(cp, form, state, bytes_of(text), bytes, [&](auto at) {
-    lx::pass_all(&at);
-    lx::put_state(new_state, lx::state_at(at, state));
+  const size_t bytes = units_of(cp, ByteText{bytes_of(text), length, state}, (flags & LX_CHARACTERS) != 0);
+  return with_cursor(cp, form, state, bytes_of(text), bytes, [&](auto at) {
+    pass_all(&at);
+    put_state(new_state, state_at(at, state));
     return same(at.p);
   });
 }
@@ -97,7 +91,7 @@ LXWChar LXGetCharEx(LXLocale* locale, const char* text, LXShiftState state) {
 
 int32_t LXPutChar(LXLocale* locale, char* text, LXWChar code) {
   const Primitive in(locale);
-  if (in) lx::store_packed(bytes_of(text), code);
+  if (in) store_packed(bytes_of(text), code);
   return 0;
 }
 
@@ -105,8 +99,8 @@ void LXPutCharEx(LXLocale* locale, char* text, LXShiftState state, LXWChar code)
   const Primitive in(locale);
   if (!in) return;
   const LXShiftState needed = code > 0xFF ? LX_SHIFT_DOUBLE : LX_SHIFT_SINGLE;
-  if (in.shift_sensitive() && needed != state) *text++ = static_cast<char>(lx::shift_byte(in.cp(), needed));
-  lx::store_packed(bytes_of(text), code);
+  if (in.shift_sensitive() && needed != state) *text++ = static_cast<char>(shift_byte(in.cp(), needed));
+  store_packed(bytes_of(text), code);
 }
 
 char* LXNextChar(LXLocale* locale, const char* text) {
@@ -116,12 +110,12 @@ char* LXNextChar(LXLocale* locale, const char* text) {
 
 char* LXNextCharEx(LXLocale* locale, const char* text, LXShiftState state, LXShiftState* new_state, int32_t) {
   const Primitive in(locale);
-  lx::put_state(new_state, state);
+  put_state(new_state, state);
   if (!in) return same(text);
   return at_char(in, text, state, [&](auto at) {
     at.p += at.length();
     if constexpr (decltype(at)::kShifts) at.pass_shift();
-    lx::put_state(new_state, lx::state_at(at, state));
+    put_state(new_state, state_at(at, state));
     return same(at.p);
   });
 }
@@ -135,7 +129,7 @@ char* LXPrevChar(LXLocale* locale, const char* start, const char* current) {
 char* LXPrevCharEx(LXLocale* locale, const char* start, const char* current, LXShiftState state,
                    LXShiftState* new_state) {
   const Primitive in(locale);
-  lx::put_state(new_state, state);
+  put_state(new_state, state);
   if (!in) return same(current);
   if (!in.shift_sensitive()) return previous_char(in, start, current);
   const Codepage& cp = in.cp();
@@ -147,21 +141,21 @@ char* LXPrevCharEx(LXLocale* locale, const char* start, const char* current, LXS
   }
   const ptrdiff_t step = cp.width_in(state);
   p = p - start > step ? p - step : start;
-  lx::put_state(new_state, state);
+  put_state(new_state, state);
   return same(p);
 }
 
 int32_t LXNumChars(LXLocale* locale, const char* text, int32_t bytes) {
   const Primitive in(locale);
   if (!in) return 0;
-  return lx::with_cursor(in.cp(), Form::kPlain, LX_SHIFT_SINGLE, bytes_of(text), lx::text_units(text, bytes),
-                         [](auto at) { return static_cast<int32_t>(lx::pass_all(&at)); });
+  return with_cursor(in.cp(), Form::kPlain, LX_SHIFT_SINGLE, bytes_of(text), text_units(text, bytes),
+                     [](auto at) { return static_cast<int32_t>(pass_all(&at)); });
 }
 
 int32_t LXNumCharsEx(LXLocale* locale, const char* text, LXShiftState state, int32_t bytes) {
   const Primitive in(locale);
   if (!in) return 0;
-  return lx::chars_in_bytes(in.cp(), bytes_of(text), state, lx::text_units(text, bytes));
+  return chars_in_bytes(in.cp(), bytes_of(text), state, text_units(text, bytes));
 }
 
 char* LXMoveStringPointer(LXLocale* locale, const char* text, int32_t length, int32_t flags) {
@@ -173,7 +167,7 @@ char* LXMoveStringPointer(LXLocale* locale, const char* text, int32_t length, in
 char* LXMoveStringPointerEx(LXLocale* locale, const char* text, LXShiftState state, int32_t length,
                             LXShiftState* new_state, int32_t flags) {
   const Primitive in(locale);
-  if (in && !in.shift_sensitive()) lx::put_state(new_state, state);
+  if (in && !in.shift_sensitive()) put_state(new_state, state);
   if (!in || length <= 0) return same(text);
   return move_by(in.cp(), Form::kEx, text, state, length, flags, new_state);
 }
@@ -197,7 +191,7 @@ int32_t LXByteLength(LXLocale* locale, const char* text) {
 
 int32_t LXByteLengthW(LXLocale* locale, LXWChar code) {
   const Primitive in(locale);
-  return in ? static_cast<int32_t>(lx::code_bytes(code)) : 0;
+  return in ? static_cast<int32_t>(code_bytes(code)) : 0;
 }
 
 int32_t LXByteLengthEx(LXLocale* locale, const char* text, LXShiftState state) {
@@ -206,7 +200,7 @@ int32_t LXByteLengthEx(LXLocale* locale, const char* text, LXShiftState state) {
 }
 
 int32_t LXStrByteLength(LXWChar code) {
-  return static_cast<int32_t>(lx::code_bytes(code));
+  return static_cast<int32_t>(code_bytes(code));
 }
 
 void LXStrBigEndian(char* buffer, int32_t bytes) {
@@ -223,47 +217,47 @@ void LXInitState(LXLocale* locale, LXShiftState* state) {
 }
 
 LXWChar LXMbToW(const LXObject* codepage, const char* text) {
-  if (!lx::initialized()) return 0;
-  return lx::pack(bytes_of(text), lx::codepage_of(*codepage).length(bytes_of(text)[0]));
+  if (!initialized()) return 0;
+  return pack(bytes_of(text), codepage_of(*codepage).length(bytes_of(text)[0]));
 }
 
 LXWChar LXMbToWS(const LXObject* codepage, const char* text, LXShiftState state) {
-  return lx::initialized() ? lx::pack(bytes_of(text), lx::codepage_of(*codepage).width_in(state)) : 0;
+  return initialized() ? pack(bytes_of(text), codepage_of(*codepage).width_in(state)) : 0;
 }
 
 int32_t LXWToMb(char* text, LXWChar code) {
-  return static_cast<int32_t>(lx::store_packed(bytes_of(text), code));
+  return static_cast<int32_t>(store_packed(bytes_of(text), code));
 }
 
 LXUChar LXCpMbToUnicode(const LXObject* codepage, const char* text) {
-  if (!lx::initialized()) return lx::kNoUnicode;
-  return lx::multibyte_unicode(lx::codepage_of(*codepage), bytes_of(text));
+  if (!initialized()) return kNoUnicode;
+  return multibyte_unicode(codepage_of(*codepage), bytes_of(text));
 }
 
 LXUChar LXCpMbToUnicodeW(const LXObject* codepage, LXWChar code) {
-  if (!lx::initialized()) return lx::kNoUnicode;
-  uint8_t text[lx::kMaxCharBytes] = {};
-  lx::store_packed(text, code);
-  return lx::multibyte_unicode(lx::codepage_of(*codepage), text);
+  if (!initialized()) return kNoUnicode;
+  uint8_t text[kMaxCharBytes] = {};
+  store_packed(text, code);
+  return multibyte_unicode(codepage_of(*codepage), text);
 }
 
 int32_t LXCpUnicodeToChar(const LXObject* codepage, LXUChar unicode, char* text) {
-  if (!lx::initialized()) return 0;
-  return static_cast<int32_t>(lx::store_unicode(lx::codepage_of(*codepage), unicode, bytes_of(text)));
+  if (!initialized()) return 0;
+  return static_cast<int32_t>(store_unicode(codepage_of(*codepage), unicode, bytes_of(text)));
 }
 
 LXWChar LXCpUnicodeToCharW(const LXObject* codepage, LXUChar unicode) {
-  return lx::initialized() ? lx::unicode_to_code(lx::codepage_of(*codepage), unicode) : 0;
+  return initialized() ? unicode_to_code(codepage_of(*codepage), unicode) : 0;
 }
 
 int32_t LXCpStrCharToByteLen(const LXObject* codepage, const char* text, LXShiftState state, int32_t chars) {
-  if (!lx::initialized()) return 0;
-  return static_cast<int32_t>(lx::bytes_of_chars(lx::codepage_of(*codepage), bytes_of(text), state, chars));
+  if (!initialized()) return 0;
+  return static_cast<int32_t>(bytes_of_chars(codepage_of(*codepage), bytes_of(text), state, chars));
 }
 
 int32_t LXCpStrByteToCharLen(const LXObject* codepage, const char* text, LXShiftState state, int32_t bytes) {
-  if (!lx::initialized() || bytes == 0) return 0;
-  return lx::chars_in_bytes(lx::codepage_of(*codepage), bytes_of(text), state, lx::text_units(text, bytes));
+  if (!initialized() || bytes == 0) return 0;
+  return chars_in_bytes(codepage_of(*codepage), bytes_of(text), state, text_units(text, bytes));
 }
 
 }  // extern "C"

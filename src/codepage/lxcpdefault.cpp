@@ -3,10 +3,11 @@
 #include "codepage/lxcodepage.h"
 #include "codepage/lxunicode_tables.inc"
 
+using namespace lx;
+
 namespace {
 
-namespace fmt = lx::format::codepage;
-using lx::Codepage;
+namespace fmt = format::codepage;
 
 constexpr uint32_t kRow = 256;
 constexpr size_t kDefaultLowBytes = 259;
@@ -29,13 +30,13 @@ constexpr DefaultPayload make_default_payload() {
     p.bytes[fmt::kLengths + b] = 1;
     p.bytes[fmt::kUpper + b] = static_cast<uint8_t>(lower ? b - 0x20 : b);
     p.bytes[fmt::kLower + b] = static_cast<uint8_t>(upper ? b + 0x20 : b);
-    lx::put_le16(p.bytes + fmt::kUnicode + 2 * b, static_cast<uint16_t>(ascii ? b : lx::kNoUnicode));
-    lx::put_le32(p.bytes + fmt::kTypes + 4 * b, ascii ? lx::LX_UNICODE_Ctype1[b] : 0);
+    put_le16(p.bytes + fmt::kUnicode + 2 * b, static_cast<uint16_t>(ascii ? b : kNoUnicode));
+    put_le32(p.bytes + fmt::kTypes + 4 * b, ascii ? LX_UNICODE_Ctype1[b] : 0);
     fmt::PageEntry page;
     if (b == 0) page = {fmt::kKindByte, 0xFF, 0x00, 0xFF, 0, 0};
     page.write(p.bytes + fmt::kPages + b * fmt::PageEntry::kBytes);
   }
-  lx::put_le16(p.bytes + fmt::kFlags, fmt::kFlagAscii);
+  put_le16(p.bytes + fmt::kFlags, fmt::kFlagAscii);
   return p;
 }
 
@@ -75,7 +76,7 @@ constexpr Codepage make_default_codepage() {
   cp.payload = LXDefCp.bytes;
   cp.pages = {LXDefCp.bytes, LXDefCp3.bytes, nullptr};
   cp.codes16 = kDefaultCodes.rows[0];
-  for (size_t b = 0; b < kRow; ++b) cp.unicode[b] = lx::le16(LXDefCp.bytes + fmt::kUnicode + 2 * b);
+  for (size_t b = 0; b < kRow; ++b) cp.unicode[b] = le16(LXDefCp.bytes + fmt::kUnicode + 2 * b);
   cp.page_start[0] = kRow;
   cp.width = 1;
   cp.substitution = kQuestionMark;

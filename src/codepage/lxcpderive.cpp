@@ -5,20 +5,21 @@
 #include "codepage/lxcodepage.h"
 #include "core/lxmemory.h"
 
+using namespace lx;
+
 namespace {
 
-namespace fmt = lx::format::codepage;
-using lx::Codepage;
+namespace fmt = format::codepage;
 
 constexpr uint32_t kRow = 256;
 
 /// The nodes of the multibyte-to-Unicode trie that can be reached, in the order in which they are found.
 class ReachableNodes {
  public:
-  explicit ReachableNodes(lx::Bytes trie)
+  explicit ReachableNodes(Bytes trie)
       : trie_(trie),
         known_(trie.size / fmt::UnicodeNode::kBytes),
-        block_(static_cast<uint16_t*>(known_ != 0 ? lx::hook_allocate_zeroed(2 * known_ * sizeof(uint16_t))
+        block_(static_cast<uint16_t*>(known_ != 0 ? hook_allocate_zeroed(2 * known_ * sizeof(uint16_t))
                                                   : nullptr)) {
     if (!block_) return;
     add(0);
@@ -45,9 +46,9 @@ class ReachableNodes {
     for (unsigned byte = node.lowest; byte <= node.highest; ++byte) add(node.next(byte));
   }
 
-  lx::Bytes trie_;
-  size_t known_;                 // nodes that the section has room for
-  lx::HookPtr<uint16_t> block_;  // place + 1 by index, then indexes by place
+  Bytes trie_;
+  size_t known_;             // nodes that the section has room for
+  HookPtr<uint16_t> block_;  // place + 1 by index, then indexes by place
   size_t count_ = 0;
 };
 
@@ -65,7 +66,7 @@ struct Layout {
         bytes(leaf + nodes) {}
 };
 
-void fill_scalars(Codepage* cp, uint16_t id, const lx::Sections& sections) {
+void fill_scalars(Codepage* cp, uint16_t id, const Sections& sections) {
   const uint8_t* payload = sections.section[0].data;
   cp->payload = payload;
   cp->pages = {payload, sections.section[2].data, sections.section[3].data};
@@ -74,22 +75,21 @@ void fill_scalars(Codepage* cp, uint16_t id, const lx::Sections& sections) {
   cp->shift_out = payload[fmt::kShiftOut];
   cp->shift_in = payload[fmt::kShiftIn];
   cp->single_byte = cp->width == 1;
-  cp->shift_sensitive = (lx::le16(payload + fmt::kFlags) & fmt::kFlagShift) != 0;
+  cp->shift_sensitive = (le16(payload + fmt::kFlags) & fmt::kFlagShift) != 0;
   cp->utf8 = id == fmt::kUtf8Id;
-  for (size_t b = 0; b < kRow; ++b) cp->unicode[b] = lx::le16(payload + fmt::kUnicode + 2 * b);
+  for (size_t b = 0; b < kRow; ++b) cp->unicode[b] = le16(payload + fmt::kUnicode + 2 * b);
 }
 
-void fill_rows(const ReachableNodes& nodes, lx::Bytes trie, const uint8_t* payload, uint16_t* rows,
-               uint8_t* leaf) {
-  const uint8_t* values = trie.data + lx::le16(payload + fmt::kUnicodeValues);
+void fill_rows(const ReachableNodes& nodes, Bytes trie, const uint8_t* payload, uint16_t* rows, uint8_t* leaf) {
+  const uint8_t* values = trie.data + le16(payload + fmt::kUnicodeValues);
   for (size_t i = 0; i < nodes.count(); ++i) {
     const fmt::UnicodeNode node = nodes.node(i);
     leaf[i] = node.leaf != 0;
     uint16_t* row = rows + i * kRow;
-    for (size_t b = 0; b < kRow; ++b) row[b] = leaf[i] != 0 ? lx::kNoUnicode : 0;
+    for (size_t b = 0; b < kRow; ++b) row[b] = leaf[i] != 0 ? kNoUnicode : 0;
     for (unsigned b = node.lowest; b <= node.highest; ++b) {
       const size_t index = node.next(b);
-      row[b] = leaf[i] != 0 ? lx::le16(values + 2 * index) : nodes.place(index);
+      row[b] = leaf[i] != 0 ? le16(values + 2 * index) : nodes.place(index);
     }
   }
 }
@@ -101,8 +101,7 @@ void fill_codes(const Codepage& cp, Code* codes) {
     if (cp.page_start[page] == 0) continue;
     Code* row = codes + cp.page_start[page];
     for (size_t low = 0; low < kRow; ++low)
-      row[low] =
-          static_cast<Code>(lx::without_zero_bytes(cp.pages.code(static_cast<uint16_t>(page << 8 | low))));
+      row[low] = static_cast<Code>(without_zero_bytes(cp.pages.code(static_cast<uint16_t>(page << 8 | low))));
   }
 }
 
@@ -112,7 +111,7 @@ uint16_t same_below(const Codepage& cp) {
   for (; below < (cp.utf8 ? 0x80u : 0x100u); ++below) {
     const uint8_t b = static_cast<uint8_t>(below);
     if (cp.unicode[b] != b || (!cp.single_byte && cp.length(b) != 1)) break;
-    if (!cp.utf8 && lx::row_code(cp, b) != b) break;
+    if (!cp.utf8 && row_code(cp, b) != b) break;
   }
   return static_cast<uint16_t>(below & 0x180);
 }
@@ -136,8 +135,8 @@ bool has_plain_digits(const Codepage& cp) {
 class TypeTrie {
  public:
   explicit TypeTrie(const uint8_t* payload)
-      : nodes_(payload + lx::le16(payload + fmt::kTypeTrie)),
-        records_(payload + lx::le16(payload + fmt::kTypeRecords)) {}
+      : nodes_(payload + le16(payload + fmt::kTypeTrie)),
+        records_(payload + le16(payload + fmt::kTypeRecords)) {}
 
   bool has_case(uint8_t first_byte) const {
     const fmt::TypeNode root = fmt::TypeNode::read(nodes_);

@@ -6,14 +6,16 @@
 #include "core/lxmemory.h"
 #include "core/lxtrace.h"
 
+using namespace lx;
+
 namespace {
 
-namespace fmt = lx::format::codepage;
+namespace fmt = format::codepage;
 
 RAS1_Unit unit = RAS1_UNIT("lxcpupgrade");
 
 size_t aligned(size_t bytes) {
-  const size_t unit_bytes = lx::globals.area->table_alignment;
+  const size_t unit_bytes = globals.area->table_alignment;
   return (bytes + unit_bytes - 1) / unit_bytes * unit_bytes;
 }
 
@@ -29,10 +31,10 @@ constexpr TableMove kFixedMoves[] = {
 constexpr size_t kPayloadOffsets[] = {fmt::kFullWidth, fmt::kPairs, fmt::kTypeTrie, fmt::kTypeRecords};
 
 /// The new payload; a block of `*bytes` bytes, or null. False when an offset does not fit.
-bool upgrade_payload(lx::Bytes old, bool single_byte, uint8_t** block, size_t* bytes) {
+bool upgrade_payload(Bytes old, bool single_byte, uint8_t** block, size_t* bytes) {
   const size_t fixed_bytes = single_byte ? fmt::kFixedBytes : aligned(fmt::kFixedBytes);
   *bytes = fixed_bytes + (single_byte ? 0 : old.size - kFixedBytes1);
-  uint8_t* fresh = static_cast<uint8_t*>(lx::hook_allocate_zeroed(*bytes));
+  uint8_t* fresh = static_cast<uint8_t*>(hook_allocate_zeroed(*bytes));
   *block = fresh;
   if (fresh == nullptr) return true;
   for (const TableMove& move : kFixedMoves)
@@ -40,24 +42,24 @@ bool upgrade_payload(lx::Bytes old, bool single_byte, uint8_t** block, size_t* b
   if (single_byte) return true;
   memcpy(fresh + fixed_bytes, old.data + kFixedBytes1, old.size - kFixedBytes1);
   for (size_t field : kPayloadOffsets) {
-    const size_t offset = lx::le16(old.data + fmt::in_version1(field));
+    const size_t offset = le16(old.data + fmt::in_version1(field));
     const size_t moved = offset != 0 ? offset + (fixed_bytes - kFixedBytes1) : 0;
     if (moved > UINT16_MAX) return false;
-    lx::put_le16(fresh + field, static_cast<uint16_t>(moved));
+    put_le16(fresh + field, static_cast<uint16_t>(moved));
   }
   return true;
 }
 
 /// The new multibyte-to-Unicode section: every node gets the range of all bytes. The values offset of the old
 /// payload tells how many nodes there are.
-bool upgrade_trie(lx::Bytes old, size_t old_values, uint8_t** block, size_t* bytes, size_t* values) {
+bool upgrade_trie(Bytes old, size_t old_values, uint8_t** block, size_t* bytes, size_t* values) {
   if (old_values > old.size) return false;
   const size_t nodes = old_values / fmt::TypeNode::kBytes;
   *values = aligned(nodes * fmt::UnicodeNode::kBytes);
   if (*values > UINT16_MAX) return false;
   const size_t value_bytes = old.size - old_values;
   *bytes = *values + value_bytes;
-  uint8_t* fresh = static_cast<uint8_t*>(lx::hook_allocate_zeroed(*bytes));
+  uint8_t* fresh = static_cast<uint8_t*>(hook_allocate_zeroed(*bytes));
   *block = fresh;
   if (fresh == nullptr) return true;
   for (size_t i = 0; i < nodes; ++i) {
@@ -103,15 +105,15 @@ int32_t upgrade_codepage(const Sections& version1, Sections* upgraded) {
 
 extern "C" void* LXCpV1toV2(const void* payload, int32_t payload_bytes, const void* section,
                             int32_t section_bytes, void** new_section) {
-  lx::Events events(unit);
+  Events events(unit);
   *new_section = nullptr;
   void* const none = nullptr;
-  if (!lx::initialized() || payload_bytes < 0 || section_bytes < 0) return events.exit(none);
-  lx::Sections version1;
+  if (!initialized() || payload_bytes < 0 || section_bytes < 0) return events.exit(none);
+  Sections version1;
   version1.section[0] = {static_cast<const uint8_t*>(payload), static_cast<size_t>(payload_bytes)};
   version1.section[1] = {static_cast<const uint8_t*>(section), static_cast<size_t>(section_bytes)};
-  lx::Sections upgraded;
-  if (lx::upgrade_codepage(version1, &upgraded) != LX_OK) return events.exit(none);
+  Sections upgraded;
+  if (upgrade_codepage(version1, &upgraded) != LX_OK) return events.exit(none);
   if (upgraded.section[1].data != version1.section[1].data)
     *new_section = const_cast<uint8_t*>(upgraded.section[1].data);
   return events.exit(static_cast<void*>(const_cast<uint8_t*>(upgraded.section[0].data)));

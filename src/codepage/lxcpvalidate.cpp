@@ -5,9 +5,11 @@
 #include "codepage/lxcodepage.h"
 #include "core/lxmemory.h"
 
+using namespace lx;
+
 namespace {
 
-namespace fmt = lx::format::codepage;
+namespace fmt = format::codepage;
 
 constexpr unsigned kAnyByte = 256;
 
@@ -22,9 +24,9 @@ template <class NodeType>
 struct Trie {
   using Node = NodeType;
   size_t section;
-  size_t start;       // of the root in the section
-  lx::Bytes nodes;    // from there to the end of the section
-  lx::Bytes entries;  // what leaves index
+  size_t start;   // of the root in the section
+  Bytes nodes;    // from there to the end of the section
+  Bytes entries;  // what leaves index
   size_t entry_bytes;
   const char* no_node;
   const char* no_entry;
@@ -42,9 +44,9 @@ class TrieCheck {
 
  public:
   explicit TrieCheck(const Trie& trie) : trie_(trie), known_(trie.nodes.size / Node::kBytes) {
-    if (known_ != 0) heights_ = static_cast<uint8_t*>(lx::hook_allocate_zeroed(known_));
+    if (known_ != 0) heights_ = static_cast<uint8_t*>(hook_allocate_zeroed(known_));
   }
-  ~TrieCheck() { lx::hook_free(heights_); }
+  ~TrieCheck() { hook_free(heights_); }
   TrieCheck(const TrieCheck&) = delete;
   TrieCheck& operator=(const TrieCheck&) = delete;
 
@@ -61,11 +63,11 @@ class TrieCheck {
     const size_t rest = height(root.next(byte), limit - 1, 0);
     return rest != 0 && (rest + 1 <= limit || refuse(trie_.too_long, 0));
   }
-  const lx::Fault& fault() const { return fault_; }
+  const Fault& fault() const { return fault_; }
 
  private:
   bool refuse(const char* reason, size_t index) {
-    fault_ = lx::corrupt(reason, trie_.start + index * Node::kBytes, trie_.section);
+    fault_ = corrupt(reason, trie_.start + index * Node::kBytes, trie_.section);
     return false;
   }
 
@@ -94,110 +96,109 @@ class TrieCheck {
   const Trie& trie_;
   size_t known_;
   uint8_t* heights_ = nullptr;  // by node; 0: not measured
-  lx::Fault fault_;
+  Fault fault_;
 };
 
 class Validator {
  public:
-  Validator(uint16_t id, const lx::Sections& sections)
+  Validator(uint16_t id, const Sections& sections)
       : sections_(sections), payload_(sections.section[0]), utf8_(id == fmt::kUtf8Id) {}
 
-  lx::Fault run() {
-    if (!payload_.holds(0, fmt::kFixedBytes))
-      return lx::corrupt("the payload is shorter than its fixed part", 0);
+  Fault run() {
+    if (!payload_.holds(0, fmt::kFixedBytes)) return corrupt("the payload is shorter than its fixed part", 0);
     width_ = payload_.data[fmt::kWidth];
     shift_ = (word(fmt::kFlags) & fmt::kFlagShift) != 0 && width_ > 1;  // else no state differs
-    if (const lx::Fault fault = check_lengths()) return fault;
-    if (const lx::Fault fault = check_width_tables()) return fault;
-    if (const lx::Fault fault = check_written_bytes()) return fault;
-    if (const lx::Fault fault = utf8_ ? check_formula() : check_pages()) return fault;
+    if (const Fault fault = check_lengths()) return fault;
+    if (const Fault fault = check_width_tables()) return fault;
+    if (const Fault fault = check_written_bytes()) return fault;
+    if (const Fault fault = utf8_ ? check_formula() : check_pages()) return fault;
     if (width_ == 1) return {};
-    if (const lx::Fault fault = check_trie(type_trie())) return fault;
-    return utf8_ ? lx::Fault{} : check_trie(unicode_trie());
+    if (const Fault fault = check_trie(type_trie())) return fault;
+    return utf8_ ? Fault{} : check_trie(unicode_trie());
   }
 
  private:
-  size_t word(size_t offset) const { return lx::le16(payload_.data + offset); }
+  size_t word(size_t offset) const { return le16(payload_.data + offset); }
   uint8_t length(unsigned byte) const { return payload_.data[fmt::kLengths + byte]; }
   bool is_shift(unsigned byte) const {
     return shift_ && (byte == payload_.data[fmt::kShiftOut] || byte == payload_.data[fmt::kShiftIn]);
   }
 
   /// Lengths are 1 to the width; where UTF-8 is computed, as long as the bytes that the formula reads.
-  lx::Fault check_lengths() const {
-    if (width_ < 1 || width_ > lx::kMaxCharBytes) return lx::corrupt("the width is not 1 to 4", fmt::kWidth);
+  Fault check_lengths() const {
+    if (width_ < 1 || width_ > kMaxCharBytes) return corrupt("the width is not 1 to 4", fmt::kWidth);
     for (unsigned byte = 0; byte < kAnyByte; ++byte) {
       if (length(byte) < 1 || length(byte) > width_)
-        return lx::corrupt("the length of a byte is not 1 to the width", fmt::kLengths + byte);
+        return corrupt("the length of a byte is not 1 to the width", fmt::kLengths + byte);
       if (utf8_ && length(byte) == 2 && byte > 0xDF)
-        return lx::corrupt("the length of a byte is 2 where UTF-8 reads 3 bytes", fmt::kLengths + byte);
+        return corrupt("the length of a byte is 2 where UTF-8 reads 3 bytes", fmt::kLengths + byte);
     }
     return {};
   }
 
-  lx::Fault check_width_tables() const {
+  Fault check_width_tables() const {
     if (!payload_.holds(word(fmt::kFullWidth), fmt::kFullWidthBytes))
-      return lx::corrupt("the full-width table lies outside the payload", fmt::kFullWidth);
+      return corrupt("the full-width table lies outside the payload", fmt::kFullWidth);
     if (!payload_.holds(word(fmt::kPairs), word(fmt::kPairCount) * fmt::WidthPair::kBytes))
-      return lx::corrupt("the width pairs lie outside the payload", fmt::kPairs);
+      return corrupt("the width pairs lie outside the payload", fmt::kPairs);
     return {};
   }
 
   /// Whether a byte that the library writes as a character is one.
   bool single(unsigned byte) const { return length(byte) == 1 && !is_shift(byte); }
 
-  lx::Fault check_written_bytes() const {
-    if (word(fmt::kUnicode) != 0) return lx::corrupt("the byte 00 is not U+0000", fmt::kUnicode);
+  Fault check_written_bytes() const {
+    if (word(fmt::kUnicode) != 0) return corrupt("the byte 00 is not U+0000", fmt::kUnicode);
     const bool ascii = (word(fmt::kFlags) & fmt::kFlagAscii) != 0;
     for (uint8_t byte : ascii ? kWrittenAscii : kWrittenEbcdic)
       if (!single(byte))
-        return lx::corrupt("a null, blank, digit or sign is no character of one byte", fmt::kLengths + byte);
+        return corrupt("a null, blank, digit or sign is no character of one byte", fmt::kLengths + byte);
     for (size_t i = 0; i < fmt::kLineEndBytes; ++i)
       if (!single(payload_.data[fmt::kLineEnds + i]))
-        return lx::corrupt("a line end is no character of one byte", fmt::kLineEnds + i);
+        return corrupt("a line end is no character of one byte", fmt::kLineEnds + i);
     if (!single(payload_.data[fmt::kSubstitution]))
-      return lx::corrupt("the substitution is no character of one byte", fmt::kSubstitution);
+      return corrupt("the substitution is no character of one byte", fmt::kSubstitution);
     return {};
   }
 
   /// Where UTF-8 is computed: what the formula writes has the lengths of the codepage, which has no states.
-  lx::Fault check_formula() const {
-    if (shift_) return lx::corrupt("UTF-8 has shift states", fmt::kFlags);
+  Fault check_formula() const {
+    if (shift_) return corrupt("UTF-8 has shift states", fmt::kFlags);
     for (uint32_t u = 0; u <= UINT16_MAX; u += u < 0x800 ? 1 : 0x1000) {
-      uint8_t bytes[lx::kMaxCharBytes];
-      const size_t count = lx::utf8_bytes(static_cast<uint16_t>(u));
-      lx::store_utf8(bytes, static_cast<uint16_t>(u), count);
+      uint8_t bytes[kMaxCharBytes];
+      const size_t count = utf8_bytes(static_cast<uint16_t>(u));
+      store_utf8(bytes, static_cast<uint16_t>(u), count);
       if (length(bytes[0]) != count)
-        return lx::corrupt("the length of a byte is not what UTF-8 writes", fmt::kLengths + bytes[0]);
+        return corrupt("the length of a byte is not what UTF-8 writes", fmt::kLengths + bytes[0]);
     }
     return {};
   }
 
   /// Pages stay in their arrays, codes are no longer than the width says, and U+0000 is the null.
-  lx::Fault check_pages() const {
-    const lx::PageCodes pages{payload_.data, sections_.section[2].data, sections_.section[3].data};
+  Fault check_pages() const {
+    const PageCodes pages{payload_.data, sections_.section[2].data, sections_.section[3].data};
     for (size_t number = 0; number < kAnyByte; ++number) {
       const fmt::PageEntry page = pages.entry(number);
       const size_t place = fmt::kPages + number * fmt::PageEntry::kBytes;
       for (unsigned byte = page.lowest; byte <= page.highest; ++byte) {
         if (!holds_element(2, page.low + (byte & page.mask), page.low_bytes()))
-          return lx::corrupt("a page leads outside the low array", place);
+          return corrupt("a page leads outside the low array", place);
         if (!holds_element(3, page.high + (byte & page.mask), page.high_bytes()))
-          return lx::corrupt("a page leads outside the high array", place);
+          return corrupt("a page leads outside the high array", place);
         const uint32_t code = page.code(byte, pages.low_array, pages.high_array);
-        if (lx::code_bytes(lx::without_zero_bytes(code)) > width_)
-          return lx::corrupt("a page has a code that is longer than the width", place);
+        if (code_bytes(without_zero_bytes(code)) > width_)
+          return corrupt("a page has a code that is longer than the width", place);
       }
     }
-    if (pages.code(0) != 0) return lx::corrupt("U+0000 is not the byte 00", fmt::kPages);
+    if (pages.code(0) != 0) return corrupt("U+0000 is not the byte 00", fmt::kPages);
     return {};
   }
   bool holds_element(size_t section, size_t index, size_t bytes) const {
     return bytes == 0 || sections_.section[section].holds(index * bytes, bytes);
   }
 
-  lx::Bytes rest_of(lx::Bytes section, size_t offset) const {
-    return offset <= section.size ? lx::Bytes{section.data + offset, section.size - offset} : lx::Bytes{};
+  Bytes rest_of(Bytes section, size_t offset) const {
+    return offset <= section.size ? Bytes{section.data + offset, section.size - offset} : Bytes{};
   }
   Trie<fmt::TypeNode> type_trie() const {
     const size_t start = word(fmt::kTypeTrie);
@@ -211,7 +212,7 @@ class Validator {
             "the type trie has a walk that is longer than its character"};
   }
   Trie<fmt::UnicodeNode> unicode_trie() const {
-    const lx::Bytes section = sections_.section[1];
+    const Bytes section = sections_.section[1];
     return {1,
             0,
             section,
@@ -225,7 +226,7 @@ class Validator {
   /// A walk may take as many bytes as the character that begins with its first byte has. One-byte characters
   /// are walked in the double-byte state only, where they begin one of the width.
   template <class Node>
-  lx::Fault check_trie(const Trie<Node>& trie) const {
+  Fault check_trie(const Trie<Node>& trie) const {
     TrieCheck<Trie<Node>> check(trie);
     if (check.out_of_memory()) return {LX_E_MEMORY};
     for (unsigned byte = 0; byte < kAnyByte; ++byte) {
@@ -235,14 +236,14 @@ class Validator {
     return {};
   }
 
-  const lx::Sections& sections_;
-  lx::Bytes payload_;
+  const Sections& sections_;
+  Bytes payload_;
   bool utf8_;
   bool shift_ = false;
   uint8_t width_ = 0;
 };
 
-lx::Fault validate_codepage(uint16_t id, const lx::Sections& sections) {
+Fault validate_codepage(uint16_t id, const Sections& sections) {
   return Validator(id, sections).run();
 }
 

@@ -7,27 +7,11 @@
 #include "codepage/lxwidth.h"
 #include "core/lxcall.h"
 
+using namespace lx;
+
 namespace {
 
-namespace fmt = lx::format::codepage;
-using lx::ByteChar;
-using lx::bytes_of;
-using lx::ByteText;
-using lx::Call;
-using lx::Codepage;
-using lx::codepage_of;
-using lx::Form;
-using lx::HalfWidthIndex;
-using lx::LeadByteText;
-using lx::Part;
-using lx::Runs;
-using lx::ShiftText;
-using lx::SpecialFilter;
-using lx::Specials;
-using lx::UnicodeChar;
-using lx::UnicodeText;
-using lx::WideText;
-using lx::WidthTables;
+namespace fmt = format::codepage;
 
 RAS1_Unit unit = RAS1_UNIT("lxmap");
 
@@ -71,7 +55,7 @@ bool parse_mode(uint32_t given, Mode* mode) {
 }
 
 uint16_t ascii_digit(uint16_t u) {
-  return (lx::unicode_type(u) & LX_C1_DIGIT) != 0 ? lx::unicode_digit(u) : 0;
+  return (unicode_type(u) & LX_C1_DIGIT) != 0 ? unicode_digit(u) : 0;
 }
 
 // Mappers: what one character maps to by itself. alone() is false when it stays as it is.
@@ -86,12 +70,12 @@ struct UnicodeMapper {
   LXUChar value(uint16_t u) const { return u; }
   bool alone(UnicodeChar c, LXUChar* mapped) const {
     if constexpr (kKind == Kind::kCase) {
-      if (lx::unicode_caseless(c.u)) return false;
-      *mapped = mode.upper ? lx::unicode_upper(c.u) : lx::unicode_lower(c.u);
+      if (unicode_caseless(c.u)) return false;
+      *mapped = mode.upper ? unicode_upper(c.u) : unicode_lower(c.u);
     } else if constexpr (kKind == Kind::kFullWidth) {
-      *mapped = lx::unicode_half_to_full(c.u);
+      *mapped = unicode_half_to_full(c.u);
     } else if constexpr (kKind == Kind::kHalfWidth) {
-      *mapped = lx::unicode_full_to_half(c.u);
+      *mapped = unicode_full_to_half(c.u);
     } else {
       *mapped = ascii_digit(c.u);
       return *mapped != 0;
@@ -111,9 +95,9 @@ struct CodepageMapper {
   using Value = LXWChar;
 
   uint16_t unicode(const ByteChar& c) const {
-    return c.length == 1 ? cp.unicode[*c.p] : lx::multibyte_unicode(cp, c.p);
+    return c.length == 1 ? cp.unicode[*c.p] : multibyte_unicode(cp, c.p);
   }
-  LXWChar value(uint16_t u) const { return lx::unicode_to_code(cp, u); }
+  LXWChar value(uint16_t u) const { return unicode_to_code(cp, u); }
   bool alone(const ByteChar& c, LXWChar* mapped) const {
     if constexpr (kKind == Kind::kCase) {
       if (c.length == 1) {
@@ -121,19 +105,19 @@ struct CodepageMapper {
         return true;
       }
       if (cp.caseless[*c.p] != 0) return false;
-      const uint8_t* record = lx::type_record(cp, c.p);  // none where the codepage has no such codes
+      const uint8_t* record = type_record(cp, c.p);  // none where the codepage has no such codes
       if (record == nullptr) return false;
-      const auto type = lx::format::codepage::TypeRecord::read(record);
+      const auto type = format::codepage::TypeRecord::read(record);
       if ((type.type & mask) == 0) return false;
-      *mapped = lx::pack(c.p, c.length) + type.case_delta;
+      *mapped = pack(c.p, c.length) + type.case_delta;
       return true;
     } else if constexpr (kKind == Kind::kFullWidth) {
-      *mapped = c.length == 1 ? widths.full_of_byte(*c.p) : widths.to_full(lx::pack(c.p, c.length));
+      *mapped = c.length == 1 ? widths.full_of_byte(*c.p) : widths.to_full(pack(c.p, c.length));
     } else if constexpr (kKind == Kind::kHalfWidth) {
-      *mapped = halves->to_half(lx::pack(c.p, c.length));
+      *mapped = halves->to_half(pack(c.p, c.length));
     } else {
       const uint16_t digit = ascii_digit(unicode(c));
-      *mapped = digit != 0 ? lx::unicode_to_code(cp, digit) : 0;
+      *mapped = digit != 0 ? unicode_to_code(cp, digit) : 0;
     }
     return *mapped != 0;
   }
@@ -203,7 +187,7 @@ void map_unicode(UnicodeText& text, const SpecialFilter& filter, const Mode& mod
 
 template <class Text>
 [[gnu::noinline]] void map_half_width(Text& text, const SpecialFilter& filter, const WidthTables& widths) {
-  const HalfWidthIndex index(widths, lx::room(text.in.p, text.in.end) >= lx::kLongText);
+  const HalfWidthIndex index(widths, room(text.in.p, text.in.end) >= kLongText);
   map_all(text, CodepageMapper<Kind::kHalfWidth>{text.in.cp, nullptr, 0, widths, &index}, filter, Runs{});
 }
 
@@ -231,7 +215,7 @@ size_t map_bytes_to(const LXLocale& locale, uint8_t* output, size_t size, const 
                     const Mode& mode, Form form) {
   const Codepage& cp = codepage_of(*locale.codepage);
   const SpecialFilter filter(*locale.language, mode.specials, mode.upper);
-  uint8_t* const out_end = lx::end_of(output, size);
+  uint8_t* const out_end = end_of(output, size);
   const uint8_t* const end =
       form == Form::kEx && cp.shift_sensitive
           ? map_codepage(
@@ -252,11 +236,11 @@ int32_t map_bytes(LXLocale* given, char* output, int32_t size, const char* input
   const uint8_t* const text = bytes_of(input);
   const bool characters = (given_mode & LX_CHARACTERS) != 0;
   if (mode.kind == Kind::kCopy) {
-    const Part copied = lx::part_that_fits(cp, form, ByteText{text, length}, size, characters);
+    const Part copied = part_that_fits(cp, form, ByteText{text, length}, size, characters);
     memmove(output, input, copied.units);
     return call.exit(static_cast<int32_t>(characters ? copied.chars : copied.units));
   }
-  const size_t bytes = lx::units_of(cp, ByteText{text, length}, characters) + (length < 0 ? 1 : 0);
+  const size_t bytes = units_of(cp, ByteText{text, length}, characters) + (length < 0 ? 1 : 0);
   const size_t room = static_cast<size_t>(size);
   if (!characters)
     return call.exit(
@@ -264,10 +248,10 @@ int32_t map_bytes(LXLocale* given, char* output, int32_t size, const char* input
   uint8_t work[kWorkBytes];
   const size_t work_bytes = room < kWorkBytes / kWorkBytesPerChar ? room * kWorkBytesPerChar : kWorkBytes;
   size_t mapped = map_bytes_to(*call.locale(), work, work_bytes, text, bytes, mode, form);
-  int32_t chars = lx::chars_in_bytes(cp, work, LX_SHIFT_SINGLE, mapped);
+  int32_t chars = chars_in_bytes(cp, work, LX_SHIFT_SINGLE, mapped);
   if (chars > size) {
     chars = size;
-    mapped = lx::bytes_of_chars(cp, work, LX_SHIFT_SINGLE, chars, mapped);
+    mapped = bytes_of_chars(cp, work, LX_SHIFT_SINGLE, chars, mapped);
   }
   memcpy(output, work, mapped);
   return call.exit(chars);
@@ -285,29 +269,29 @@ int32_t map_units(LXLocale* given, Unit* output, int32_t size, const Unit* input
   if (size < 1 || length == 0) return call.exit(0);
   const Codepage& cp = codepage_of(call.codepage());
   if (mode.kind == Kind::kCopy) {
-    const Part copied = lx::part_that_fits(cp, Form::kPlain, lx::Text<Unit>{input, length}, size, false);
+    const Part copied = part_that_fits(cp, Form::kPlain, Text<Unit>{input, length}, size, false);
     memmove(output, input, copied.units * sizeof(Unit));
     return call.exit(static_cast<int32_t>(copied.units));
   }
-  const size_t units = lx::text_units_with_null(input, length);
+  const size_t units = text_units_with_null(input, length);
   const Unit* const end =
-      map(*call.locale(), input, input + units, output, lx::end_of(output, static_cast<size_t>(size)), mode);
+      map(*call.locale(), input, input + units, output, end_of(output, static_cast<size_t>(size)), mode);
   return call.exit(static_cast<int32_t>(end - output));
 }
 
 LXUChar mapped_alone(LXLocale* locale, LXUChar u, uint16_t (*map)(uint16_t)) {
-  const lx::Primitive in(locale);
+  const Primitive in(locale);
   return map(u);
 }
 
 /// Stores a character in its other case. A walk may go beyond a single byte, so it stands in a longer text.
 int32_t store_other_case(const Codepage& cp, const char* text, size_t length, char* output, uint32_t mask) {
-  uint8_t bytes[lx::kMaxCharBytes] = {};
+  uint8_t bytes[kMaxCharBytes] = {};
   memcpy(bytes, text, length);
-  const uint32_t code = lx::pack(bytes, length);
-  const uint32_t other = lx::other_case(lx::type_record(cp, bytes), code, mask);
-  if (other != code && lx::code_bytes(other) <= cp.width)
-    return static_cast<int32_t>(lx::store_packed(bytes_of(output), other));
+  const uint32_t code = pack(bytes, length);
+  const uint32_t other = other_case(type_record(cp, bytes), code, mask);
+  if (other != code && code_bytes(other) <= cp.width)
+    return static_cast<int32_t>(store_packed(bytes_of(output), other));
   memmove(output, text, length);
   return static_cast<int32_t>(length);
 }
@@ -317,44 +301,44 @@ int32_t store_other_case(const Codepage& cp, const char* text, size_t length, ch
 extern "C" {
 
 LXUChar LXUnicodeToLower(LXLocale* locale, LXUChar unicode) {
-  return mapped_alone(locale, unicode, lx::unicode_lower);
+  return mapped_alone(locale, unicode, unicode_lower);
 }
 
 LXUChar LXUnicodeToUpper(LXLocale* locale, LXUChar unicode) {
-  return mapped_alone(locale, unicode, lx::unicode_upper);
+  return mapped_alone(locale, unicode, unicode_upper);
 }
 
 LXUChar LXUnicodeToH2F(LXLocale* locale, LXUChar unicode) {
-  return mapped_alone(locale, unicode, lx::unicode_half_to_full);
+  return mapped_alone(locale, unicode, unicode_half_to_full);
 }
 
 LXUChar LXUnicodeToF2H(LXLocale* locale, LXUChar unicode) {
-  return mapped_alone(locale, unicode, lx::unicode_full_to_half);
+  return mapped_alone(locale, unicode, unicode_full_to_half);
 }
 
 LXWChar LXCpMbCaseConvW(const LXObject* codepage, LXWChar code, uint32_t mask) {
-  if (!lx::initialized()) return code;
-  return lx::other_case(lx::type_record_of_code(codepage_of(*codepage), code), code, mask);
+  if (!initialized()) return code;
+  return other_case(type_record_of_code(codepage_of(*codepage), code), code, mask);
 }
 
 int32_t LXCpMbCaseConv(const LXObject* codepage, const char* text, char* output, uint32_t mask) {
-  if (!lx::initialized()) return 0;
+  if (!initialized()) return 0;
   const Codepage& cp = codepage_of(*codepage);
   return store_other_case(cp, text, cp.length(bytes_of(text)[0]), output, mask);
 }
 
 int32_t LXCpMbCaseConvS(const LXObject* codepage, const char* text, char* output, uint32_t mask) {
-  if (!lx::initialized()) return 0;
+  if (!initialized()) return 0;
   const Codepage& cp = codepage_of(*codepage);
   return store_other_case(cp, text, cp.width, output, mask);
 }
 
 LXWChar LXCpMbHalfToFullW(const LXObject* codepage, LXWChar code) {
-  return lx::initialized() ? WidthTables(codepage_of(*codepage)).to_full(code) : 0;
+  return initialized() ? WidthTables(codepage_of(*codepage)).to_full(code) : 0;
 }
 
 LXWChar LXCpFullToHalfW(const LXObject* codepage, LXWChar code) {
-  return lx::initialized() ? WidthTables(codepage_of(*codepage)).to_half(code) : 0;
+  return initialized() ? WidthTables(codepage_of(*codepage)).to_half(code) : 0;
 }
 
 int32_t LXMapString(LXLocale* locale, char* output, int32_t size, const char* input, int32_t length,

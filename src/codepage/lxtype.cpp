@@ -2,11 +2,11 @@
 #include "codepage/lxprimitive.h"
 #include "codepage/lxunicode.h"
 
+using namespace lx;
+
 namespace {
 
-namespace fmt = lx::format::codepage;
-using lx::bytes_of;
-using lx::Primitive;
+namespace fmt = format::codepage;
 
 /// The field of a type word that a selector asks for; any other selector gives the classification.
 uint32_t type_field(const Primitive& in, uint32_t word, uint32_t selector) {
@@ -80,7 +80,7 @@ uint32_t LXGetCharType(LXLocale* locale, const char* text, uint32_t selector) {
   if (!in) return 0;
   const uint8_t* p = bytes_of(text);
   const bool single = in.single_byte() || in.cp().length(*p) == 1;
-  return type_field(in, single ? in.cp().type(*p) : type_of(lx::type_record(in.cp(), p)), selector);
+  return type_field(in, single ? in.cp().type(*p) : type_of(type_record(in.cp(), p)), selector);
 }
 
 uint32_t LXGetCharTypeW(LXLocale* locale, LXWChar code, uint32_t selector) {
@@ -88,13 +88,13 @@ uint32_t LXGetCharTypeW(LXLocale* locale, LXWChar code, uint32_t selector) {
   if (!in) return 0;
   const bool single = in.single_byte() || code <= 0xFF;
   return type_field(
-      in, single ? in.cp().type(static_cast<uint8_t>(code)) : type_of(lx::type_record_of_code(in.cp(), code)),
+      in, single ? in.cp().type(static_cast<uint8_t>(code)) : type_of(type_record_of_code(in.cp(), code)),
       selector);
 }
 
 uint32_t LXGetCharTypeU(LXLocale* locale, LXUChar unicode, uint32_t selector) {
   const Primitive in(locale);
-  return in ? type_field(in, lx::unicode_type(unicode), selector) : 0;
+  return in ? type_field(in, unicode_type(unicode), selector) : 0;
 }
 
 uint32_t LXGetCharTypeEx(LXLocale* locale, const char* text, LXShiftState state, uint32_t selector) {
@@ -102,24 +102,24 @@ uint32_t LXGetCharTypeEx(LXLocale* locale, const char* text, LXShiftState state,
   if (!in) return 0;
   if (in.single_byte() || !in.shift_sensitive()) return LXGetCharType(locale, text, selector);
   const uint8_t* p = bytes_of(text);
-  lx::take_shift(in.cp(), &p, &state);
+  take_shift(in.cp(), &p, &state);
   const bool single = state != LX_SHIFT_DOUBLE;
-  return type_field(in, single ? in.cp().type(*p) : type_of(lx::type_record(in.cp(), p)), selector);
+  return type_field(in, single ? in.cp().type(*p) : type_of(type_record(in.cp(), p)), selector);
 }
 
 const uint8_t* LXGetMbCtype(const LXObject* codepage, const char* text) {
-  return lx::initialized() ? lx::type_record(lx::codepage_of(*codepage), bytes_of(text)) : nullptr;
+  return initialized() ? type_record(codepage_of(*codepage), bytes_of(text)) : nullptr;
 }
 
 const uint8_t* LXGetMbCtypeW(const LXObject* codepage, LXWChar code) {
-  return lx::initialized() ? lx::type_record_of_code(lx::codepage_of(*codepage), code) : nullptr;
+  return initialized() ? type_record_of_code(codepage_of(*codepage), code) : nullptr;
 }
 
 int32_t LXLangGetSpecial(const LXObject* language, LXUChar first, LXUChar second, LXUChar* result1,
                          LXUChar* result2, int32_t selector) {
   constexpr int32_t kUpperSelector = 44;
-  if (!lx::initialized()) return 0;
-  return lx::specials_of(*language, selector == kUpperSelector).find(first, second, result1, result2);
+  if (!initialized()) return 0;
+  return specials_of(*language, selector == kUpperSelector).find(first, second, result1, result2);
 }
 
 }  // extern "C"

@@ -6,16 +6,9 @@
 #include "collate/lxkey.h"
 #include "core/lxcall.h"
 
-namespace {
+using namespace lx;
 
-using lx::bytes_of;
-using lx::Call;
-using lx::codepage_of;
-using lx::CountedText;
-using lx::Form;
-using lx::Levels;
-using lx::Sort;
-using lx::Text;
+namespace {
 
 RAS1_Unit unit = RAS1_UNIT("lxcoll");
 
@@ -59,34 +52,34 @@ int32_t compare_binary(LXLocale* locale, Form, const Text<LXUChar>& a, const Tex
   return LXStrcmpU(locale, a.p, a.length, b.p, b.length, options);
 }
 
-void drop_blanks(LXLocale* locale, Form form, CountedText<uint8_t>* a, CountedText<uint8_t>* b, bool) {
-  lx::drop_blanks(locale, form, a, b, LX_DROP_FULL_BLANKS, true);
+void ignore_blanks(LXLocale* locale, Form form, CountedText<uint8_t>* a, CountedText<uint8_t>* b, bool) {
+  drop_blanks(locale, form, a, b, LX_DROP_FULL_BLANKS, true);
 }
 template <class Unit>
-void drop_blanks(LXLocale* locale, Form, CountedText<Unit>* a, CountedText<Unit>* b, bool width) {
-  const Unit blank = lx::blank_of(*locale);
+void ignore_blanks(LXLocale* locale, Form, CountedText<Unit>* a, CountedText<Unit>* b, bool width) {
+  const Unit blank = blank_of(*locale);
   Unit full = blank;
-  if (width) lx::find_full_width_blank(*locale, &full);
-  a->units = lx::without_blanks(a->p, a->units, blank, full);
-  b->units = lx::without_blanks(b->p, b->units, blank, full);
+  if (width) find_full_width_blank(*locale, &full);
+  a->units = without_blanks(a->p, a->units, blank, full);
+  b->units = without_blanks(b->p, b->units, blank, full);
 }
 
 /// Compares the keys of two texts of at most `chars1` and `chars2` characters.
 template <class Cursor>
 int32_t compare_keys(const Sort& sort, const Cursor& text1, size_t chars1, const Cursor& text2, size_t chars2,
                      int32_t* code) {
-  const lx::LevelSpace space(chars1, chars2);
+  const LevelSpace space(chars1, chars2);
   *code = space ? LX_OK : LX_E_MEMORY;
   if (!space) return 0;
   uint8_t* const bytes1 = space.first.as<uint8_t>();
   uint8_t* const bytes2 = space.second.as<uint8_t>();
-  const lx::Key key1(sort, text1, chars1, bytes1);
-  const lx::Key key2(sort, text2, chars2, bytes2);
+  const Key key1(sort, text1, chars1, bytes1);
+  const Key key2(sort, text2, chars2, bytes2);
   const size_t size1 = key1.bytes();
   const size_t size2 = key2.bytes();
   key1.write(bytes1);
   key2.write(bytes2);
-  const int32_t difference = memcmp(bytes1, bytes2, lx::least(size1, size2));
+  const int32_t difference = memcmp(bytes1, bytes2, least(size1, size2));
   return difference != 0 ? difference : (size1 > size2) - (size1 < size2);
 }
 
@@ -95,12 +88,11 @@ template <class Unit>
 [[gnu::noinline]] int32_t compare_behind(const LXLocale& locale, Form form, Text<Unit> text1, size_t units1,
                                          Text<Unit> text2, size_t units2, size_t same, int32_t* code) {
   const auto rest = [same](const auto& text) {
-    return lx::like(text, text.p + same, lx::room(text.p, text.end) - same,
-                    lx::state_at(text, LX_SHIFT_SINGLE));
+    return like(text, text.p + same, room(text.p, text.end) - same, state_at(text, LX_SHIFT_SINGLE));
   };
-  return lx::with_cursor(codepage_of(*locale.codepage), form, text1, units1, [&](const auto& in) {
-    const auto other = lx::like(in, text2.p, units2, text2.state);
-    return lx::compare_rest(lx::sort_of(*locale.sort), in, other, rest(in), rest(other), code);
+  return with_cursor(codepage_of(*locale.codepage), form, text1, units1, [&](const auto& in) {
+    const auto other = like(in, text2.p, units2, text2.state);
+    return compare_rest(sort_of(*locale.sort), in, other, rest(in), rest(other), code);
   });
 }
 
@@ -109,11 +101,11 @@ template <class Unit>
 [[gnu::always_inline]] inline int32_t compare_weights(const LXLocale& locale, Form form,
                                                       const Text<Unit>& text1, size_t units1,
                                                       const Text<Unit>& text2, size_t units2, int32_t* code) {
-  const Sort& sort = lx::sort_of(*locale.sort);
+  const Sort& sort = sort_of(*locale.sort);
   size_t same = 0;
   if (sort.appends_primaries && form == Form::kPlain) {
-    const lx::Beginnings beginnings =
-        lx::compare_beginnings(codepage_of(*locale.codepage), sort, text1.p, units1, text2.p, units2);
+    const Beginnings beginnings =
+        compare_beginnings(codepage_of(*locale.codepage), sort, text1.p, units1, text2.p, units2);
     if (beginnings.result != 0) return beginnings.result;
     same = beginnings.same;
     if (same != 0 && same == units1 && same == units2) return 0;
@@ -123,13 +115,13 @@ template <class Unit>
 
 template <class Unit>
 [[gnu::noinline]] int32_t compare_folded(const LXLocale& locale, Form form, const CountedText<Unit>& a,
-                                         const CountedText<Unit>& b, lx::Fold fold, int32_t* code) {
-  const lx::Folding folding(locale, fold);
-  return lx::with_cursor(
+                                         const CountedText<Unit>& b, Fold fold, int32_t* code) {
+  const Folding folding(locale, fold);
+  return with_cursor(
       codepage_of(*locale.codepage), form, Text<Unit>{a.p, 0, a.state}, a.units, [&](const auto& in) {
-        using Folded = lx::FoldCursor<std::decay_t<decltype(in)>>;
-        return compare_keys(lx::sort_of(*locale.sort), Folded{folding, in}, folding.most_chars(a.units),
-                            Folded{folding, lx::like(in, b.p, b.units, b.state)}, folding.most_chars(b.units),
+        using Folded = FoldCursor<std::decay_t<decltype(in)>>;
+        return compare_keys(sort_of(*locale.sort), Folded{folding, in}, folding.most_chars(a.units),
+                            Folded{folding, like(in, b.p, b.units, b.state)}, folding.most_chars(b.units),
                             code);
       });
 }
@@ -140,11 +132,11 @@ template <class Unit>
                                                uint32_t options, const Rules& rules, int32_t* code) {
   *code = LX_E_INVALID;
   if ((options & rules.refused) != 0) return 0;
-  const lx::Codepage& cp = codepage_of(*locale->codepage);
+  const Codepage& cp = codepage_of(*locale->codepage);
   const bool characters = (options & LX_CHARACTERS) != 0;
-  const bool width = lx::fold_of(options) == lx::Fold::kWidth;
-  CountedText<Unit> a{text1.p, lx::units_of(cp, text1, characters), text1.state};
-  CountedText<Unit> b{text2.p, lx::units_of(cp, text2, characters), text2.state};
+  const bool width = fold_of(options) == Fold::kWidth;
+  CountedText<Unit> a{text1.p, units_of(cp, text1, characters), text1.state};
+  CountedText<Unit> b{text2.p, units_of(cp, text2, characters), text2.state};
   if (locale->sort == nullptr) {
     options &= width ? rules.binary_width : rules.binary;
     if (text1.length >= 0) text1.length = static_cast<int32_t>(a.units);
@@ -155,13 +147,13 @@ template <class Unit>
   }
   options &= ~uint32_t{LX_CHARACTERS};
   if ((options & rules.blanks) != 0) {
-    drop_blanks(locale, form, &a, &b, width);
+    ignore_blanks(locale, form, &a, &b, width);
     options &= ~LX_IGNORE_BLANKS;
   }
-  if (!lx::is_fold(options)) return 0;
+  if (!is_fold(options)) return 0;
   *code = LX_OK;
   if (options == 0) return compare_weights(*locale, form, text1, a.units, text2, b.units, code);
-  return compare_folded(*locale, form, a, b, lx::fold_of(options), code);
+  return compare_folded(*locale, form, a, b, fold_of(options), code);
 }
 
 template <class Unit>
@@ -172,8 +164,8 @@ template <class Unit>
   int32_t code = LX_OK;
   int32_t result = 0;
   if (options == 0 && call.locale()->sort != nullptr)
-    result = compare_weights(*call.locale(), form, text1, lx::text_units(text1.p, text1.length), text2,
-                             lx::text_units(text2.p, text2.length), &code);
+    result = compare_weights(*call.locale(), form, text1, text_units(text1.p, text1.length), text2,
+                             text_units(text2.p, text2.length), &code);
   else
     result = compare_with_options(call.locale(), form, text1, text2, options, rules, &code);
   return call.fail(code, result);
@@ -191,7 +183,7 @@ int32_t LXStrcoll(LXLocale* locale, const char* text1, int32_t length1, const ch
 
 int32_t LXStrcollEx(LXLocale* locale, const char* text1, LXShiftState state1, int32_t length1,
                     const char* text2, LXShiftState state2, int32_t length2, uint32_t options) {
-  const LXLocale* used = lx::locale_of(locale);
+  const LXLocale* used = locale_of(locale);
   if (used == nullptr || !codepage_of(*used->codepage).shift_sensitive)
     return LXStrcoll(locale, text1, length1, text2, length2, options);
   return collate<uint8_t>(locale, Form::kEx, {bytes_of(text1), length1, state1},

@@ -6,12 +6,9 @@
 #include "core/lxcall.h"
 #include "text/lxwalk.h"
 
-namespace {
+using namespace lx;
 
-using lx::bytes_of;
-using lx::Call;
-using lx::codepage_of;
-using lx::Form;
+namespace {
 
 RAS1_Unit unit = RAS1_UNIT("lxnextweight");
 
@@ -27,7 +24,7 @@ struct Step {
   uint8_t* char_class;
   LXUChar* look_ahead;
 
-  bool has_ahead() const { return *look_ahead != lx::kNoAhead; }
+  bool has_ahead() const { return *look_ahead != kNoAhead; }
   /// The units behind the character that was read ahead.
   size_t units() const {
     const int32_t units = *remaining - (has_ahead() ? 1 : 0);
@@ -37,28 +34,28 @@ struct Step {
 
 /// Takes the next element of the text that `in` reads on.
 template <class Cursor, class Unit>
-int32_t take(const lx::Sort& sort, const Cursor& in, const Step<Unit>& step) {
-  lx::Elements<Cursor, lx::LookAhead::kAlways> elements(sort, in, *step.counter, *step.look_ahead);
-  const lx::Element element = elements.next();
+int32_t take(const Sort& sort, const Cursor& in, const Step<Unit>& step) {
+  Elements<Cursor, LookAhead::kAlways> elements(sort, in, *step.counter, *step.look_ahead);
+  const Element element = elements.next();
   const bool cut = elements.position() == *step.counter;
   *step.remaining = 0;
   if (cut) return 0;
   *step.counter = elements.position();
   *step.look_ahead = elements.ahead();
   *step.text = reinterpret_cast<const Unit*>(elements.in().p);
-  if (step.state != nullptr) *step.state = lx::state_at(elements.in(), *step.state);
+  if (step.state != nullptr) *step.state = state_at(elements.in(), *step.state);
   if (!elements.at_end())
-    *step.remaining = static_cast<int32_t>(lx::room(elements.in().p, elements.in().end)) + step.has_ahead();
+    *step.remaining = static_cast<int32_t>(room(elements.in().p, elements.in().end)) + step.has_ahead();
   if (element.sets() == 0) return 0;
   *step.char_class = static_cast<uint8_t>(element.char_class());
-  return lx::weight_sets(sort, element, step.first, step.second);
+  return weight_sets(sort, element, step.first, step.second);
 }
 
-lx::ByteText text_at(const char* p, LXShiftState state) {
+ByteText text_at(const char* p, LXShiftState state) {
   return {bytes_of(p), 0, state};
 }
 template <class Unit>
-lx::Text<Unit> text_at(const Unit* p, LXShiftState state) {
+Text<Unit> text_at(const Unit* p, LXShiftState state) {
   return {p, 0, state};
 }
 
@@ -69,11 +66,11 @@ int32_t next_weight(LXLocale* given, Form form, const Step<Unit>& step) {
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, 0);
   const LXLocale& locale = *call.locale();
   if (locale.sort == nullptr) return call.fail(LX_E_INVALID, 0);
-  const lx::Sort& sort = lx::sort_of(*locale.sort);
+  const Sort& sort = sort_of(*locale.sort);
   LXShiftState state = LX_SHIFT_SINGLE;
   if (step.state != nullptr) state = *step.state;
-  return call.exit(lx::with_cursor(codepage_of(*locale.codepage), form, text_at(*step.text, state),
-                                   step.units(), [&](const auto& in) { return take(sort, in, step); }));
+  return call.exit(with_cursor(codepage_of(*locale.codepage), form, text_at(*step.text, state), step.units(),
+                               [&](const auto& in) { return take(sort, in, step); }));
 }
 
 /// Places `places` values, which are one weight, into a level.

@@ -5,14 +5,11 @@
 
 #include "core/lxmemory.h"
 
+using namespace lx;
+
 namespace {
 
-namespace fmt = lx::format::sort;
-using lx::Bytes;
-using lx::Element;
-using lx::le16;
-using lx::Pair;
-using lx::Sort;
+namespace fmt = format::sort;
 
 constexpr size_t kPages = 256;
 constexpr size_t kPageElements = 256;
@@ -169,40 +166,39 @@ int32_t give(const Sort& sort, const Element& element, const SetOut& first, cons
              uint8_t* char_class) {
   if (element.sets() == 0) return 0;
   LXWeights weights[2];
-  const int32_t sets = lx::weight_sets(sort, element, &weights[0], &weights[1]);
+  const int32_t sets = weight_sets(sort, element, &weights[0], &weights[1]);
   first.store(weights[0]);
   if (sets == 2) second.store(weights[1]);
   *char_class = static_cast<uint8_t>(element.char_class());
   return sets;
 }
 
-lx::Fault validate_sort(uint16_t, const lx::Sections& sections) {
+Fault validate_sort(uint16_t, const Sections& sections) {
   const Bytes bytes = sections.section[0];
-  if (!bytes.holds(0, fmt::kFixedBytes)) return lx::corrupt("the payload is shorter than its fixed part", 0);
+  if (!bytes.holds(0, fmt::kFixedBytes)) return corrupt("the payload is shorter than its fixed part", 0);
   const uint8_t* payload = bytes.data;
   const auto table_fits = [&](size_t offset_field, size_t count, size_t record_bytes) {
     return bytes.holds(le16(payload + offset_field), count * record_bytes);
   };
   if (!table_fits(fmt::kExpansions, le16(payload + fmt::kExpansionCount), fmt::Expansion::kBytes))
-    return lx::corrupt("the expansions lie outside the payload", fmt::kExpansions);
+    return corrupt("the expansions lie outside the payload", fmt::kExpansions);
   if (!table_fits(fmt::kContractions, le16(payload + fmt::kContractionCount), fmt::Contraction::kBytes))
-    return lx::corrupt("the contractions lie outside the payload", fmt::kContractions);
+    return corrupt("the contractions lie outside the payload", fmt::kContractions);
   for (size_t number = 0; number < kPages; ++number) {
     const fmt::Page page = page_at(payload, number);
     if (page.is_table() && !table_fits(fmt::kWeights, page.base + kPageElements, fmt::WeightRecord::kBytes))
-      return lx::corrupt("the weights of a page lie outside the payload",
-                         fmt::kPages + fmt::Page::kBytes * number);
+      return corrupt("the weights of a page lie outside the payload", fmt::kPages + fmt::Page::kBytes * number);
   }
   return {};
 }
 
-void* derive_sort(uint16_t, const lx::Sections& sections) {
+void* derive_sort(uint16_t, const Sections& sections) {
   const uint8_t* payload = sections.section[0].data;
   bool flat[kPages];
   const size_t pages = flat_pages(payload, flat);
   const size_t pairs = le16(payload + fmt::kContractionCount);
   auto* sort = static_cast<Sort*>(
-      lx::hook_allocate_zeroed(sizeof(Sort) + pairs * sizeof(Pair) + pages * kPageElements * sizeof(Element)));
+      hook_allocate_zeroed(sizeof(Sort) + pairs * sizeof(Pair) + pages * kPageElements * sizeof(Element)));
   if (sort == nullptr) return nullptr;
   sort->payload = payload;
   sort->expansions = payload + le16(payload + fmt::kExpansions);
@@ -239,8 +235,8 @@ extern "C" {
 int32_t LXSortGetWeights(const LXObject* object, LXUChar unicode, uint16_t* primary1, uint8_t* secondary1,
                          uint8_t* tertiary1, uint16_t* special1, uint16_t* primary2, uint8_t* secondary2,
                          uint8_t* tertiary2, uint16_t* special2, uint8_t* char_class) {
-  if (!lx::initialized() || object == nullptr || object->derived == nullptr) return 0;
-  const Sort& sort = lx::sort_of(*object);
+  if (!initialized() || object == nullptr || object->derived == nullptr) return 0;
+  const Sort& sort = sort_of(*object);
   return give(sort, sort.element(unicode), {primary1, secondary1, tertiary1, special1},
               {primary2, secondary2, tertiary2, special2}, char_class);
 }
@@ -248,8 +244,8 @@ int32_t LXSortGetWeights(const LXObject* object, LXUChar unicode, uint16_t* prim
 int32_t LXSortGetCombination(const LXObject* object, LXUChar first, LXUChar second, uint16_t* primary,
                              uint8_t* secondary, uint8_t* tertiary, uint16_t* special, uint8_t* char_class) {
   Element element;
-  if (!lx::initialized() || object == nullptr || object->derived == nullptr) return 0;
-  const Sort& sort = lx::sort_of(*object);
+  if (!initialized() || object == nullptr || object->derived == nullptr) return 0;
+  const Sort& sort = sort_of(*object);
   if (!sort.pair(first, second, &element)) return 0;
   return give(sort, element, {primary, secondary, tertiary, special}, {}, char_class);
 }

@@ -6,19 +6,9 @@
 #include "core/lxcall.h"
 #include "text/lxwalk.h"
 
-namespace {
+using namespace lx;
 
-using lx::bytes_of;
-using lx::Call;
-using lx::Codepage;
-using lx::codepage_of;
-using lx::Fold;
-using lx::Folding;
-using lx::Form;
-using lx::Key;
-using lx::Levels;
-using lx::Sort;
-using lx::Text;
+namespace {
 
 RAS1_Unit unit = RAS1_UNIT("lxsortkey");
 
@@ -37,7 +27,7 @@ struct Output {
     aligned = output + shift;
     usable = size > shift ? size - shift : 0;
   }
-  static size_t alignment() { return lx::globals.area->table_alignment; }
+  static size_t alignment() { return globals.area->table_alignment; }
 
   /// Whether it can be the work area for a text of `chars` characters. Callers rely on its rest being cleared
   /// exactly then; twice as much as the special level needs is asked for.
@@ -59,7 +49,7 @@ template <class Cursor>
 int32_t make_key(const Sort& sort, const Cursor& text, size_t most_chars, const Output& output) {
   if (most_chars > Levels::kMostChars) return -1;
   const bool in_place = output.is_work_area(most_chars);
-  const lx::WorkBuffer space(in_place ? 0 : Levels::bytes_for(most_chars));
+  const WorkBuffer space(in_place ? 0 : Levels::bytes_for(most_chars));
   if (!space) return -1;
   const Key key(sort, text, most_chars, in_place ? output.aligned : space.as<uint8_t>());
   if (key.chars() == 0) return key_of_nothing(output);
@@ -108,12 +98,12 @@ size_t store_unit(Unit value, uint8_t* p) {
 /// How a form stores a folded character in binary order.
 template <class Cursor>
 size_t store_character(const Codepage& cp, const Cursor&, LXUChar u, uint8_t* p) {
-  return lx::store_unicode(cp, u, p);
+  return store_unicode(cp, u, p);
 }
-size_t store_character(const Codepage& cp, const lx::CodeCursor&, LXUChar u, uint8_t* p) {
-  return store_unit(lx::unicode_to_code(cp, u), p);
+size_t store_character(const Codepage& cp, const CodeCursor&, LXUChar u, uint8_t* p) {
+  return store_unit(unicode_to_code(cp, u), p);
 }
-size_t store_character(const Codepage&, const lx::UnicodeCursor&, LXUChar u, uint8_t* p) {
+size_t store_character(const Codepage&, const UnicodeCursor&, LXUChar u, uint8_t* p) {
   return store_unit(u, p);
 }
 
@@ -125,17 +115,17 @@ int32_t transform(LXLocale* given, Form form, uint8_t* output, int32_t size, con
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
   const LXLocale& locale = *call.locale();
   const Codepage& cp = codepage_of(*locale.codepage);
-  if (!lx::is_fold(options & ~uint32_t{LX_CHARACTERS})) return call.fail(LX_E_INVALID, -1);
-  const Fold fold = lx::fold_of(options);
-  const size_t units = lx::units_of(cp, text, (options & LX_CHARACTERS) != 0);
+  if (!is_fold(options & ~uint32_t{LX_CHARACTERS})) return call.fail(LX_E_INVALID, -1);
+  const Fold fold = fold_of(options);
+  const size_t units = units_of(cp, text, (options & LX_CHARACTERS) != 0);
   if (units == 0) return call.exit(empty_key(output, size));
   if (units > INT32_MAX / sizeof(Unit)) return call.fail(LX_E_MEMORY, -1);
   if (locale.sort == nullptr && fold == Fold::kNone) return call.exit(copy_text(output, size, text.p, units));
   const Folding folding(locale, fold);
-  const int32_t bytes = lx::with_cursor(cp, form, text, units, [&](const auto& in) {
-    return lx::read_folded(folding, in, [&](const auto& reader) {
+  const int32_t bytes = with_cursor(cp, form, text, units, [&](const auto& in) {
+    return read_folded(folding, in, [&](const auto& reader) {
       if (locale.sort != nullptr)
-        return make_key(lx::sort_of(*locale.sort), reader, folding.most_chars(units), Output(output, size));
+        return make_key(sort_of(*locale.sort), reader, folding.most_chars(units), Output(output, size));
       return write_folded(reader, output, size,
                           [&](LXUChar u, uint8_t* p) { return store_character(cp, in, u, p); });
     });
@@ -218,9 +208,9 @@ int32_t LXStrGenSortKey(LXLocale* given, uint8_t* output, int32_t size, const LX
   const LXLocale& locale = *call.locale();
   if (locale.sort == nullptr || count < 0) return call.fail(LX_E_INVALID, -1);
   if (count == 0) return call.exit(key_of_nothing(Output(output, size)));
-  const lx::UnicodeCursor reader{text, text + count};
+  const UnicodeCursor reader{text, text + count};
   const int32_t bytes =
-      make_key(lx::sort_of(*locale.sort), reader, static_cast<size_t>(count), Output(output, size));
+      make_key(sort_of(*locale.sort), reader, static_cast<size_t>(count), Output(output, size));
   return bytes < 0 ? call.fail(LX_E_MEMORY, -1) : call.exit(bytes);
 }
 

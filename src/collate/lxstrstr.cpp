@@ -4,14 +4,9 @@
 #include "text/lxfold.h"
 #include "text/lxsearch.h"
 
-namespace {
+using namespace lx;
 
-using lx::bytes_of;
-using lx::ByteText;
-using lx::Call;
-using lx::Form;
-using lx::Text;
-using lx::Walk;
+namespace {
 
 RAS1_Unit unit = RAS1_UNIT("lxstrstr");
 
@@ -21,20 +16,20 @@ RAS1_Unit unit = RAS1_UNIT("lxstrstr");
 template <class Cursor>
 int32_t collate(LXLocale* locale, const Walk<Cursor>& at, const uint8_t* end, const Cursor& part,
                 int32_t part_bytes, uint32_t options) {
-  return LXStrcoll(locale, lx::chars_of(at.start), static_cast<int32_t>(end - at.start), lx::chars_of(part.p),
+  return LXStrcoll(locale, chars_of(at.start), static_cast<int32_t>(end - at.start), chars_of(part.p),
                    part_bytes, options);
 }
-int32_t collate(LXLocale* locale, const lx::Walk<lx::ShiftCursor>& at, const uint8_t* end,
-                const lx::ShiftCursor& part, int32_t part_bytes, uint32_t options) {
-  return LXStrcollEx(locale, lx::chars_of(at.start), at.in.state, static_cast<int32_t>(end - at.start),
-                     lx::chars_of(part.p), part.state, part_bytes, options);
+int32_t collate(LXLocale* locale, const Walk<ShiftCursor>& at, const uint8_t* end, const ShiftCursor& part,
+                int32_t part_bytes, uint32_t options) {
+  return LXStrcollEx(locale, chars_of(at.start), at.in.state, static_cast<int32_t>(end - at.start),
+                     chars_of(part.p), part.state, part_bytes, options);
 }
-int32_t collate(LXLocale* locale, const lx::Walk<lx::CodeCursor>& at, const LXWChar* end,
-                const lx::CodeCursor& part, int32_t part_codes, uint32_t options) {
+int32_t collate(LXLocale* locale, const Walk<CodeCursor>& at, const LXWChar* end, const CodeCursor& part,
+                int32_t part_codes, uint32_t options) {
   return LXWcscoll(locale, at.start, static_cast<int32_t>(end - at.start), part.p, part_codes, options);
 }
-int32_t collate(LXLocale* locale, const lx::Walk<lx::UnicodeCursor>& at, const LXUChar* end,
-                const lx::UnicodeCursor& part, int32_t part_units, uint32_t options) {
+int32_t collate(LXLocale* locale, const Walk<UnicodeCursor>& at, const LXUChar* end, const UnicodeCursor& part,
+                int32_t part_units, uint32_t options) {
   return LXStrcollU(locale, at.start, static_cast<int32_t>(end - at.start), part.p, part_units, options);
 }
 
@@ -47,27 +42,26 @@ bool begins_with(const Cursor& text, const Cursor& part) {
 }
 
 template <class Cursor>
-lx::Place<Cursor> find_exactly(const Cursor& text, const Cursor& part) {
+Place<Cursor> find_exactly(const Cursor& text, const Cursor& part) {
   Walk first(part);
   if (!first.next()) return {text.p, text};
   for (Walk at(text); at.next();)
     if (at.same_as(first) && begins_with(at.in, first.in)) return {at.start, at.in};
   return {nullptr, text};
 }
-lx::Place<lx::SingleByteCursor> find_exactly(const lx::SingleByteCursor& text,
-                                             const lx::SingleByteCursor& part) {
-  const void* found = memmem(text.p, lx::room(text.p, text.end), part.p, lx::room(part.p, part.end));
+Place<SingleByteCursor> find_exactly(const SingleByteCursor& text, const SingleByteCursor& part) {
+  const void* found = memmem(text.p, room(text.p, text.end), part.p, room(part.p, part.end));
   return {static_cast<const uint8_t*>(found), text};
 }
 
 /// Candidates begin with the same character when it is folded. What that is, is kept for characters of one
 /// byte: looking for a half-width form takes long. `*code` receives the error of a comparison that failed.
 template <class Cursor>
-lx::Place<Cursor> find_folded(LXLocale* locale, const Cursor& text, const Cursor& part, lx::Fold fold,
-                              uint32_t options, int32_t* code) {
+Place<Cursor> find_folded(LXLocale* locale, const Cursor& text, const Cursor& part, Fold fold, uint32_t options,
+                          int32_t* code) {
   Walk last(part);
   if (!last.next()) return {text.p, text};
-  using Character = lx::Folded<typename lx::CharOf<typename Cursor::Unit>::Type>;
+  using Character = Folded<typename CharOf<typename Cursor::Unit>::Type>;
   const Character wanted(*locale, last.value, fold);
   // Fewer characters than the substring has are no candidate: one cursor runs ahead, to the last one of each.
   Walk ahead(text);
@@ -89,14 +83,13 @@ lx::Place<Cursor> find_folded(LXLocale* locale, const Cursor& text, const Cursor
 }
 
 /// In a single-byte codepage without regard to case: at every place, by LXStrcmp, as a trace shows it.
-lx::Place<lx::SingleByteCursor> find_folded(LXLocale* locale, const lx::SingleByteCursor& text,
-                                            const lx::SingleByteCursor& part, lx::Fold fold, uint32_t,
-                                            int32_t* code) {
-  if (fold == lx::Fold::kWidth) return find_exactly(text, part);  // it has one width
+Place<SingleByteCursor> find_folded(LXLocale* locale, const SingleByteCursor& text,
+                                    const SingleByteCursor& part, Fold fold, uint32_t, int32_t* code) {
+  if (fold == Fold::kWidth) return find_exactly(text, part);  // it has one width
   const auto bytes = static_cast<int32_t>(part.end - part.p);
   for (const uint8_t* p = text.p; text.end - p >= bytes; ++p) {
     const int32_t difference =
-        LXStrcmp(locale, lx::chars_of(p), bytes, lx::chars_of(part.p), bytes, LX_CASE_INSENSITIVE);
+        LXStrcmp(locale, chars_of(p), bytes, chars_of(part.p), bytes, LX_CASE_INSENSITIVE);
     *code = locale->last_error;
     if (*code != LX_OK) break;
     if (difference == 0) return {p, text};
@@ -105,13 +98,13 @@ lx::Place<lx::SingleByteCursor> find_folded(LXLocale* locale, const lx::SingleBy
 }
 
 template <class Cursor>
-lx::Place<Cursor> find_part(LXLocale* locale, const Cursor& text, const Cursor& part, uint32_t options,
-                            int32_t* code) {
+Place<Cursor> find_part(LXLocale* locale, const Cursor& text, const Cursor& part, uint32_t options,
+                        int32_t* code) {
   if (part.p == part.end) return {text.p, text};
   // Between shift bytes characters count: bytes do not tell which text is longer.
   if (!Cursor::kShifts && part.end - part.p > text.end - text.p) return {nullptr, text};
-  const lx::Fold fold = lx::fold_of(options);
-  if (fold == lx::Fold::kNone) return find_exactly(text, part);
+  const Fold fold = fold_of(options);
+  if (fold == Fold::kNone) return find_exactly(text, part);
   return find_folded(locale, text, part, fold, options & LX_WIDTH_INSENSITIVE, code);
 }
 
@@ -119,13 +112,13 @@ template <class Unit>
 Unit* find_substring(LXLocale* given, Form form, const Text<Unit>& text, const Text<Unit>& part,
                      LXShiftState* state, uint32_t options) {
   Unit* const none = nullptr;
-  return lx::search(unit, given, form, text, part, options, LX_WIDTH_INSENSITIVE | LX_CHARACTERS, none,
-                    [&](Call& call, const auto& in, const auto& wanted) {
-                      int32_t code = LX_OK;
-                      const auto place = find_part(call.locale(), in, wanted, options, &code);
-                      if (place.p != nullptr) lx::put_state(state, lx::state_at(place.in, text.state));
-                      return call.fail(code, lx::writable(place.p));
-                    });
+  return search(unit, given, form, text, part, options, LX_WIDTH_INSENSITIVE | LX_CHARACTERS, none,
+                [&](Call& call, const auto& in, const auto& wanted) {
+                  int32_t code = LX_OK;
+                  const auto place = find_part(call.locale(), in, wanted, options, &code);
+                  if (place.p != nullptr) put_state(state, state_at(place.in, text.state));
+                  return call.fail(code, writable(place.p));
+                });
 }
 
 }  // namespace
@@ -134,13 +127,13 @@ extern "C" {
 
 char* LXStrstr(LXLocale* locale, const char* text, int32_t length, const char* part, int32_t part_length,
                uint32_t options) {
-  return lx::chars_of(find_substring(locale, Form::kPlain, ByteText{bytes_of(text), length},
-                                     ByteText{bytes_of(part), part_length}, nullptr, options));
+  return chars_of(find_substring(locale, Form::kPlain, ByteText{bytes_of(text), length},
+                                 ByteText{bytes_of(part), part_length}, nullptr, options));
 }
 char* LXStrstrEx(LXLocale* locale, const char* text, LXShiftState text_state, int32_t length, const char* part,
                  LXShiftState part_state, int32_t part_length, LXShiftState* state, uint32_t options) {
-  return lx::chars_of(find_substring(locale, Form::kEx, ByteText{bytes_of(text), length, text_state},
-                                     ByteText{bytes_of(part), part_length, part_state}, state, options));
+  return chars_of(find_substring(locale, Form::kEx, ByteText{bytes_of(text), length, text_state},
+                                 ByteText{bytes_of(part), part_length, part_state}, state, options));
 }
 LXWChar* LXWcsstr(LXLocale* locale, const LXWChar* text, int32_t length, const LXWChar* part,
                   int32_t part_length, uint32_t options) {

@@ -12,13 +12,15 @@
 #include "core/lxmemory.h"
 #include "core/lxtrace.h"
 
+using namespace lx;
+
 namespace {
 
 RAS1_Unit unit = RAS1_UNIT("lxalias");
 
 constexpr size_t kMaxLineBytes = 32767;  // a longer line is read as several
-constexpr size_t kMaxCodepageBytes = sizeof(lx::AliasRecord::codepage) - 1;
-constexpr size_t kMaxAliasBytes = sizeof(lx::AliasRecord::alias) - 1;
+constexpr size_t kMaxCodepageBytes = sizeof(AliasRecord::codepage) - 1;
+constexpr size_t kMaxAliasBytes = sizeof(AliasRecord::alias) - 1;
 constexpr size_t kNameBytes = sizeof(LXObjManager::directory) + 16;
 
 bool is_separator(char c) {
@@ -102,10 +104,10 @@ class AliasReader {
                static_cast<int>(kMaxCodepageBytes));
       return false;
     }
-    auto* record = static_cast<lx::AliasRecord*>(lx::hook_allocate_zeroed(sizeof(lx::AliasRecord)));
+    auto* record = static_cast<AliasRecord*>(hook_allocate_zeroed(sizeof(AliasRecord)));
     if (record == nullptr) {
       LX_TRACE(unit, RAS1_LEVEL_ERRORS, "Unable to allocate %d bytes for codepage %.*s, alias %.*s",
-               static_cast<int>(sizeof(lx::AliasRecord)), codepage_.printable_bytes(), codepage_.begin,
+               static_cast<int>(sizeof(AliasRecord)), codepage_.printable_bytes(), codepage_.begin,
                alias.printable_bytes(), alias.begin);
       return false;
     }
@@ -118,59 +120,59 @@ class AliasReader {
     return true;
   }
 
-  lx::AliasRecord** tail_;
+  AliasRecord** tail_;
   Span codepage_;
 };
 
 }  // namespace
 
 char* LXGetAliasFileName(const char* directory, char* buffer, size_t size) {
-  const size_t needed = strlen(directory) + strlen("/") + strlen(lx::format::kAliasFile) + 1;
+  const size_t needed = strlen(directory) + strlen("/") + strlen(format::kAliasFile) + 1;
   if (needed > size) {
     fprintf(stderr, "Buffer provided = %d, needed = %d\n", static_cast<int>(size), static_cast<int>(needed));
     return nullptr;
   }
-  snprintf(buffer, size, "%s%s%s", directory, lx::globals.area->directory_separator, lx::format::kAliasFile);
+  snprintf(buffer, size, "%s%s%s", directory, globals.area->directory_separator, format::kAliasFile);
   return buffer;
 }
 
 bool LXBuildAliasList(LXObjManager* manager) {
-  lx::Events events(unit);
+  Events events(unit);
   char name[kNameBytes];
   if (LXGetAliasFileName(manager->directory, name, sizeof(name)) == nullptr) {
     LX_TRACE(unit, RAS1_LEVEL_ERRORS, "Unable to generate alias file name");
     return events.exit(false);
   }
   int32_t rc = LX_OK;
-  LXFile* file = lx::open_for_reading(name, &rc);
+  LXFile* file = open_for_reading(name, &rc);
   if (file == nullptr) {
     LX_TRACE(unit, RAS1_LEVEL_ERRORS, "Open of %s failed, err = %d", name, rc);
     return events.exit(false);
   }
-  lx::FileCloser closer(file);
+  FileCloser closer(file);
   const int32_t bytes = LXFileSize(file);
-  lx::HookPtr<char> text(static_cast<char*>(LXLoadFile(file, 0, bytes, &rc)));
+  HookPtr<char> text(static_cast<char*>(LXLoadFile(file, 0, bytes, &rc)));
   if (rc != LX_OK) return events.exit(false);
   return events.exit(AliasReader(manager).read(Span{text.get(), text.get() + bytes}));
 }
 
 void LXDestroyAliasList(LXObjManager* manager) {
-  while (lx::AliasRecord* record = manager->aliases) {
+  while (AliasRecord* record = manager->aliases) {
     manager->aliases = record->next;
-    lx::hook_free(record);
+    hook_free(record);
   }
 }
 
 extern "C" {
 
 const char* LXGetCodepageFromAlias(LXObjManager* given, const char* alias) {
-  lx::Events events(unit);
+  Events events(unit);
   const char* const none = nullptr;
-  const LXObjManager* manager = lx::manager_of(given);
+  const LXObjManager* manager = manager_of(given);
   if (manager == nullptr) return events.exit(none);
   LX_TRACE(unit, RAS1_LEVEL_INPUT, "Searching for %s.", alias);
   const size_t bytes = strlen(alias);
-  for (const lx::AliasRecord* record = manager->aliases; record != nullptr; record = record->next) {
+  for (const AliasRecord* record = manager->aliases; record != nullptr; record = record->next) {
     if (strlen(record->alias) != bytes || LXmemicmp(record->alias, alias, bytes) != 0) continue;
     LX_TRACE(unit, RAS1_LEVEL_NOTICES, "%s -> %s", alias, record->codepage);
     return events.exit(static_cast<const char*>(record->codepage));
@@ -179,10 +181,10 @@ const char* LXGetCodepageFromAlias(LXObjManager* given, const char* alias) {
 }
 
 int32_t LXEnumAliases(LXObjManager* given, LXAliasCallback callback, void* user) {
-  lx::Events events(unit);
-  const LXObjManager* manager = lx::manager_of(given);
+  Events events(unit);
+  const LXObjManager* manager = manager_of(given);
   if (manager == nullptr) return events.exit(LX_E_NOT_INITIALIZED);
-  for (const lx::AliasRecord* record = manager->aliases; record != nullptr; record = record->next)
+  for (const AliasRecord* record = manager->aliases; record != nullptr; record = record->next)
     if (callback(user, record->codepage, record->alias) == 0) break;
   return events.exit(LX_OK);
 }

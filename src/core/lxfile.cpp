@@ -13,6 +13,8 @@
 #include "core/lxpath.h"
 #include "core/lxtrace.h"
 
+using namespace lx;
+
 namespace {
 
 RAS1_Unit unit = RAS1_UNIT("lxfile");
@@ -37,7 +39,7 @@ int32_t code_of_errno() {
 /// Prepares a handle to write beside an existing file: its target name and extension are kept, `temporary_name`
 /// is where to write. False when the name is too long to be kept.
 bool use_temporary(LXFile* file, const char* path, char* temporary_name) {
-  lx::PathParts parts;
+  PathParts parts;
   SplitPath(path, parts.drive, parts.directory, parts.file, parts.extension);
   const size_t bytes = strlen(parts.drive) + strlen(parts.directory) + strlen(parts.file);
   if (bytes >= sizeof(file->target)) {
@@ -106,12 +108,12 @@ LXFile* open_for_reading(const char* path, int32_t* rc) {
 extern "C" {
 
 LXFile* LXOpenFile(int32_t, const char* path, int32_t mode, int32_t no_temporary, int32_t* rc) {
-  lx::Events events(unit);
+  Events events(unit);
   *rc = LX_E_NOT_INITIALIZED;
-  if (!lx::files_usable()) return events.exit(static_cast<LXFile*>(nullptr));
+  if (!files_usable()) return events.exit(static_cast<LXFile*>(nullptr));
   LX_TRACE(unit, RAS1_LEVEL_INPUT, "Opening file %s", path);
   *rc = LX_E_MEMORY;
-  lx::HookPtr<LXFile> file(static_cast<LXFile*>(lx::hook_allocate_zeroed(sizeof(LXFile))));
+  HookPtr<LXFile> file(static_cast<LXFile*>(hook_allocate_zeroed(sizeof(LXFile))));
   if (!file) return events.exit(static_cast<LXFile*>(nullptr));
   file->mode = static_cast<uint8_t>(mode);
 
@@ -128,8 +130,8 @@ LXFile* LXOpenFile(int32_t, const char* path, int32_t mode, int32_t no_temporary
 }
 
 int32_t LXCloseFile(LXFile* file, int32_t discard) {
-  lx::Events events(unit);
-  if (file == nullptr || !lx::files_usable()) return events.exit(LX_E_INVALID);
+  Events events(unit);
+  if (file == nullptr || !files_usable()) return events.exit(LX_E_INVALID);
   int32_t result = close(file->descriptor);
   if (file->temporary != 0) {
     char temporary_name[kFullNameBytes];
@@ -139,7 +141,7 @@ int32_t LXCloseFile(LXFile* file, int32_t discard) {
     else
       replace_target(file, temporary_name);
   }
-  if (!lx::hook_free(file) && result == 0) result = LX_E_FREE;
+  if (!hook_free(file) && result == 0) result = LX_E_FREE;
   return events.exit(result);
 }
 
@@ -157,17 +159,17 @@ int32_t LXSeekFile(LXFile* file, int32_t offset, int32_t origin) {
 }
 
 void* LXLoadFile(LXFile* file, uint32_t offset, int32_t bytes, int32_t* rc) {
-  lx::Events events(unit);
+  Events events(unit);
   void* const none = nullptr;
   *rc = LX_E_NOT_INITIALIZED;
-  if (!lx::files_usable()) return events.exit(none);
+  if (!files_usable()) return events.exit(none);
   *rc = LX_OK;
   if (bytes == 0) return events.exit(none);
   *rc = LX_E_FILE_MODE;
   if (file->write_only != 0) return events.exit(none);
   *rc = LX_E_FILE_IO;
   if (bytes < 0) return events.exit(none);
-  lx::HookPtr<void> block(lx::hook_allocate(static_cast<size_t>(bytes)));
+  HookPtr<void> block(hook_allocate(static_cast<size_t>(bytes)));
   if (!block) {
     *rc = LX_E_MEMORY;
     return events.exit(none);
@@ -179,7 +181,7 @@ void* LXLoadFile(LXFile* file, uint32_t offset, int32_t bytes, int32_t* rc) {
 }
 
 int32_t LXUnloadFile(void* block) {
-  if (lx::files_usable()) lx::hook_free(block);
+  if (files_usable()) hook_free(block);
   return LX_OK;
 }
 

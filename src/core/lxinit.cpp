@@ -8,6 +8,8 @@
 #include "core/lxobjman.h"
 #include "core/lxtrace.h"
 
+using namespace lx;
+
 namespace {
 
 RAS1_Unit unit = RAS1_UNIT("lxinit");
@@ -15,15 +17,15 @@ RAS1_Unit unit = RAS1_UNIT("lxinit");
 constexpr uint32_t kTableAlignment = 4;
 
 void drop_area() {
-  lx::GlobalArea* area = lx::globals.area;
-  const LXFreeHook release = lx::globals.release;
-  lx::globals = lx::Globals{};
+  GlobalArea* area = globals.area;
+  const LXFreeHook release = globals.release;
+  globals = Globals{};
   release(area->context, area);
 }
 
 /// The new count of uses. Other threads read it without the lock.
 uint32_t add_to_count(int32_t uses) {
-  lx::GlobalArea* area = lx::globals.area;
+  GlobalArea* area = globals.area;
   const uint32_t count = area->init_count + static_cast<uint32_t>(uses);
   __atomic_store_n(&area->init_count, count, __ATOMIC_RELAXED);
   return count;
@@ -31,22 +33,21 @@ uint32_t add_to_count(int32_t uses) {
 
 /// Creates the area, or takes the one that a failed initialisation left, unless other hooks own that one.
 bool create_area(LXAllocHook allocate, LXFreeHook release, void* context) {
-  if (lx::globals.area != nullptr) {
-    if (lx::globals.allocate == allocate && lx::globals.release == release &&
-        lx::globals.area->context == context)
+  if (globals.area != nullptr) {
+    if (globals.allocate == allocate && globals.release == release && globals.area->context == context)
       return true;
     drop_area();
   }
   LX_TRACE(unit, RAS1_LEVEL_DETAIL, "Creating global area");
-  void* block = allocate(context, sizeof(lx::GlobalArea));
+  void* block = allocate(context, sizeof(GlobalArea));
   if (block == nullptr) {
     LX_TRACE(unit, RAS1_LEVEL_ERRORS, "Unable to allocate %d bytes for globals",
-             static_cast<int>(sizeof(lx::GlobalArea)));
+             static_cast<int>(sizeof(GlobalArea)));
     return false;
   }
-  memset(block, 0, sizeof(lx::GlobalArea));
-  lx::globals = lx::Globals{static_cast<lx::GlobalArea*>(block), allocate, release, nullptr, nullptr};
-  lx::globals.area->context = context;
+  memset(block, 0, sizeof(GlobalArea));
+  globals = Globals{static_cast<GlobalArea*>(block), allocate, release, nullptr, nullptr};
+  globals.area->context = context;
   return true;
 }
 
@@ -77,9 +78,9 @@ int32_t LXDefFree(void*, void* block) {
 
 int32_t LXInit(const char* directory, LXAllocHook allocate, LXFreeHook release, void* context,
                uint32_t options) {
-  lx::Events events(unit);
-  if (lx::initialized()) {
-    lx::GlobalLock lock;
+  Events events(unit);
+  if (initialized()) {
+    GlobalLock lock;
     const uint32_t count = add_to_count(1);
     LX_TRACE(unit, RAS1_LEVEL_DETAIL, "Lexicor init count = %d", static_cast<int>(count));
     return events.exit(LX_OK);
@@ -88,18 +89,18 @@ int32_t LXInit(const char* directory, LXAllocHook allocate, LXFreeHook release, 
   if (release == nullptr) release = LXDefFree;
   if (!create_area(allocate, release, context)) return events.exit(LX_E_MEMORY);
 
-  lx::GlobalArea* area = lx::globals.area;
+  GlobalArea* area = globals.area;
   LX_TRACE(unit, RAS1_LEVEL_DETAIL, "Lexicor init count = %d", 0);
   BSS1_InitializeLock(&area->lock);
   int32_t result = LX_OK;
   {
-    lx::GlobalLock lock;
+    GlobalLock lock;
     memcpy(area->directory_separator, "/", 2);
     memcpy(area->name_separator, "_", 2);
     area->table_alignment = kTableAlignment;
     area->file_context = 1;
     int32_t rc = LX_OK;
-    LXObjManager* manager = lx::create_manager(directory, options, &rc);
+    LXObjManager* manager = create_manager(directory, options, &rc);
     if (manager != nullptr) {
       if (rc != LX_OK) result = LX_W_DEFAULTS;
       area->manager = manager;
@@ -114,14 +115,14 @@ int32_t LXInit(const char* directory, LXAllocHook allocate, LXFreeHook release, 
 }
 
 int32_t LXTerm(void) {
-  lx::Events events(unit);
-  if (!lx::initialized()) {
-    if (lx::globals.area != nullptr) drop_area();  // left by an initialisation that failed
+  Events events(unit);
+  if (!initialized()) {
+    if (globals.area != nullptr) drop_area();  // left by an initialisation that failed
     return events.exit(LX_E_NOT_INITIALIZED);
   }
-  lx::GlobalArea* area = lx::globals.area;
+  GlobalArea* area = globals.area;
   {
-    lx::GlobalLock lock;
+    GlobalLock lock;
     if (area->init_count > 1) {
       add_to_count(-1);
       return events.exit(LX_OK);
@@ -129,9 +130,9 @@ int32_t LXTerm(void) {
   }
   // The count stays 1 while the default locale and the manager are released through the library itself.
   int32_t result = LX_OK;
-  if (LXLocale* locale = lx::globals.default_locale) {
-    lx::globals.default_locale = nullptr;
-    result = lx::globals.release_default(locale);
+  if (LXLocale* locale = globals.default_locale) {
+    globals.default_locale = nullptr;
+    result = globals.release_default(locale);
   }
   LXObjManager* manager = area->manager;
   area->manager = nullptr;
@@ -145,7 +146,7 @@ int32_t LXTerm(void) {
 }
 
 int32_t LXGetError(const LXLocale* locale) {
-  const LXLocale* used = lx::locale_of(const_cast<LXLocale*>(locale));
+  const LXLocale* used = locale_of(const_cast<LXLocale*>(locale));
   return used != nullptr ? used->last_error : LX_E_NOT_INITIALIZED;
 }
 

@@ -10,9 +10,9 @@
 #include "core/lxobjtypes.h"
 #include "core/lxtrace.h"
 
-namespace {
+using namespace lx;
 
-namespace format = lx::format;
+namespace {
 
 RAS1_Unit unit = RAS1_UNIT("lxobjload");
 
@@ -20,8 +20,8 @@ RAS1_Unit unit = RAS1_UNIT("lxobjload");
 constexpr size_t kNameBytes = sizeof(LXObjManager::directory) + 16;
 
 /// Null for a type that a control file may name but that there is none of.
-const lx::ObjectType* object_type(uint8_t type) {
-  return type < format::kTypes ? lx::kObjectTypes[type] : nullptr;
+const ObjectType* object_type(uint8_t type) {
+  return type < format::kTypes ? kObjectTypes[type] : nullptr;
 }
 
 /// The sections of an object while it is loaded: freed unless they are handed to the entry.
@@ -29,18 +29,18 @@ class Loading {
  public:
   Loading() = default;
   ~Loading() {
-    for (const lx::Bytes& section : sections_.section) lx::hook_free(const_cast<uint8_t*>(section.data));
+    for (const Bytes& section : sections_.section) hook_free(const_cast<uint8_t*>(section.data));
   }
   Loading(const Loading&) = delete;
   Loading& operator=(const Loading&) = delete;
 
   /// Reads, converts and checks: 0 when the sections can be handed over.
-  int32_t load(LXFile* file, const LXObjDisk& disk, const lx::ObjectType& type) {
+  int32_t load(LXFile* file, const LXObjDisk& disk, const ObjectType& type) {
     uint32_t version = 0;
     int32_t rc = read(file, &version);
     if (rc == LX_OK && type.upgrade != nullptr && version == 1) rc = upgrade(type);
     if (rc != LX_OK) return rc;
-    const lx::Fault fault = type.validate(disk.id, sections_);
+    const Fault fault = type.validate(disk.id, sections_);
     if (fault.code == LX_E_CORRUPT)
       LX_TRACE(unit, RAS1_LEVEL_ERRORS, "Object %s is refused: %s (section %d, offset %d)", disk.name,
                fault.reason, static_cast<int>(fault.section), static_cast<int>(fault.offset));
@@ -56,18 +56,18 @@ class Loading {
     __atomic_store_n(&entry->section[0], take(0), __ATOMIC_RELEASE);
   }
 
-  const lx::Sections& sections() const { return sections_; }
+  const Sections& sections() const { return sections_; }
 
  private:
   uint8_t* take(size_t i) {
     uint8_t* data = const_cast<uint8_t*>(sections_.section[i].data);
-    sections_.section[i] = lx::Bytes{};
+    sections_.section[i] = Bytes{};
     return data;
   }
 
   int32_t read(LXFile* file, uint32_t* version) {
     int32_t rc = LX_OK;
-    lx::HookPtr<uint8_t> block(static_cast<uint8_t*>(LXLoadFile(file, 0, format::kHeaderBytes, &rc)));
+    HookPtr<uint8_t> block(static_cast<uint8_t*>(LXLoadFile(file, 0, format::kHeaderBytes, &rc)));
     if (!block) return rc;
     const format::Header header = format::Header::read(block.get());
     if (header.magic != format::kMagic) return LX_E_CORRUPT;
@@ -81,32 +81,32 @@ class Loading {
     return LX_OK;
   }
 
-  int32_t upgrade(const lx::ObjectType& type) {
-    lx::Sections upgraded;
+  int32_t upgrade(const ObjectType& type) {
+    Sections upgraded;
     const int32_t rc = type.upgrade(sections_, &upgraded);
     if (rc != LX_OK) return rc;
     for (size_t i = 0; i < format::kMaxSections; ++i) {
       if (upgraded.section[i].data == sections_.section[i].data) continue;
       LXUnloadFile(take(i));
       sections_.section[i] = upgraded.section[i];
-      owned_ = static_cast<uint8_t>(owned_ | lx::kObjectOwned0 << i);
+      owned_ = static_cast<uint8_t>(owned_ | kObjectOwned0 << i);
     }
     return LX_OK;
   }
 
-  lx::Sections sections_;
+  Sections sections_;
   uint8_t owned_ = 0;
 };
 
 /// Loads an entry from its file; the entry stays as it was on failure.
 int32_t load_from_file(const LXObjManager* manager, LXObject* entry) {
   char name[kNameBytes];
-  const lx::ObjectType* type = object_type(entry->disk.type);
+  const ObjectType* type = object_type(entry->disk.type);
   if (type == nullptr ||
       LXGetDataFileName(manager->directory, entry->disk.type, entry->disk.id, name, sizeof(name)) == nullptr)
     return LX_E_FILE_IO;
   int32_t rc = LX_OK;
-  LXFile* file = lx::open_for_reading(name, &rc);
+  LXFile* file = open_for_reading(name, &rc);
   if (file == nullptr) return rc;
   Loading loading;
   void* derived = nullptr;
@@ -125,8 +125,8 @@ int32_t load_from_file(const LXObjManager* manager, LXObject* entry) {
 }  // namespace
 
 LXObject* LXLoadObj(LXObjManager* manager, LXObject* entry, int32_t* rc) {
-  lx::Events events(unit);
-  lx::GlobalLock lock;
+  Events events(unit);
+  GlobalLock lock;
   *rc = LX_OK;
   if (entry->section[0] != nullptr) return events.exit(entry);
   *rc = load_from_file(manager, entry);
@@ -138,18 +138,18 @@ LXObject* LXLoadObj(LXObjManager* manager, LXObject* entry, int32_t* rc) {
 }
 
 int32_t LXUnloadObj(LXObjManager*, LXObject* entry) {
-  lx::Events events(unit);
+  Events events(unit);
   int32_t result = LX_OK;
   for (size_t i = format::kMaxSections; i-- > 0;) {
     uint8_t* section = entry->section[i];
     entry->section[i] = nullptr;
-    if ((entry->disk.flags & lx::kObjectBuiltIn) != 0) continue;
-    if ((entry->disk.flags & lx::kObjectOwned0 << i) == 0)
+    if ((entry->disk.flags & kObjectBuiltIn) != 0) continue;
+    if ((entry->disk.flags & kObjectOwned0 << i) == 0)
       LXUnloadFile(section);
-    else if (!lx::hook_free(section))
+    else if (!hook_free(section))
       result = LX_E_FREE;
   }
-  if ((entry->disk.flags & lx::kObjectBuiltIn) == 0) lx::hook_free(entry->derived);
+  if ((entry->disk.flags & kObjectBuiltIn) == 0) hook_free(entry->derived);
   entry->derived = nullptr;
   if (entry->file != nullptr) LXCloseFile(entry->file, 0);
   entry->file = nullptr;
@@ -157,11 +157,11 @@ int32_t LXUnloadObj(LXObjManager*, LXObject* entry) {
 }
 
 LXObject* LXLoadDefaultObj(LXObjManager*, LXObject* entry) {
-  const lx::ObjectType* type = object_type(entry->disk.type);
-  const lx::BuiltIn* data = type != nullptr ? type->built_in : nullptr;
+  const ObjectType* type = object_type(entry->disk.type);
+  const BuiltIn* data = type != nullptr ? type->built_in : nullptr;
   if (data == nullptr) return nullptr;
   // Flagged as built-in, the compiled-in data are never freed and never written.
-  entry->disk.flags = lx::kObjectBuiltIn;
+  entry->disk.flags = kObjectBuiltIn;
   entry->derived = const_cast<void*>(data->derived);
   for (size_t i = format::kMaxSections; i-- > 1;)
     entry->section[i] = const_cast<uint8_t*>(data->sections.section[i].data);
@@ -171,14 +171,14 @@ LXObject* LXLoadDefaultObj(LXObjManager*, LXObject* entry) {
 
 bool LXLoadDefaults(LXObjManager* manager) {
   uint16_t count = 0;
-  for (const lx::ObjectType* type : lx::kObjectTypes)
+  for (const ObjectType* type : kObjectTypes)
     count = static_cast<uint16_t>(count + (type->built_in != nullptr));
-  manager->entries = static_cast<LXObject*>(lx::hook_allocate_zeroed(count * sizeof(LXObject)));
+  manager->entries = static_cast<LXObject*>(hook_allocate_zeroed(count * sizeof(LXObject)));
   if (manager->entries == nullptr) return false;
   manager->count = 0;
   for (uint8_t type = 0; type < format::kTypes; ++type) {
     manager->first[type] = manager->count;
-    const lx::BuiltIn* data = lx::kObjectTypes[type]->built_in;
+    const BuiltIn* data = kObjectTypes[type]->built_in;
     if (data == nullptr) continue;
     LXObject* entry = &manager->entries[manager->count++];
     entry->disk.id = 1;

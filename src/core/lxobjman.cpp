@@ -12,9 +12,9 @@
 #include "core/lxmemory.h"
 #include "core/lxtrace.h"
 
-namespace {
+using namespace lx;
 
-namespace format = lx::format;
+namespace {
 
 RAS1_Unit unit = RAS1_UNIT("lxobjman");
 
@@ -32,7 +32,7 @@ LXFile* try_control(LXObjManager* manager, const char* directory, char* name, in
     *rc = LX_E_FILE_IO;
     return nullptr;
   }
-  LXFile* file = lx::open_for_reading(name, rc);
+  LXFile* file = open_for_reading(name, rc);
   if (file != nullptr) strcpy(manager->directory, directory);
   return file;
 }
@@ -71,7 +71,7 @@ LXFile* find_control(LXObjManager* manager, const char* directory, int32_t* rc) 
 /// Reads the records of an open control file into a new block. `*bytes` receives its size; null with a code, or
 /// with code 0 when the table is empty.
 uint8_t* read_records(LXFile* file, size_t* bytes, int32_t* rc) {
-  lx::HookPtr<uint8_t> block(static_cast<uint8_t*>(LXLoadFile(file, 0, format::kHeaderBytes, rc)));
+  HookPtr<uint8_t> block(static_cast<uint8_t*>(LXLoadFile(file, 0, format::kHeaderBytes, rc)));
   if (!block) return nullptr;
   const format::Header header = format::Header::read(block.get());
   if (header.magic != format::kMagic) {
@@ -83,7 +83,7 @@ uint8_t* read_records(LXFile* file, size_t* bytes, int32_t* rc) {
   const int32_t offset = static_cast<int32_t>(header.section[0].offset);
   *bytes = static_cast<size_t>(size);
   if (size == 0) return nullptr;
-  lx::HookPtr<uint8_t> records(static_cast<uint8_t*>(lx::hook_allocate(static_cast<size_t>(size))));
+  HookPtr<uint8_t> records(static_cast<uint8_t*>(hook_allocate(static_cast<size_t>(size))));
   if (!records) {
     LX_TRACE(unit, RAS1_LEVEL_ERRORS, "Unable to allocate %d bytes for control data", size);
     *rc = LX_E_MEMORY;
@@ -130,13 +130,13 @@ int32_t read_directory(LXObjManager* manager, const char* directory) {
     LX_TRACE(unit, RAS1_LEVEL_ERRORS, "Unable to open control file");
     return rc;
   }
-  lx::FileCloser closer(file);
+  FileCloser closer(file);
   size_t bytes = 0;
-  lx::HookPtr<uint8_t> records(read_records(file, &bytes, &rc));
+  HookPtr<uint8_t> records(read_records(file, &bytes, &rc));
   if (rc != LX_OK) return rc;
   const size_t count = bytes / format::ControlRecord::kBytes;
   const size_t table_bytes = (count != 0 ? count : 1) * sizeof(LXObject);
-  manager->entries = static_cast<LXObject*>(lx::hook_allocate_zeroed(table_bytes));
+  manager->entries = static_cast<LXObject*>(hook_allocate_zeroed(table_bytes));
   if (manager->entries == nullptr) {
     LX_TRACE(unit, RAS1_LEVEL_ERRORS, "Unable to allocate %d bytes for control data",
              static_cast<int>(table_bytes));
@@ -210,8 +210,8 @@ LXObject* deliver(LXObjManager* manager, LXObject* entry, int32_t mode, int32_t*
 
 /// Releases a manager's memory: 0, or 1 when a free hook failed.
 int32_t free_manager(LXObjManager* manager) {
-  const bool entries_freed = lx::hook_free(manager->entries);
-  const bool manager_freed = lx::hook_free(manager);
+  const bool entries_freed = hook_free(manager->entries);
+  const bool manager_freed = hook_free(manager);
   return entries_freed && manager_freed ? LX_OK : 1;
 }
 
@@ -257,17 +257,17 @@ extern "C" {
 
 LXObjManager* LXInitObjManager(const char* directory, uint32_t options, int32_t* rc) {
   *rc = LX_E_NOT_INITIALIZED;
-  return lx::initialized() ? lx::create_manager(directory, options, rc) : nullptr;
+  return initialized() ? create_manager(directory, options, rc) : nullptr;
 }
 
 int32_t LXTermObjManager(LXObjManager* manager) {
-  lx::Events events(unit);
-  if (manager == nullptr || !lx::initialized()) return events.exit(LX_E_INVALID);
+  Events events(unit);
+  if (manager == nullptr || !initialized()) return events.exit(LX_E_INVALID);
   LXDestroyAliasList(manager);
   int32_t result = LX_OK;
   for (uint16_t i = 0; i < manager->count; ++i) {
     LXObject* entry = &manager->entries[i];
-    if (entry->section[0] == nullptr || (entry->disk.flags & lx::kObjectBuiltIn) != 0) continue;
+    if (entry->section[0] == nullptr || (entry->disk.flags & kObjectBuiltIn) != 0) continue;
     const int32_t rc = LXUnloadObj(manager, entry);
     if (result == LX_OK) result = rc;
   }
@@ -277,10 +277,10 @@ int32_t LXTermObjManager(LXObjManager* manager) {
 
 LXObject* LXGetObjFromName(LXObjManager* given, int32_t type, const char* name, int32_t length, int32_t mode,
                            int32_t* rc) {
-  lx::Events events(unit);
+  Events events(unit);
   LXObject* const none = nullptr;
   *rc = LX_E_NOT_INITIALIZED;
-  LXObjManager* manager = lx::manager_of(given);
+  LXObjManager* manager = manager_of(given);
   if (manager == nullptr) return events.exit(none);
   LX_TRACE(unit, RAS1_LEVEL_INPUT, "Searching for type %d, name %.*s", type, length, name);
   if (is_binary_sort(type, name, length)) {
@@ -293,7 +293,7 @@ LXObject* LXGetObjFromName(LXObjManager* given, int32_t type, const char* name, 
 LXObject* LXGetObjFromNameW(LXObjManager* given, int32_t type, const LXWChar* name, int32_t length,
                             int32_t mode, int32_t* rc) {
   *rc = LX_E_NOT_INITIALIZED;
-  if (!lx::initialized()) return nullptr;
+  if (!initialized()) return nullptr;
   // Names are single bytes: a name with a longer character, or too long for any record, is not found.
   char narrow[sizeof(LXObjDisk::name)];
   const int32_t size = sizeof(narrow);
@@ -308,10 +308,10 @@ LXObject* LXGetObjFromNameW(LXObjManager* given, int32_t type, const LXWChar* na
 }
 
 LXObject* LXGetObjFromID(LXObjManager* given, int32_t type, uint16_t id, int32_t mode, int32_t* rc) {
-  lx::Events events(unit);
+  Events events(unit);
   LXObject* const none = nullptr;
   *rc = LX_E_NOT_INITIALIZED;
-  LXObjManager* manager = lx::manager_of(given);
+  LXObjManager* manager = manager_of(given);
   if (manager == nullptr) return events.exit(none);
   if (type == LX_SORT && id == 0) {
     *rc = LX_OK;
@@ -328,13 +328,13 @@ char* LXGetControlFileName(const char* directory, char* buffer, int32_t size) {
 }
 
 char* LXGetDataFileName(const char* directory, int32_t type, uint16_t id, char* buffer, int32_t size) {
-  if (!lx::initialized() || type < 0 || static_cast<size_t>(type) >= format::kTypes) return nullptr;
+  if (!initialized() || type < 0 || static_cast<size_t>(type) >= format::kTypes) return nullptr;
   const size_t needed = strlen(directory) + kDataTailBytes;
   if (size < 0 || needed > static_cast<size_t>(size)) {
     fprintf(stderr, "Buffer provided = %d, needed = %d\n", size, static_cast<int>(needed));
     return nullptr;
   }
-  const lx::GlobalArea* area = lx::globals.area;
+  const GlobalArea* area = globals.area;
   snprintf(buffer, static_cast<size_t>(size), "%s%s%s%s%05d%s", directory, area->directory_separator,
            format::kTypePrefix[type], area->name_separator, id, format::kDataExtension);
   return buffer;

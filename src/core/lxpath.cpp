@@ -7,6 +7,8 @@
 #include "core/lxtrace.h"
 #include "lx.h"
 
+using namespace lx;
+
 namespace {
 
 RAS1_Unit unit = RAS1_UNIT("lxpath");
@@ -43,14 +45,14 @@ int32_t store(char* out, const char* part, size_t bytes, size_t limit) {
 extern "C" {
 
 int32_t SplitDrive(const char* path, char* drive) {
-  return store(drive, path, drive_bytes(path), sizeof(lx::PathParts::drive) - 1);
+  return store(drive, path, drive_bytes(path), sizeof(PathParts::drive) - 1);
 }
 
 int32_t SplitDir(const char* path, char* directory) {
   const char* begin = path + drive_bytes(path);
   const char* end = last_component(path);
   if (is_dot_directory(end)) end += strlen(end);
-  return store(directory, begin, static_cast<size_t>(end - begin), sizeof(lx::PathParts::directory) - 1);
+  return store(directory, begin, static_cast<size_t>(end - begin), sizeof(PathParts::directory) - 1);
 }
 
 int32_t SplitFile(const char* path, char* file) {
@@ -58,17 +60,17 @@ int32_t SplitFile(const char* path, char* file) {
   if (is_dot_directory(name)) return store(file, name, 0, 0);
   const char* dot = strrchr(name, '.');
   const size_t bytes = dot != nullptr ? static_cast<size_t>(dot - name) : strlen(name);
-  return store(file, name, bytes, sizeof(lx::PathParts::file) - 1);
+  return store(file, name, bytes, sizeof(PathParts::file) - 1);
 }
 
 int32_t SplitExtent(const char* path, char* extension) {
   const char* dot = strrchr(path, '.');
   if (dot == nullptr) return store(extension, path, 0, 0);
-  return store(extension, dot, strlen(dot), sizeof(lx::PathParts::extension) - 1);
+  return store(extension, dot, strlen(dot), sizeof(PathParts::extension) - 1);
 }
 
 void SplitPath(const char* path, char* drive, char* directory, char* file, char* extension) {
-  lx::Events events(unit);
+  Events events(unit);
   drive[0] = directory[0] = file[0] = extension[0] = '\0';
   SplitDrive(path, drive);
   SplitDir(path, directory);

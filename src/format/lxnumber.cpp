@@ -5,19 +5,11 @@
 #include "core/lxcall.h"
 #include "format/lxnumbertext.h"
 
+using namespace lx;
+
 namespace {
 
-namespace territory = lx::format::territory;
-using lx::bytes_of;
-using lx::Call;
-using lx::Codepage;
-using lx::codepage_of;
-using lx::DecimalDigits;
-using lx::FixedChars;
-using lx::Form;
-using lx::FormUnit;
-using lx::NumberText;
-using lx::TextKind;
+namespace territory = format::territory;
 
 RAS1_Unit unit = RAS1_UNIT("lxnumber");
 
@@ -41,7 +33,7 @@ size_t put_units(Sink& out, const typename Sink::Unit* units, size_t count) {
   if constexpr (Sink::kShifts) {
     while (n < count && out.put(LXWChar{units[n]})) ++n;
   } else {
-    n = lx::least(count, lx::room(out.p, out.end));
+    n = least(count, room(out.p, out.end));
     auto* const to = out.p;
     for (size_t i = 0; i < n; ++i) to[i] = units[i];
     out.p = to + n;
@@ -58,7 +50,7 @@ bool put_number(Sink& out, const NumberText<Unit>& number) {
   Unit zeros[kRun];
   for (Unit& zero : zeros) zero = number.zero();
   for (size_t left = number.zeros(); left != 0;) {
-    const size_t n = lx::least(left, kRun);
+    const size_t n = least(left, kRun);
     if (put_units(out, zeros, n) < n) return false;
     left -= n;
   }
@@ -76,15 +68,15 @@ template <Form kForm, bool kDirect, class Write>
 Written write_text(const Codepage& cp, FormUnit<kForm>* p, size_t room, LXShiftState state, Write write) {
   const auto run = [&](auto out) {
     const bool all = write(out);
-    lx::close_text(out);
+    close_text(out);
     return Written{static_cast<size_t>(out.p - p), all};
   };
-  FormUnit<kForm>* const end = lx::end_of(p, room);
+  FormUnit<kForm>* const end = end_of(p, room);
   using Unit = FormUnit<kForm>;
   if constexpr (kDirect && sizeof(Unit) == 1)
-    if (kForm == Form::kPlain || !cp.shift_sensitive) return run(lx::SingleByteSink{cp, p, end});
-  return lx::with_kind<Unit, lx::ClosedShiftSink>(cp, kForm,
-                                                  [&](auto kind) { return run(kind.sink(cp, p, end, state)); });
+    if (kForm == Form::kPlain || !cp.shift_sensitive) return run(SingleByteSink{cp, p, end});
+  return with_kind<Unit, ClosedShiftSink>(cp, kForm,
+                                          [&](auto kind) { return run(kind.sink(cp, p, end, state)); });
 }
 
 template <Form kForm>
@@ -107,7 +99,7 @@ int32_t write_number(Call& call, const Output<kForm>& to, const NumberText<FormU
 
 /// The frame of a writing function: `make(call)` is run when there is a buffer to write to.
 template <Form kForm, class Make>
-int32_t format(LXLocale* given, const Output<kForm>& to, uint32_t allowed_flags, Make make) {
+int32_t with_output(LXLocale* given, const Output<kForm>& to, uint32_t allowed_flags, Make make) {
   Call call(unit, given);
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
   if ((to.flags & ~(allowed_flags | LX_TERRITORY_VALUES | LX_TERMINATE | LX_CHARACTERS)) != 0)
@@ -118,13 +110,13 @@ int32_t format(LXLocale* given, const Output<kForm>& to, uint32_t allowed_flags,
 
 template <Form kForm>
 int32_t long_to_text(LXLocale* given, int32_t value, const Output<kForm>& to) {
-  return format(given, to, LX_UNSIGNED, [&](Call& call, const LXLocale& locale) {
+  return with_output(given, to, LX_UNSIGNED, [&](Call& call, const LXLocale& locale) {
     const bool negative = value < 0 && (to.flags & LX_UNSIGNED) == 0;
     DecimalDigits digits;
-    lx::integer_digits(negative ? 0u - static_cast<uint32_t>(value) : static_cast<uint32_t>(value), &digits);
-    NumberText<FormUnit<kForm>> number(lx::fixed_chars<kForm>(locale));
-    number.put_integer(digits, lx::separator_of<kForm>(locale, to.current(), lx::kThousands),
-                       lx::GroupSizes<kForm>(locale, to.current(), lx::kGrouping));
+    integer_digits(negative ? 0u - static_cast<uint32_t>(value) : static_cast<uint32_t>(value), &digits);
+    NumberText<FormUnit<kForm>> number(fixed_chars<kForm>(locale));
+    number.put_integer(digits, separator_of<kForm>(locale, to.current(), kThousands),
+                       GroupSizes<kForm>(locale, to.current(), kGrouping));
     if (negative) number.put_minus();
     return write_number(call, to, number);
   });
@@ -132,43 +124,41 @@ int32_t long_to_text(LXLocale* given, int32_t value, const Output<kForm>& to) {
 
 /// The conventions of plain numbers, and of amounts.
 struct DoubleItems {
-  lx::NumberSeparator decimal, thousands;
-  lx::NumberGrouping grouping;
-  lx::NumberDigits fraction_digits;
+  NumberSeparator decimal, thousands;
+  NumberGrouping grouping;
+  NumberDigits fraction_digits;
 };
-constexpr DoubleItems kPlainItems{lx::kDecimal, lx::kThousands, lx::kGrouping, lx::kDigits};
-constexpr DoubleItems kLocalItems{lx::kMonetaryDecimal, lx::kMonetaryThousands, lx::kMonetaryGrouping,
-                                  lx::kCurrencyDigits};
-constexpr DoubleItems kInternationalItems{lx::kMonetaryDecimal, lx::kMonetaryThousands, lx::kMonetaryGrouping,
-                                          lx::kInternationalDigits};
+constexpr DoubleItems kPlainItems{kDecimal, kThousands, kGrouping, kDigits};
+constexpr DoubleItems kLocalItems{kMonetaryDecimal, kMonetaryThousands, kMonetaryGrouping, kCurrencyDigits};
+constexpr DoubleItems kInternationalItems{kMonetaryDecimal, kMonetaryThousands, kMonetaryGrouping,
+                                          kInternationalDigits};
 
 /// The number without its sign.
 template <Form kForm>
 void put_magnitude(NumberText<FormUnit<kForm>>* number, double value, const LXLocale& locale, bool current,
                    const DoubleItems& items) {
   DecimalDigits digits;
-  lx::double_digits(value < 0 ? -value : value == 0 ? 0.0 : value, &digits);
+  double_digits(value < 0 ? -value : value == 0 ? 0.0 : value, &digits);
   if (digits.fraction == nullptr) {
     const Codepage& cp = codepage_of(*locale.codepage);
     number->put_word(digits, [&](char c) {
       const LXUChar u = static_cast<LXUChar>(c);
-      return static_cast<FormUnit<kForm>>(kForm == Form::kUnicode ? u : lx::unicode_to_code(cp, u));
+      return static_cast<FormUnit<kForm>>(kForm == Form::kUnicode ? u : unicode_to_code(cp, u));
     });
     return;
   }
   const uint16_t fraction_digits =
       current ? locale.numbers[items.fraction_digits]
-              : lx::payload_word(*locale.territory, territory::kNumbers + items.fraction_digits);
-  number->put_integer(digits, lx::separator_of<kForm>(locale, current, items.thousands),
-                      lx::GroupSizes<kForm>(locale, current, items.grouping));
-  number->put_fraction(digits.fraction, lx::separator_of<kForm>(locale, current, items.decimal),
-                       fraction_digits);
+              : payload_word(*locale.territory, territory::kNumbers + items.fraction_digits);
+  number->put_integer(digits, separator_of<kForm>(locale, current, items.thousands),
+                      GroupSizes<kForm>(locale, current, items.grouping));
+  number->put_fraction(digits.fraction, separator_of<kForm>(locale, current, items.decimal), fraction_digits);
 }
 
 template <Form kForm>
 int32_t double_to_text(LXLocale* given, double value, const Output<kForm>& to) {
-  return format(given, to, 0, [&](Call& call, const LXLocale& locale) {
-    NumberText<FormUnit<kForm>> number(lx::fixed_chars<kForm>(locale));
+  return with_output(given, to, 0, [&](Call& call, const LXLocale& locale) {
+    NumberText<FormUnit<kForm>> number(fixed_chars<kForm>(locale));
     put_magnitude<kForm>(&number, value, locale, to.current(), kPlainItems);
     if (value < 0) number.put_minus();
     return write_number(call, to, number);
@@ -196,11 +186,10 @@ struct Placement {
 
 Placement placement_of(const LXLocale& locale, bool current, bool negative, bool international) {
   const LXObject& land = *locale.territory;
-  const unsigned flags = current ? locale.flags : lx::payload_word(land, territory::kFlags) >> 1;
-  const uint8_t* positions =
-      current ? locale.sign_positions : lx::payload_of(land) + 2 * territory::kSignPositions;
+  const unsigned flags = current ? locale.flags : payload_word(land, territory::kFlags) >> 1;
+  const uint8_t* positions = current ? locale.sign_positions : payload_of(land) + 2 * territory::kSignPositions;
   const unsigned own = flags >> (negative ? 2 : 0);  // bit 0: the symbol precedes, bit 1: a space
-  const size_t position = lx::least(positions[negative ? 1 : 0], 4);
+  const size_t position = least(positions[negative ? 1 : 0], 4);
   return {kLayouts[position][own & 1], international ? LX_ITEM_INTERNATIONAL_CURRENCY : LX_ITEM_CURRENCY,
           negative ? LX_ITEM_NEGATIVE_SIGN : LX_ITEM_POSITIVE_SIGN, (own & 2) != 0};
 }
@@ -219,13 +208,13 @@ bool put_item(Sink& out, const LXLocale& locale, int32_t item, bool current) {
   TextKind kind{};
   if constexpr (kForm == Form::kUnicode) {
     const void* text = LXLocaleGetTextItemU(&locale, item, current, &kind);
-    return put_all<LXUChar>(out, lx::PayloadCursor{static_cast<const uint8_t*>(text), nullptr});
+    return put_all<LXUChar>(out, PayloadCursor{static_cast<const uint8_t*>(text), nullptr});
   } else {
     const auto* text = static_cast<const uint8_t*>(LXLocaleGetTextItem(&locale, item, current, &kind));
-    if (kind == TextKind::kUnicode) return put_all<LXUChar>(out, lx::PayloadCursor{text, nullptr});
-    return lx::with_cursor(codepage_of(*locale.codepage), lx::kTextForm<kForm>, LX_SHIFT_SINGLE, text,
-                           strlen(reinterpret_cast<const char*>(text)),
-                           [&](auto in) { return put_all<LXWChar>(out, in); });
+    if (kind == TextKind::kUnicode) return put_all<LXUChar>(out, PayloadCursor{text, nullptr});
+    return with_cursor(codepage_of(*locale.codepage), kTextForm<kForm>, LX_SHIFT_SINGLE, text,
+                       strlen(reinterpret_cast<const char*>(text)),
+                       [&](auto in) { return put_all<LXWChar>(out, in); });
   }
 }
 
@@ -233,7 +222,7 @@ template <Form kForm, class Sink>
 bool put_pieces(Sink& out, const char* pieces, const LXLocale& locale, bool current,
                 const Placement& placement) {
   using Char = std::conditional_t<kForm == Form::kUnicode, LXUChar, LXWChar>;
-  const FixedChars& chars = lx::fixed_chars<kForm>(locale);
+  const FixedChars& chars = fixed_chars<kForm>(locale);
   for (; *pieces != '\0'; ++pieces) {
     bool put = true;
     if (*pieces == '$')
@@ -253,12 +242,12 @@ bool put_pieces(Sink& out, const char* pieces, const LXLocale& locale, bool curr
 
 template <Form kForm>
 int32_t currency_to_text(LXLocale* given, double value, const Output<kForm>& to) {
-  return format(given, to, LX_INTERNATIONAL, [&](Call& call, const LXLocale& locale) {
+  return with_output(given, to, LX_INTERNATIONAL, [&](Call& call, const LXLocale& locale) {
     const Codepage& cp = codepage_of(*locale.codepage);
     const bool current = to.current();
     const bool international = (to.flags & LX_INTERNATIONAL) != 0;
     const Placement placement = placement_of(locale, current, !(value >= 0), international);
-    NumberText<FormUnit<kForm>> number(lx::fixed_chars<kForm>(locale));
+    NumberText<FormUnit<kForm>> number(fixed_chars<kForm>(locale));
     put_magnitude<kForm>(&number, value, locale, current, international ? kInternationalItems : kLocalItems);
     const auto write = [&](FormUnit<kForm>* p, size_t room) {
       return write_text<kForm, false>(cp, p, room, to.state, [&](auto& out) {
@@ -275,8 +264,7 @@ int32_t currency_to_text(LXLocale* given, double value, const Output<kForm>& to)
         uint8_t work[kWorkBytes] = {};
         const size_t work_bytes = size < kWorkBytes / kWorkBytesPerChar ? size * kWorkBytesPerChar : kWorkBytes;
         const Written written = write(work, work_bytes - to.nulls());
-        const lx::Part copied =
-            lx::copy_chars(cp, kForm, to.state, work, written.units, size - to.nulls(), to.buffer);
+        const Part copied = copy_chars(cp, kForm, to.state, work, written.units, size - to.nulls(), to.buffer);
         return finish(call, to, copied.units, copied.chars, written.all);
       }
     }
@@ -291,10 +279,10 @@ int32_t first_group_size(LXLocale* given, const Text* text, int32_t* remaining, 
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
   if (text == nullptr) return call.exit(-1);
   using Unit = FormUnit<kForm>;
-  const FixedChars& chars = lx::fixed_chars<kForm>(*call.locale());
+  const FixedChars& chars = fixed_chars<kForm>(*call.locale());
   const auto unit_at = [&](int32_t i) { return static_cast<Unit>(text[i]); };
   int32_t units = 0;
-  const int32_t size = lx::group_size(unit_at, *remaining, chars, &units);
+  const int32_t size = group_size(unit_at, *remaining, chars, &units);
   if (size < 0) return call.exit(-1);
   const bool more = units < *remaining && text[units] != 0;
   *remaining = more ? *remaining - units : 0;

@@ -4,31 +4,23 @@
 #include "core/lxcall.h"
 #include "format/lxnumberclass.h"
 
-namespace {
+using namespace lx;
 
-using lx::bytes_of;
-using lx::Call;
-using lx::Classifier;
-using lx::Codepage;
-using lx::codepage_of;
-using lx::FixedChars;
-using lx::Form;
-using lx::FormUnit;
-using lx::kNoClass;
+namespace {
 
 RAS1_Unit unit = RAS1_UNIT("lxnumberread");
 
 /// A text to read, and the flags of its reading.
 template <Form kForm>
 struct Input {
-  lx::Text<FormUnit<kForm>> text;
+  Text<FormUnit<kForm>> text;
   uint32_t flags;
 };
 
 template <Form kForm, class Body>
 auto read(const Codepage& cp, const Input<kForm>& from, Body&& body) {
-  const size_t units = lx::units_of(cp, from.text, (from.flags & LX_CHARACTERS) != 0);
-  return lx::with_cursor(cp, kForm, from.text, units, body);
+  const size_t units = units_of(cp, from.text, (from.flags & LX_CHARACTERS) != 0);
+  return with_cursor(cp, kForm, from.text, units, body);
 }
 
 /// What a parser has read of the value.
@@ -60,7 +52,7 @@ template <class Cursor, class Classes>
 int32_t read_long(Cursor& in, const Classes& classes, uint32_t base, bool is_unsigned) {
   Cursor item(in);  // where the last class began
   const auto take = [&] {
-    lx::go_on_at(item, in);
+    go_on_at(item, in);
     return classes.take(&in);
   };
   const auto is_digit = [&](int32_t c) { return c >= 0 && static_cast<uint32_t>(c) < base; };
@@ -74,13 +66,13 @@ int32_t read_long(Cursor& in, const Classes& classes, uint32_t base, bool is_uns
   bool prefix = false;
   if (c == 0 && (base == 0 || base == 16)) {
     c = take();
-    if (base == 0) base = c == lx::kClassX ? 16 : 8;
-    prefix = c == lx::kClassX;
+    if (base == 0) base = c == kClassX ? 16 : 8;
+    prefix = c == kClassX;
   } else if (base == 0) {
     base = 10;
   }
   if (refused || (!prefix && !is_digit(c))) {
-    lx::go_on_at(in, item);
+    go_on_at(in, item);
     return 0;
   }
   Magnitude magnitude(base, is_unsigned);
@@ -97,7 +89,7 @@ int32_t read_long(Cursor& in, const Classes& classes, uint32_t base, bool is_uns
     else if (c != LX_CLASS_THOUSANDS)
       break;
   }
-  lx::go_on_at(in, item);
+  go_on_at(in, item);
   return magnitude.result(negative);
 }
 
@@ -193,8 +185,8 @@ int32_t next_state(int32_t state, int32_t c, DoubleParts* parts) {
       if (state == kIntegerDigits) parts->fraction_exponent = 0;
       if (state == kStart || state == kSigned) return kDecimalFirst;
       return state == kIntegerDigits ? kFractionDigits : kNoNumber;
-    case lx::kClassD:
-    case lx::kClassE:
+    case kClassD:
+    case kClassE:
       return state == kFractionDigits ? kExponentMarker : kNoNumber;
     default:
       return kNoNumber;
@@ -215,15 +207,15 @@ double read_double(Cursor& in, Classes& classes, const FixedChars& chars) {
       });
       parts = moved;
     }
-    lx::go_on_at(item, in);
+    go_on_at(item, in);
     state = next_state(state, classes.take(&in), &parts);
     if (state < 0) break;
     if (state == kExponentMarker) {
-      classes.positive = lx::single_sign(chars.plus);
-      classes.negative = lx::single_sign(chars.minus);
+      classes.positive = single_sign(chars.plus);
+      classes.negative = single_sign(chars.minus);
     }
   }
-  lx::go_on_at(in, item);
+  go_on_at(in, item);
   return parts.result();
 }
 
@@ -242,7 +234,7 @@ int32_t text_to_long(LXLocale* given, const Input<kForm>& from, const Text** end
   constexpr uint32_t kAllowed =
       LX_TERRITORY_VALUES | LX_NATIONAL_DIGITS | LX_MONETARY | LX_UNSIGNED | LX_CHARACTERS;
   if ((from.flags & ~kAllowed) != 0) return call.fail(LX_E_INVALID, 0);
-  const auto classes = lx::classifier_of<kForm>(*call.locale(), from.flags, false);
+  const auto classes = classifier_of<kForm>(*call.locale(), from.flags, false);
   return call.exit(read(codepage_of(call.codepage()), from, [&](auto in) {
     const bool is_unsigned = (from.flags & LX_UNSIGNED) != 0;
     const int32_t value = read_long(in, classes, static_cast<uint32_t>(base), is_unsigned);
@@ -263,9 +255,9 @@ double text_to_double(LXLocale* given, const Input<kForm>& from, const Text** en
   put_place(end, from.text.p);
   constexpr uint32_t kAllowed = LX_TERRITORY_VALUES | LX_NATIONAL_DIGITS | LX_MONETARY | LX_CHARACTERS;
   if ((from.flags & ~kAllowed) != 0) return exit(LX_E_INVALID);
-  auto classes = lx::classifier_of<kForm>(*call.locale(), from.flags, true);
+  auto classes = classifier_of<kForm>(*call.locale(), from.flags, true);
   read(codepage_of(call.codepage()), from, [&](auto in) {
-    value = read_double(in, classes, lx::fixed_chars<kForm>(*call.locale()));
+    value = read_double(in, classes, fixed_chars<kForm>(*call.locale()));
     put_place(end, in.p);
   });
   return exit(LX_OK);
@@ -280,12 +272,12 @@ int32_t get_digit(LXLocale* given, const Input<kForm>& from, const Text** new_po
   if (from.flags != 0 && from.flags != LX_NATIONAL_DIGITS) return call.fail(LX_E_INVALID, kNoClass);
   const Codepage& cp = codepage_of(call.codepage());
   const Classifier<kForm> classes{cp,
-                                  lx::digit_values<kForm>(ascii),
+                                  digit_values<kForm>(ascii),
                                   from.flags != 0,
-                                  lx::first_unit(thousands),
-                                  lx::first_unit(decimal),
-                                  lx::given_sign<kForm>(cp, positive),
-                                  lx::given_sign<kForm>(cp, negative)};
+                                  first_unit(thousands),
+                                  first_unit(decimal),
+                                  given_sign<kForm>(cp, positive),
+                                  given_sign<kForm>(cp, negative)};
   return call.exit(read(cp, from, [&](auto in) {
     const int32_t found = classes.take(&in);
     put_place(new_position, in.p);

@@ -5,9 +5,9 @@
 #include <cstdio>
 #include <cstring>
 
-namespace {
+using namespace lx;
 
-using lx::DecimalDigits;
+namespace {
 
 struct DigitPairs {
   char text[200];
@@ -38,7 +38,7 @@ void set_digits(DecimalDigits* digits, uint64_t integer, uint32_t fraction) {
       integer <= UINT32_MAX ? put_digits(point, static_cast<uint32_t>(integer)) : put_digits(point, integer);
   digits->integer = begin;
   digits->integer_digits = static_cast<size_t>(point - begin);
-  char* p = point + lx::kPrintedFraction;
+  char* p = point + kPrintedFraction;
   for (int pair = 0; pair < 3; ++pair, fraction /= 100) memcpy(p -= 2, kPairs.text + 2 * (fraction % 100), 2);
   digits->fraction = point;
 }
@@ -54,7 +54,7 @@ void print_digits(double value, DecimalDigits* digits) {
   const int bytes = snprintf(digits->text, sizeof(digits->text), "%f", value);
   digits->integer = digits->text;
   digits->integer_digits = strspn(digits->text, "0123456789");
-  digits->fraction = digits->text + static_cast<size_t>(bytes) - lx::kPrintedFraction;
+  digits->fraction = digits->text + static_cast<size_t>(bytes) - kPrintedFraction;
 }
 
 }  // namespace

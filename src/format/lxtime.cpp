@@ -3,16 +3,9 @@
 #include "core/lxcall.h"
 #include "format/lxtimetext.h"
 
-namespace {
+using namespace lx;
 
-using lx::bytes_of;
-using lx::Call;
-using lx::Codepage;
-using lx::codepage_of;
-using lx::Form;
-using lx::TimeAction;
-using lx::TimeDirective;
-using lx::TimeSymbols;
+namespace {
 
 RAS1_Unit unit = RAS1_UNIT("lxtime");
 
@@ -42,12 +35,12 @@ class TimeFormatter {
 
  public:
   TimeFormatter(const LXLocale& locale, const LXTime& time, bool current)
-      : locale_(locale), time_(time), symbols_(lx::time_symbols<Text>(locale)), current_(current) {}
+      : locale_(locale), time_(time), symbols_(time_symbols<Text>(locale)), current_(current) {}
 
   /// Writes as much as there is before a failure: the code.
   int32_t expand(Cursor format, Sink* out, int depth = 0) const {
     const int32_t code = walk(format, out, depth);
-    lx::close_text(*out);
+    close_text(*out);
     return code;
   }
 
@@ -63,13 +56,13 @@ class TimeFormatter {
         if (format.p != format.end) code = LX_E_FORMAT;
         break;
       }
-      if (!lx::is_percent(format, value, symbols_)) {
-        if (!lx::copy_char<Text>(format, before, value, &to)) code = LX_E_SIZE;
-      } else if (lx::units_left(to) == 0) {
+      if (!is_percent(format, value, symbols_)) {
+        if (!copy_char<Text>(format, before, value, &to)) code = LX_E_SIZE;
+      } else if (units_left(to) == 0) {
         code = LX_E_SIZE;
       } else {
         bool flag = false;
-        const TimeDirective& directive = lx::take_directive(&format, symbols_, &flag, &value);
+        const TimeDirective& directive = take_directive(&format, symbols_, &flag, &value);
         if (directive.field.member != nullptr) {
           code = write_field(directive, flag, &to);
         } else if (directive.action == TimeAction::kPercent) {
@@ -77,11 +70,11 @@ class TimeFormatter {
         } else {
           Sink moved = to;
           code = write_nested(directive, flag, start, &moved, depth);
-          lx::go_on_at(to, moved);
+          go_on_at(to, moved);
         }
       }
     }
-    lx::go_on_at(*out, to);
+    go_on_at(*out, to);
     return code;
   }
 
@@ -95,7 +88,7 @@ class TimeFormatter {
     if (directive.action == TimeAction::kHour12) {
       number = value % 12 == 0 ? 12 : static_cast<uint32_t>(value % 12);
     } else if (directive.action == TimeAction::kWeek) {
-      if (!lx::time_field::kDayOfYear.in_range(time_)) return LX_E_NOT_FOUND;
+      if (!time_field::kDayOfYear.in_range(time_)) return LX_E_NOT_FOUND;
       number = week_of(time_, directive.write_added);
     }
     return write_number(number, directive.digits, flag, out);
@@ -124,36 +117,36 @@ class TimeFormatter {
 
   /// Expands a format of the locale at `place`, in as many units as `out` has left, and moves `out` on.
   int32_t expand_item(int32_t item, const Sink& place, Sink* out, int depth) const {
-    if (lx::units_left(*out) == 0) return LX_E_SIZE;
-    if (depth == lx::kMostNestedFormats) return LX_E_FORMAT;
-    const lx::TimeItem<Text> format(locale_, item, current_);
+    if (units_left(*out) == 0) return LX_E_SIZE;
+    if (depth == kMostNestedFormats) return LX_E_FORMAT;
+    const TimeItem<Text> format(locale_, item, current_);
     Sink nested = place;
-    nested.end = nested.p + lx::room(out->p, out->end);
+    nested.end = nested.p + room(out->p, out->end);
     const Unit* const begin = nested.p;
     const int32_t code = expand(format.cursor(locale_), &nested, depth + 1);
     nested.p = out->p + (nested.p - begin);
-    lx::go_on_at(*out, nested);
+    go_on_at(*out, nested);
     return code;
   }
 
   int32_t write_item(int32_t item, Sink* out) const {
     Sink word = *out;
     int32_t code = LX_OK;
-    if (!Cursor::kShifts && lx::units_left(word) >= lx::kItemUnits) {
-      word.end = word.p + lx::kItemUnits;
-      lx::write_time_unicode(lx::time_name(locale_, item), &word);
+    if (!Cursor::kShifts && units_left(word) >= kItemUnits) {
+      word.end = word.p + kItemUnits;
+      write_time_unicode(time_name(locale_, item), &word);
     } else {
       code = write_item_cut(item, &word);
     }
-    lx::go_on_at(*out, word);
+    go_on_at(*out, word);
     return code;
   }
   int32_t write_item_cut(int32_t item, Sink* out) const {
-    const lx::TimeItem<Text> text(locale_, item, current_);
+    const TimeItem<Text> text(locale_, item, current_);
     Cursor in = text.cursor(locale_);
     const Unit* before = in.p;
     for (Value value{}; in.next(&value); before = in.p)
-      if (!lx::copy_char<Text>(in, before, value, out)) return LX_E_SIZE;
+      if (!copy_char<Text>(in, before, value, out)) return LX_E_SIZE;
     return LX_OK;
   }
 
@@ -167,7 +160,7 @@ class TimeFormatter {
     }
     // In place where there is room; copying single units that have just been stored would stall.
     Unit cut[kMostDigits];
-    const bool fits = !Cursor::kShifts && lx::units_left(*out) > kMostDigits;
+    const bool fits = !Cursor::kShifts && units_left(*out) > kMostDigits;
     Unit* const digits = fits ? out->p : cut;
     for (uint32_t i = count; i-- > 0; number /= 10) digits[i] = static_cast<Unit>(symbols_.zero + number % 10);
     if (fits) {
@@ -176,7 +169,7 @@ class TimeFormatter {
     }
     for (uint32_t i = 0; i < count; ++i)
       if (!out->put(Value{cut[i]})) return LX_E_SIZE;
-    return lx::units_left(*out) == 0 ? LX_E_SIZE : LX_OK;
+    return units_left(*out) == 0 ? LX_E_SIZE : LX_OK;
   }
 
   const LXLocale& locale_;
@@ -196,7 +189,7 @@ size_t format_time(const LXLocale& locale, const LXTime& time, typename Text::Un
                    typename Text::Cursor format, LXShiftState state, uint32_t flags, int32_t* code) {
   const Codepage& cp = codepage_of(*locale.codepage);
   const bool null = (flags & LX_TERMINATE) != 0;
-  auto out = Text::sink(cp, buffer, lx::end_of(buffer, units - null), state);
+  auto out = Text::sink(cp, buffer, end_of(buffer, units - null), state);
   if (format.p != format.end)
     *code = TimeFormatter<Text>(locale, time, (flags & LX_TERRITORY_VALUES) == 0).expand(format, &out);
   if (null) *out.p = 0;
@@ -211,7 +204,7 @@ int32_t format_units(LXLocale* given, const LXTime* time, typename Text::Unit* b
   int32_t code = refusal(flags, size);
   if (code != LX_OK) return call.fail(code, code == LX_E_INVALID ? -1 : 0);
   const Codepage& cp = codepage_of(call.codepage());
-  const size_t units = lx::text_units(format, format_length);
+  const size_t units = text_units(format, format_length);
   const size_t written = format_time<Text>(*call.locale(), *time, buffer, static_cast<size_t>(size),
                                            Text::cursor(cp, format, units), LX_SHIFT_SINGLE, flags, &code);
   return call.end(code, static_cast<int32_t>(written + ((flags & LX_TERMINATE) != 0)));
@@ -229,18 +222,17 @@ int32_t format_bytes(LXLocale* given, const LXTime* time, char* buffer, LXShiftS
   const bool characters = (flags & LX_CHARACTERS) != 0;
   const bool null = (flags & LX_TERMINATE) != 0;
   const size_t most = static_cast<size_t>(size);
-  const size_t written = lx::with_kind<uint8_t, lx::ClosedShiftSink>(cp, form, [&](auto text) {
+  const size_t written = with_kind<uint8_t, ClosedShiftSink>(cp, form, [&](auto text) {
     using Text = decltype(text);
-    const auto in = lx::given_text<Text>(cp, format, format_state, format_length, characters);
+    const auto in = given_text<Text>(cp, format, format_state, format_length, characters);
     uint8_t work[kWorkBytes];
     // Cleared, since nested formats may leave places unwritten.
     if (characters) memset(work, 0, sizeof(work));
-    const size_t room =
-        characters ? lx::least(lx::least(most, kWorkBytes) * kWorkBytesPerChar, kWorkBytes) : most;
+    const size_t room = characters ? least(least(most, kWorkBytes) * kWorkBytesPerChar, kWorkBytes) : most;
     const size_t filled =
         format_time<Text>(locale, *time, characters ? work : bytes_of(buffer), room, in, state, flags, &code);
     if (!characters) return null + filled;
-    const lx::Part copied = lx::copy_chars(cp, form, state, work, filled, most - null, bytes_of(buffer));
+    const Part copied = copy_chars(cp, form, state, work, filled, most - null, bytes_of(buffer));
     if (null) buffer[copied.units] = 0;
     return copied.chars + null;
   });
@@ -259,12 +251,12 @@ int32_t LXTimeToString(LXLocale* locale, const LXTime* time, char* buffer, int32
 
 int32_t LXTimeToStringW(LXLocale* locale, const LXTime* time, LXWChar* buffer, int32_t size,
                         const LXWChar* format, int32_t format_length, uint32_t flags) {
-  return format_units<lx::WideKind>(locale, time, buffer, size, format, format_length, flags);
+  return format_units<WideKind>(locale, time, buffer, size, format, format_length, flags);
 }
 
 int32_t LXTimeToStringU(LXLocale* locale, const LXTime* time, LXUChar* buffer, int32_t size,
                         const LXUChar* format, int32_t format_length, uint32_t flags) {
-  return format_units<lx::UnicodeKind>(locale, time, buffer, size, format, format_length, flags);
+  return format_units<UnicodeKind>(locale, time, buffer, size, format, format_length, flags);
 }
 
 int32_t LXTimeToStringEx(LXLocale* locale, const LXTime* time, char* buffer, LXShiftState state, int32_t size,

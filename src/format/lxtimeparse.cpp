@@ -3,17 +3,9 @@
 #include "core/lxcall.h"
 #include "format/lxtimetext.h"
 
-namespace {
+using namespace lx;
 
-using lx::bytes_of;
-using lx::Call;
-using lx::Codepage;
-using lx::codepage_of;
-using lx::Form;
-using lx::has_more;
-using lx::TimeAction;
-using lx::TimeDirective;
-using lx::TimeSymbols;
+namespace {
 
 RAS1_Unit unit = RAS1_UNIT("lxtimeparse");
 
@@ -32,18 +24,18 @@ Match match_char(const typename Text::Cursor& format, const typename Text::Unit*
     return text->next(&other) && other == value ? Match::kSame : Match::kDifferent;
   } else {
     Cursor at = *text;
-    size_t count = lx::room(before, format.p);
+    size_t count = room(before, format.p);
     if constexpr (Cursor::kShifts) {
       count = format.cp.width_in(format.state);
       at.pass_shift();
     }
-    if (count > lx::room(at.p, at.end)) return Match::kCut;
-    if (lx::state_at(at, LX_SHIFT_SINGLE) != lx::state_at(format, LX_SHIFT_SINGLE)) return Match::kDifferent;
+    if (count > room(at.p, at.end)) return Match::kCut;
+    if (state_at(at, LX_SHIFT_SINGLE) != state_at(format, LX_SHIFT_SINGLE)) return Match::kDifferent;
     // A single byte apart: not worth a call.
     if (count == 1 ? *at.p != format.p[-1] : memcmp(at.p, format.p - count, count) != 0)
       return Match::kDifferent;
     at.p += count;
-    lx::go_on_at(*text, at);
+    go_on_at(*text, at);
     return Match::kSame;
   }
 }
@@ -56,7 +48,7 @@ class TimeParser {
 
  public:
   TimeParser(const LXLocale& locale, LXTime* time, bool current)
-      : locale_(locale), time_(*time), symbols_(lx::time_symbols<Text>(locale)), current_(current) {}
+      : locale_(locale), time_(*time), symbols_(time_symbols<Text>(locale)), current_(current) {}
 
   /// The code; the text stands behind what was read.
   int32_t match(Cursor format, Cursor* text, int depth = 0) {
@@ -68,24 +60,24 @@ class TimeParser {
     while (code == LX_OK && has_more(format) && has_more(at)) {
       const Unit* const before = format.p;
       if (!format.next(&value)) break;
-      if (!lx::is_percent(format, value, symbols)) {
+      if (!is_percent(format, value, symbols)) {
         const Match found = match_char<Text>(format, before, value, &at);
         if (found == Match::kDifferent) code = LX_E_NOT_FOUND;
         if (found == Match::kCut) break;
         continue;
       }
       bool flag = false;
-      const TimeDirective& directive = lx::take_directive(&format, symbols, &flag, &value);
+      const TimeDirective& directive = take_directive(&format, symbols, &flag, &value);
       if (directive.digits != 0) {
         code = read_number(directive, symbols.zero, &at);
       } else {
         Cursor moved = at;
         code = directive.field.member != nullptr ? read_name(directive, &moved, &afternoon)
                                                  : read_nested(directive, flag, value, &moved, depth);
-        lx::go_on_at(at, moved);
+        go_on_at(at, moved);
       }
     }
-    lx::go_on_at(*text, at);
+    go_on_at(*text, at);
     if (code != LX_OK) return code;
     if (afternoon && time_.hours <= 11) time_.hours += 12;
     if constexpr (Cursor::kShifts)
@@ -112,11 +104,11 @@ class TimeParser {
     int digits = 0;
     Cursor at = *text;
     Value value{};
-    for (; digits < directive.digits && at.next(&value) && lx::read_single(at); ++digits) {
+    for (; digits < directive.digits && at.next(&value) && read_single(at); ++digits) {
       const uint32_t digit = uint32_t{value} - zero;
       if (digit > 9) break;
       number = number * 10 + static_cast<int32_t>(digit);
-      lx::go_on_at(*text, at);
+      go_on_at(*text, at);
     }
     if (digits == 0) return LX_E_NOT_FOUND;
     const bool noon = directive.action == TimeAction::kHour12 && number == 12;
@@ -130,7 +122,7 @@ class TimeParser {
     Value value{};
     switch (directive.action) {
       case TimeAction::kPercent:
-        return text->next(&value) && value == percent && lx::read_single(*text) ? LX_OK : LX_E_NOT_FOUND;
+        return text->next(&value) && value == percent && read_single(*text) ? LX_OK : LX_E_NOT_FOUND;
       case TimeAction::kDate:
         return match_item(date, text, depth);
       case TimeAction::kTime:
@@ -148,8 +140,8 @@ class TimeParser {
 
   int32_t match_item(int32_t item, Cursor* text, int depth) {
     if (!has_more(*text)) return LX_OK;
-    if (depth == lx::kMostNestedFormats) return LX_E_FORMAT;
-    const lx::TimeItem<Text> format(locale_, item, current_);
+    if (depth == kMostNestedFormats) return LX_E_FORMAT;
+    const TimeItem<Text> format(locale_, item, current_);
     return match(format.cursor(locale_), text, depth + 1);
   }
 
@@ -157,21 +149,21 @@ class TimeParser {
   bool read_word(const TimeDirective& directive, Cursor* text, int32_t* index) {
     Cursor longest = *text;
     for (int32_t i = 0; i < directive.items; ++i) {
-      const lx::TimeItem<Text> item(locale_, directive.first_item + i, current_);
+      const TimeItem<Text> item(locale_, directive.first_item + i, current_);
       Cursor at = *text;
       if (!passes(item, &at) || at.p <= longest.p) continue;
-      lx::go_on_at(longest, at);
+      go_on_at(longest, at);
       *index = i;
     }
     const bool found = longest.p != text->p;
-    lx::go_on_at(*text, longest);
+    go_on_at(*text, longest);
     return found;
   }
 
   /// Whether the text has an item's characters; `at` moves over them.
-  bool passes(const lx::TimeItem<Text>& item, Cursor* at) const {
+  bool passes(const TimeItem<Text>& item, Cursor* at) const {
     if constexpr (!Cursor::kShifts) {
-      if (item.count > lx::room(at->p, at->end)) return false;
+      if (item.count > room(at->p, at->end)) return false;
       if (memcmp(at->p, item.units, item.count * sizeof(Unit)) != 0) return false;
       at->p += item.count;
     } else {
@@ -208,8 +200,8 @@ int32_t parse_units(LXLocale* given, LXTime* time, const typename Text::Unit* te
   const Codepage& cp = codepage_of(call.codepage());
   int32_t code = LX_OK;
   const int32_t read =
-      parse_time<Text>(*call.locale(), time, Text::cursor(cp, text, lx::text_units(text, length)),
-                       Text::cursor(cp, format, lx::text_units(format, format_length)), flags, &code);
+      parse_time<Text>(*call.locale(), time, Text::cursor(cp, text, text_units(text, length)),
+                       Text::cursor(cp, format, text_units(format, format_length)), flags, &code);
   return call.end(code, read);
 }
 
@@ -223,15 +215,14 @@ int32_t parse_bytes(LXLocale* given, LXTime* time, const char* text, LXShiftStat
   const Codepage& cp = codepage_of(*locale.codepage);
   const bool characters = (flags & LX_CHARACTERS) != 0;
   int32_t code = LX_OK;
-  const int32_t read = lx::with_kind<uint8_t, lx::ClosedShiftSink>(cp, form, [&](auto kind) {
+  const int32_t read = with_kind<uint8_t, ClosedShiftSink>(cp, form, [&](auto kind) {
     using Text = decltype(kind);
-    const auto in = lx::given_text<Text>(cp, text, state, length, characters);
+    const auto in = given_text<Text>(cp, text, state, length, characters);
     const int32_t bytes = parse_time<Text>(
-        locale, time, in, lx::given_text<Text>(cp, format, format_state, format_length, characters), flags,
-        &code);
+        locale, time, in, given_text<Text>(cp, format, format_state, format_length, characters), flags, &code);
     if (bytes < 0 || !characters) return bytes;
     auto taken = Text::cursor(cp, in.p, static_cast<size_t>(bytes), state);
-    return static_cast<int32_t>(lx::pass_all(&taken));
+    return static_cast<int32_t>(pass_all(&taken));
   });
   return call.end(code, read);
 }
@@ -248,12 +239,12 @@ int32_t LXStringToTime(LXLocale* locale, LXTime* time, const char* text, int32_t
 
 int32_t LXStringToTimeW(LXLocale* locale, LXTime* time, const LXWChar* text, int32_t length,
                         const LXWChar* format, int32_t format_length, uint32_t flags) {
-  return parse_units<lx::WideKind>(locale, time, text, length, format, format_length, flags);
+  return parse_units<WideKind>(locale, time, text, length, format, format_length, flags);
 }
 
 int32_t LXStringToTimeU(LXLocale* locale, LXTime* time, const LXUChar* text, int32_t length,
                         const LXUChar* format, int32_t format_length, uint32_t flags) {
-  return parse_units<lx::UnicodeKind>(locale, time, text, length, format, format_length, flags);
+  return parse_units<UnicodeKind>(locale, time, text, length, format, format_length, flags);
 }
 
 int32_t LXStringToTimeEx(LXLocale* locale, LXTime* time, const char* text, LXShiftState state, int32_t length,

@@ -9,21 +9,14 @@
 #include "core/lxobjman.h"
 #include "locale/lxlocale.h"
 
-namespace {
+using namespace lx;
 
-using lx::bytes_of;
-using lx::Call;
-using lx::Codepage;
-using lx::codepage_of;
-using lx::Form;
-using lx::Item;
-using lx::ItemKind;
-using lx::TextKind;
+namespace {
 
 RAS1_Unit unit = RAS1_UNIT("lxitems");
 
-namespace language = lx::format::language;
-namespace territory = lx::format::territory;
+namespace language = format::language;
+namespace territory = format::territory;
 
 constexpr int32_t kItems = LX_ITEM_LOCALE_STRING + 1;
 
@@ -85,8 +78,8 @@ static_assert(__BYTE_ORDER__ == __ORDER_LITTLE_ENDIAN__,
 const char* default_name(const LXObject& language, size_t word) {
   constexpr int32_t kTypes[] = {LX_TERRITORY, LX_CODEPAGE, LX_SORT};
   const int32_t type = kTypes[word];
-  const uint16_t id = lx::payload_word(language, word);
-  if (type == LX_SORT && id == 0) return lx::name_of(nullptr);
+  const uint16_t id = payload_word(language, word);
+  if (type == LX_SORT && id == 0) return name_of(nullptr);
   int32_t rc = LX_OK;
   const LXObject* object = LXGetObjFromID(nullptr, type, id, LX_FIND_ONLY, &rc);
   return object != nullptr && object->disk.type == type ? object->disk.name : nullptr;
@@ -94,40 +87,40 @@ const char* default_name(const LXObject& language, size_t word) {
 
 /// The value of a number item; false for any other item.
 bool number_of(const LXLocale& locale, int32_t number, bool current, int32_t* value) {
-  const Item item = lx::item_of(number);
+  const Item item = item_of(number);
   const LXObject& land = *locale.territory;
   switch (item.kind) {
     case ItemKind::kObjectId: {
-      const LXObject* object = locale.*lx::kLocaleObjects[item.index];
+      const LXObject* object = locale.*kLocaleObjects[item.index];
       *value = object != nullptr ? object->disk.id : 0;
       return true;
     }
     case ItemKind::kNumber:
-      *value = current ? locale.numbers[item.index] : lx::payload_word(land, territory::kNumbers + item.index);
+      *value = current ? locale.numbers[item.index] : payload_word(land, territory::kNumbers + item.index);
       return true;
     case ItemKind::kFlag:
-      *value = (current ? locale.flags >> item.index
-                        : lx::payload_word(land, territory::kFlags) >> (item.index + 1)) &
-               1;
+      *value =
+          (current ? locale.flags >> item.index : payload_word(land, territory::kFlags) >> (item.index + 1)) &
+          1;
       return true;
     case ItemKind::kSignPosition:
       *value = current ? locale.sign_positions[item.index]
-                       : lx::payload_of(land)[2 * territory::kSignPositions + item.index];
+                       : payload_of(land)[2 * territory::kSignPositions + item.index];
       return true;
     case ItemKind::kTerritoryFlag:
-      *value = lx::payload_word(land, territory::kFlags) >> item.index & 1;
+      *value = payload_word(land, territory::kFlags) >> item.index & 1;
       return true;
     case ItemKind::kValue84:
-      *value = lx::payload_word(land, territory::kValue84);
+      *value = payload_word(land, territory::kValue84);
       return true;
     case ItemKind::kCodepageWidth:
       *value = codepage_of(*locale.codepage).width;
       return true;
     case ItemKind::kCodepageAscii:
-      *value = lx::keeps_ascii(locale);
+      *value = keeps_ascii(locale);
       return true;
     case ItemKind::kCodepageShift:
-      *value = (locale.flags & lx::kLocaleShift) != 0;
+      *value = (locale.flags & kLocaleShift) != 0;
       return true;
     default:
       return false;
@@ -148,7 +141,7 @@ ItemText find_text(const LXLocale& locale, int32_t number, bool current, bool un
     return {TextKind::kName, bytes_of(locale_string), strlen(locale_string), false};
   }
   ItemText found{};
-  found.one_unit = lx::item_of(number).kind == ItemKind::kSeparator;
+  found.one_unit = item_of(number).kind == ItemKind::kSeparator;
   const auto get = unicode ? LXLocaleGetTextItemU : LXLocaleGetTextItem;
   found.text = static_cast<const uint8_t*>(get(&locale, number, current, &found.kind));
   if (found.text == nullptr || found.kind == TextKind::kUnicode) return found;
@@ -165,20 +158,20 @@ bool read_text(const LXLocale& locale, const ItemText& from, Form form, int32_t*
   const Codepage& cp = codepage_of(*locale.codepage);
   if (from.kind == TextKind::kUnicode) {
     const uint8_t* const end = from.one_unit ? from.text + 2 : nullptr;
-    body(lx::PayloadCursor{from.text, end}, LXUChar{});
+    body(PayloadCursor{from.text, end}, LXUChar{});
     return true;
   }
   if (from.kind == TextKind::kCodepage) {
-    lx::with_cursor(cp, form, LX_SHIFT_SINGLE, from.text, from.bytes, [&](auto in) { body(in, Value{}); });
+    with_cursor(cp, form, LX_SHIFT_SINGLE, from.text, from.bytes, [&](auto in) { body(in, Value{}); });
     return true;
   }
-  if (lx::keeps_ascii(locale)) {
-    body(lx::SingleByteCursor{cp, from.text, from.text + from.bytes}, Value{});
+  if (keeps_ascii(locale)) {
+    body(SingleByteCursor{cp, from.text, from.text + from.bytes}, Value{});
     return true;
   }
-  const Codepage* common = lx::common_codepage(rc);
+  const Codepage* common = common_codepage(rc);
   if (common == nullptr) return false;
-  body(lx::SingleByteCursor{*common, from.text, from.text + from.bytes}, LXUChar{});
+  body(SingleByteCursor{*common, from.text, from.text + from.bytes}, LXUChar{});
   return true;
 }
 
@@ -192,24 +185,24 @@ int32_t get_text(LXLocale* given, int32_t number, Unit* buffer, int32_t size, in
   if (size <= 0) return call.exit(0);
   const LXLocale& locale = *call.locale();
   const bool current = (flags & LX_TERRITORY_VALUES) == 0;
-  char locale_string[lx::kLocaleStringBytes];
+  char locale_string[kLocaleStringBytes];
   const ItemText from = find_text(locale, number, current, !kDirect, locale_string);
   if (from.text == nullptr) return call.fail(LX_E_ITEM, -1);
 
   const bool by_chars = sizeof(Unit) == 1 && (flags & LX_CHARACTERS) != 0;
   const size_t most = static_cast<size_t>(from.one_unit && size > 2 ? 2 : size) - 1;  // without the null
-  Unit* const end = by_chars ? lx::no_end<Unit>() : lx::end_of(buffer, most);
+  Unit* const end = by_chars ? no_end<Unit>() : end_of(buffer, most);
   int32_t written = 0;
   int32_t rc = LX_OK;
   const bool read = read_text<kDirect>(locale, from, form, &rc, [&](auto in, auto value) {
     write(codepage_of(*locale.codepage), end, [&](auto out) {
-      const auto moved = lx::transfer<decltype(value)>(in, out, by_chars ? most : SIZE_MAX);
-      lx::close_text(out);
+      const auto moved = transfer<decltype(value)>(in, out, by_chars ? most : SIZE_MAX);
+      close_text(out);
       *out.p = 0;
       written = static_cast<int32_t>(by_chars ? moved.chars : static_cast<size_t>(out.p - buffer)) + 1;
     });
   });
-  return read ? call.exit(written) : call.fail(lx::search_code(rc), -1);
+  return read ? call.exit(written) : call.fail(search_code(rc), -1);
 }
 
 }  // namespace
@@ -228,35 +221,35 @@ const Codepage* common_codepage(int32_t* rc) {
 }  // namespace lx
 
 const void* LXLocaleGetTextItem(const LXLocale* locale, int32_t number, bool current, TextKind* kind) {
-  const Item item = lx::item_of(number);
+  const Item item = item_of(number);
   switch (item.kind) {
     case ItemKind::kObjectName:
       *kind = TextKind::kName;
-      return lx::name_of(locale->*lx::kLocaleObjects[item.index]);
+      return name_of(locale->*kLocaleObjects[item.index]);
     case ItemKind::kDefaultName:
       *kind = TextKind::kName;
       return default_name(*locale->language, item.index);
     case ItemKind::kLanguageText:
       *kind = TextKind::kUnicode;
-      return lx::payload_text(*locale->language, item.index);
+      return payload_text(*locale->language, item.index);
     case ItemKind::kTerritoryText:
       *kind = TextKind::kUnicode;
-      return lx::payload_text(*locale->territory, item.index);
+      return payload_text(*locale->territory, item.index);
     case ItemKind::kSeparator:
       *kind = current ? TextKind::kCodepage : TextKind::kUnicode;
       if (current) return &locale->separators[item.index];
-      return lx::payload_of(*locale->territory) + 2 * (territory::kSeparators + item.index);
+      return payload_of(*locale->territory) + 2 * (territory::kSeparators + item.index);
     case ItemKind::kText:
       *kind = current ? TextKind::kCodepage : TextKind::kUnicode;
       if (current) return locale->texts[item.index];
-      return lx::payload_text(*locale->territory, lx::kTextWords[item.index]);
+      return payload_text(*locale->territory, kTextWords[item.index]);
     default:
       return nullptr;
   }
 }
 
 const void* LXLocaleGetTextItemU(const LXLocale* locale, int32_t number, bool current, TextKind* kind) {
-  const Item item = lx::item_of(number);
+  const Item item = item_of(number);
   const bool copied = item.kind == ItemKind::kSeparator || item.kind == ItemKind::kText;
   if (!copied || !current) return LXLocaleGetTextItem(locale, number, current, kind);
   *kind = TextKind::kUnicode;
@@ -265,8 +258,8 @@ const void* LXLocaleGetTextItemU(const LXLocale* locale, int32_t number, bool cu
 }
 
 char* LXLocaleGetLocaleString(const LXLocale* locale, char* buffer) {
-  snprintf(buffer, lx::kLocaleStringBytes, "%s_%s.%s@%s", lx::name_of(locale->language),
-           lx::name_of(locale->territory), lx::name_of(locale->codepage), lx::name_of(locale->sort));
+  snprintf(buffer, kLocaleStringBytes, "%s_%s.%s@%s", name_of(locale->language), name_of(locale->territory),
+           name_of(locale->codepage), name_of(locale->sort));
   return buffer;
 }
 
@@ -285,32 +278,32 @@ int32_t LXGetLocaleNumInfo(LXLocale* given, int32_t item, int32_t flags) {
 int32_t LXGetLocaleTextInfo(LXLocale* locale, int32_t item, char* buffer, int32_t size, int32_t flags) {
   return get_text<true>(locale, item, bytes_of(buffer), size, flags, Form::kPlain,
                         [&](const Codepage& cp, uint8_t* end, auto body) {
-                          lx::with_sink(cp, Form::kPlain, LX_SHIFT_SINGLE, bytes_of(buffer), end, body);
+                          with_sink(cp, Form::kPlain, LX_SHIFT_SINGLE, bytes_of(buffer), end, body);
                         });
 }
 
 int32_t LXGetLocaleTextInfoW(LXLocale* locale, int32_t item, LXWChar* buffer, int32_t size, int32_t flags) {
   return get_text<true>(locale, item, buffer, size, flags, Form::kEx,
                         [&](const Codepage& cp, LXWChar* end, auto body) {
-                          body(lx::CodeSink{cp, buffer, end});
+                          body(CodeSink{cp, buffer, end});
                         });
 }
 
 int32_t LXGetLocaleTextInfoU(LXLocale* locale, int32_t item, LXUChar* buffer, int32_t size, int32_t flags) {
   return get_text<false>(locale, item, buffer, size, flags, Form::kEx,
                          [&](const Codepage&, LXUChar* end, auto body) {
-                           body(lx::UnicodeSink{buffer, end});
+                           body(UnicodeSink{buffer, end});
                          });
 }
 
 int32_t LXGetLocaleTextInfoEx(LXLocale* locale, int32_t item, char* buffer, LXShiftState state, int32_t size,
                               int32_t flags) {
-  const LXLocale* used = lx::locale_of(locale);
+  const LXLocale* used = locale_of(locale);
   if (used == nullptr || !codepage_of(*used->codepage).shift_sensitive)
     return LXGetLocaleTextInfo(locale, item, buffer, size, flags);
   return get_text<true>(locale, item, bytes_of(buffer), size, flags, Form::kEx,
                         [&](const Codepage& cp, uint8_t* end, auto body) {
-                          body(lx::ClosedShiftSink{cp, bytes_of(buffer), end, state});
+                          body(ClosedShiftSink{cp, bytes_of(buffer), end, state});
                         });
 }
 

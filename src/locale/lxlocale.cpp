@@ -8,9 +8,9 @@
 #include "core/lxmemory.h"
 #include "core/lxobjman.h"
 
-namespace {
+using namespace lx;
 
-using lx::Events;
+namespace {
 
 RAS1_Unit unit = RAS1_UNIT("lxlocale");
 
@@ -76,7 +76,7 @@ LXObject* find_or_default(int32_t type, const Part<Unit>& part, const LXObject& 
     LXObject* object = find(type, part, rc);
     if (*rc != LX_E_NOT_FOUND || (flags & LX_FALLBACK) == 0) return object;
   }
-  return lx::object_by_id(type, lx::le16(lx::payload_of(language) + 2 * default_word), rc);
+  return object_by_id(type, le16(payload_of(language) + 2 * default_word), rc);
 }
 
 /// The result of a look-up as a code of locale creation: an object may come with a code when built-in data took
@@ -90,7 +90,7 @@ int32_t lookup_code(const LXObject* object, int32_t rc, int32_t not_found) {
 /// Finds the four objects of a locale.
 template <class Unit>
 int32_t find_objects(LXLocale* locale, const LocaleName<Unit>& name, int32_t flags) {
-  namespace words = lx::format::language;
+  namespace words = format::language;
   int32_t rc = LX_E_NOT_FOUND;
   const bool is_default = !name.language.named;
   if (!is_default) locale->language = find(LX_LANGUAGE, name.language, &rc);
@@ -124,9 +124,9 @@ int32_t find_objects(LXLocale* locale, const LocaleName<Unit>& name, int32_t fla
 template <class Unit>
 int32_t build(LXLocale* locale, const LocaleName<Unit>& name, int32_t flags) {
   if (const int32_t code = find_objects(locale, name, flags)) return code;
-  lx::set_codepage_flags(locale);
-  lx::set_sort(locale, locale->sort);
-  const int32_t code = lx::set_modifiable(locale);
+  set_codepage_flags(locale);
+  set_sort(locale, locale->sort);
+  const int32_t code = set_modifiable(locale);
   if (code != LX_OK) LX_TRACE(unit, RAS1_LEVEL_ERRORS, "Unable to set modifiable values, err = %d", code);
   return code;
 }
@@ -134,32 +134,32 @@ int32_t build(LXLocale* locale, const LocaleName<Unit>& name, int32_t flags) {
 /// Creates a locale; null with a code.
 template <class Unit>
 LXLocale* create(const Unit* name, size_t units, int32_t flags, int32_t* rc) {
-  auto* locale = static_cast<LXLocale*>(lx::hook_allocate_zeroed(sizeof(LXLocale)));
+  auto* locale = static_cast<LXLocale*>(hook_allocate_zeroed(sizeof(LXLocale)));
   *rc = LX_E_MEMORY;
   if (locale == nullptr) return nullptr;
   *rc = build(locale, LocaleName<Unit>(name, units), flags);
   if (*rc == LX_OK) return locale;
-  lx::free_locale(locale);
+  free_locale(locale);
   return nullptr;
 }
 
 /// Creates the user's locale. One that the system's environment asks for has the system's conventions.
 LXLocale* create_for_user(int32_t flags, int32_t* rc) {
-  char name[lx::kUserNameBytes];
-  const lx::UserLocale from = lx::get_user_locale(name, sizeof(name));
+  char name[kUserNameBytes];
+  const UserLocale from = get_user_locale(name, sizeof(name));
   *rc = LX_E_NO_NATIVE;
-  if (from == lx::UserLocale::kFailed) return nullptr;
+  if (from == UserLocale::kFailed) return nullptr;
   LXLocale* locale = create(name, strnlen(name, sizeof(name)), flags, rc);
-  if (locale == nullptr || from == lx::UserLocale::kVariable) return locale;
-  *rc = lx::map_native_info("", locale);
+  if (locale == nullptr || from == UserLocale::kVariable) return locale;
+  *rc = map_native_info("", locale);
   if (*rc == LX_OK) return locale;
-  lx::free_locale(locale);
+  free_locale(locale);
   return nullptr;
 }
 
 LXLocale* create_from_bytes(const char* name, int32_t flags, int32_t* rc) {
   *rc = LX_E_NOT_INITIALIZED;
-  if (!lx::initialized()) return nullptr;
+  if (!initialized()) return nullptr;
   *rc = LX_E_INVALID;
   if ((flags & ~kCreateFlags) != 0) return nullptr;
   if ((flags & LX_USER_LOCALE) != 0) return create_for_user(flags, rc);
@@ -173,9 +173,9 @@ int32_t install(Create create_locale) {
   int32_t rc = LX_OK;
   LXLocale* locale = create_locale(&rc);
   if (locale == nullptr) return events.exit(rc);
-  LXLocale* previous = lx::globals.default_locale;
-  lx::globals.default_locale = locale;
-  lx::globals.release_default = LXReleaseLocale;
+  LXLocale* previous = globals.default_locale;
+  globals.default_locale = locale;
+  globals.release_default = LXReleaseLocale;
   if (previous != nullptr) LXReleaseLocale(previous);
   return events.exit(LX_OK);
 }
@@ -184,7 +184,7 @@ int32_t install(Create create_locale) {
 template <class Visit>
 int32_t enumerate(Visit visit) {
   Events events(unit);
-  const LXObjManager* manager = lx::manager_of(nullptr);
+  const LXObjManager* manager = manager_of(nullptr);
   if (manager == nullptr) return events.exit(LX_OK);
   for (uint16_t i = 0; i < manager->count; ++i)
     if (visit(manager->entries[i].disk) == 0) break;
@@ -247,9 +247,9 @@ LXLocale* LXGetLocale(const char* name, int32_t flags, int32_t* rc) {
 LXLocale* LXGetLocaleW(const LXWChar* name, int32_t flags, int32_t* rc) {
   if ((flags & LX_USER_LOCALE) != 0 || name == nullptr) return LXGetLocale(nullptr, flags, rc);
   Events events(unit);
-  int32_t code = lx::initialized() ? LX_E_INVALID : LX_E_NOT_INITIALIZED;
+  int32_t code = initialized() ? LX_E_INVALID : LX_E_NOT_INITIALIZED;
   LXLocale* locale = nullptr;
-  if (lx::initialized() && (flags & ~kCreateFlags) == 0) {
+  if (initialized() && (flags & ~kCreateFlags) == 0) {
     size_t units = 0;
     while (name[units] != 0) ++units;
     locale = create(name, units, flags, &code);
@@ -260,10 +260,10 @@ LXLocale* LXGetLocaleW(const LXWChar* name, int32_t flags, int32_t* rc) {
 
 LXLocale* LXGetLocaleU(const LXUChar* name, int32_t flags, int32_t* rc) {
   Events events(unit);
-  if (!lx::initialized() || name == nullptr) return events.exit(LXGetLocale(nullptr, flags, rc));
+  if (!initialized() || name == nullptr) return events.exit(LXGetLocale(nullptr, flags, rc));
   size_t units = 0;
   while (name[units] != 0) ++units;
-  const lx::WorkBuffer narrow(units * lx::kMaxCharBytes + 1);
+  const WorkBuffer narrow(units * kMaxCharBytes + 1);
   if (!narrow) {
     if (rc != nullptr) *rc = LX_E_MEMORY;
     return events.exit(static_cast<LXLocale*>(nullptr));
@@ -274,9 +274,9 @@ LXLocale* LXGetLocaleU(const LXUChar* name, int32_t flags, int32_t* rc) {
 
 int32_t LXReleaseLocale(LXLocale* locale) {
   Events events(unit);
-  if (!lx::initialized()) return events.exit(1);
+  if (!initialized()) return events.exit(1);
   if (locale == nullptr) return events.exit(LX_OK);
-  return events.exit(lx::free_locale(locale) ? LX_OK : 1);
+  return events.exit(free_locale(locale) ? LX_OK : 1);
 }
 
 int32_t LXSetLocale(const char* name, int32_t flags) {
@@ -290,7 +290,7 @@ int32_t LXSetLocaleU(const LXUChar* name, int32_t flags) {
 }
 
 int32_t LXConvertLocale(LXLocale* given, char* buffer, int32_t flags) {
-  lx::Call call(unit, given);
+  Call call(unit, given);
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, 0);
   if ((flags & ~(LX_TERRITORY_VALUES | LX_FALLBACK)) != 0) return call.fail(LX_E_INVALID, 0);
   const LXLocale* locale = call.locale();

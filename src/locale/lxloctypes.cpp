@@ -2,28 +2,30 @@
 // UnitedStates, in force without a locale directory and laid out at compile time from their texts.
 #include "locale/lxlocale.h"
 
+using namespace lx;
+
 namespace {
 
-namespace language = lx::format::language;
-namespace territory = lx::format::territory;
+namespace language = format::language;
+namespace territory = format::territory;
 
 /// The words and texts of a payload that is being validated.
 class TextPayload {
  public:
-  explicit TextPayload(lx::Bytes payload) : payload_(payload) {}
+  explicit TextPayload(Bytes payload) : payload_(payload) {}
 
-  size_t word(size_t number) const { return lx::le16(payload_.data + 2 * number); }
+  size_t word(size_t number) const { return le16(payload_.data + 2 * number); }
 
   /// Whether a null-terminated text at `offset` ends before `end`.
   bool text_ends(size_t offset, size_t end) const {
     for (; offset + 2 <= end; offset += 2)
-      if (lx::le16(payload_.data + offset) == 0) return true;
+      if (le16(payload_.data + offset) == 0) return true;
     return false;
   }
-  lx::Fault check_texts(size_t first_word, size_t last_word) const {
+  Fault check_texts(size_t first_word, size_t last_word) const {
     for (size_t number = first_word; number <= last_word; ++number)
       if (!text_ends(word(number), payload_.size))
-        return lx::corrupt("a text does not end inside the payload", 2 * number);
+        return corrupt("a text does not end inside the payload", 2 * number);
     return {};
   }
   bool holds_specials(size_t count_word, size_t table_word) const {
@@ -31,38 +33,36 @@ class TextPayload {
   }
 
  private:
-  lx::Bytes payload_;
+  Bytes payload_;
 };
 
-lx::Fault validate_language(uint16_t, const lx::Sections& sections) {
-  const lx::Bytes bytes = sections.section[0];
-  if (!bytes.holds(0, language::kHeaderBytes))
-    return lx::corrupt("the payload is shorter than its 51 words", 0);
+Fault validate_language(uint16_t, const Sections& sections) {
+  const Bytes bytes = sections.section[0];
+  if (!bytes.holds(0, language::kHeaderBytes)) return corrupt("the payload is shorter than its 51 words", 0);
   const TextPayload payload(bytes);
-  if (const lx::Fault fault = payload.check_texts(language::kFirstText, language::kLastText)) return fault;
+  if (const Fault fault = payload.check_texts(language::kFirstText, language::kLastText)) return fault;
   if (!payload.holds_specials(language::kUpperSpecials, language::kUpperSpecialTable))
-    return lx::corrupt("the special mappings to upper case lie outside the payload",
-                       2 * language::kUpperSpecialTable);
+    return corrupt("the special mappings to upper case lie outside the payload",
+                   2 * language::kUpperSpecialTable);
   if (!payload.holds_specials(language::kLowerSpecials, language::kLowerSpecialTable))
-    return lx::corrupt("the special mappings to lower case lie outside the payload",
-                       2 * language::kLowerSpecialTable);
+    return corrupt("the special mappings to lower case lie outside the payload",
+                   2 * language::kLowerSpecialTable);
   return {};
 }
 
-lx::Fault validate_territory(uint16_t, const lx::Sections& sections) {
+Fault validate_territory(uint16_t, const Sections& sections) {
   // Texts that a locale copies are taken to end where the next one begins; the others only have to end.
   constexpr size_t kCopied[] = {13, 14, 15, 17, 18, 19, 20, 21};
-  const lx::Bytes bytes = sections.section[0];
-  if (!bytes.holds(0, territory::kHeaderBytes))
-    return lx::corrupt("the payload is shorter than its 23 words", 0);
+  const Bytes bytes = sections.section[0];
+  if (!bytes.holds(0, territory::kHeaderBytes)) return corrupt("the payload is shorter than its 23 words", 0);
   const TextPayload payload(bytes);
-  if (const lx::Fault fault = payload.check_texts(territory::kFirstText, territory::kLastText)) return fault;
+  if (const Fault fault = payload.check_texts(territory::kFirstText, territory::kLastText)) return fault;
   if (payload.word(territory::kPayloadBytes) > bytes.size)
-    return lx::corrupt("word 22 is larger than the payload", 2 * territory::kPayloadBytes);
+    return corrupt("word 22 is larger than the payload", 2 * territory::kPayloadBytes);
   for (size_t number : kCopied)
     if (payload.word(number + 1) > bytes.size ||
         !payload.text_ends(payload.word(number), payload.word(number + 1)))
-      return lx::corrupt("a text does not end before the next one begins", 2 * number);
+      return corrupt("a text does not end before the next one begins", 2 * number);
   return {};
 }
 
@@ -74,11 +74,11 @@ struct Payload {
 
   constexpr explicit Payload(size_t header_bytes) : used(header_bytes) {}
 
-  constexpr void word(size_t number, uint16_t value) { lx::put_le16(bytes + 2 * number, value); }
+  constexpr void word(size_t number, uint16_t value) { put_le16(bytes + 2 * number, value); }
   constexpr void text(size_t number, const char* ascii) {
     word(number, static_cast<uint16_t>(used));
     do {
-      lx::put_le16(bytes + used, static_cast<uint8_t>(*ascii));
+      put_le16(bytes + used, static_cast<uint8_t>(*ascii));
       used += 2;
     } while (*ascii++ != '\0');
   }

@@ -7,25 +7,19 @@
 #include "core/lxmemory.h"
 #include "locale/lxlocale.h"
 
-namespace {
+using namespace lx;
 
-using lx::bytes_of;
-using lx::Call;
-using lx::changed_bit;
-using lx::Codepage;
-using lx::codepage_of;
-using lx::Form;
-using lx::ItemKind;
+namespace {
 
 RAS1_Unit unit = RAS1_UNIT("lxmodify");
 
-namespace territory = lx::format::territory;
+namespace territory = format::territory;
 
 constexpr size_t kCurrencyText = 1;
 
 /// The 16-bit units of a text with its null.
 size_t units_of(const uint8_t* text) {
-  lx::PayloadCursor in{text, nullptr};
+  PayloadCursor in{text, nullptr};
   size_t units = 1;
   for (LXUChar u = 0; in.next(&u);) ++units;
   return units;
@@ -33,19 +27,18 @@ size_t units_of(const uint8_t* text) {
 
 /// Frees the codepage texts of one record that another does not use.
 void LXLocaleFreeOldText(const LXLocale& kept, LXLocale& dropped) {
-  for (size_t i = 0; i < lx::kTexts; ++i)
-    if (dropped.texts[i] != kept.texts[i]) lx::hook_free(dropped.texts[i]);
+  for (size_t i = 0; i < kTexts; ++i)
+    if (dropped.texts[i] != kept.texts[i]) hook_free(dropped.texts[i]);
 }
 
 /// Converts a text from one codepage to another, shift bytes and null included: the bytes written.
 size_t LXLocaleCnvText(const Codepage& from, const Codepage& to, const char* text, char* output) {
-  return lx::with_cursor(from, Form::kEx, LX_SHIFT_SINGLE, bytes_of(text), strlen(text), [&](auto in) {
-    return lx::with_sink(to, Form::kEx, LX_SHIFT_SINGLE, bytes_of(output), lx::no_end<uint8_t>(),
-                         [&](auto out) {
-                           lx::transfer<LXUChar>(in, out, SIZE_MAX);
-                           out.put(LXUChar{0});
-                           return static_cast<size_t>(out.p - bytes_of(output));
-                         });
+  return with_cursor(from, Form::kEx, LX_SHIFT_SINGLE, bytes_of(text), strlen(text), [&](auto in) {
+    return with_sink(to, Form::kEx, LX_SHIFT_SINGLE, bytes_of(output), no_end<uint8_t>(), [&](auto out) {
+      transfer<LXUChar>(in, out, SIZE_MAX);
+      out.put(LXUChar{0});
+      return static_cast<size_t>(out.p - bytes_of(output));
+    });
   });
 }
 
@@ -53,26 +46,25 @@ void fill_numbers(LXLocale* locale, const LXObject& land) {
   const auto free_to_fill = [&](ItemKind kind, size_t i) {
     return (locale->changed & changed_bit(kind, i)) == 0;
   };
-  for (size_t i = 0; i < lx::kNumbers; ++i)
-    if (free_to_fill(ItemKind::kNumber, i))
-      locale->numbers[i] = lx::payload_word(land, territory::kNumbers + i);
-  const unsigned flags = lx::payload_word(land, territory::kFlags) >> 1;
-  for (size_t i = 0; i < lx::kFlags; ++i)
+  for (size_t i = 0; i < kNumbers; ++i)
+    if (free_to_fill(ItemKind::kNumber, i)) locale->numbers[i] = payload_word(land, territory::kNumbers + i);
+  const unsigned flags = payload_word(land, territory::kFlags) >> 1;
+  for (size_t i = 0; i < kFlags; ++i)
     if (free_to_fill(ItemKind::kFlag, i))
       locale->flags = static_cast<uint16_t>((locale->flags & ~(1u << i)) | (flags & 1u << i));
-  for (size_t i = 0; i < lx::kSignPositions; ++i)
+  for (size_t i = 0; i < kSignPositions; ++i)
     if (free_to_fill(ItemKind::kSignPosition, i))
-      locale->sign_positions[i] = lx::payload_of(land)[2 * territory::kSignPositions + i];
+      locale->sign_positions[i] = payload_of(land)[2 * territory::kSignPositions + i];
 }
 
 /// A separator without a single byte in the codepage keeps the byte that it had.
 void fill_separators(LXLocale* locale, const LXObject& land) {
   const Codepage& cp = codepage_of(*locale->codepage);
-  for (size_t i = 0; i < lx::kSeparators; ++i) {
+  for (size_t i = 0; i < kSeparators; ++i) {
     if ((locale->changed & changed_bit(ItemKind::kSeparator, i)) != 0) continue;
-    const LXUChar u = lx::payload_word(land, territory::kSeparators + i);
+    const LXUChar u = payload_word(land, territory::kSeparators + i);
     locale->separators_unicode[i] = u;
-    const uint32_t code = lx::unicode_to_code(cp, u);
+    const uint32_t code = unicode_to_code(cp, u);
     if (code <= 0xFF) locale->separators[i] = static_cast<uint8_t>(code);
   }
 }
@@ -81,19 +73,18 @@ void fill_separators(LXLocale* locale, const LXObject& land) {
 bool fill_text(LXLocale* locale, const uint8_t* text, size_t i) {
   const Codepage& cp = codepage_of(*locale->codepage);
   const size_t units = units_of(text);
-  const size_t bytes = lx::most_text_bytes(cp, units);
-  lx::HookPtr<char> narrow(static_cast<char*>(lx::hook_allocate(bytes)));
+  const size_t bytes = most_text_bytes(cp, units);
+  HookPtr<char> narrow(static_cast<char*>(hook_allocate(bytes)));
   if (!narrow)
     LX_TRACE(unit, RAS1_LEVEL_ERRORS, "Unable to allocate %d bytes, (%d * %d)", static_cast<int>(bytes),
              static_cast<int>(units), static_cast<int>(bytes / units));
-  lx::HookPtr<LXUChar> wide(narrow ? static_cast<LXUChar*>(lx::hook_allocate(sizeof(LXUChar) * units))
-                                   : nullptr);
+  HookPtr<LXUChar> wide(narrow ? static_cast<LXUChar*>(hook_allocate(sizeof(LXUChar) * units)) : nullptr);
   if (narrow && !wide)
     LX_TRACE(unit, RAS1_LEVEL_ERRORS, "Unable to allocate %d bytes, (%d * %d)",
              static_cast<int>(sizeof(LXUChar) * units), static_cast<int>(units),
              static_cast<int>(sizeof(LXUChar)));
   if (!wide) return false;
-  lx::store_text(cp, text, bytes_of(narrow.get()));
+  store_text(cp, text, bytes_of(narrow.get()));
   memcpy(wide.get(), text, sizeof(LXUChar) * units);
   locale->texts[i] = narrow.detach();
   locale->texts_unicode[i] = wide.detach();
@@ -107,22 +98,22 @@ bool fill_text(LXLocale* locale, const uint8_t* text, size_t i) {
 int32_t convert_values(LXLocale* locale, const Codepage& from, const LXLocale& saved) {
   const Codepage& to = codepage_of(*locale->codepage);
   for (uint8_t& separator : locale->separators) {
-    const uint32_t code = lx::unicode_to_code(to, from.unicode[separator]);
+    const uint32_t code = unicode_to_code(to, from.unicode[separator]);
     if (code > 0xFF) return LX_E_SEPARATOR;
     separator = static_cast<uint8_t>(code);
   }
-  for (size_t i = 0; i < lx::kTexts; ++i) {
+  for (size_t i = 0; i < kTexts; ++i) {
     const char* old = saved.texts[i];
-    char* large = static_cast<char*>(lx::hook_allocate(lx::most_text_bytes(to, strlen(old) + 1)));
+    char* large = static_cast<char*>(hook_allocate(most_text_bytes(to, strlen(old) + 1)));
     if (large == nullptr) return LX_E_MEMORY;
     locale->texts[i] = large;
     const size_t bytes = LXLocaleCnvText(from, to, old, large);
     // Without memory for the exact copy the larger block stays.
-    char* exact = static_cast<char*>(lx::hook_allocate(bytes));
+    char* exact = static_cast<char*>(hook_allocate(bytes));
     if (exact == nullptr) continue;
     memcpy(exact, large, bytes);
     locale->texts[i] = exact;
-    lx::hook_free(large);
+    hook_free(large);
   }
   return LX_OK;
 }
@@ -210,7 +201,7 @@ extern "C" {
 int32_t LXLocaleSetModifiable(LXLocale* given) {
   Call call(unit, given);
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, LX_E_NOT_INITIALIZED);
-  const int32_t code = lx::change_territory(call.locale(), call.locale()->territory);
+  const int32_t code = change_territory(call.locale(), call.locale()->territory);
   return call.end(code, code);
 }
 
@@ -218,7 +209,7 @@ int32_t LXLocaleChangeTerritory(LXLocale* given, LXObject* land) {
   Call call(unit, given);
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, LX_E_NOT_INITIALIZED);
   if (!is_loaded(land, LX_TERRITORY)) return call.fail(LX_E_NOT_FOUND, LX_E_NOT_FOUND);
-  const int32_t code = lx::change_territory(call.locale(), land);
+  const int32_t code = change_territory(call.locale(), land);
   return call.end(code, code);
 }
 
@@ -226,7 +217,7 @@ int32_t LXLocaleChangeCodePage(LXLocale* given, LXObject* codepage) {
   Call call(unit, given);
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, LX_E_NOT_INITIALIZED);
   if (!is_loaded(codepage, LX_CODEPAGE)) return call.fail(LX_E_NOT_FOUND, LX_E_NOT_FOUND);
-  const int32_t code = lx::change_codepage(call.locale(), codepage);
+  const int32_t code = change_codepage(call.locale(), codepage);
   return call.end(code, code);
 }
 

@@ -11,9 +11,9 @@
 #include "core/lxmemory.h"
 #include "locale/lxlocale.h"
 
-namespace {
+using namespace lx;
 
-using lx::Call;
+namespace {
 
 RAS1_Unit unit = RAS1_UNIT("lxnative");
 
@@ -48,7 +48,7 @@ class SystemLocale {
   bool saved() const { return saved_; }
 
  private:
-  lx::GlobalLock lock_;
+  GlobalLock lock_;
   bool saved_;
   size_t bytes_;
   char name_[kMostSavedBytes];
@@ -94,7 +94,7 @@ int32_t copy_grouping(LXLocale* locale, int32_t item, const char* sizes) {
   constexpr size_t kMostSizeBytes = 4;
   constexpr int kAllOnes = 0xFF;  // CHAR_MAX where char is unsigned
   if (*sizes == '\0') return LX_OK;
-  char text[lx::kUserNameBytes];
+  char text[kUserNameBytes];
   size_t bytes = 0;
   for (; bytes + kMostSizeBytes < sizeof(text); ++sizes) {
     const int size = static_cast<unsigned char>(*sizes);
@@ -102,22 +102,22 @@ int32_t copy_grouping(LXLocale* locale, int32_t item, const char* sizes) {
     bytes += static_cast<size_t>(snprintf(text + bytes, sizeof(text) - bytes, "%d;", size));
   }
   text[bytes++] = '0';
-  if (!lx::keeps_ascii(*locale))
+  if (!keeps_ascii(*locale))
     for (size_t i = 0; i < bytes; ++i)
-      text[i] = static_cast<char>(
-          lx::unicode_to_code(lx::codepage_of(*locale->codepage), static_cast<uint8_t>(text[i])));
-  return lx::set_item_text(locale, item, text, bytes);
+      text[i] =
+          static_cast<char>(unicode_to_code(codepage_of(*locale->codepage), static_cast<uint8_t>(text[i])));
+  return set_item_text(locale, item, text, bytes);
 }
 
 /// Whether a system locale's text is in the codepage of a locale, by what its name maps to.
 bool same_codepage(const char* native_name, const LXLocale& locale) {
-  char mapped[lx::kUserNameBytes];
+  char mapped[kUserNameBytes];
   LXMapNativeLocale(native_name, mapped, sizeof(mapped));
   char* end = strchr(mapped, '@');
   if (end == nullptr) return false;
   *end = '\0';
   const char* dot = strrchr(mapped, '.');
-  const char* name = lx::name_of(locale.codepage);
+  const char* name = name_of(locale.codepage);
   return dot != nullptr && strlen(dot + 1) == strlen(name) && LXmemicmp(dot + 1, name, strlen(name)) == 0;
 }
 
@@ -133,7 +133,7 @@ int32_t copy_texts(LXLocale* locale, const lconv& system) {
     if (strlen(separator.text) != 1) continue;
     const auto byte = static_cast<uint8_t>(*separator.text);
     locale->separators[separator.index] = byte;
-    locale->separators_unicode[separator.index] = lx::codepage_of(*locale->codepage).unicode[byte];
+    locale->separators_unicode[separator.index] = codepage_of(*locale->codepage).unicode[byte];
   }
   const struct {
     int32_t item;
@@ -143,7 +143,7 @@ int32_t copy_texts(LXLocale* locale, const lconv& system) {
                {LX_ITEM_NEGATIVE_SIGN, system.negative_sign}};
   for (const auto& text : texts) {
     if (*text.text == '\0') continue;
-    if (const int32_t code = lx::set_item_text(locale, text.item, text.text, strlen(text.text))) return code;
+    if (const int32_t code = set_item_text(locale, text.item, text.text, strlen(text.text))) return code;
   }
   return LX_OK;
 }
@@ -184,23 +184,23 @@ int32_t map_native_info(const char* native_name, LXLocale* locale) {
 extern "C" {
 
 int32_t LXGetUserLocale(char* buffer, int32_t size) {
-  lx::Events events(unit);
-  if (!lx::initialized() || size <= 0) return events.exit(0);
-  return events.exit(static_cast<int32_t>(lx::get_user_locale(buffer, static_cast<size_t>(size))));
+  Events events(unit);
+  if (!initialized() || size <= 0) return events.exit(0);
+  return events.exit(static_cast<int32_t>(get_user_locale(buffer, static_cast<size_t>(size))));
 }
 
 void LXMapNativeInfo(const char* native_name, LXLocale* given) {
   Call call(unit, given);
   if (!call) return;
-  call.fail(lx::map_native_info(native_name != nullptr ? native_name : "", call.locale()), 0);
+  call.fail(map_native_info(native_name != nullptr ? native_name : "", call.locale()), 0);
 }
 
 LXLocale* LXConvertNativeLocale(const char* native_name, int32_t flags, int32_t* rc) {
-  lx::Events events(unit);
+  Events events(unit);
   LXLocale* locale = nullptr;
   int32_t code = LX_E_INVALID;
   if ((flags & ~(LX_TERRITORY_VALUES | LX_FALLBACK)) == 0) {
-    char name[lx::kUserNameBytes];
+    char name[kUserNameBytes];
     LXMapNativeLocale(native_name, name, sizeof(name));
     locale = LXGetLocale(name, flags & LX_FALLBACK, &code);
   }

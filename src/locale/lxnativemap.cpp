@@ -5,6 +5,8 @@
 #include "core/lxtrace.h"
 #include "lx.h"
 
+using namespace lx;
+
 namespace {
 
 RAS1_Unit unit = RAS1_UNIT("lxnativemap");
@@ -149,7 +151,7 @@ char* map_composite(const char* name, char* buffer, int32_t size) {
 extern "C" {
 
 char* LXMapNativeLocale(const char* name, char* buffer, int32_t size) {
-  lx::Events events(unit);
+  Events events(unit);
   if (name == nullptr) name = "";
   if (strchr(name, ';') != nullptr) return events.exit(map_composite(name, buffer, size));
   LX_TRACE(unit, RAS1_LEVEL_DETAIL, "Searching for %s", name);
@@ -160,7 +162,7 @@ char* LXMapNativeLocale(const char* name, char* buffer, int32_t size) {
 }
 
 int32_t LXEnumNativeLocales(LXNativeCallback callback, void* user) {
-  lx::Events events(unit);
+  Events events(unit);
   for (const Family& family : kFamilies)
     for (const Form& form : family.forms) {
       if (form.suffix == nullptr) continue;

@@ -8,17 +8,9 @@
 #include "core/lxobjman.h"
 #include "locale/lxlocale.h"
 
-namespace {
+using namespace lx;
 
-using lx::bytes_of;
-using lx::Call;
-using lx::changed_bit;
-using lx::changed_unicode_bit;
-using lx::Codepage;
-using lx::codepage_of;
-using lx::Form;
-using lx::Item;
-using lx::ItemKind;
+namespace {
 
 RAS1_Unit unit = RAS1_UNIT("lxsetitems");
 
@@ -43,11 +35,11 @@ int32_t install_object(LXLocale* locale, int32_t type, LXObject* object) {
       locale->language = object;
       return LX_OK;
     case LX_TERRITORY:
-      return lx::change_territory(locale, object);
+      return change_territory(locale, object);
     case LX_CODEPAGE:
-      return object == locale->codepage ? LX_OK : lx::change_codepage(locale, object);
+      return object == locale->codepage ? LX_OK : change_codepage(locale, object);
     default:
-      lx::set_sort(locale, object);
+      set_sort(locale, object);
       return LX_OK;
   }
 }
@@ -55,8 +47,8 @@ int32_t install_object(LXLocale* locale, int32_t type, LXObject* object) {
 int32_t set_object_by_id(LXLocale* locale, int32_t type, int32_t id) {
   if (id < 0 || id > UINT16_MAX) return LX_E_NOT_FOUND;
   int32_t rc = LX_OK;
-  LXObject* object = lx::object_by_id(type, static_cast<uint16_t>(id), &rc);
-  if (object == nullptr && rc != LX_OK) return lx::search_code(rc);
+  LXObject* object = object_by_id(type, static_cast<uint16_t>(id), &rc);
+  if (object == nullptr && rc != LX_OK) return search_code(rc);
   return install_object(locale, type, object);
 }
 
@@ -64,11 +56,11 @@ int32_t set_object_by_id(LXLocale* locale, int32_t type, int32_t id) {
 int32_t name_to_ascii(const Codepage& cp, const NewText& text, size_t count, char* name, size_t* length) {
   if (cp.shift_sensitive && memchr(text.bytes, cp.shift_out, count) != nullptr) return LX_E_NOT_FOUND;
   int32_t rc = LX_OK;
-  const Codepage* common = lx::common_codepage(&rc);
-  if (common == nullptr) return lx::search_code(rc);
-  lx::SingleByteSink out{*common, bytes_of(name), bytes_of(name) + kMostNameBytes};
-  lx::with_cursor(cp, Form::kPlain, LX_SHIFT_SINGLE, text.bytes, count,
-                  [&](auto in) { lx::transfer<LXUChar>(in, out, SIZE_MAX); });
+  const Codepage* common = common_codepage(&rc);
+  if (common == nullptr) return search_code(rc);
+  SingleByteSink out{*common, bytes_of(name), bytes_of(name) + kMostNameBytes};
+  with_cursor(cp, Form::kPlain, LX_SHIFT_SINGLE, text.bytes, count,
+              [&](auto in) { transfer<LXUChar>(in, out, SIZE_MAX); });
   *length = static_cast<size_t>(out.p - bytes_of(name));
   return LX_OK;
 }
@@ -76,25 +68,25 @@ int32_t name_to_ascii(const Codepage& cp, const NewText& text, size_t count, cha
 int32_t set_object_by_name(LXLocale* locale, int32_t type, const NewText& text) {
   const Codepage& cp = codepage_of(*locale->codepage);
   if (text.state != LX_SHIFT_SINGLE) return LX_E_NOT_FOUND;
-  const size_t count = lx::least(text.count, kMostNameBytes);
+  const size_t count = least(text.count, kMostNameBytes);
   char name[kMostNameBytes];
   size_t length = count;
   memcpy(name, text.bytes, count);
-  if (!lx::keeps_ascii(*locale))
+  if (!keeps_ascii(*locale))
     if (const int32_t code = name_to_ascii(cp, text, count, name, &length)) return code;
   int32_t rc = LX_OK;
   LXObject* object = LXGetObjFromName(nullptr, type, name, static_cast<int32_t>(length), LX_FIND_AND_LOAD, &rc);
-  if (object == nullptr && rc != LX_OK) return lx::search_code(rc);
+  if (object == nullptr && rc != LX_OK) return search_code(rc);
   return install_object(locale, type, object);
 }
 
 int32_t set_separator(LXLocale* locale, size_t index, const NewText& text) {
-  constexpr size_t kPartner[lx::kSeparators] = {1, 0, kListSeparator, 4, 3};
+  constexpr size_t kPartner[kSeparators] = {1, 0, kListSeparator, 4, 3};
   if (text.state != LX_SHIFT_SINGLE) return LX_E_NOT_FOUND;
   if (text.units != nullptr && text.unit_count != 1) return LX_E_NOT_FOUND;
   const uint8_t byte = text.count != 0 ? text.bytes[0] : uint8_t{0};
   if (index != kListSeparator) {
-    const uint8_t zero = lx::keeps_ascii(*locale) ? 0x30 : 0xF0;
+    const uint8_t zero = keeps_ascii(*locale) ? 0x30 : 0xF0;
     if (byte == 0 || (byte >= zero && byte <= zero + 9)) return LX_E_NOT_FOUND;
     if (byte == locale->separators[kPartner[index]]) return LX_E_NOT_FOUND;
   }
@@ -111,26 +103,26 @@ class TextBlock {
  public:
   TextBlock(Unit** slot, size_t stored, size_t units)
       : slot_(slot),
-        fresh_(units > stored ? static_cast<Unit*>(lx::hook_allocate(sizeof(Unit) * (units + 1))) : nullptr),
+        fresh_(units > stored ? static_cast<Unit*>(hook_allocate(sizeof(Unit) * (units + 1))) : nullptr),
         data_(units > stored ? fresh_.get() : *slot) {}
 
   Unit* data() const { return data_; }  // null: no memory
   void install() {
     if (!fresh_) return;
-    lx::hook_free(*slot_);
+    hook_free(*slot_);
     *slot_ = fresh_.detach();
   }
 
  private:
   Unit** slot_;
-  lx::HookPtr<Unit> fresh_;
+  HookPtr<Unit> fresh_;
   Unit* data_;
 };
 
 int32_t set_string(LXLocale* locale, size_t index, const NewText& text) {
   const Codepage& cp = codepage_of(*locale->codepage);
   const auto read = [&](auto body) {
-    return lx::with_cursor(cp, Form::kEx, text.state, text.bytes, text.count, body);
+    return with_cursor(cp, Form::kEx, text.state, text.bytes, text.count, body);
   };
   size_t chars = 0;
   const uint8_t* end = read([&](auto in) {
@@ -142,17 +134,17 @@ int32_t set_string(LXLocale* locale, size_t index, const NewText& text) {
   const size_t units = text.units != nullptr ? text.unit_count : chars;
 
   const size_t stored = strlen(locale->texts[index]);
-  const size_t stored_units = lx::units_up_to(locale->texts_unicode[index], -1);
+  const size_t stored_units = units_up_to(locale->texts_unicode[index], -1);
   TextBlock<char> narrow(&locale->texts[index], stored, shift + count);
   if (narrow.data() == nullptr) return LX_E_MEMORY;
   TextBlock<LXUChar> wide(&locale->texts_unicode[index], stored_units, units);
   if (wide.data() == nullptr) return LX_E_MEMORY;
 
-  lx::UnicodeSink out{wide.data(), wide.data() + units};
+  UnicodeSink out{wide.data(), wide.data() + units};
   if (text.units != nullptr)
     memcpy(out.p, text.units, sizeof(LXUChar) * units);
   else
-    read([&](auto in) { return lx::transfer<LXUChar>(in, out, SIZE_MAX).chars; });
+    read([&](auto in) { return transfer<LXUChar>(in, out, SIZE_MAX).chars; });
   wide.data()[units] = 0;
   uint8_t* const bytes = bytes_of(narrow.data());
   if (shift != 0) bytes[0] = cp.shift_out;
@@ -164,7 +156,7 @@ int32_t set_string(LXLocale* locale, size_t index, const NewText& text) {
 }
 
 int32_t set_text(LXLocale* locale, int32_t number, const NewText& text) {
-  const Item item = lx::item_of(number);
+  const Item item = item_of(number);
   if (item.kind == ItemKind::kObjectName) return set_object_by_name(locale, item.index, text);
   int32_t code = LX_E_ITEM;
   if (item.kind == ItemKind::kSeparator) code = set_separator(locale, item.index, text);
@@ -181,7 +173,7 @@ int32_t set_text(LXLocale* locale, int32_t number, const NewText& text) {
 size_t bytes_before_null(const Codepage& cp, const char* text, LXShiftState state, int32_t length,
                          int32_t flags) {
   if (length < 0) return strlen(text);
-  const size_t bytes = (flags & LX_CHARACTERS) != 0 ? lx::bytes_of_chars(cp, bytes_of(text), state, length)
+  const size_t bytes = (flags & LX_CHARACTERS) != 0 ? bytes_of_chars(cp, bytes_of(text), state, length)
                                                     : static_cast<size_t>(length);
   return strnlen(text, bytes);
 }
@@ -198,7 +190,7 @@ int32_t set_shifted(LXLocale* locale, int32_t item, NewText text) {
   const Codepage& cp = codepage_of(*locale->codepage);
   if (text.count != 0 && cp.is_shift(text.bytes[0])) {
     const uint8_t* p = text.bytes;
-    lx::take_shift(cp, &p, &text.state);
+    take_shift(cp, &p, &text.state);
     text.bytes = p;
     if (--text.count == 0) return LX_OK;
   }
@@ -225,12 +217,12 @@ int32_t set_item(LXLocale* given, int32_t length, int32_t flags, Set set) {
 template <class Cursor, class Value>
 int32_t set_converted(LXLocale* locale, int32_t item, Cursor in, size_t count, const LXUChar* units) {
   const Codepage& cp = codepage_of(*locale->codepage);
-  if (count > INT32_MAX / (lx::kMaxCharBytes + 1) - 1) return LX_E_MEMORY;
-  const lx::WorkBuffer narrow((count + 1) * (lx::kMaxCharBytes + 1));
+  if (count > INT32_MAX / (kMaxCharBytes + 1) - 1) return LX_E_MEMORY;
+  const WorkBuffer narrow((count + 1) * (kMaxCharBytes + 1));
   if (!narrow) return LX_E_MEMORY;
   uint8_t* const start = narrow.as<uint8_t>();
-  lx::with_sink(cp, Form::kEx, LX_SHIFT_SINGLE, start, lx::no_end<uint8_t>(), [&](auto out) {
-    lx::transfer<Value>(in, out, SIZE_MAX);
+  with_sink(cp, Form::kEx, LX_SHIFT_SINGLE, start, no_end<uint8_t>(), [&](auto out) {
+    transfer<Value>(in, out, SIZE_MAX);
     out.put(Value{0});
   });
   return set_in_form(locale, item,
@@ -238,7 +230,7 @@ int32_t set_converted(LXLocale* locale, int32_t item, Cursor in, size_t count, c
 }
 
 int32_t set_number(LXLocale* locale, int32_t number, int32_t value) {
-  const Item item = lx::item_of(number);
+  const Item item = item_of(number);
   switch (item.kind) {
     case ItemKind::kObjectId:
       return set_object_by_id(locale, item.index, value);
@@ -294,24 +286,24 @@ int32_t LXSetLocaleTextInfo(LXLocale* given, int32_t item, const char* text, int
 int32_t LXSetLocaleTextInfoW(LXLocale* given, int32_t item, const LXWChar* text, int32_t length,
                              int32_t flags) {
   return set_item(given, length, flags, [&](LXLocale* locale) {
-    const size_t count = lx::units_up_to(text, length);
-    const lx::CodeCursor in{codepage_of(*locale->codepage), text, text + count};
-    return set_converted<lx::CodeCursor, LXWChar>(locale, item, in, count, nullptr);
+    const size_t count = units_up_to(text, length);
+    const CodeCursor in{codepage_of(*locale->codepage), text, text + count};
+    return set_converted<CodeCursor, LXWChar>(locale, item, in, count, nullptr);
   });
 }
 
 int32_t LXSetLocaleTextInfoU(LXLocale* given, int32_t item, const LXUChar* text, int32_t length,
                              int32_t flags) {
   return set_item(given, length, flags, [&](LXLocale* locale) {
-    const size_t count = lx::units_up_to(text, length < 0 ? kMostUnicodeUnits + 1 : length);
+    const size_t count = units_up_to(text, length < 0 ? kMostUnicodeUnits + 1 : length);
     if (length > kMostUnicodeUnits || count > kMostUnicodeUnits) return int32_t{LX_E_NOT_FOUND};
-    return set_converted<lx::UnicodeCursor, LXUChar>(locale, item, {text, text + count}, count, text);
+    return set_converted<UnicodeCursor, LXUChar>(locale, item, {text, text + count}, count, text);
   });
 }
 
 int32_t LXSetLocaleTextInfoEx(LXLocale* given, int32_t item, const char* text, LXShiftState state,
                               int32_t length, int32_t flags) {
-  const LXLocale* used = lx::locale_of(given);
+  const LXLocale* used = locale_of(given);
   if (used == nullptr || !codepage_of(*used->codepage).shift_sensitive)
     return LXSetLocaleTextInfo(given, item, text, length, flags);
   return set_item(given, length, flags, [&](LXLocale* locale) {

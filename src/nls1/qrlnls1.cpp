@@ -11,9 +11,9 @@
 #include "nls1.h"
 #include "platform/bss1.h"
 
-namespace {
+using namespace lx;
 
-using lx::Events;
+namespace {
 
 RAS1_Unit unit = RAS1_UNIT("qrlnls1");
 
@@ -70,7 +70,7 @@ BSS1_ProcessBlock process_block = BSS1_PROCESS_BLOCK(InitProcess, TermProcess, s
 /// either, nor after a program's own last LXTerm.
 bool process_ready() {
   return BSS1_ResolveProcess(&process_block) != nullptr &&
-         __atomic_load_n(&process_state, __ATOMIC_ACQUIRE) >= 1 && lx::initialized();
+         __atomic_load_n(&process_state, __ATOMIC_ACQUIRE) >= 1 && initialized();
 }
 
 void InitThread(void* block) {
@@ -235,7 +235,7 @@ int32_t set_native(LXLocale* locale, int32_t category, int32_t flags) {
     LX_TRACE(unit, RAS1_LEVEL_ERRORS, "NLS1_ConvertLocale failed with rc = %d", LXGetError(locale));
     return LX_E_NO_NATIVE;
   }
-  const lx::GlobalLock lock;  // not while the library has another locale set, which it would put back over this
+  const GlobalLock lock;  // not while the library has another locale set, which it would put back over this
   if (setlocale(category, name) != nullptr) return LX_OK;
   LX_TRACE(unit, RAS1_LEVEL_ERRORS, "setlocale failed to setlocale to %s", name);
   return LX_E_NO_NATIVE;
@@ -351,10 +351,10 @@ int32_t NLS1_GetSortName(int32_t id, char* buffer, int32_t size) {
 
 int32_t NLS1_GetLocaleNumInfo(LXLocale* locale, int32_t item, int32_t source) {
   if (item != LX_ITEM_DEFAULT_CODEPAGE) return Events(unit).exit(LXGetLocaleNumInfo(locale, item, source));
-  lx::Call call(unit, locale);
+  Call call(unit, locale);
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
-  const uint8_t* language = lx::payload_of(*call.locale()->language);
-  return call.exit(int32_t{lx::le16(language + 2 * lx::format::language::kDefaultCodepage)});
+  const uint8_t* language = payload_of(*call.locale()->language);
+  return call.exit(int32_t{le16(language + 2 * format::language::kDefaultCodepage)});
 }
 int32_t NLS1_SetLocaleNumInfo(LXLocale* locale, int32_t item, int32_t value) {
   return Events(unit).exit(LXSetLocaleNumInfo(locale, item, value));

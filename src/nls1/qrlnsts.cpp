@@ -4,11 +4,9 @@
 #include "core/lxtrace.h"
 #include "nls1.h"
 
-namespace {
+using namespace lx;
 
-using lx::Codepage;
-using lx::Form;
-using lx::Stop;
+namespace {
 
 RAS1_Unit unit = RAS1_UNIT("qrlnsts");
 
@@ -17,12 +15,12 @@ constexpr int32_t kFlags = LX_TERMINATE | LX_CHARACTERS | NLS1_PAD | NLS1_DROP_B
 
 /// Whether built-in data took the place of the object's own, which could not be loaded.
 bool is_stand_in(const LXObject& object) {
-  return (object.disk.flags & lx::kObjectBuiltIn) != 0 && lx::globals.area->manager->directory[0] != '\0';
+  return (object.disk.flags & kObjectBuiltIn) != 0 && globals.area->manager->directory[0] != '\0';
 }
 
 /// The single byte of a codepage's blank; -1 when the blank is longer.
 int32_t blank_byte(const Codepage& cp) {
-  const uint32_t code = lx::unicode_to_code(cp, kBlank);
+  const uint32_t code = unicode_to_code(cp, kBlank);
   return code <= 0xFF ? static_cast<int32_t>(code) : -1;
 }
 
@@ -39,9 +37,9 @@ struct Side {
     if (number == NLS1_UTF16) return LX_OK;
     int32_t rc = LX_E_NOT_FOUND;
     if (number >= 0 && number <= UINT16_MAX) {
-      const LXObject* object = lx::object_by_id(LX_CODEPAGE, static_cast<uint16_t>(number), &rc);
+      const LXObject* object = object_by_id(LX_CODEPAGE, static_cast<uint16_t>(number), &rc);
       if (rc == LX_OK && is_stand_in(*object)) rc = LX_E_NO_CODEPAGE;
-      if (rc == LX_OK) cp = &lx::codepage_of(*object);
+      if (rc == LX_OK) cp = &codepage_of(*object);
     }
     if (rc == LX_OK)
       trace_kind(title);
@@ -97,8 +95,8 @@ size_t bytes_moved(const Cursor& in, const typename Cursor::Unit* start, Stop st
   if constexpr (Cursor::kOneUnit)
     return (read - held) * sizeof(*start);
   else
-    return lx::whole_chars(in.cp, Cursor::kShifts ? Form::kEx : Form::kPlain, start, LX_SHIFT_SINGLE,
-                           read - held, bytes)
+    return whole_chars(in.cp, Cursor::kShifts ? Form::kEx : Form::kPlain, start, LX_SHIFT_SINGLE, read - held,
+                       bytes)
         .units;
 }
 
@@ -106,7 +104,7 @@ size_t bytes_moved(const Cursor& in, const typename Cursor::Unit* start, Stop st
 template <class Cursor>
 bool only_blanks(const Cursor& in, const typename Cursor::Unit* start, size_t at, size_t bytes) {
   using Unit = typename Cursor::Unit;
-  if (lx::state_at(in, LX_SHIFT_SINGLE) != LX_SHIFT_SINGLE) return false;
+  if (state_at(in, LX_SHIFT_SINGLE) != LX_SHIFT_SINGLE) return false;
   int32_t blank = kBlank;
   if constexpr (!Cursor::kUnicode) {
     blank = blank_byte(in.cp);
@@ -124,7 +122,7 @@ template <class Sink>
 void close_state(Sink& out, const typename Sink::Unit* start, const Request& request, size_t* chars) {
   if constexpr (Sink::kShifts) {
     if (out.state != LX_SHIFT_DOUBLE) return;
-    const size_t bytes = lx::room(start, out.p);
+    const size_t bytes = room(start, out.p);
     if (request.used(bytes, *chars) >= request.size) {
       if (bytes < out.cp.width) return;  // codes shorter than the width: nothing can go
       out.take_back();
@@ -160,7 +158,7 @@ template <class Cursor, class Sink>
 Outcome translate(Cursor in, Sink out, const Request& request) {
   const auto* const from = in.p;
   auto* const to = out.p;
-  const auto moved = lx::transfer<LXUChar>(in, out, request.characters ? request.size : SIZE_MAX);
+  const auto moved = transfer<LXUChar>(in, out, request.characters ? request.size : SIZE_MAX);
   size_t chars = moved.chars;
   size_t consumed = bytes_moved(in, from, moved.stop, request.bytes);
   if (request.drop_blanks && only_blanks(in, from, consumed, request.bytes)) consumed = request.bytes;
@@ -182,10 +180,10 @@ template <class Body>
 Outcome read_source(const Request& request, Body body) {
   const Side& source = request.source;
   if (source.cp != nullptr)
-    return lx::with_cursor(*source.cp, source.form(), LX_SHIFT_SINGLE,
-                           static_cast<const uint8_t*>(request.input), request.bytes, body);
+    return with_cursor(*source.cp, source.form(), LX_SHIFT_SINGLE, static_cast<const uint8_t*>(request.input),
+                       request.bytes, body);
   const LXUChar* const units = static_cast<const LXUChar*>(request.input);
-  return body(lx::UnicodeCursor{units, units + request.bytes / sizeof(LXUChar)});
+  return body(UnicodeCursor{units, units + request.bytes / sizeof(LXUChar)});
 }
 
 /// A size in characters says nothing about the end of the output.
@@ -194,12 +192,11 @@ Outcome write_target(const Request& request, Body body) {
   const Side& target = request.target;
   if (target.cp == nullptr) {
     LXUChar* const units = static_cast<LXUChar*>(request.output);
-    return body(
-        lx::UnicodeSink{units, request.characters ? lx::no_end<LXUChar>() : lx::end_of(units, request.size)});
+    return body(UnicodeSink{units, request.characters ? no_end<LXUChar>() : end_of(units, request.size)});
   }
   uint8_t* const bytes = static_cast<uint8_t*>(request.output);
-  return lx::with_sink(*target.cp, target.form(), LX_SHIFT_SINGLE, bytes,
-                       request.characters ? lx::no_end<uint8_t>() : lx::end_of(bytes, request.size), body);
+  return with_sink(*target.cp, target.form(), LX_SHIFT_SINGLE, bytes,
+                   request.characters ? no_end<uint8_t>() : end_of(bytes, request.size), body);
 }
 
 void trace_path(const Side& source, const Side& target) {
@@ -218,13 +215,12 @@ size_t input_bytes(const Side& source, const void* input, int32_t length, int32_
   const bool characters = (flags & LX_CHARACTERS) != 0;
   size_t bytes;
   if (source.cp == nullptr)
-    bytes = length < 0 || characters
-                ? lx::text_units(static_cast<const LXUChar*>(input), length) * sizeof(LXUChar)
-                : static_cast<size_t>(length);
+    bytes = length < 0 || characters ? text_units(static_cast<const LXUChar*>(input), length) * sizeof(LXUChar)
+                                     : static_cast<size_t>(length);
   else if (characters && !source.cp->single_byte)
-    bytes = lx::units_of(*source.cp, lx::ByteText{static_cast<const uint8_t*>(input), length}, true);
+    bytes = units_of(*source.cp, ByteText{static_cast<const uint8_t*>(input), length}, true);
   else
-    bytes = lx::text_units(static_cast<const char*>(input), length);
+    bytes = text_units(static_cast<const char*>(input), length);
   if (length < 0) LX_TRACE(unit, RAS1_LEVEL_DETAIL, "Source length = %d", static_cast<int32_t>(bytes));
   return bytes;
 }
@@ -275,7 +271,7 @@ extern "C" {
 int32_t NLS1_TranslateString(int32_t target_codepage, int32_t source_codepage, void* output,
                              int32_t output_size, const void* input, int32_t input_length, int32_t* consumed,
                              int32_t flags, uint32_t* rc) {
-  lx::Events events(unit);
+  Events events(unit);
   NLS1_PrivateFunction_GetThreadLocale();  // initialises the process; the locale has no influence
   const Outcome outcome =
       translate_string({source_codepage}, {target_codepage}, output, output_size, input, input_length, flags);

@@ -4,17 +4,9 @@
 #include "core/lxcall.h"
 #include "text/lxwalk.h"
 
-namespace {
+using namespace lx;
 
-using lx::bytes_of;
-using lx::ByteText;
-using lx::Call;
-using lx::Codepage;
-using lx::codepage_of;
-using lx::Form;
-using lx::LineEnds;
-using lx::Text;
-using lx::Walk;
+namespace {
 
 RAS1_Unit unit = RAS1_UNIT("lxeol");
 
@@ -50,10 +42,9 @@ Unit* find(LXLocale* given, Form form, const Text<Unit>& text, uint32_t* kind, i
   *eol_length = 0;
   if ((flags & ~LX_EOL_ALL) != 0) return call.fail(LX_E_INVALID, none);
   const Codepage& cp = codepage_of(call.codepage());
-  const size_t units = lx::units_of(cp, text, characters);
+  const size_t units = units_of(cp, text, characters);
   const uint32_t kinds = flags != 0 ? flags : LX_EOL_LF;
-  const auto eol =
-      lx::with_cursor(cp, form, text, units, [&](const auto& in) { return first_eol(cp, in, kinds); });
+  const auto eol = with_cursor(cp, form, text, units, [&](const auto& in) { return first_eol(cp, in, kinds); });
   *kind = eol.kind;
   *eol_length = eol.length;
   return call.exit(const_cast<Unit*>(eol.end));

@@ -7,15 +7,9 @@
 #include "stream/lxeol.h"
 #include "stream/lxstream.h"
 
-namespace {
+using namespace lx;
 
-using lx::bytes_of;
-using lx::Call;
-using lx::Codepage;
-using lx::codepage_of;
-using lx::Form;
-using lx::LineEnds;
-using lx::StreamChar;
+namespace {
 
 RAS1_Unit unit = RAS1_UNIT("lxreadstring");
 
@@ -33,25 +27,25 @@ struct Source {
 
   int32_t next() {
     if constexpr (sizeof(Value) == sizeof(LXUChar)) {
-      const int32_t code = lx::read_unit(stream, &held);
-      if (code == LX_OK) value = lx::unit_of(held);
+      const int32_t code = read_unit(stream, &held);
+      if (code == LX_OK) value = unit_of(held);
       return code;
     } else {
-      const int32_t code = lx::read_char(cp, stream, &held);
-      if (code == LX_OK) value = lx::pack(held.bytes, held.length);
+      const int32_t code = read_char(cp, stream, &held);
+      if (code == LX_OK) value = pack(held.bytes, held.length);
       return code;
     }
   }
   /// Whether it can be a line-end character.
   bool one_unit() const { return sizeof(Value) == sizeof(LXUChar) || held.length == 1; }
   /// There is room: it was taken out of the buffer, or read when that was empty.
-  void put_back(const StreamChar& c) { lx::push_back(cp, stream, c); }
+  void put_back(const StreamChar& c) { push_back(cp, stream, c); }
 };
 
 template <class Sink>
 class Line {
  public:
-  using Value = std::conditional_t<std::is_same_v<Sink, lx::UnicodeSink>, LXUChar, LXWChar>;
+  using Value = std::conditional_t<std::is_same_v<Sink, UnicodeSink>, LXUChar, LXWChar>;
 
   Line(const Codepage& cp, LXStream& stream, const Sink& out, size_t most_chars, uint32_t flags)
       : in_{cp, stream},
@@ -81,7 +75,7 @@ class Line {
   size_t chars() const { return chars_; }
   /// Where the text ends, in the single-byte state.
   typename Sink::Unit* close() {
-    lx::close_text(out_);
+    close_text(out_);
     return out_.p;
   }
 
@@ -140,30 +134,29 @@ class Line {
 template <class Unit, class Body>
 int32_t with_line_sink(const Codepage& cp, Form form, Unit* p, Unit* end, Body body) {
   if constexpr (sizeof(Unit) == 1)
-    if (form != Form::kEx || !cp.shift_sensitive) return body(lx::MultiByteSink{cp, p, end});
-  return lx::with_kind<Unit, lx::ClosedShiftSink>(cp, form,
-                                                  [&](auto kind) { return body(kind.sink(cp, p, end)); });
+    if (form != Form::kEx || !cp.shift_sensitive) return body(MultiByteSink{cp, p, end});
+  return with_kind<Unit, ClosedShiftSink>(cp, form, [&](auto kind) { return body(kind.sink(cp, p, end)); });
 }
 
 template <class Unit>
 int32_t read_string(LXStream* stream, LXLocale* given, Form form, Unit* output, int32_t size, uint32_t flags) {
   Call call(unit, given);
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, kFailed);
-  if (stream->direction != lx::kReadStream) return call.fail(LX_E_STREAM_DIRECTION, kFailed);
+  if (stream->direction != kReadStream) return call.fail(LX_E_STREAM_DIRECTION, kFailed);
   if ((flags & ~kFlags) != 0) return call.fail(LX_E_INVALID, kFailed);
   const Codepage& cp = codepage_of(call.codepage());
   const bool by_chars = sizeof(Unit) == 1 && (flags & LX_CHARACTERS) != 0;
   const size_t given_room = size > 0 ? static_cast<size_t>(size) : 0;
   const size_t nulls = (flags & LX_TERMINATE) != 0 && given_room != 0 ? 1 : 0;
   const size_t most = given_room - nulls;
-  Unit* const end = by_chars ? lx::no_end<Unit>() : lx::end_of(output, most);
+  Unit* const end = by_chars ? no_end<Unit>() : end_of(output, most);
   return with_line_sink(cp, form, output, end, [&](const auto& out) {
     Line line(cp, *stream, out, most, flags);
     const int32_t code = line.read();
     if (line.chars() == 0 && code != LX_OK) return code > LX_OK ? call.fail(code, kFailed) : call.exit(kAtEnd);
     Unit* const behind = line.close();
     if (nulls != 0) *behind = 0;
-    const size_t count = by_chars ? line.chars() : lx::room(output, behind);
+    const size_t count = by_chars ? line.chars() : room(output, behind);
     return call.end(code > LX_OK ? code : LX_OK, static_cast<int32_t>(count + nulls));
   });
 }

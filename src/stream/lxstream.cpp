@@ -7,13 +7,9 @@
 #include "core/lxcall.h"
 #include "core/lxmemory.h"
 
-namespace {
+using namespace lx;
 
-using lx::bytes_of;
-using lx::Call;
-using lx::Codepage;
-using lx::codepage_of;
-using lx::StreamChar;
+namespace {
 
 RAS1_Unit unit = RAS1_UNIT("lxstream");
 
@@ -46,7 +42,7 @@ int32_t fill(LXStream& s, size_t bytes) {
     const int32_t wanted = static_cast<int32_t>(bytes - s.count);
     const int32_t got = call_back(s, s.buffer + s.count, static_cast<size_t>(wanted));
     if (got > wanted || got < -1) return LX_E_STREAM_COUNT;
-    if (got <= 0 && s.count == 0) return lx::kInputEnd;
+    if (got <= 0 && s.count == 0) return kInputEnd;
     if (got <= 0) return got == 0 ? LX_E_STREAM_HALF : LX_E_STREAM_READ;
     s.count = static_cast<uint16_t>(s.count + got);
   }
@@ -56,8 +52,8 @@ int32_t fill(LXStream& s, size_t bytes) {
 /// What a callback means that did not give the bytes of a unit; one byte is kept.
 int32_t short_unit(LXStream& s, int32_t got) {
   if (s.count == 1) return static_cast<uint16_t>(got) < 0xFFFF ? LX_E_STREAM_HALF : LX_E_STREAM_READ;
-  if (got == -1) return lx::kInputEnd;
-  if (got == 0) return lx::kNoInput;
+  if (got == -1) return kInputEnd;
+  if (got == 0) return kNoInput;
   if (got != 1) return LX_E_STREAM_COUNT;
   s.count = 1;
   return LX_E_STREAM_HALF;
@@ -110,7 +106,7 @@ int32_t flush(LXStream& s) {
 int32_t write_char(const Codepage& cp, LXStream& s, const StreamChar& c) {
   const size_t shift = c.shifts && c.state != s.shift_state ? 1 : 0;
   const size_t bytes = shift + c.length;
-  uint8_t text[1 + lx::kMaxCharBytes] = {lx::shift_byte(cp, c.state)};
+  uint8_t text[1 + kMaxCharBytes] = {shift_byte(cp, c.state)};
   memcpy(text + shift, c.bytes, c.length);
   size_t taken = 0;
   offer_kept(s);
@@ -157,10 +153,10 @@ StreamChar shift_char(const Codepage& cp, const uint8_t* text, bool double_byte)
 }
 
 StreamChar code_char(const Codepage& cp, LXWChar code) {
-  const uint32_t stored = lx::without_zero_bytes(code);
-  const size_t count = lx::code_bytes(stored);
-  uint8_t text[lx::kMaxCharBytes] = {};
-  lx::store_code(text, stored, count);
+  const uint32_t stored = without_zero_bytes(code);
+  const size_t count = code_bytes(stored);
+  uint8_t text[kMaxCharBytes] = {};
+  store_code(text, stored, count);
   return shift_char(cp, text, count > 1);
 }
 
@@ -173,7 +169,7 @@ StreamChar unit_char(LXUChar u) {
 
 /// The frame of the functions that write a character or put it back: `move` gives their code.
 template <class Make>
-int32_t move_char(LXStream* stream, LXLocale* given, lx::StreamDirection direction,
+int32_t move_char(LXStream* stream, LXLocale* given, StreamDirection direction,
                   int32_t (*move)(const Codepage&, LXStream&, const StreamChar&), Make make) {
   Call call(unit, given);
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, 0);
@@ -185,11 +181,11 @@ int32_t move_char(LXStream* stream, LXLocale* given, lx::StreamDirection directi
 
 template <class Make>
 int32_t write(LXStream* stream, LXLocale* given, Make make) {
-  return move_char(stream, given, lx::kWriteStream, write_char, make);
+  return move_char(stream, given, kWriteStream, write_char, make);
 }
 template <class Make>
 int32_t unget(LXStream* stream, LXLocale* given, Make make) {
-  return move_char(stream, given, lx::kReadStream, lx::push_back, make);
+  return move_char(stream, given, kReadStream, push_back, make);
 }
 
 }  // namespace
@@ -231,7 +227,7 @@ int32_t push_back(const Codepage& cp, LXStream& s, const StreamChar& c) {
   s.count = static_cast<uint16_t>(s.count + bytes);
   memcpy(s.buffer, c.bytes, c.length);
   if (shift == 0) return LX_OK;
-  s.buffer[c.length] = lx::shift_byte(cp, s.shift_state);
+  s.buffer[c.length] = shift_byte(cp, s.shift_state);
   s.shift_state = static_cast<uint8_t>(c.state);
   return LX_OK;
 }
@@ -246,11 +242,11 @@ LXStream* LXOpenStream(LXLocale* locale, LXTransfer transfer, void* user, uint32
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, none);
   if (mode != LX_STREAM_READ && mode != LX_STREAM_WRITE) return call.fail(LX_E_INVALID, none);
   if (transfer == nullptr) return call.fail(LX_E_INVALID, none);
-  auto* stream = static_cast<LXStream*>(lx::hook_allocate_zeroed(sizeof(LXStream)));
+  auto* stream = static_cast<LXStream*>(hook_allocate_zeroed(sizeof(LXStream)));
   if (stream == nullptr) return call.fail(LX_E_MEMORY, none);
   stream->transfer = transfer;
   stream->user = user;
-  stream->direction = mode == LX_STREAM_WRITE ? lx::kWriteStream : lx::kReadStream;
+  stream->direction = mode == LX_STREAM_WRITE ? kWriteStream : kReadStream;
   return call.exit(stream);
 }
 
@@ -258,8 +254,8 @@ int32_t LXCloseStream(LXStream* stream, LXLocale* locale) {
   Call call(unit, locale);
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, 0);
   int32_t code = LX_OK;
-  if (stream->direction == lx::kWriteStream) code = finish(codepage_of(call.codepage()), *stream);
-  if (!lx::hook_free(stream) && code == LX_OK) code = LX_E_FREE;
+  if (stream->direction == kWriteStream) code = finish(codepage_of(call.codepage()), *stream);
+  if (!hook_free(stream) && code == LX_OK) code = LX_E_FREE;
   return call.end(code, code == LX_OK ? 1 : 0);
 }
 
@@ -267,7 +263,7 @@ int32_t LXFlushStream(LXStream* stream, LXLocale* locale) {
   Call call(unit, locale);
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, 0);
   int32_t code = LX_OK;
-  if (stream->direction == lx::kWriteStream)
+  if (stream->direction == kWriteStream)
     code = flush(*stream);
   else
     drop_buffer(codepage_of(call.codepage()), *stream);
@@ -278,22 +274,22 @@ LXUChar LXReadCharU(LXStream* stream, LXLocale* locale) {
   constexpr LXUChar kNone = LX_STREAM_NO_UNIT;
   Call call(unit, locale);
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, kNone);
-  if (stream->direction != lx::kReadStream) return call.fail(LX_E_STREAM_DIRECTION, kNone);
+  if (stream->direction != kReadStream) return call.fail(LX_E_STREAM_DIRECTION, kNone);
   StreamChar c;
-  const int32_t code = lx::read_unit(*stream, &c);
-  if (code == LX_OK) return call.exit(lx::unit_of(c));
-  if (code == lx::kInputEnd) return call.exit(kNone);
-  return call.fail(code == lx::kNoInput ? LX_E_STREAM_COUNT : code, kNone);
+  const int32_t code = read_unit(*stream, &c);
+  if (code == LX_OK) return call.exit(unit_of(c));
+  if (code == kInputEnd) return call.exit(kNone);
+  return call.fail(code == kNoInput ? LX_E_STREAM_COUNT : code, kNone);
 }
 
 LXWChar LXReadCharW(LXStream* stream, LXLocale* locale) {
   Call call(unit, locale);
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, LX_STREAM_FAILURE);
-  if (stream->direction != lx::kReadStream) return call.fail(LX_E_STREAM_DIRECTION, LX_STREAM_FAILURE);
+  if (stream->direction != kReadStream) return call.fail(LX_E_STREAM_DIRECTION, LX_STREAM_FAILURE);
   StreamChar c;
-  const int32_t code = lx::read_char(codepage_of(call.codepage()), *stream, &c);
-  if (code == LX_OK) return call.exit(LXWChar{lx::pack(c.bytes, c.length)});
-  if (code == lx::kInputEnd) return call.exit(LX_STREAM_END);
+  const int32_t code = read_char(codepage_of(call.codepage()), *stream, &c);
+  if (code == LX_OK) return call.exit(LXWChar{pack(c.bytes, c.length)});
+  if (code == kInputEnd) return call.exit(LX_STREAM_END);
   return call.fail(code, LX_STREAM_FAILURE);
 }
 

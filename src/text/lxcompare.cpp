@@ -7,18 +7,9 @@
 #include "core/lxmemory.h"
 #include "text/lxcomparechars.h"
 
-namespace {
+using namespace lx;
 
-using lx::bytes_of;
-using lx::Call;
-using lx::Codepage;
-using lx::codepage_of;
-using lx::CountedText;
-using lx::difference;
-using lx::Fold;
-using lx::Form;
-using lx::MultiByteCursor;
-using lx::ShiftCursor;
+namespace {
 
 RAS1_Unit unit = RAS1_UNIT("lxcompare");
 
@@ -54,7 +45,7 @@ struct CodeCase {
   static constexpr bool kTable = false;
   static constexpr bool kSign = false;
   const Codepage& cp;
-  LXWChar operator()(LXWChar code) const { return lx::small_letter(cp, code); }
+  LXWChar operator()(LXWChar code) const { return small_letter(cp, code); }
 };
 
 struct UnicodeFold {
@@ -62,18 +53,18 @@ struct UnicodeFold {
   static constexpr bool kSign = true;
   const Codepage& cp;
   bool upper;  // else half width
-  LXUChar operator()(LXUChar u) const { return upper ? lx::capital(cp, u) : lx::half_width(cp, u); }
+  LXUChar operator()(LXUChar u) const { return upper ? capital(cp, u) : half_width(cp, u); }
 };
 
 /// Compares unit by unit, then the lengths. Behind a difference some units are folded without asking first how
 /// many are the same: where one letter is in the other case, the next one often is.
 template <class Unit, class Folding>
 int32_t compare_units(const CountedText<Unit>& a, const CountedText<Unit>& b, const Folding& fold) {
-  const size_t n = lx::least(a.units, b.units);
+  const size_t n = least(a.units, b.units);
   for (size_t i = 0;;) {
-    i += lx::equal_units(a.p + i, n - i, b.p + i, n - i);
+    i += equal_units(a.p + i, n - i, b.p + i, n - i);
     if (i == n) return length_difference(a, b);
-    for (const size_t stop = i + lx::least(n - i, lx::kBlock); i < stop; ++i) {
+    for (const size_t stop = i + least(n - i, kBlock); i < stop; ++i) {
       if (!Folding::kTable && a.p[i] == b.p[i]) continue;
       const Unit x = fold(a.p[i]);
       const Unit y = fold(b.p[i]);
@@ -86,7 +77,7 @@ int32_t compare_units(const CountedText<Unit>& a, const CountedText<Unit>& b, co
 // as a trace shows it.
 
 bool has_special_upper(const LXLocale& locale) {
-  return lx::specials_of(*locale.language, true).count != 0;
+  return specials_of(*locale.language, true).count != 0;
 }
 
 /// Room for a text in upper case, in units. Packed codes and Unicode do not grow: what more a special mapping
@@ -150,12 +141,12 @@ int32_t compare_mapped(Call& call, Form form, const CountedText<Unit>& a, const 
   const auto bytes_for = [](const CountedText<Unit>& text) {
     return (static_cast<size_t>(upper_units(text)) + copy_units(text)) * sizeof(Unit);
   };
-  const lx::WorkBuffer a_buffer(bytes_for(a));
-  const lx::WorkBuffer b_buffer(bytes_for(b));
+  const WorkBuffer a_buffer(bytes_for(a));
+  const WorkBuffer b_buffer(bytes_for(b));
   if (!a_buffer || !b_buffer) return call.fail(LX_E_MEMORY, 0);
   const CountedText<Unit> x = upper(call.locale(), form, a, a_buffer.as<Unit>());
   const CountedText<Unit> y = upper(call.locale(), form, b, b_buffer.as<Unit>());
-  const size_t bytes = lx::least(x.units, y.units) * sizeof(Unit);
+  const size_t bytes = least(x.units, y.units) * sizeof(Unit);
   const int32_t result =
       compare_units(CountedText<uint8_t>{reinterpret_cast<const uint8_t*>(x.p), bytes},
                     CountedText<uint8_t>{reinterpret_cast<const uint8_t*>(y.p), bytes}, Exact{});
@@ -169,7 +160,7 @@ size_t adjust_length(const Codepage& cp, const uint8_t* text, LXShiftState state
   const uint8_t* p = text;
   const uint8_t* const end = text + length;
   while (p < end) {
-    if (lx::take_shift(cp, &p, &state) && p == end) break;
+    if (take_shift(cp, &p, &state) && p == end) break;
     if (cp.width_in(state) > end - p) break;
     p += cp.width_in(state);
   }
@@ -183,13 +174,13 @@ CountedText<uint8_t> byte_text(const Codepage& cp, Form form, const char* given,
   const LXShiftState state = shift && given_state != LX_SHIFT_SINGLE ? LX_SHIFT_DOUBLE : LX_SHIFT_SINGLE;
   if (length < 0) return {p, strlen(given), state};
   size_t bytes = static_cast<size_t>(length);
-  if (characters) bytes = lx::bytes_of_chars(cp, p, state, length);
-  if (!shift) return {p, cp.single_byte ? bytes : lx::whole_units(cp, p, bytes), state};
+  if (characters) bytes = bytes_of_chars(cp, p, state, length);
+  if (!shift) return {p, cp.single_byte ? bytes : whole_units(cp, p, bytes), state};
   return {p, characters ? bytes : adjust_length(cp, p, state, bytes), state};
 }
 
 void take_first_shift(const Codepage& cp, CountedText<uint8_t>* text) {
-  if (text->units != 0 && lx::take_shift(cp, &text->p, &text->state)) --text->units;
+  if (text->units != 0 && take_shift(cp, &text->p, &text->state)) --text->units;
 }
 
 int32_t compare_bytes(LXLocale* given, Form form, const char* text1, LXShiftState state1, int32_t length1,
@@ -201,12 +192,12 @@ int32_t compare_bytes(LXLocale* given, Form form, const char* text1, LXShiftStat
   const Codepage& cp = codepage_of(call.codepage());
   if (!cp.shift_sensitive) form = Form::kPlain;
   const bool characters = (options & LX_CHARACTERS) != 0;
-  const Fold fold = lx::fold_of(options);
+  const Fold fold = fold_of(options);
   CountedText<uint8_t> a = byte_text(cp, form, text1, state1, length1, characters);
   CountedText<uint8_t> b = byte_text(cp, form, text2, state2, length2, characters);
   if ((options & LX_IGNORE_BLANKS) != 0)
-    lx::drop_blanks(call.locale(), form, &a, &b, fold == Fold::kWidth ? LX_DROP_FULL_BLANKS : LX_DROP_BLANKS,
-                    false);
+    drop_blanks(call.locale(), form, &a, &b, fold == Fold::kWidth ? LX_DROP_FULL_BLANKS : LX_DROP_BLANKS,
+                false);
   if (form == Form::kEx) {
     take_first_shift(cp, &a);
     take_first_shift(cp, &b);
@@ -214,14 +205,14 @@ int32_t compare_bytes(LXLocale* given, Form form, const char* text1, LXShiftStat
              static_cast<int>(a.units), static_cast<int>(a.state), static_cast<int>(b.units),
              static_cast<int>(b.state));
   }
-  lx::dump_texts(unit, a, b);
+  dump_texts(unit, a, b);
   if (a.units == 0 || b.units == 0) return call.exit(length_difference(a, b));
   if (fold == Fold::kCase && has_special_upper(*call.locale())) return compare_mapped(call, form, a, b);
   const bool single = form == Form::kPlain && cp.single_byte;
   if (fold == Fold::kNone || (single && fold == Fold::kWidth)) return call.exit(compare_units(a, b, Exact{}));
-  if (single) return call.exit(compare_units(a, b, ByteCase{lx::lower_table(cp)}));
+  if (single) return call.exit(compare_units(a, b, ByteCase{lower_table(cp)}));
   const auto walked = [&](auto x, auto y) {
-    return call.exit(fold == Fold::kCase ? lx::compare_case(x, y) : lx::compare_width(unit, x, y));
+    return call.exit(fold == Fold::kCase ? compare_case(x, y) : compare_width(unit, x, y));
   };
   if (form == Form::kEx)
     return walked(ShiftCursor{cp, a.p, a.p + a.units, a.state}, ShiftCursor{cp, b.p, b.p + b.units, b.state});
@@ -235,11 +226,11 @@ struct CodeRules {
   using Unit = LXWChar;
   static constexpr bool kTraced = false;
 
-  static bool knows(uint32_t options) { return lx::is_fold(options) && options != LX_WIDTH_INSENSITIVE; }
+  static bool knows(uint32_t options) { return is_fold(options) && options != LX_WIDTH_INSENSITIVE; }
   static void drop_blanks(const LXLocale& locale, CountedText<Unit>* a, CountedText<Unit>* b) {
-    const Unit blank = lx::blank_of(locale);
-    a->units = lx::without_blanks(a->p, a->units, blank, blank);
-    b->units = lx::without_blanks(b->p, b->units, blank, blank);
+    const Unit blank = blank_of(locale);
+    a->units = without_blanks(a->p, a->units, blank, blank);
+    b->units = without_blanks(b->p, b->units, blank, blank);
   }
   static CodeCase folding(const Codepage& cp, Fold) { return {cp}; }
 };
@@ -254,8 +245,8 @@ struct UnicodeRules {
     constexpr uint8_t kStored[sizeof(Unit)] = {0x00, 0x20};
     Unit blank;
     memcpy(&blank, kStored, sizeof(blank));
-    a->units = lx::without_blanks(a->p, a->units, blank, blank);
-    if (a->units != 0) b->units = lx::without_blanks(b->p, b->units, blank, blank);
+    a->units = without_blanks(a->p, a->units, blank, blank);
+    if (a->units != 0) b->units = without_blanks(b->p, b->units, blank, blank);
   }
   static UnicodeFold folding(const Codepage& cp, Fold fold) { return {cp, fold == Fold::kCase}; }
 };
@@ -268,11 +259,11 @@ int32_t compare_text(LXLocale* given, const Unit* text1, int32_t length1, const 
   if (Rules::kTraced) LX_TRACE(unit, RAS1_LEVEL_INPUT, "options = %08x", options);
   if (!is_known(options) || !Rules::knows(options & LX_WIDTH_INSENSITIVE)) return call.fail(LX_E_INVALID, 0);
   const LXLocale& locale = *call.locale();
-  const Fold fold = lx::fold_of(options);
-  CountedText<Unit> a{text1, lx::text_units(text1, length1)};
-  CountedText<Unit> b{text2, lx::text_units(text2, length2)};
+  const Fold fold = fold_of(options);
+  CountedText<Unit> a{text1, text_units(text1, length1)};
+  CountedText<Unit> b{text2, text_units(text2, length2)};
   if ((options & LX_IGNORE_BLANKS) != 0) Rules::drop_blanks(locale, &a, &b);
-  if (Rules::kTraced) lx::dump_texts(unit, a, b);
+  if (Rules::kTraced) dump_texts(unit, a, b);
   if (a.units == 0 || b.units == 0) return call.exit(length_difference(a, b));
   if (fold == Fold::kNone) return call.exit(compare_units(a, b, Exact{}));
   if (fold == Fold::kCase && has_special_upper(locale)) return compare_mapped(call, Form::kPlain, a, b);

@@ -4,16 +4,9 @@
 #include "core/lxcall.h"
 #include "text/lxwalk.h"
 
-namespace {
+using namespace lx;
 
-using lx::bytes_of;
-using lx::ByteText;
-using lx::Call;
-using lx::Codepage;
-using lx::codepage_of;
-using lx::Form;
-using lx::Text;
-using lx::Walk;
+namespace {
 
 RAS1_Unit unit = RAS1_UNIT("lxstrcopy");
 
@@ -26,8 +19,8 @@ void move_units(Unit* to, const Unit* from, size_t units) {
 /// The state behind all characters of a text and the shift byte that may end it.
 LXShiftState state_behind(const Codepage& cp, const ByteText& text, size_t bytes) {
   if (!cp.shift_sensitive) return text.state;
-  lx::ShiftCursor in{cp, text.p, text.p + bytes, text.state};
-  lx::pass_all(&in);
+  ShiftCursor in{cp, text.p, text.p + bytes, text.state};
+  pass_all(&in);
   return in.state;
 }
 
@@ -39,7 +32,7 @@ int32_t copy(LXLocale* given, Form form, Unit* output, int32_t size, const Text<
   if ((flags & ~uint32_t{LX_CHARACTERS}) != 0) return call.fail(LX_E_INVALID, -1);
   const Codepage& cp = codepage_of(call.codepage());
   const bool characters = (flags & LX_CHARACTERS) != 0;
-  const lx::Part taken = lx::part_that_fits(cp, form, text, size, characters);
+  const Part taken = part_that_fits(cp, form, text, size, characters);
   if constexpr (sizeof(Unit) == 1)
     if (state != nullptr) *state = state_behind(cp, text, taken.units);
   move_units(output, text.p, taken.units);
@@ -57,22 +50,22 @@ struct Target {
 };
 
 /// What the buffer holds, the null included. `bytes` of text are there.
-lx::Part append_shifting(const Codepage& cp, const Target<uint8_t>& to, const ByteText& text, size_t bytes) {
-  lx::ShiftCursor old{cp, to.p, to.p + to.used, to.state};
-  lx::ShiftSink out{cp, to.p, to.characters ? lx::no_end<uint8_t>() : to.p + to.most, to.state};
-  lx::Part held{0, 1};
+Part append_shifting(const Codepage& cp, const Target<uint8_t>& to, const ByteText& text, size_t bytes) {
+  ShiftCursor old{cp, to.p, to.p + to.used, to.state};
+  ShiftSink out{cp, to.p, to.characters ? no_end<uint8_t>() : to.p + to.most, to.state};
+  Part held{0, 1};
   LXWChar code = 0;
   for (; old.next(&code); ++held.chars) {
     out.p = to.p + (old.p - to.p);
     out.state = old.state;
   }
   if (to.characters && held.chars > to.most + 1) return {0, 0};
-  lx::ShiftCursor in{cp, text.p, text.p + bytes, text.state};
+  ShiftCursor in{cp, text.p, text.p + bytes, text.state};
   for (; (!to.characters || held.chars <= to.most) && in.next(&code); ++held.chars) {
-    lx::ShiftSink ahead(out);
+    ShiftSink ahead(out);
     // A Shift-In must fit behind it.
     if (!ahead.put(code) || (ahead.state == LX_SHIFT_DOUBLE && ahead.p == ahead.end)) break;
-    lx::go_on_at(out, ahead);
+    go_on_at(out, ahead);
   }
   if (out.state == LX_SHIFT_DOUBLE && out.p != out.end) *out.p++ = out.take_shift_byte();
   *out.p++ = 0;
@@ -80,32 +73,31 @@ lx::Part append_shifting(const Codepage& cp, const Target<uint8_t>& to, const By
   return held;
 }
 
-lx::Part first_chars(const Codepage& cp, Form form, const ByteText& text, size_t bytes, size_t most) {
-  return lx::with_cursor(cp, form, text, bytes, [&](const auto& in) {
+Part first_chars(const Codepage& cp, Form form, const ByteText& text, size_t bytes, size_t most) {
+  return with_cursor(cp, form, text, bytes, [&](const auto& in) {
     Walk at(in);
     size_t chars = 0;
     while (chars < most && at.next()) ++chars;
-    return lx::Part{lx::room(in.p, at.in.p), chars};
+    return Part{room(in.p, at.in.p), chars};
   });
 }
 
-lx::Part append(const Codepage& cp, Form form, const Target<uint8_t>& to, const ByteText& text, size_t bytes) {
+Part append(const Codepage& cp, Form form, const Target<uint8_t>& to, const ByteText& text, size_t bytes) {
   if (form == Form::kEx && cp.shift_sensitive) return append_shifting(cp, to, text, bytes);
-  const lx::Part old = lx::whole_chars(cp, form, to.p, to.state, to.used, to.used);
+  const Part old = whole_chars(cp, form, to.p, to.state, to.used, to.used);
   const size_t held = to.characters ? old.chars : old.units;
   if (held > to.most) return {0, 0};
   const size_t left = to.most - held;
-  const lx::Part taken = to.characters
-                             ? first_chars(cp, form, text, bytes, left)
-                             : lx::whole_chars(cp, form, text.p, text.state, lx::least(bytes, left), bytes);
+  const Part taken = to.characters ? first_chars(cp, form, text, bytes, left)
+                                   : whole_chars(cp, form, text.p, text.state, least(bytes, left), bytes);
   move_units(to.p + old.units, text.p, taken.units);
   to.p[old.units + taken.units] = 0;
   return {old.units + taken.units + 1, old.chars + taken.chars + 1};
 }
 
 template <class Unit>
-lx::Part append(const Codepage&, Form, const Target<Unit>& to, const Text<Unit>& text, size_t units) {
-  const size_t taken = lx::least(units, to.most - to.used);
+Part append(const Codepage&, Form, const Target<Unit>& to, const Text<Unit>& text, size_t units) {
+  const size_t taken = least(units, to.most - to.used);
   move_units(to.p + to.used, text.p, taken);
   to.p[to.used + taken] = 0;
   return {to.used + taken + 1, to.used + taken + 1};
@@ -124,8 +116,8 @@ int32_t concatenate(LXLocale* given, Form form, Unit* buffer, LXShiftState buffe
   size_t used = 0;
   while ((characters || used < most) && buffer[used] != 0) ++used;
   if (buffer[used] != 0) return call.exit(0);
-  const lx::Part held = append(cp, form, Target<Unit>{buffer, buffer_state, used, most, characters}, text,
-                               lx::units_of(cp, text, characters));
+  const Part held = append(cp, form, Target<Unit>{buffer, buffer_state, used, most, characters}, text,
+                           units_of(cp, text, characters));
   return call.exit(static_cast<int32_t>(characters ? held.chars : held.units));
 }
 

@@ -4,18 +4,9 @@
 
 #include "text/lxsearch.h"
 
-namespace {
+using namespace lx;
 
-using lx::bytes_of;
-using lx::ByteText;
-using lx::Call;
-using lx::Codepage;
-using lx::codepage_of;
-using lx::Form;
-using lx::put_state;
-using lx::state_at;
-using lx::Text;
-using lx::Walk;
+namespace {
 
 RAS1_Unit unit = RAS1_UNIT("lxstring");
 
@@ -28,8 +19,8 @@ bool find_code(Walk<Cursor>* at, LXWChar code, size_t units) {
     if (at->value == code && at->units() == units) return true;
   return false;
 }
-bool find_code(Walk<lx::SingleByteCursor>* at, LXWChar code, size_t units) {
-  const size_t bytes = lx::room(at->in.p, at->in.end);
+bool find_code(Walk<SingleByteCursor>* at, LXWChar code, size_t units) {
+  const size_t bytes = room(at->in.p, at->in.end);
   const void* found = bytes != 0 && units == 1 ? memchr(at->in.p, static_cast<int>(code), bytes) : nullptr;
   at->start = static_cast<const uint8_t*>(found);
   return found != nullptr;
@@ -38,17 +29,17 @@ bool find_code(Walk<lx::SingleByteCursor>* at, LXWChar code, size_t units) {
 template <class Unit>
 Unit* find_character(LXLocale* given, Form form, const Text<Unit>& text, LXWChar character, LXShiftState* state,
                      uint32_t flags) {
-  const LXWChar code = sizeof(Unit) == 1 ? lx::without_zero_bytes(character) : character;
-  const size_t code_units = sizeof(Unit) == 1 ? lx::code_bytes(code) : 1;
+  const LXWChar code = sizeof(Unit) == 1 ? without_zero_bytes(character) : character;
+  const size_t code_units = sizeof(Unit) == 1 ? code_bytes(code) : 1;
   Unit* const none = nullptr;
-  return lx::search(unit, given, form, text, {text.p, 0}, flags, LX_CHARACTERS, none,
-                    [&](Call& call, const auto& in, const auto&) {
-                      Walk at(in);
-                      const bool found = find_code(&at, code, code_units);
-                      if (!found && (code != 0 || text.length >= 0)) return call.exit(none);
-                      put_state(state, state_at(at.in, text.state));
-                      return call.exit(lx::writable(found ? at.start : in.end));
-                    });
+  return search(unit, given, form, text, {text.p, 0}, flags, LX_CHARACTERS, none,
+                [&](Call& call, const auto& in, const auto&) {
+                  Walk at(in);
+                  const bool found = find_code(&at, code, code_units);
+                  if (!found && (code != 0 || text.length >= 0)) return call.exit(none);
+                  put_state(state, state_at(at.in, text.state));
+                  return call.exit(writable(found ? at.start : in.end));
+                });
 }
 
 /// The characters of a text: those of one unit below 256 as bits, the others where they stand.
@@ -79,8 +70,8 @@ class CharacterSet {
 };
 
 /// Takes a shift byte that ends the text.
-bool take_last_shift(lx::ShiftCursor* in) {
-  return in->end - in->p == 1 && lx::take_shift(in->cp, &in->p, &in->state);
+bool take_last_shift(ShiftCursor* in) {
+  return in->end - in->p == 1 && take_shift(in->cp, &in->p, &in->state);
 }
 
 /// The characters that a text begins with, `wanted` or not in a set.
@@ -94,11 +85,11 @@ template <class Cursor>
 Span<Cursor> span(const Cursor& text, const CharacterSet<Cursor>& set, bool wanted) {
   Span<Cursor> taken{text, 0};
   for (Walk<Cursor> at(text); at.next() && !at.holds_null() && set.holds(at) == wanted; ++taken.chars)
-    lx::go_on_at(taken.behind, at.in);
+    go_on_at(taken.behind, at.in);
   if constexpr (Cursor::kShifts) {
     Cursor& in = taken.behind;
     if (!take_last_shift(&in) && in.p < in.end && taken.chars != 0 && *in.p == in.cp.shift_in)
-      lx::take_shift(in.cp, &in.p, &in.state);
+      take_shift(in.cp, &in.p, &in.state);
   }
   return taken;
 }
@@ -106,14 +97,14 @@ Span<Cursor> span(const Cursor& text, const CharacterSet<Cursor>& set, bool want
 template <class Unit>
 int32_t span_of_set(LXLocale* given, Form form, const Text<Unit>& text, const Text<Unit>& set, bool wanted,
                     LXShiftState* state, uint32_t flags) {
-  return lx::search(unit, given, form, text, set, flags, LX_CHARACTERS, int32_t{-1},
-                    [&](Call& call, const auto& in, const auto& characters) {
-                      const auto taken = span(in, CharacterSet(characters), wanted);
-                      put_state(state, state_at(taken.behind, text.state));
-                      const bool count = sizeof(Unit) == 1 && (flags & LX_CHARACTERS) != 0;
-                      return call.exit(static_cast<int32_t>(
-                          count ? taken.chars : static_cast<size_t>(taken.behind.p - in.p)));
-                    });
+  return search(unit, given, form, text, set, flags, LX_CHARACTERS, int32_t{-1},
+                [&](Call& call, const auto& in, const auto& characters) {
+                  const auto taken = span(in, CharacterSet(characters), wanted);
+                  put_state(state, state_at(taken.behind, text.state));
+                  const bool count = sizeof(Unit) == 1 && (flags & LX_CHARACTERS) != 0;
+                  return call.exit(
+                      static_cast<int32_t>(count ? taken.chars : static_cast<size_t>(taken.behind.p - in.p)));
+                });
 }
 
 // Tokens.
@@ -122,10 +113,10 @@ int32_t span_of_set(LXLocale* given, Form form, const Text<Unit>& text, const Te
 /// as far as it goes. Moves to the characters that follow.
 template <class Cursor>
 void overwrite_delimiter(Cursor* in) {
-  auto* const first = lx::writable(in->p);
+  auto* const first = writable(in->p);
   Walk at(*in);
   const bool whole = at.next();
-  lx::go_on_at(*in, at.in);
+  go_on_at(*in, at.in);
   if (!whole) in->p = in->end;
   for (auto* p = first; p < in->p; ++p) *p = 0;
   if constexpr (Cursor::kShifts) take_last_shift(in);
@@ -133,16 +124,16 @@ void overwrite_delimiter(Cursor* in) {
 
 /// Where the token begins, or null; `*rest` is left at the text that follows it.
 template <class Cursor>
-lx::Place<Cursor> take_token(Cursor* rest, const CharacterSet<Cursor>& set) {
+Place<Cursor> take_token(Cursor* rest, const CharacterSet<Cursor>& set) {
   Cursor start(*rest);
   Span<Cursor> token = span(start, set, false);
   if (token.chars == 0 && token.behind.p < start.end) {
-    lx::go_on_at(start, span(start, set, true).behind);
-    lx::go_on_at(*rest, start);
+    go_on_at(start, span(start, set, true).behind);
+    go_on_at(*rest, start);
     if (start.p == start.end) return {nullptr, start};
-    lx::go_on_at(token.behind, span(start, set, false).behind);
+    go_on_at(token.behind, span(start, set, false).behind);
   }
-  lx::go_on_at(*rest, token.behind);
+  go_on_at(*rest, token.behind);
   if (rest->p < rest->end) overwrite_delimiter(rest);
   return {start.p, start};
 }
@@ -150,7 +141,7 @@ lx::Place<Cursor> take_token(Cursor* rest, const CharacterSet<Cursor>& set) {
 template <class Unit>
 int32_t length_of_rest(const Codepage& cp, const Text<Unit>& rest, size_t units, bool characters) {
   if constexpr (sizeof(Unit) == 1)
-    if (characters) return lx::chars_counted(cp, rest.p, rest.state, units);  // as the next call takes them
+    if (characters) return chars_counted(cp, rest.p, rest.state, units);  // as the next call takes them
   return static_cast<int32_t>(units);
 }
 
@@ -159,30 +150,30 @@ template <class Unit, class Char>
 Unit* tokenize(LXLocale* given, Form form, Unit* text, LXShiftState* state, int32_t* length,
                const Text<Unit>& set, Char** next, LXShiftState* token_state, uint32_t flags) {
   Unit* const none = nullptr;
-  const bool usable = lx::locale_of(given) != nullptr;
+  const bool usable = locale_of(given) != nullptr;
   if (usable) *next = nullptr;
   if (usable && text == nullptr) *length = 0;
   const Text<Unit> whole{text, usable ? *length : 0, usable ? *state : 0};
-  return lx::search(unit, given, form, whole, set, flags, LX_CHARACTERS, none,
-                    [&](Call& call, const auto& in, const auto& characters) {
-                      if (text == nullptr) return call.exit(none);
-                      auto rest = in;
-                      const auto token = take_token(&rest, CharacterSet(characters));
-                      if (token.p != nullptr) put_state(token_state, state_at(token.in, whole.state));
-                      const Text<Unit> left{rest.p, 0, state_at(rest, whole.state)};
-                      *length = length_of_rest(codepage_of(call.codepage()), left, lx::room(rest.p, rest.end),
-                                               (flags & LX_CHARACTERS) != 0);
-                      *state = left.state;
-                      if (rest.p < rest.end) *next = reinterpret_cast<Char*>(lx::writable(rest.p));
-                      return call.exit(lx::writable(token.p));
-                    });
+  return search(unit, given, form, whole, set, flags, LX_CHARACTERS, none,
+                [&](Call& call, const auto& in, const auto& characters) {
+                  if (text == nullptr) return call.exit(none);
+                  auto rest = in;
+                  const auto token = take_token(&rest, CharacterSet(characters));
+                  if (token.p != nullptr) put_state(token_state, state_at(token.in, whole.state));
+                  const Text<Unit> left{rest.p, 0, state_at(rest, whole.state)};
+                  *length = length_of_rest(codepage_of(call.codepage()), left, room(rest.p, rest.end),
+                                           (flags & LX_CHARACTERS) != 0);
+                  *state = left.state;
+                  if (rest.p < rest.end) *next = reinterpret_cast<Char*>(writable(rest.p));
+                  return call.exit(writable(token.p));
+                });
 }
 
 template <class Unit>
 int32_t length_of(LXLocale* given, const Unit* text) {
   Call call(unit, given);
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, 0);
-  return call.exit(static_cast<int32_t>(lx::units_before_null(text)));
+  return call.exit(static_cast<int32_t>(units_before_null(text)));
 }
 
 }  // namespace
@@ -191,12 +182,12 @@ extern "C" {
 
 char* LXStrchr(LXLocale* locale, const char* text, int32_t length, LXWChar character, uint32_t flags) {
   const ByteText in{bytes_of(text), length};
-  return lx::chars_of(find_character(locale, Form::kPlain, in, character, nullptr, flags));
+  return chars_of(find_character(locale, Form::kPlain, in, character, nullptr, flags));
 }
 char* LXStrchrEx(LXLocale* locale, const char* text, LXShiftState text_state, int32_t length, LXWChar character,
                  LXShiftState* state, uint32_t flags) {
   const ByteText in{bytes_of(text), length, text_state};
-  return lx::chars_of(find_character(locale, Form::kEx, in, character, state, flags));
+  return chars_of(find_character(locale, Form::kEx, in, character, state, flags));
 }
 LXWChar* LXWcschr(LXLocale* locale, const LXWChar* text, int32_t length, LXWChar character, uint32_t flags) {
   return find_character(locale, Form::kPlain, Text<LXWChar>{text, length}, character, nullptr, flags);
@@ -257,14 +248,14 @@ int32_t LXStrspnU(LXLocale* locale, const LXUChar* text, int32_t length, const L
 char* LXStrtok(LXLocale* locale, char* text, int32_t* length, const char* set, int32_t set_length, char** next,
                uint32_t flags) {
   LXShiftState state = LX_SHIFT_SINGLE;
-  return lx::chars_of(tokenize(locale, Form::kPlain, bytes_of(text), &state, length,
-                               ByteText{bytes_of(set), set_length}, next, nullptr, flags));
+  return chars_of(tokenize(locale, Form::kPlain, bytes_of(text), &state, length,
+                           ByteText{bytes_of(set), set_length}, next, nullptr, flags));
 }
 char* LXStrtokEx(LXLocale* locale, char* text, LXShiftState* state, int32_t* length, const char* set,
                  LXShiftState set_state, int32_t set_length, char** next, LXShiftState* token_state,
                  uint32_t flags) {
-  return lx::chars_of(tokenize(locale, Form::kEx, bytes_of(text), state, length,
-                               ByteText{bytes_of(set), set_length, set_state}, next, token_state, flags));
+  return chars_of(tokenize(locale, Form::kEx, bytes_of(text), state, length,
+                           ByteText{bytes_of(set), set_length, set_state}, next, token_state, flags));
 }
 LXWChar* LXWcstok(LXLocale* locale, LXWChar* text, int32_t* length, const LXWChar* set, int32_t set_length,
                   LXWChar** next, uint32_t flags) {

@@ -7,14 +7,9 @@
 #include "text/lxfold.h"
 #include "text/lxwalk.h"
 
-namespace {
+using namespace lx;
 
-using lx::bytes_of;
-using lx::Call;
-using lx::Codepage;
-using lx::codepage_of;
-using lx::Form;
-using lx::Walk;
+namespace {
 
 RAS1_Unit unit = RAS1_UNIT("lxtruncate");
 
@@ -25,8 +20,8 @@ struct Blanks {
   LXWChar full;
 
   Blanks(const LXLocale& locale, uint32_t flags)
-      : dropped((flags & LX_DROP_BLANKS) != 0), blank(lx::blank_of(locale)), full(0) {
-    if ((flags & LX_DROP_FULL_BLANKS) == LX_DROP_FULL_BLANKS) lx::find_full_width_blank(locale, &full);
+      : dropped((flags & LX_DROP_BLANKS) != 0), blank(blank_of(locale)), full(0) {
+    if ((flags & LX_DROP_FULL_BLANKS) == LX_DROP_FULL_BLANKS) find_full_width_blank(locale, &full);
   }
 };
 
@@ -80,8 +75,8 @@ size_t cut_characters(const Cursor& in, const Blanks& blanks, const Words& words
 /// The bytes that the first `chars` characters take, the null being one of them; what follows the null does not
 /// count.
 size_t size_in_bytes(const Codepage& cp, const uint8_t* text, LXShiftState state, size_t bytes, int32_t chars) {
-  if (chars > lx::chars_counted(cp, text, state, bytes)) return bytes + 1;
-  return lx::bytes_of_chars(cp, text, state, chars);
+  if (chars > chars_counted(cp, text, state, bytes)) return bytes + 1;
+  return bytes_of_chars(cp, text, state, chars);
 }
 
 /// The bytes that the text takes after the cut.
@@ -91,7 +86,7 @@ size_t truncate(LXLocale* locale, Form form, uint8_t* text, LXShiftState state, 
     text[0] = 0;
     return 1;
   }
-  const size_t bytes = lx::units_before_null(text);
+  const size_t bytes = units_before_null(text);
   size_t size = static_cast<size_t>(given);
   if ((flags & LX_CHARACTERS) != 0) size = size_in_bytes(cp, text, state, bytes, given);
   const Blanks blanks(*locale, flags);
@@ -103,8 +98,8 @@ size_t truncate(LXLocale* locale, Form form, uint8_t* text, LXShiftState state, 
     end = cut_single_bytes(text, size, blanks);
   } else {
     const Words& words = form == Form::kEx && cp.shift_sensitive ? kExWords : kPlainWords;
-    end = lx::with_cursor(cp, form, state, text, size - 1,
-                          [&](const auto& in) { return cut_characters(in, blanks, words); });
+    end = with_cursor(cp, form, state, text, size - 1,
+                      [&](const auto& in) { return cut_characters(in, blanks, words); });
   }
   text[end] = 0;
   return end + 1;
@@ -118,7 +113,7 @@ int32_t truncate_string(LXLocale* given, Form form, char* buffer, LXShiftState s
   uint8_t* const text = bytes_of(buffer);
   size_t result = truncate(call.locale(), form, text, state, size, flags);
   if ((flags & LX_CHARACTERS) != 0)
-    result = lx::whole_chars(codepage_of(call.codepage()), form, text, state, result, result).chars;
+    result = whole_chars(codepage_of(call.codepage()), form, text, state, result, result).chars;
   LX_TRACE(unit, RAS1_LEVEL_DETAIL, "Truncated string: %s", buffer);
   return call.exit(static_cast<int32_t>(result));
 }
