@@ -42,6 +42,8 @@ struct Codepage {
   const uint8_t* leaf;   // by node
   const uint16_t* codes16;
   const uint32_t* codes32;
+  const uint16_t* halves;  // what WidthTables::to_half() finds, by hash; null: nothing
+  size_t halves_mask;
   uint16_t unicode[256];
   uint32_t page_start[256];
   uint8_t width;  // of a character in bytes: the longest, or that of the double-byte state
@@ -176,7 +178,8 @@ inline size_t store_unicode(const Codepage& cp, uint16_t u, uint8_t* p) {
   return count;
 }
 
-/// The type record of the character at `p`. Null in a single-byte codepage. There is no range check: the trie covers every byte sequence.
+/// The type record of the character at `p`. Null in a single-byte codepage. There is no range check: the trie
+/// covers every byte sequence.
 const uint8_t* type_record(const Codepage& cp, const uint8_t* p);
 const uint8_t* type_record_of_code(const Codepage& cp, uint32_t code);
 

@@ -1,5 +1,5 @@
 // Conversion of whole strings: between two codepages, to and from packed codes, to and from Unicode. One flow
-// for all of them over a reader and a writer; the doors below say what they read and write.
+// for all of them over a cursor and a sink; the doors below say what they read and write.
 #include "codepage/lxtransfer.h"
 #include "core/lxcall.h"
 
@@ -82,11 +82,6 @@ int32_t convert(Cursor in, Sink out, const Request& request) {
   return static_cast<int32_t>(by_chars ? moved.chars + end : static_cast<size_t>(out.p - start));
 }
 
-/// The end of an output of `size` units; a size in characters says nothing about its bytes.
-uint8_t* output_end(uint8_t* output, const Request& request) {
-  return request.characters ? no_end<uint8_t>() : end_of(output, request.size);
-}
-
 /// Which flags a conversion knows, and what it returns for others when LX_CHARACTERS is among them.
 struct Rules {
   int32_t flags;
@@ -96,81 +91,38 @@ constexpr Rules kBetweenLocales = {LX_TERMINATE | LX_CHARACTERS, 0};
 constexpr Rules kUnicode = {LX_TERMINATE | LX_CHARACTERS, -1};
 constexpr Rules kPacked = {LX_CHARACTERS, -1};
 
-/// What every conversion begins and ends with. `body` converts, given the codepage of the locale that keeps the
-/// error and the request. `other` is the second locale, or null where it is missing.
-template <class Unit, class Body>
-int32_t carry_out(LXLocale* locale, const LXLocale* other, int32_t size, const Unit* input, int32_t length,
-                  int32_t flags, const Rules& rules, Body body) {
-  Call call(unit, locale);
-  if (!call || other == nullptr) return call.fail(LX_E_NOT_INITIALIZED, -1);
-  Request request(size, input, length, flags, rules.flags);
+/// A caller's buffer, and the shift state that its text begins in.
+template <class Unit>
+struct Buffer {
+  Unit* p;
+  int32_t size;
+  LXShiftState state = LX_SHIFT_SINGLE;
+};
+Buffer<uint8_t> buffer_of(char* p, int32_t size, LXShiftState state = LX_SHIFT_SINGLE) {
+  return {bytes_of(p), size, state};
+}
+
+/// Every conversion: from text of the source's codepage to text of the target's, as Unicode values or, where both
+/// are the same, as packed codes. The target keeps the error.
+template <class Value, class Out, class In>
+int32_t convert_text(LXLocale* target, const Buffer<Out>& to, LXLocale* source, const Text<In>& text,
+                     int32_t flags, const Rules& rules, Form form) {
+  Call call(unit, target);
+  const LXLocale* const from = locale_of(source);
+  if (!call || from == nullptr) return call.fail(LX_E_NOT_INITIALIZED, -1);
+  Request request(to.size, text.p, text.length, flags, rules.flags);
   if (!request.valid) return call.fail(LX_E_INVALID, request.characters ? rules.invalid_in_characters : -1);
   if (request.nothing) return call.exit(0);
-  return call.exit(body(codepage_of(call.codepage()), request));
-}
-
-int32_t convert_bytes(LXLocale* target, char* output, LXShiftState target_state, int32_t size, LXLocale* source,
-                      const char* input, LXShiftState source_state, int32_t length, int32_t flags, Form form) {
-  const LXLocale* from = locale_of(source);
-  return carry_out(
-      target, from, size, bytes_of(input), length, flags, kBetweenLocales,
-      [&](const Codepage& out_cp, Request& request) {
-        const Codepage& in_cp = codepage_of(*from->codepage);
-        request.count_bytes(in_cp, bytes_of(input), source_state);
-        uint8_t* const out = bytes_of(output);
-        return with_cursor(in_cp, form, source_state, bytes_of(input), request.length, [&](auto reader) {
-          return with_sink(out_cp, form, target_state, out, output_end(out, request),
-                           [&](auto writer) { return convert<LXUChar>(reader, writer, request); });
-        });
-      });
-}
-
-int32_t to_unicode(LXUChar* output, int32_t size, LXLocale* locale, const char* input, LXShiftState state,
-                   int32_t length, int32_t flags, Form form) {
-  return carry_out(locale, locale_of(locale), size, bytes_of(input), length, flags, kUnicode,
-                   [&](const Codepage& cp, Request& request) {
-                     request.count_bytes(cp, bytes_of(input), state);
-                     const UnicodeSink writer{output, end_of(output, request.size)};
-                     return with_cursor(cp, form, state, bytes_of(input), request.length,
-                                        [&](auto reader) { return convert<LXUChar>(reader, writer, request); });
-                   });
-}
-
-int32_t from_unicode(LXLocale* locale, char* output, LXShiftState state, int32_t size, const LXUChar* input,
-                     int32_t length, int32_t flags, Form form) {
-  return carry_out(locale, locale_of(locale), size, input, length, flags, kUnicode,
-                   [&](const Codepage& cp, Request& request) {
-                     const UnicodeCursor reader{input, input + request.length};
-                     uint8_t* const out = bytes_of(output);
-                     return with_sink(cp, form, state, out, output_end(out, request),
-                                      [&](auto writer) { return convert<LXUChar>(reader, writer, request); });
-                   });
-}
-
-/// Bytes to packed codes. The terminating null of a text without a length is a character of it.
-int32_t to_wide(LXLocale* locale, LXWChar* output, int32_t size, const char* input, LXShiftState state,
-                int32_t length, int32_t flags, Form form) {
-  return carry_out(locale, locale_of(locale), size, bytes_of(input), length, flags, kPacked,
-                   [&](const Codepage& cp, Request& request) {
-                     request.count_bytes(cp, bytes_of(input), state);
-                     request.take_terminator();
-                     const CodeSink writer{cp, output, end_of(output, request.size)};
-                     return with_cursor(cp, form, state, bytes_of(input), request.length,
-                                        [&](auto reader) { return convert<LXWChar>(reader, writer, request); });
-                   });
-}
-
-/// Packed codes to bytes; the zero that ends codes without a length is one of them.
-int32_t from_wide(LXLocale* locale, char* output, LXShiftState state, int32_t size, const LXWChar* input,
-                  int32_t length, int32_t flags, Form form) {
-  return carry_out(locale, locale_of(locale), size, input, length, flags, kPacked,
-                   [&](const Codepage& cp, Request& request) {
-                     request.take_terminator();
-                     const CodeCursor reader{cp, input, input + request.length};
-                     uint8_t* const out = bytes_of(output);
-                     return with_sink(cp, form, state, out, output_end(out, request),
-                                      [&](auto writer) { return convert<LXWChar>(reader, writer, request); });
-                   });
+  const Codepage& in_cp = codepage_of(*from->codepage);
+  if constexpr (sizeof(In) == 1) request.count_bytes(in_cp, text.p, text.state);
+  if constexpr (std::is_same_v<Value, LXWChar>) request.take_terminator();
+  // A size in characters says nothing about the end of bytes.
+  const bool endless = sizeof(Out) == 1 && request.characters;
+  Out* const end = endless ? no_end<Out>() : end_of(to.p, request.size);
+  return call.exit(with_cursor(in_cp, form, text, request.length, [&](auto reader) {
+    return with_sink(codepage_of(call.codepage()), form, to.state, to.p, end,
+                     [&](auto writer) { return convert<Value>(reader, writer, request); });
+  }));
 }
 
 /// The object of the common codepage, or null.
@@ -185,86 +137,81 @@ extern "C" {
 
 int32_t LXConvertString(LXLocale* target, char* output, int32_t size, LXLocale* source, const char* input,
                         int32_t length, int32_t flags) {
-  return convert_bytes(target, output, LX_SHIFT_SINGLE, size, source, input, LX_SHIFT_SINGLE, length, flags,
-                       Form::kPlain);
+  return convert_text<LXUChar>(target, buffer_of(output, size), source, text_of(input, length), flags,
+                               kBetweenLocales, Form::kPlain);
 }
 
 int32_t LXConvertStringEx(LXLocale* target, char* output, LXShiftState target_state, int32_t size,
                           LXLocale* source, const char* input, LXShiftState source_state, int32_t length,
                           int32_t flags) {
-  return convert_bytes(target, output, target_state, size, source, input, source_state, length, flags,
-                       Form::kEx);
+  return convert_text<LXUChar>(target, buffer_of(output, size, target_state), source,
+                               text_of(input, length, source_state), flags, kBetweenLocales, Form::kEx);
 }
 
 int32_t LXConvertStringW(LXLocale* target, LXWChar* output, int32_t size, LXLocale* source,
                          const LXWChar* input, int32_t length, int32_t flags) {
-  const LXLocale* from = locale_of(source);
-  return carry_out(
-      target, from, size, input, length, flags, kBetweenLocales,
-      [&](const Codepage& cp, const Request& request) {
-        const CodeCursor reader{codepage_of(*from->codepage), input, input + request.length};
-        return convert<LXUChar>(reader, CodeSink{cp, output, end_of(output, request.size)}, request);
-      });
+  return convert_text<LXUChar>(target, Buffer<LXWChar>{output, size}, source, text_of(input, length), flags,
+                               kBetweenLocales, Form::kWide);
 }
 
 int32_t LXMbToWide(LXLocale* locale, LXWChar* output, int32_t size, const char* input, int32_t length,
                    int32_t flags) {
-  return to_wide(locale, output, size, input, LX_SHIFT_SINGLE, length, flags, Form::kPlain);
+  return convert_text<LXWChar>(locale, Buffer<LXWChar>{output, size}, locale, text_of(input, length), flags,
+                               kPacked, Form::kPlain);
 }
 
 int32_t LXMbToWideEx(LXLocale* locale, LXWChar* output, int32_t size, const char* input, LXShiftState state,
                      int32_t length, int32_t flags) {
-  return to_wide(locale, output, size, input, state, length, flags, Form::kEx);
+  return convert_text<LXWChar>(locale, Buffer<LXWChar>{output, size}, locale, text_of(input, length, state),
+                               flags, kPacked, Form::kEx);
 }
 
 int32_t LXWideToMb(LXLocale* locale, char* output, int32_t size, const LXWChar* input, int32_t length,
                    int32_t flags) {
-  return from_wide(locale, output, LX_SHIFT_SINGLE, size, input, length, flags, Form::kPlain);
+  return convert_text<LXWChar>(locale, buffer_of(output, size), locale, text_of(input, length), flags, kPacked,
+                               Form::kPlain);
 }
 
 int32_t LXWideToMbEx(LXLocale* locale, char* output, LXShiftState state, int32_t size, const LXWChar* input,
                      int32_t length, int32_t flags) {
-  return from_wide(locale, output, state, size, input, length, flags, Form::kEx);
+  return convert_text<LXWChar>(locale, buffer_of(output, size, state), locale, text_of(input, length), flags,
+                               kPacked, Form::kEx);
 }
 
 int32_t LXStringToUnicode(LXUChar* output, int32_t size, LXLocale* locale, const char* input, int32_t length,
                           int32_t flags) {
-  return to_unicode(output, size, locale, input, LX_SHIFT_SINGLE, length, flags, Form::kPlain);
+  return convert_text<LXUChar>(locale, Buffer<LXUChar>{output, size}, locale, text_of(input, length), flags,
+                               kUnicode, Form::kPlain);
 }
 
 int32_t LXStringToUnicodeEx(LXUChar* output, int32_t size, LXLocale* locale, const char* input,
                             LXShiftState state, int32_t length, int32_t flags) {
-  return to_unicode(output, size, locale, input, state, length, flags, Form::kEx);
+  return convert_text<LXUChar>(locale, Buffer<LXUChar>{output, size}, locale, text_of(input, length, state),
+                               flags, kUnicode, Form::kEx);
 }
 
 int32_t LXStringToUnicodeW(LXUChar* output, int32_t size, LXLocale* locale, const LXWChar* input,
                            int32_t length, int32_t flags) {
-  return carry_out(
-      locale, locale_of(locale), size, input, length, flags, kUnicode,
-      [&](const Codepage& cp, const Request& request) {
-        const CodeCursor reader{cp, input, input + request.length};
-        return convert<LXUChar>(reader, UnicodeSink{output, end_of(output, request.size)}, request);
-      });
+  return convert_text<LXUChar>(locale, Buffer<LXUChar>{output, size}, locale, text_of(input, length), flags,
+                               kUnicode, Form::kWide);
 }
 
 int32_t LXUnicodeToString(LXLocale* locale, char* output, int32_t size, const LXUChar* input, int32_t length,
                           int32_t flags) {
-  return from_unicode(locale, output, LX_SHIFT_SINGLE, size, input, length, flags, Form::kPlain);
+  return convert_text<LXUChar>(locale, buffer_of(output, size), locale, text_of(input, length), flags, kUnicode,
+                               Form::kPlain);
 }
 
 int32_t LXUnicodeToStringEx(LXLocale* locale, char* output, LXShiftState state, int32_t size,
                             const LXUChar* input, int32_t length, int32_t flags) {
-  return from_unicode(locale, output, state, size, input, length, flags, Form::kEx);
+  return convert_text<LXUChar>(locale, buffer_of(output, size, state), locale, text_of(input, length), flags,
+                               kUnicode, Form::kEx);
 }
 
 int32_t LXUnicodeToStringW(LXLocale* locale, LXWChar* output, int32_t size, const LXUChar* input,
                            int32_t length, int32_t flags) {
-  return carry_out(
-      locale, locale_of(locale), size, input, length, flags, kUnicode,
-      [&](const Codepage& cp, const Request& request) {
-        const UnicodeCursor reader{input, input + request.length};
-        return convert<LXUChar>(reader, CodeSink{cp, output, end_of(output, request.size)}, request);
-      });
+  return convert_text<LXUChar>(locale, Buffer<LXWChar>{output, size}, locale, text_of(input, length), flags,
+                               kUnicode, Form::kWide);
 }
 
 int32_t LXCpStrToUnicode(const LXObject* codepage, const char* input, int32_t length, LXUChar* output) {

@@ -44,7 +44,7 @@ char* previous_char(const Primitive& in, const char* start, const char* current)
 /// Moves by a length above 0, in whole characters.
 char* move_by(const Codepage& cp, Form form, const char* text, LXShiftState state, int32_t length,
               int32_t flags, LXShiftState* new_state) {
-  const size_t bytes = units_of(cp, ByteText{bytes_of(text), length, state}, (flags & LX_CHARACTERS) != 0);
+  const size_t bytes = units_of(cp, text_of(text, length, state), (flags & LX_CHARACTERS) != 0);
   return with_cursor(cp, form, state, bytes_of(text), bytes, [&](auto at) {
     pass_all(&at);
     put_state(new_state, state_at(at, state));

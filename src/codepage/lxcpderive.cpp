@@ -2,7 +2,7 @@
 // table loads.
 #include <string.h>
 
-#include "codepage/lxcodepage.h"
+#include "codepage/lxwidth.h"
 #include "core/lxmemory.h"
 
 using namespace lx;
@@ -56,13 +56,15 @@ class ReachableNodes {
 struct Layout {
   size_t codes;
   size_t rows;
+  size_t halves;
   size_t leaf;
   size_t bytes;
 
-  Layout(size_t code_rows, bool wide, size_t nodes)
+  Layout(size_t code_rows, bool wide, size_t nodes, size_t half_slots)
       : codes(sizeof(Codepage)),
         rows(codes + code_rows * kRow * (wide ? sizeof(uint32_t) : sizeof(uint16_t))),
-        leaf(rows + nodes * kRow * sizeof(uint16_t)),
+        halves(rows + nodes * kRow * sizeof(uint16_t)),
+        leaf(halves + half_slots * sizeof(uint16_t)),
         bytes(leaf + nodes) {}
 };
 
@@ -186,9 +188,10 @@ void* derive_codepage(uint16_t id, const Sections& sections) {
   for (size_t page = 0; page < kRow; ++page)
     if (!scalars.utf8 && scalars.pages.maps(page)) scalars.page_start[page] = kRow * code_rows++;
   const bool wide = !scalars.utf8 && scalars.width > 2;
-  const Layout layout(code_rows, wide, nodes.count());
+  const size_t half_slots = WidthTables(scalars).slots();
+  const Layout layout(code_rows, wide, nodes.count(), half_slots);
 
-  uint8_t* block = static_cast<uint8_t*>(hook_allocate(layout.bytes));
+  uint8_t* block = static_cast<uint8_t*>(hook_allocate_zeroed(layout.bytes));
   if (block == nullptr) return nullptr;
   Codepage* cp = reinterpret_cast<Codepage*>(block);
   memcpy(cp, &scalars, sizeof(scalars));
@@ -206,6 +209,12 @@ void* derive_codepage(uint16_t id, const Sections& sections) {
     fill_rows(nodes, trie, cp->payload, rows, block + layout.leaf);
     cp->rows = rows;
     cp->leaf = block + layout.leaf;
+  }
+  if (half_slots != 0) {
+    uint16_t* halves = reinterpret_cast<uint16_t*>(block + layout.halves);
+    cp->halves = halves;
+    cp->halves_mask = half_slots - 1;
+    WidthTables(*cp).fill(halves);
   }
   cp->two_level_rows = has_two_level_rows(*cp, nodes.count());
   cp->same_below = same_below(*cp);

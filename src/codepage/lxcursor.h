@@ -24,19 +24,22 @@ namespace lx {
 
 inline constexpr unsigned kAnySame = 0x10000;  // same_below() of 16-bit Unicode
 
-struct SingleByteCursor {
-  using Unit = uint8_t;
+/// Text of which every unit is a character of the codepage: single bytes, or packed codes.
+template <class UnitOf>
+struct UnitCursor {
+  using Unit = UnitOf;
   using Value = LXWChar;
-  static constexpr bool kOneUnit = true, kShifts = false, kUnicode = false, kRuns = true;
+  static constexpr bool kOneUnit = true, kShifts = false, kUnicode = false, kRuns = sizeof(Unit) == 1;
   const Codepage& cp;
-  const uint8_t* p;
-  const uint8_t* end;
+  const Unit* p;
+  const Unit* end;
 
-  static SingleByteCursor over(const Codepage& cp, const Unit* p, const Unit* end, LXShiftState) {
+  static UnitCursor over(const Codepage& cp, const Unit* p, const Unit* end, LXShiftState) {
     return {cp, p, end};
   }
   unsigned same_below() const { return cp.same_below; }
-  void decode(Unit unit, LXUChar* u) const { *u = cp.unicode[unit]; }
+  void decode(uint8_t byte, LXUChar* u) const { *u = cp.unicode[byte]; }
+  void decode(LXWChar code, LXUChar* u) const { *u = code_to_unicode(cp, code); }
   void decode(Unit unit, LXWChar* code) const { *code = unit; }
   size_t read_run(LXUChar* values, size_t most, unsigned below);
   bool pass() {
@@ -51,6 +54,10 @@ struct SingleByteCursor {
     return true;
   }
 };
+using SingleByteCursor = UnitCursor<uint8_t>;
+using CodeCursor = UnitCursor<LXWChar>;
+template <>
+size_t SingleByteCursor::read_run(LXUChar* values, size_t most, unsigned below);
 
 /// Multibyte text by lead-byte lengths; where UTF-8 is computed, by its formula.
 template <bool kUtf8>
@@ -146,32 +153,6 @@ struct ShiftCursor {
     size_t length;
     if (!pass(&length)) return false;
     decode(p - length, value);
-    return true;
-  }
-};
-
-struct CodeCursor {
-  using Unit = LXWChar;
-  using Value = LXWChar;
-  static constexpr bool kOneUnit = true, kShifts = false, kUnicode = false, kRuns = false;
-  const Codepage& cp;
-  const LXWChar* p;
-  const LXWChar* end;
-
-  static CodeCursor over(const Codepage& cp, const Unit* p, const Unit* end, LXShiftState) {
-    return {cp, p, end};
-  }
-  void decode(Unit unit, LXUChar* u) const { *u = code_to_unicode(cp, unit); }
-  void decode(Unit unit, LXWChar* code) const { *code = unit; }
-  bool pass() {
-    if (p == end) return false;
-    ++p;
-    return true;
-  }
-  template <class V>
-  bool next(V* value) {
-    if (p == end) return false;
-    decode(*p++, value);
     return true;
   }
 };

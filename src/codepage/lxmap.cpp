@@ -26,36 +26,28 @@ struct Mode {
   bool specials;
 };
 
+constexpr struct {
+  uint32_t given;
+  Mode mode;
+} kModes[] = {
+    {LX_MAP_UPPER, {Kind::kCase, true, true}},
+    {LX_MAP_LOWER, {Kind::kCase, false, true}},
+    {LX_MAP_UPPER_SIMPLE, {Kind::kCase, true, false}},
+    {LX_MAP_LOWER_SIMPLE, {Kind::kCase, false, false}},
+    {LX_MAP_FULL_WIDTH, {Kind::kFullWidth, false, false}},
+    {LX_MAP_HALF_WIDTH, {Kind::kHalfWidth, false, false}},
+    {LX_MAP_DIGITS, {Kind::kDigits, false, false}},
+    {LX_MAP_COPY, {Kind::kCopy, false, false}},
+};
+
 /// False for a mode that is not listed.
 bool parse_mode(uint32_t given, Mode* mode) {
-  switch (given & ~uint32_t{LX_CHARACTERS}) {
-    case LX_MAP_FULL_WIDTH:
-      *mode = {Kind::kFullWidth, false, false};
-      return true;
-    case LX_MAP_HALF_WIDTH:
-      *mode = {Kind::kHalfWidth, false, false};
-      return true;
-    case LX_MAP_COPY:
-      *mode = {Kind::kCopy, false, false};
-      return true;
-    case LX_MAP_LOWER:
-    case LX_MAP_LOWER_SIMPLE:
-      *mode = {Kind::kCase, false, (given & 0x2000) == 0};
-      return true;
-    case LX_MAP_UPPER:
-    case LX_MAP_UPPER_SIMPLE:
-      *mode = {Kind::kCase, true, (given & 0x2000) == 0};
-      return true;
-    case LX_MAP_DIGITS:
-      *mode = {Kind::kDigits, false, false};
-      return true;
-    default:
-      return false;
+  for (const auto& row : kModes) {
+    if (row.given != (given & ~uint32_t{LX_CHARACTERS})) continue;
+    *mode = row.mode;
+    return true;
   }
-}
-
-uint16_t ascii_digit(uint16_t u) {
-  return (unicode_type(u) & LX_C1_DIGIT) != 0 ? unicode_digit(u) : 0;
+  return false;
 }
 
 // Mappers: what one character maps to by itself. alone() is false when it stays as it is.
@@ -77,7 +69,7 @@ struct UnicodeMapper {
     } else if constexpr (kKind == Kind::kHalfWidth) {
       *mapped = unicode_full_to_half(c.u);
     } else {
-      *mapped = ascii_digit(c.u);
+      *mapped = digit_of(c.u);
       return *mapped != 0;
     }
     return true;
@@ -91,7 +83,6 @@ struct CodepageMapper {
   const uint8_t* table;  // the case of single bytes
   uint32_t mask;
   const WidthTables& widths;
-  const HalfWidthIndex* halves;  // where the kind is half width
   using Value = LXWChar;
 
   uint16_t unicode(const ByteChar& c) const {
@@ -114,9 +105,9 @@ struct CodepageMapper {
     } else if constexpr (kKind == Kind::kFullWidth) {
       *mapped = c.length == 1 ? widths.full_of_byte(*c.p) : widths.to_full(pack(c.p, c.length));
     } else if constexpr (kKind == Kind::kHalfWidth) {
-      *mapped = halves->to_half(pack(c.p, c.length));
+      *mapped = widths.to_half(pack(c.p, c.length));
     } else {
-      const uint16_t digit = ascii_digit(unicode(c));
+      const uint16_t digit = digit_of(unicode(c));
       *mapped = digit != 0 ? unicode_to_code(cp, digit) : 0;
     }
     return *mapped != 0;
@@ -171,112 +162,88 @@ void map_all(Text& text, const Mapper& mapper, const SpecialFilter& filter, cons
   text.finish();
 }
 
-void map_unicode(UnicodeText& text, const SpecialFilter& filter, const Mode& mode) {
-  const Runs runs = runs_of(text, filter, mode.upper);
-  switch (mode.kind) {
-    case Kind::kCase:
-      return map_all(text, UnicodeMapper<Kind::kCase>{mode}, filter, runs);
-    case Kind::kFullWidth:
-      return map_all(text, UnicodeMapper<Kind::kFullWidth>{mode}, filter, runs);
-    case Kind::kHalfWidth:
-      return map_all(text, UnicodeMapper<Kind::kHalfWidth>{mode}, filter, runs);
-    default:
-      return map_all(text, UnicodeMapper<Kind::kDigits>{mode}, filter, runs);
-  }
-}
-
-template <class Text>
-[[gnu::noinline]] void map_half_width(Text& text, const SpecialFilter& filter, const WidthTables& widths) {
-  const HalfWidthIndex index(widths, room(text.in.p, text.in.end) >= kLongText);
-  map_all(text, CodepageMapper<Kind::kHalfWidth>{text.in.cp, nullptr, 0, widths, &index}, filter, Runs{});
-}
-
-/// The text after it is mapped: where its output ends.
-template <class Text>
-auto map_codepage(Text text, const SpecialFilter& filter, const Mode& mode) {
-  const WidthTables widths(text.in.cp);
-  Runs runs{};
-  if constexpr (Text::kRuns)
-    if (mode.kind == Kind::kCase) runs = runs_of(text, filter, mode.upper);
-  const uint8_t* const table = text.in.cp.payload + (mode.upper ? fmt::kUpper : fmt::kLower);
-  const uint32_t mask = mode.upper ? LX_C1_LOWER : LX_C1_UPPER;
+/// Maps a text by the mapper of a kind, which is made of `parts`: where the output ends.
+template <template <Kind> class Mapper, class Text, class... Parts>
+auto map_by_kind(Text text, const Mode& mode, const SpecialFilter& filter, const Runs& runs,
+                 const Parts&... parts) {
   if (mode.kind == Kind::kCase)
-    map_all(text, CodepageMapper<Kind::kCase>{text.in.cp, table, mask, widths, nullptr}, filter, runs);
+    map_all(text, Mapper<Kind::kCase>{parts...}, filter, runs);
   else if (mode.kind == Kind::kFullWidth)
-    map_all(text, CodepageMapper<Kind::kFullWidth>{text.in.cp, table, mask, widths, nullptr}, filter, runs);
+    map_all(text, Mapper<Kind::kFullWidth>{parts...}, filter, runs);
   else if (mode.kind == Kind::kHalfWidth)
-    map_half_width(text, filter, widths);
+    map_all(text, Mapper<Kind::kHalfWidth>{parts...}, filter, runs);
   else
-    map_all(text, CodepageMapper<Kind::kDigits>{text.in.cp, table, mask, widths, nullptr}, filter, runs);
+    map_all(text, Mapper<Kind::kDigits>{parts...}, filter, runs);
   return text.out.p;
 }
 
-size_t map_bytes_to(const LXLocale& locale, uint8_t* output, size_t size, const uint8_t* input, size_t bytes,
-                    const Mode& mode, Form form) {
+template <class Text>
+auto map_codepage(const Text& text, const SpecialFilter& filter, const Mode& mode) {
+  const Codepage& cp = text.in.cp;
+  Runs runs{};
+  if constexpr (Text::kRuns)
+    if (mode.kind == Kind::kCase) runs = runs_of(text, filter, mode.upper);
+  const uint8_t* const table = cp.payload + (mode.upper ? fmt::kUpper : fmt::kLower);
+  const uint32_t mask = mode.upper ? LX_C1_LOWER : LX_C1_UPPER;
+  return map_by_kind<CodepageMapper>(text, mode, filter, runs, cp, table, mask, WidthTables(cp));
+}
+
+/// Maps to `size` units: the units written.
+template <class Unit>
+size_t map_to(const LXLocale& locale, Form form, Unit* output, size_t size, const Unit* input, size_t units,
+              const Mode& mode) {
   const Codepage& cp = codepage_of(*locale.codepage);
   const SpecialFilter filter(*locale.language, mode.specials, mode.upper);
-  uint8_t* const out_end = end_of(output, size);
-  const uint8_t* const end =
-      form == Form::kEx && cp.shift_sensitive
-          ? map_codepage(
-                ShiftText{{cp, input, input + bytes, LX_SHIFT_SINGLE}, {cp, output, out_end, LX_SHIFT_SINGLE}},
-                filter, mode)
-          : map_codepage(LeadByteText{{cp, input, input + bytes}, {cp, output, out_end}}, filter, mode);
-  return static_cast<size_t>(end - output);
+  const Unit* const end = input + units;
+  Unit* const out_end = end_of(output, size);
+  if constexpr (std::is_same_v<Unit, LXUChar>) {
+    const UnicodeText text{{input, end}, {output, out_end}};
+    return room(output,
+                map_by_kind<UnicodeMapper>(text, mode, filter, runs_of(text, filter, mode.upper), mode));
+  } else if constexpr (std::is_same_v<Unit, LXWChar>) {
+    return room(output, map_codepage(WideText{{cp, input, end}, {cp, output, out_end}}, filter, mode));
+  } else if (form == Form::kEx && cp.shift_sensitive) {
+    const ShiftText text{{cp, input, end, LX_SHIFT_SINGLE}, {cp, output, out_end, LX_SHIFT_SINGLE}};
+    return room(output, map_codepage(text, filter, mode));
+  } else {
+    return room(output, map_codepage(LeadByteText{{cp, input, end}, {cp, output, out_end}}, filter, mode));
+  }
 }
 
-int32_t map_bytes(LXLocale* given, char* output, int32_t size, const char* input, int32_t length,
-                  uint32_t given_mode, Form form) {
+template <class Unit>
+int32_t map_text(LXLocale* given, Form form, Unit* output, int32_t size, const Text<Unit>& text,
+                 uint32_t given_mode) {
   Call call(unit, given);
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
-  Mode mode;
-  if (!parse_mode(given_mode, &mode)) return call.fail(LX_E_INVALID, -1);
-  if (size < 1 || length == 0) return call.exit(0);
-  const Codepage& cp = codepage_of(call.codepage());
-  const uint8_t* const text = bytes_of(input);
-  const bool characters = (given_mode & LX_CHARACTERS) != 0;
+  const LXLocale& locale = *call.locale();
+  const Codepage& cp = codepage_of(*locale.codepage);
+  Mode mode{Kind::kCopy, false, false};
+  const bool no_mode = std::is_same_v<Unit, LXUChar> && (given_mode & ~uint32_t{LX_CHARACTERS}) == 0;
+  if (!no_mode && !parse_mode(given_mode, &mode)) return call.fail(LX_E_INVALID, -1);
+  if (size < 1 || text.length == 0) return call.exit(0);
+  const bool characters = sizeof(Unit) == 1 && (given_mode & LX_CHARACTERS) != 0;
   if (mode.kind == Kind::kCopy) {
-    const Part copied = part_that_fits(cp, form, ByteText{text, length}, size, characters);
-    memmove(output, input, copied.units);
+    const Part copied = part_that_fits(cp, form, text, size, characters);
+    memmove(output, text.p, copied.units * sizeof(Unit));
     return call.exit(static_cast<int32_t>(characters ? copied.chars : copied.units));
   }
-  const size_t bytes = units_of(cp, ByteText{text, length}, characters) + (length < 0 ? 1 : 0);
+  const size_t units = units_of(cp, text, characters) + (text.length < 0 ? 1 : 0);
   const size_t room = static_cast<size_t>(size);
-  if (!characters)
-    return call.exit(
-        static_cast<int32_t>(map_bytes_to(*call.locale(), bytes_of(output), room, text, bytes, mode, form)));
-  uint8_t work[kWorkBytes];
-  const size_t work_bytes = room < kWorkBytes / kWorkBytesPerChar ? room * kWorkBytesPerChar : kWorkBytes;
-  size_t mapped = map_bytes_to(*call.locale(), work, work_bytes, text, bytes, mode, form);
-  int32_t chars = chars_in_bytes(cp, work, LX_SHIFT_SINGLE, mapped);
-  if (chars > size) {
-    chars = size;
-    mapped = bytes_of_chars(cp, work, LX_SHIFT_SINGLE, chars, mapped);
+  if constexpr (sizeof(Unit) == 1) {
+    if (characters) {
+      uint8_t work[kWorkBytes];
+      const size_t bytes = room < kWorkBytes / kWorkBytesPerChar ? room * kWorkBytesPerChar : kWorkBytes;
+      size_t mapped = map_to(locale, form, work, bytes, text.p, units, mode);
+      int32_t chars = chars_in_bytes(cp, work, LX_SHIFT_SINGLE, mapped);
+      if (chars > size) {
+        chars = size;
+        mapped = bytes_of_chars(cp, work, LX_SHIFT_SINGLE, chars, mapped);
+      }
+      memcpy(output, work, mapped);
+      return call.exit(chars);
+    }
   }
-  memcpy(output, work, mapped);
-  return call.exit(chars);
-}
-
-/// Texts whose units are characters. `map(locale, input, its end, output, its end, mode)` gives where it ends.
-template <class Unit, class Map>
-int32_t map_units(LXLocale* given, Unit* output, int32_t size, const Unit* input, int32_t length,
-                  uint32_t given_mode, bool copies_without_mode, Map map) {
-  Call call(unit, given);
-  if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
-  Mode mode{Kind::kCopy, false, false};
-  const bool no_mode = copies_without_mode && (given_mode & ~uint32_t{LX_CHARACTERS}) == 0;
-  if (!no_mode && !parse_mode(given_mode, &mode)) return call.fail(LX_E_INVALID, -1);
-  if (size < 1 || length == 0) return call.exit(0);
-  const Codepage& cp = codepage_of(call.codepage());
-  if (mode.kind == Kind::kCopy) {
-    const Part copied = part_that_fits(cp, Form::kPlain, Text<Unit>{input, length}, size, false);
-    memmove(output, input, copied.units * sizeof(Unit));
-    return call.exit(static_cast<int32_t>(copied.units));
-  }
-  const size_t units = text_units_with_null(input, length);
-  const Unit* const end =
-      map(*call.locale(), input, input + units, output, end_of(output, static_cast<size_t>(size)), mode);
-  return call.exit(static_cast<int32_t>(end - output));
+  return call.exit(static_cast<int32_t>(map_to(locale, form, output, room, text.p, units, mode)));
 }
 
 LXUChar mapped_alone(LXLocale* locale, LXUChar u, uint16_t (*map)(uint16_t)) {
@@ -343,34 +310,22 @@ LXWChar LXCpFullToHalfW(const LXObject* codepage, LXWChar code) {
 
 int32_t LXMapString(LXLocale* locale, char* output, int32_t size, const char* input, int32_t length,
                     uint32_t mode) {
-  return map_bytes(locale, output, size, input, length, mode, Form::kPlain);
+  return map_text(locale, Form::kPlain, bytes_of(output), size, text_of(input, length), mode);
 }
 
 int32_t LXMapStringEx(LXLocale* locale, char* output, int32_t size, const char* input, int32_t length,
                       uint32_t mode) {
-  return map_bytes(locale, output, size, input, length, mode, Form::kEx);
+  return map_text(locale, Form::kEx, bytes_of(output), size, text_of(input, length), mode);
 }
 
 int32_t LXMapStringW(LXLocale* locale, LXWChar* output, int32_t size, const LXWChar* input, int32_t length,
                      uint32_t mode) {
-  const auto map = [](const LXLocale& in, const LXWChar* p, const LXWChar* end, LXWChar* out, LXWChar* out_end,
-                      const Mode& parsed) {
-    const Codepage& cp = codepage_of(*in.codepage);
-    const SpecialFilter filter(*in.language, parsed.specials, parsed.upper);
-    return map_codepage(WideText{{cp, p, end}, {cp, out, out_end}}, filter, parsed);
-  };
-  return map_units(locale, output, size, input, length, mode, false, map);
+  return map_text(locale, Form::kWide, output, size, text_of(input, length), mode);
 }
 
 int32_t LXMapStringU(LXLocale* locale, LXUChar* output, int32_t size, const LXUChar* input, int32_t length,
                      uint32_t mode) {
-  const auto map = [](const LXLocale& in, const LXUChar* p, const LXUChar* end, LXUChar* out, LXUChar* out_end,
-                      const Mode& parsed) {
-    UnicodeText text{{p, end}, {out, out_end}};
-    map_unicode(text, SpecialFilter(*in.language, parsed.specials, parsed.upper), parsed);
-    return text.out.p;
-  };
-  return map_units(locale, output, size, input, length, mode, true, map);
+  return map_text(locale, Form::kUnicode, output, size, text_of(input, length), mode);
 }
 
 }  // extern "C"

@@ -18,6 +18,7 @@ uint16_t two_byte_unicode(const uint16_t* rows, const uint8_t* p) {
 
 }  // namespace
 
+template <>
 size_t SingleByteCursor::read_run(LXUChar* values, size_t most, unsigned below) {
   const uint16_t* const unicode = cp.unicode;
   const uint8_t* const start = p;
@@ -148,6 +149,7 @@ size_t ShiftCursor::read_run(LXUChar* values, size_t most, unsigned) {
   return n;
 }
 
+template <>
 void SingleByteSink::put_run(const LXUChar* values, size_t count) {
   constexpr size_t kBatch = 8;
   const uint32_t* const page_start = cp.page_start;

@@ -15,17 +15,23 @@
 
 namespace lx {
 
-struct SingleByteSink {
-  using Unit = uint8_t;
-  static constexpr bool kOneUnit = true, kShifts = false, kCloses = false, kUnicode = false, kRuns = true;
+/// Text of which every unit is a character of the codepage: single bytes, or packed codes.
+template <class UnitOf>
+struct UnitSink {
+  using Unit = UnitOf;
+  static constexpr bool kOneUnit = true, kShifts = false, kCloses = false, kUnicode = false;
+  static constexpr bool kRuns = sizeof(Unit) == 1;
   const Codepage& cp;
-  uint8_t* p;
-  uint8_t* end;
+  Unit* p;
+  Unit* end;
 
-  static SingleByteSink over(const Codepage& cp, Unit* p, Unit* end, LXShiftState) { return {cp, p, end}; }
+  static UnitSink over(const Codepage& cp, Unit* p, Unit* end, LXShiftState) { return {cp, p, end}; }
   unsigned same_below() const { return cp.same_below; }
-  Unit encode(LXUChar u) const { return static_cast<uint8_t>(cp.codes16[cp.page_start[u >> 8] + (u & 0xFFu)]); }
-  Unit encode(LXWChar code) const { return static_cast<uint8_t>(code); }
+  Unit encode(LXUChar u) const {
+    if constexpr (sizeof(Unit) == 1) return static_cast<Unit>(cp.codes16[cp.page_start[u >> 8] + (u & 0xFFu)]);
+    return static_cast<Unit>(unicode_to_code(cp, u));
+  }
+  Unit encode(LXWChar code) const { return static_cast<Unit>(code); }
   size_t most_units() const { return 1; }
   void put_run(const LXUChar* values, size_t count);
   template <class V>
@@ -35,6 +41,10 @@ struct SingleByteSink {
     return true;
   }
 };
+using SingleByteSink = UnitSink<uint8_t>;
+using CodeSink = UnitSink<LXWChar>;
+template <>
+void SingleByteSink::put_run(const LXUChar* values, size_t count);
 
 /// Multibyte text without shift bytes; where UTF-8 is computed, by its formula.
 template <bool kUtf8>
@@ -143,24 +153,6 @@ using ShiftSink = ShiftSinkOf<false>;
 using ClosedShiftSink = ShiftSinkOf<true>;
 template <>
 void ShiftSink::put_run(const LXUChar* values, size_t count);
-
-struct CodeSink {
-  using Unit = LXWChar;
-  static constexpr bool kOneUnit = true, kShifts = false, kCloses = false, kUnicode = false, kRuns = false;
-  const Codepage& cp;
-  LXWChar* p;
-  LXWChar* end;
-
-  static CodeSink over(const Codepage& cp, Unit* p, Unit* end, LXShiftState) { return {cp, p, end}; }
-  Unit encode(LXUChar u) const { return unicode_to_code(cp, u); }
-  Unit encode(LXWChar code) const { return code; }
-  template <class V>
-  bool put(V value) {
-    if (p == end) return false;
-    *p++ = encode(value);
-    return true;
-  }
-};
 
 struct UnicodeSink {
   using Unit = LXUChar;

@@ -100,9 +100,16 @@ struct Text {
   LXShiftState state = LX_SHIFT_SINGLE;
 };
 using ByteText = Text<uint8_t>;
+inline ByteText text_of(const char* p, int32_t length, LXShiftState state = LX_SHIFT_SINGLE) {
+  return {bytes_of(p), length, state};
+}
+template <class Unit>
+Text<Unit> text_of(const Unit* p, int32_t length) {
+  return {p, length};
+}
 
-/// Its units, where a length counts units or, of bytes, characters. At most those up to the end
-/// of memory, so that the end of a text never wraps.
+/// Its units, where a length counts units or, of bytes, characters. At most those up to the end of memory, so
+/// that the end of a text never wraps.
 template <class Unit>
 size_t units_of(const Codepage& cp, const Text<Unit>& text, bool characters) {
   if (text.length < 0) return units_before_null(text.p);

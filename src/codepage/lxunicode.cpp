@@ -7,6 +7,7 @@
 #include <cstddef>
 
 #include "codepage/lxunicode_tables.inc"
+#include "core/lxbytes.h"
 
 namespace lx {
 
@@ -129,17 +130,9 @@ uint16_t unicode_full_to_half(uint16_t u) {
 }
 
 uint16_t unicode_digit(uint16_t u) {
-  size_t low = 0;
-  size_t high = sizeof LXDigits / sizeof LXDigits[0];
-  while (low < high) {
-    const size_t middle = low + (high - low) / 2;
-    if (LXDigits[middle][0] == u) return LXDigits[middle][1];
-    if (LXDigits[middle][0] < u)
-      low = middle + 1;
-    else
-      high = middle;
-  }
-  return 0;
+  constexpr size_t kDigits = sizeof(LXDigits) / sizeof(LXDigits[0]);
+  const size_t at = lower_bound(kDigits, [u](size_t i) { return LXDigits[i][0] < u; });
+  return at != kDigits && LXDigits[at][0] == u ? LXDigits[at][1] : 0;
 }
 
 }  // namespace lx

@@ -4,6 +4,8 @@
 
 #include <cstdint>
 
+#include "lx/codepage.h"
+
 namespace lx {
 
 /// The character-type word: bits 0-9 classification, 10-21 bidirectional category, 22-31 text properties.
@@ -23,6 +25,11 @@ inline bool unicode_caseless(uint16_t u) {
 /// The ASCII digit of a decimal digit, superscript or subscript; 0 for any other value. It knows the digits
 /// U+0F20 to U+0F29, whose type word lacks the decimal-digit bit: who maps text tests the bit first.
 uint16_t unicode_digit(uint16_t u);
+
+/// The ASCII digit that text is mapped to; 0: none.
+inline uint16_t digit_of(uint16_t u) {
+  return (unicode_type(u) & LX_C1_DIGIT) != 0 ? unicode_digit(u) : 0;
+}
 
 /// The type word of a value that has no character.
 inline constexpr uint32_t kTypeUnassigned = 0x400;

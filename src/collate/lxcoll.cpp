@@ -177,8 +177,7 @@ extern "C" {
 
 int32_t LXStrcoll(LXLocale* locale, const char* text1, int32_t length1, const char* text2, int32_t length2,
                   uint32_t options) {
-  return collate<uint8_t>(locale, Form::kPlain, {bytes_of(text1), length1}, {bytes_of(text2), length2}, options,
-                          kPlainRules);
+  return collate(locale, Form::kPlain, text_of(text1, length1), text_of(text2, length2), options, kPlainRules);
 }
 
 int32_t LXStrcollEx(LXLocale* locale, const char* text1, LXShiftState state1, int32_t length1,
@@ -186,18 +185,19 @@ int32_t LXStrcollEx(LXLocale* locale, const char* text1, LXShiftState state1, in
   const LXLocale* used = locale_of(locale);
   if (used == nullptr || !codepage_of(*used->codepage).shift_sensitive)
     return LXStrcoll(locale, text1, length1, text2, length2, options);
-  return collate<uint8_t>(locale, Form::kEx, {bytes_of(text1), length1, state1},
-                          {bytes_of(text2), length2, state2}, options, kExRules);
+  return collate(locale, Form::kEx, text_of(text1, length1, state1), text_of(text2, length2, state2), options,
+                 kExRules);
 }
 
 int32_t LXWcscoll(LXLocale* locale, const LXWChar* text1, int32_t length1, const LXWChar* text2,
                   int32_t length2, uint32_t options) {
-  return collate<LXWChar>(locale, Form::kPlain, {text1, length1}, {text2, length2}, options, kCodeRules);
+  return collate(locale, Form::kPlain, text_of(text1, length1), text_of(text2, length2), options, kCodeRules);
 }
 
 int32_t LXStrcollU(LXLocale* locale, const LXUChar* text1, int32_t length1, const LXUChar* text2,
                    int32_t length2, uint32_t options) {
-  return collate<LXUChar>(locale, Form::kPlain, {text1, length1}, {text2, length2}, options, kUnicodeRules);
+  return collate(locale, Form::kPlain, text_of(text1, length1), text_of(text2, length2), options,
+                 kUnicodeRules);
 }
 
 }  // extern "C"

@@ -51,14 +51,6 @@ int32_t take(const Sort& sort, const Cursor& in, const Step<Unit>& step) {
   return weight_sets(sort, element, step.first, step.second);
 }
 
-ByteText text_at(const char* p, LXShiftState state) {
-  return {bytes_of(p), 0, state};
-}
-template <class Unit>
-Text<Unit> text_at(const Unit* p, LXShiftState state) {
-  return {p, 0, state};
-}
-
 /// The frame of all forms.
 template <class Unit>
 int32_t next_weight(LXLocale* given, Form form, const Step<Unit>& step) {
@@ -67,9 +59,9 @@ int32_t next_weight(LXLocale* given, Form form, const Step<Unit>& step) {
   const LXLocale& locale = *call.locale();
   if (locale.sort == nullptr) return call.fail(LX_E_INVALID, 0);
   const Sort& sort = sort_of(*locale.sort);
-  LXShiftState state = LX_SHIFT_SINGLE;
-  if (step.state != nullptr) state = *step.state;
-  return call.exit(with_cursor(codepage_of(*locale.codepage), form, text_at(*step.text, state), step.units(),
+  auto text = text_of(*step.text, 0);
+  if (step.state != nullptr) text.state = *step.state;
+  return call.exit(with_cursor(codepage_of(*locale.codepage), form, text, step.units(),
                                [&](const auto& in) { return take(sort, in, step); }));
 }
 

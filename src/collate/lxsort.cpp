@@ -106,16 +106,7 @@ void fill_expansions(Sort* sort) {
 
 /// The place of a pair among those in order, or where it belongs.
 size_t place_of(const Pair* pairs, size_t count, uint32_t characters) {
-  size_t low = 0;
-  size_t high = count;
-  while (low < high) {
-    const size_t middle = low + (high - low) / 2;
-    if (pairs[middle].characters < characters)
-      low = middle + 1;
-    else
-      high = middle;
-  }
-  return low;
+  return lower_bound(count, [&](size_t i) { return pairs[i].characters < characters; });
 }
 
 void fill_pairs(Sort* sort, Pair* pairs) {

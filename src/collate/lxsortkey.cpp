@@ -184,22 +184,22 @@ extern "C" {
 
 int32_t LXStrxfrm(LXLocale* locale, uint8_t* output, int32_t size, const char* text, int32_t length,
                   uint32_t options) {
-  return transform<uint8_t>(locale, Form::kPlain, output, size, {bytes_of(text), length}, options);
+  return transform(locale, Form::kPlain, output, size, text_of(text, length), options);
 }
 
 int32_t LXStrxfrmEx(LXLocale* locale, uint8_t* output, int32_t size, const char* text, LXShiftState state,
                     int32_t length, uint32_t options) {
-  return transform<uint8_t>(locale, Form::kEx, output, size, {bytes_of(text), length, state}, options);
+  return transform(locale, Form::kEx, output, size, text_of(text, length, state), options);
 }
 
 int32_t LXWcsxfrm(LXLocale* locale, uint8_t* output, int32_t size, const LXWChar* text, int32_t length,
                   uint32_t options) {
-  return transform<LXWChar>(locale, Form::kPlain, output, size, {text, length}, options);
+  return transform(locale, Form::kPlain, output, size, text_of(text, length), options);
 }
 
 int32_t LXStrxfrmU(LXLocale* locale, uint8_t* output, int32_t size, const LXUChar* text, int32_t length,
                    uint32_t options) {
-  return transform<LXUChar>(locale, Form::kPlain, output, size, {text, length}, options);
+  return transform(locale, Form::kPlain, output, size, text_of(text, length), options);
 }
 
 int32_t LXStrGenSortKey(LXLocale* given, uint8_t* output, int32_t size, const LXUChar* text, int32_t count) {

@@ -127,23 +127,23 @@ extern "C" {
 
 char* LXStrstr(LXLocale* locale, const char* text, int32_t length, const char* part, int32_t part_length,
                uint32_t options) {
-  return chars_of(find_substring(locale, Form::kPlain, ByteText{bytes_of(text), length},
-                                 ByteText{bytes_of(part), part_length}, nullptr, options));
+  return chars_of(find_substring(locale, Form::kPlain, text_of(text, length), text_of(part, part_length),
+                                 nullptr, options));
 }
 char* LXStrstrEx(LXLocale* locale, const char* text, LXShiftState text_state, int32_t length, const char* part,
                  LXShiftState part_state, int32_t part_length, LXShiftState* state, uint32_t options) {
-  return chars_of(find_substring(locale, Form::kEx, ByteText{bytes_of(text), length, text_state},
-                                 ByteText{bytes_of(part), part_length, part_state}, state, options));
+  return chars_of(find_substring(locale, Form::kEx, text_of(text, length, text_state),
+                                 text_of(part, part_length, part_state), state, options));
 }
 LXWChar* LXWcsstr(LXLocale* locale, const LXWChar* text, int32_t length, const LXWChar* part,
                   int32_t part_length, uint32_t options) {
-  return find_substring(locale, Form::kPlain, Text<LXWChar>{text, length}, Text<LXWChar>{part, part_length},
-                        nullptr, options);
+  return find_substring(locale, Form::kPlain, text_of(text, length), text_of(part, part_length), nullptr,
+                        options);
 }
 LXUChar* LXStrstrU(LXLocale* locale, const LXUChar* text, int32_t length, const LXUChar* part,
                    int32_t part_length, uint32_t options) {
-  return find_substring(locale, Form::kPlain, Text<LXUChar>{text, length}, Text<LXUChar>{part, part_length},
-                        nullptr, options);
+  return find_substring(locale, Form::kPlain, text_of(text, length), text_of(part, part_length), nullptr,
+                        options);
 }
 
 }  // extern "C"

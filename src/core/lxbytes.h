@@ -1,5 +1,5 @@
-// Little-endian reads and writes over byte ranges: the only way file memory is read. The compiler turns
-// each into one load or store.
+// Little-endian reads and writes over byte ranges: the only way file memory is read. The compiler turns each
+// into one load or store. And the search in tables that are in order.
 #pragma once
 
 #include <cstddef>
@@ -25,6 +25,20 @@ inline constexpr void put_le16(uint8_t* p, uint16_t v) {
 inline constexpr void put_le32(uint8_t* p, uint32_t v) {
   put_le16(p, static_cast<uint16_t>(v));
   put_le16(p + 2, static_cast<uint16_t>(v >> 16));
+}
+
+/// The first of `count` places in order for which `less(i)` is false, or `count`.
+template <class Less>
+inline size_t lower_bound(size_t count, Less less) {
+  size_t low = 0;
+  while (low < count) {
+    const size_t middle = low + (count - low) / 2;
+    if (less(middle))
+      low = middle + 1;
+    else
+      count = middle;
+  }
+  return low;
 }
 
 /// A range of bytes with its size, as a section of an object file is handed around.

@@ -65,10 +65,6 @@ Sign item_sign(const LXLocale& locale, bool current, int32_t item) {
   return with_first<kForm>(codepage_of(*locale.codepage), sign);
 }
 
-inline uint16_t digit_of(uint16_t u) {
-  return (unicode_type(u) & LX_C1_DIGIT) != 0 ? unicode_digit(u) : 0;
-}
-
 /// What the characters of a text mean.
 template <Form kForm>
 struct Classifier {

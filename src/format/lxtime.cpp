@@ -184,59 +184,45 @@ int32_t refusal(uint32_t flags, int32_t size) {
 }
 
 /// Writes to `units` units and a null where one is asked for: the units written without the null.
-template <class Text>
-size_t format_time(const LXLocale& locale, const LXTime& time, typename Text::Unit* buffer, size_t units,
-                   typename Text::Cursor format, LXShiftState state, uint32_t flags, int32_t* code) {
-  const Codepage& cp = codepage_of(*locale.codepage);
+template <class Kind, class Unit = typename Kind::Unit>
+size_t write_time(const LXLocale& locale, const LXTime& time, Unit* buffer, size_t units,
+                  const typename Kind::Cursor& format, LXShiftState state, uint32_t flags, int32_t* code) {
   const bool null = (flags & LX_TERMINATE) != 0;
-  auto out = Text::sink(cp, buffer, end_of(buffer, units - null), state);
+  auto out = Kind::sink(codepage_of(*locale.codepage), buffer, end_of(buffer, units - null), state);
   if (format.p != format.end)
-    *code = TimeFormatter<Text>(locale, time, (flags & LX_TERRITORY_VALUES) == 0).expand(format, &out);
+    *code = TimeFormatter<Kind>(locale, time, (flags & LX_TERRITORY_VALUES) == 0).expand(format, &out);
   if (null) *out.p = 0;
   return static_cast<size_t>(out.p - buffer);
 }
 
-template <class Text>
-int32_t format_units(LXLocale* given, const LXTime* time, typename Text::Unit* buffer, int32_t size,
-                     const typename Text::Unit* format, int32_t format_length, uint32_t flags) {
-  Call call(unit, given);
-  if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
-  int32_t code = refusal(flags, size);
-  if (code != LX_OK) return call.fail(code, code == LX_E_INVALID ? -1 : 0);
-  const Codepage& cp = codepage_of(call.codepage());
-  const size_t units = text_units(format, format_length);
-  const size_t written = format_time<Text>(*call.locale(), *time, buffer, static_cast<size_t>(size),
-                                           Text::cursor(cp, format, units), LX_SHIFT_SINGLE, flags, &code);
-  return call.end(code, static_cast<int32_t>(written + ((flags & LX_TERMINATE) != 0)));
-}
-
-int32_t format_bytes(LXLocale* given, const LXTime* time, char* buffer, LXShiftState state, int32_t size,
-                     const char* format, LXShiftState format_state, int32_t format_length, uint32_t flags,
-                     Form form) {
+template <class Unit>
+int32_t format_time(LXLocale* given, const LXTime& time, Unit* buffer, LXShiftState state, int32_t size,
+                    const Text<Unit>& format, uint32_t flags, Form form) {
   Call call(unit, given);
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
   int32_t code = refusal(flags, size);
   if (code != LX_OK) return call.fail(code, code == LX_E_INVALID ? -1 : 0);
   const LXLocale& locale = *call.locale();
   const Codepage& cp = codepage_of(*locale.codepage);
-  const bool characters = (flags & LX_CHARACTERS) != 0;
-  const bool null = (flags & LX_TERMINATE) != 0;
+  const bool characters = sizeof(Unit) == 1 && (flags & LX_CHARACTERS) != 0;
+  const size_t null = (flags & LX_TERMINATE) != 0 ? 1 : 0;
   const size_t most = static_cast<size_t>(size);
-  const size_t written = with_kind<uint8_t, ClosedShiftSink>(cp, form, [&](auto text) {
-    using Text = decltype(text);
-    const auto in = given_text<Text>(cp, format, format_state, format_length, characters);
-    uint8_t work[kWorkBytes];
-    // Cleared, since nested formats may leave places unwritten.
-    if (characters) memset(work, 0, sizeof(work));
-    const size_t room = characters ? least(least(most, kWorkBytes) * kWorkBytesPerChar, kWorkBytes) : most;
-    const size_t filled =
-        format_time<Text>(locale, *time, characters ? work : bytes_of(buffer), room, in, state, flags, &code);
-    if (!characters) return null + filled;
-    const Part copied = copy_chars(cp, form, state, work, filled, most - null, bytes_of(buffer));
-    if (null) buffer[copied.units] = 0;
-    return copied.chars + null;
+  const size_t written = with_kind<Unit, ClosedShiftSink>(cp, form, [&](auto kind) {
+    using Kind = decltype(kind);
+    const auto in = given_text<Kind>(cp, format, characters);
+    if constexpr (sizeof(Unit) == 1) {
+      if (characters) {
+        uint8_t work[kWorkBytes] = {};  // cleared, since nested formats may leave places unwritten
+        const size_t room = least(least(most, kWorkBytes) * kWorkBytesPerChar, kWorkBytes);
+        const size_t filled = write_time<Kind>(locale, time, work, room, in, state, flags, &code);
+        const Part copied = copy_chars(cp, form, state, work, filled, most - null, buffer);
+        if (null != 0) buffer[copied.units] = 0;
+        return copied.chars;
+      }
+    }
+    return write_time<Kind>(locale, time, buffer, most, in, state, flags, &code);
   });
-  return call.end(code, static_cast<int32_t>(written));
+  return call.end(code, static_cast<int32_t>(written + null));
 }
 
 }  // namespace
@@ -245,23 +231,26 @@ extern "C" {
 
 int32_t LXTimeToString(LXLocale* locale, const LXTime* time, char* buffer, int32_t size, const char* format,
                        int32_t format_length, uint32_t flags) {
-  return format_bytes(locale, time, buffer, LX_SHIFT_SINGLE, size, format, LX_SHIFT_SINGLE, format_length,
-                      flags, Form::kPlain);
+  return format_time(locale, *time, bytes_of(buffer), LX_SHIFT_SINGLE, size, text_of(format, format_length),
+                     flags, Form::kPlain);
 }
 
 int32_t LXTimeToStringW(LXLocale* locale, const LXTime* time, LXWChar* buffer, int32_t size,
                         const LXWChar* format, int32_t format_length, uint32_t flags) {
-  return format_units<WideKind>(locale, time, buffer, size, format, format_length, flags);
+  return format_time(locale, *time, buffer, LX_SHIFT_SINGLE, size, text_of(format, format_length), flags,
+                     Form::kWide);
 }
 
 int32_t LXTimeToStringU(LXLocale* locale, const LXTime* time, LXUChar* buffer, int32_t size,
                         const LXUChar* format, int32_t format_length, uint32_t flags) {
-  return format_units<UnicodeKind>(locale, time, buffer, size, format, format_length, flags);
+  return format_time(locale, *time, buffer, LX_SHIFT_SINGLE, size, text_of(format, format_length), flags,
+                     Form::kUnicode);
 }
 
 int32_t LXTimeToStringEx(LXLocale* locale, const LXTime* time, char* buffer, LXShiftState state, int32_t size,
                          const char* format, LXShiftState format_state, int32_t format_length, uint32_t flags) {
-  return format_bytes(locale, time, buffer, state, size, format, format_state, format_length, flags, Form::kEx);
+  return format_time(locale, *time, bytes_of(buffer), state, size, text_of(format, format_length, format_state),
+                     flags, Form::kEx);
 }
 
 }  // extern "C"

@@ -181,48 +181,30 @@ class TimeParser {
   const bool current_;
 };
 
-/// The units read, or -1.
-template <class Text>
-int32_t parse_time(const LXLocale& locale, LXTime* time, const typename Text::Cursor& given,
-                   const typename Text::Cursor& format, uint32_t flags, int32_t* code) {
-  if (given.p == given.end || format.p == format.end) return 0;
-  auto text = given;
-  *code = TimeParser<Text>(locale, time, (flags & LX_TERRITORY_VALUES) == 0).match(format, &text);
-  return *code == LX_OK ? static_cast<int32_t>(text.p - given.p) : -1;
-}
-
-template <class Text>
-int32_t parse_units(LXLocale* given, LXTime* time, const typename Text::Unit* text, int32_t length,
-                    const typename Text::Unit* format, int32_t format_length, uint32_t flags) {
-  Call call(unit, given);
-  if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
-  if ((flags & ~kFlags) != 0) return call.fail(LX_E_INVALID, -1);
-  const Codepage& cp = codepage_of(call.codepage());
-  int32_t code = LX_OK;
-  const int32_t read =
-      parse_time<Text>(*call.locale(), time, Text::cursor(cp, text, text_units(text, length)),
-                       Text::cursor(cp, format, text_units(format, format_length)), flags, &code);
-  return call.end(code, read);
-}
-
-int32_t parse_bytes(LXLocale* given, LXTime* time, const char* text, LXShiftState state, int32_t length,
-                    const char* format, LXShiftState format_state, int32_t format_length, uint32_t flags,
-                    Form form) {
+template <class Unit>
+int32_t parse_time(LXLocale* given, LXTime* time, const Text<Unit>& text, const Text<Unit>& format,
+                   uint32_t flags, Form form) {
   Call call(unit, given);
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
   if ((flags & ~kFlags) != 0) return call.fail(LX_E_INVALID, -1);
   const LXLocale& locale = *call.locale();
   const Codepage& cp = codepage_of(*locale.codepage);
-  const bool characters = (flags & LX_CHARACTERS) != 0;
+  const bool characters = sizeof(Unit) == 1 && (flags & LX_CHARACTERS) != 0;
   int32_t code = LX_OK;
-  const int32_t read = with_kind<uint8_t, ClosedShiftSink>(cp, form, [&](auto kind) {
-    using Text = decltype(kind);
-    const auto in = given_text<Text>(cp, text, state, length, characters);
-    const int32_t bytes = parse_time<Text>(
-        locale, time, in, given_text<Text>(cp, format, format_state, format_length, characters), flags, &code);
-    if (bytes < 0 || !characters) return bytes;
-    auto taken = Text::cursor(cp, in.p, static_cast<size_t>(bytes), state);
-    return static_cast<int32_t>(pass_all(&taken));
+  const int32_t read = with_kind<Unit, ClosedShiftSink>(cp, form, [&](auto kind) {
+    using Kind = decltype(kind);
+    const auto start = given_text<Kind>(cp, text, characters);
+    const auto wanted = given_text<Kind>(cp, format, characters);
+    if (start.p == start.end || wanted.p == wanted.end) return 0;
+    auto in = start;
+    code = TimeParser<Kind>(locale, time, (flags & LX_TERRITORY_VALUES) == 0).match(wanted, &in);
+    if (code != LX_OK) return -1;
+    size_t taken = room(start.p, in.p);
+    if (characters) {
+      auto counted = Kind::cursor(cp, start.p, taken, text.state);
+      taken = pass_all(&counted);
+    }
+    return static_cast<int32_t>(taken);
   });
   return call.end(code, read);
 }
@@ -233,23 +215,23 @@ extern "C" {
 
 int32_t LXStringToTime(LXLocale* locale, LXTime* time, const char* text, int32_t length, const char* format,
                        int32_t format_length, uint32_t flags) {
-  return parse_bytes(locale, time, text, LX_SHIFT_SINGLE, length, format, LX_SHIFT_SINGLE, format_length, flags,
-                     Form::kPlain);
+  return parse_time(locale, time, text_of(text, length), text_of(format, format_length), flags, Form::kPlain);
 }
 
 int32_t LXStringToTimeW(LXLocale* locale, LXTime* time, const LXWChar* text, int32_t length,
                         const LXWChar* format, int32_t format_length, uint32_t flags) {
-  return parse_units<WideKind>(locale, time, text, length, format, format_length, flags);
+  return parse_time(locale, time, text_of(text, length), text_of(format, format_length), flags, Form::kWide);
 }
 
 int32_t LXStringToTimeU(LXLocale* locale, LXTime* time, const LXUChar* text, int32_t length,
                         const LXUChar* format, int32_t format_length, uint32_t flags) {
-  return parse_units<UnicodeKind>(locale, time, text, length, format, format_length, flags);
+  return parse_time(locale, time, text_of(text, length), text_of(format, format_length), flags, Form::kUnicode);
 }
 
 int32_t LXStringToTimeEx(LXLocale* locale, LXTime* time, const char* text, LXShiftState state, int32_t length,
                          const char* format, LXShiftState format_state, int32_t format_length, uint32_t flags) {
-  return parse_bytes(locale, time, text, state, length, format, format_state, format_length, flags, Form::kEx);
+  return parse_time(locale, time, text_of(text, length, state), text_of(format, format_length, format_state),
+                    flags, Form::kEx);
 }
 
 }  // extern "C"

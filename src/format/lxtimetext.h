@@ -46,16 +46,15 @@ bool copy_char(const typename Text::Cursor& in, const typename Text::Unit* befor
   }
 }
 
-/// The cursor of a byte text that a caller gave, whose length counts bytes, or characters. Nothing behind the
-/// last character is looked at.
-template <class Text>
-typename Text::Cursor given_text(const Codepage& cp, const char* text, LXShiftState state, int32_t length,
-                                 bool characters) {
-  const uint8_t* const p = bytes_of(text);
-  if (length < 0 || !characters) return Text::cursor(cp, p, text_units(p, length), state);
-  auto in = Text::Cursor::over(cp, p, no_end<const uint8_t>(), state);
-  for (int32_t left = length; left > 0; --left) in.pass();
-  return Text::cursor(cp, p, room(p, in.p), state);
+/// The cursor of a text that a caller gave, whose length counts units or, of bytes, characters. Nothing behind
+/// the last character is looked at.
+template <class Kind, class Unit = typename Kind::Unit>
+typename Kind::Cursor given_text(const Codepage& cp, const Text<Unit>& text, bool characters) {
+  if (text.length < 0 || !characters)
+    return Kind::cursor(cp, text.p, text_units(text.p, text.length), text.state);
+  auto in = Kind::Cursor::over(cp, text.p, no_end<const Unit>(), text.state);
+  for (int32_t left = text.length; left > 0; --left) in.pass();
+  return Kind::cursor(cp, text.p, room(text.p, in.p), text.state);
 }
 
 /// Names and nested formats are used as far as they fit before a null.

@@ -92,32 +92,27 @@ template <class Unit>
 int32_t find_objects(LXLocale* locale, const LocaleName<Unit>& name, int32_t flags) {
   namespace words = format::language;
   int32_t rc = LX_E_NOT_FOUND;
+  const auto check = [&rc](const LXObject* object, int32_t not_found, const char* title) {
+    const int32_t code = lookup_code(object, rc, not_found);
+    if (code != LX_OK) LX_TRACE(unit, RAS1_LEVEL_ERRORS, "Unable to locate %s, rc = %d", title, rc);
+    return code;
+  };
   const bool is_default = !name.language.named;
   if (!is_default) locale->language = find(LX_LANGUAGE, name.language, &rc);
   if (is_default || (rc == LX_E_NOT_FOUND && (flags & LX_FALLBACK) != 0)) {
     const Part<char> english{kDefaultLanguage, static_cast<int32_t>(strlen(kDefaultLanguage)), true};
     locale->language = find(LX_LANGUAGE, english, &rc);
   }
-  if (const int32_t code = lookup_code(locale->language, rc, LX_E_NO_LANGUAGE)) {
-    LX_TRACE(unit, RAS1_LEVEL_ERRORS, "Unable to locate language, rc = %d", rc);
-    return code;
-  }
-  const LXObject& language = *locale->language;
-  locale->territory =
-      find_or_default(LX_TERRITORY, name.territory, language, words::kDefaultTerritory, flags, &rc);
-  if (const int32_t code = lookup_code(locale->territory, rc, LX_E_NO_TERRITORY)) {
-    LX_TRACE(unit, RAS1_LEVEL_ERRORS, "Unable to locate territory, rc = %d", rc);
-    return code;
-  }
-  locale->codepage = find_or_default(LX_CODEPAGE, name.codepage, language, words::kDefaultCodepage, flags, &rc);
-  if (const int32_t code = lookup_code(locale->codepage, rc, LX_E_NO_CODEPAGE)) {
-    LX_TRACE(unit, RAS1_LEVEL_ERRORS, "Unable to locate code page, rc = %d", rc);
-    return code;
-  }
-  locale->sort = find_or_default(LX_SORT, name.sort, language, words::kDefaultSort, flags, &rc);
-  const int32_t code = lookup_code(locale->sort, rc, LX_E_NO_SORT);
-  if (code != LX_OK) LX_TRACE(unit, RAS1_LEVEL_ERRORS, "Unable to locate sort, rc = %d", rc);
-  return code;
+  if (const int32_t code = check(locale->language, LX_E_NO_LANGUAGE, "language")) return code;
+  const auto find_other = [&](int32_t type, const Part<Unit>& part, size_t default_word) {
+    return find_or_default(type, part, *locale->language, default_word, flags, &rc);
+  };
+  locale->territory = find_other(LX_TERRITORY, name.territory, words::kDefaultTerritory);
+  if (const int32_t code = check(locale->territory, LX_E_NO_TERRITORY, "territory")) return code;
+  locale->codepage = find_other(LX_CODEPAGE, name.codepage, words::kDefaultCodepage);
+  if (const int32_t code = check(locale->codepage, LX_E_NO_CODEPAGE, "code page")) return code;
+  locale->sort = find_other(LX_SORT, name.sort, words::kDefaultSort);
+  return check(locale->sort, LX_E_NO_SORT, "sort");
 }
 
 /// Finds the objects of a locale and fills its values.

@@ -118,9 +118,15 @@ int32_t convert_values(LXLocale* locale, const Codepage& from, const LXLocale& s
   return LX_OK;
 }
 
-/// Whether a public function was given a loaded object of the type that it needs.
-bool is_loaded(const LXObject* object, int32_t type) {
-  return object != nullptr && object->disk.type == type && object->section[0] != nullptr;
+/// The frame of the functions that give a locale another object, which must be a loaded one of its type.
+int32_t change_object(LXLocale* given, LXObject* object, int32_t type,
+                      int32_t (*change)(LXLocale*, LXObject*)) {
+  Call call(unit, given);
+  if (!call) return call.fail(LX_E_NOT_INITIALIZED, LX_E_NOT_INITIALIZED);
+  if (object == nullptr || object->disk.type != type || object->section[0] == nullptr)
+    return call.fail(LX_E_NOT_FOUND, LX_E_NOT_FOUND);
+  const int32_t code = change(call.locale(), object);
+  return call.end(code, code);
 }
 
 }  // namespace
@@ -199,26 +205,16 @@ int32_t change_codepage(LXLocale* locale, LXObject* codepage) {
 extern "C" {
 
 int32_t LXLocaleSetModifiable(LXLocale* given) {
-  Call call(unit, given);
-  if (!call) return call.fail(LX_E_NOT_INITIALIZED, LX_E_NOT_INITIALIZED);
-  const int32_t code = change_territory(call.locale(), call.locale()->territory);
-  return call.end(code, code);
+  const LXLocale* locale = locale_of(given);
+  return change_object(given, locale != nullptr ? locale->territory : nullptr, LX_TERRITORY, change_territory);
 }
 
 int32_t LXLocaleChangeTerritory(LXLocale* given, LXObject* land) {
-  Call call(unit, given);
-  if (!call) return call.fail(LX_E_NOT_INITIALIZED, LX_E_NOT_INITIALIZED);
-  if (!is_loaded(land, LX_TERRITORY)) return call.fail(LX_E_NOT_FOUND, LX_E_NOT_FOUND);
-  const int32_t code = change_territory(call.locale(), land);
-  return call.end(code, code);
+  return change_object(given, land, LX_TERRITORY, change_territory);
 }
 
 int32_t LXLocaleChangeCodePage(LXLocale* given, LXObject* codepage) {
-  Call call(unit, given);
-  if (!call) return call.fail(LX_E_NOT_INITIALIZED, LX_E_NOT_INITIALIZED);
-  if (!is_loaded(codepage, LX_CODEPAGE)) return call.fail(LX_E_NOT_FOUND, LX_E_NOT_FOUND);
-  const int32_t code = change_codepage(call.locale(), codepage);
-  return call.end(code, code);
+  return change_object(given, codepage, LX_CODEPAGE, change_codepage);
 }
 
 }  // extern "C"

@@ -163,21 +163,19 @@ class LocaleName {
  public:
   const char* text() const { return text_; }
 
-  /// 0, 30, 31 or 34.
+  /// LX_OK, or the code of the first part that there is no object for.
   int32_t build(int32_t language_territory, int32_t codepage) {
-    const int32_t language = language_of(language_territory);
-    const int32_t territory = territory_of(language_territory);
-    if (!append("", LX_LANGUAGE, language)) {
-      LX_TRACE(unit, RAS1_LEVEL_DETAIL, "Invalid Language %d", language);
-      return LX_E_NO_LANGUAGE;
-    }
-    if (!append("_", LX_TERRITORY, territory)) {
-      LX_TRACE(unit, RAS1_LEVEL_DETAIL, "Invalid Territory %d", territory);
-      return LX_E_NO_TERRITORY;
-    }
-    if (!append(".", LX_CODEPAGE, codepage)) {
-      LX_TRACE(unit, RAS1_LEVEL_DETAIL, "Invalid Codepage %d", codepage);
-      return LX_E_NO_CODEPAGE;
+    const struct {
+      const char* mark;
+      int32_t type, id, code;
+      const char* title;
+    } parts[] = {{"", LX_LANGUAGE, language_of(language_territory), LX_E_NO_LANGUAGE, "Language"},
+                 {"_", LX_TERRITORY, territory_of(language_territory), LX_E_NO_TERRITORY, "Territory"},
+                 {".", LX_CODEPAGE, codepage, LX_E_NO_CODEPAGE, "Codepage"}};
+    for (const auto& part : parts) {
+      if (append(part.mark, part.type, part.id)) continue;
+      LX_TRACE(unit, RAS1_LEVEL_DETAIL, "Invalid %s %d", part.title, part.id);
+      return part.code;
     }
     return LX_OK;
   }

@@ -75,19 +75,19 @@ extern "C" {
 
 char* LXGetEol(LXLocale* locale, const char* text, int32_t length, uint32_t* kind, int32_t* eol_length,
                uint32_t flags) {
-  return chars_of(find(locale, Form::kPlain, ByteText{bytes_of(text), length}, kind, eol_length, flags));
+  return chars_of(find(locale, Form::kPlain, text_of(text, length), kind, eol_length, flags));
 }
 char* LXGetEolEx(LXLocale* locale, const char* text, int32_t length, uint32_t* kind, int32_t* eol_length,
                  uint32_t flags) {
-  return chars_of(find(locale, Form::kEx, ByteText{bytes_of(text), length}, kind, eol_length, flags));
+  return chars_of(find(locale, Form::kEx, text_of(text, length), kind, eol_length, flags));
 }
 LXWChar* LXGetEolW(LXLocale* locale, const LXWChar* text, int32_t length, uint32_t* kind, int32_t* eol_length,
                    uint32_t flags) {
-  return find(locale, Form::kPlain, Text<LXWChar>{text, length}, kind, eol_length, flags);
+  return find(locale, Form::kPlain, text_of(text, length), kind, eol_length, flags);
 }
 LXUChar* LXGetEolU(LXLocale* locale, const LXUChar* text, int32_t length, uint32_t* kind, int32_t* eol_length,
                    uint32_t flags) {
-  return find(locale, Form::kPlain, Text<LXUChar>{text, length}, kind, eol_length, flags);
+  return find(locale, Form::kPlain, text_of(text, length), kind, eol_length, flags);
 }
 
 char* LXPutEol(LXLocale* locale, char* output, uint32_t flags) {

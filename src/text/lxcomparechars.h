@@ -17,17 +17,11 @@ void dump_texts(RAS1_Unit& unit, const CountedText<Unit>& a, const CountedText<U
   RAS1_Dump(&unit, __LINE__, b.p, b.units * sizeof(Unit), "String2");
 }
 
-inline size_t length_at(const MultiByteCursor& in) {
-  return in.cp.length(*in.p);
-}
-inline size_t length_at(const ShiftCursor& in) {
-  return in.cp.width_in(in.state);
-}
-inline bool pass_shift(MultiByteCursor*) {
+/// Shift bytes are passed apart from characters.
+template <class Cursor>
+bool pass_shift(Cursor* in) {
+  if constexpr (Cursor::kShifts) return in->pass_shift();
   return false;
-}
-inline bool pass_shift(ShiftCursor* in) {
-  return in->p != in->end && take_shift(in->cp, &in->p, &in->state);
 }
 template <class Cursor>
 size_t left(const Cursor& in) {
@@ -109,9 +103,9 @@ int32_t compare_case(Cursor a, Cursor b) {
       pass_shift(&b);
       continue;
     }
-    const size_t length = length_at(a);
-    if (length != length_at(b) || length > left(a) || length > left(b))
-      return difference(static_cast<int64_t>(length), static_cast<int64_t>(length_at(b)));
+    const size_t length = a.length();
+    if (length != b.length() || length > left(a) || length > left(b))
+      return difference(static_cast<int64_t>(length), static_cast<int64_t>(b.length()));
     if (length == 1) {
       if (fold[*a.p] != fold[*b.p]) return case_difference(a, b, fold[*a.p], fold[*b.p]);
     } else if (!same_bytes(a.p, b.p, length)) {
@@ -137,8 +131,8 @@ inline Char half_width(const Codepage& cp, const uint8_t* p, size_t length, size
 
 /// Compares the characters at both places, which differ: true when that decides, with the result.
 inline bool width_differs(RAS1_Unit&, const MultiByteCursor& a, const MultiByteCursor& b, int32_t* result) {
-  const Char x = half_width(a.cp, a.p, length_at(a), left(a));
-  const Char y = half_width(b.cp, b.p, length_at(b), left(b));
+  const Char x = half_width(a.cp, a.p, a.length(), left(a));
+  const Char y = half_width(b.cp, b.p, b.length(), left(b));
   const size_t x_length = a.cp.length(x.bytes[0]);
   const size_t y_length = b.cp.length(y.bytes[0]);
   const size_t at = first_difference(x, y);
@@ -152,8 +146,8 @@ inline bool width_differs(RAS1_Unit&, const MultiByteCursor& a, const MultiByteC
   return true;
 }
 inline bool width_differs(RAS1_Unit& unit, const ShiftCursor& a, const ShiftCursor& b, int32_t* result) {
-  const size_t a_length = length_at(a);
-  const size_t b_length = length_at(b);
+  const size_t a_length = a.length();
+  const size_t b_length = b.length();
   // A cut character is not entered: what is left decides.
   if (a_length > left(a) || b_length > left(b)) {
     *result = left_difference(a, b);
@@ -186,13 +180,13 @@ int32_t compare_width(RAS1_Unit& unit, Cursor a, Cursor b) {
     while (pass_shift(&b)) continue;
     if (a.p == a.end || b.p == b.end) return left_difference(a, b);
     // Where there is room for every form, equal characters need not be mapped.
-    const size_t length = length_at(a);
+    const size_t length = a.length();
     const bool same =
-        least(left(a), left(b)) >= a.cp.width && length == length_at(b) && same_bytes(a.p, b.p, length);
+        least(left(a), left(b)) >= a.cp.width && length == b.length() && same_bytes(a.p, b.p, length);
     int32_t result = 0;
     if (!same && width_differs(unit, a, b, &result)) return result;
     a.p += length;
-    b.p += length_at(b);
+    b.p += b.length();
   }
 }
 

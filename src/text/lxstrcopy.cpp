@@ -127,38 +127,38 @@ extern "C" {
 
 int32_t LXStrcat(LXLocale* locale, char* buffer, int32_t size, const char* text, int32_t length,
                  uint32_t flags) {
-  return concatenate(locale, Form::kPlain, bytes_of(buffer), 0, size, ByteText{bytes_of(text), length}, flags);
+  return concatenate(locale, Form::kPlain, bytes_of(buffer), 0, size, text_of(text, length), flags);
 }
 int32_t LXStrcatEx(LXLocale* locale, char* buffer, LXShiftState buffer_state, int32_t size, const char* text,
                    LXShiftState text_state, int32_t length, uint32_t flags) {
-  return concatenate(locale, Form::kEx, bytes_of(buffer), buffer_state, size,
-                     ByteText{bytes_of(text), length, text_state}, flags);
+  return concatenate(locale, Form::kEx, bytes_of(buffer), buffer_state, size, text_of(text, length, text_state),
+                     flags);
 }
 int32_t LXWcscat(LXLocale* locale, LXWChar* buffer, int32_t size, const LXWChar* text, int32_t length,
                  uint32_t flags) {
-  return concatenate(locale, Form::kPlain, buffer, 0, size, Text<LXWChar>{text, length}, flags);
+  return concatenate(locale, Form::kPlain, buffer, 0, size, text_of(text, length), flags);
 }
 int32_t LXStrcatU(LXLocale* locale, LXUChar* buffer, int32_t size, const LXUChar* text, int32_t length,
                   uint32_t flags) {
-  return concatenate(locale, Form::kPlain, buffer, 0, size, Text<LXUChar>{text, length}, flags);
+  return concatenate(locale, Form::kPlain, buffer, 0, size, text_of(text, length), flags);
 }
 
 int32_t LXStrcpy(LXLocale* locale, char* output, int32_t size, const char* text, int32_t length,
                  uint32_t flags) {
-  return copy(locale, Form::kPlain, bytes_of(output), size, ByteText{bytes_of(text), length}, nullptr, flags);
+  return copy(locale, Form::kPlain, bytes_of(output), size, text_of(text, length), nullptr, flags);
 }
 int32_t LXStrcpyEx(LXLocale* locale, char* output, int32_t size, const char* text, LXShiftState text_state,
                    int32_t length, LXShiftState* state, uint32_t flags) {
-  const ByteText in{bytes_of(text), length, text_state};
+  const ByteText in = text_of(text, length, text_state);
   return copy(locale, Form::kEx, bytes_of(output), size, in, state, flags);
 }
 int32_t LXWcscpy(LXLocale* locale, LXWChar* output, int32_t size, const LXWChar* text, int32_t length,
                  uint32_t flags) {
-  return copy(locale, Form::kPlain, output, size, Text<LXWChar>{text, length}, nullptr, flags);
+  return copy(locale, Form::kPlain, output, size, text_of(text, length), nullptr, flags);
 }
 int32_t LXStrcpyU(LXLocale* locale, LXUChar* output, int32_t size, const LXUChar* text, int32_t length,
                   uint32_t flags) {
-  return copy(locale, Form::kPlain, output, size, Text<LXUChar>{text, length}, nullptr, flags);
+  return copy(locale, Form::kPlain, output, size, text_of(text, length), nullptr, flags);
 }
 
 }  // extern "C"

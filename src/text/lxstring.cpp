@@ -69,11 +69,6 @@ class CharacterSet {
   bool others_ = false;
 };
 
-/// Takes a shift byte that ends the text.
-bool take_last_shift(ShiftCursor* in) {
-  return in->end - in->p == 1 && take_shift(in->cp, &in->p, &in->state);
-}
-
 /// The characters that a text begins with, `wanted` or not in a set.
 template <class Cursor>
 struct Span {
@@ -88,8 +83,7 @@ Span<Cursor> span(const Cursor& text, const CharacterSet<Cursor>& set, bool want
     go_on_at(taken.behind, at.in);
   if constexpr (Cursor::kShifts) {
     Cursor& in = taken.behind;
-    if (!take_last_shift(&in) && in.p < in.end && taken.chars != 0 && *in.p == in.cp.shift_in)
-      take_shift(in.cp, &in.p, &in.state);
+    if (!in.pass_last_shift() && in.p < in.end && taken.chars != 0 && *in.p == in.cp.shift_in) in.pass_shift();
   }
   return taken;
 }
@@ -119,7 +113,7 @@ void overwrite_delimiter(Cursor* in) {
   go_on_at(*in, at.in);
   if (!whole) in->p = in->end;
   for (auto* p = first; p < in->p; ++p) *p = 0;
-  if constexpr (Cursor::kShifts) take_last_shift(in);
+  if constexpr (Cursor::kShifts) in->pass_last_shift();
 }
 
 /// Where the token begins, or null; `*rest` is left at the text that follows it.
@@ -181,19 +175,19 @@ int32_t length_of(LXLocale* given, const Unit* text) {
 extern "C" {
 
 char* LXStrchr(LXLocale* locale, const char* text, int32_t length, LXWChar character, uint32_t flags) {
-  const ByteText in{bytes_of(text), length};
+  const ByteText in = text_of(text, length);
   return chars_of(find_character(locale, Form::kPlain, in, character, nullptr, flags));
 }
 char* LXStrchrEx(LXLocale* locale, const char* text, LXShiftState text_state, int32_t length, LXWChar character,
                  LXShiftState* state, uint32_t flags) {
-  const ByteText in{bytes_of(text), length, text_state};
+  const ByteText in = text_of(text, length, text_state);
   return chars_of(find_character(locale, Form::kEx, in, character, state, flags));
 }
 LXWChar* LXWcschr(LXLocale* locale, const LXWChar* text, int32_t length, LXWChar character, uint32_t flags) {
-  return find_character(locale, Form::kPlain, Text<LXWChar>{text, length}, character, nullptr, flags);
+  return find_character(locale, Form::kPlain, text_of(text, length), character, nullptr, flags);
 }
 LXUChar* LXStrchrU(LXLocale* locale, const LXUChar* text, int32_t length, LXUChar character, uint32_t flags) {
-  return find_character(locale, Form::kPlain, Text<LXUChar>{text, length}, character, nullptr, flags);
+  return find_character(locale, Form::kPlain, text_of(text, length), character, nullptr, flags);
 }
 
 int32_t LXWcslen(LXLocale* locale, const LXWChar* text) {
@@ -205,69 +199,67 @@ int32_t LXStrlenU(LXLocale* locale, const LXUChar* text) {
 
 int32_t LXStrcspn(LXLocale* locale, const char* text, int32_t length, const char* set, int32_t set_length,
                   uint32_t flags) {
-  return span_of_set(locale, Form::kPlain, ByteText{bytes_of(text), length}, {bytes_of(set), set_length}, false,
-                     nullptr, flags);
+  return span_of_set(locale, Form::kPlain, text_of(text, length), text_of(set, set_length), false, nullptr,
+                     flags);
 }
 int32_t LXStrcspnEx(LXLocale* locale, const char* text, LXShiftState text_state, int32_t length,
                     const char* set, LXShiftState set_state, int32_t set_length, LXShiftState* state,
                     uint32_t flags) {
-  return span_of_set(locale, Form::kEx, ByteText{bytes_of(text), length, text_state},
-                     {bytes_of(set), set_length, set_state}, false, state, flags);
+  return span_of_set(locale, Form::kEx, text_of(text, length, text_state), text_of(set, set_length, set_state),
+                     false, state, flags);
 }
 int32_t LXWcscspn(LXLocale* locale, const LXWChar* text, int32_t length, const LXWChar* set, int32_t set_length,
                   uint32_t flags) {
-  return span_of_set(locale, Form::kPlain, Text<LXWChar>{text, length}, {set, set_length}, false, nullptr,
+  return span_of_set(locale, Form::kPlain, text_of(text, length), text_of(set, set_length), false, nullptr,
                      flags);
 }
 int32_t LXStrcspnU(LXLocale* locale, const LXUChar* text, int32_t length, const LXUChar* set,
                    int32_t set_length, uint32_t flags) {
-  return span_of_set(locale, Form::kPlain, Text<LXUChar>{text, length}, {set, set_length}, false, nullptr,
+  return span_of_set(locale, Form::kPlain, text_of(text, length), text_of(set, set_length), false, nullptr,
                      flags);
 }
 int32_t LXStrspn(LXLocale* locale, const char* text, int32_t length, const char* set, int32_t set_length,
                  uint32_t flags) {
-  return span_of_set(locale, Form::kPlain, ByteText{bytes_of(text), length}, {bytes_of(set), set_length}, true,
-                     nullptr, flags);
+  return span_of_set(locale, Form::kPlain, text_of(text, length), text_of(set, set_length), true, nullptr,
+                     flags);
 }
 int32_t LXStrspnEx(LXLocale* locale, const char* text, LXShiftState text_state, int32_t length, const char* set,
                    LXShiftState set_state, int32_t set_length, LXShiftState* state, uint32_t flags) {
-  return span_of_set(locale, Form::kEx, ByteText{bytes_of(text), length, text_state},
-                     {bytes_of(set), set_length, set_state}, true, state, flags);
+  return span_of_set(locale, Form::kEx, text_of(text, length, text_state), text_of(set, set_length, set_state),
+                     true, state, flags);
 }
 int32_t LXWcsspn(LXLocale* locale, const LXWChar* text, int32_t length, const LXWChar* set, int32_t set_length,
                  uint32_t flags) {
-  return span_of_set(locale, Form::kPlain, Text<LXWChar>{text, length}, {set, set_length}, true, nullptr,
+  return span_of_set(locale, Form::kPlain, text_of(text, length), text_of(set, set_length), true, nullptr,
                      flags);
 }
 int32_t LXStrspnU(LXLocale* locale, const LXUChar* text, int32_t length, const LXUChar* set, int32_t set_length,
                   uint32_t flags) {
-  return span_of_set(locale, Form::kPlain, Text<LXUChar>{text, length}, {set, set_length}, true, nullptr,
+  return span_of_set(locale, Form::kPlain, text_of(text, length), text_of(set, set_length), true, nullptr,
                      flags);
 }
 
 char* LXStrtok(LXLocale* locale, char* text, int32_t* length, const char* set, int32_t set_length, char** next,
                uint32_t flags) {
   LXShiftState state = LX_SHIFT_SINGLE;
-  return chars_of(tokenize(locale, Form::kPlain, bytes_of(text), &state, length,
-                           ByteText{bytes_of(set), set_length}, next, nullptr, flags));
+  return chars_of(tokenize(locale, Form::kPlain, bytes_of(text), &state, length, text_of(set, set_length), next,
+                           nullptr, flags));
 }
 char* LXStrtokEx(LXLocale* locale, char* text, LXShiftState* state, int32_t* length, const char* set,
                  LXShiftState set_state, int32_t set_length, char** next, LXShiftState* token_state,
                  uint32_t flags) {
   return chars_of(tokenize(locale, Form::kEx, bytes_of(text), state, length,
-                           ByteText{bytes_of(set), set_length, set_state}, next, token_state, flags));
+                           text_of(set, set_length, set_state), next, token_state, flags));
 }
 LXWChar* LXWcstok(LXLocale* locale, LXWChar* text, int32_t* length, const LXWChar* set, int32_t set_length,
                   LXWChar** next, uint32_t flags) {
   LXShiftState state = LX_SHIFT_SINGLE;
-  return tokenize(locale, Form::kPlain, text, &state, length, Text<LXWChar>{set, set_length}, next, nullptr,
-                  flags);
+  return tokenize(locale, Form::kPlain, text, &state, length, text_of(set, set_length), next, nullptr, flags);
 }
 LXUChar* LXStrtokU(LXLocale* locale, LXUChar* text, int32_t* length, const LXUChar* set, int32_t set_length,
                    LXUChar** next, uint32_t flags) {
   LXShiftState state = LX_SHIFT_SINGLE;
-  return tokenize(locale, Form::kPlain, text, &state, length, Text<LXUChar>{set, set_length}, next, nullptr,
-                  flags);
+  return tokenize(locale, Form::kPlain, text, &state, length, text_of(set, set_length), next, nullptr, flags);
 }
 
 }  // extern "C"
