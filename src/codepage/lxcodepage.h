@@ -84,6 +84,9 @@ inline const uint8_t* bytes_of(const char* text) {
 inline uint8_t* bytes_of(char* text) {
   return reinterpret_cast<uint8_t*>(text);
 }
+inline char* chars_of(const uint8_t* text) {
+  return reinterpret_cast<char*>(const_cast<uint8_t*>(text));
+}
 
 /// The number of bytes that a packed code takes.
 inline size_t code_bytes(uint32_t code) {

@@ -87,9 +87,14 @@ struct Rules {
   int32_t flags;
   int32_t invalid_in_characters;
 };
-constexpr Rules kBetweenLocales = {LX_TERMINATE | LX_CHARACTERS, 0};
-constexpr Rules kUnicode = {LX_TERMINATE | LX_CHARACTERS, -1};
-constexpr Rules kPacked = {LX_CHARACTERS, -1};
+template <class In, class Out>
+constexpr bool kUnicode = std::is_same_v<In, LXUChar> || std::is_same_v<Out, LXUChar>;
+/// Between bytes and packed codes, which are of the same codepage.
+template <class In, class Out>
+constexpr bool kPacked = !kUnicode<In, Out> && sizeof(In) != sizeof(Out);
+template <class In, class Out>
+constexpr Rules kRules{kPacked<In, Out> ? LX_CHARACTERS : LX_TERMINATE | LX_CHARACTERS,
+                       kPacked<In, Out> || kUnicode<In, Out> ? -1 : 0};
 
 /// A caller's buffer, and the shift state that its text begins in.
 template <class Unit>
@@ -102,26 +107,28 @@ Buffer<uint8_t> buffer_of(char* p, int32_t size, LXShiftState state = LX_SHIFT_S
   return {bytes_of(p), size, state};
 }
 
-/// Every conversion: from text of the source's codepage to text of the target's, as Unicode values or, where both
-/// are the same, as packed codes. The target keeps the error.
-template <class Value, class Out, class In>
-int32_t convert_text(LXLocale* target, const Buffer<Out>& to, LXLocale* source, const Text<In>& text,
-                     int32_t flags, const Rules& rules, Form form) {
+/// Every conversion: from text of the source's codepage to text of the target's, which keeps the error.
+template <class Out, class In>
+int32_t convert_text(LXLocale* target, Buffer<Out> to, LXLocale* source, Text<In> text, int32_t flags,
+                     Form form) {
+  using Value = std::conditional_t<kPacked<In, Out>, LXWChar, LXUChar>;
+  constexpr Rules kMine = kRules<In, Out>;
   Call call(unit, target);
   const LXLocale* const from = locale_of(source);
   if (!call || from == nullptr) return call.fail(LX_E_NOT_INITIALIZED, -1);
-  Request request(to.size, text.p, text.length, flags, rules.flags);
-  if (!request.valid) return call.fail(LX_E_INVALID, request.characters ? rules.invalid_in_characters : -1);
+  Request request(to.size, text.p, text.length, flags, kMine.flags);
+  if (!request.valid) return call.fail(LX_E_INVALID, request.characters ? kMine.invalid_in_characters : -1);
   if (request.nothing) return call.exit(0);
   const Codepage& in_cp = codepage_of(*from->codepage);
+  const Codepage& out_cp = codepage_of(call.codepage());
   if constexpr (sizeof(In) == 1) request.count_bytes(in_cp, text.p, text.state);
-  if constexpr (std::is_same_v<Value, LXWChar>) request.take_terminator();
+  if constexpr (kPacked<In, Out>) request.take_terminator();
   // A size in characters says nothing about the end of bytes.
   const bool endless = sizeof(Out) == 1 && request.characters;
   Out* const end = endless ? no_end<Out>() : end_of(to.p, request.size);
-  return call.exit(with_cursor(in_cp, form, text, request.length, [&](auto reader) {
-    return with_sink(codepage_of(call.codepage()), form, to.state, to.p, end,
-                     [&](auto writer) { return convert<Value>(reader, writer, request); });
+  return call.exit(with_sink(out_cp, form, to.state, to.p, end, [&](const auto& writer) {
+    return with_cursor(in_cp, form, text, request.length,
+                       [&](auto reader) { return convert<Value>(reader, writer, request); });
   }));
 }
 
@@ -137,81 +144,76 @@ extern "C" {
 
 int32_t LXConvertString(LXLocale* target, char* output, int32_t size, LXLocale* source, const char* input,
                         int32_t length, int32_t flags) {
-  return convert_text<LXUChar>(target, buffer_of(output, size), source, text_of(input, length), flags,
-                               kBetweenLocales, Form::kPlain);
+  return convert_text(target, buffer_of(output, size), source, text_of(input, length), flags, Form::kPlain);
 }
 
 int32_t LXConvertStringEx(LXLocale* target, char* output, LXShiftState target_state, int32_t size,
                           LXLocale* source, const char* input, LXShiftState source_state, int32_t length,
                           int32_t flags) {
-  return convert_text<LXUChar>(target, buffer_of(output, size, target_state), source,
-                               text_of(input, length, source_state), flags, kBetweenLocales, Form::kEx);
+  return convert_text(target, buffer_of(output, size, target_state), source,
+                      text_of(input, length, source_state), flags, Form::kEx);
 }
 
 int32_t LXConvertStringW(LXLocale* target, LXWChar* output, int32_t size, LXLocale* source,
                          const LXWChar* input, int32_t length, int32_t flags) {
-  return convert_text<LXUChar>(target, Buffer<LXWChar>{output, size}, source, text_of(input, length), flags,
-                               kBetweenLocales, Form::kWide);
+  return convert_text(target, Buffer<LXWChar>{output, size}, source, text_of(input, length), flags,
+                      Form::kWide);
 }
 
 int32_t LXMbToWide(LXLocale* locale, LXWChar* output, int32_t size, const char* input, int32_t length,
                    int32_t flags) {
-  return convert_text<LXWChar>(locale, Buffer<LXWChar>{output, size}, locale, text_of(input, length), flags,
-                               kPacked, Form::kPlain);
+  return convert_text(locale, Buffer<LXWChar>{output, size}, locale, text_of(input, length), flags,
+                      Form::kPlain);
 }
 
 int32_t LXMbToWideEx(LXLocale* locale, LXWChar* output, int32_t size, const char* input, LXShiftState state,
                      int32_t length, int32_t flags) {
-  return convert_text<LXWChar>(locale, Buffer<LXWChar>{output, size}, locale, text_of(input, length, state),
-                               flags, kPacked, Form::kEx);
+  return convert_text(locale, Buffer<LXWChar>{output, size}, locale, text_of(input, length, state), flags,
+                      Form::kEx);
 }
 
 int32_t LXWideToMb(LXLocale* locale, char* output, int32_t size, const LXWChar* input, int32_t length,
                    int32_t flags) {
-  return convert_text<LXWChar>(locale, buffer_of(output, size), locale, text_of(input, length), flags, kPacked,
-                               Form::kPlain);
+  return convert_text(locale, buffer_of(output, size), locale, text_of(input, length), flags, Form::kPlain);
 }
 
 int32_t LXWideToMbEx(LXLocale* locale, char* output, LXShiftState state, int32_t size, const LXWChar* input,
                      int32_t length, int32_t flags) {
-  return convert_text<LXWChar>(locale, buffer_of(output, size, state), locale, text_of(input, length), flags,
-                               kPacked, Form::kEx);
+  return convert_text(locale, buffer_of(output, size, state), locale, text_of(input, length), flags, Form::kEx);
 }
 
 int32_t LXStringToUnicode(LXUChar* output, int32_t size, LXLocale* locale, const char* input, int32_t length,
                           int32_t flags) {
-  return convert_text<LXUChar>(locale, Buffer<LXUChar>{output, size}, locale, text_of(input, length), flags,
-                               kUnicode, Form::kPlain);
+  return convert_text(locale, Buffer<LXUChar>{output, size}, locale, text_of(input, length), flags,
+                      Form::kPlain);
 }
 
 int32_t LXStringToUnicodeEx(LXUChar* output, int32_t size, LXLocale* locale, const char* input,
                             LXShiftState state, int32_t length, int32_t flags) {
-  return convert_text<LXUChar>(locale, Buffer<LXUChar>{output, size}, locale, text_of(input, length, state),
-                               flags, kUnicode, Form::kEx);
+  return convert_text(locale, Buffer<LXUChar>{output, size}, locale, text_of(input, length, state), flags,
+                      Form::kEx);
 }
 
 int32_t LXStringToUnicodeW(LXUChar* output, int32_t size, LXLocale* locale, const LXWChar* input,
                            int32_t length, int32_t flags) {
-  return convert_text<LXUChar>(locale, Buffer<LXUChar>{output, size}, locale, text_of(input, length), flags,
-                               kUnicode, Form::kWide);
+  return convert_text(locale, Buffer<LXUChar>{output, size}, locale, text_of(input, length), flags,
+                      Form::kWide);
 }
 
 int32_t LXUnicodeToString(LXLocale* locale, char* output, int32_t size, const LXUChar* input, int32_t length,
                           int32_t flags) {
-  return convert_text<LXUChar>(locale, buffer_of(output, size), locale, text_of(input, length), flags, kUnicode,
-                               Form::kPlain);
+  return convert_text(locale, buffer_of(output, size), locale, text_of(input, length), flags, Form::kPlain);
 }
 
 int32_t LXUnicodeToStringEx(LXLocale* locale, char* output, LXShiftState state, int32_t size,
                             const LXUChar* input, int32_t length, int32_t flags) {
-  return convert_text<LXUChar>(locale, buffer_of(output, size, state), locale, text_of(input, length), flags,
-                               kUnicode, Form::kEx);
+  return convert_text(locale, buffer_of(output, size, state), locale, text_of(input, length), flags, Form::kEx);
 }
 
 int32_t LXUnicodeToStringW(LXLocale* locale, LXWChar* output, int32_t size, const LXUChar* input,
                            int32_t length, int32_t flags) {
-  return convert_text<LXUChar>(locale, Buffer<LXWChar>{output, size}, locale, text_of(input, length), flags,
-                               kUnicode, Form::kWide);
+  return convert_text(locale, Buffer<LXWChar>{output, size}, locale, text_of(input, length), flags,
+                      Form::kWide);
 }
 
 int32_t LXCpStrToUnicode(const LXObject* codepage, const char* input, int32_t length, LXUChar* output) {

@@ -12,9 +12,6 @@ namespace {
 char* same(const char* text) {
   return const_cast<char*>(text);
 }
-char* same(const uint8_t* text) {
-  return reinterpret_cast<char*>(const_cast<uint8_t*>(text));
-}
 
 /// Calls `body` with the cursor of a text whose end is not known: by lead bytes, or where the codepage has them
 /// by shift bytes, of which one that stands here is passed.
@@ -38,7 +35,7 @@ char* previous_char(const Primitive& in, const char* start, const char* current)
   if (in.single_byte()) return same(current - 1);
   const uint8_t* last = bytes_of(start);
   for (MultiByteCursor at{in.cp(), last, bytes_of(current)}; at.pass() && at.p < at.end;) last = at.p;
-  return same(last);
+  return chars_of(last);
 }
 
 /// Moves by a length above 0, in whole characters.
@@ -48,7 +45,7 @@ char* move_by(const Codepage& cp, Form form, const char* text, LXShiftState stat
   return with_cursor(cp, form, state, bytes_of(text), bytes, [&](auto at) {
     pass_all(&at);
     put_state(new_state, state_at(at, state));
-    return same(at.p);
+    return chars_of(at.p);
   });
 }
 
@@ -116,7 +113,7 @@ char* LXNextCharEx(LXLocale* locale, const char* text, LXShiftState state, LXShi
     at.p += at.length();
     if constexpr (decltype(at)::kShifts) at.pass_shift();
     put_state(new_state, state_at(at, state));
-    return same(at.p);
+    return chars_of(at.p);
   });
 }
 

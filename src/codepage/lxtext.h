@@ -56,10 +56,16 @@ template <class Unit, class Body>
   return with_kind<Unit>(cp, form, [&](auto kind) { return body(kind.cursor(cp, p, units, state)); });
 }
 
-/// Calls `body` with the sink of an output that ends at `end`. Not inline in all callers: what follows is.
+/// Calls `body` with the sink of an output that ends at `end`. Not inline in all callers where bytes are
+/// written: what follows is.
 template <class Unit, class Body>
-auto with_sink(const Codepage& cp, Form form, LXShiftState state, Unit* p, Unit* end, Body&& body) {
+[[gnu::always_inline]] inline auto with_sink(const Codepage& cp, Form form, LXShiftState state, Unit* p,
+                                             Unit* end, Body&& body) {
   return with_kind<Unit>(cp, form, [&](auto kind) { return body(kind.sink(cp, p, end, state)); });
+}
+template <class Body>
+auto with_sink(const Codepage& cp, Form form, LXShiftState state, uint8_t* p, uint8_t* end, Body&& body) {
+  return with_kind<uint8_t>(cp, form, [&](auto kind) { return body(kind.sink(cp, p, end, state)); });
 }
 
 // How many characters stand in how many bytes. Of a text without shift states all counts are of whole

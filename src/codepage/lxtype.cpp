@@ -41,8 +41,7 @@ const uint8_t* type_record(const Codepage& cp, const uint8_t* p) {
 
 const uint8_t* type_record_of_code(const Codepage& cp, uint32_t code) {
   uint8_t bytes[kMaxCharBytes] = {};
-  const uint32_t stored = without_zero_bytes(code);
-  store_code(bytes, stored, code_bytes(stored));
+  store_packed(bytes, code);
   return type_record(cp, bytes);
 }
 

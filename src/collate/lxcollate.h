@@ -63,16 +63,15 @@ struct BufferSource {
 
     uint32_t next() { return p != end ? *p++ : 0; }
   };
-  template <WeightLevel kLevel, class Weight>
-  static Weights<kLevel, Weight> weights_in(const Level<Weight>& level) {
-    return {level.begin, level.end};
-  }
   template <WeightLevel kLevel>
   auto weights() const {
-    if constexpr (kLevel == WeightLevel::kPrimary) return weights_in<kLevel>(levels.primaries);
-    if constexpr (kLevel == WeightLevel::kSecondary) return weights_in<kLevel>(levels.secondaries);
-    if constexpr (kLevel == WeightLevel::kTertiary) return weights_in<kLevel>(levels.tertiaries);
-    if constexpr (kLevel == WeightLevel::kSpecial) return weights_in<kLevel>(levels.specials);
+    const auto in = [](const auto& level) {
+      return Weights<kLevel, std::decay_t<decltype(*level.begin)>>{level.begin, level.end};
+    };
+    if constexpr (kLevel == WeightLevel::kPrimary) return in(levels.primaries);
+    if constexpr (kLevel == WeightLevel::kSecondary) return in(levels.secondaries);
+    if constexpr (kLevel == WeightLevel::kTertiary) return in(levels.tertiaries);
+    if constexpr (kLevel == WeightLevel::kSpecial) return in(levels.specials);
   }
 };
 

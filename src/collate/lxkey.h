@@ -12,7 +12,10 @@ struct Folding {
   Fold fold;
   Specials specials;  // none unless case is folded and the language has some
 
-  Folding(const LXLocale& locale, Fold fold);
+  Folding(const LXLocale& locale, Fold asked)
+      : cp(codepage_of(*locale.codepage)),
+        fold(asked),
+        specials(asked == Fold::kCase ? specials_of(*locale.language, true) : Specials{nullptr, 0}) {}
 
   LXUChar folded(LXWChar code) const {
     if (fold == Fold::kCase) return unicode_of(cp, small_letter(cp, code));
@@ -77,13 +80,6 @@ bool exhausted(const FoldCursor<In>& folded) {
 template <class In>
 void drop_rest(FoldCursor<In>* folded) {
   drop_rest(&folded->in);
-}
-
-/// Calls `body` with the reader of the text folded as asked.
-template <class In, class Body>
-auto read_folded(const Folding& folding, const In& in, Body&& body) {
-  if (folding.fold == Fold::kNone) return body(in);
-  return body(FoldCursor<In>{folding, in});
 }
 
 /// A key: the levels of a text in their space, and how long it will be.

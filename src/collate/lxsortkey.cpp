@@ -123,12 +123,13 @@ int32_t transform(LXLocale* given, Form form, uint8_t* output, int32_t size, con
   if (locale.sort == nullptr && fold == Fold::kNone) return call.exit(copy_text(output, size, text.p, units));
   const Folding folding(locale, fold);
   const int32_t bytes = with_cursor(cp, form, text, units, [&](const auto& in) {
-    return read_folded(folding, in, [&](const auto& reader) {
+    const auto write = [&](const auto& reader) {
       if (locale.sort != nullptr)
         return make_key(sort_of(*locale.sort), reader, folding.most_chars(units), Output(output, size));
       return write_folded(reader, output, size,
                           [&](LXUChar u, uint8_t* p) { return store_character(cp, in, u, p); });
-    });
+    };
+    return fold == Fold::kNone ? write(in) : write(FoldCursor<std::decay_t<decltype(in)>>{folding, in});
   });
   return bytes < 0 ? call.fail(LX_E_MEMORY, -1) : call.exit(bytes);
 }
@@ -136,11 +137,6 @@ int32_t transform(LXLocale* given, Form form, uint8_t* output, int32_t size, con
 }  // namespace
 
 namespace lx {
-
-Folding::Folding(const LXLocale& locale, Fold asked)
-    : cp(codepage_of(*locale.codepage)),
-      fold(asked),
-      specials(asked == Fold::kCase ? specials_of(*locale.language, true) : Specials{nullptr, 0}) {}
 
 void Key::trim(const Sort& sort) {
   const auto drop = [](Level<uint8_t>* level, uint8_t weight) {

@@ -170,7 +170,8 @@ int32_t after_sign(int32_t state, int32_t sign, DoubleParts* parts) {
   return state == kStart ? kSigned : kExponentSigned;
 }
 
-int32_t next_state(int32_t state, int32_t c, DoubleParts* parts) {
+/// Inline, as is after_digit(): it is called for each character that is not among digits.
+[[gnu::always_inline]] inline int32_t next_state(int32_t state, int32_t c, DoubleParts* parts) {
   if (c >= 0 && c <= 9) return after_digit(state, c, parts);
   switch (c) {
     case LX_CLASS_POSITIVE:

@@ -4,6 +4,7 @@
 
 #include <string.h>
 
+#include "codepage/lxlength.h"
 #include "core/lxcall.h"
 #include "core/lxmemory.h"
 #include "core/lxobjman.h"
@@ -245,9 +246,7 @@ LXLocale* LXGetLocaleW(const LXWChar* name, int32_t flags, int32_t* rc) {
   int32_t code = initialized() ? LX_E_INVALID : LX_E_NOT_INITIALIZED;
   LXLocale* locale = nullptr;
   if (initialized() && (flags & ~kCreateFlags) == 0) {
-    size_t units = 0;
-    while (name[units] != 0) ++units;
-    locale = create(name, units, flags, &code);
+    locale = create(name, units_before_null(name), flags, &code);
   }
   if (rc != nullptr) *rc = code;
   return events.exit(locale);
@@ -256,8 +255,7 @@ LXLocale* LXGetLocaleW(const LXWChar* name, int32_t flags, int32_t* rc) {
 LXLocale* LXGetLocaleU(const LXUChar* name, int32_t flags, int32_t* rc) {
   Events events(unit);
   if (!initialized() || name == nullptr) return events.exit(LXGetLocale(nullptr, flags, rc));
-  size_t units = 0;
-  while (name[units] != 0) ++units;
+  const size_t units = units_before_null(name);
   const WorkBuffer narrow(units * kMaxCharBytes + 1);
   if (!narrow) {
     if (rc != nullptr) *rc = LX_E_MEMORY;

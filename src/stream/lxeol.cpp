@@ -65,10 +65,6 @@ Unit* put(LXLocale* given, Unit* output, uint32_t flags) {
   return call.exit(output);
 }
 
-char* chars_of(uint8_t* p) {
-  return reinterpret_cast<char*>(p);
-}
-
 }  // namespace
 
 extern "C" {

@@ -122,7 +122,7 @@ int32_t compare_case(Cursor a, Cursor b) {
 
 /// A character in its half-width form, or as it is: as much of it as is there.
 inline Char half_width(const Codepage& cp, const uint8_t* p, size_t length, size_t there) {
-  const uint32_t half = length > there ? 0 : find_half_width(cp, pack(p, length));
+  const uint32_t half = length > there ? 0 : WidthTables(cp).to_half(pack(p, length));
   if (half != 0) return unpacked(half);
   Char c{{}, length};
   memcpy(c.bytes, p, least(length, there));

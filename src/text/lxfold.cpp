@@ -2,7 +2,6 @@
 
 #include <cstring>
 
-#include "codepage/lxwidth.h"
 #include "core/lxmemory.h"
 #include "lx/string.h"
 
@@ -13,10 +12,6 @@ LXWChar capital(const Codepage& cp, LXWChar code) {
   const uint32_t stored = without_zero_bytes(code);
   const uint32_t other = other_case(type_record_of_code(cp, code), stored, LX_C1_LOWER);
   return other != stored ? other : code;
-}
-
-LXWChar find_half_width(const Codepage& cp, LXWChar code) {
-  return WidthTables(cp).to_half(code);
 }
 
 void find_full_width_blank(const LXLocale& locale, LXWChar* code) {

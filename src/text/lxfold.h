@@ -20,6 +20,7 @@
 
 #include "codepage/lxtext.h"
 #include "codepage/lxunicode.h"
+#include "codepage/lxwidth.h"
 #include "core/lxrecords.h"
 #include "locale/lxlocale.h"
 #include "lx/compare.h"
@@ -76,10 +77,8 @@ inline LXUChar capital(const Codepage&, LXUChar u) {
   return static_cast<LXUChar>(u - (u >= 'a' && u <= 'z' ? 0x20 : 0));
 }
 
-/// 0: there is none.
-LXWChar find_half_width(const Codepage& cp, LXWChar code);
 inline LXWChar half_width(const Codepage& cp, LXWChar code) {
-  const LXWChar half = find_half_width(cp, code);
+  const LXWChar half = WidthTables(cp).to_half(code);
   return half != 0 ? half : code;
 }
 inline LXUChar half_width(const Codepage&, LXUChar u) {

@@ -28,9 +28,6 @@ template <class Unit>
 Unit* writable(const Unit* p) {
   return const_cast<Unit*>(p);
 }
-inline char* chars_of(const uint8_t* p) {
-  return reinterpret_cast<char*>(const_cast<uint8_t*>(p));
-}
 
 /// A character in a text.
 template <class Cursor>
