@@ -319,6 +319,13 @@ class Reader {
                              std::to_string(longest));
     }
     if (source_.utf8 && !multi_byte) fail("lexicor:algorithm", "the algorithm UTF-8 needs the class MBCS");
+    const auto check_single = [&](const char* key, uint8_t byte) {
+      const bool shift =
+          source_.kind == CodepageClass::kShiftStateful && (byte == kShiftOut || byte == kShiftIn);
+      if (shift || source_.leads[byte] != 1) fail(key, byte_text(byte) + " is no character of one byte");
+    };
+    check_single("subchar", source_.substitution);
+    for (const uint8_t byte : source_.line_ends) check_single("lexicor:line_ends", byte);
   }
 
   void read_mapping(Cursor& cursor) {
