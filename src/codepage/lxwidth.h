@@ -58,7 +58,7 @@ struct WidthTables {
   }
   /// The slot of a full-width code, or the empty one where it belongs.
   size_t slot_of(uint32_t code) const {
-    size_t slot = code & cp.halves_mask;
+    size_t slot = (code * 0x9E3779B1u >> 16) & cp.halves_mask;
     while (cp.halves[slot] != 0 && full_of(cp.halves[slot] - 1u) != code) slot = (slot + 1) & cp.halves_mask;
     return slot;
   }

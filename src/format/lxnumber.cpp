@@ -63,20 +63,14 @@ struct Written {
 };
 
 /// Writes the text that `write(out)` makes into `room` units; it is false for a text that does not fit.
-/// `kDirect`: the text is single bytes, so that all kinds of bytes without shift states are the same.
-template <Form kForm, bool kDirect, class Write>
+template <Form kForm, class Write>
 Written write_text(const Codepage& cp, FormUnit<kForm>* p, size_t room, LXShiftState state, Write write) {
-  const auto run = [&](auto out) {
+  return with_kind<FormUnit<kForm>, ClosedShiftSink>(cp, kForm, [&](auto kind) {
+    auto out = kind.sink(cp, p, end_of(p, room), state);
     const bool all = write(out);
     close_text(out);
     return Written{static_cast<size_t>(out.p - p), all};
-  };
-  FormUnit<kForm>* const end = end_of(p, room);
-  using Unit = FormUnit<kForm>;
-  if constexpr (kDirect && sizeof(Unit) == 1)
-    if (kForm == Form::kPlain || !cp.shift_sensitive) return run(SingleByteSink{cp, p, end});
-  return with_kind<Unit, ClosedShiftSink>(cp, kForm,
-                                          [&](auto kind) { return run(kind.sink(cp, p, end, state)); });
+  });
 }
 
 template <Form kForm>
@@ -92,8 +86,8 @@ int32_t write_number(Call& call, const Output<kForm>& to, const NumberText<FormU
   const size_t most = static_cast<size_t>(to.size) - to.nulls();
   const bool shifts = kForm == Form::kEx && cp.shift_sensitive && to.state == LX_SHIFT_DOUBLE;
   const size_t shift_bytes = shifts && to.by_chars() && most != 0 ? 1 : 0;  // a Shift-In, which does not count
-  const Written written = write_text<kForm, true>(cp, to.buffer, most + shift_bytes, to.state,
-                                                  [&](auto& out) { return put_number(out, number); });
+  const Written written = write_text<kForm>(cp, to.buffer, most + shift_bytes, to.state,
+                                            [&](auto& out) { return put_number(out, number); });
   return finish(call, to, written.units, written.units - shift_bytes, written.all);
 }
 
@@ -250,7 +244,7 @@ int32_t currency_to_text(LXLocale* given, double value, const Output<kForm>& to)
     NumberText<FormUnit<kForm>> number(fixed_chars<kForm>(locale));
     put_magnitude<kForm>(&number, value, locale, current, international ? kInternationalItems : kLocalItems);
     const auto write = [&](FormUnit<kForm>* p, size_t room) {
-      return write_text<kForm, false>(cp, p, room, to.state, [&](auto& out) {
+      return write_text<kForm>(cp, p, room, to.state, [&](auto& out) {
         return put_pieces<kForm>(out, placement.layout.before, locale, current, placement) &&
                put_number(out, number) &&
                put_pieces<kForm>(out, placement.layout.behind, locale, current, placement);
