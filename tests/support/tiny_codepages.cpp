@@ -89,7 +89,11 @@ std::string TinyCodepage::encode(const std::vector<uint16_t>& text, LXShiftState
   LXShiftState& now = state != nullptr ? *state : own;
   for (uint16_t u : text) {
     const TinyCharacter* c = find(u);
-    const std::string one = c != nullptr ? c->bytes : std::string(1, static_cast<char>(substitution));
+    std::string one = c != nullptr ? c->bytes : std::string(1, static_cast<char>(substitution));
+    if (file.id == fmt::kUtf8Id) {
+      one.resize(utf8_bytes(u));
+      store_utf8(bytes_of(one.data()), u, one.size());
+    }
     const LXShiftState needed = one.size() > 1 ? LX_SHIFT_DOUBLE : LX_SHIFT_SINGLE;
     if (shift && needed != now) bytes.push_back(needed == LX_SHIFT_DOUBLE ? shift_out : shift_in);
     if (shift) now = needed;

@@ -29,7 +29,8 @@ struct TinyCodepage {
   std::vector<TinyCharacter> characters;  // mapped both ways, by packed code
 
   /// The bytes of a text; in a shift-sensitive codepage with the shift bytes that it needs from `*state` on,
-  /// which is left as the text leaves it.
+  /// which is left as the text leaves it. UTF-8 is computed; elsewhere the substitution byte stands for what is
+  /// not mapped.
   std::string encode(const std::vector<uint16_t>& text, LXShiftState* state = nullptr) const;
   const TinyCharacter* find(uint16_t unicode) const;
 };
