@@ -345,7 +345,7 @@ TEST_F(Validate, NotRefused) {
     change.apply(cp.file.sections);
     CodepageObject made(cp.file.id, cp.file.sections);
     ASSERT_EQ(made.code(), LX_OK);
-    use_everything(&made, 1);
+    use_everything(&made, 3);
     cp.file.sections.resize(format::kMaxSections);
     compare(cp.file.sections, made.object(), &random, 20);
   }

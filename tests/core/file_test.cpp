@@ -124,6 +124,10 @@ TEST_F(FileTest, OpenCodes) {
   }
   expect_code(".", LX_READ_WRITE, LX_E_OPEN);
   expect_code("data.txt", 3, LX_E_OPEN);
+  hooks.fail_at(1);
+  expect_code("none", LX_WRITE, LX_E_MEMORY);
+  EXPECT_FALSE(directory.exists("none"));
+  hooks.fail_at(0);
   constexpr uid_t kNobody = 65534;
   const uid_t user = geteuid();
   if (user == 0 && seteuid(kNobody) != 0) GTEST_SKIP();
