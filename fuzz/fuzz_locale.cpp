@@ -66,9 +66,11 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
   for (const char* other : {"so_00001.nls", "alias.txt"}) directory.write(other, {});
   directory.write(kFiles[data[0] % std::size(kFiles)], {data + 1, data + size});
   LXInit(directory.path().c_str(), nullptr, nullptr, nullptr, 0);
-  for (const char* name : {"", "English_UnitedStates.US-ASCII@BINARY", "English@Default"}) {
-    LXLocale* locale = LXGetLocale(name, LX_FALLBACK, nullptr);
-    if (locale == nullptr) continue;
+  for (const char* name : {"", "English_UnitedStates.US-ASCII@BINARY"})
+    LXReleaseLocale(LXGetLocale(name, LX_FALLBACK, nullptr));
+  LXLocale* locale = LXGetLocale("English@Default", 0, nullptr);
+  if (locale == nullptr) locale = LXGetLocale("English", 0, nullptr);
+  if (locale != nullptr) {
     read_items(locale);
     use_text(locale);
     write_values(locale);

@@ -119,30 +119,27 @@ TEST_F(Navigation, EveryCharacterForwardsAndBackwards) {
 TEST_F(Navigation, PackedCodes) {
   const struct {
     uint32_t code;
+    int32_t length;  // zero bytes counted
     std::string bytes;
-    int32_t code_length;  // zero bytes counted
-  } rows[] = {
-      {0x00, std::string("\0", 1), 1},
-      {0x41, "A", 1},
-      {0x82A0, "\x82\xA0", 2},
-      {0x8200, std::string("\x82\0", 2), 2},
-      {0x820041, "\x82\x41", 3},
-      {0x8FB0A1, "\x8F\xB0\xA1", 3},
-      {0x90308130, "\x90\x30\x81\x30", 4},
-      {0x90000030, "\x90\x30", 4},
-      {0x90300030, "\x90\x30\x30", 4},
-      {0x90008100, std::string("\x90\x81\0", 3), 4},
-  };
+  } rows[] = {{0x00, 1, {"\0", 1}},
+              {0x41, 1, "A"},
+              {0x82A0, 2, "\x82\xA0"},
+              {0x8200, 2, {"\x82\0", 2}},
+              {0x820041, 3, "\x82\x41"},
+              {0x8FB0A1, 3, "\x8F\xB0\xA1"},
+              {0x90000030, 4, "\x90\x30"},
+              {0x90308130, 4, "\x90\x30\x81\x30"},
+              {0x90300030, 4, "\x90\x30\x30"},
+              {0x90008100, 4, {"\x90\x81\0", 3}}};
   LXLocale* locale = library_.locale(case_codepage("SINGLE"));
   for (const auto& row : rows) {
     SCOPED_TRACE(row.code);
-    EXPECT_EQ(LXStrByteLength(row.code), row.code_length);
-    EXPECT_EQ(LXByteLengthW(locale, row.code), row.code_length);
-    std::vector<char> stored(row.bytes.size());  // exact
-    EXPECT_EQ(LXWToMb(stored.data(), row.code), static_cast<int32_t>(row.bytes.size()));
-    EXPECT_EQ(std::string(stored.begin(), stored.end()), row.bytes);
-    std::vector<char> put(row.bytes.size());
+    EXPECT_EQ(LXStrByteLength(row.code), row.length);
+    EXPECT_EQ(LXByteLengthW(locale, row.code), row.length);
+    std::vector<char> stored(row.bytes.size()), put(row.bytes.size());  // exact
+    EXPECT_EQ(LXWToMb(stored.data(), row.code), count_of(row.bytes));
     EXPECT_EQ(LXPutChar(locale, put.data(), row.code), 0);
+    EXPECT_EQ(std::string(stored.begin(), stored.end()), row.bytes);
     EXPECT_EQ(put, stored);
   }
 }

@@ -20,6 +20,7 @@ const std::pair<const char*, uint32_t> kLevels[] = {
     {"input", RAS1_LEVEL_INPUT},     {"flow", RAS1_LEVEL_FLOW},    {"notice", RAS1_LEVEL_NOTICES}};
 
 using Action = std::function<void()>;
+const Action kNothing = [] {};
 
 class TraceTest : public LibraryTest {
  protected:
@@ -51,7 +52,7 @@ class TraceTest : public LibraryTest {
   }
 
   /// A use of the library in which `action` happens.
-  Action use(const Action& action = [] {}) {
+  Action use(const Action& action = kNothing) {
     return [this, action] {
       init();
       action();
@@ -60,8 +61,7 @@ class TraceTest : public LibraryTest {
     };
   }
   /// With another content of a file, which need not be there otherwise.
-  Action with_file(
-      const std::string& name, const ByteString& content, const Action& action = [] {}) {
+  Action with_file(const std::string& name, const ByteString& content, const Action& action = kNothing) {
     return [=] {
       const ByteString whole = directory.read(name);
       directory.write(name, content);
@@ -70,14 +70,12 @@ class TraceTest : public LibraryTest {
       if (whole.empty()) std::filesystem::remove(directory.file(name));
     };
   }
-  Action with_byte(
-      const std::string& name, size_t at, uint8_t value, const Action& action = [] {}) {
+  Action with_byte(const std::string& name, size_t at, uint8_t value, const Action& action = kNothing) {
     ByteString content = directory.read(name);
     content[at] = value;
     return with_file(name, content, action);
   }
-  Action with_aliases(
-      const std::string& text, const Action& action = [] {}) {
+  Action with_aliases(const std::string& text, const Action& action = kNothing) {
     return with_file("alias.txt", ByteString(text.begin(), text.end()), action);
   }
   Action without_memory(size_t n) {
