@@ -14,55 +14,6 @@ namespace {
 using I = int32_t;
 constexpr I kModes[] = {0, LX_CHARACTERS, LX_TERMINATE, LX_TERMINATE | LX_CHARACTERS};
 
-/// What a conversion should give: pieces of output, one a character, in order.
-template <class Unit>
-struct Model {
-  std::vector<std::vector<Unit>> pieces;
-  bool cut = false;              // the input ends inside a character
-  bool null_terminated = false;  // the length is given as -1
-  bool null_converted = false;   // ... and its null is one of the characters
-
-  std::vector<Unit> output(I size, I flags, I* result) const {
-    std::vector<Unit> out;
-    *result = 0;
-    const bool terminate = (flags & LX_TERMINATE) != 0;
-    if (size <= 0 || (pieces.empty() && !cut && !null_terminated && !terminate)) return out;
-    const bool chars = (flags & LX_CHARACTERS) != 0 && sizeof(Unit) == 1;
-    const size_t limit = static_cast<size_t>(size) - terminate;
-    size_t used = 0, taken = 0;
-    for (const auto& piece : pieces) {
-      const size_t grown = used + (chars ? 1 : piece.size());
-      if (grown > limit) break;
-      used = grown;
-      ++taken;
-      out.insert(out.end(), piece.begin(), piece.end());
-    }
-    const bool all = taken == pieces.size() && !cut;
-    if (terminate || (!null_converted && null_terminated && all && used < limit)) {
-      out.push_back(0);
-      ++used;
-    }
-    *result = static_cast<I>(used);
-    return out;
-  }
-};
-
-/// Calls a conversion for every size up to two more than it can use, and compares result, output and canaries.
-template <class Unit, class Call>
-void check(const Model<Unit>& model, I flags, const Call& convert) {
-  size_t needed = 1;
-  for (const auto& piece : model.pieces) needed += piece.size();
-  const Unit canary = static_cast<Unit>(0xA5A5A5A5);
-  for (I size = 0; size <= static_cast<I>(needed) + 2; ++size) {
-    I result = 0;
-    std::vector<Unit> expected = model.output(size, flags, &result);
-    std::vector<Unit> output(needed + 4, canary);
-    expected.resize(output.size(), canary);
-    EXPECT_EQ(convert(output.data(), size, flags), result) << "size " << size << " flags " << flags;
-    EXPECT_EQ(output, expected) << "size " << size << " flags " << flags;
-  }
-}
-
 class Convert : public testing::Test {
  protected:
   void TearDown() override { EXPECT_TRUE(library_.close()); }
@@ -94,7 +45,7 @@ class Convert : public testing::Test {
       }
       for (const bool null : {false, true}) {
         if (cut && null && null_converted) continue;  // the null would be the rest of the character
-        Model<typename Out::Unit> model;
+        OutputModel<typename Out::Unit> model;
         model.cut = cut;
         model.null_terminated = null;
         model.null_converted = null_converted;
@@ -106,8 +57,9 @@ class Convert : public testing::Test {
           const bool chars = (kModes[mode] & LX_CHARACTERS) != 0;
           if (chars && cut && !null) continue;  // a count has no end to cut
           const I length = null ? -1 : chars ? count_of(text) : count_of(block);
-          check(model, kModes[mode],
-                [&](auto* out, I size, I flags) { return call(out, size, block.data(), length, flags); });
+          expect_at_every_size(model, kModes[mode], [&](auto* out, I size, I flags) {
+            return call(out, size, block.data(), length, flags);
+          });
         }
       }
     }

@@ -83,28 +83,19 @@ class Map : public testing::Test {
     SCOPED_TRACE(cp.file.name + " " + form.name + " mode " + std::to_string(mode) + " " + shown(text));
     text.push_back(0);
     const std::vector<Unit> input = units_of<F>(cp, text);
-    std::vector<std::vector<Unit>> pieces;
-    size_t needed = 0;
-    for (const Piece& piece : mapped(std::is_same_v<F, Unicode> ? nullptr : &cp, text, mode)) {
-      pieces.push_back(units_of<F>(cp, piece.unicode));
-      needed += pieces.back().size();
-    }
-    for (size_t size = 0; size <= needed + 1; ++size) {
-      std::vector<Unit> expected, output(size);
-      for (const auto& piece : pieces) {
-        if (expected.size() + piece.size() > size) break;
-        expected.insert(expected.end(), piece.begin(), piece.end());
-      }
-      const int32_t result = form.map(locale(cp), output.data(), count_of(output), input.data(), -1, mode);
-      ASSERT_EQ(result, count_of(expected)) << "size " << size;
-      output.resize(expected.size());
-      ASSERT_EQ(output, expected) << "size " << size;
-    }
+    OutputModel<Unit> model;
+    model.null_terminated = model.null_converted = true;
+    for (const Piece& piece : mapped(std::is_same_v<F, Unicode> ? nullptr : &cp, text, mode))
+      model.pieces.push_back(units_of<F>(cp, piece.unicode));
+    expect_at_every_size(model, 0, [&](Unit* out, int32_t size, int32_t) {
+      return form.map(locale(cp), out, size, input.data(), -1, mode);
+    });
     if constexpr (!std::is_same_v<F, Plain>) return;
     // In characters, within the bytes that are mapped that way.
     std::vector<Unit> expected, out(1024);
-    const size_t chars = std::min<size_t>(pieces.size(), 9);
-    for (size_t i = 0; i < chars; ++i) expected.insert(expected.end(), pieces[i].begin(), pieces[i].end());
+    const size_t chars = std::min<size_t>(model.pieces.size(), 9);
+    for (size_t i = 0; i < chars; ++i)
+      expected.insert(expected.end(), model.pieces[i].begin(), model.pieces[i].end());
     const auto size = static_cast<int32_t>(chars);
     EXPECT_EQ(form.map(locale(cp), out.data(), size, input.data(), -1, mode | LX_CHARACTERS), size);
     EXPECT_EQ(out[expected.size()], 0);

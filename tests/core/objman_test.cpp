@@ -215,8 +215,10 @@ TEST_F(ObjManTest, LoadsAsManySectionsAsCountedOnce) {
     EXPECT_EQ(rc, counted < 3 ? LX_E_CORRUPT : LX_OK);
     EXPECT_EQ(opened([&] { EXPECT_EQ(by_name(LX_CODEPAGE, "TINY"), found); }), std::vector<std::string>{});
     EXPECT_EQ(found->section[3] != nullptr, counted > 3);
-    for (size_t i = 0; i < std::min<size_t>(counted, 4) && counted > 2; ++i)
+    for (size_t i = 0; i < std::min<size_t>(counted, 4) && counted > 2; ++i) {
+      ASSERT_NE(found->section[i], nullptr) << i;
       EXPECT_EQ(memcmp(found->section[i], sections[i].data(), sections[i].size()), 0) << i;
+    }
     EXPECT_EQ(LXTerm(), LX_OK);
   }
 }
