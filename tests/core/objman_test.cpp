@@ -1,6 +1,5 @@
 // The object manager: where the control file is searched, look-ups by name and identifier, loading, and the
 // built-in data that stand in.
-#include <strings.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -136,65 +135,43 @@ TEST_F(ObjManTest, EveryEntryIsFoundAndNoOther) {
   }
 }
 
-// Callers rely on it: for a type without entries the entry before its range is looked at, or the first of the
-// table. By name the type counts, also where the table is not grouped by it.
-TEST_F(ObjManTest, ByIdReturnsTheNeighbourOfAnEmptyRange) {
-  directory.write("control.nls", control_file({{5, LX_TERRITORY, "A"}, {6, LX_TERRITORY, "B"}}));
-  ASSERT_EQ(init(), LX_OK);
-  EXPECT_EQ(name_of(by_id(LX_LANGUAGE, 5, LX_FIND_ONLY)), "A");
-  EXPECT_EQ(rc, LX_OK);
-  EXPECT_EQ(by_id(LX_LANGUAGE, 6, LX_FIND_ONLY), nullptr);
-  EXPECT_EQ(name_of(by_id(LX_CODEPAGE, 6, LX_FIND_ONLY)), "B");
-  EXPECT_EQ(by_id(LX_CODEPAGE, 5, LX_FIND_ONLY), nullptr);
-  EXPECT_EQ(rc, LX_E_NOT_FOUND);
-  EXPECT_EQ(name_of(by_id(LX_SORT, 6, LX_FIND_ONLY)), "B");
-  terminate();
-  directory.write("control.nls", control_file({{1, LX_LANGUAGE, "English"},
-                                               {840, LX_TERRITORY, "UnitedStates"},
-                                               {850, LX_CODEPAGE, "Tiny"},
-                                               {841, LX_TERRITORY, "Odd"}}));
-  ASSERT_EQ(init(), LX_OK);
-  EXPECT_EQ(by_name(LX_CODEPAGE, "Odd", LX_FIND_ONLY), nullptr);
-  EXPECT_EQ(rc, LX_E_NOT_FOUND);
-}
-
-TEST_F(ObjManTest, ByName) {
-  std::vector<ControlRecord> languages;
-  for (const std::string& name : {std::string("English"), std::string("English (Old)"), std::string(33, 'L'),
-                                  std::string("ENGLISH"), std::string(34, 'M')})
-    languages.push_back({static_cast<uint16_t>(languages.size() + 1), LX_LANGUAGE, name});
-  directory.write("control.nls", control_file(languages));
-  ASSERT_EQ(init(), LX_OK);
-  for (const CaseRow& row : case_rows("core/names_in_table.txt")) {
+TEST_F(ObjManTest, LookUps) {
+  std::vector<ControlRecord> table;
+  bool open = false;
+  for (const CaseRow& row : case_rows("core/look_ups.txt")) {
     SCOPED_TRACE(row.where);
-    const int32_t length = row.number(1), code = row.number(2) != 0 ? LX_OK : LX_E_NOT_FOUND;
-    LXObject* object = LXGetObjFromName(nullptr, LX_LANGUAGE, row[0].c_str(), length, LX_FIND_ONLY, &rc);
-    EXPECT_EQ(object != nullptr ? object->disk.id : 0, row.number(2));
-    EXPECT_EQ(rc, code);
-    const auto wide = widened<LXWChar>(row[0] + std::string(1, '\0'));
-    EXPECT_EQ(LXGetObjFromNameW(nullptr, LX_LANGUAGE, wide.c_str(), length, LX_FIND_ONLY, &rc), object);
-    EXPECT_EQ(rc, code);
-  }
-  const LXWChar beyond[] = {'E' + 0x100, 'n', 'g', 'l', 'i', 's', 'h', 0};
-  EXPECT_EQ(LXGetObjFromNameW(nullptr, LX_LANGUAGE, beyond, 7, LX_FIND_ONLY, &rc), nullptr);
-}
-
-TEST_F(ObjManTest, BinaryOrderHasNoObject) {
-  directory.write("control.nls",
-                  control_file({{1, LX_LANGUAGE, "BINARY"}, {0, LX_SORT, "Zero"}, {9, LX_SORT, "BINARY"}}));
-  ASSERT_EQ(init(), LX_OK);
-  for (int32_t mode : {LX_FIND_AND_LOAD, LX_FIND_ONLY}) {
-    for (const auto& [name, length] :
-         {std::pair("BINARY", 6), {"bInArY", 7}, {"BINARYX", 6}, {"BINARX", 6}, {"BINAR", 6}, {"BINARYX", 7}}) {
-      EXPECT_EQ(LXGetObjFromName(nullptr, LX_SORT, name, length, mode, &rc), nullptr) << name;
-      EXPECT_EQ(rc, strncasecmp(name, "BINARY", static_cast<size_t>(length)) == 0 ? LX_OK : LX_E_NOT_FOUND)
-          << name;
+    if (row[0] == "table") {
+      terminate();
+      table.clear();
+      open = false;
+      continue;
     }
-    EXPECT_EQ(by_id(LX_SORT, 0, mode), nullptr);
-    EXPECT_EQ(rc, LX_OK);
+    const int32_t type = row.number(1), number = row.number(2);
+    const std::string& name = row[3];
+    if (row[0] == "entry") {
+      table.push_back({static_cast<uint16_t>(number), static_cast<uint8_t>(type), name});
+      continue;
+    }
+    if (!open) {
+      directory.write("control.nls", control_file(table));
+      ASSERT_EQ(init(), LX_OK);
+      open = true;
+    }
+    const auto expect = [&](const LXObject* found) {
+      const std::string shown = found != nullptr ? std::to_string(found->disk.id) + " " + found->disk.name : "";
+      EXPECT_EQ(found != nullptr ? shown : rc == LX_OK ? "nothing" : "none", row[4]);
+      EXPECT_EQ(rc, row[4] == "none" ? LX_E_NOT_FOUND : LX_OK);
+    };
+    if (row[0] == "id") {
+      expect(by_id(type, static_cast<uint16_t>(number), LX_FIND_ONLY));
+    } else {
+      expect(LXGetObjFromName(nullptr, type, name.c_str(), number, LX_FIND_ONLY, &rc));
+      const auto wide = widened<LXWChar>(name + std::string(1, '\0'));
+      expect(LXGetObjFromNameW(nullptr, type, wide.c_str(), number, LX_FIND_ONLY, &rc));
+    }
   }
-  EXPECT_EQ(name_of(by_name(LX_LANGUAGE, "BINARY", LX_FIND_ONLY)), "BINARY");
-  EXPECT_EQ(name_of(by_id(LX_SORT, 9, LX_FIND_ONLY)), "BINARY");
+  const LXWChar beyond[] = {'O' + 0x100, 'd', 'd', 0};
+  EXPECT_EQ(LXGetObjFromNameW(nullptr, LX_TERRITORY, beyond, 3, LX_FIND_ONLY, &rc), nullptr);
 }
 
 TEST_F(ObjManTest, LoadsAsManySectionsAsCountedOnce) {
