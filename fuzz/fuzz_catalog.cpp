@@ -1,8 +1,11 @@
 // Any bytes as a message catalog: refused, or every message comes terminated, in both modes. Numbers to ask for
 // are taken from the input.
+#include <cstdlib>
+#include <cstring>
+#include <iterator>
+
 #include "core/lxcatformat.h"
-#include "lx.h"
-#include "scratch.h"
+#include "support/object_files.h"
 
 namespace {
 
@@ -33,12 +36,12 @@ void fetch_all(LXCatalog* catalog, const std::vector<uint32_t>& numbers) {
 }  // namespace
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
-  static const fuzz::Scratch scratch;
-  static const std::string path = scratch.path() + "/catalog";
-  static const int32_t started = LXInit(scratch.path().c_str(), nullptr, nullptr, nullptr, 0);
+  static const lx::test::ScratchDirectory directory;
+  static const std::string path = directory.file("catalog");
+  static const int32_t started = LXInit(directory.path().c_str(), nullptr, nullptr, nullptr, 0);
   static LXLocale* const locale = LXGetLocale("", 0, nullptr);
   if (started != LX_W_DEFAULTS || locale == nullptr) abort();
-  scratch.write("catalog", data, size);
+  directory.write("catalog", {data, data + size});
   const std::vector<uint32_t> numbers = numbers_in(data, size);
   for (const uint32_t mode : kModes) {
     LXCatalog* catalog = LXOpenCatalog(locale, nullptr, path.c_str(), mode);

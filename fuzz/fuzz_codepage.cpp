@@ -1,8 +1,7 @@
 // Any bytes as the data file of a codepage: refused, or every function is safe with it.
-#include <vector>
+#include <cstdlib>
 
-#include "lx.h"
-#include "scratch.h"
+#include "support/object_files.h"
 
 namespace {
 
@@ -39,11 +38,10 @@ void exercise(LXLocale* locale) {
 }  // namespace
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
-  static const fuzz::Scratch scratch;
-  static const std::vector<uint8_t> control_file = fuzz::control_file();
-  scratch.write("control.nls", control_file.data(), control_file.size());
-  scratch.write(fuzz::file_name(LX_CODEPAGE), data, size);
-  if (LXInit(scratch.path().c_str(), nullptr, nullptr, nullptr, 0) != LX_OK) abort();
+  static const lx::test::ScratchDirectory directory;
+  directory.write_locale({{819, "Fuzz", {{}}}});
+  directory.write("cp_00819.nls", {data, data + size});
+  if (LXInit(directory.path().c_str(), nullptr, nullptr, nullptr, 0) != LX_OK) abort();
   int32_t rc = LX_OK;
   LXLocale* locale = LXGetLocale("English_UnitedStates.Fuzz", 0, &rc);
   if (locale == nullptr) abort();  // the built-in codepage takes the place of one that is refused

@@ -1,15 +1,13 @@
-// Any bytes as the data file of a language, a territory or a sort: refused, or every function is safe with it.
-// The first byte says which.
-#include <vector>
+// Any bytes as a file of a locale directory, as the first of them says: refused, or every function is safe with
+// it.
+#include <cstdlib>
+#include <iterator>
 
-#include "lx.h"
-#include "scratch.h"
+#include "support/object_files.h"
 
 namespace {
 
-constexpr int kTypes[] = {LX_LANGUAGE, LX_TERRITORY, LX_SORT};
-constexpr const char* kNames[] = {"Fuzz_UnitedStates.Fuzz@Binary", "English_Fuzz.Fuzz@Binary",
-                                  "English_UnitedStates.Fuzz@Fuzz"};
+constexpr const char* kFiles[] = {"la_00001.nls", "te_00840.nls", "so_00001.nls", "control.nls", "alias.txt"};
 constexpr int32_t kUnits = 0x10000;
 
 void read_items(LXLocale* locale) {
@@ -57,19 +55,32 @@ void write_values(LXLocale* locale) {
 }  // namespace
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
-  static const fuzz::Scratch scratch;
-  static const std::vector<uint8_t> control_file = fuzz::control_file();
+  using namespace lx::test;
+  static const ScratchDirectory directory;
   if (size == 0) return 0;
-  const size_t which = data[0] % std::size(kTypes);
-  scratch.write("control.nls", control_file.data(), control_file.size());
-  scratch.write(fuzz::file_name(kTypes[which]), data + 1, size - 1);
-  if (LXInit(scratch.path().c_str(), nullptr, nullptr, nullptr, 0) != LX_OK) abort();
-  if (LXLocale* locale = LXGetLocale(kNames[which], LX_FALLBACK, nullptr)) {
+  directory.write_locale({{367, "US-ASCII", ascii_codepage()}});
+  directory.write("control.nls", control_file({{1, LX_LANGUAGE, "English"},
+                                               {840, LX_TERRITORY, "UnitedStates"},
+                                               {367, LX_CODEPAGE, "US-ASCII"},
+                                               {1, LX_SORT, "Default"}}));
+  for (const char* other : {"so_00001.nls", "alias.txt"}) directory.write(other, {});
+  directory.write(kFiles[data[0] % std::size(kFiles)], {data + 1, data + size});
+  LXInit(directory.path().c_str(), nullptr, nullptr, nullptr, 0);
+  for (const char* name : {"", "English_UnitedStates.US-ASCII@BINARY"})
+    LXReleaseLocale(LXGetLocale(name, LX_FALLBACK, nullptr));
+  LXLocale* locale = LXGetLocale("English@Default", 0, nullptr);
+  if (locale == nullptr) locale = LXGetLocale("English", 0, nullptr);
+  if (locale != nullptr) {
     read_items(locale);
     use_text(locale);
     write_values(locale);
     LXReleaseLocale(locale);
   }
-  if (LXTerm() != LX_OK) abort();
+  int32_t rc = LX_OK;
+  for (int32_t type = LX_LANGUAGE; type <= LX_SORT; ++type)
+    for (int32_t id = 0; id <= 0xFFFF; id += 257)
+      LXGetObjFromID(nullptr, type, static_cast<uint16_t>(id), LX_FIND_AND_LOAD, &rc);
+  LXGetCodepageFromAlias(nullptr, "utf8");
+  LXTerm();
   return 0;
 }

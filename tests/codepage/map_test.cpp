@@ -7,7 +7,7 @@
 #include "codepage/lxunicode.h"
 #include "core/lxrecords.h"
 #include "support/case_library.h"
-#include "support/encoded_text.h"
+#include "support/conversion.h"
 
 namespace lx::test {
 namespace {
@@ -75,82 +75,49 @@ class Map : public testing::Test {
     return mode == LX_MAP_COPY ? u : unicode_upper(u);
   }
 
-  /// Compares for every size, of the input with its null, in a block of its own size.
-  template <class Unit, class Call>
-  static void check(const std::vector<std::vector<Unit>>& pieces, const Call& call) {
-    size_t needed = 0;
-    for (const auto& piece : pieces) needed += piece.size();
-    for (size_t size = 0; size <= needed + 1; ++size) {
-      std::vector<Unit> expected, output(size);
-      for (const auto& piece : pieces) {
-        if (expected.size() + piece.size() > size) break;
-        expected.insert(expected.end(), piece.begin(), piece.end());
-      }
-      const int32_t result = call(output.data(), static_cast<int32_t>(size));
-      ASSERT_EQ(result, static_cast<int32_t>(expected.size())) << "size " << size;
-      output.resize(expected.size());
-      ASSERT_EQ(output, expected) << "size " << size;
-    }
+  /// Compares for every size, of the input with its null, in a block of its own size. The Unicode form knows
+  /// no codepage.
+  template <class F>
+  void follow_model(const F& form, const TinyCodepage& cp, Units text, uint32_t mode) {
+    using Unit = typename F::Unit;
+    SCOPED_TRACE(cp.file.name + " " + form.name + " mode " + std::to_string(mode) + " " + shown(text));
+    text.push_back(0);
+    const std::vector<Unit> input = units_of<F>(cp, text);
+    OutputModel<Unit> model;
+    model.null_terminated = model.null_converted = true;
+    for (const Piece& piece : mapped(std::is_same_v<F, Unicode> ? nullptr : &cp, text, mode))
+      model.pieces.push_back(units_of<F>(cp, piece.unicode));
+    expect_at_every_size(model, 0, [&](Unit* out, int32_t size, int32_t) {
+      return form.map(locale(cp), out, size, input.data(), -1, mode);
+    });
+    if constexpr (!std::is_same_v<F, Plain>) return;
+    // In characters, within the bytes that are mapped that way.
+    std::vector<Unit> expected, out(1024);
+    const size_t chars = std::min<size_t>(model.pieces.size(), 9);
+    for (size_t i = 0; i < chars; ++i)
+      expected.insert(expected.end(), model.pieces[i].begin(), model.pieces[i].end());
+    const auto size = static_cast<int32_t>(chars);
+    EXPECT_EQ(form.map(locale(cp), out.data(), size, input.data(), -1, mode | LX_CHARACTERS), size);
+    EXPECT_EQ(out[expected.size()], 0);
+    out.resize(expected.size());
+    EXPECT_EQ(out, expected);
   }
 
   CaseLibrary library_;
 };
 
-TEST_F(Map, PlainAndWideFollowTheModel) {
+TEST_F(Map, EveryFormFollowsTheModel) {
   std::mt19937 random(1);
   for (const TinyCodepage& cp : case_codepages()) {
     if (cp.shift || cp.file.name == "ODD") continue;
-    LXLocale* const in = locale(cp);
     for (int n = 0; n < 320 && !HasFatalFailure(); ++n) {
       const uint32_t mode = kModes[n % 8];
-      Units text = random_text(&cp, &random);
-      const auto bytes = Encoded<Plain>(cp, text).terminated();
-      const auto codes = Encoded<Wide>(cp, text).terminated();
-      text.push_back(0);
-      std::vector<std::vector<char>> pieces;
-      std::vector<std::vector<LXWChar>> code_pieces;
-      for (const Piece& piece : mapped(&cp, text, mode)) {
-        const std::string one = cp.encode({piece.unicode});  // or the substitution byte
-        pieces.emplace_back(one.begin(), one.end());
-        LXWChar code = 0;
-        for (char byte : one) code = code << 8 | static_cast<uint8_t>(byte);
-        code_pieces.push_back({code});
-      }
-      SCOPED_TRACE(cp.file.name + " mode " + std::to_string(mode) + " " + shown(text));
-      check<char>(pieces,
-                  [&](char* out, int32_t size) { return LXMapString(in, out, size, bytes.data(), -1, mode); });
-      check<char>(pieces, [&](char* out, int32_t size) {
-        return LXMapStringEx(in, out, size, bytes.data(), -1, mode);
-      });
-      check<LXWChar>(code_pieces, [&](LXWChar* out, int32_t size) {
-        return LXMapStringW(in, out, size, codes.data(), -1, mode);
-      });
-      // In characters, within the bytes that are mapped that way.
-      std::vector<char> out(1024);
-      const size_t chars = std::min<size_t>(pieces.size(), 9);
-      EXPECT_EQ(
-          LXMapString(in, out.data(), static_cast<int32_t>(chars), bytes.data(), -1, mode | LX_CHARACTERS),
-          static_cast<int32_t>(chars));
-      std::string expected;
-      for (size_t i = 0; i < chars; ++i) expected.append(pieces[i].begin(), pieces[i].end());
-      EXPECT_EQ(std::string(out.data(), expected.size()), expected);
-      EXPECT_EQ(out[expected.size()], 0);
+      const Units text = random_text(&cp, &random);
+      follow_model(kPlain, cp, text, mode);
+      follow_model(kEx, cp, text, mode);
+      follow_model(kWide, cp, text, mode);
+      if (cp.file.name == "UTF8") follow_model(kUnicode, cp, random_text(nullptr, &random), mode);
     }
-  }
-}
-
-TEST_F(Map, UnicodeFollowsTheModel) {
-  std::mt19937 random(2);
-  LXLocale* const in = locale(case_codepage("UTF8"));
-  for (int n = 0; n < 320 && !HasFatalFailure(); ++n) {
-    const uint32_t mode = kModes[n % 8];
-    const Units text = random_text(nullptr, &random);
-    std::vector<std::vector<LXUChar>> pieces;
-    for (const Piece& piece : mapped(nullptr, text, mode)) pieces.push_back({piece.unicode});
-    SCOPED_TRACE(shown(text) + " mode " + std::to_string(mode));
-    check<LXUChar>(pieces, [&](LXUChar* out, int32_t size) {
-      return LXMapStringU(in, out, size, text.data(), static_cast<int32_t>(text.size()), mode);
-    });
   }
 }
 

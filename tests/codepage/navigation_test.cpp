@@ -70,101 +70,76 @@ class Navigation : public testing::Test {
   std::mt19937 random_{1};
 };
 
-TEST_F(Navigation, StatelessTextInPlainAndExForms) {
+TEST_F(Navigation, EveryCharacterForwardsAndBackwards) {
   for (const TinyCodepage& cp : case_codepages()) {
-    if (cp.shift) continue;
     SCOPED_TRACE(cp.file.name);
     LXLocale* const in = library_.locale(cp);
-    for (int round = 0; round < 60; ++round) {
-      states.text = random_() % 2;
-      const Encoded<Ex> text = random_text(cp, random_() % 12, states.text);
+    for (int round = 0; round < (cp.shift ? 400 : 60); ++round) {
+      const LXShiftState initial = random_() % 2;
+      const Encoded<Ex> text = random_text(cp, random_() % 12, initial);
       const std::vector<char> bytes = text.terminated();
-      const char* const start = bytes.data();
+      const char *const start = bytes.data(), *p = start;
+      LXShiftState state = initial;
       for (size_t i = 0; i < text.count(); ++i) {
-        const char *const p = start + text.start[i], *const next = start + text.end[i];
-        const auto walk = [&](const auto& form) {
-          const auto index = static_cast<int32_t>(i + 1);
-          states.result = kUntouched;
-          EXPECT_EQ(form.next(in, p), next);
-          EXPECT_EQ(form.previous(in, start, next), p);
-          EXPECT_EQ(form.code(in, p), text.codes[i]);
-          EXPECT_EQ(form.length(in, p), next - p);
-          EXPECT_EQ(form.valid(in, p), next - p);
-          EXPECT_EQ(form.move(in, start, index, LX_CHARACTERS), next);
-          EXPECT_TRUE(form.name != kEx.name || states.result == states.text);
-        };
-        walk(kPlain), walk(kEx);
-        EXPECT_EQ(LXMbToW(in->codepage, p), text.codes[i]);
-        EXPECT_EQ(LXByteLengthW(in, text.codes[i]), next - p);
-        EXPECT_EQ(LXCpStrCharToByteLen(in->codepage, start, states.text, static_cast<int32_t>(i + 1)),
-                  next - start);
+        const char* const character = start + text.start[i];
+        const auto width = static_cast<int32_t>(text.end[i] - text.start[i]),
+                   count = static_cast<int32_t>(i + 1);
+        const bool shift_behind = std::count(text.shifts.begin(), text.shifts.end(), text.end[i]) != 0;
+        const char* const behind = start + text.end[i] + shift_behind;
+        const LXShiftState own = cp.shift ? static_cast<LXShiftState>(width - 1) : initial;
+        const LXShiftState state_behind = shift_behind ? 1 - own : own;
+        EXPECT_EQ(LXGetCharEx(in, p, state), text.codes[i]);
+        EXPECT_EQ(LXByteLengthEx(in, p, state), width);
+        EXPECT_EQ(cp.shift ? LXMbToWS(in->codepage, character, own) : LXMbToW(in->codepage, character),
+                  text.codes[i]);
+        LXShiftState next_state = kUntouched, previous_state = kUntouched;
+        EXPECT_EQ(LXNextCharEx(in, p, state, &next_state, 0), behind);
+        EXPECT_EQ(next_state, state_behind);
+        EXPECT_EQ(LXPrevCharEx(in, start, behind, next_state, &previous_state), character);
+        EXPECT_EQ(previous_state, own);
+        EXPECT_EQ(LXCpStrCharToByteLen(in->codepage, start, initial, count), behind - start);
+        EXPECT_EQ(LXMoveStringPointerEx(in, start, initial, count, &state, LX_CHARACTERS), behind);
+        EXPECT_EQ(state, state_behind);
+        p = behind;
+        if (cp.shift) continue;
+        EXPECT_EQ(LXNextChar(in, character), behind);
+        EXPECT_EQ(LXPrevChar(in, start, behind), character);
+        EXPECT_EQ(LXGetChar(in, character), text.codes[i]);
+        EXPECT_EQ(LXByteLength(in, character), width);
+        EXPECT_EQ(LXByteLengthW(in, text.codes[i]), width);
+        EXPECT_EQ(LXValidChar(in, character), width);
+        EXPECT_EQ(LXValidCharEx(in, character, own), width);
+        EXPECT_EQ(LXMoveStringPointer(in, start, count, LX_CHARACTERS), behind);
       }
-      counts(cp, text, states.text);
+      counts(cp, text, initial);
     }
-  }
-  states = {};
-}
-
-TEST_F(Navigation, ShiftSensitiveText) {
-  const TinyCodepage& cp = case_codepage("SHIFT");
-  LXLocale* const in = library_.locale(cp);
-  for (int round = 0; round < 400; ++round) {
-    const LXShiftState initial = random_() % 2;
-    const Encoded<Ex> text = random_text(cp, random_() % 10, initial);
-    const std::vector<char> bytes = text.terminated();
-    const char *const start = bytes.data(), *p = start;
-    LXShiftState state = initial;
-    for (size_t i = 0; i < text.count(); ++i) {
-      const char* const character = start + text.start[i];
-      const auto width = static_cast<LXShiftState>(text.end[i] - text.start[i]);
-      const bool shift_behind = std::count(text.shifts.begin(), text.shifts.end(), text.end[i]) != 0;
-      const char* const behind = start + text.end[i] + shift_behind;
-      const LXShiftState own = width - 1, state_behind = shift_behind ? 1 - own : own;
-      EXPECT_EQ(LXGetCharEx(in, p, state), text.codes[i]);
-      EXPECT_EQ(LXByteLengthEx(in, p, state), static_cast<int32_t>(width));
-      EXPECT_EQ(LXMbToWS(in->codepage, character, own), text.codes[i]);
-      LXShiftState next_state = kUntouched, previous_state = kUntouched;
-      EXPECT_EQ(LXNextCharEx(in, p, state, &next_state, 0), behind);
-      EXPECT_EQ(next_state, state_behind);
-      EXPECT_EQ(LXPrevCharEx(in, start, behind, next_state, &previous_state), character);
-      EXPECT_EQ(previous_state, own);
-      const auto count = static_cast<int32_t>(i + 1);
-      EXPECT_EQ(LXCpStrCharToByteLen(in->codepage, start, initial, count), behind - start);
-      EXPECT_EQ(LXMoveStringPointerEx(in, start, initial, count, &state, LX_CHARACTERS), behind);
-      EXPECT_EQ(state, state_behind);
-      p = behind;
-    }
-    counts(cp, text, initial);
   }
 }
 
 TEST_F(Navigation, PackedCodes) {
   const struct {
     uint32_t code;
+    int32_t length;  // zero bytes counted
     std::string bytes;
-    int32_t code_length;  // zero bytes counted
-  } rows[] = {
-      {0x00, std::string("\0", 1), 1},
-      {0x41, "A", 1},
-      {0x82A0, "\x82\xA0", 2},
-      {0x8200, std::string("\x82\0", 2), 2},
-      {0x820041, "\x82\x41", 3},
-      {0x8FB0A1, "\x8F\xB0\xA1", 3},
-      {0x90308130, "\x90\x30\x81\x30", 4},
-      {0x90000030, "\x90\x30", 4},
-      {0x90300030, "\x90\x30\x30", 4},
-      {0x90008100, std::string("\x90\x81\0", 3), 4},
-  };
+  } rows[] = {{0x00, 1, {"\0", 1}},
+              {0x41, 1, "A"},
+              {0x82A0, 2, "\x82\xA0"},
+              {0x8200, 2, {"\x82\0", 2}},
+              {0x820041, 3, "\x82\x41"},
+              {0x8FB0A1, 3, "\x8F\xB0\xA1"},
+              {0x90000030, 4, "\x90\x30"},
+              {0x90308130, 4, "\x90\x30\x81\x30"},
+              {0x90300030, 4, "\x90\x30\x30"},
+              {0x90008100, 4, {"\x90\x81\0", 3}}};
   LXLocale* locale = library_.locale(case_codepage("SINGLE"));
   for (const auto& row : rows) {
     SCOPED_TRACE(row.code);
-    EXPECT_EQ(LXStrByteLength(row.code), row.code_length);
-    EXPECT_EQ(LXByteLengthW(locale, row.code), row.code_length);
-    std::vector<char> stored(row.bytes.size());  // exact
-    EXPECT_EQ(LXWToMb(stored.data(), row.code), static_cast<int32_t>(row.bytes.size()));
-    EXPECT_EQ(std::string(stored.begin(), stored.end()), row.bytes);
-    std::vector<char> put(row.bytes.size());
+    EXPECT_EQ(LXStrByteLength(row.code), row.length);
+    EXPECT_EQ(LXByteLengthW(locale, row.code), row.length);
+    std::vector<char> stored(row.bytes.size()), put(row.bytes.size());  // exact
+    EXPECT_EQ(LXWToMb(stored.data(), row.code), count_of(row.bytes));
     EXPECT_EQ(LXPutChar(locale, put.data(), row.code), 0);
+    EXPECT_EQ(std::string(stored.begin(), stored.end()), row.bytes);
     EXPECT_EQ(put, stored);
   }
 }

@@ -6,6 +6,7 @@
 #include <unicode/uscript.h>
 
 #include <cstdio>
+#include <map>
 #include <string>
 
 #include "codepage/lxunicode.h"
@@ -97,37 +98,27 @@ uint32_t classification(uint32_t u) {
 uint32_t bidi_category(uint32_t u) {
   // The assignment in which the solidus separates numbers, and plus and minus end them.
   if (u == '/' || u == 0xFF0F) return LX_C2_EUROPEAN_SEPARATOR;
-  switch (u_charDirection(static_cast<UChar32>(u))) {
-    case U_LEFT_TO_RIGHT:
-      return LX_C2_LEFT_TO_RIGHT;
-    case U_RIGHT_TO_LEFT:
-    case U_RIGHT_TO_LEFT_ARABIC:
-      return LX_C2_RIGHT_TO_LEFT;
-    case U_EUROPEAN_NUMBER:
-      return LX_C2_EUROPEAN_NUMBER;
-    case U_EUROPEAN_NUMBER_SEPARATOR:
-    case U_EUROPEAN_NUMBER_TERMINATOR:
-      return LX_C2_EUROPEAN_TERMINATOR;
-    case U_ARABIC_NUMBER:
-      return LX_C2_ARABIC_NUMBER;
-    case U_COMMON_NUMBER_SEPARATOR:
-      return LX_C2_COMMON_SEPARATOR;
-    case U_BLOCK_SEPARATOR:
-      return LX_C2_BLOCK_SEPARATOR;
-    case U_SEGMENT_SEPARATOR:
-      return LX_C2_SEGMENT_SEPARATOR;
-    case U_WHITE_SPACE_NEUTRAL:
-      return LX_C2_WHITE_SPACE;
-    case U_OTHER_NEUTRAL:
-    case U_DIR_NON_SPACING_MARK:  // no category of their own: marks and isolates act as neutrals
-    case U_FIRST_STRONG_ISOLATE:
-    case U_LEFT_TO_RIGHT_ISOLATE:
-    case U_RIGHT_TO_LEFT_ISOLATE:
-    case U_POP_DIRECTIONAL_ISOLATE:
-      return LX_C2_OTHER_NEUTRAL;
-    default:  // embeddings, overrides and boundary neutrals
-      return LX_C2_NONE;
-  }
+  static const std::map<UCharDirection, uint32_t> categories = {
+      {U_LEFT_TO_RIGHT, LX_C2_LEFT_TO_RIGHT},
+      {U_RIGHT_TO_LEFT, LX_C2_RIGHT_TO_LEFT},
+      {U_RIGHT_TO_LEFT_ARABIC, LX_C2_RIGHT_TO_LEFT},
+      {U_EUROPEAN_NUMBER, LX_C2_EUROPEAN_NUMBER},
+      {U_EUROPEAN_NUMBER_SEPARATOR, LX_C2_EUROPEAN_TERMINATOR},
+      {U_EUROPEAN_NUMBER_TERMINATOR, LX_C2_EUROPEAN_TERMINATOR},
+      {U_ARABIC_NUMBER, LX_C2_ARABIC_NUMBER},
+      {U_COMMON_NUMBER_SEPARATOR, LX_C2_COMMON_SEPARATOR},
+      {U_BLOCK_SEPARATOR, LX_C2_BLOCK_SEPARATOR},
+      {U_SEGMENT_SEPARATOR, LX_C2_SEGMENT_SEPARATOR},
+      {U_WHITE_SPACE_NEUTRAL, LX_C2_WHITE_SPACE},
+      {U_OTHER_NEUTRAL, LX_C2_OTHER_NEUTRAL},
+      // No category of their own: marks and isolates act as neutrals, embeddings and overrides as nothing.
+      {U_DIR_NON_SPACING_MARK, LX_C2_OTHER_NEUTRAL},
+      {U_FIRST_STRONG_ISOLATE, LX_C2_OTHER_NEUTRAL},
+      {U_LEFT_TO_RIGHT_ISOLATE, LX_C2_OTHER_NEUTRAL},
+      {U_RIGHT_TO_LEFT_ISOLATE, LX_C2_OTHER_NEUTRAL},
+      {U_POP_DIRECTIONAL_ISOLATE, LX_C2_OTHER_NEUTRAL}};
+  const auto found = categories.find(u_charDirection(static_cast<UChar32>(u)));
+  return found != categories.end() ? found->second : uint32_t{LX_C2_NONE};
 }
 
 /// Whether the canonical decomposition of a letter holds a mark.

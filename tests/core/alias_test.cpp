@@ -52,21 +52,14 @@ TEST_F(AliasTest, LongLinesAreReadInPieces) {
 
 TEST_F(AliasTest, LookUpAndEnumeration) {
   load("UTF-8 utf8\nIBM-850 850 Latin-1\nIBM-437 latin-1 437\n");
-  const auto codepage = [](const char* alias) {
-    const char* name = LXGetCodepageFromAlias(nullptr, alias);
-    return std::string(name != nullptr ? name : "");
-  };
-  EXPECT_EQ(codepage("Utf8"), "UTF-8");
-  EXPECT_EQ(codepage("437"), "IBM-437");
-  EXPECT_EQ(codepage("LATIN-1"), "IBM-850") << "the first in file order";
+  EXPECT_STREQ(LXGetCodepageFromAlias(nullptr, "Utf8"), "UTF-8");
+  EXPECT_STREQ(LXGetCodepageFromAlias(nullptr, "437"), "IBM-437");
+  EXPECT_STREQ(LXGetCodepageFromAlias(nullptr, "LATIN-1"), "IBM-850") << "the first in file order";
   for (const char* unknown : {"", "UTF", "UTF88", "UTF-8", "IBM-850"})
-    EXPECT_EQ(codepage(unknown), "") << unknown;
+    EXPECT_EQ(LXGetCodepageFromAlias(nullptr, unknown), nullptr) << unknown;
   int calls = 0;
-  EXPECT_EQ(
-      LXEnumAliases(
-          nullptr, [](void* user, const char*, const char*) { return ++*static_cast<int*>(user) < 2 ? 1 : 0; },
-          &calls),
-      LX_OK);
+  const auto two = [](void* user, const char*, const char*) { return ++*static_cast<int*>(user) < 2 ? 1 : 0; };
+  EXPECT_EQ(LXEnumAliases(nullptr, two, &calls), LX_OK);
   EXPECT_EQ(calls, 2);
 }
 

@@ -111,10 +111,12 @@ TEST_F(FileTest, DescriptorRulesOfCreation) {
 
 TEST_F(FileTest, OpenCodes) {
   directory.write_text("data.txt", "text");
+  directory.write_text("secret", "text");
+  ASSERT_EQ(chmod(directory.file("secret").c_str(), 0), 0);
+  ASSERT_EQ(chmod(directory.path().c_str(), 0755), 0);
   const auto expect_code = [&](const char* name, int32_t mode, int32_t code) {
     EXPECT_EQ(open_file(name, mode), nullptr) << name;
     EXPECT_EQ(rc, code) << name;
-    hooks.fail_at(0);
   };
   for (int32_t mode : {LX_READ, LX_READ_WRITE}) {
     expect_code("none", mode, LX_E_FILE_NOT_FOUND);
@@ -125,97 +127,80 @@ TEST_F(FileTest, OpenCodes) {
   hooks.fail_at(1);
   expect_code("none", LX_WRITE, LX_E_MEMORY);
   EXPECT_FALSE(directory.exists("none"));
-}
-
-TEST_F(FileTest, AccessDenied) {
-  directory.write_text("secret", "text");
-  ASSERT_EQ(chmod(directory.file("secret").c_str(), 0), 0);
-  ASSERT_EQ(chmod(directory.path().c_str(), 0755), 0);
+  hooks.fail_at(0);
   constexpr uid_t kNobody = 65534;
   const uid_t user = geteuid();
   if (user == 0 && seteuid(kNobody) != 0) GTEST_SKIP();
-  LXFile* file = open_file("secret", LX_READ);
-  const int32_t code = rc;
+  expect_code("secret", LX_READ, LX_E_FILE_ACCESS);
   const bool restored = user != 0 || seteuid(user) == 0;
   ASSERT_TRUE(restored);
-  EXPECT_EQ(file, nullptr);
-  EXPECT_EQ(code, LX_E_FILE_ACCESS);
 }
 
-TEST_F(FileTest, ReadsAndSeeks) {
-  directory.write_text("data.txt", "0123456789");
-  LXFile* file = open_file("data.txt", LX_READ);
-  ASSERT_NE(file, nullptr);
-  EXPECT_EQ(LXFileSize(file), 10);
-  struct Case {
-    int32_t offset, origin, result;
-    char next;
-  };
-  const Case cases[] = {{4, LX_FROM_START, 0, '4'},
-                        {2, LX_FROM_HERE, 0, '7'},
-                        {-3, LX_FROM_END, 0, '7'},
-                        {3, 0, 0, '3'},
-                        {5, 13, 0, '5'},
-                        {-1, LX_FROM_START, 1, '6'},
-                        {-11, LX_FROM_END, 1, '7'}};
-  for (const Case& c : cases) {
-    SCOPED_TRACE(c.next);
-    EXPECT_EQ(LXSeekFile(file, c.offset, c.origin), c.result);
-    char byte = 0;
-    EXPECT_EQ(LXReadFile(file, &byte, 1, &rc), 1);
-    EXPECT_EQ(byte, c.next);
-  }
-  char buffer[20] = {};
-  LXSeekFile(file, 0, LX_FROM_START);
-  EXPECT_EQ(LXReadFile(file, buffer, 20, &rc), 10);
-  EXPECT_EQ(rc, LX_OK);
-  EXPECT_STREQ(buffer, "0123456789");
-  EXPECT_EQ(LXReadFile(file, buffer, 20, &rc), 0);
-  EXPECT_EQ(rc, LX_OK) << "the end of the file is no failure";
-  EXPECT_EQ(LXCloseFile(file, 0), 0);
-  file = open_file(".", LX_READ);
-  EXPECT_EQ(LXReadFile(file, buffer, 20, &rc), 0);
-  EXPECT_EQ(rc, LX_E_FILE_IO);
-  EXPECT_EQ(LXCloseFile(file, 0), 0);
-}
-
-TEST_F(FileTest, LoadsBytes) {
+TEST_F(FileTest, ReadsSeeksAndLoads) {
   directory.write_text("data.txt", "0123456789");
   LXFile* file = open_file("data.txt", LX_READ_WRITE);
   ASSERT_NE(file, nullptr);
-  struct Case {
+  EXPECT_EQ(LXFileSize(file), 10);
+  char buffer[20] = {};
+  const struct {
+    int32_t offset, origin, result;
+    char next;
+  } seeks[] = {{4, LX_FROM_START, 0, '4'},
+               {2, LX_FROM_HERE, 0, '7'},
+               {-3, LX_FROM_END, 0, '7'},
+               {3, 0, 0, '3'},
+               {5, 13, 0, '5'},
+               {-1, LX_FROM_START, 1, '6'},
+               {-11, LX_FROM_END, 1, '7'},
+               {0, LX_FROM_START, 0, '0'}};
+  for (const auto& seek : seeks) {
+    EXPECT_EQ(LXSeekFile(file, seek.offset, seek.origin), seek.result) << seek.next;
+    EXPECT_EQ(LXReadFile(file, buffer, 1, &rc), 1);
+    EXPECT_EQ(buffer[0], seek.next);
+  }
+  EXPECT_EQ(LXReadFile(file, buffer, 20, &rc), 9);
+  EXPECT_EQ(rc, LX_OK);
+  EXPECT_STREQ(buffer, "123456789");
+  EXPECT_EQ(LXReadFile(file, buffer, 20, &rc), 0);
+  EXPECT_EQ(rc, LX_OK) << "the end of the file is no failure";
+
+  const struct {
     uint32_t offset;
     int32_t bytes, code;
     const char* text;
-  };
-  const Case cases[] = {
-      {0, 10, LX_OK, "0123456789"},           {7, 3, LX_OK, "789"},   {7, 4, LX_E_FILE_IO, nullptr},
-      {0xFFFFFFFF, 1, LX_E_FILE_IO, nullptr}, {0, 0, LX_OK, nullptr},
-  };
-  for (const Case& c : cases) {
-    SCOPED_TRACE(c.offset);
+  } loads[] = {{0, 10, LX_OK, "0123456789"},
+               {7, 3, LX_OK, "789"},
+               {7, 4, LX_E_FILE_IO, nullptr},
+               {0xFFFFFFFF, 1, LX_E_FILE_IO, nullptr},
+               {0, 0, LX_OK, nullptr}};
+  for (const auto& load : loads) {
+    SCOPED_TRACE(load.offset);
     rc = -1;
-    void* block = LXLoadFile(file, c.offset, c.bytes, &rc);
-    EXPECT_EQ(rc, c.code);
-    ASSERT_EQ(block != nullptr, c.text != nullptr);
-    if (c.text != nullptr) {
-      EXPECT_EQ(memcmp(block, c.text, strlen(c.text)), 0);
+    void* block = LXLoadFile(file, load.offset, load.bytes, &rc);
+    EXPECT_EQ(rc, load.code);
+    ASSERT_EQ(block != nullptr, load.text != nullptr);
+    if (load.text != nullptr) {
+      EXPECT_EQ(memcmp(block, load.text, strlen(load.text)), 0);
     }
-    EXPECT_EQ(LXUnloadFile(block), 0);
+    hooks.fail_frees(true);
+    EXPECT_EQ(LXUnloadFile(block), 0) << "it never fails";
+    hooks.fail_frees(false);
   }
-  void* block = LXLoadFile(file, 0, 4, &rc);
-  hooks.fail_frees(true);
-  EXPECT_EQ(LXUnloadFile(block), 0) << "it never fails";
-  hooks.fail_frees(false);
   EXPECT_EQ(LXCloseFile(file, 0), 0);
+}
 
-  file = open_file("data.txt", LX_WRITE, 1);
-  char byte;
-  EXPECT_EQ(LXReadFile(file, &byte, 1, &rc), 0);
-  EXPECT_EQ(rc, LX_E_FILE_MODE);
-  EXPECT_EQ(LXLoadFile(file, 0, 1, &rc), nullptr);
-  EXPECT_EQ(rc, LX_E_FILE_MODE);
-  EXPECT_EQ(LXCloseFile(file, 0), 0);
+TEST_F(FileTest, WhatCannotBeRead) {
+  const auto expect_code = [&](LXFile* file, int32_t code) {
+    char byte;
+    ASSERT_NE(file, nullptr);
+    EXPECT_EQ(LXReadFile(file, &byte, 1, &rc), 0);
+    EXPECT_EQ(rc, code);
+    EXPECT_EQ(LXLoadFile(file, 0, 1, &rc), nullptr);
+    EXPECT_EQ(rc, code);
+    EXPECT_EQ(LXCloseFile(file, 0), 0);
+  };
+  expect_code(open_file(".", LX_READ), LX_E_FILE_IO);
+  expect_code(open_file("data.txt", LX_WRITE, 1), LX_E_FILE_MODE);
 }
 
 TEST(PathTest, Parts) {

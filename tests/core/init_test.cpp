@@ -2,7 +2,6 @@
 #include <climits>
 
 #include "core/library_fixture.h"
-#include "core/small_codepages.h"
 
 namespace lx::test {
 namespace {
@@ -99,7 +98,8 @@ TEST_F(InitTest, TermReportsTheFirstFailingRelease) {
     bool set_default_locale;
     int32_t code;
   };
-  directory.write_locale({{367, "US-ASCII", ascii_codepage()}, {500, "Old", version1_ascii_codepage(), 1}});
+  directory.write_locale(
+      {{367, "US-ASCII", ascii_codepage()}, {500, "Old", version1_codepage(ascii_codepage()), 1}});
   for (const Case& c :
        {Case{"a codepage read from its file", 367, false, 1},
         Case{"a converted codepage", 500, false, LX_E_FREE}, Case{"a default locale", 500, true, 1}}) {

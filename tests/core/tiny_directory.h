@@ -5,7 +5,6 @@
 #include "core/library_fixture.h"
 #include "core/lxformat.h"
 #include "core/lxobjtypes.h"
-#include "core/small_codepages.h"
 #include "support/sort_builder.h"
 #include "support/tiny_codepages.h"
 
@@ -14,7 +13,7 @@ namespace lx::test {
 inline constexpr uint16_t kElsewhereId = 276, kOldId = 901, kSortId = 5;
 
 inline void write_tiny_directory(const ScratchDirectory& directory) {
-  std::vector<ScratchDirectory::Codepage> files = {{kOldId, "Old", version1_ascii_codepage(), 1}};
+  std::vector<ScratchDirectory::Codepage> files = {{kOldId, "Old", version1_codepage(ascii_codepage()), 1}};
   for (const TinyCodepage& codepage : tiny_codepages()) files.push_back(codepage.file);
   std::sort(files.begin(), files.end(), [](const auto& a, const auto& b) { return a.id < b.id; });
   directory.write_locale(files);

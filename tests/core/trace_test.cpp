@@ -19,26 +19,28 @@ const std::pair<const char*, uint32_t> kLevels[] = {
     {"process", RAS1_LEVEL_PROCESS}, {"error", RAS1_LEVEL_ERRORS}, {"detail", RAS1_LEVEL_DETAIL},
     {"input", RAS1_LEVEL_INPUT},     {"flow", RAS1_LEVEL_FLOW},    {"notice", RAS1_LEVEL_NOTICES}};
 
+using Action = std::function<void()>;
+const Action kNothing = [] {};
+
 class TraceTest : public LibraryTest {
  protected:
   /// What is different on every machine and in every run gets a name.
   std::string named(std::string text) const {
-    for (size_t at; (at = text.find(directory.path())) != std::string::npos;)
-      text.replace(at, directory.path().size(), "DIR");
-    text = std::regex_replace(text, std::regex("0x[0-9a-f]+"), "ADDRESS");
-    text = std::regex_replace(text, std::regex("\n"), "\\n");
-    const std::pair<const char*, size_t> sizes[] = {{"AREA", sizeof(lx::GlobalArea)},
-                                                    {"MANAGER", sizeof(LXObjManager)},
-                                                    {"ALIAS", sizeof(lx::AliasRecord)}};
-    for (const auto& [name, bytes] : sizes)
-      text = std::regex_replace(text, std::regex("allocate " + std::to_string(bytes) + " "),
-                                std::string("allocate ") + name + " ");
+    const auto allocation = [](size_t bytes) { return "allocate " + std::to_string(bytes) + " "; };
+    const std::pair<std::string, const char*> names[] = {
+        {directory.path(), "DIR"},
+        {"0x[0-9a-f]+", "ADDRESS"},
+        {"\n", "\\n"},
+        {allocation(sizeof(GlobalArea)), "allocate AREA "},
+        {allocation(sizeof(LXObjManager)), "allocate MANAGER "},
+        {allocation(sizeof(AliasRecord)), "allocate ALIAS "}};
+    for (const auto& [what, name] : names) text = std::regex_replace(text, std::regex(what), name);
     return text;
   }
 
   /// The messages of `action` as "level: text" lines, one level after the other, without those that every use
   /// of the library gives.
-  std::vector<std::string> transcript(const std::function<void()>& action) {
+  std::vector<std::string> transcript(const Action& action) {
     std::vector<std::string> lines;
     for (const auto& [name, level] : kLevels) {
       for (const std::string& text : messages(level, action)) {
@@ -50,7 +52,7 @@ class TraceTest : public LibraryTest {
   }
 
   /// A use of the library in which `action` happens.
-  std::function<void()> use(std::function<void()> action = [] {}) {
+  Action use(const Action& action = kNothing) {
     return [this, action] {
       init();
       action();
@@ -58,25 +60,25 @@ class TraceTest : public LibraryTest {
       terminate();
     };
   }
-  std::function<void()> with_alias_file(
-      const std::string& text, std::function<void()> action = [] {}) {
-    return [this, text, action] {
-      directory.write_text("alias.txt", text);
+  /// With another content of a file, which need not be there otherwise.
+  Action with_file(const std::string& name, const ByteString& content, const Action& action = kNothing) {
+    return [=] {
+      const ByteString whole = directory.read(name);
+      directory.write(name, content);
       use(action)();
-      std::filesystem::remove(directory.file("alias.txt"));
+      directory.write(name, whole);
+      if (whole.empty()) std::filesystem::remove(directory.file(name));
     };
   }
-  std::function<void()> with_control_file(const std::function<void(ByteString*)>& change) {
-    return [this, change] {
-      const ByteString whole = directory.read("control.nls");
-      ByteString content = whole;
-      change(&content);
-      directory.write("control.nls", content);
-      use()();
-      directory.write("control.nls", whole);
-    };
+  Action with_byte(const std::string& name, size_t at, uint8_t value, const Action& action = kNothing) {
+    ByteString content = directory.read(name);
+    content[at] = value;
+    return with_file(name, content, action);
   }
-  std::function<void()> without_memory(size_t n) {
+  Action with_aliases(const std::string& text, const Action& action = kNothing) {
+    return with_file("alias.txt", ByteString(text.begin(), text.end()), action);
+  }
+  Action without_memory(size_t n) {
     return [this, n] {
       hooks.fail_at(n);
       use()();
@@ -105,10 +107,12 @@ TEST_F(TraceTest, Texts) {
       terminate();
     };
   };
+  ByteString short_table = directory.read("control.nls");
+  short_table.pop_back();
   const std::string long_path(250, 'x'), path = directory.path(), none = directory.file("none");
   const struct {
     const char* name;
-    std::function<void()> action;
+    Action action;
   } actions[] = {
       {"use twice", use_twice},
       {"options", start(path.c_str(), 7)},
@@ -119,15 +123,16 @@ TEST_F(TraceTest, Texts) {
       {"no memory for the area", without_memory(1)},
       {"no memory for the manager", without_memory(2)},
       {"no memory for the records", without_memory(5)},
-      {"bad header", with_control_file([](ByteString* file) { (*file)[0] = 0; })},
-      {"table before the start", with_control_file([](ByteString* file) {
-         put_le32(file->data() + format::header_section_offset(0), 0xFFFFFFFE);
-       })},
-      {"short table", with_control_file([](ByteString* file) { file->pop_back(); })},
-      {"alias", with_alias_file("UTF-8 utf8\n")},
-      {"alias without a codepage", with_alias_file(" one\n")},
-      {"long codepage name", with_alias_file(std::string(33, 'n') + "\n")},
-      {"long alias", with_alias_file("A " + std::string(65, 'a') + "\n")},
+      {"bad header", with_byte("control.nls", 0, 0)},
+      {"table before the start", with_byte("control.nls", format::header_section_offset(0) + 3, 0xFF)},
+      {"short table", with_file("control.nls", short_table)},
+      {"refused object",
+       with_byte("cp_00367.nls", format::kHeaderBytes + format::codepage::kWidth, 0,
+                 [] { LXGetObjFromID(nullptr, LX_CODEPAGE, 367, LX_FIND_AND_LOAD, &ignored); })},
+      {"alias", with_aliases("UTF-8 utf8\n")},
+      {"alias without a codepage", with_aliases(" one\n")},
+      {"long codepage name", with_aliases(std::string(33, 'n') + "\n")},
+      {"long alias", with_aliases("A " + std::string(65, 'a') + "\n")},
       {"no memory for an alias",
        [&] {
          directory.write_text("alias.txt", "A one\n");
@@ -137,7 +142,7 @@ TEST_F(TraceTest, Texts) {
          without_memory(calls)();
          std::filesystem::remove(directory.file("alias.txt"));
        }},
-      {"alias looked up", with_alias_file("A one\n", [] { LXGetCodepageFromAlias(nullptr, "One"); })},
+      {"alias looked up", with_aliases("A one\n", [] { LXGetCodepageFromAlias(nullptr, "One"); })},
       {"file rewritten", use([&] { LXCloseFile(open_data(), 0); })},
       {"file gone", use([&] {
          LXFile* file = open_data();

@@ -1,5 +1,5 @@
-// The standalone platform layer: locks, environment, once-only blocks and trace. What happens at the start or
-// the end of a process, or depends on its environment, is seen from outside: the program runs in a role (see
+// The standalone platform layer: environment, once-only blocks and trace; locks are seen where threads load
+// objects. What happens at the start or the end of a process, or depends on its environment, is seen from outside: the program runs in a role (see
 // kRoles at the end), and tests/cases/cli/platform.txt says what that writes.
 #include <gtest/gtest.h>
 #include <pthread.h>
@@ -43,25 +43,6 @@ void in_eight_threads(Work work) {
 /// point.
 void say(const char* text) {
   if (write(STDOUT_FILENO, text, strlen(text)) < 0) abort();
-}
-
-TEST(Lock, ExcludesOtherThreads) {
-  BSS1_Lock lock, other;
-  for (BSS1_Lock* each : {&lock, &other}) ASSERT_EQ(BSS1_InitializeLock(each), 0);
-  ASSERT_EQ(BSS1_GetLock(&other), 0);  // the locks are independent
-  volatile int count = 0;
-  in_eight_threads([&](int) {
-    for (int i = 0; i < 500; ++i) {
-      ASSERT_EQ(BSS1_GetLock(&lock), 0);
-      const int before = count;
-      std::this_thread::yield();
-      count = before + 1;
-      ASSERT_EQ(BSS1_ReleaseLock(&lock), 0);
-    }
-  });
-  EXPECT_EQ(count, 8 * 500);
-  EXPECT_EQ(BSS1_ReleaseLock(&other), 0);
-  for (BSS1_Lock* each : {&lock, &other}) EXPECT_EQ(BSS1_DestroyLock(each), 0);
 }
 
 // ---- Once-only blocks
@@ -189,43 +170,41 @@ int role_end_order() {
   exit(0);
 }
 
-/// The main thread ends the process while another thread is in the middle of its termination.
-int role_end_waits() {
-  static std::atomic<bool> ending{false};
-  static const BSS1_ThreadBlock slow = BSS1_THREAD_BLOCK([](void*) { BSS1_ResolveProcess(&outer_block); },
-                                                         [](void*) {
-                                                           ending = true;
-                                                           std::this_thread::sleep_for(milliseconds(100));
-                                                           say("end slow thread\n");
-                                                         },
-                                                         1);
-  std::thread([] { BSS1_ResolveThread(&slow); }).detach();
-  while (!ending) std::this_thread::yield();
+void exit_with_3(void*) {
+  exit(3);
+}
+void say_half_made(void*) {
+  say("end half-made\n");
+}
+BSS1_ProcessBlock exiting_process = BSS1_PROCESS_BLOCK(exit_with_3, say_half_made, 1);
+const BSS1_ThreadBlock exiting_thread = BSS1_THREAD_BLOCK(exit_with_3, say_half_made, 1);
+const BSS1_ThreadBlock exiting_at_end = BSS1_THREAD_BLOCK(nullptr, exit_with_3, 1);
+
+/// In a thread that has another block, which has one of the process.
+int beside_others(void (*exits)()) {
+  std::thread([&] { BSS1_ResolveThread(&speaking_block), exits(); }).join();
   return 0;
 }
 
-int role_exit_in_process_init() {
-  static BSS1_ProcessBlock block =
-      BSS1_PROCESS_BLOCK([](void*) { exit(3); }, [](void*) { say("end half-made\n"); }, 1);
-  BSS1_ResolveThread(&speaking_block);
-  return BSS1_ResolveProcess(&block) != nullptr;
-}
+std::atomic<bool> slow_thread_ends{false};
+const BSS1_ThreadBlock slow_block = BSS1_THREAD_BLOCK([](void*) { BSS1_ResolveProcess(&outer_block); },
+                                                      [](void*) {
+                                                        slow_thread_ends = true;
+                                                        std::this_thread::sleep_for(milliseconds(100));
+                                                        say("end slow thread\n");
+                                                      },
+                                                      1);
 
-int role_exit_in_thread_init() {
-  static const BSS1_ThreadBlock block =
-      BSS1_THREAD_BLOCK([](void*) { exit(3); }, [](void*) { say("end half-made\n"); }, 1);
-  BSS1_ResolveThread(&speaking_block);
-  return BSS1_ResolveThread(&block) != nullptr;
-}
-
-int role_exit_in_thread_term() {
-  static const BSS1_ThreadBlock block = BSS1_THREAD_BLOCK(
-      nullptr, [](void*) { exit(3); }, 1);
-  std::thread([] { BSS1_ResolveThread(&speaking_block), BSS1_ResolveThread(&block); }).join();
+/// The main thread ends the process while another thread is in the middle of its termination.
+int role_end_waits() {
+  std::thread([] { BSS1_ResolveThread(&slow_block); }).detach();
+  while (!slow_thread_ends) std::this_thread::yield();
   return 0;
 }
 
 // ---- Environment and trace
+
+RAS1_Unit alpha = RAS1_UNIT("alpha");
 
 int role_environment() {
   const char* value = BSS1_GetEnv("LX_PROBE");
@@ -239,47 +218,43 @@ int role_environment() {
 
 /// Every kind of line, if the unit is traced; errno stays, even when the file cannot be opened.
 int role_lines() {
-  RAS1_Unit unit = RAS1_UNIT("alpha");
-  if (RAS1_Sync(&unit) == 0) return 0;
+  if (RAS1_Sync(&alpha) == 0) return 0;
   errno = 4711;
-  RAS1_Printf(&unit, 4, "%s", "");
-  RAS1_Event(&unit, 57, RAS1_EVENT_ENTRY, 99);
-  RAS1_Event(&unit, 58, RAS1_EVENT_EXIT_VALUE, 0);
-  RAS1_Event(&unit, 60, RAS1_EVENT_EXIT_VALUE, -1);
-  RAS1_Event(&unit, 61, RAS1_EVENT_EXIT, 99);
-  RAS1_Printf(&unit, 1, "Lexicor init count = %d", 3);
-  RAS1_Printf(&unit, 2, "Ends with a newline %s\n", "of its own");
-  RAS1_Printf(&unit, 3, "Path: %s\n file:\t%s\x7F", "a\\b", "\xC3\xA4");
-  RAS1_Dump(&unit, 70, "0123456789ABCDEF\x7F\x80~ \n", 21, "String1");
-  RAS1_Dump(&unit, 71, "x", 1, "Two\nlines");
-  RAS1_Dump(&unit, 72, "x", 0, "Empty");
-  RAS1_Dump(&unit, 73, nullptr, 5, "None");
+  RAS1_Printf(&alpha, 4, "%s", "");
+  RAS1_Event(&alpha, 57, RAS1_EVENT_ENTRY, 99);
+  RAS1_Event(&alpha, 58, RAS1_EVENT_EXIT_VALUE, 0);
+  RAS1_Event(&alpha, 60, RAS1_EVENT_EXIT_VALUE, -1);
+  RAS1_Event(&alpha, 61, RAS1_EVENT_EXIT, 99);
+  RAS1_Printf(&alpha, 1, "Lexicor init count = %d", 3);
+  RAS1_Printf(&alpha, 2, "Ends with a newline %s\n", "of its own");
+  RAS1_Printf(&alpha, 3, "Path: %s\n file:\t%s\x7F", "a\\b", "\xC3\xA4");
+  RAS1_Dump(&alpha, 70, "0123456789ABCDEF\x7F\x80~ \n", 21, "String1");
+  RAS1_Dump(&alpha, 71, "x", 1, "Two\nlines");
+  RAS1_Dump(&alpha, 72, "x", 0, "Empty");
+  RAS1_Dump(&alpha, 73, nullptr, 5, "None");
   return errno == 4711 ? 0 : 1;
 }
 
 int role_message() {
-  RAS1_Unit unit = RAS1_UNIT("alpha");
-  if (RAS1_Sync(&unit) == 0) return 0;
-  std::thread([&] { RAS1_Printf(&unit, 1, "one"); }).join();
-  RAS1_Printf(&unit, 2, "two");
+  if (RAS1_Sync(&alpha) == 0) return 0;
+  std::thread([&] { RAS1_Printf(&alpha, 1, "one"); }).join();
+  RAS1_Printf(&alpha, 2, "two");
   return 0;
 }
 
 int role_long_messages() {
-  RAS1_Unit unit = RAS1_UNIT("alpha");
-  RAS1_Sync(&unit);
+  RAS1_Sync(&alpha);
   for (size_t bytes = 1900; bytes < 2100; ++bytes)
-    RAS1_Printf(&unit, 1, "%s\n", std::string(bytes, 'x').c_str());
-  RAS1_Printf(&unit, 1, "%s", std::string(2000, '\n').c_str());  // grows when it is spelled out
+    RAS1_Printf(&alpha, 1, "%s\n", std::string(bytes, 'x').c_str());
+  RAS1_Printf(&alpha, 1, "%s", std::string(2000, '\n').c_str());  // grows when it is spelled out
   return 0;
 }
 
 int role_writers() {
-  RAS1_Unit unit = RAS1_UNIT("alpha");
-  RAS1_Sync(&unit);
+  RAS1_Sync(&alpha);
   in_eight_threads([&](int i) {
     const std::string text(static_cast<size_t>(100 + 50 * i), static_cast<char>('a' + i));
-    for (int k = 0; k < 100; ++k) RAS1_Printf(&unit, i, "%s", text.c_str());
+    for (int k = 0; k < 100; ++k) RAS1_Printf(&alpha, i, "%s", text.c_str());
   });
   return 0;
 }
@@ -302,9 +277,9 @@ const struct {
     {"environment", role_environment},
     {"end_order", role_end_order},
     {"end_waits", role_end_waits},
-    {"exit_in_process_init", role_exit_in_process_init},
-    {"exit_in_thread_init", role_exit_in_thread_init},
-    {"exit_in_thread_term", role_exit_in_thread_term},
+    {"exit_in_process_init", [] { return beside_others([] { BSS1_ResolveProcess(&exiting_process); }); }},
+    {"exit_in_thread_init", [] { return beside_others([] { BSS1_ResolveThread(&exiting_thread); }); }},
+    {"exit_in_thread_term", [] { return beside_others([] { BSS1_ResolveThread(&exiting_at_end); }); }},
     {"lines", role_lines},
     {"message", role_message},
     {"long_messages", role_long_messages},

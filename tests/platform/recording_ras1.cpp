@@ -22,7 +22,6 @@ void add(TraceRecord::Kind kind, const RAS1_Unit& unit, int line, TraceRecord re
   record.unit = unit.name;
   record.line = line;
   std::lock_guard<std::mutex> held(mutex);
-  record.level = current_level;
   records.push_back(std::move(record));
 }
 

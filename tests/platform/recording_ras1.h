@@ -14,7 +14,6 @@ struct TraceRecord {
   Kind kind;
   std::string unit;
   int line;
-  uint32_t level;              // the level that was set when the record was made
   intptr_t value;              // kExitValue
   std::string text;            // kMessage: as formatted; kDump: the label
   std::vector<uint8_t> bytes;  // kDump

@@ -1,14 +1,89 @@
-// An open conversion that is called with buffers of their exact sizes.
+// What conversion and mapping give: a character in the units of a form, as a small codepage has it; a model of an
+// output of any size; and an open conversion that is called with buffers of their exact sizes.
 #pragma once
 
 #include <gtest/gtest.h>
 
 #include <string>
+#include <type_traits>
 #include <vector>
 
 #include "lx.h"
+#include "support/forms.h"
+#include "support/tiny_codepages.h"
 
 namespace lx::test {
+
+/// A character of a codepage, or its substitution byte.
+template <class F>
+std::vector<typename F::Unit> units_of(const TinyCodepage& cp, LXUChar u) {
+  if constexpr (std::is_same_v<F, Unicode>) {
+    return {u};
+  } else if constexpr (std::is_same_v<F, Wide>) {
+    LXWChar code = 0;
+    for (char byte : cp.encode({u})) code = code << 8 | static_cast<uint8_t>(byte);
+    return {code};
+  } else {
+    const std::string bytes = cp.encode({u});
+    return {bytes.begin(), bytes.end()};
+  }
+}
+template <class F>
+std::vector<typename F::Unit> units_of(const TinyCodepage& cp, const Units& text) {
+  std::vector<typename F::Unit> all;
+  for (LXUChar u : text)
+    for (auto unit : units_of<F>(cp, u)) all.push_back(unit);
+  return all;
+}
+
+/// What a conversion should give: pieces of output, one a character, in order.
+template <class Unit>
+struct OutputModel {
+  std::vector<std::vector<Unit>> pieces;
+  bool cut = false;              // the input ends inside a character
+  bool null_terminated = false;  // the length is given as -1
+  bool null_converted = false;   // ... and its null is one of the characters
+
+  std::vector<Unit> output(int32_t size, int32_t flags, int32_t* result) const {
+    std::vector<Unit> out;
+    *result = 0;
+    const bool terminate = (flags & LX_TERMINATE) != 0;
+    if (size <= 0 || (pieces.empty() && !cut && !null_terminated && !terminate)) return out;
+    const bool chars = (flags & LX_CHARACTERS) != 0 && sizeof(Unit) == 1;
+    const size_t limit = static_cast<size_t>(size) - terminate;
+    size_t used = 0, taken = 0;
+    for (const auto& piece : pieces) {
+      const size_t grown = used + (chars ? 1 : piece.size());
+      if (grown > limit) break;
+      used = grown;
+      ++taken;
+      out.insert(out.end(), piece.begin(), piece.end());
+    }
+    const bool all = taken == pieces.size() && !cut;
+    if (terminate || (!null_converted && null_terminated && all && used < limit)) {
+      out.push_back(0);
+      ++used;
+    }
+    *result = static_cast<int32_t>(used);
+    return out;
+  }
+};
+
+/// Calls a conversion for every size up to two more than it can use, and compares result, output and canaries.
+template <class Unit, class Call>
+void expect_at_every_size(const OutputModel<Unit>& model, int32_t flags, const Call& convert) {
+  size_t needed = 1;
+  for (const auto& piece : model.pieces) needed += piece.size();
+  const Unit canary = static_cast<Unit>(0xA5A5A5A5);
+  for (int32_t size = 0; size <= static_cast<int32_t>(needed) + 2; ++size) {
+    int32_t result = 0;
+    std::vector<Unit> expected = model.output(size, flags, &result);
+    std::vector<Unit> output(needed + 4, canary);
+    expected.resize(output.size(), canary);
+    EXPECT_EQ(convert(output.data(), size, flags), result) << "size " << size << " flags " << flags;
+    EXPECT_EQ(output, expected) << "size " << size << " flags " << flags;
+  }
+}
 
 class Conversion {
  public:

@@ -12,12 +12,6 @@ void Hooks::fail_at(size_t call, bool from_then_on) {
   largest_ = 0;
 }
 
-size_t Hooks::live_bytes() const {
-  size_t bytes = 0;
-  for (const auto& [block, size] : live_) bytes += size;
-  return bytes;
-}
-
 void* Hooks::allocate(void* context, size_t bytes) {
   Hooks& self = *static_cast<Hooks*>(context);
   const std::lock_guard<std::mutex> lock(self.mutex_);

@@ -19,7 +19,6 @@ class Hooks {
 
   size_t calls() const { return calls_; }              // allocations asked for
   size_t live_blocks() const { return live_.size(); }  // not yet freed
-  size_t live_bytes() const;
   size_t wrong_frees() const { return wrong_frees_; }  // of blocks that were not out
   bool failed() const { return failed_; }              // whether an allocation was refused
   size_t largest() const { return largest_; }          // most bytes asked for at once since fail_at()

@@ -6,6 +6,7 @@
 #include <string>
 #include <vector>
 
+#include "codepage_model.h"
 #include "core/lxrecords.h"
 #include "support/hooks.h"
 #include "support/object_files.h"
@@ -25,11 +26,11 @@ struct TinyCodepage {
   bool shift;  // shift-sensitive, with `shift_out` and `shift_in`
   char shift_out, shift_in;
   uint8_t substitution;
-  std::vector<uint8_t> lengths;           // by first byte
   std::vector<TinyCharacter> characters;  // mapped both ways, by packed code
 
   /// The bytes of a text; in a shift-sensitive codepage with the shift bytes that it needs from `*state` on,
-  /// which is left as the text leaves it.
+  /// which is left as the text leaves it. UTF-8 is computed; elsewhere the substitution byte stands for what is
+  /// not mapped.
   std::string encode(const std::vector<uint16_t>& text, LXShiftState* state = nullptr) const;
   const TinyCharacter* find(uint16_t unicode) const;
 };
@@ -43,23 +44,24 @@ class CodepageBuilder {
   CodepageBuilder& lead(uint8_t first, uint8_t last, uint8_t length);
   /// `count` characters from this packed code and this Unicode value on, both ways.
   CodepageBuilder& map(uint32_t code, uint16_t unicode, unsigned count = 1);
-  CodepageBuilder& ascii() { return map(0, 0, 0x80); }
-  CodepageBuilder& shift(uint8_t out, uint8_t in) {
-    return shift_out_ = out, shift_in_ = in, shift_ = true, *this;
+  struct Range {
+    uint32_t code;
+    uint16_t unicode;
+    unsigned count = 1;
+  };
+  CodepageBuilder& map(const std::vector<Range>& ranges) {
+    for (const Range& range : ranges) map(range.code, range.unicode, range.count);
+    return *this;
   }
-  CodepageBuilder& substitution(uint8_t byte) { return substitution_ = byte, *this; }
+  CodepageBuilder& ascii() { return map(0, 0, 0x80); }
+  CodepageBuilder& shift(uint8_t out, uint8_t in);
+  CodepageBuilder& substitution(uint8_t byte) { return model_.header.substitution = byte, *this; }
   TinyCodepage build() const;
 
  private:
   uint16_t id_;
-  std::string name_;
-  uint8_t width_;
-  uint8_t substitution_ = '?';
   uint8_t shift_out_ = 0, shift_in_ = 0;
-  bool shift_ = false;
-  std::vector<uint8_t> lengths_;
-  std::map<uint32_t, uint16_t> to_unicode_;
-  std::map<uint16_t, uint32_t> to_code_;
+  lexicor_data::CodepageModel model_;
 };
 
 /// ASCII and U+00A0 to U+00FF, with the euro sign in place of U+00A4.

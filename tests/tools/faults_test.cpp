@@ -1,8 +1,7 @@
 // Faults of sources: each file of tests/cases/faults is a sound source. Below a line stand bad ones that take
 // its place, and what is said of the source then:
 //   #! TEXT       a line in place of the one above; several, or none at all
-//   #= C: TEXT    how the message begins: the column in the line replaced, and what is wrong. The place may
-//   also be
+//   #= C: TEXT    how the message begins: the column in the line replaced, and what is wrong. The place may be
 //                 +N:C for N lines below, or begin with the word file. "accepted": nothing is wrong
 //   #. C: TEXT    the same of a source that ends there, without a line end
 //   ## TEXT       a comment on what follows
