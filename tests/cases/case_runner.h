@@ -135,5 +135,6 @@ Families compare_families();
 Families convert_families();
 Families walk_families();
 Families format_families();
+Families stream_families();
 
 }  // namespace lx::test

@@ -28,7 +28,8 @@ namespace {
 const Families& families() {
   static const Families all = [] {
     Families made = string_families();
-    for (Families more : {compare_families(), convert_families(), walk_families(), format_families()})
+    for (Families more :
+         {compare_families(), convert_families(), walk_families(), format_families(), stream_families()})
       made.merge(more);
     return made;
   }();

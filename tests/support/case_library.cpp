@@ -127,6 +127,10 @@ void set_cases(const TinyCodepage& cp, LXLocale* in) {
 
 }  // namespace
 
+Units line_ends(const TinyCodepage& cp) {
+  return cp.shift ? Units{0x0A, 2, 3, 1} : Units{0x0A, 0x0D, 0x0B, 0x0C};
+}
+
 const std::vector<TinyCodepage>& case_codepages() {
   static const std::vector<TinyCodepage> all = [] {
     std::vector<TinyCodepage> made{tiny_single(),
@@ -140,6 +144,9 @@ const std::vector<TinyCodepage>& case_codepages() {
     for (const auto& [place, name] : {std::pair(0, "SINGLE"), {2, "EUC"}, {3, "FOUR"}})
       made[static_cast<size_t>(place)].file.name = name;
     add_pair(&made.back(), 0x8141, '!');
+    for (TinyCodepage& cp : made)
+      for (size_t i = 0; i < 4; ++i)
+        cp.file.sections[0][fmt::kLineEnds + i] = static_cast<uint8_t>(cp.find(line_ends(cp)[i])->code);
     return made;
   }();
   return all;

@@ -6,6 +6,7 @@
 #include <string>
 #include <vector>
 
+#include "support/forms.h"
 #include "support/hooks.h"
 #include "support/object_files.h"
 #include "support/sort_builder.h"
@@ -17,6 +18,9 @@ namespace lx::test {
 /// SJIS where "!" has a "half-width" form of two bytes.
 const std::vector<TinyCodepage>& case_codepages();
 const TinyCodepage& case_codepage(const std::string& name);
+
+/// The line feed, the carriage return and the two further line ends of one of these codepages.
+Units line_ends(const TinyCodepage& cp);
 
 struct SpecialMapping {
   uint16_t first, second, result1, result2;  // second and result2 0 for none

@@ -50,7 +50,10 @@ inline ShiftStates states;
   static constexpr auto read_long = LXStringToLong##FORM;        \
   static constexpr auto read_double = LXStringToDouble##FORM;    \
   static constexpr auto write_time = LXTimeToString##FORM;       \
-  static constexpr auto read_time = LXStringToTime##FORM
+  static constexpr auto read_time = LXStringToTime##FORM;        \
+  static constexpr auto read_string = LXReadString##FORM;        \
+  static constexpr auto get_eol = LXGetEol##FORM;                \
+  static constexpr auto put_eol = LXPutEol##FORM
 
 struct Plain {
   LX_TEST_FORM("plain", char, LXWChar, LXStr, , );
@@ -158,6 +161,9 @@ struct Ex {
                            uint32_t f) {
     return LXStringToTimeEx(in, time, t, states.text, n, by, states.second, m, f);
   }
+  static constexpr auto read_string = LXReadStringEx;
+  static constexpr auto get_eol = LXGetEolEx;
+  static constexpr auto put_eol = LXPutEolEx;
   static int32_t truncate(In in, char* t, int32_t size, uint32_t f) {
     return LXTruncateStringEx(in, t, states.text, size, f);
   }
