@@ -136,5 +136,6 @@ Families convert_families();
 Families walk_families();
 Families format_families();
 Families stream_families();
+Families item_families();
 
 }  // namespace lx::test

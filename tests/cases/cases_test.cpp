@@ -28,8 +28,8 @@ namespace {
 const Families& families() {
   static const Families all = [] {
     Families made = string_families();
-    for (Families more :
-         {compare_families(), convert_families(), walk_families(), format_families(), stream_families()})
+    for (Families more : {compare_families(), convert_families(), walk_families(), format_families(),
+                          stream_families(), item_families()})
       made.merge(more);
     return made;
   }();
@@ -49,7 +49,7 @@ class CaseLocale {
  public:
   CaseLocale(CaseLibrary& library, const Case& c, const TinyCodepage& cp) {
     std::string language = "English", sort;
-    bool changed = false;
+    bool changed = c.family == "items";  // which sets them
     for (const CaseWords& with : c.with)
       for (const CaseWords::Word& w : with.all)
         if (w.name == "language" || w.name == "sort")

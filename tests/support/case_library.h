@@ -37,7 +37,8 @@ TestWeight special(uint16_t weight);
 SortBuilder example_sort();
 
 /// Languages: English; Special; Kana, whose names begin with kana; Long, whose days run together besides, and
-/// which says AM in the afternoon. The sort is called Test.
+/// which says AM in the afternoon. The territory Elsewhere, 276, has other separators, one of which is no ASCII,
+/// and a kana for a currency. The sort is called Test.
 class CaseLibrary {
  public:
   explicit CaseLibrary(const SortBuilder& sort = example_sort());

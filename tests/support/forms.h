@@ -51,6 +51,8 @@ inline ShiftStates states;
   static constexpr auto read_double = LXStringToDouble##FORM;    \
   static constexpr auto write_time = LXTimeToString##FORM;       \
   static constexpr auto read_time = LXStringToTime##FORM;        \
+  static constexpr auto set_item = LXSetLocaleTextInfo##FORM;    \
+  static constexpr auto get_item = LXGetLocaleTextInfo##FORM;    \
   static constexpr auto read_string = LXReadString##FORM;        \
   static constexpr auto get_eol = LXGetEol##FORM;                \
   static constexpr auto put_eol = LXPutEol##FORM
@@ -160,6 +162,12 @@ struct Ex {
   static int32_t read_time(In in, LXTime* time, const char* t, int32_t n, const char* by, int32_t m,
                            uint32_t f) {
     return LXStringToTimeEx(in, time, t, states.text, n, by, states.second, m, f);
+  }
+  static int32_t set_item(In in, int32_t item, const char* t, int32_t n, int32_t f) {
+    return LXSetLocaleTextInfoEx(in, item, t, states.text, n, f);
+  }
+  static int32_t get_item(In in, int32_t item, char* to, int32_t size, int32_t f) {
+    return LXGetLocaleTextInfoEx(in, item, to, states.output, size, f);
   }
   static constexpr auto read_string = LXReadStringEx;
   static constexpr auto get_eol = LXGetEolEx;
