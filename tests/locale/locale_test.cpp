@@ -104,6 +104,14 @@ TEST_F(LocaleTest, Names) {
   }
 }
 
+// A default that exists only as an object of another type, next to the empty range, is not found.
+TEST_F(LocaleTest, AnObjectOfAnotherTypeIsNotFound) {
+  directory.write("la_00007.nls", language(7, 367, 0));
+  directory.write("control.nls", control_file({{7, LX_LANGUAGE, "English"}, {367, LX_CODEPAGE, "US-ASCII"}}));
+  ASSERT_EQ(init(), LX_OK);
+  EXPECT_EQ(LXSetLocale("English", LX_FALLBACK), LX_E_NO_TERRITORY);
+}
+
 TEST_F(LocaleTest, OtherCodesOfLookUps) {
   write_directory();
   for (const char* file : {"te_00250.nls", "cp_00850.nls", "so_00005.nls"}) {

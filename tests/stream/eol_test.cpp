@@ -1,20 +1,16 @@
 // Line ends in strings: the four forms against one model, and the order in which they are stored.
-#include <gtest/gtest.h>
-
 #include "stream/line_texts.h"
 
 namespace lx::test {
 namespace {
 
-class LineEnds : public testing::Test {
+class LineEnds : public CaseTest {
  protected:
-  void TearDown() override { EXPECT_TRUE(library_.close()); }
-
   /// Looks for line ends in the text, in a block of its exact size and with `behind` after it: by its length in
   /// units and in characters and, without a null in it and nothing behind, null-terminated.
   template <class F>
   void check(const TinyCodepage& cp, const Units& text, const Units& behind, uint32_t kinds) {
-    LXLocale* locale = library_.locale(cp);
+    LXLocale* locale = library.locale(cp);
     const FoundEol model = find_eol(line_ends(cp), text, 0, kinds != 0 ? kinds : LX_EOL_LF);
     const Encoded<F> before(cp, text.substr(0, model.past)), whole(cp, text);
     auto units = whole.units;
@@ -37,21 +33,16 @@ class LineEnds : public testing::Test {
       EXPECT_EQ(end, model.kind == LX_EOL_NONE ? nullptr : units.data() + before.size());
     }
   }
-
-  CaseLibrary library_;
-  std::mt19937 random_{30};
 };
 
 TEST_F(LineEnds, FoundAlikeInAllForms) {
   for (const TinyCodepage& cp : case_codepages()) {
     SCOPED_TRACE(cp.file.name);
     for (int round = 0; round < 300; ++round) {
-      const Units text = random_text(cp, random_, 9), behind = random_text(cp, random_, 1 + round % 3);
-      const uint32_t kinds = (random_() % 16) << 8;
+      const Units text = random_text(cp, random, 9), behind = random_text(cp, random, 1 + round % 3);
+      const uint32_t kinds = (random() % 16) << 8;
       SCOPED_TRACE(kinds);
-      in_all_forms([&](const auto& form) {
-        if (form.name != kPlain.name || !cp.shift) check<std::decay_t<decltype(form)>>(cp, text, behind, kinds);
-      });
+      forms_of(cp, [&](const auto& form) { check<std::decay_t<decltype(form)>>(cp, text, behind, kinds); });
     }
   }
 }
@@ -71,7 +62,7 @@ TEST_F(LineEnds, Stored) {
         using F = std::decay_t<decltype(form)>;
         const auto expected = Encoded<F>(cp, text).units;
         std::vector<typename F::Unit> out(expected.size());
-        EXPECT_EQ(F::put_eol(library_.locale(cp), out.data(), flags), out.data() + out.size());
+        EXPECT_EQ(F::put_eol(library.locale(cp), out.data(), flags), out.data() + out.size());
         EXPECT_EQ(out, expected);
       });
     }

@@ -1,10 +1,7 @@
 // Random texts full of line ends of every kind, and a model of line ends that works on characters.
 #pragma once
 
-#include <random>
-
-#include "support/case_library.h"
-#include "support/encoded_text.h"
+#include "support/case_test.h"
 
 namespace lx::test {
 
