@@ -121,16 +121,11 @@ class Library16 : public Peer {
   }
 
   uint32_t to_unicode(const std::string& text) override {
-    LXUChar units[8];
-    const int32_t n = LXStringToUnicodeEx(units, 8, locale_.get(), text.data(), LX_SHIFT_SINGLE,
-                                          static_cast<int32_t>(text.size()), 0);
-    return n == 1 && units[0] != 0xFFFD ? units[0] : kNone;
+    const Units units = test::to_unicode(locale_.get(), text);
+    return units.size() == 1 && units[0] != 0xFFFD ? units[0] : kNone;
   }
   std::string from_unicode(uint16_t u) override {
-    char bytes[16];
-    const int32_t n =
-        LXUnicodeToStringEx(locale_.get(), bytes, LX_SHIFT_SINGLE, sizeof(bytes), &u, 1, LX_TERMINATE);
-    std::string text(bytes, static_cast<size_t>(n) - 1);
+    const std::string text = test::from_unicode(locale_.get(), {u});
     return text == substitution_ && substitutes_for_.count(u) == 0 ? std::string() : text;
   }
 

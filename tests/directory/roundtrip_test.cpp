@@ -5,56 +5,26 @@
 
 #include <map>
 #include <random>
-#include <string>
-#include <vector>
 
 #include "directory/directory_codepages.h"
+#include "support/conversion.h"
 #include "support/library.h"
 
 namespace lx::test {
 namespace {
 
-using Units = std::vector<LXUChar>;
-
-Units to_unicode(LXLocale* locale, const std::string& bytes) {
-  Units units(bytes.size() + 1);
-  const int32_t n = LXStringToUnicodeEx(units.data(), static_cast<int32_t>(units.size()), locale, bytes.data(),
-                                        LX_SHIFT_SINGLE, static_cast<int32_t>(bytes.size()), 0);
-  units.resize(n > 0 ? static_cast<size_t>(n) : 0);
-  return units;
-}
-
-std::string from_unicode(LXLocale* locale, const Units& units) {
-  std::string bytes(units.size() * 5 + 2, '\0');
-  const int32_t n =
-      LXUnicodeToStringEx(locale, bytes.data(), LX_SHIFT_SINGLE, static_cast<int32_t>(bytes.size()),
-                          units.data(), static_cast<int32_t>(units.size()), LX_TERMINATE);
-  bytes.resize(n > 0 ? static_cast<size_t>(n) - 1 : 0);
-  return bytes;
-}
-
 /// Through a conversion handle, in pieces that cut characters everywhere.
 std::string stream(LXLocale* target, LXLocale* source, const std::string& text) {
-  LXConversion* conversion = LXOpenConversion(target, source);
+  Conversion conversion(target, source);
   std::string result;
-  const char* in = text.data();
-  size_t left = text.size();
-  int32_t piece_left = 0;
-  for (size_t piece = 1;; piece = piece % 97 + 1) {
-    char buffer[61];
-    char* out = buffer;
-    int32_t out_left = sizeof(buffer);
-    if (piece_left == 0) piece_left = static_cast<int32_t>(left < piece ? left : piece);
-    left -= static_cast<size_t>(piece_left);
-    const int32_t rc = LXConvertBuffer(conversion, &out, &out_left, &in, &piece_left);
-    left += static_cast<size_t>(piece_left);
-    result.append(buffer, out);
-    if (rc == LX_OK && left == 0) break;
-    if (rc != LX_OK && rc != LX_E_OUTPUT_FULL && rc != LX_E_INPUT_CUT) return "code " + std::to_string(rc);
-    if (rc == LX_E_INPUT_CUT && left == 0) return "cut";
-    if (rc == LX_OK) piece_left = 0;
+  Conversion::Step step{LX_OK, "", 0};
+  for (size_t at = 0, piece = 1; at < text.size() || step.code == LX_E_OUTPUT_FULL; piece = piece % 97 + 1) {
+    step = conversion.call(text.substr(at, piece), 61);
+    at += step.taken;
+    result += step.output;
+    if (step.code != LX_OK && step.code != LX_E_OUTPUT_FULL && step.code != LX_E_INPUT_CUT) break;
   }
-  EXPECT_EQ(LXCloseConversion(conversion), LX_OK);
+  EXPECT_EQ(step.code, LX_OK);
   return result;
 }
 
@@ -130,29 +100,19 @@ TEST_P(EveryCodepage, LongTextsConvertAsTheirCharacters) {
     for (LXUChar& unit : units)
       if (random() % 5 != 0) unit = static_cast<LXUChar>(random() % (round % 4 == 1 ? 0x600 : 0x10000));
 
-    Units whole(bytes.size()), parts;
-    const auto size = static_cast<int32_t>(bytes.size());
-    whole.resize(
-        static_cast<size_t>(LXStringToUnicode(whole.data(), size, locale.get(), bytes.data(), size, 0)));
-    for (const char *p = bytes.data(), *end = p + bytes.size(); p < end;) {
-      const int32_t length = LXByteLength(locale.get(), p);
-      LXUChar unit = 0;
-      if (length > end - p || LXStringToUnicode(&unit, 1, locale.get(), p, length, 0) != 1) break;
-      parts.push_back(unit);
-      p += length;
+    Units parts;
+    for (size_t at = 0; at < bytes.size();) {
+      const size_t length = static_cast<size_t>(LXByteLength(locale.get(), &bytes[at]));
+      const Units unit = decode(kPlain, locale.get(), bytes.substr(at, length));
+      if (at + length > bytes.size() || unit.size() != 1) break;
+      parts += unit;
+      at += length;
     }
-    ASSERT_EQ(whole, parts);
+    ASSERT_EQ(decode(kPlain, locale.get(), bytes), parts);
 
-    const auto plain = [&](const Units& text) {
-      std::string out(text.size() * 4, '\0');
-      const auto count = static_cast<int32_t>(text.size());
-      out.resize(
-          static_cast<size_t>(LXUnicodeToString(locale.get(), out.data(), 4 * count, text.data(), count, 0)));
-      return out;
-    };
     std::string joined;
-    for (LXUChar unit : units) joined += plain({unit});
-    ASSERT_EQ(plain(units), joined);
+    for (LXUChar unit : units) joined += encode(kPlain, locale.get(), {unit});
+    ASSERT_EQ(encode(kPlain, locale.get(), units), joined);
   }
 }
 

@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <cstdio>
 #include <ctime>
+#include <memory>
 #include <string>
 #include <utility>
 #include <vector>
@@ -215,19 +216,22 @@ inline Units units(const std::string& ascii) {
 }
 /// What `put(buffer, room)` writes.
 template <class Unit, class Put>
-Text<Unit> made(Put put) {
-  Unit buffer[4000];
-  return Text<Unit>(buffer, static_cast<size_t>(std::max(put(buffer, 4000), 0)));
+Text<Unit> made(Put put, size_t room = 1000) {
+  const std::unique_ptr<Unit[]> buffer(new Unit[room]);
+  const int32_t units = put(buffer.get(), static_cast<int32_t>(room));
+  return Text<Unit>(buffer.get(), static_cast<size_t>(std::max(units, 0)));
 }
 template <class F>
 Text<typename F::Unit> encode(const F& form, LXLocale* l, const Units& text) {
   return made<typename F::Unit>(
-      [&](auto* to, int32_t size) { return form.encode(l, to, size, text.data(), count_of(text), 0); });
+      [&](auto* to, int32_t size) { return form.encode(l, to, size, text.data(), count_of(text), 0); },
+      6 * text.size());
 }
 template <class F>
 Units decode(const F& form, LXLocale* l, const Text<typename F::Unit>& text) {
   return made<LXUChar>(
-      [&](LXUChar* to, int32_t size) { return form.decode(to, size, l, text.data(), count_of(text), 0); });
+      [&](LXUChar* to, int32_t size) { return form.decode(to, size, l, text.data(), count_of(text), 0); },
+      text.size());
 }
 /// A text for a message.
 inline std::string shown(const Units& text) {
