@@ -1,7 +1,6 @@
 // The codepages of the shipped directory as their sources say, for tests that compare the library with them.
 #pragma once
 
-#include <set>
 #include <string>
 #include <vector>
 
@@ -13,7 +12,6 @@ namespace lx::test {
 struct ShippedCodepage {
   uint16_t id;
   lexicor_data::CodepageSource source;
-  std::set<uint32_t> left_out;  ///< 16-bit Unicode values whose mappings the object has no room for
 
   bool shift() const { return source.kind == lexicor_data::CodepageClass::kShiftStateful; }
 };
