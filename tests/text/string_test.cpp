@@ -154,52 +154,6 @@ TEST_F(Strings, TokensComeOutWhole) {
   });
 }
 
-TEST_F(Strings, TruncationFollowsTheModel) {
-  for (const TinyCodepage& cp : case_codepages()) {
-    LXLocale* const in = library.locale(cp);
-    const auto code_of = [&](LXUChar u) { return cp.find(u) != nullptr ? cp.find(u)->code : 0xFFFF; };
-    const uint32_t blank = code_of(' '), full_blank = code_of(0x3000);
-    Units letters = alphabet(cp).substr(0, 5);
-    if (blank != 0xFFFF) letters += Units(2, ' ');
-    if (full_blank != 0xFFFF) letters += Units(2, 0x3000);
-    for (int n = 0; n < 600 && !HasFailure(); ++n) {
-      const uint32_t flags[] = {0, LX_DROP_BLANKS, LX_DROP_FULL_BLANKS};
-      const Encoded<Ex> text(cp, any_text(letters, 8));
-      const auto is_blank = [&](size_t i) {
-        return (n % 3 != 0 && text.codes[i] == blank) || (n % 3 == 2 && text.codes[i] == full_blank);
-      };
-      for (int32_t size = -1; size <= text.size() + 2; ++size) {
-        const size_t room = std::min(static_cast<size_t>(std::max(size, 1) - 1), text.units.size());
-        // The last place behind a character or a shift byte.
-        size_t cut = 0, kept = text.whole(room);
-        for (const size_t end : text.end) cut = end <= room ? std::max(cut, end) : cut;
-        for (const size_t shift : text.shifts) cut = shift < room ? std::max(cut, shift + 1) : cut;
-        // Kept as it is: one character at the end does not save the blanks before it, nor itself.
-        const bool last = kept > 1 && text.codes[kept - 1] <= 0xFF && text.units.size() == text.end[kept - 1];
-        if (cp.width > 1 && last && !is_blank(kept - 1) && is_blank(kept - 2)) --kept;
-        while (kept > 0 && is_blank(kept - 1)) cut = text.start[--kept];
-        for (const bool ex : {true, false}) {
-          if (!ex && cp.shift) continue;
-          std::vector<char> buffer = text.terminated(), expected = buffer;
-          expected[cut] = 0;
-          const int32_t result = ex ? LXTruncateStringEx(in, buffer.data(), 0, size, flags[n % 3])
-                                    : LXTruncateString(in, buffer.data(), size, flags[n % 3]);
-          ASSERT_EQ(result, n32(cut) + 1)
-              << cp.file.name << testing::PrintToString(text.units) << " size " << size << " flags " << n % 3;
-          ASSERT_EQ(buffer, expected);
-        }
-      }
-      // In characters, the null one of them.
-      for (int32_t size = 0; n % 3 == 0 && !cp.shift && size <= n32(text.count()) + 2; ++size) {
-        std::vector<char> buffer = text.terminated();
-        const int32_t left = std::max(1, std::min(size, n32(text.count()) + 1));
-        ASSERT_EQ(LXTruncateString(in, buffer.data(), size, LX_CHARACTERS), left);
-        ASSERT_EQ(LXNumChars(in, buffer.data(), -1), left - 1);
-      }
-    }
-  }
-}
-
 /// Two texts joined, a Shift-In and a Shift-Out side by side: what is left is counted as it is taken.
 TEST_F(Strings, TokensOfJoinedTexts) {
   LXLocale* const shift = library.locale(case_codepage("SHIFT"));
