@@ -277,6 +277,9 @@ TEST_F(CollateTest, BadSorts) {
     bad[field] = bad[field + 1] = 0xFF;
     EXPECT_EQ(refused(bad), field != 8 + 4 * 0x4E) << field << ": any base of a computed page will do";
   }
+  ByteString end_outside = good;
+  put_le16(&end_outside[8], 600);  // of the first page, whose weights begin inside
+  EXPECT_TRUE(refused(end_outside));
   for (size_t bytes = 0; bytes < good.size(); bytes += 97)
     EXPECT_TRUE(refused({good.begin(), good.begin() + static_cast<ptrdiff_t>(bytes)})) << bytes;
 }
