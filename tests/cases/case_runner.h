@@ -135,5 +135,7 @@ Families compare_families();
 Families convert_families();
 Families walk_families();
 Families format_families();
+Families stream_families();
+Families item_families();
 
 }  // namespace lx::test

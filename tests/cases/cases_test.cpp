@@ -28,7 +28,8 @@ namespace {
 const Families& families() {
   static const Families all = [] {
     Families made = string_families();
-    for (Families more : {compare_families(), convert_families(), walk_families(), format_families()})
+    for (Families more : {compare_families(), convert_families(), walk_families(), format_families(),
+                          stream_families(), item_families()})
       made.merge(more);
     return made;
   }();
@@ -48,7 +49,7 @@ class CaseLocale {
  public:
   CaseLocale(CaseLibrary& library, const Case& c, const TinyCodepage& cp) {
     std::string language = "English", sort;
-    bool changed = false;
+    bool changed = c.family == "items";  // which sets them
     for (const CaseWords& with : c.with)
       for (const CaseWords::Word& w : with.all)
         if (w.name == "language" || w.name == "sort")
@@ -75,7 +76,11 @@ class CaseLocale {
                                                        {"currency-digits", LX_ITEM_CURRENCY_DIGITS},
                                                        {"positive-sign", LX_ITEM_POSITIVE_SIGN},
                                                        {"negative-sign", LX_ITEM_NEGATIVE_SIGN},
+                                                       {"positive-space", LX_ITEM_POSITIVE_SPACE},
+                                                       {"positive-precedes", LX_ITEM_POSITIVE_PRECEDES},
+                                                       {"positive-position", LX_ITEM_POSITIVE_POSITION},
                                                        {"negative-space", LX_ITEM_NEGATIVE_SPACE},
+                                                       {"negative-precedes", LX_ITEM_NEGATIVE_PRECEDES},
                                                        {"negative-position", LX_ITEM_NEGATIVE_POSITION},
                                                        {"time-format", LX_ITEM_TIME_FORMAT},
                                                        {"short-date", LX_ITEM_SHORT_DATE_FORMAT},

@@ -1,13 +1,10 @@
 // The library on tiny codepages, catalogs written to a scratch directory, and messages as strings.
 #pragma once
 
-#include <gtest/gtest.h>
-
 #include <cstdlib>
 #include <memory>
-#include <string>
 
-#include "lx.h"
+#include "core/library_fixture.h"
 #include "support/catalog_builder.h"
 #include "support/tiny_codepages.h"
 
@@ -20,7 +17,7 @@ using CatalogPtr = std::unique_ptr<LXCatalog, CatalogCloser>;
 
 inline constexpr uint32_t kModes[] = {0, LX_CATALOG_LOAD};
 
-class CatalogTest : public ::testing::Test {
+class CatalogTest : public LibraryTest {
  protected:
   void SetUp() override {
     unsetenv("LX_NLSPATH");
@@ -28,19 +25,16 @@ class CatalogTest : public ::testing::Test {
     library.locale(tiny_shift_jis());
     LXReleaseLocale(LXGetLocale("", LX_FALLBACK, nullptr));
   }
-  void TearDown() override {
-    unsetenv("LX_NLSPATH");
-    EXPECT_TRUE(library.close());
-  }
+  void TearDown() override { EXPECT_TRUE(library.close()); }
 
   LXLocale* single() { return library.locale(tiny_single()); }
 
   /// Opens the catalog that was written last, or writes one.
   CatalogPtr open(uint32_t flags) {
-    return CatalogPtr(LXOpenCatalog(single(), nullptr, files.file("catalog").c_str(), flags));
+    return CatalogPtr(LXOpenCatalog(single(), nullptr, directory.file("catalog").c_str(), flags));
   }
   CatalogPtr open(const ByteString& file, uint32_t flags) {
-    files.write("catalog", file);
+    directory.write("catalog", file);
     return open(flags);
   }
 
@@ -53,7 +47,6 @@ class CatalogTest : public ::testing::Test {
   }
 
   TinyLibrary library;
-  ScratchDirectory files;
 };
 
 }  // namespace lx::test

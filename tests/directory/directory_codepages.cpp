@@ -2,22 +2,13 @@
 
 #include <fstream>
 
-#include "codepage_pack.h"
 #include "compile.h"
 
 namespace lx::test {
 namespace {
 
-ShippedCodepage read_codepage(uint16_t id, const std::string& name) {
-  const std::string file = std::string(LEXICOR_DATA_DIR) + "/codepages/" + name + ".ucm";
-  std::ifstream in(file);
-  ShippedCodepage codepage{id, lexicor_data::read_ucm(in, file), {}};
-  if (codepage.source.utf8) return codepage;
-  std::vector<lexicor_data::LeftOut> left_out;
-  lexicor_data::pack_codepage(lexicor_data::to_model(codepage.source, file, left_out), file, left_out);
-  for (const lexicor_data::LeftOut& character : left_out)
-    if (character.mapping.unicode <= 0xFFFF) codepage.left_out.insert(character.mapping.unicode);
-  return codepage;
+std::string file_of(const std::string& name) {
+  return std::string(LEXICOR_DATA_DIR) + "/codepages/" + name + ".ucm";
 }
 
 }  // namespace
@@ -26,8 +17,10 @@ const std::vector<ShippedCodepage>& shipped_codepages() {
   static const std::vector<ShippedCodepage> codepages = [] {
     std::vector<ShippedCodepage> all;
     for (const lexicor_data::ObjectName& object : lexicor_data::read_source_control(LEXICOR_DATA_DIR).objects)
-      if (object.type == lexicor_data::ObjectType::kCodepage)
-        all.push_back(read_codepage(object.id, object.name));
+      if (object.type == lexicor_data::ObjectType::kCodepage) {
+        std::ifstream in(file_of(object.name));
+        all.push_back({object.id, lexicor_data::read_ucm(in, file_of(object.name))});
+      }
     return all;
   }();
   return codepages;

@@ -67,7 +67,6 @@ struct Place {
 };
 
 struct RoundTrip {
-  static constexpr LXTime kUntouched{-1, -2, -3, -4, -5, -6, -7, -8};
   ListedDifferences differences;
   size_t trips = 0, cases = 0;
 
@@ -96,7 +95,7 @@ struct RoundTrip {
 
   template <class F>
   void time(const F& form, const Place& place, const LXTime& t, const std::string& ascii_format,
-            const Units& whole, const LXTime& carried) {
+            const Units& whole) {
     LXLocale* const l = place.get();
     ++trips;
     const auto format = encode(form, l, units(ascii_format));
@@ -109,11 +108,11 @@ struct RoundTrip {
       const bool cut = code == LX_OK && written.size() < expected.size() && sizeof(typename F::Unit) == 1;
       fail(cut ? "name" : "time_characters", place, cut ? "" : form.name, shown(written));
     }
-    LXTime back = kUntouched;
+    LXTime back{-1, -1, -1, -1, -1, -10000, -1, -1};  // what is not read cannot be written again
     const std::vector<typename F::Unit> exact(text.begin(), text.end());
     const auto count =
         form.read_time(l, &back, exact.data(), count_of(text), format.data(), count_of(format), 0);
-    if (count != count_of(text) || memcmp(&back, &carried, sizeof(back)) != 0)
+    if (count != count_of(text) || write(form, l, back, format) != text)
       fail("time", place, form.name, ascii_format + " " + shown(decode(form, l, text)));
   }
 
@@ -165,53 +164,17 @@ void numbers(RoundTrip* trip, const Place& place) {
   }
 }
 
-/// The letters of a format's directives, nested ones in their places.
-std::string directives(LXLocale* l, const Units& format) {
-  std::string out;
-  for (size_t i = 0; i < format.size(); ++i) {
-    if (format[i] != '%') continue;
-    const bool flag = format[i + 1] == '#';
-    const char letter = static_cast<char>(format[i += 1 + flag]);
-    const bool date = letter == 'x' || letter == 'c', time = letter == 'X' || letter == 'c';
-    if (date) out += directives(l, item(l, flag ? LX_ITEM_LONG_DATE_FORMAT : LX_ITEM_SHORT_DATE_FORMAT));
-    if (time) out += directives(l, item(l, LX_ITEM_TIME_FORMAT));
-    if (!date && !time) out += letter;
-  }
-  return out;
-}
-
-/// What reading leaves of a time: the fields that directives carry.
-LXTime carried(const LXTime& t, const std::string& letters) {
-  LXTime out = RoundTrip::kUntouched;
-  const auto take = [&](const char* any, int32_t LXTime::*field, int32_t value) {
-    if (letters.find_first_of(any) != std::string::npos) out.*field = value;
-  };
-  take("d", &LXTime::day, t.day);
-  take("mbB", &LXTime::month, t.month);
-  take("y", &LXTime::year, t.year % 100);
-  take("Y", &LXTime::year, t.year);
-  take("I", &LXTime::hours, t.hours % 12);
-  take("Hp", &LXTime::hours, t.hours);
-  take("M", &LXTime::minutes, t.minutes);
-  take("S", &LXTime::seconds, t.seconds);
-  take("aAw", &LXTime::weekday, t.weekday);
-  take("j", &LXTime::day_of_year, t.day_of_year);
-  return out;
-}
-
 void times(RoundTrip* trip, const Place& place) {
   LXLocale* const l = place.get();
   for (const char* format : {"%c", "%#c", "%x", "%#x", "%X", "%x %A %j", "%#x, %H:%M", "%c %w",
                              "%Y-%m-%d %H:%M:%S", "%A %#d %B %Y, %I:%M:%S %p", "%a %b %d %#y", "%%%j%%%p%#I"}) {
-    const std::string letters = directives(l, units(format));
     for (int n = 0; n < 12; ++n) {  // all months and weekdays, noon and midnight
       if (!trip->takes(place) && strcmp(format, "%#c") != 0) continue;  // which has all names
       tm date{59 - n, n, n == 0 ? 12 : 2 * n % 22, 1 + 11 * n % 28, n, 70 + 5 * n, 0, 0, 0, 0, nullptr};
       timegm(&date);
       const LXTime t = fields_of(date);
-      const LXTime expected = carried(t, letters);
       const Units whole = write(kUnicode, l, t, units(format));
-      trip->run(place, whole, [&](const auto& form) { trip->time(form, place, t, format, whole, expected); });
+      trip->run(place, whole, [&](const auto& form) { trip->time(form, place, t, format, whole); });
     }
   }
 }

@@ -287,7 +287,7 @@ void compare_language(const Language& row, Differences* differences) {
       const auto theirs = [&](UChar* out, int32_t room, UErrorCode* status) {
         return (upper ? u_strToUpper : u_strToLower)(out, room, source.data(), length, row.locale, status);
       };
-      compare((upper ? "upper_" : "lower_") + kind, widen(made<LXUChar>(ours)), icu(theirs));
+      compare((upper ? "upper_" : "lower_") + kind, widen(made<LXUChar>(ours, 3 * source.size())), icu(theirs));
     }
   }
 }

@@ -12,8 +12,6 @@
 #include <memory>
 #include <set>
 #include <sstream>
-#include <string>
-#include <vector>
 
 #include "directory/directory_codepages.h"
 #include "directory/icu_peer.h"
@@ -26,119 +24,84 @@ namespace {
 constexpr uint32_t kNone = 0xFFFFFFFF;
 
 /// A converter, character by character: kNone and an empty text where there is no mapping.
-class Peer {
- public:
-  virtual ~Peer() = default;
-  virtual uint32_t to_unicode(const std::string& text) = 0;
-  virtual std::string from_unicode(uint16_t u) = 0;
+struct Peer {
+  std::function<uint32_t(const std::string&)> to_unicode;  // none: there is no such converter
+  std::function<std::string(uint16_t)> from_unicode;
 };
 
-class IcuPeer : public Peer {
- public:
-  explicit IcuPeer(const std::string& name) {
-    UErrorCode status = U_ZERO_ERROR;
-    converter_.reset(ucnv_open(name.c_str(), &status));
-    if (U_FAILURE(status)) return;
-    ucnv_setFallback(converter_.get(), 1);
-    ucnv_setToUCallBack(converter_.get(), UCNV_TO_U_CALLBACK_STOP, nullptr, nullptr, nullptr, &status);
-    ucnv_setFromUCallBack(converter_.get(), UCNV_FROM_U_CALLBACK_STOP, nullptr, nullptr, nullptr, &status);
-  }
-  bool usable() const { return converter_ != nullptr; }
-
-  uint32_t to_unicode(const std::string& text) override {
+Peer icu_peer(const std::string& name) {
+  UErrorCode opened = U_ZERO_ERROR;
+  const std::shared_ptr<UConverter> converter(ucnv_open(name.c_str(), &opened), ucnv_close);
+  if (U_FAILURE(opened)) return {};
+  ucnv_setFallback(converter.get(), 1);
+  ucnv_setToUCallBack(converter.get(), UCNV_TO_U_CALLBACK_STOP, nullptr, nullptr, nullptr, &opened);
+  ucnv_setFromUCallBack(converter.get(), UCNV_FROM_U_CALLBACK_STOP, nullptr, nullptr, nullptr, &opened);
+  const auto to_unicode = [converter](const std::string& text) {
     UErrorCode status = U_ZERO_ERROR;
     UChar units[8];
-    ucnv_resetToUnicode(converter_.get());
+    ucnv_resetToUnicode(converter.get());
     const int32_t n =
-        ucnv_toUChars(converter_.get(), units, 8, text.data(), static_cast<int32_t>(text.size()), &status);
-    if (U_FAILURE(status) || n == 0) return kNone;
-    return n == 1 && units[0] != 0xFFFD ? units[0] : kNone;
-  }
-
-  std::string from_unicode(uint16_t u) override {
+        ucnv_toUChars(converter.get(), units, 8, text.data(), static_cast<int32_t>(text.size()), &status);
+    return U_SUCCESS(status) && n == 1 && units[0] != 0xFFFD ? units[0] : kNone;
+  };
+  const auto from_unicode = [converter](uint16_t u) {
     UErrorCode status = U_ZERO_ERROR;
     char bytes[16];
     const UChar unit = u;
-    ucnv_resetFromUnicode(converter_.get());
-    const int32_t n = ucnv_fromUChars(converter_.get(), bytes, sizeof(bytes), &unit, 1, &status);
+    ucnv_resetFromUnicode(converter.get());
+    const int32_t n = ucnv_fromUChars(converter.get(), bytes, sizeof(bytes), &unit, 1, &status);
     return U_SUCCESS(status) ? std::string(bytes, static_cast<size_t>(n)) : std::string();
-  }
+  };
+  return {to_unicode, from_unicode};
+}
 
- private:
-  lexicor_import::IcuPtr<UConverter, ucnv_close> converter_;
-};
-
-class IconvPeer : public Peer {
- public:
-  explicit IconvPeer(const std::string& name)
-      : to_(iconv_open("UCS-2LE", name.c_str())), from_(iconv_open(name.c_str(), "UCS-2LE")) {}
-  ~IconvPeer() override {
-    if (to_ != kBad) iconv_close(to_);
-    if (from_ != kBad) iconv_close(from_);
-  }
-  bool usable() const { return to_ != kBad && from_ != kBad; }
-
-  uint32_t to_unicode(const std::string& text) override {
-    const std::string units = run(to_, text);
-    if (units.size() != 2) return kNone;
-    const uint32_t u = static_cast<uint8_t>(units[0]) | static_cast<uint32_t>(static_cast<uint8_t>(units[1]))
-                                                            << 8;
-    return u != 0xFFFD ? u : kNone;
-  }
-  std::string from_unicode(uint16_t u) override {
-    return run(from_, {static_cast<char>(u), static_cast<char>(u >> 8)});
-  }
-
- private:
-  static inline const iconv_t kBad = reinterpret_cast<iconv_t>(-1);
-
-  static std::string run(iconv_t converter, std::string text) {
+/// Converts a text between glibc's charsets; empty where it has none of these or a character does not convert.
+std::function<std::string(std::string)> iconv_of(const std::string& to, const std::string& from) {
+  const iconv_t opened = iconv_open(to.c_str(), from.c_str());
+  if (opened == reinterpret_cast<iconv_t>(-1)) return {};
+  return [converter = std::shared_ptr<void>(opened, iconv_close)](std::string text) {
     char out[32];
-    char* in_pointer = text.data();
-    char* out_pointer = out;
-    size_t in_left = text.size();
-    size_t out_left = sizeof(out);
-    iconv(converter, nullptr, nullptr, nullptr, nullptr);
-    if (iconv(converter, &in_pointer, &in_left, &out_pointer, &out_left) != 0 || in_left != 0) return {};
-    iconv(converter, nullptr, nullptr, &out_pointer, &out_left);
+    char *in_pointer = text.data(), *out_pointer = out;
+    size_t in_left = text.size(), out_left = sizeof(out);
+    iconv(converter.get(), nullptr, nullptr, nullptr, nullptr);
+    if (iconv(converter.get(), &in_pointer, &in_left, &out_pointer, &out_left) != 0 || in_left != 0)
+      return std::string();
+    iconv(converter.get(), nullptr, nullptr, &out_pointer, &out_left);
     return std::string(out, out_pointer);
-  }
-
-  iconv_t to_;
-  iconv_t from_;
-};
+  };
+}
+Peer iconv_peer(const std::string& name) {
+  const auto to = iconv_of("UCS-2LE", name), from = iconv_of(name, "UCS-2LE");
+  if (!to || !from) return {};
+  const auto to_unicode = [to](const std::string& text) {
+    const std::string unit = to(text);
+    if (unit.size() != 2) return kNone;
+    const uint32_t u = static_cast<uint8_t>(unit[0]) | static_cast<uint32_t>(static_cast<uint8_t>(unit[1]))
+                                                           << 8;
+    return u != 0xFFFD ? u : kNone;
+  };
+  return {to_unicode, [from](uint16_t u) { return from({static_cast<char>(u), static_cast<char>(u >> 8)}); }};
+}
 
 /// The library's own conversion, in the same shape.
-class Library16 : public Peer {
- public:
-  explicit Library16(const ShippedCodepage& codepage)
-      : locale_(locale_with(codepage.source.name)),
-        substitution_(1, static_cast<char>(codepage.source.substitution)) {
-    if (codepage.source.utf8) substitutes_for_.insert(codepage.source.substitution);
-    for (const lexicor_data::Mapping& mapping : codepage.source.mappings)
-      if (mapping.precision != 3 && mapping.bytes == 1 && mapping.code == codepage.source.substitution)
-        substitutes_for_.insert(mapping.unicode);
-  }
-
-  uint32_t to_unicode(const std::string& text) override {
-    LXUChar units[8];
-    const int32_t n = LXStringToUnicodeEx(units, 8, locale_.get(), text.data(), LX_SHIFT_SINGLE,
-                                          static_cast<int32_t>(text.size()), 0);
-    return n == 1 && units[0] != 0xFFFD ? units[0] : kNone;
-  }
-  std::string from_unicode(uint16_t u) override {
-    char bytes[16];
-    const int32_t n =
-        LXUnicodeToStringEx(locale_.get(), bytes, LX_SHIFT_SINGLE, sizeof(bytes), &u, 1, LX_TERMINATE);
-    std::string text(bytes, static_cast<size_t>(n) - 1);
-    return text == substitution_ && substitutes_for_.count(u) == 0 ? std::string() : text;
-  }
-
- private:
-  LocalePtr locale_;
-  std::string substitution_;
-  std::set<uint32_t> substitutes_for_;
-};
+Peer library_peer(const ShippedCodepage& codepage) {
+  const std::shared_ptr<LXLocale> locale = locale_with(codepage.source.name);
+  const std::string substitution(1, static_cast<char>(codepage.source.substitution));
+  std::set<uint32_t> substitutes_for;
+  if (codepage.source.utf8) substitutes_for.insert(codepage.source.substitution);
+  for (const lexicor_data::Mapping& mapping : codepage.source.mappings)
+    if (mapping.precision != 3 && mapping.bytes == 1 && mapping.code == codepage.source.substitution)
+      substitutes_for.insert(mapping.unicode);
+  const auto to_unicode = [locale](const std::string& text) {
+    const Units units = test::to_unicode(locale.get(), text);
+    return units.size() == 1 && units[0] != 0xFFFD ? units[0] : kNone;
+  };
+  const auto from_unicode = [=](uint16_t u) {
+    const std::string text = test::from_unicode(locale.get(), {u});
+    return text == substitution && substitutes_for.count(u) == 0 ? std::string() : text;
+  };
+  return {to_unicode, from_unicode};
+}
 
 bool is_private(uint32_t u) {
   return u >= 0xE000 && u <= 0xF8FF;
@@ -206,9 +169,9 @@ void for_each_text(const ShippedCodepage& codepage, const std::function<void(con
       visit(text_of_code(codepage, mapping.code, mapping.bytes));
 }
 
-void compare(const ShippedCodepage& codepage, const std::string& peer_name, Peer& peer,
+void compare(const ShippedCodepage& codepage, const std::string& peer_name, const Peer& peer,
              Differences* differences) {
-  Library16 library(codepage);
+  const Peer library = library_peer(codepage);
   const std::string head = peer_name + " " + codepage.source.name + " ";
   for_each_text(codepage, [&](const std::string& text) {
     const uint32_t ours = library.to_unicode(text);
@@ -278,16 +241,16 @@ TEST(Peers, CodepagesConvertAsInIcuAndIconv) {
   size_t icu = 0, iconv = 0;
   for (const ShippedCodepage& codepage : shipped_codepages()) {
     if (const std::string name = codepage.source.utf8 ? "UTF-8" : icu_name(codepage); !name.empty()) {
-      IcuPeer peer(name);
-      ASSERT_TRUE(peer.usable()) << codepage.source.name << ": no converter " << name;
+      const Peer peer = icu_peer(name);
+      ASSERT_TRUE(peer.to_unicode) << codepage.source.name << ": no converter " << name;
       compare(codepage, "icu", peer, &differences);
       ++icu;
     }
-    std::unique_ptr<IconvPeer> peer;
+    Peer peer;
     for (const std::string& name : iconv_names(codepage))
-      if (peer == nullptr || !peer->usable()) peer = std::make_unique<IconvPeer>(name);
-    if (!peer->usable()) continue;
-    compare(codepage, "iconv", *peer, &differences);
+      if (!peer.to_unicode) peer = iconv_peer(name);
+    if (!peer.to_unicode) continue;
+    compare(codepage, "iconv", peer, &differences);
     ++iconv;
   }
   EXPECT_GE(icu, 140u) << "the others are taken from glibc";

@@ -1,19 +1,13 @@
 // Numbers and currency amounts, written and read: all forms against one model and against each other, over
 // random conventions and every size; reading of whatever was written.
-#include <gtest/gtest.h>
-
-#include <algorithm>
 #include <cfloat>
 #include <cmath>
 #include <cstdarg>
 #include <cstdio>
 #include <cstring>
-#include <iterator>
-#include <random>
 #include <sstream>
 
-#include "support/case_library.h"
-#include "support/forms.h"
+#include "support/case_test.h"
 
 namespace {
 bool other_decimal_point = false;  // what a process's locale may make of "%f"
@@ -128,34 +122,18 @@ Units model(double value, const Style& style) {
                fraction);
 }
 
-class NumberTest : public ::testing::Test {
+class NumberTest : public CaseTest {
  protected:
-  void TearDown() override { EXPECT_TRUE(library.close()); }
-
-  /// Calls `body` with a locale and a form of each codepage; the plain form does not write shift bytes.
-  template <class Body>
-  void everywhere(Body body) {
-    for (const TinyCodepage& codepage : case_codepages())
-      in_all_forms([&](const auto& form) {
-        SCOPED_TRACE(codepage.file.name + " " + form.name);
-        if (form.name != kPlain.name || !codepage.shift) body(library.locale(codepage), form, codepage.shift);
-      });
-  }
-  void apply_everywhere(const Style& style) {
-    for (const TinyCodepage& codepage : case_codepages()) apply(library.locale(codepage), style);
-  }
-
-  int any(int end) { return static_cast<int>(random() % static_cast<unsigned>(end)); }
+  int any(size_t end) { return static_cast<int>(below(end)); }
   Style random_style() {
     static const auto groupings = words("3;0 3 3;2;0 0 ; 1;1 2;0;5 1;0 4;3 9999999999999;0");
     static const auto separators = words(".,' ,.' '., .', ,'. ',.");
     // The sign of two or three bytes stands where the codepage has it.
     static const std::vector<Units> texts{units("$"), {},           units("-"),
                                           {0x5186},   units("USD"), {0x5186, 0x5186, 'k'}};
-    const auto pick = [&](const auto& list) { return list[random() % list.size()]; };
-    const std::string two = pick(separators);
-    return {two[0],      two[1],      pick(groupings), any(10), pick(texts),
-            pick(texts), pick(texts), any(2),          any(2),  any(5)};
+    const std::string two = any_of(separators);
+    return {two[0], two[1], any_of(groupings), any(10), any_of(texts), any_of(texts), any_of(texts), any(2),
+            any(2), any(5)};
   }
   double random_double() {
     const auto bits = (uint64_t{random()} << 32) | random();
@@ -163,12 +141,10 @@ class NumberTest : public ::testing::Test {
     memcpy(&value, &bits, sizeof(value));  // any exponent, and what is not finite
     const auto integer = static_cast<double>(static_cast<int64_t>(bits) >> (bits % 60));
     const double choice[] = {value, integer / 128, integer / 100, std::ldexp(integer, -any(140))};
-    return choice[any(4)];  // the second: ties of the sixth digit
+    return any_of(choice);  // the second: ties of the sixth digit
   }
 
-  CaseLibrary library;
   LXLocale* ascii = library.locale(case_codepage("SINGLE"));
-  std::mt19937 random{2};
 };
 
 TEST_F(NumberTest, LongTexts) {
@@ -199,7 +175,7 @@ TEST_F(NumberTest, DigitsAreThoseOfThePrintfConversion) {
 TEST_F(NumberTest, AllFormsWriteAndReadTheSameCharacters) {
   for (int i = 0; i < 300; ++i) {
     const Style style = random_style();
-    apply_everywhere(style);
+    for (const TinyCodepage& cp : case_codepages()) apply(library.locale(cp), style);
     const auto kind = static_cast<Value::Kind>(any(3));
     const bool money = kind == Value::kAmount;
     const uint32_t values = any(4) == 0 ? LX_TERRITORY_VALUES : 0;
@@ -210,7 +186,7 @@ TEST_F(NumberTest, AllFormsWriteAndReadTheSameCharacters) {
     const uint32_t flags = any(2) == 0 ? 0 : LX_TERMINATE;
     const size_t room = static_cast<size_t>(size) - (flags != 0 ? 1 : 0);
     const Units part = whole.substr(0, room);
-    everywhere([&](LXLocale* l, const auto& form, bool shift) {
+    const auto check = [&](LXLocale* l, const auto& form, bool shift) {
       using F = std::decay_t<decltype(form)>;
       if (decode(kWide, l, encode(kWide, l, whole)) != whole) return;  // not in the codepage
       for (LXShiftState state = 0; state <= (std::is_same_v<F, Ex> && shift ? 1 : 0); ++state) {
@@ -234,28 +210,10 @@ TEST_F(NumberTest, AllFormsWriteAndReadTheSameCharacters) {
           EXPECT_EQ(chars.result, count_of(part) + (flags != 0 ? 1 : 0));
         }
       }
-    });
+    };
+    for (const TinyCodepage& cp : case_codepages())
+      forms_of(cp, [&](const auto& form) { check(library.locale(cp), form, cp.shift); });
   }
-}
-
-TEST_F(NumberTest, SignsAndSymbolsStandWhereTheItemsSay) {
-  // By sign position, each: symbol behind, symbol before, and both with a space.
-  const char* const texts[] = {"(1.5USD) (USD1.5) (1.5_USD) (USD_1.5)", "CR1.5USD CRUSD1.5 CR1.5_USD CRUSD_1.5",
-                               "1.5USDCR USD1.5CR 1.5_USDCR USD_1.5CR", "1.5CRUSD CRUSD1.5 1.5_CRUSD CRUSD_1.5",
-                               "1.5USDCR USDCR1.5 1.5_USDCR USDCR_1.5"};
-  for (int position = 0; position < 5; ++position)
-    for (int i = 0; i < 4; ++i) {
-      apply_everywhere({'.', ',', "3;0", 1, units("USD"), units("CR"), units("CR"), i % 2, i / 2, position});
-      Units expected = units(words(texts[position])[static_cast<size_t>(i)]);
-      std::replace(expected.begin(), expected.end(), '_', ' ');
-      everywhere([&](LXLocale* l, const auto& form, bool) {
-        for (double value : {1.5, -1.5})
-          EXPECT_EQ(decode(form, l, write(form, l, Value{Value::kAmount, value})), expected);
-      });
-    }
-  LXSetLocaleNumInfo(ascii, LX_ITEM_NEGATIVE_PRECEDES, 0);
-  EXPECT_EQ(write(kPlain, ascii, Value{Value::kAmount, -1.5}), "1.5 USDCR");
-  EXPECT_EQ(write(kPlain, ascii, Value{Value::kAmount, 1.5}), "USDCR 1.5");
 }
 
 /// "|" stands where the character ends, "_" for a space.

@@ -1,14 +1,9 @@
 // Times: over random formats, records, sizes and texts that all forms write and read the same characters, in
 // every kind of codepage; and what stays in the buffer.
-#include <gtest/gtest.h>
-
-#include <algorithm>
 #include <cstring>
-#include <random>
 
 #include "core/lxrecords.h"
-#include "support/case_library.h"
-#include "support/forms.h"
+#include "support/case_test.h"
 
 namespace lx::test {
 namespace {
@@ -67,52 +62,32 @@ Result parsed(const F& form, LXLocale* in, const Units& text, const Units& forma
   return out;
 }
 
-class TimeTest : public ::testing::Test {
+class TimeTest : public CaseTest {
  protected:
-  void TearDown() override { EXPECT_TRUE(library.close()); }
-
-  /// The names of days and months begin with kana where the codepage has them.
-  const TinyCodepage& random_codepage() {
-    const auto& all = case_codepages();
-    return all[static_cast<size_t>(below(count_of(all) - 1))];
-  }
-  LXLocale* locale(const TinyCodepage& cp, const char* language = "Kana") {
-    return library.locale(cp, language);
-  }
-  /// Calls `body` with the forms that can say all characters of the codepage.
-  template <class Body>
-  static void forms_of(const TinyCodepage& cp, const Body& body) {
-    in_all_forms([&](const auto& form) {
-      SCOPED_TRACE(cp.file.name + " " + form.name);
-      if (form.name != kPlain.name || !cp.shift) body(form);
-    });
-  }
-  int below(int n) { return static_cast<int>(random() % static_cast<unsigned>(n)); }
+  int any(size_t end) { return static_cast<int>(below(end)); }
   LXTime random_time() {
-    LXTime time{below(60), below(60), below(24), below(32), below(12), below(100), below(7), below(366)};
-    if (below(8) == 0) time.hours = 24;
+    LXTime time{any(60), any(60), any(24), any(32), any(12), any(100), any(7), any(366)};
+    if (any(8) == 0) time.hours = 24;
     return time;
   }
   /// Directives, letters, kana, mistakes; nested formats at the start only, where forms agree on their place.
   std::string random_format(int most) {
     static const char kLetters[] = "aAbBdHIjmMpSUwWyYaAbBdHIjmMpSwyY%";
-    std::string format = below(4) == 0 ? std::string(below(2) == 0 ? "%" : "%#") + "cxX"[below(3)] : "";
-    for (int n = below(most); n > 0; --n) {
-      const int what = below(12);
+    std::string format = any(4) == 0 ? std::string(any(2) == 0 ? "%" : "%#") + "cxX"[any(3)] : "";
+    for (int n = any(most); n > 0; --n) {
+      const int what = any(12);
       if (what < 7)
-        format += std::string(what < 5 ? "%" : "%#") + kLetters[below(sizeof(kLetters) - 1)];
+        format += std::string(what < 5 ? "%" : "%#") + kLetters[any(sizeof(kLetters) - 1)];
       else
-        format += static_cast<char>(what < 9 ? 'd' + below(16) : what < 11 ? 0x80 + below(63) : '%');
+        format += static_cast<char>(what < 9 ? 'd' + any(16) : what < 11 ? 0x80 + any(63) : '%');
     }
     return format;
   }
-  CaseLibrary library;
-  std::mt19937 random{20030704};
 };
 
 /// Nested formats go to the start of the buffer, whose work copy by characters is cleared.
 TEST_F(TimeTest, NestedFormatsGoToTheStart) {
-  LXLocale* const in = locale(case_codepage("SINGLE"), "English");
+  LXLocale* const in = library.locale(case_codepage("SINGLE"));
   for (const auto& [format, text] : {std::pair("on %x.", "7/4/03~~~."),
                                      {"At %X!", "2:05:09 PM~~~!"},
                                      {"Week %W%c", "7/4/036~~~~~~ 2:05:09 PM"}})
@@ -128,7 +103,7 @@ TEST_F(TimeTest, LongAndEqualNames) {
   LXTime sunday = kSample;
   sunday.weekday = 0;
   for (const TinyCodepage& cp : case_codepages()) {
-    LXLocale* const in = locale(cp, "Long");
+    LXLocale* const in = library.locale(cp, "Long");
     forms_of(cp, [&](const auto& form) {
       // Three bytes for a kana at most, and shift bytes.
       const bool bytes = sizeof(typename std::decay_t<decltype(form)>::Unit) == 1 && cp.find(0x3041) != nullptr;
@@ -145,8 +120,8 @@ TEST_F(TimeTest, LongAndEqualNames) {
 
 TEST_F(TimeTest, FormsWriteTheSame) {
   for (int round = 0; round < 3000; ++round) {
-    const TinyCodepage& cp = random_codepage();
-    LXLocale* const in = locale(cp);
+    const TinyCodepage& cp = case_codepages()[below(case_codepages().size() - 1)];
+    LXLocale* const in = library.locale(cp, "Kana");  // names that begin with kana
     const LXTime time = random_time();
     const Units format = kana_units(random_format(8));
     const Result whole = written(kUnicode, in, time, format);
@@ -157,7 +132,7 @@ TEST_F(TimeTest, FormsWriteTheSame) {
       const Units text = decode(form, in, encode(form, in, whole.text));
       const Result out = written(form, in, time, format);
       ASSERT_TRUE(out.text == text && out.code == whole.code);
-      const int32_t size = below(24);
+      const int32_t size = any(24);
       const Result cut = written(form, in, time, format, size, below(2) == 0 ? 0 : LX_TERMINATE);
       ASSERT_EQ(cut.text, text.substr(0, cut.text.size())) << "whole characters";
       ASSERT_TRUE(cut.code == 40 || (cut.text == text && cut.code == whole.code));
@@ -175,9 +150,9 @@ TEST_F(TimeTest, FormsWriteTheSame) {
 TEST_F(TimeTest, FormsReadTheSameAndWhatWasWritten) {
   int read_back = 0;
   for (int round = 0; round < 4000; ++round) {
-    const TinyCodepage& cp = random_codepage();
+    const TinyCodepage& cp = case_codepages()[below(case_codepages().size() - 1)];
     if (cp.find(0x3041) == nullptr) continue;
-    LXLocale* const in = locale(cp);
+    LXLocale* const in = library.locale(cp, "Kana");  // names that begin with kana
     const std::string format_text = random_format(6);
     const Units format = kana_units(format_text);
     const LXTime time = random_time();
@@ -186,10 +161,7 @@ TEST_F(TimeTest, FormsReadTheSameAndWhatWasWritten) {
     Units text = original.text;
     text.insert(text.end(), 4, 'z');
     const bool changed = below(2) == 0;
-    if (changed)
-      text[static_cast<size_t>(below(count_of(text) - 3))] = kana_units(
-          "7%\x91"
-          "a")[static_cast<size_t>(below(4))];
+    if (changed) text[below(text.size() - 3)] = any_of(Units{'7', '%', 0x3052, 'a'});
     const Result whole = parsed(kUnicode, in, text, format, time);
     SCOPED_TRACE(round);
     forms_of(cp, [&](const auto& form) {

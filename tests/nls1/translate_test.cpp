@@ -126,7 +126,8 @@ TEST(Translate, AgreesWithConversion) {
 }
 
 int32_t codepage_of_letter(const std::string& letter) {
-  return std::map<std::string, int32_t>{{"S", S}, {"J", J}, {"V", V}, {"H", H}, {"U", U}}.at(letter);
+  return std::map<std::string, int32_t>{{"S", S}, {"J", J}, {"V", V}, {"H", H}, {"U", U}, {"1", 1}, {"2", 2}}
+      .at(letter);
 }
 int32_t flags_of_letters(const std::string& letters) {
   const std::map<char, int32_t> flags{{'p', kPad},  {'d', kDrop}, {'c', kChars},
@@ -189,42 +190,23 @@ TEST_F(TranslateTest, CodepagesThatCannotBeHad) {
 }
 
 TEST(Translate, Messages) {
-  struct Case {
-    uint32_t level;
-    int32_t to, from, length;
-    std::string messages;  // each with a bar behind it
-  };
-  const std::string shift = " codepage 9005 is shift sensitive, Shift-In=0E, Shift-Out=0f|";
-  const std::string single = " codepage 9001 is single byte|";
-  const Case cases[] = {
-      {RAS1_LEVEL_DETAIL, V, S, -1,
-       "Source" + single + "Target codepage 57352 is not shift sensitive|Source length = 1|"},
-      {RAS1_LEVEL_DETAIL, S, H, 2, "Source" + shift + "Target" + single},
-      {RAS1_LEVEL_DETAIL, H, U, -1, "Target" + shift + "Source length = 2|"},
-      {RAS1_LEVEL_ERRORS, 1, 2, 2, "Unable to locate codepage 2|Unable to locate codepage 1|"},
-      {RAS1_LEVEL_FLOW, J, S, 2, "Process SingleByte Input, Multi-byte output |"},
-      {RAS1_LEVEL_FLOW, H, S, 2, "Process SingleByte Input, Extended Multi-byte output |"},
-      {RAS1_LEVEL_FLOW, V, H, 2, "Process Multi-Byte Input, Multi-byte output |"},
-      {RAS1_LEVEL_FLOW, H, J, 2, "Process multi-byte Input, Extended Multi-byte output |"},
-      {RAS1_LEVEL_FLOW, S, J, 2, ""},
-      {RAS1_LEVEL_FLOW, H, U, 2, ""},
-      {RAS1_LEVEL_FLOW, H, S, 0, ""},
-  };
-  expect_in_child("messages", [&cases] {
+  expect_in_child("messages", [] {
     TinyLibrary library;
-    for (const Case& c : cases) {
+    for (const CaseRow& row : case_rows("nls1/translation_messages.txt")) {
+      SCOPED_TRACE(row.where);
       RecordingTrace::take();
-      RecordingTrace::set_level(c.level | RAS1_LEVEL_EVENTS);
-      const Translated t = translate(c.to, c.from, {'a', 0, 0, 0}, c.length, 8, 0, 8);
+      RecordingTrace::set_level(static_cast<uint32_t>(row.number(0)) | RAS1_LEVEL_EVENTS);
+      const Translated t = translate(codepage_of_letter(row[1]), codepage_of_letter(row[2]), {'a', 0, 0, 0},
+                                     row.number(3), 8, 0, 8);
       RecordingTrace::set_level(0);
-      std::string found;
+      std::string found = " ";
       for (const TraceRecord& record : RecordingTrace::take()) {
         if (record.unit != "qrlnsts") continue;
-        if (record.kind == TraceRecord::kEntry) found += "entry|";
-        if (record.kind == TraceRecord::kMessage) found += record.text + "|";
-        if (record.kind == TraceRecord::kExitValue) found += std::to_string(record.value);
+        if (record.kind == TraceRecord::kEntry) found += "entry";
+        if (record.kind == TraceRecord::kMessage) found += "; " + record.text;
+        if (record.kind == TraceRecord::kExitValue) found += "; " + std::to_string(record.value);
       }
-      EXPECT_EQ(found, "entry|" + c.messages + std::to_string(t.result)) << c.from << " to " << c.to;
+      EXPECT_EQ(found, " entry; " + (row[4].empty() ? "" : row[4] + "; ") + std::to_string(t.result));
     }
   });
 }

@@ -1,27 +1,27 @@
 // Character streams against a scripted callback that moves any number of bytes, fails or ends at any call: the
 // bytes that pass are those of the text, whatever the form and the codepage.
-#include <gtest/gtest.h>
-
-#include <algorithm>
 #include <cstring>
 
+#include "stream/line_texts.h"
 #include "stream/lxstream.h"
-#include "stream/stream_texts.h"
+#include "stream/stream_peer.h"
 
+namespace lx::test {
 namespace {
 
-using namespace lx::test;
-
-std::string printed(const std::string& bytes) {
-  return testing::PrintToString(bytes);
-}
-
-class Streams : public testing::Test {
+class Streams : public CaseTest {
  protected:
-  void TearDown() override { EXPECT_TRUE(library_.close()); }
-
-  LXStream* open(LXLocale* locale, Peer& peer, uint32_t mode) {
-    LXStream* stream = LXOpenStream(locale, Peer::transfer, &peer, mode);
+  /// Calls `body(codepage, locale)` with every codepage.
+  template <class Body>
+  void in_all_codepages(const Body& body) {
+    for (const TinyCodepage& cp : case_codepages()) {
+      SCOPED_TRACE(cp.file.name);
+      body(cp, library.locale(cp));
+    }
+  }
+  LXStream* open(LXLocale* locale, Peer& peer) {
+    LXStream* stream =
+        LXOpenStream(locale, Peer::transfer, &peer, peer.sends ? LX_STREAM_READ : LX_STREAM_WRITE);
     EXPECT_NE(stream, nullptr);
     return stream;
   }
@@ -29,17 +29,21 @@ class Streams : public testing::Test {
   std::vector<int32_t> random_script(size_t steps) {
     std::vector<int32_t> script;
     while (script.size() < steps) {
-      constexpr int32_t kSteps[] = {1, 1, 2, 3, kAll, 0, -1, -7, kNonsense};
-      const int32_t step = kSteps[random_() % std::size(kSteps)];
-      script.insert(script.end(), step > 0 && step != kNonsense ? 1 : 1 + random_() % 40, step);
+      constexpr int32_t kSteps[] = {1, 1, 2, 3, Peer::kAll, 0, -1, -7, Peer::kNonsense};
+      const int32_t step = any_of(kSteps);
+      script.insert(script.end(), step > 0 && step != Peer::kNonsense ? 1 : 1 + random() % 40, step);
     }
     return script;
   }
-
-  const std::vector<TinyCodepage> codepages_ = line_codepages();
-  TinyLibrary library_{codepages_};
-  std::mt19937 random_{20};
 };
+
+/// The bytes that a stream of a form carries: units, or bytes that begin and end in the single-byte state.
+template <class F>
+std::string stream_bytes(const TinyCodepage& cp, const Units& text) {
+  using Carried = std::conditional_t<std::is_same_v<F, Unicode>, Unicode, Ex>;
+  const auto units = Encoded<Carried>(cp, text).units;
+  return {reinterpret_cast<const char*>(units.data()), units.size() * sizeof(units[0])};
+}
 
 /// Writes one character by a form's door.
 template <class F>
@@ -51,61 +55,43 @@ int32_t write(LXStream* stream, LXLocale* locale, const TinyCharacter& c) {
   return LXWriteCharU(stream, locale, c.unicode);
 }
 
-/// Writes a text as the error codes ask for: a character is given again after 40 and never after 65.
-template <class F>
-void write_text(LXStream* stream, LXLocale* locale, const Text& text) {
-  for (const TinyCharacter& c : text) {
-    while (write<F>(stream, locale, c) == 0) {
-      const int32_t code = LXGetError(locale);
-      EXPECT_TRUE(code == LX_E_STREAM_KEPT || code == LX_E_SIZE) << code;
-      if (code != LX_E_SIZE) break;
-    }
-    EXPECT_LE(stream->count, LX_STREAM_BUFFER);
-  }
-}
-
+// As the error codes ask for, a character is given again after 40 and never after 65.
 TEST_F(Streams, WritingLosesNothing) {
-  for (const TinyCodepage& cp : codepages_) {
-    SCOPED_TRACE(cp.file.name);
-    LXLocale* locale = library_.locale(cp);
+  in_all_codepages([&](const TinyCodepage& cp, LXLocale* locale) {
     std::vector<std::vector<int32_t>> scripts;
-    for (size_t n = 0; n < 24; ++n) {
-      for (int32_t stop : {-1, 0, 1, kNonsense, -9}) {
+    for (size_t n = 0; n < 24; ++n)
+      for (int32_t stop : {-1, 0, 1, Peer::kNonsense, -9}) {
         scripts.emplace_back(n, 1);
         scripts.back().insert(scripts.back().end(), stop == 0 ? 400 : 60, stop);
       }
-    }
     for (int round = 0; round < 100; ++round) scripts.push_back(random_script(200));
     for (const auto& script : scripts) {
-      const Text text = random_text(cp, random_, 80);
-      in_all_forms([&](auto form) {
-        using F = decltype(form);
-        if (cp.shift && std::is_same_v<F, Plain>) return;
-        Receiver peer;
-        peer.script = script;
-        LXStream* stream = open(locale, peer, LX_STREAM_WRITE);
-        write_text<F>(stream, locale, text);
+      const Units text = random_text(cp, random, 80);
+      forms_of(cp, [&](const auto& form) {
+        using F = std::decay_t<decltype(form)>;
+        Peer peer{false, "", script};
+        LXStream* stream = open(locale, peer);
+        for (const LXUChar u : text) {
+          int32_t code = LX_E_SIZE;
+          while (code == LX_E_SIZE && write<F>(stream, locale, *cp.find(u)) == 0) code = LXGetError(locale);
+          EXPECT_TRUE(code == LX_E_SIZE || code == LX_E_STREAM_KEPT) << code;
+          EXPECT_LE(stream->count, LX_STREAM_BUFFER);
+        }
         peer.script.clear();  // closing would drop what is not taken
         EXPECT_EQ(LXCloseStream(stream, locale), 1) << LXGetError(locale);
-        EXPECT_EQ(printed(peer.bytes), printed(stream_bytes<F>(cp, text)));
+        EXPECT_EQ(testing::PrintToString(peer.bytes), testing::PrintToString(stream_bytes<F>(cp, text)));
       });
     }
-  }
+  });
 }
 
 TEST_F(Streams, ReadingLosesNothing) {
-  for (const TinyCodepage& cp : codepages_) {
-    SCOPED_TRACE(cp.file.name);
-    LXLocale* locale = library_.locale(cp);
+  in_all_codepages([&](const TinyCodepage& cp, LXLocale* locale) {
     for (int round = 0; round < 100; ++round) {
-      const Text text = random_text(cp, random_, 60);
-      Sender peer, units;
-      peer.bytes = stream_bytes<Wide>(cp, text);
-      units.bytes = stream_bytes<Unicode>(cp, text);
-      peer.script = random_script(150);
-      units.script = random_script(150);
-      LXStream* in = open(locale, peer, LX_STREAM_READ);
-      LXStream* in_units = open(locale, units, LX_STREAM_READ);
+      const Units text = random_text(cp, random, 60);
+      Peer peer{true, stream_bytes<Wide>(cp, text), random_script(150)};
+      Peer units{true, stream_bytes<Unicode>(cp, text), random_script(150)};
+      LXStream *const in = open(locale, peer), *const in_units = open(locale, units);
       std::vector<LXWChar> codes;
       for (;;) {
         const LXWChar code = LXReadCharW(in, locale);
@@ -116,20 +102,20 @@ TEST_F(Streams, ReadingLosesNothing) {
           EXPECT_EQ(code == LX_STREAM_END, LXGetError(locale) == LX_OK);
           if (peer.calls > peer.script.size()) break;
         }
-        for (size_t n = random_() % 8 == 0 ? random_() % 6 : 0; n > 0 && !codes.empty(); --n, codes.pop_back())
+        for (size_t n = random() % 8 == 0 ? random() % 6 : 0; n > 0 && !codes.empty(); --n, codes.pop_back())
           EXPECT_EQ(LXUngetCharW(in, locale, codes.back()), 1);
       }
-      EXPECT_EQ(codes, Wide::encode(cp, text));
-      std::vector<LXUChar> read;
+      EXPECT_EQ(codes, Encoded<Wide>(cp, text).codes);
+      Units read;
       for (;;) {
         const LXUChar u = LXReadCharU(in_units, locale);
         if (u != LX_STREAM_NO_UNIT) read.push_back(u);
         if (u == LX_STREAM_NO_UNIT && units.calls > units.script.size()) break;
       }
-      EXPECT_EQ(read, Unicode::encode(cp, text));
+      EXPECT_EQ(read, text);
       EXPECT_EQ(LXCloseStream(in, locale) + LXCloseStream(in_units, locale), 2);
     }
-  }
+  });
 }
 
 /// Reads strings until the input is over; each in a block of its exact size.
@@ -139,7 +125,7 @@ std::vector<std::vector<typename F::Unit>> strings(LXStream* stream, LXLocale* l
   std::vector<std::vector<typename F::Unit>> all;
   for (;;) {
     std::vector<typename F::Unit> block(static_cast<size_t>(size()));
-    const int32_t n = F::read(stream, locale, block.data(), static_cast<int32_t>(block.size()), flags);
+    const int32_t n = F::read_string(stream, locale, block.data(), count_of(block), flags);
     if (n < 0) {
       EXPECT_EQ(n == -1, LXGetError(locale) == LX_OK);
       if (n == -1 && peer.calls > peer.script.size()) return all;
@@ -154,6 +140,23 @@ std::vector<std::vector<typename F::Unit>> strings(LXStream* stream, LXLocale* l
   }
 }
 
+/// The lines of a text in a form, as the model of line ends has them.
+template <class F>
+std::vector<std::vector<typename F::Unit>> lines_of(const TinyCodepage& cp, const Units& text, uint32_t flags) {
+  const Units ends = line_ends(cp);
+  std::vector<std::vector<typename F::Unit>> lines;
+  for (size_t at = 0; at < text.size();) {
+    const size_t past = find_eol(ends, text, at, flags & LX_EOL_ALL).past;
+    Units line;
+    for (; at < past; ++at) {
+      const bool pair = at + 1 < past && text[at] == ends[1] && text[at + 1] == ends[0];
+      if (!pair || (flags & LX_DROP_RETURNS) == 0) line.push_back(text[at]);
+    }
+    lines.push_back(Encoded<F>(cp, line).units);
+  }
+  return lines;
+}
+
 /// The parts behind one another, without shift bytes.
 template <class Unit>
 std::vector<Unit> joined(const TinyCodepage& cp, const std::vector<std::vector<Unit>>& parts) {
@@ -165,51 +168,43 @@ std::vector<Unit> joined(const TinyCodepage& cp, const std::vector<std::vector<U
 }
 
 TEST_F(Streams, LinesAreThoseOfTheModel) {
-  const auto check = [&](auto form, const TinyCodepage& cp) {
-    using F = decltype(form);
-    using Strings = std::vector<std::vector<typename F::Unit>>;
-    LXLocale* locale = library_.locale(cp);
-    const Text text = random_text(cp, random_, 40);
+  const auto check = [&](const auto& form, const TinyCodepage& cp, LXLocale* locale) {
+    using F = std::decay_t<decltype(form)>;
+    const Units text = random_text(cp, random, 40);
     const uint32_t flags =
-        (random_() % 16) << 8 | (random_() % 2) * LX_DROP_RETURNS | (random_() % 2) * LX_TERMINATE;
+        (random() % 16) << 8 | (random() % 2) * LX_DROP_RETURNS | (random() % 2) * LX_TERMINATE;
     SCOPED_TRACE(flags);
-    Sender peer;
-    peer.bytes = stream_bytes<F>(cp, text);
+    Peer peer{true, stream_bytes<F>(cp, text)};
     // Any number of bytes a call, but for units: half of one ends a string.
     if (!std::is_same_v<F, Unicode>)
-      for (int i = 0; i < 100; ++i) peer.script.push_back(1 + static_cast<int32_t>(random_() % 3));
-    LXStream* stream = open(locale, peer, LX_STREAM_READ);
-    Strings expected;
-    for (const Text& line : lines_of(cp, text, flags)) expected.push_back(F::encode(cp, line));
-    EXPECT_EQ(strings<F>(stream, locale, peer, flags, [] { return 300; }), expected);
+      for (int i = 0; i < 100; ++i) peer.script.push_back(1 + static_cast<int32_t>(random() % 3));
+    LXStream* stream = open(locale, peer);
+    EXPECT_EQ(strings<F>(stream, locale, peer, flags, [] { return 300; }), lines_of<F>(cp, text, flags));
 
     // In rooms of any size and with failures, the text comes in pieces.
     peer.given = peer.calls = 0;
     peer.script = random_script(60);
-    const auto any_size = [&] { return 6 + static_cast<int32_t>(random_() % 9); };
-    const Strings pieces = strings<F>(stream, locale, peer, flags & ~LX_DROP_RETURNS, any_size);
-    EXPECT_EQ(joined(cp, pieces), joined(cp, Strings{F::encode(cp, text)}));
+    const auto any_size = [&] { return 6 + static_cast<int32_t>(random() % 9); };
+    const auto pieces = strings<F>(stream, locale, peer, flags & ~LX_DROP_RETURNS, any_size);
+    EXPECT_EQ(joined(cp, pieces), joined(cp, lines_of<F>(cp, text, 0)));
     EXPECT_EQ(LXCloseStream(stream, locale), 1);
   };
-  for (const TinyCodepage& cp : codepages_) {
-    SCOPED_TRACE(cp.file.name);
-    for (int round = 0; round < 150; ++round) in_all_forms([&](auto form) { check(form, cp); });
-  }
+  in_all_codepages([&](const TinyCodepage& cp, LXLocale* locale) {
+    for (int round = 0; round < 150; ++round) in_all_forms([&](const auto& form) { check(form, cp, locale); });
+  });
 }
 
-TEST_F(Streams, ModesAndMemory) {
-  LXLocale* locale = library_.locale(codepages_[1]);
-  Receiver peer;
+TEST_F(Streams, ModesAndFailingFrees) {
+  LXLocale* locale = library.locale(case_codepage("SJIS"));
+  Peer peer{false};
   EXPECT_EQ(LXOpenStream(locale, Peer::transfer, &peer, 0x80000052u), nullptr);
   EXPECT_EQ(LXGetError(locale), LX_E_INVALID);
-  library_.hooks().fail_at(1);
-  EXPECT_EQ(LXOpenStream(locale, Peer::transfer, &peer, LX_STREAM_WRITE), nullptr);
-  EXPECT_EQ(LXGetError(locale), LX_E_MEMORY);
-  LXStream* stream = open(locale, peer, LX_STREAM_WRITE);
-  library_.hooks().fail_frees(true);
+  LXStream* stream = open(locale, peer);
+  library.hooks().fail_frees(true);
   EXPECT_EQ(LXCloseStream(stream, locale), 0);
   EXPECT_EQ(LXGetError(locale), LX_E_FREE);
-  library_.hooks().fail_frees(false);
+  library.hooks().fail_frees(false);
 }
 
 }  // namespace
+}  // namespace lx::test

@@ -15,6 +15,7 @@ namespace {
 
 namespace fmt = format::codepage;
 namespace words = format::language;
+namespace lands = format::territory;
 
 void add_pair(TinyCodepage* cp, uint32_t half, uint32_t full) {
   ByteString& payload = cp->file.sections[0];
@@ -114,6 +115,18 @@ ByteString kana_language(bool long_names) {
   return payload;
 }
 
+ByteString elsewhere() {
+  const Bytes built_in = kBuiltInTerritory.sections.section[0];
+  ByteString payload(built_in.data, built_in.data + built_in.size);
+  const uint16_t separators[] = {',', '.', ';', ',', 0xE0};
+  for (size_t i = 0; i < std::size(separators); ++i)
+    put_le16(payload.data() + 2 * (lands::kSeparators + i), separators[i]);
+  put_le16(payload.data() + 2 * lands::kNumbers, 3);
+  put_le16(payload.data() + 2 * lands::kFlags, 0);
+  put_le16(payload.data() + le16(payload.data() + 2 * (lands::kInternationalCurrency - 1)), 0x3041);
+  return payload;
+}
+
 /// Gives the characters of several bytes of a loaded codepage their other case.
 void set_cases(const TinyCodepage& cp, LXLocale* in) {
   for (const TinyCharacter& c : cp.characters) {
@@ -126,6 +139,10 @@ void set_cases(const TinyCodepage& cp, LXLocale* in) {
 }
 
 }  // namespace
+
+Units line_ends(const TinyCodepage& cp) {
+  return cp.shift ? Units{0x0A, 2, 3, 1} : Units{0x0A, 0x0D, 0x0B, 0x0C};
+}
 
 const std::vector<TinyCodepage>& case_codepages() {
   static const std::vector<TinyCodepage> all = [] {
@@ -140,6 +157,9 @@ const std::vector<TinyCodepage>& case_codepages() {
     for (const auto& [place, name] : {std::pair(0, "SINGLE"), {2, "EUC"}, {3, "FOUR"}})
       made[static_cast<size_t>(place)].file.name = name;
     add_pair(&made.back(), 0x8141, '!');
+    for (TinyCodepage& cp : made)
+      for (size_t i = 0; i < 4; ++i)
+        cp.file.sections[0][fmt::kLineEnds + i] = static_cast<uint8_t>(cp.find(line_ends(cp)[i])->code);
     return made;
   }();
   return all;
@@ -203,17 +223,16 @@ CaseLibrary::CaseLibrary(const SortBuilder& sort) {
   // The control file lists identifiers in ascending order.
   std::sort(files.begin(), files.end(), [](const auto& a, const auto& b) { return a.id < b.id; });
   directory_.write_locale(files);
-  std::vector<ControlRecord> records{{1, LX_LANGUAGE, "English"},
-                                     {2, LX_LANGUAGE, "Special"},
-                                     {3, LX_LANGUAGE, "Kana"},
-                                     {4, LX_LANGUAGE, "Long"},
-                                     {840, LX_TERRITORY, "UnitedStates"}};
+  std::vector<ControlRecord> records{{1, LX_LANGUAGE, "English"},      {2, LX_LANGUAGE, "Special"},
+                                     {3, LX_LANGUAGE, "Kana"},         {4, LX_LANGUAGE, "Long"},
+                                     {276, LX_TERRITORY, "Elsewhere"}, {840, LX_TERRITORY, "UnitedStates"}};
   for (const auto& file : files) records.push_back({file.id, LX_CODEPAGE, file.name});
   records.push_back({1, LX_SORT, "Test"});
   directory_.write("control.nls", control_file(records));
   directory_.write("la_00002.nls", object_file({special_language()}));
   directory_.write("la_00003.nls", object_file({kana_language(false)}));
   directory_.write("la_00004.nls", object_file({kana_language(true)}));
+  directory_.write("te_00276.nls", object_file({elsewhere()}));
   directory_.write("so_00001.nls", object_file({sort.payload()}));
   if (LXInit(directory_.path().c_str(), Hooks::allocate, Hooks::release, &hooks_, LX_NO_DEFAULTS) != LX_OK)
     throw std::runtime_error("LXInit failed");

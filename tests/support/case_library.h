@@ -6,6 +6,7 @@
 #include <string>
 #include <vector>
 
+#include "support/forms.h"
 #include "support/hooks.h"
 #include "support/object_files.h"
 #include "support/sort_builder.h"
@@ -17,6 +18,9 @@ namespace lx::test {
 /// SJIS where "!" has a "half-width" form of two bytes.
 const std::vector<TinyCodepage>& case_codepages();
 const TinyCodepage& case_codepage(const std::string& name);
+
+/// The line feed, the carriage return and the two further line ends of one of these codepages.
+Units line_ends(const TinyCodepage& cp);
 
 struct SpecialMapping {
   uint16_t first, second, result1, result2;  // second and result2 0 for none
@@ -33,7 +37,8 @@ TestWeight special(uint16_t weight);
 SortBuilder example_sort();
 
 /// Languages: English; Special; Kana, whose names begin with kana; Long, whose days run together besides, and
-/// which says AM in the afternoon. The sort is called Test.
+/// which says AM in the afternoon. The territory Elsewhere, 276, has other separators, one of which is no ASCII,
+/// and a kana for a currency. The sort is called Test.
 class CaseLibrary {
  public:
   explicit CaseLibrary(const SortBuilder& sort = example_sort());

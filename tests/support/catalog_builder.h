@@ -1,26 +1,19 @@
-// Message catalogs built in memory, for this machine's byte order or the other one.
+// Message catalogs as the catalog compiler packs them.
 #pragma once
 
-#include <cstdint>
+#include <map>
 #include <string>
-#include <utility>
-#include <vector>
 
-#include "core/lxcatformat.h"
+#include "catalog_file.h"
 #include "support/object_files.h"
 
 namespace lx::test {
 
-struct CatalogSet {
-  uint32_t number;
-  std::vector<std::pair<uint32_t, std::string>> messages;  // each gets its null
-};
+using CatalogSets = std::map<uint32_t, std::map<uint32_t, std::string>>;
 
-/// Header, set records, then the index and the texts of each set.
-ByteString catalog_file(const std::vector<CatalogSet>& sets, const std::string& locale = "",
-                        bool other_order = false);
-
-/// Changes one integer of a catalog for this machine.
-void put_catalog_word(ByteString* file, size_t offset, uint32_t value);
+inline ByteString catalog_file(const CatalogSets& sets, const std::string& locale = "") {
+  const std::string file = lexicor_gencat::pack_catalog({locale, lexicor_gencat::native_byte_order(), sets});
+  return ByteString(file.begin(), file.end());
+}
 
 }  // namespace lx::test

@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <cstdio>
 #include <ctime>
+#include <memory>
 #include <string>
 #include <utility>
 #include <vector>
@@ -50,7 +51,12 @@ inline ShiftStates states;
   static constexpr auto read_long = LXStringToLong##FORM;        \
   static constexpr auto read_double = LXStringToDouble##FORM;    \
   static constexpr auto write_time = LXTimeToString##FORM;       \
-  static constexpr auto read_time = LXStringToTime##FORM
+  static constexpr auto read_time = LXStringToTime##FORM;        \
+  static constexpr auto set_item = LXSetLocaleTextInfo##FORM;    \
+  static constexpr auto get_item = LXGetLocaleTextInfo##FORM;    \
+  static constexpr auto read_string = LXReadString##FORM;        \
+  static constexpr auto get_eol = LXGetEol##FORM;                \
+  static constexpr auto put_eol = LXPutEol##FORM
 
 struct Plain {
   LX_TEST_FORM("plain", char, LXWChar, LXStr, , );
@@ -158,6 +164,15 @@ struct Ex {
                            uint32_t f) {
     return LXStringToTimeEx(in, time, t, states.text, n, by, states.second, m, f);
   }
+  static int32_t set_item(In in, int32_t item, const char* t, int32_t n, int32_t f) {
+    return LXSetLocaleTextInfoEx(in, item, t, states.text, n, f);
+  }
+  static int32_t get_item(In in, int32_t item, char* to, int32_t size, int32_t f) {
+    return LXGetLocaleTextInfoEx(in, item, to, states.output, size, f);
+  }
+  static constexpr auto read_string = LXReadStringEx;
+  static constexpr auto get_eol = LXGetEolEx;
+  static constexpr auto put_eol = LXPutEolEx;
   static int32_t truncate(In in, char* t, int32_t size, uint32_t f) {
     return LXTruncateStringEx(in, t, states.text, size, f);
   }
@@ -201,19 +216,22 @@ inline Units units(const std::string& ascii) {
 }
 /// What `put(buffer, room)` writes.
 template <class Unit, class Put>
-Text<Unit> made(Put put) {
-  Unit buffer[4000];
-  return Text<Unit>(buffer, static_cast<size_t>(std::max(put(buffer, 4000), 0)));
+Text<Unit> made(Put put, size_t room = 1000) {
+  const std::unique_ptr<Unit[]> buffer(new Unit[room]);
+  const int32_t units = put(buffer.get(), static_cast<int32_t>(room));
+  return Text<Unit>(buffer.get(), static_cast<size_t>(std::max(units, 0)));
 }
 template <class F>
 Text<typename F::Unit> encode(const F& form, LXLocale* l, const Units& text) {
   return made<typename F::Unit>(
-      [&](auto* to, int32_t size) { return form.encode(l, to, size, text.data(), count_of(text), 0); });
+      [&](auto* to, int32_t size) { return form.encode(l, to, size, text.data(), count_of(text), 0); },
+      6 * text.size());
 }
 template <class F>
 Units decode(const F& form, LXLocale* l, const Text<typename F::Unit>& text) {
   return made<LXUChar>(
-      [&](LXUChar* to, int32_t size) { return form.decode(to, size, l, text.data(), count_of(text), 0); });
+      [&](LXUChar* to, int32_t size) { return form.decode(to, size, l, text.data(), count_of(text), 0); },
+      text.size());
 }
 /// A text for a message.
 inline std::string shown(const Units& text) {

@@ -1,35 +1,24 @@
 // Comparison by code value: random pairs of similar texts in every codepage against a model on Unicode values,
 // with every length that cuts; memory that fails.
-#include <gtest/gtest.h>
-
-#include <algorithm>
-#include <random>
-
 #include "codepage/lxunicode.h"
-#include "support/case_library.h"
-#include "support/encoded_text.h"
+#include "support/case_test.h"
 
 namespace lx::test {
 namespace {
 
 constexpr uint32_t kCase = LX_CASE_INSENSITIVE, kWidth = LX_WIDTH_INSENSITIVE, kBlanks = LX_IGNORE_BLANKS;
 
-int sign(int32_t value) {
-  return (value > 0) - (value < 0);
-}
 std::string encoded(const TinyCodepage& cp, const Units& text, size_t from = 0) {
   return cp.encode({text.begin() + static_cast<ptrdiff_t>(from), text.end()});
 }
 
-class Compare : public testing::Test {
+class Compare : public CaseTest {
  protected:
-  void TearDown() override { EXPECT_TRUE(library_.close()); }
-
   /// A character of few, so that two are often equal up to case and width.
   LXUChar random_char(const TinyCodepage& cp) {
     constexpr LXUChar kOften[] = {'a', 'A', 'z', 'Z', '_', '/', 0xFF21, 0xE0, 0xC0, 0x3041, 0xFF71, 0x30A2};
-    const LXUChar u = kOften[random_() % std::size(kOften)];
-    return cp.find(u) != nullptr ? u : random_() % 2 == 0 ? 'a' : 'A';
+    const LXUChar u = any_of(kOften);
+    return cp.find(u) != nullptr ? u : random() % 2 == 0 ? 'a' : 'A';
   }
   static const std::string& folded(const TinyCodepage& cp, LXUChar u, uint32_t options) {
     static std::map<std::tuple<const TinyCodepage*, LXUChar, uint32_t>, std::string> known;
@@ -53,18 +42,18 @@ class Compare : public testing::Test {
   }
   /// A text and one that is like it.
   std::pair<Units, Units> random_pair(const TinyCodepage& cp, uint32_t options, size_t most) {
-    Units a(random_() % most, 0), b;
+    Units a(below(most), 0), b;
     for (LXUChar& u : a) u = random_char(cp);
     for (LXUChar u : a) {
       const LXUChar other = random_char(cp);
-      b.push_back(random_() % 64 == 0 || folded(cp, u, options) == folded(cp, other, options) ? other : u);
+      b.push_back(random() % 64 == 0 || folded(cp, u, options) == folded(cp, other, options) ? other : u);
     }
-    if (random_() % 3 == 0) b.resize(random_() % (b.size() + 1));
+    if (random() % 3 == 0) b.resize(random() % (b.size() + 1));
     return {a, b};
   }
   /// Packed codes and Unicode.
   void in_units(const TinyCodepage& cp, const Units& a, const Units& b, uint32_t options) {
-    LXLocale* const in = library_.locale(cp);
+    LXLocale* const in = library.locale(cp);
     Units f = a, g = b;
     for (Units* text : {&f, &g})
       for (LXUChar& u : *text)
@@ -79,23 +68,20 @@ class Compare : public testing::Test {
       EXPECT_EQ(compared(kWide) == 0, f == g);
     }
   }
-
-  CaseLibrary library_;
-  std::mt19937 random_{1};
 };
 
 TEST_F(Compare, AllFormsFollowTheModel) {
   for (const char* name : {"SINGLE", "SJIS", "UTF8", "SHIFT"})
     for (unsigned n = 0; n < 2400 && !HasFailure(); ++n) {
       const TinyCodepage& cp = case_codepage(name);
-      LXLocale* const in = library_.locale(cp);
+      LXLocale* const in = library.locale(cp);
       const uint32_t options = n % 3 == 0 ? 0 : n % 3 == 1 ? kCase : kWidth;
       auto [a, b] = random_pair(cp, options, n % 15 == 0 ? 300 : 20);
       const std::string x = encoded(cp, a), y = encoded(cp, b);
       SCOPED_TRACE(cp.file.name + " " + shown(a) + " " + shown(b) + " " + std::to_string(options));
       // The first text ends anywhere, in a block of exactly its size. Whether a shift byte or the caller tells
       // the state makes no difference.
-      const size_t cut = random_() % 2 == 0 ? x.size() : random_() % (x.size() + 1);
+      const size_t cut = random() % 2 == 0 ? x.size() : random() % (x.size() + 1);
       const bool started = cp.shift && cut != 0 && x[0] == cp.shift_out;
       const std::vector<char> block(x.begin() + started, x.begin() + static_cast<ptrdiff_t>(cut));
       const int32_t bytes = count_of(block);
@@ -119,12 +105,12 @@ TEST_F(Compare, AllFormsFollowTheModel) {
 TEST_F(Compare, MemoryThatFails) {
   const TinyCodepage& single = case_codepage("SINGLE");
   const std::string text(300, 'x'), blank = text + " ";
-  LXLocale *const in = library_.locale(single), *const mapping = library_.locale(single, "Special");
-  library_.hooks().fail_at(1);
+  LXLocale *const in = library.locale(single), *const mapping = library.locale(single, "Special");
+  library.hooks().fail_at(1);
   EXPECT_EQ(LXStrcmp(in, blank.c_str(), -1, text.c_str(), -1, kBlanks), 1);  // the blank counts
   EXPECT_EQ(LXGetError(in), LX_OK);
   for (size_t failing : {1u, 2u, 3u}) {
-    library_.hooks().fail_at(failing);
+    library.hooks().fail_at(failing);
     EXPECT_EQ(LXStrcmp(mapping, blank.c_str(), -1, text.c_str(), -1, kCase), failing == 3 ? 1 : 0);
     EXPECT_EQ(LXGetError(mapping), failing == 3 ? LX_OK : LX_E_MEMORY);
   }

