@@ -205,8 +205,8 @@ void check_formatting_characters(const CodepageSource& source) {
   for (uint32_t control = 0; source.ascii && control < 0x20; ++control) EXPECT_EQ(bytes.at(control), control);
 }
 
-/// The object of a source, whose dump compiles to the same object. That is a matter of course when it says all
-/// that the source said.
+/// The object of a source. Its dump says what the source said of the codepage itself, and compiles to the same
+/// object, which is a matter of course when it says the same of all characters.
 CompiledObject compile(CodepageSource source, uint16_t id = 1) {
   source.source.clear();
   std::stringstream text;
@@ -214,6 +214,8 @@ CompiledObject compile(CodepageSource source, uint16_t id = 1) {
   const ObjectName name{ObjectType::kCodepage, id, source.name, 0};
   const CompiledObject object = compile_object(text, "test.ucm", name, {});
   std::istringstream dump(dump_object(read_object(object.bytes, "object"), name, nullptr, "object"));
+  const auto head = [](const std::string& ucm) { return ucm.substr(0, ucm.find("CHARMAP")); };
+  EXPECT_EQ(head(dump.str()), head(text.str()));
   if (dump.str() == text.str()) return object;
   const CompiledObject again = compile_object(dump, "dump", name, {});
   EXPECT_TRUE(again.left_out.empty());
