@@ -9,7 +9,6 @@
 
 namespace {
 
-constexpr uint32_t kModes[] = {0, LX_CATALOG_LOAD};
 constexpr size_t kMostNumbers = 16;
 
 /// The words of the file that may be numbers of sets and messages, and some that mostly are none.
@@ -18,19 +17,6 @@ std::vector<uint32_t> numbers_in(const uint8_t* data, size_t size) {
   for (size_t at = lx::format::catalog::kHeaderBytes; at + 4 <= size && numbers.size() < kMostNumbers; at += 4)
     numbers.push_back(lx::le32(data + at));
   return numbers;
-}
-
-void fetch_all(LXCatalog* catalog, const std::vector<uint32_t>& numbers) {
-  for (const uint32_t set : numbers) {
-    for (const uint32_t number : numbers) {
-      char text[64];
-      LXUChar units[64];
-      const int32_t code = LXGetMessage(catalog, set, number, text, sizeof(text), nullptr);
-      if (code != LX_OK && code != LX_E_CATALOG && code != LX_E_MESSAGE) abort();
-      if (memchr(text, 0, sizeof(text)) == nullptr) abort();
-      if (LXGetMessageU(catalog, set, number, units, std::size(units), nullptr) != code) abort();
-    }
-  }
 }
 
 }  // namespace
@@ -43,10 +29,17 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
   if (started != LX_W_DEFAULTS || locale == nullptr) abort();
   directory.write("catalog", {data, data + size});
   const std::vector<uint32_t> numbers = numbers_in(data, size);
-  for (const uint32_t mode : kModes) {
+  for (const uint32_t mode : {0u, uint32_t{LX_CATALOG_LOAD}}) {
     LXCatalog* catalog = LXOpenCatalog(locale, nullptr, path.c_str(), mode);
-    if (catalog == nullptr) continue;
-    fetch_all(catalog, numbers);
+    for (size_t i = 0; catalog != nullptr && i < numbers.size() * numbers.size(); ++i) {
+      const uint32_t set = numbers[i / numbers.size()], number = numbers[i % numbers.size()];
+      char text[64];
+      LXUChar units[64];
+      const int32_t code = LXGetMessage(catalog, set, number, text, sizeof(text), nullptr);
+      if (code != LX_OK && code != LX_E_CATALOG && code != LX_E_MESSAGE) abort();
+      if (memchr(text, 0, sizeof(text)) == nullptr) abort();
+      if (LXGetMessageU(catalog, set, number, units, std::size(units), nullptr) != code) abort();
+    }
     LXCloseCatalog(catalog);
   }
   return 0;

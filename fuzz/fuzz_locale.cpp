@@ -10,18 +10,6 @@ namespace {
 constexpr const char* kFiles[] = {"la_00001.nls", "te_00840.nls", "so_00001.nls", "control.nls", "alias.txt"};
 constexpr int32_t kUnits = 0x10000;
 
-void read_items(LXLocale* locale) {
-  for (int32_t item = 1; item <= LX_ITEM_LOCALE_STRING; ++item) {
-    char bytes[64];
-    LXUChar units[64];
-    for (int32_t flags : {0, int32_t{LX_TERRITORY_VALUES}}) {
-      LXGetLocaleNumInfo(locale, item, flags);
-      LXGetLocaleTextInfo(locale, item, bytes, sizeof(bytes), flags);
-      LXGetLocaleTextInfoU(locale, item, units, 64, flags);
-    }
-  }
-}
-
 /// Every character, with its neighbours in pairs.
 void use_text(LXLocale* locale) {
   static LXUChar units[kUnits], mapped[2 * kUnits];
@@ -39,8 +27,15 @@ void use_text(LXLocale* locale) {
   }
 }
 
-void write_values(LXLocale* locale) {
+void use_items(LXLocale* locale) {
   char text[128];
+  LXUChar units[64];
+  for (int32_t item = 1; item <= LX_ITEM_LOCALE_STRING; ++item)
+    for (int32_t flags : {0, int32_t{LX_TERRITORY_VALUES}}) {
+      LXGetLocaleNumInfo(locale, item, flags);
+      LXGetLocaleTextInfo(locale, item, text, sizeof(text), flags);
+      LXGetLocaleTextInfoU(locale, item, units, 64, flags);
+    }
   LXLongToString(locale, -1234567890, text, sizeof(text), LX_TERMINATE);
   LXDoubleToString(locale, -1.5e300, text, sizeof(text), LX_TERMINATE);
   for (double value : {-1234567.891, 0.5}) LXCurrencyToString(locale, value, text, sizeof(text), LX_TERMINATE);
@@ -70,12 +65,8 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     LXReleaseLocale(LXGetLocale(name, LX_FALLBACK, nullptr));
   LXLocale* locale = LXGetLocale("English@Default", 0, nullptr);
   if (locale == nullptr) locale = LXGetLocale("English", 0, nullptr);
-  if (locale != nullptr) {
-    read_items(locale);
-    use_text(locale);
-    write_values(locale);
-    LXReleaseLocale(locale);
-  }
+  if (locale != nullptr) use_text(locale), use_items(locale);
+  LXReleaseLocale(locale);
   int32_t rc = LX_OK;
   for (int32_t type = LX_LANGUAGE; type <= LX_SORT; ++type)
     for (int32_t id = 0; id <= 0xFFFF; id += 257)

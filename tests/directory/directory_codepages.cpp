@@ -5,21 +5,14 @@
 #include "compile.h"
 
 namespace lx::test {
-namespace {
-
-std::string file_of(const std::string& name) {
-  return std::string(LEXICOR_DATA_DIR) + "/codepages/" + name + ".ucm";
-}
-
-}  // namespace
-
 const std::vector<ShippedCodepage>& shipped_codepages() {
   static const std::vector<ShippedCodepage> codepages = [] {
     std::vector<ShippedCodepage> all;
     for (const lexicor_data::ObjectName& object : lexicor_data::read_source_control(LEXICOR_DATA_DIR).objects)
       if (object.type == lexicor_data::ObjectType::kCodepage) {
-        std::ifstream in(file_of(object.name));
-        all.push_back({object.id, lexicor_data::read_ucm(in, file_of(object.name))});
+        const std::string file = LEXICOR_DATA_DIR "/" + source_file_name(object);
+        std::ifstream in(file);
+        all.push_back({object.id, lexicor_data::read_ucm(in, file)});
       }
     return all;
   }();

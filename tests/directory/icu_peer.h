@@ -2,6 +2,7 @@
 #pragma once
 
 #include <unicode/udat.h>
+#include <unicode/unistr.h>
 #include <unicode/ustring.h>
 
 #include <string>
@@ -21,12 +22,8 @@ Text16 icu(Function function, Arguments... arguments) {
 }
 
 inline std::string utf8(const Text16& text) {
-  std::string out(3 * text.size(), '\0');
-  UErrorCode error = U_ZERO_ERROR;
-  int32_t bytes = 0;
-  u_strToUTF8(out.data(), static_cast<int32_t>(out.size()), &bytes, text.data(),
-              static_cast<int32_t>(text.size()), &error);
-  return out.substr(0, static_cast<size_t>(bytes));
+  std::string out;
+  return ::icu::UnicodeString(text.data(), static_cast<int32_t>(text.size())).toUTF8String(out);
 }
 
 /// ASCII, or 16-bit Unicode of another type.

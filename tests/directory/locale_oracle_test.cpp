@@ -14,6 +14,7 @@
 #include <ctime>
 #include <map>
 #include <random>
+#include <set>
 
 #include "compile.h"
 #include "directory/icu_peer.h"
@@ -34,26 +35,12 @@ using NumberPtr = IcuPtr<UNumberFormat, unum_close>;
 
 /// The ways in which what is written may differ, as locale_differences.txt explains them. What ICU is asked, or
 /// both texts, are changed accordingly.
-enum Kind {
-  kParentheses,
-  kSignSpace,
-  kCodeSpace,
-  kCurrency,
-  kMoneyGroups,
-  kCodeDigits,  // amounts
-  kOneLanguage,
-  kStandAlone,
-  kDayPeriods,
-  kEra,
-  kTwoDigitDay,
-  kKinds  // times
-};
-constexpr const char* kNames[kKinds] = {"parentheses",  "sign_space",  "code_space",   "currency",
-                                        "money_groups", "code_digits", "one_language", "stand_alone",
-                                        "day_periods",  "era",         "two_digit_day"};
-using Kinds = uint32_t;
-constexpr bool has(Kinds kinds, Kind kind) {
-  return (kinds >> kind & 1) != 0;
+const std::vector<std::string> kKinds = {
+    "parentheses",  "sign_space",  "code_space",  "currency", "money_groups", "code_digits",  // amounts
+    "one_language", "stand_alone", "day_periods", "era",      "two_digit_day"};               // times
+using Kinds = std::set<std::string>;
+bool has(const Kinds& kinds, const char* kind) {
+  return kinds.count(kind) != 0;
 }
 
 Text16 with(Text16 text, const Text16& from, const Text16& to) {
@@ -63,11 +50,11 @@ Text16 with(Text16 text, const Text16& from, const Text16& to) {
 }
 
 /// A text of either side without what the kinds are about. `code`: that of the currency.
-Text16 level(Text16 text, Kinds kinds, const Text16& code) {
-  if (has(kinds, kCodeSpace) && !code.empty()) text = with(with(text, code + u" ", code), u" " + code, code);
-  if (has(kinds, kSignSpace)) text = with(text, u" -", u"-");
-  if (has(kinds, kTwoDigitDay)) text = with(text, u" 0", u" ");
-  if (has(kinds, kParentheses) && text.front() == '(') text = u"-" + text.substr(1, text.size() - 2);
+Text16 level(Text16 text, const Kinds& kinds, const Text16& code) {
+  if (has(kinds, "code_space") && !code.empty()) text = with(with(text, code + u" ", code), u" " + code, code);
+  if (has(kinds, "sign_space")) text = with(text, u" -", u"-");
+  if (has(kinds, "two_digit_day")) text = with(text, u" 0", u" ");
+  if (has(kinds, "parentheses") && text.front() == '(') text = u"-" + text.substr(1, text.size() - 2);
   return with(with(text, u" inf", u"inf"), u" nan", u"nan");
 }
 
@@ -82,17 +69,18 @@ class Differences {
   void compare_written(const std::string& place, const std::string& area, const Text16& ours, Peer peer,
                        const Text16& code = {}) {
     ++compared_;
-    const auto equal = [&](Kinds kinds) {
+    const auto equal = [&](const Kinds& kinds) {
       return level(ours, kinds, code) == level(ascii_signs(peer(kinds)), kinds, code);
     };
-    if (equal(0)) return;
-    Kinds kinds = (1U << kKinds) - 1;
-    const std::string example = utf8(ours) + " / " + utf8(peer(0));
+    if (equal({})) return;
+    Kinds kinds(kKinds.begin(), kKinds.end());
+    const std::string example = utf8(ours) + " / " + utf8(peer({}));
     if (!equal(kinds)) return listed_.add(place, area, example + " / " + utf8(peer(kinds)));
-    for (int kind = kKinds; kind-- > 0;)
-      if (equal(kinds & ~(1U << kind))) kinds &= ~(1U << kind);
-    for (int kind = 0; kind < kKinds; ++kind)
-      if (has(kinds, static_cast<Kind>(kind))) found_[{kNames[kind], area}].emplace(place, example);
+    for (auto kind = kKinds.rbegin(); kind != kKinds.rend(); ++kind) {
+      kinds.erase(*kind);
+      if (!equal(kinds)) kinds.insert(*kind);
+    }
+    for (const std::string& kind : kinds) found_[{kind, area}].emplace(place, example);
   }
   /// Where a kind befalls a few, the list names them.
   void expect_listed() {
@@ -119,7 +107,7 @@ struct NumberPeer {
   Text16 code = widen(item(l, LX_ITEM_INTERNATIONAL_CURRENCY));
   std::map<std::pair<int, Kinds>, NumberPtr> formats{};
 
-  Text16 operator()(UNumberFormatStyle style, int32_t digits, double value, Kinds kinds) {
+  Text16 operator()(UNumberFormatStyle style, int32_t digits, double value, const Kinds& kinds) {
     NumberPtr& format = formats[{style, kinds}];
     if (!format) format = open(style, kinds);
     const bool bare = style == UNUM_DECIMAL;
@@ -135,23 +123,23 @@ struct NumberPeer {
     });
   }
 
-  NumberPtr open(UNumberFormatStyle style, Kinds kinds) const {
+  NumberPtr open(UNumberFormatStyle style, const Kinds& kinds) const {
     UErrorCode error = U_ZERO_ERROR;
     NumberPtr format(unum_open(style, nullptr, 0, icu_locale(row.locale).c_str(), nullptr, &error));
     const auto symbol = [&](UNumberFormatSymbol which, const Text16& text) {
       unum_setSymbol(format.get(), which, text.data(), static_cast<int32_t>(text.size()), &error);
     };
     const bool money = style != UNUM_DECIMAL;
-    if (has(kinds, kCurrency) && money) {
+    if (has(kinds, "currency") && money) {
       unum_setTextAttribute(format.get(), UNUM_CURRENCY_CODE, code.data(), 3, &error);
       if (style == UNUM_CURRENCY) symbol(UNUM_CURRENCY_SYMBOL, widen(item(l, LX_ITEM_CURRENCY)));
     }
-    if (has(kinds, kMoneyGroups) && money) {
+    if (has(kinds, "money_groups") && money) {
       const NumberPtr numbers = open(UNUM_DECIMAL, kinds);
       const int32_t size = unum_getAttribute(numbers.get(), UNUM_SECONDARY_GROUPING_SIZE);
       unum_setAttribute(format.get(), UNUM_SECONDARY_GROUPING_SIZE, size);
     }
-    if (has(kinds, kCodeDigits) && style == UNUM_CURRENCY_ISO)
+    if (has(kinds, "code_digits") && style == UNUM_CURRENCY_ISO)
       unum_setAttribute(format.get(), UNUM_FRACTION_DIGITS,
                         LXGetLocaleNumInfo(l, LX_ITEM_INTERNATIONAL_DIGITS, 0));
     symbol(UNUM_INFINITY_SYMBOL, u"inf"), symbol(UNUM_NAN_SYMBOL, u"nan");
@@ -169,7 +157,7 @@ void compare_numbers(const Territory& row, std::mt19937* random, Differences* di
   const auto compare = [&](const char* area, UNumberFormatStyle style, const Value& v) {
     differences->compare_written(
         row.name, area, widen(write(kUnicode, l, v)),
-        [&](Kinds kinds) { return peer(style, v.digits, v.number, kinds); }, peer.code);
+        [&](const Kinds& kinds) { return peer(style, v.digits, v.number, kinds); }, peer.code);
   };
   std::vector<double> values{0,     -0.0,      0.5,      -0.25,        7,     -8,       999,
                              -1000, 1234.5,    -12345,   99999.999999, 1.239, -0.001,   1e15,
@@ -191,17 +179,18 @@ struct TimePeer {
   const Territory& territory;
   std::map<std::pair<Text16, Kinds>, DatePtr> formats{};
 
-  Text16 operator()(UDateFormatStyle time, UDateFormatStyle date, Text16 pattern, UDate when, Kinds kinds) {
+  Text16 operator()(UDateFormatStyle time, UDateFormatStyle date, Text16 pattern, UDate when,
+                    const Kinds& kinds) {
     DatePtr& format = formats[{Text16{char16_t(time + 2), char16_t(date + 2)} + pattern, kinds}];
     if (!format) {
       const DatePtr own = open_date(time, date, icu_locale(territory.locale), pattern);
       pattern = icu([&](UChar* out, int32_t room, UErrorCode* error) {
         return udat_toPattern(own.get(), 0, out, room, error);
       });
-      if (has(kinds, kDayPeriods)) pattern = with(pattern, u"B", u"a");
-      if (has(kinds, kEra)) pattern = with(pattern, u"G ", u"");
-      if (has(kinds, kStandAlone)) pattern = with(pattern, u"EEEE", u"cccc");
-      const bool of_territory = territory.language == std::string(language.name) && !has(kinds, kOneLanguage);
+      if (has(kinds, "day_periods")) pattern = with(pattern, u"B", u"a");
+      if (has(kinds, "era")) pattern = with(pattern, u"G ", u"");
+      if (has(kinds, "stand_alone")) pattern = with(pattern, u"EEEE", u"cccc");
+      const bool of_territory = territory.language == std::string(language.name) && !has(kinds, "one_language");
       const char* const texts = of_territory ? territory.locale : language.locale;
       format = open_date(UDAT_PATTERN, UDAT_PATTERN, icu_locale(texts), pattern);
     }
@@ -238,7 +227,7 @@ void compare_times(const Language& language, const Territory& territory, std::mt
     EXPECT_EQ(ours("%c"), ours("%x") + u" " + ours("%X"));
     EXPECT_EQ(ours("%#c"), ours("%#x") + u" " + ours("%X"));
     for (const auto& area : areas)
-      differences->compare_written(place, area.area, ours(area.format), [&](Kinds kinds) {
+      differences->compare_written(place, area.area, ours(area.format), [&](const Kinds& kinds) {
         return peer(area.time, area.date, area.pattern, static_cast<UDate>(seconds) * 1000, kinds);
       });
   }

@@ -23,10 +23,20 @@ namespace {
 
 constexpr uint32_t kNone = 0xFFFFFFFF;
 
-/// A converter, character by character: kNone and an empty text where there is no mapping.
+using Convert = std::function<std::string(const std::string&)>;
+
+/// A converter, character by character between its bytes and UTF-16LE: empty where there is no mapping.
 struct Peer {
-  std::function<uint32_t(const std::string&)> to_unicode;  // none: there is no such converter
-  std::function<std::string(uint16_t)> from_unicode;
+  Convert decode, encode;  // none: there is no such converter
+
+  uint32_t to_unicode(const std::string& text) const {
+    const std::string unit = decode(text);
+    const auto byte = [&](size_t i) { return static_cast<uint32_t>(static_cast<uint8_t>(unit[i])); };
+    return unit.size() == 2 && unit != "\xFD\xFF" ? byte(0) | byte(1) << 8 : kNone;
+  }
+  std::string from_unicode(uint32_t u) const {
+    return encode({static_cast<char>(u), static_cast<char>(u >> 8)});
+  }
 };
 
 Peer icu_peer(const std::string& name) {
@@ -36,27 +46,23 @@ Peer icu_peer(const std::string& name) {
   ucnv_setFallback(converter.get(), 1);
   ucnv_setToUCallBack(converter.get(), UCNV_TO_U_CALLBACK_STOP, nullptr, nullptr, nullptr, &opened);
   ucnv_setFromUCallBack(converter.get(), UCNV_FROM_U_CALLBACK_STOP, nullptr, nullptr, nullptr, &opened);
-  const auto to_unicode = [converter](const std::string& text) {
-    UErrorCode status = U_ZERO_ERROR;
-    UChar units[8];
-    ucnv_resetToUnicode(converter.get());
-    const int32_t n =
-        ucnv_toUChars(converter.get(), units, 8, text.data(), static_cast<int32_t>(text.size()), &status);
-    return U_SUCCESS(status) && n == 1 && units[0] != 0xFFFD ? units[0] : kNone;
+  const auto convert = [converter](bool encode) {
+    return [converter, encode](const std::string& text) {
+      UErrorCode status = U_ZERO_ERROR;
+      char out[32];
+      UConverter* const c = converter.get();
+      const auto length = static_cast<int32_t>(text.size());
+      const int32_t n =
+          encode ? ucnv_fromAlgorithmic(c, UCNV_UTF16_LittleEndian, out, 32, text.data(), length, &status)
+                 : ucnv_toAlgorithmic(UCNV_UTF16_LittleEndian, c, out, 32, text.data(), length, &status);
+      return U_SUCCESS(status) ? std::string(out, static_cast<size_t>(n)) : std::string();
+    };
   };
-  const auto from_unicode = [converter](uint16_t u) {
-    UErrorCode status = U_ZERO_ERROR;
-    char bytes[16];
-    const UChar unit = u;
-    ucnv_resetFromUnicode(converter.get());
-    const int32_t n = ucnv_fromUChars(converter.get(), bytes, sizeof(bytes), &unit, 1, &status);
-    return U_SUCCESS(status) ? std::string(bytes, static_cast<size_t>(n)) : std::string();
-  };
-  return {to_unicode, from_unicode};
+  return {convert(false), convert(true)};
 }
 
-/// Converts a text between glibc's charsets; empty where it has none of these or a character does not convert.
-std::function<std::string(std::string)> iconv_of(const std::string& to, const std::string& from) {
+/// Converts a text between glibc's charsets; nothing where it has none of these.
+Convert iconv_of(const std::string& to, const std::string& from) {
   const iconv_t opened = iconv_open(to.c_str(), from.c_str());
   if (opened == reinterpret_cast<iconv_t>(-1)) return {};
   return [converter = std::shared_ptr<void>(opened, iconv_close)](std::string text) {
@@ -70,37 +76,28 @@ std::function<std::string(std::string)> iconv_of(const std::string& to, const st
     return std::string(out, out_pointer);
   };
 }
-Peer iconv_peer(const std::string& name) {
-  const auto to = iconv_of("UCS-2LE", name), from = iconv_of(name, "UCS-2LE");
-  if (!to || !from) return {};
-  const auto to_unicode = [to](const std::string& text) {
-    const std::string unit = to(text);
-    if (unit.size() != 2) return kNone;
-    const uint32_t u = static_cast<uint8_t>(unit[0]) | static_cast<uint32_t>(static_cast<uint8_t>(unit[1]))
-                                                           << 8;
-    return u != 0xFFFD ? u : kNone;
-  };
-  return {to_unicode, [from](uint16_t u) { return from({static_cast<char>(u), static_cast<char>(u >> 8)}); }};
-}
 
 /// The library's own conversion, in the same shape.
 Peer library_peer(const ShippedCodepage& codepage) {
   const std::shared_ptr<LXLocale> locale = locale_with(codepage.source.name);
   const std::string substitution(1, static_cast<char>(codepage.source.substitution));
+  const auto decode = [locale](const std::string& text) {
+    std::string bytes;
+    for (LXUChar u : test::to_unicode(locale.get(), text))
+      bytes += {static_cast<char>(u), static_cast<char>(u >> 8)};
+    return bytes;
+  };
   std::set<uint32_t> substitutes_for;
   if (codepage.source.utf8) substitutes_for.insert(codepage.source.substitution);
   for (const lexicor_data::Mapping& mapping : codepage.source.mappings)
     if (mapping.precision != 3 && mapping.bytes == 1 && mapping.code == codepage.source.substitution)
       substitutes_for.insert(mapping.unicode);
-  const auto to_unicode = [locale](const std::string& text) {
-    const Units units = test::to_unicode(locale.get(), text);
-    return units.size() == 1 && units[0] != 0xFFFD ? units[0] : kNone;
-  };
-  const auto from_unicode = [=](uint16_t u) {
+  const auto encode = [=](const std::string& unit) {
+    const auto u = static_cast<LXUChar>(static_cast<uint8_t>(unit[0]) | static_cast<uint8_t>(unit[1]) << 8);
     const std::string text = test::from_unicode(locale.get(), {u});
     return text == substitution && substitutes_for.count(u) == 0 ? std::string() : text;
   };
-  return {to_unicode, from_unicode};
+  return {decode, encode};
 }
 
 bool is_private(uint32_t u) {
@@ -135,24 +132,6 @@ std::string shown(const std::string& bytes) {
   return testing::PrintToString(bytes);
 }
 
-/// Counts of differences by "peer codepage direction kind", with examples of each: "character:ours/theirs".
-class Differences {
- public:
-  template <class Value>
-  void add(const std::string& line, const std::string& character, const Value& ours, const Value& theirs) {
-    auto& [count, examples] = groups_[line];
-    if (count++ < 6) examples += character + ":" + shown(ours) + "/" + shown(theirs) + " ";
-  }
-  void expect_listed() const {
-    ListedDifferences all(5);
-    for (const auto& [line, group] : groups_) all.add(line + " " + std::to_string(group.first), group.second);
-    all.expect_listed("peer_differences.txt");
-  }
-
- private:
-  std::map<std::string, std::pair<size_t, std::string>> groups_;
-};
-
 /// Calls `visit(text)` for every character that the codepage's bytes can form: the first bytes of longer
 /// characters with all second bytes, and of those that are longer still the ones that the source maps.
 void for_each_text(const ShippedCodepage& codepage, const std::function<void(const std::string&)>& visit) {
@@ -170,35 +149,31 @@ void for_each_text(const ShippedCodepage& codepage, const std::function<void(con
 }
 
 void compare(const ShippedCodepage& codepage, const std::string& peer_name, const Peer& peer,
-             Differences* differences) {
+             ListedDifferences* differences) {
   const Peer library = library_peer(codepage);
-  const std::string head = peer_name + " " + codepage.source.name + " ";
+  const std::string head = peer_name + " " + codepage.source.name;
   for_each_text(codepage, [&](const std::string& text) {
-    const uint32_t ours = library.to_unicode(text);
-    const uint32_t theirs = peer.to_unicode(text);
+    const uint32_t ours = library.to_unicode(text), theirs = peer.to_unicode(text);
     if (ours == theirs) return;
     const char* kind = is_private(ours) || is_private(theirs) ? "private-use"
                        : ours == kNone                        ? "only-theirs"
                        : theirs == kNone                      ? "only-ours"
                                                               : "other-value";
-    differences->add(head + "to-unicode " + kind, shown(text), ours, theirs);
+    differences->add(head, std::string("to-unicode ") + kind,
+                     shown(text) + ":" + shown(ours) + "/" + shown(theirs));
   });
   for (uint32_t u = 0; u <= 0xFFFF; ++u) {
     if (u >= 0xD800 && u <= 0xDFFF) continue;
-    const std::string ours = library.from_unicode(static_cast<uint16_t>(u));
-    const std::string theirs = peer.from_unicode(static_cast<uint16_t>(u));
+    const std::string ours = library.from_unicode(u), theirs = peer.from_unicode(u);
     if (ours == theirs) continue;
+    std::string place = head, kind = is_private(u) ? "private-use" : "other-bytes";
     if (!is_private(u) && ours.empty() != theirs.empty()) {
       const uint32_t read = ours.empty() ? peer.to_unicode(theirs) : library.to_unicode(ours);
-      const std::string side = ours.empty() ? "only-theirs" : "only-ours";
-      const bool one_way = read != u && read != kNone;
-      const std::string line = one_way ? peer_name + " * from-unicode " + side + "-" + family(u, read)
-                                       : head + "from-unicode " + side;
-      differences->add(line, codepage.source.name + " " + shown(u), ours, theirs);
-    } else {
-      const char* kind = is_private(u) ? "private-use" : "other-bytes";
-      differences->add(head + "from-unicode " + kind, shown(u), ours, theirs);
+      kind = ours.empty() ? "only-theirs" : "only-ours";
+      if (read != u && read != kNone) place = peer_name + " *", kind += "-" + family(u, read);
     }
+    differences->add(place, "from-unicode " + kind,
+                     codepage.source.name + " " + shown(u) + ":" + shown(ours) + "/" + shown(theirs));
   }
 }
 
@@ -206,8 +181,7 @@ void compare(const ShippedCodepage& codepage, const std::string& peer_name, cons
 std::string icu_name(const ShippedCodepage& codepage) {
   std::istringstream words(codepage.source.source);
   std::string icu, version, name;
-  words >> icu >> version >> name;
-  while (!name.empty() && name.back() == ';') name.pop_back();
+  std::getline(words >> icu >> version >> std::ws, name, ';');
   return icu == "ICU" ? name : std::string();
 }
 
@@ -237,25 +211,25 @@ std::vector<std::string> iconv_names(const ShippedCodepage& codepage) {
 
 TEST(Peers, CodepagesConvertAsInIcuAndIconv) {
   const Library library(LEXICOR_LOCALE_DIR);
-  Differences differences;
+  ListedDifferences differences;
   size_t icu = 0, iconv = 0;
   for (const ShippedCodepage& codepage : shipped_codepages()) {
     if (const std::string name = codepage.source.utf8 ? "UTF-8" : icu_name(codepage); !name.empty()) {
       const Peer peer = icu_peer(name);
-      ASSERT_TRUE(peer.to_unicode) << codepage.source.name << ": no converter " << name;
+      ASSERT_TRUE(peer.decode) << codepage.source.name << ": no converter " << name;
       compare(codepage, "icu", peer, &differences);
       ++icu;
     }
     Peer peer;
     for (const std::string& name : iconv_names(codepage))
-      if (!peer.to_unicode) peer = iconv_peer(name);
-    if (!peer.to_unicode) continue;
+      if (!peer.decode) peer = {iconv_of("UCS-2LE", name), iconv_of(name, "UCS-2LE")};
+    if (!peer.decode) continue;
     compare(codepage, "iconv", peer, &differences);
     ++iconv;
   }
   EXPECT_GE(icu, 140u) << "the others are taken from glibc";
   EXPECT_GE(iconv, 147u) << "glibc has fewer charsets than when this was written";
-  differences.expect_listed();
+  differences.expect_listed("peer_differences.txt", 4, true);
 }
 
 }  // namespace

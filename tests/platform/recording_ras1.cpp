@@ -8,8 +8,6 @@
 #include <mutex>
 #include <utility>
 
-#include "platform/ras1.h"
-
 namespace lx::test {
 namespace {
 
@@ -17,19 +15,13 @@ std::mutex mutex;
 uint32_t current_level;
 std::vector<TraceRecord> records;
 
-void add(TraceRecord::Kind kind, const RAS1_Unit& unit, int line, TraceRecord record) {
-  record.kind = kind;
-  record.unit = unit.name;
-  record.line = line;
+/// The library may look at errno after a trace call.
+void add(TraceRecord record) {
+  const int saved = errno;
   std::lock_guard<std::mutex> held(mutex);
   records.push_back(std::move(record));
+  errno = saved;
 }
-
-/// The library may look at errno after a trace call.
-struct KeepErrno {
-  const int saved = errno;
-  ~KeepErrno() { errno = saved; }
-};
 
 }  // namespace
 
@@ -53,7 +45,6 @@ extern "C" {
 uint32_t RAS1_ChangeCounter = 1;
 
 uint32_t RAS1_Sync(RAS1_Unit* unit) {
-  KeepErrno keep;
   std::lock_guard<std::mutex> held(mutex);
   __atomic_store_n(&unit->level, current_level, __ATOMIC_RELAXED);
   __atomic_store_n(&unit->seen, __atomic_load_n(&RAS1_ChangeCounter, __ATOMIC_RELAXED), __ATOMIC_RELEASE);
@@ -61,36 +52,23 @@ uint32_t RAS1_Sync(RAS1_Unit* unit) {
 }
 
 void RAS1_Event(RAS1_Unit* unit, int line, int kind, intptr_t value) {
-  KeepErrno keep;
-  TraceRecord record{};
-  if (kind == RAS1_EVENT_EXIT_VALUE) record.value = value;
-  const auto recorded = kind == RAS1_EVENT_ENTRY        ? TraceRecord::kEntry
-                        : kind == RAS1_EVENT_EXIT_VALUE ? TraceRecord::kExitValue
-                                                        : TraceRecord::kExit;
-  if (recorded == TraceRecord::kExit && kind != RAS1_EVENT_EXIT) abort();
-  add(recorded, *unit, line, std::move(record));
+  add({static_cast<TraceRecord::Kind>(kind), unit->name, line, value, "", {}});
 }
 
 void RAS1_Printf(RAS1_Unit* unit, int line, const char* format, ...) {
-  KeepErrno keep;
-  TraceRecord record{};
   char text[8192];
   va_list arguments;
   va_start(arguments, format);
   const int bytes = vsnprintf(text, sizeof(text), format, arguments);
   va_end(arguments);
   if (bytes < 0 || static_cast<size_t>(bytes) >= sizeof(text)) abort();
-  record.text = text;
-  add(TraceRecord::kMessage, *unit, line, std::move(record));
+  add({TraceRecord::kMessage, unit->name, line, 0, text, {}});
 }
 
 void RAS1_Dump(RAS1_Unit* unit, int line, const void* buffer, size_t bytes, const char* label) {
-  KeepErrno keep;
-  TraceRecord record{};
-  record.text = label;
   const uint8_t* first = static_cast<const uint8_t*>(buffer);
-  if (bytes > 0) record.bytes.assign(first, first + bytes);
-  add(TraceRecord::kDump, *unit, line, std::move(record));
+  const std::vector<uint8_t> copy(first, bytes > 0 ? first + bytes : first);
+  add({TraceRecord::kDump, unit->name, line, 0, label, copy});
 }
 
 }  // extern "C"

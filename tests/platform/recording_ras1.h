@@ -6,10 +6,18 @@
 #include <string>
 #include <vector>
 
+#include "platform/ras1.h"
+
 namespace lx::test {
 
 struct TraceRecord {
-  enum Kind { kEntry, kExitValue, kExit, kMessage, kDump };
+  enum Kind {
+    kEntry = RAS1_EVENT_ENTRY,
+    kExitValue = RAS1_EVENT_EXIT_VALUE,
+    kExit = RAS1_EVENT_EXIT,
+    kMessage,
+    kDump
+  };
 
   Kind kind;
   std::string unit;

@@ -16,16 +16,6 @@ exec 3>&2 2>said
 
 convert() { "$lexicor" convert --strict --from "$1" --to "$2" "${@:3}"; }
 
-# --- Samples: the bytes of the system's converter, and back.
-for case in japanese:MS932:CP932 japanese:JapanEUC:EUC-JP japanese:IBM939:IBM939 chinese-simplified:MS936:CP936 \
-  chinese-traditional:EUC-TW:EUC-TW korean:MS949:CP949 russian:MS1251:CP1251 hebrew:MS1255:CP1255 \
-  thai:MS874:CP874 german:IBM1141:IBM1141; do
-  IFS=: read -r sample codepage system <<<"$case"
-  convert UTF-8 "$codepage" -o there "$samples/$sample.txt"
-  convert "$codepage" UTF-8 there | cmp - "$samples/$sample.txt"
-  if iconv -f UTF-8 -t "$system" "$samples/$sample.txt" >system 2>/dev/null; then cmp there system; fi
-done
-
 # --- A megabyte, shifted so that every character of the sample meets the end of a piece.
 repeated() { yes "$(cat "$1")" | head -n $((3500 * $(wc -l <"$1"))) || [ $? = 141 ]; }
 repeated "$samples/japanese.txt" >text
@@ -72,18 +62,6 @@ while read -r command; do
   command=${command// \/tmp\// $work/}
   (cd "$source_dir" && eval "${command/#build\/m64/$build_dir}") >out || [[ $command == *' compare '* && $? -ge 3 ]]
 done < <(grep '^build/m64/bin/' "$source_dir/README.md")
-
-# --- Message samples in the codepages that their languages live in, and back.
-for case in english:IBM037 german:IBM273 german:MS1252 japanese:IBM930 japanese:MS932 japanese:JapanEUC russian:KOI8-R \
-  russian:IBM1025; do
-  IFS=: read -r language codepage <<<"$case"
-  "$gencat" --new --locale "English_UnitedStates.$codepage" s.cat "$samples/catalog/$language.msg"
-  for encoding in UTF-8 "$codepage"; do
-    "$gencat" --dump --from "$encoding" -o s.msg s.cat
-    "$gencat" --new --from "$encoding" t.cat s.msg
-    cmp s.cat t.cat
-  done
-done
 
 # --- The system's gencat makes the same catalog of a source and of the dump of what it was compiled to.
 # Left out is where it goes its own way: a number alone, more than three octal digits, $delset. The sets ascend,

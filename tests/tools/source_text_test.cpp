@@ -1,11 +1,7 @@
-// What sources become and what is written of objects, where a transcript cannot show it: all of data/, damaged
-// objects, and packing. tests/cases/cli/data.txt says the rest, and faults_test.cpp what is wrong with sources.
+// What sources become and what is written of objects, where a transcript cannot show it: damaged objects, and
+// packing. tests/cases/cli says the rest, and faults_test.cpp what is wrong with sources.
 #include <gtest/gtest.h>
 
-#include <algorithm>
-#include <fstream>
-#include <iterator>
-#include <set>
 #include <sstream>
 
 #include "compile.h"
@@ -16,11 +12,6 @@
 
 namespace lexicor_data {
 namespace {
-
-std::string text_of(const std::string& file) {
-  std::ifstream in(LEXICOR_DATA_DIR "/" + file, std::ios::binary);
-  return {std::istreambuf_iterator<char>(in), {}};
-}
 
 // Equal rows once, contained rows reused.
 TEST(RowPacker, SharesRows) {
@@ -87,53 +78,6 @@ TEST(Objects, AnyByteMayBeWrong) {
       use(ByteVector(sound.begin(), sound.begin() + static_cast<std::ptrdiff_t>(size)));
     EXPECT_GT(refused, 0u) << object.name.name;
   }
-}
-
-// The dump of a compiled object is its source, which begins with a comment. Codepages are looked at by
-// themselves.
-TEST(Sources, ShippedOnesAreCanonical) {
-  const Control control = read_source_control(LEXICOR_DATA_DIR);
-  for (const ObjectName& name : control.objects) {
-    if (name.type == ObjectType::kCodepage) continue;
-    const std::string file = LEXICOR_LOCALE_DIR "/" + object_file_name(name),
-                      text = text_of(source_file_name(name));
-    EXPECT_TRUE(dump_object(read_object(read_file(file), file), name, &control, file) ==
-                text.substr(text.find('\n') + 1))
-        << file;
-  }
-}
-
-// An editor's byte-order mark and carriage returns change nothing.
-TEST(Sources, LineEndsOfAnyKind) {
-  const Control control = read_source_control(LEXICOR_DATA_DIR);
-  for (const ObjectType type :
-       {ObjectType::kLanguage, ObjectType::kTerritory, ObjectType::kCodepage, ObjectType::kSort}) {
-    const ObjectName& name = *std::find_if(control.objects.begin(), control.objects.end(),
-                                           [&](const ObjectName& object) { return object.type == type; });
-    std::string edited = "\xEF\xBB\xBF";
-    for (const char c : text_of(source_file_name(name))) edited += c == '\n' ? "\r\n" : std::string(1, c);
-    std::istringstream in(edited);
-    EXPECT_EQ(compile_object(in, "e", name, control).bytes,
-              read_file(LEXICOR_LOCALE_DIR "/" + object_file_name(name)));
-  }
-}
-
-TEST(ShippedAliases, StandOnceAndNeverHideAnObject) {
-  const auto upper = [](std::string text) {
-    for (char& c : text) c = static_cast<char>(toupper(c));
-    return text;
-  };
-  std::set<std::string> objects, headings, names;
-  for (const ObjectName& object : read_source_control(LEXICOR_DATA_DIR).objects)
-    if (object.type == ObjectType::kCodepage) objects.insert(upper(object.name));
-  std::istringstream lines(text_of("alias.txt"));
-  for (std::string line, word; std::getline(lines, line);) {
-    if (line.empty() || line[0] == '#') continue;
-    std::istringstream words(line);
-    if (line[0] != ' ' && words >> word) headings.insert(upper(word)), words.seekg(0);
-    while (words >> word) EXPECT_TRUE(names.insert(upper(word)).second) << word;
-  }
-  EXPECT_EQ(headings, objects);
 }
 
 }  // namespace
