@@ -13,10 +13,13 @@ namespace lx::test {
 
 uint32_t case_flags(const CaseWords& words) {
   static const std::pair<const char*, uint32_t> kFlags[] = {
-      {"chars", LX_CHARACTERS},      {"terminate", LX_TERMINATE},         {"territory", LX_TERRITORY_VALUES},
-      {"case", LX_CASE_INSENSITIVE}, {"width", LX_WIDTH_INSENSITIVE},     {"blanks", LX_IGNORE_BLANKS},
-      {"drop", LX_DROP_BLANKS},      {"drop-full", LX_DROP_FULL_BLANKS},  {"national", LX_NATIONAL_DIGITS},
-      {"monetary", LX_MONETARY},     {"international", LX_INTERNATIONAL}, {"unsigned", LX_UNSIGNED}};
+      {"chars", LX_CHARACTERS},      {"terminate", LX_TERMINATE},           {"territory", LX_TERRITORY_VALUES},
+      {"case", LX_CASE_INSENSITIVE}, {"width", LX_WIDTH_INSENSITIVE},       {"blanks", LX_IGNORE_BLANKS},
+      {"drop", LX_DROP_BLANKS},      {"drop-full", LX_DROP_FULL_BLANKS},    {"national", LX_NATIONAL_DIGITS},
+      {"monetary", LX_MONETARY},     {"international", LX_INTERNATIONAL},   {"unsigned", LX_UNSIGNED},
+      {"full", LX_MAP_FULL_WIDTH},   {"half", LX_MAP_HALF_WIDTH},           {"copy", LX_MAP_COPY},
+      {"lower", LX_MAP_LOWER},       {"lower-simple", LX_MAP_LOWER_SIMPLE}, {"digits", LX_MAP_DIGITS},
+      {"upper", LX_MAP_UPPER},       {"upper-simple", LX_MAP_UPPER_SIMPLE}};
   uint32_t flags = static_cast<uint32_t>(words.number("flags", 0));
   for (const auto& [word, flag] : kFlags)
     if (words.has(word)) flags |= flag;
