@@ -215,23 +215,5 @@ TEST_P(Cases, InEveryFormAndCodepage) {
 INSTANTIATE_TEST_SUITE_P(Files, Cases, testing::ValuesIn(case_files()),
                          [](const auto& file) { return std::filesystem::path(file.param).stem().string(); });
 
-/// What is no case is said with its line.
-TEST(CaseFiles, MalformedLines) {
-  for (const char* line :
-       {"find \"a", "find \"a\"", "find \"\\q\" = 1", "[U find \"a\" = 1", "find \"\\u12\" = 0"}) {
-    const std::string path = testing::TempDir() + "malformed_cases.txt";
-    FILE* const file = fopen(path.c_str(), "w");
-    fprintf(file, "\n%s\n", line);
-    fclose(file);
-    try {
-      read_cases(path);
-      ADD_FAILURE() << line;
-    } catch (const CaseError& error) {
-      EXPECT_EQ(std::string(error.what()).find("malformed_cases.txt:2: "), 0u) << error.what();
-    }
-    remove(path.c_str());
-  }
-}
-
 }  // namespace
 }  // namespace lx::test

@@ -116,13 +116,15 @@ TEST_F(Convert, UndefinedFlagsBesideCharacters) {
   EXPECT_EQ(LXMbToWide(l, wide, 4, "a", 1, flags), -1);
 }
 
-/// ASCII is moved in blocks: another character at every place of a text that is longer than two of them.
+/// ASCII is moved in blocks: another character at every place of a text that is longer than two of them, also
+/// one whose value has a low byte of ASCII.
 TEST_F(Convert, RunsOfAsciiAroundOtherCharacters) {
   Units run;
   for (LXUChar u = '!'; u < '!' + 37; ++u) run.push_back(u);
   for (const TinyCodepage& from : codepages())
-    for (size_t at = 0; at < run.size(); ++at)
-      for (const LXUChar other : {from.characters.back().unicode, from.characters[0x5C].unicode}) {
+    for (const LXUChar other : {from.characters.back().unicode, from.characters[0x5C].unicode, uint16_t{0x100},
+                                uint16_t{0x3041}, uint16_t{0xE0}})
+      for (size_t at = 0; at < run.size() && from.find(other) != nullptr; ++at) {
         SCOPED_TRACE(from.file.name + " at " + std::to_string(at) + ": " + std::to_string(other));
         Units text = run;
         text[at] = other;

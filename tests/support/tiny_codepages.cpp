@@ -101,7 +101,7 @@ std::string TinyCodepage::encode(const std::vector<uint16_t>& text, LXShiftState
 
 TinyCodepage tiny_single() {
   CodepageBuilder builder(9001, "TINY-SINGLE", 1);
-  return builder.ascii().map({{0xA0, 0xA0, 4}, {0xA5, 0xA5, 91}, {0xA4, 0x20AC}}).build();
+  return builder.ascii().map(0xA0, 0xA0, 4).map(0xA5, 0xA5, 91).map(0xA4, 0x20AC).build();
 }
 
 TinyCodepage shift_jis(uint16_t id, const char* name) {
@@ -118,27 +118,16 @@ TinyCodepage tiny_shift_jis() {
 TinyCodepage tiny_euc() {
   CodepageBuilder builder(9003, "TINY-EUC", 3);
   builder.lead(0x8E, 0x8E, 2).lead(0x8F, 0x8F, 3).lead(0xA1, 0xFE, 2);
-  builder.map({{0x00, 0x00, 0x5C},
-               {0x5C, 0xA5},
-               {0x5D, 0x5D, 0x23},
-               {0x8EA1, 0xFF61, 63},
-               {0xA4A1, 0x3041, 83},
-               {0xB0A1, 0x4E9C},
-               {0x8FB0A1, 0x4E02},
-               {0x8FB0A2, 0x4E04, 2},
-               {0x8FEDE3, 0x9FA5}});
-  return builder.build();
+  builder.map(0x00, 0x00, 0x5C).map(0x5C, 0xA5).map(0x5D, 0x5D, 0x23).map(0x8EA1, 0xFF61, 63);
+  builder.map(0xA4A1, 0x3041, 83).map(0xB0A1, 0x4E9C).map(0x8FB0A1, 0x4E02).map(0x8FB0A2, 0x4E04, 2);
+  return builder.map(0x8FEDE3, 0x9FA5).build();
 }
 
 TinyCodepage tiny_four() {
   CodepageBuilder builder(9004, "TINY-FOUR", 4);
   builder.ascii().lead(0x81, 0x84, 2).lead(0x90, 0x91, 4);
-  builder.map({{0x8140, 0x4E02, 63},
-               {0x84FE, 0x4E90},
-               {0x90308130, 0x0100, 10},
-               {0x90318130, 0x010A, 10},
-               {0x91398139, 0x01FF}});
-  return builder.build();
+  builder.map(0x8140, 0x4E02, 63).map(0x84FE, 0x4E90).map(0x90308130, 0x0100, 10).map(0x90318130, 0x010A, 10);
+  return builder.map(0x91398139, 0x01FF).build();
 }
 
 TinyCodepage ebcdic(uint16_t id, const char* name, bool katakana) {

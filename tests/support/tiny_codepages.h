@@ -43,15 +43,6 @@ class CodepageBuilder {
   CodepageBuilder& lead(uint8_t first, uint8_t last, uint8_t length);
   /// `count` characters from this packed code and this Unicode value on, both ways.
   CodepageBuilder& map(uint32_t code, uint16_t unicode, unsigned count = 1);
-  struct Range {
-    uint32_t code;
-    uint16_t unicode;
-    unsigned count = 1;
-  };
-  CodepageBuilder& map(const std::vector<Range>& ranges) {
-    for (const Range& range : ranges) map(range.code, range.unicode, range.count);
-    return *this;
-  }
   CodepageBuilder& ascii() { return map(0, 0, 0x80); }
   /// The characters of a text, from this code on.
   CodepageBuilder& text(uint32_t code, const char* ascii) {
