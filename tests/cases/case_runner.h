@@ -2,14 +2,12 @@
 // came out.
 #pragma once
 
-#include <gtest/gtest.h>
-
 #include <map>
 #include <string>
 #include <vector>
 
 #include "support/case_file.h"
-#include "support/case_library.h"
+#include "support/case_test.h"
 
 namespace lx::test {
 
@@ -93,23 +91,10 @@ struct CaseRun {
   void text(const std::vector<Unit>& got, LXShiftState state = 0) {
     EXPECT_EQ(testing::PrintToString(got), testing::PrintToString(units(c.expected.text(), state)));
   }
-  /// Gives `put` a buffer and its size, and gives back what it wrote: nothing behind the result, or with
-  /// LX_CHARACTERS what is not as it was.
+  /// What `put` writes into a buffer of this size.
   template <class Put>
   std::vector<Unit> output(int32_t size, int32_t* result, Put put) {
-    const bool by_chars = kBytes && (flags & LX_CHARACTERS) != 0;
-    const size_t room = static_cast<size_t>(std::max(size, 0)) * (by_chars ? 6 : 1);
-    std::vector<Unit> buffer(room + 4, kCanary);
-    *result = put(buffer.data(), size);
-    EXPECT_LE(*result, std::max(size, 0));
-    EXPECT_EQ(std::vector<Unit>(buffer.begin() + static_cast<ptrdiff_t>(room), buffer.end()),
-              std::vector<Unit>(4, kCanary))
-        << "behind the size " << size;
-    size_t end = static_cast<size_t>(std::max(*result, 0));
-    if (by_chars)
-      for (end = room; end > 0 && buffer[end - 1] == kCanary;) --end;
-    buffer.resize(end);
-    return buffer;
+    return put_into<Unit>(size, flags, result, put);
   }
 };
 

@@ -13,10 +13,13 @@ namespace lx::test {
 
 uint32_t case_flags(const CaseWords& words) {
   static const std::pair<const char*, uint32_t> kFlags[] = {
-      {"chars", LX_CHARACTERS},      {"terminate", LX_TERMINATE},         {"territory", LX_TERRITORY_VALUES},
-      {"case", LX_CASE_INSENSITIVE}, {"width", LX_WIDTH_INSENSITIVE},     {"blanks", LX_IGNORE_BLANKS},
-      {"drop", LX_DROP_BLANKS},      {"drop-full", LX_DROP_FULL_BLANKS},  {"national", LX_NATIONAL_DIGITS},
-      {"monetary", LX_MONETARY},     {"international", LX_INTERNATIONAL}, {"unsigned", LX_UNSIGNED}};
+      {"chars", LX_CHARACTERS},      {"terminate", LX_TERMINATE},           {"territory", LX_TERRITORY_VALUES},
+      {"case", LX_CASE_INSENSITIVE}, {"width", LX_WIDTH_INSENSITIVE},       {"blanks", LX_IGNORE_BLANKS},
+      {"drop", LX_DROP_BLANKS},      {"drop-full", LX_DROP_FULL_BLANKS},    {"national", LX_NATIONAL_DIGITS},
+      {"monetary", LX_MONETARY},     {"international", LX_INTERNATIONAL},   {"unsigned", LX_UNSIGNED},
+      {"full", LX_MAP_FULL_WIDTH},   {"half", LX_MAP_HALF_WIDTH},           {"copy", LX_MAP_COPY},
+      {"lower", LX_MAP_LOWER},       {"lower-simple", LX_MAP_LOWER_SIMPLE}, {"digits", LX_MAP_DIGITS},
+      {"upper", LX_MAP_UPPER},       {"upper-simple", LX_MAP_UPPER_SIMPLE}};
   uint32_t flags = static_cast<uint32_t>(words.number("flags", 0));
   for (const auto& [word, flag] : kFlags)
     if (words.has(word)) flags |= flag;
@@ -211,24 +214,6 @@ TEST_P(Cases, InEveryFormAndCodepage) {
 
 INSTANTIATE_TEST_SUITE_P(Files, Cases, testing::ValuesIn(case_files()),
                          [](const auto& file) { return std::filesystem::path(file.param).stem().string(); });
-
-/// What is no case is said with its line.
-TEST(CaseFiles, MalformedLines) {
-  for (const char* line :
-       {"find \"a", "find \"a\"", "find \"\\q\" = 1", "[U find \"a\" = 1", "find \"\\u12\" = 0"}) {
-    const std::string path = testing::TempDir() + "malformed_cases.txt";
-    FILE* const file = fopen(path.c_str(), "w");
-    fprintf(file, "\n%s\n", line);
-    fclose(file);
-    try {
-      read_cases(path);
-      ADD_FAILURE() << line;
-    } catch (const CaseError& error) {
-      EXPECT_EQ(std::string(error.what()).find("malformed_cases.txt:2: "), 0u) << error.what();
-    }
-    remove(path.c_str());
-  }
-}
 
 }  // namespace
 }  // namespace lx::test

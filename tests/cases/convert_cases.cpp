@@ -113,23 +113,12 @@ void stream(CaseRun<Ex>& r) {
   }
 }
 
-uint32_t mode_of(const CaseWords& words) {
-  static const std::pair<const char*, uint32_t> kModes[] = {
-      {"full", LX_MAP_FULL_WIDTH}, {"half", LX_MAP_HALF_WIDTH},
-      {"copy", LX_MAP_COPY},       {"lower", LX_MAP_LOWER},
-      {"upper", LX_MAP_UPPER},     {"lower-simple", LX_MAP_LOWER_SIMPLE},
-      {"digits", LX_MAP_DIGITS},   {"upper-simple", LX_MAP_UPPER_SIMPLE}};
-  for (const auto& [word, mode] : kModes)
-    if (words.has(word)) return mode;
-  return static_cast<uint32_t>(words.number("mode", 0));
-}
 template <class R>
 void map(R& r) {
-  const uint32_t mode = mode_of(r.given());
   const auto text = r.input();
   int32_t result = 0;
   const auto out = r.output(r.given().number("size", 99), &result, [&](auto* to, int32_t size) {
-    return R::Form::map(r.l, to, size, text.data(), text.length, mode | r.flags);
+    return R::Form::map(r.l, to, size, text.data(), text.length, r.flags);
   });
   auto expected = r.units(r.expected().text());
   if (r.expected().has("whole") && text.length < 0) expected.push_back(0);

@@ -61,21 +61,11 @@ void join(R& r) {
 }
 template <class R>
 void tokens(R& r) {
-  using Unit = typename R::Unit;
   auto text = r.input();
   const auto set = r.input();
-  states.result = 0;
-  Unit* next = nullptr;
-  for (Unit* at = text.block.data(); at != nullptr; at = next) {
-    const Unit* const token = R::Form::tok(r.l, at, &text.length, set.data(), set.length, &next, r.flags);
-    EXPECT_EQ(next == nullptr, text.length == 0);
-    if (token == nullptr) break;
-    const Unit* const end =
-        std::find(token, static_cast<const Unit*>(text.data()) + text.block.size(), Unit{0});
-    states.text = r.cp.shift ? states.token : 0;
-    EXPECT_EQ(shown(decode(typename R::Form(), r.l, Text<Unit>(token, end))),
-              shown(r.expected().text().units()));
-  }
+  for (const Units& token :
+       tokens_of(typename R::Form(), r.cp, r.l, text.block, text.length, set.block, set.length, r.flags))
+    EXPECT_EQ(shown(token), shown(r.expected().text().units()));
 }
 template <class R>
 void truncate(R& r) {

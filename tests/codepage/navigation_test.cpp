@@ -1,32 +1,23 @@
 // Walking, counting, packing and storing characters, in every kind of text: rules on random valid text, and
 // packed codes.
-#include <gtest/gtest.h>
-
-#include <random>
-
 #include "core/lxrecords.h"
-#include "support/case_library.h"
-#include "support/encoded_text.h"
+#include "support/case_test.h"
 
 namespace lx::test {
 namespace {
 
 constexpr LXShiftState kUntouched = 77;
 
-class Navigation : public testing::Test {
+class Navigation : public CaseTest {
  protected:
-  void TearDown() override { EXPECT_TRUE(library_.close()); }
-
   /// Random characters but the null; in a shift-sensitive codepage from a state on, the last shift byte only
   /// now and then.
   Encoded<Ex> random_text(const TinyCodepage& cp, size_t chars, LXShiftState state) {
-    Units text;
-    while (text.size() < chars) {
-      const LXUChar u = cp.characters[random_() % cp.characters.size()].unicode;
-      if (u != 0) text.push_back(u);
-    }
+    Units text(chars, 0);
+    for (LXUChar& u : text)
+      while (u == 0) u = any_of(cp.characters).unicode;
     Encoded<Ex> made(cp, text, state);
-    if (!made.shifts.empty() && made.shifts.back() + 1 == made.units.size() && random_() % 2 == 0) {
+    if (!made.shifts.empty() && made.shifts.back() + 1 == made.units.size() && random() % 2 == 0) {
       made.units.pop_back();
       made.shifts.pop_back();
     }
@@ -46,7 +37,7 @@ class Navigation : public testing::Test {
 
   /// Whole characters of every beginning of a text, and their end.
   void counts(const TinyCodepage& cp, const Encoded<Ex>& text, LXShiftState initial) {
-    LXLocale* const in = library_.locale(cp);
+    LXLocale* const in = library.locale(cp);
     for (size_t n = 0; n <= text.units.size() + 1; ++n) {
       const bool null = n > text.units.size();
       const int32_t bytes = null ? -1 : static_cast<int32_t>(n);
@@ -65,18 +56,15 @@ class Navigation : public testing::Test {
                 cut.data() + last);
     }
   }
-
-  CaseLibrary library_;
-  std::mt19937 random_{1};
 };
 
 TEST_F(Navigation, EveryCharacterForwardsAndBackwards) {
   for (const TinyCodepage& cp : case_codepages()) {
     SCOPED_TRACE(cp.file.name);
-    LXLocale* const in = library_.locale(cp);
+    LXLocale* const in = library.locale(cp);
     for (int round = 0; round < (cp.shift ? 400 : 60); ++round) {
-      const LXShiftState initial = random_() % 2;
-      const Encoded<Ex> text = random_text(cp, random_() % 12, initial);
+      const LXShiftState initial = random() % 2;
+      const Encoded<Ex> text = random_text(cp, random() % 12, initial);
       const std::vector<char> bytes = text.terminated();
       const char *const start = bytes.data(), *p = start;
       LXShiftState state = initial;
@@ -131,7 +119,7 @@ TEST_F(Navigation, PackedCodes) {
               {0x90308130, 4, "\x90\x30\x81\x30"},
               {0x90300030, 4, "\x90\x30\x30"},
               {0x90008100, 4, {"\x90\x81\0", 3}}};
-  LXLocale* locale = library_.locale(case_codepage("SINGLE"));
+  LXLocale* locale = library.locale(case_codepage("SINGLE"));
   for (const auto& row : rows) {
     SCOPED_TRACE(row.code);
     EXPECT_EQ(LXStrByteLength(row.code), row.length);

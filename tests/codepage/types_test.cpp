@@ -1,21 +1,15 @@
 // Character types through the doors, the type records, and the tables of the built-in codepage.
-#include <gtest/gtest.h>
-
 #include "codepage/lxcodepage.h"
 #include "codepage/lxunicode.h"
 #include "core/lxmemory.h"
-#include "support/tiny_codepages.h"
+#include "support/case_test.h"
 
 namespace lx::test {
 namespace {
 
 namespace fmt = format::codepage;
 
-class Types : public testing::Test {
- protected:
-  void TearDown() override { EXPECT_TRUE(library_.close()); }
-  TinyLibrary library_;
-};
+using Types = CaseTest;
 
 TEST_F(Types, EveryCharacterInEveryForm) {
   const struct {
@@ -24,9 +18,9 @@ TEST_F(Types, EveryCharacterInEveryForm) {
   } selectors[] = {{0x80000010, 0, 0x3FF, LX_OK},     {0x80000011, 10, 0xFFF, LX_OK},
                    {0x80000012, 22, 0x3FF, LX_OK},    {0x80000013, 0, 0x3FF, LX_E_INVALID},
                    {0x12345, 0, 0x3FF, LX_E_INVALID}, {0, 0, 0x3FF, LX_E_INVALID}};
-  for (const TinyCodepage& cp : tiny_codepages()) {
+  for (const TinyCodepage& cp : case_codepages()) {
     SCOPED_TRACE(cp.file.name);
-    LXLocale* locale = library_.locale(cp);
+    LXLocale* locale = library.locale(cp);
     for (const TinyCharacter& c : cp.characters) {
       const std::vector<char> text(c.bytes.begin(), c.bytes.end());
       const LXShiftState state = cp.shift && text.size() > 1 ? LX_SHIFT_DOUBLE : LX_SHIFT_SINGLE;
@@ -45,17 +39,17 @@ TEST_F(Types, EveryCharacterInEveryForm) {
 }
 
 TEST_F(Types, BytesWithoutACharacterAndShiftBytes) {
-  LXLocale* single = library_.locale(tiny_single());
+  LXLocale* single = library.locale(case_codepage("SINGLE"));
   EXPECT_EQ(LXGetCharType(single, "\x80", LX_CTYPE1), 0u);
   EXPECT_EQ(LXGetCharTypeW(single, 0x80, LX_CTYPE2), 0u);
   EXPECT_EQ(LXGetCharTypeEx(single, "A", 1, LX_CTYPE1), 0x213u);
   EXPECT_EQ(LXGetMbCtype(single->codepage, "A"), nullptr);
   // A lead byte on its own is a single byte when it comes as a code.
-  LXLocale* sjis = library_.locale(tiny_shift_jis());
+  LXLocale* sjis = library.locale(case_codepage("SJIS"));
   EXPECT_EQ(LXGetCharTypeW(sjis, 0x82, LX_CTYPE1), 0u);
   EXPECT_EQ(LXGetCharType(sjis, "\x82\x20", LX_CTYPE2), 0u) << "a pair without a character";
 
-  LXLocale* shift = library_.locale(tiny_shift());
+  LXLocale* shift = library.locale(case_codepage("SHIFT"));
   for (LXShiftState state : {LX_SHIFT_SINGLE, LX_SHIFT_DOUBLE}) {
     EXPECT_EQ(LXGetCharTypeEx(shift, "\x0E\x44\x47", state, LX_CTYPE3), unicode_type(0x3041) >> 22);
     EXPECT_EQ(LXGetCharTypeEx(shift, "\x0F\xC1", state, LX_CTYPE3), unicode_type('A') >> 22);

@@ -5,7 +5,6 @@
 #include <unicode/unorm2.h>
 #include <unicode/uscript.h>
 
-#include <cstdio>
 #include <map>
 #include <string>
 
@@ -25,23 +24,17 @@ bool in(const Span (&spans)[kSpans], uint32_t u) {
   return false;
 }
 
-/// Counts the values that differ and prints the first of them.
-class Differences {
- public:
-  explicit Differences(const char* what) : what_(what) {}
-  ~Differences() { EXPECT_EQ(count_, 0) << what_ << ":" << text_; }
-  void check(uint32_t u, uint32_t got, uint32_t expected) {
-    if (got == expected || ++count_ > 20) return;
-    char line[64];
-    snprintf(line, sizeof line, "\n  U+%04X: %03X instead of %03X", u, got, expected);
-    text_ += line;
+/// Compares all values, and shows the first that differ.
+template <class Got, class Expected>
+void expect_all(const char* what, Got got, Expected expected) {
+  int32_t differences = 0;
+  for (uint32_t u = 0; u <= 0xFFFF; ++u) {
+    const uint32_t value = got(static_cast<uint16_t>(u)), wanted = expected(u);
+    if (value != wanted && ++differences <= 20)
+      ADD_FAILURE() << what << std::hex << " U+" << u << ": " << value << " instead of " << wanted;
   }
-
- private:
-  const char* what_;
-  std::string text_;
-  int32_t count_ = 0;
-};
+  EXPECT_EQ(differences, 0) << what;
+}
 
 // Whole blocks without types: those that Unicode filled later, and scripts that the tables never covered. Among
 // them are also surrogates and the private use area.
@@ -182,14 +175,16 @@ TEST(UnicodeOracle, VersionIsTheSame) {
 }
 
 TEST(UnicodeOracle, Types) {
-  Differences type1("classification"), type2("bidirectional category"), type3("text properties");
-  for (uint32_t u = 0; u <= 0xFFFF; ++u) {
-    const uint32_t word = lx::unicode_type(static_cast<uint16_t>(u));
-    const bool known = has_type(u);
-    type1.check(u, word & 0x3FF, known ? classification(u) : 0);
-    type2.check(u, word >> 10 & 0xFFF, known ? bidi_category(u) : uint32_t{LX_C2_NONE});
-    type3.check(u, word >> 22, known ? text_properties(u) : 0);
-  }
+  const auto known = [](auto rule, uint32_t otherwise) {
+    return [=](uint32_t u) { return has_type(u) ? rule(u) : otherwise; };
+  };
+  expect_all(
+      "classification", [](uint16_t u) { return lx::unicode_type(u) & 0x3FF; }, known(classification, 0));
+  expect_all(
+      "bidirectional category", [](uint16_t u) { return lx::unicode_type(u) >> 10 & 0xFFF; },
+      known(bidi_category, LX_C2_NONE));
+  expect_all(
+      "text properties", [](uint16_t u) { return lx::unicode_type(u) >> 22; }, known(text_properties, 0));
 }
 
 TEST(UnicodeOracle, Case) {
@@ -202,15 +197,13 @@ TEST(UnicodeOracle, Case) {
                          {0x24D0, 0x24E9}, {0xFF41, 0xFF5A}};
   // Old Georgian capitals go to the modern letters; ICU sends them to the small letters of their own kind.
   const Span georgian[] = {{0x10A0, 0x10C5}};
-  Differences lower("lower case"), upper("upper case");
-  for (uint32_t u = 0; u <= 0xFFFF; ++u) {
+  expect_all("lower case", lx::unicode_lower, [&](uint32_t u) {
     const auto c = static_cast<UChar32>(u);
-    UChar32 expected = in(lowered, u) ? u_tolower(c) : c;
-    if (in(georgian, u)) expected = c + 0x30;
-    lower.check(u, lx::unicode_lower(static_cast<uint16_t>(u)), static_cast<uint32_t>(expected));
-    expected = in(raised, u) ? u_toupper(c) : c;
-    upper.check(u, lx::unicode_upper(static_cast<uint16_t>(u)), static_cast<uint32_t>(expected));
-  }
+    return in(georgian, u) ? u + 0x30 : in(lowered, u) ? static_cast<uint32_t>(u_tolower(c)) : u;
+  });
+  expect_all("upper case", lx::unicode_upper, [&](uint32_t u) {
+    return in(raised, u) ? static_cast<uint32_t>(u_toupper(static_cast<UChar32>(u))) : u;
+  });
 }
 
 TEST(UnicodeOracle, Width) {
@@ -228,19 +221,15 @@ TEST(UnicodeOracle, Width) {
     to_full[type == U_DT_WIDE ? other[0] : u] = type == U_DT_WIDE ? u : other[0];
     to_half[type == U_DT_WIDE ? u : other[0]] = type == U_DT_WIDE ? other[0] : u;
   }
-  Differences half_to_full("half to full width"), full_to_half("full to half width");
-  for (uint32_t u = 0; u <= 0xFFFF; ++u) {
-    half_to_full.check(u, lx::unicode_half_to_full(static_cast<uint16_t>(u)), to_full[u]);
-    full_to_half.check(u, lx::unicode_full_to_half(static_cast<uint16_t>(u)), to_half[u]);
-  }
+  expect_all("half to full width", lx::unicode_half_to_full, [](uint32_t u) { return to_full[u]; });
+  expect_all("full to half width", lx::unicode_full_to_half, [](uint32_t u) { return to_half[u]; });
 }
 
 TEST(UnicodeOracle, Digits) {
-  Differences digits("digits");
-  for (uint32_t u = 0; u <= 0xFFFF; ++u) {
+  expect_all("digits", lx::unicode_digit, [](uint32_t u) {
     const auto number = static_cast<uint32_t>(u_getNumericValue(static_cast<UChar32>(u)));
-    digits.check(u, lx::unicode_digit(static_cast<uint16_t>(u)), is_mapped_digit(u) ? '0' + number : 0);
-  }
+    return is_mapped_digit(u) ? '0' + number : 0;
+  });
 }
 
 }  // namespace

@@ -18,44 +18,30 @@ Units kana_units(const std::string& text) {
 /// 4 July 2003, 14:05:09, a Friday.
 constexpr LXTime kSample{9, 5, 14, 4, 6, 103, 5, 184};
 
+/// Formats into `size` units, or characters.
+template <class F>
+Written<F> formatted(const F& form, LXLocale* in, const LXTime& time, const Units& format_text,
+                     int32_t size = 2000, uint32_t flags = 0) {
+  const bool chars = (flags & LX_CHARACTERS) != 0 && sizeof(typename F::Unit) == 1;
+  const auto format = encode(form, in, format_text);
+  const int32_t length = chars ? count_of(format_text) : count_of(format);
+  return written(form, in, size, flags, [&](auto* to, int32_t room) {
+    return form.write_time(in, &time, to, room, format.data(), length, flags);
+  });
+}
+
 struct Result {
-  int32_t code;
-  int32_t count;
-  Units text;   // written, without the null
-  LXTime time;  // read
+  int32_t code, count;
+  LXTime time;
 };
 bool same(const Result& a, const Result& b) {
   return a.code == b.code && a.count == b.count && memcmp(&a.time, &b.time, sizeof(LXTime)) == 0;
-}
-
-/// Formats into `size` units (characters: the bytes that they can take) before a margin that must stay.
-template <class F>
-Result written(const F& form, LXLocale* in, const LXTime& time, const Units& format_text, int32_t size = 2000,
-               uint32_t flags = 0) {
-  using Unit = typename F::Unit;
-  const bool chars = (flags & LX_CHARACTERS) != 0 && sizeof(Unit) == 1;
-  const auto format = encode(form, in, format_text);
-  const size_t room = static_cast<size_t>(size) * (chars ? 6 : 1);
-  Text<Unit> buffer(room + 8, 0x5A);
-  const int32_t length = chars ? count_of(format_text) : count_of(format);
-  const int32_t count = form.write_time(in, &time, buffer.data(), size, format.data(), length, flags);
-  Result out{LXGetError(in), count, {}, time};
-  EXPECT_LE(count, size);
-  EXPECT_EQ(buffer.substr(room), Text<Unit>(8, 0x5A));
-  const bool null = count > 0 && (flags & LX_TERMINATE) != 0;
-  int32_t units = std::max(count, 0) - null;
-  if constexpr (sizeof(Unit) == 1) {
-    if (chars) units = LXCpStrCharToByteLen(in->codepage, buffer.data(), 0, units);
-  }
-  EXPECT_TRUE(!null || buffer[static_cast<size_t>(units)] == 0);
-  out.text = decode(form, in, buffer.substr(0, static_cast<size_t>(units)));
-  return out;
 }
 template <class F>
 Result parsed(const F& form, LXLocale* in, const Units& text, const Units& format, const LXTime& before) {
   const auto t = encode(form, in, text), by = encode(form, in, format);
   const std::vector<typename F::Unit> block(t.begin(), t.end());  // of its exact size
-  Result out{0, 0, {}, before};
+  Result out{0, 0, before};
   out.count =
       form.read_time(in, &out.time, block.data(), count_of(text), by.data(), count_of(format), LX_CHARACTERS);
   out.code = LXGetError(in);
@@ -64,7 +50,6 @@ Result parsed(const F& form, LXLocale* in, const Units& text, const Units& forma
 
 class TimeTest : public CaseTest {
  protected:
-  int any(size_t end) { return static_cast<int>(below(end)); }
   LXTime random_time() {
     LXTime time{any(60), any(60), any(24), any(32), any(12), any(100), any(7), any(366)};
     if (any(8) == 0) time.hours = 24;
@@ -107,11 +92,11 @@ TEST_F(TimeTest, LongAndEqualNames) {
     forms_of(cp, [&](const auto& form) {
       // Three bytes for a kana at most, and shift bytes.
       const bool bytes = sizeof(typename std::decay_t<decltype(form)>::Unit) == 1 && cp.find(0x3041) != nullptr;
-      const Result out = written(form, in, sunday, units("%A."));
-      EXPECT_TRUE(bytes ? out.text.size() < 31 && out.count >= 28 : out.count == 32) << out.count;
+      const auto out = formatted(form, in, sunday, units("%A."));
+      EXPECT_TRUE(bytes ? out.text.size() < 31 && out.result >= 28 : out.result == 32) << out.result;
       EXPECT_EQ(out.text.back(), '.');
       for (int32_t size = 1; size < 28; ++size)
-        EXPECT_EQ(written(form, in, sunday, units("%A"), size).code, 40);
+        EXPECT_EQ(formatted(form, in, sunday, units("%A"), size).code, 40);
       EXPECT_EQ(parsed(form, in, units("9AM"), units("%I%p"), kSample).time.hours, 9)
           << "the first of equal names";
     });
@@ -124,25 +109,25 @@ TEST_F(TimeTest, FormsWriteTheSame) {
     LXLocale* const in = library.locale(cp, "Kana");  // names that begin with kana
     const LXTime time = random_time();
     const Units format = kana_units(random_format(8));
-    const Result whole = written(kUnicode, in, time, format);
+    const auto whole = formatted(kUnicode, in, time, format);
     SCOPED_TRACE(round);
     forms_of(cp, [&](const auto& form) {
       constexpr bool kBytes = sizeof(typename std::decay_t<decltype(form)>::Unit) == 1;
       // In the codepage's characters.
       const Units text = decode(form, in, encode(form, in, whole.text));
-      const Result out = written(form, in, time, format);
+      const auto out = formatted(form, in, time, format);
       ASSERT_TRUE(out.text == text && out.code == whole.code);
       const int32_t size = any(24);
-      const Result cut = written(form, in, time, format, size, below(2) == 0 ? 0 : LX_TERMINATE);
+      const auto cut = formatted(form, in, time, format, size, below(2) == 0 ? 0 : LX_TERMINATE);
       ASSERT_EQ(cut.text, text.substr(0, cut.text.size())) << "whole characters";
       ASSERT_TRUE(cut.code == 40 || (cut.text == text && cut.code == whole.code));
-      ASSERT_TRUE(cut.code != 40 || kBytes || cut.count == size);
+      ASSERT_TRUE(cut.code != 40 || kBytes || cut.result == size);
       // By characters: as many as asked for, without a code, where the work buffer held everything.
-      const Result chars = written(form, in, time, format, size, LX_CHARACTERS | LX_TERMINATE);
+      const auto chars = formatted(form, in, time, format, size, LX_CHARACTERS | LX_TERMINATE);
       const int32_t work = kBytes ? 6 * size : size;
       ASSERT_EQ(chars.text, text.substr(0, chars.text.size()));
-      ASSERT_TRUE(chars.code != 40 || out.count + 4 > work);
-      ASSERT_TRUE(chars.code == 40 || chars.count == std::min(size, count_of(text) + 1));
+      ASSERT_TRUE(chars.code != 40 || out.result + 4 > work);
+      ASSERT_TRUE(chars.code == 40 || chars.result == std::min(size, count_of(text) + 1));
     });
   }
 }
@@ -156,7 +141,7 @@ TEST_F(TimeTest, FormsReadTheSameAndWhatWasWritten) {
     const std::string format_text = random_format(6);
     const Units format = kana_units(format_text);
     const LXTime time = random_time();
-    const Result original = written(kUnicode, in, time, format);
+    const auto original = formatted(kUnicode, in, time, format);
     // A character that the end cuts is read differently where characters are bytes: no text ends in one.
     Units text = original.text;
     text.insert(text.end(), 4, 'z');
@@ -172,7 +157,7 @@ TEST_F(TimeTest, FormsReadTheSameAndWhatWasWritten) {
         format_text.find_first_of("#I") != std::string::npos)
       continue;
     ASSERT_EQ(whole.count, count_of(original.text));
-    ASSERT_EQ(written(kUnicode, in, whole.time, format).text, original.text);
+    ASSERT_EQ(formatted(kUnicode, in, whole.time, format).text, original.text);
     ++read_back;
   }
   EXPECT_GT(read_back, 200);

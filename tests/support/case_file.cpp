@@ -2,6 +2,7 @@
 
 #include <cstdlib>
 #include <fstream>
+#include <map>
 
 namespace lx::test {
 
@@ -38,25 +39,17 @@ class Scanner {
 
  private:
   uint32_t escape() {
-    switch (const char c = at_ < line_.size() ? line_[at_++] : '\0') {
-      case '>':
-        return CaseText::kShiftOut;
-      case '-':
-        return CaseText::kNothing;
-      case '<':
-        return CaseText::kShiftIn;
-      case 'n':
-        return '\n';
-      case 'x':
-        return CaseText::kByte | hex(2);
-      case 'u':
-        return hex(4);
-      case '"':
-      case '\\':
-        return static_cast<uint32_t>(c);
-      default:
-        fail("an unknown escape");
-    }
+    static const std::map<char, uint32_t> kEscapes{{'>', CaseText::kShiftOut},
+                                                   {'<', CaseText::kShiftIn},
+                                                   {'-', CaseText::kNothing},
+                                                   {'n', '\n'},
+                                                   {'"', '"'},
+                                                   {'\\', '\\'}};
+    const char c = at_ < line_.size() ? line_[at_++] : '\0';
+    if (c == 'x') return CaseText::kByte | hex(2);
+    if (c == 'u') return hex(4);
+    if (kEscapes.count(c) == 0) fail("an unknown escape");
+    return kEscapes.at(c);
   }
   uint32_t hex(size_t digits) {
     const std::string number = line_.substr(std::min(at_, line_.size()), digits);

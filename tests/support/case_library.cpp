@@ -1,6 +1,6 @@
 #include "support/case_library.h"
 
-#include <algorithm>
+#include <cstring>
 #include <stdexcept>
 
 #include "codepage/lxunicode.h"
@@ -8,6 +8,7 @@
 #include "core/lxformat.h"
 #include "core/lxobjtypes.h"
 #include "lx.h"
+#include "object_file.h"
 
 namespace lx::test {
 
@@ -17,77 +18,18 @@ namespace fmt = format::codepage;
 namespace words = format::language;
 namespace lands = format::territory;
 
-void add_pair(TinyCodepage* cp, uint32_t half, uint32_t full) {
+/// Gives a codepage another pair of widths behind those that it has, which move to the end of the payload.
+void add_pair(TinyCodepage* cp, const fmt::WidthPair& pair) {
   ByteString& payload = cp->file.sections[0];
+  const uint8_t* const pairs = payload.data() + le16(payload.data() + fmt::kPairs);
   const uint16_t count = le16(payload.data() + fmt::kPairCount);
-  if (count == 0) put_le16(payload.data() + fmt::kPairs, static_cast<uint16_t>(payload.size()));
+  const ByteString moved(pairs, pairs + size_t{count} * fmt::WidthPair::kBytes);
+  put_le16(payload.data() + fmt::kPairs, static_cast<uint16_t>(payload.size()));
   put_le16(payload.data() + fmt::kPairCount, static_cast<uint16_t>(count + 1));
-  payload.resize(payload.size() + fmt::WidthPair::kBytes);
-  fmt::WidthPair{half, full}.write(payload.data() + payload.size() - fmt::WidthPair::kBytes);
+  payload.insert(payload.end(), moved.begin(), moved.end());
+  lexicor_data::append_record(payload, pair);
 }
 
-/// Fills the width tables by the Unicode rule.
-TinyCodepage with_widths(TinyCodepage cp) {
-  const size_t table = le16(cp.file.sections[0].data() + fmt::kFullWidth);
-  for (const TinyCharacter& c : cp.characters) {
-    const TinyCharacter* const full = cp.find(unicode_half_to_full(c.unicode));
-    if (full == nullptr || full->code == c.code || cp.width == 1) continue;
-    if (c.code <= 0xFF)
-      put_le32(cp.file.sections[0].data() + table + 4 * c.code, full->code);
-    else
-      add_pair(&cp, c.code, full->code);
-  }
-  return cp;
-}
-
-CodepageBuilder sjis(uint16_t id, const char* name) {
-  CodepageBuilder builder(id, name, 2);
-  builder.lead(0x81, 0x9F, 2).lead(0xE0, 0xFC, 2).ascii().map(0xA1, 0xFF61, 63).map(0x8140, 0x3000);
-  builder.map(0x824F, 0xFF10, 10).map(0x8260, 0xFF21, 26).map(0x8281, 0xFF41, 26).map(0x829F, 0x3041, 83);
-  builder.map(0x8340, 0x30A1, 63).map(0x8440, 0xFFE8, 7).map(0x84A0, 0x2502).map(0x889F, 0x4E9C);
-  builder.map(0x898E, 0x5186).map(0xE0FC, 0x4EF0);
-  return builder;
-}
-
-/// EBCDIC with two-byte characters; small letters where 930 has them, or where all others do.
-TinyCodepage ebcdic(uint16_t id, const char* name, bool katakana) {
-  CodepageBuilder builder(id, name, 2);
-  builder.shift(0x0E, 0x0F).substitution(0x6F).map(0x00, 0x00, 4).map(0x25, 0x0A).map(0x40, ' ').map(0x6F, '?');
-  builder.map(0x4B, '.').map(0x4D, '(').map(0x4E, '+').map(0x5A, '!').map(0x5B, '$').map(0x5D, ')').map(0x5E,
-                                                                                                        ';');
-  builder.map(0x60, '-').map(0x61, '/').map(0x6B, ',').map(0x6C, '%').map(0x6D, '_').map(0x7A, ':').map(0x7B,
-                                                                                                        '#');
-  builder.map(0x7D, '\'').map(0xC1, 'A', 9).map(0xD1, 'J', 9).map(0xE2, 'S', 8).map(0xF0, '0', 10);
-  if (katakana)
-    builder.map(0x62, 'a', 8).map(0x71, 'i', 8).map(0x8B, 'q').map(0x9B, 'r').map(0xAB, 's').map(0xB3, 't', 7);
-  else
-    builder.map(0x81, 'a', 9).map(0x91, 'j', 9).map(0xA2, 's', 8);
-  builder.map(0x4040, 0x3000).map(0x4281, 0xFF41, 9).map(0x42C1, 0xFF21, 9).map(0x42F0, 0xFF10, 10);
-  builder.map(0x4447, 0x3041, 83).map(0x4541, 0x4E9C, 3).map(0x4551, 0x5186);
-  return with_widths(builder.build());
-}
-
-TinyCodepage utf8() {
-  CodepageBuilder builder(fmt::kUtf8Id, "UTF8", 3);
-  builder.ascii().lead(0xC0, 0xDF, 2).lead(0xE0, 0xFF, 3);
-  builder.map(0xC2A0, 0xA0, 32).map(0xC380, 0xC0, 64).map(0xC480, 0x100, 64).map(0xCC80, 0x300, 16);
-  builder.map(0xD9A0, 0x660, 10)
-      .map(0xE28080, 0x2000)
-      .map(0xE28090, 0x2010, 2)
-      .map(0xE282AC, 0x20AC)
-      .map(0xE29883, 0x2603);
-  builder.map(0xE38080, 0x3000, 4)
-      .map(0xE38181, 0x3041, 63)
-      .map(0xE4B880, 0x4E00, 64)
-      .map(0xE4BA80, 0x4E80, 64);
-  builder.map(0xE4BC80, 0x4F00).map(0xE58686, 0x5186).map(0xEFBC90, 0xFF10, 10).map(0xEFBCA1, 0xFF21, 26);
-  return with_widths(builder.map(0xEFBD81, 0xFF41, 26).map(0xEFBDA1, 0xFF61, 31).build());
-}
-
-ByteString built_in_language() {
-  const Bytes built_in = kBuiltInLanguage.sections.section[0];
-  return ByteString(built_in.data, built_in.data + built_in.size);
-}
 void add_specials(ByteString* payload, size_t count, size_t table,
                   const std::vector<SpecialMapping>& specials) {
   put_le16(payload->data() + 2 * count, static_cast<uint16_t>(specials.size()));
@@ -99,13 +41,13 @@ void add_specials(ByteString* payload, size_t count, size_t table,
     }
 }
 ByteString special_language() {
-  ByteString payload = built_in_language();
+  ByteString payload = payload_of(kBuiltInLanguage);
   add_specials(&payload, words::kUpperSpecials, words::kUpperSpecialTable, upper_specials());
   add_specials(&payload, words::kLowerSpecials, words::kLowerSpecialTable, lower_specials());
   return payload;
 }
 ByteString kana_language(bool long_names) {
-  ByteString payload = built_in_language();
+  ByteString payload = payload_of(kBuiltInLanguage);
   for (unsigned word = words::kFirstDay; word < words::kLastText - 1; ++word) {
     uint8_t* const name = payload.data() + le16(payload.data() + 2 * word);
     if (le16(name) != 0) put_le16(name, static_cast<uint16_t>(0x3041 + word));
@@ -116,8 +58,7 @@ ByteString kana_language(bool long_names) {
 }
 
 ByteString elsewhere() {
-  const Bytes built_in = kBuiltInTerritory.sections.section[0];
-  ByteString payload(built_in.data, built_in.data + built_in.size);
+  ByteString payload = payload_of(kBuiltInTerritory);
   const uint16_t separators[] = {',', '.', ';', ',', 0xE0};
   for (size_t i = 0; i < std::size(separators); ++i)
     put_le16(payload.data() + 2 * (lands::kSeparators + i), separators[i]);
@@ -125,6 +66,11 @@ ByteString elsewhere() {
   put_le16(payload.data() + 2 * lands::kFlags, 0);
   put_le16(payload.data() + le16(payload.data() + 2 * (lands::kInternationalCurrency - 1)), 0x3041);
   return payload;
+}
+
+std::vector<TinyCodepage> with_common(std::vector<TinyCodepage> codepages) {
+  codepages.push_back(tiny_codepages().back());
+  return codepages;
 }
 
 /// Gives the characters of several bytes of a loaded codepage their other case.
@@ -146,17 +92,12 @@ Units line_ends(const TinyCodepage& cp) {
 
 const std::vector<TinyCodepage>& case_codepages() {
   static const std::vector<TinyCodepage> all = [] {
-    std::vector<TinyCodepage> made{tiny_single(),
-                                   with_widths(sjis(9002, "SJIS").build()),
-                                   tiny_euc(),
-                                   tiny_four(),
-                                   ebcdic(9005, "SHIFT", false),
-                                   utf8(),
-                                   ebcdic(930, "K930", true),
-                                   with_widths(sjis(9012, "ODD").build())};
-    for (const auto& [place, name] : {std::pair(0, "SINGLE"), {2, "EUC"}, {3, "FOUR"}})
-      made[static_cast<size_t>(place)].file.name = name;
-    add_pair(&made.back(), 0x8141, '!');
+    std::vector<TinyCodepage> made = tiny_codepages();
+    made.pop_back();  // US-ASCII
+    for (TinyCodepage& cp : made) cp.file.name.erase(0, strlen("TINY-"));
+    made.push_back(ebcdic(930, "K930", true));
+    made.push_back(shift_jis(9012, "ODD"));
+    add_pair(&made.back(), {0x8141, '!'});
     for (TinyCodepage& cp : made)
       for (size_t i = 0; i < 4; ++i)
         cp.file.sections[0][fmt::kLineEnds + i] = static_cast<uint8_t>(cp.find(line_ends(cp)[i])->code);
@@ -216,54 +157,14 @@ SortBuilder example_sort() {
   return sort;
 }
 
-CaseLibrary::CaseLibrary(const SortBuilder& sort) {
-  const auto& codepages = case_codepages();
-  std::vector<ScratchDirectory::Codepage> files{{fmt::kCommonId, "US-ASCII", ascii_codepage()}};
-  for (const TinyCodepage& codepage : codepages) files.push_back(codepage.file);
-  // The control file lists identifiers in ascending order.
-  std::sort(files.begin(), files.end(), [](const auto& a, const auto& b) { return a.id < b.id; });
-  directory_.write_locale(files);
-  std::vector<ControlRecord> records{{1, LX_LANGUAGE, "English"},      {2, LX_LANGUAGE, "Special"},
-                                     {3, LX_LANGUAGE, "Kana"},         {4, LX_LANGUAGE, "Long"},
-                                     {276, LX_TERRITORY, "Elsewhere"}, {840, LX_TERRITORY, "UnitedStates"}};
-  for (const auto& file : files) records.push_back({file.id, LX_CODEPAGE, file.name});
-  records.push_back({1, LX_SORT, "Test"});
-  directory_.write("control.nls", control_file(records));
-  directory_.write("la_00002.nls", object_file({special_language()}));
-  directory_.write("la_00003.nls", object_file({kana_language(false)}));
-  directory_.write("la_00004.nls", object_file({kana_language(true)}));
-  directory_.write("te_00276.nls", object_file({elsewhere()}));
-  directory_.write("so_00001.nls", object_file({sort.payload()}));
-  if (LXInit(directory_.path().c_str(), Hooks::allocate, Hooks::release, &hooks_, LX_NO_DEFAULTS) != LX_OK)
-    throw std::runtime_error("LXInit failed");
-  open_ = true;
-  for (const TinyCodepage& codepage : codepages)
+CaseLibrary::CaseLibrary(const SortBuilder& sort)
+    : TinyLibrary(with_common(case_codepages()), {{{2, LX_LANGUAGE, "Special"}, special_language()},
+                                                  {{3, LX_LANGUAGE, "Kana"}, kana_language(false)},
+                                                  {{4, LX_LANGUAGE, "Long"}, kana_language(true)},
+                                                  {{276, LX_TERRITORY, "Elsewhere"}, elsewhere()},
+                                                  {{1, LX_SORT, "Test"}, sort.payload()}}) {
+  for (const TinyCodepage& codepage : case_codepages())
     if (codepage.width > 1) set_cases(codepage, locale(codepage));
-}
-
-bool CaseLibrary::close() {
-  if (!open_) return true;
-  open_ = false;
-  bool good = true;
-  for (const auto& [name, locale] : locales_) good &= LXReleaseLocale(locale) == LX_OK;
-  good &= LXTerm() == LX_OK;
-  return good && hooks_.live_blocks() == 0 && hooks_.wrong_frees() == 0;
-}
-
-LXLocale* CaseLibrary::new_locale(const TinyCodepage& codepage, const std::string& language,
-                                  const std::string& sort) {
-  const std::string name = language + "_UnitedStates." + codepage.file.name + (sort.empty() ? "" : "@" + sort);
-  int32_t rc = LX_OK;
-  LXLocale* const made = LXGetLocale(name.c_str(), 0, &rc);
-  if (made == nullptr) throw std::runtime_error("no locale " + name + ": " + std::to_string(rc));
-  return made;
-}
-
-LXLocale* CaseLibrary::locale(const TinyCodepage& codepage, const std::string& language,
-                              const std::string& sort) {
-  LXLocale*& kept = locales_[language + "." + codepage.file.name + "@" + sort];
-  if (kept == nullptr) kept = new_locale(codepage, language, sort);
-  return kept;
 }
 
 }  // namespace lx::test

@@ -2,13 +2,10 @@
 // and width tables, languages with special mappings and with kana in their names, and a sort.
 #pragma once
 
-#include <map>
 #include <string>
 #include <vector>
 
 #include "support/forms.h"
-#include "support/hooks.h"
-#include "support/object_files.h"
 #include "support/sort_builder.h"
 #include "support/tiny_codepages.h"
 
@@ -39,29 +36,9 @@ SortBuilder example_sort();
 /// Languages: English; Special; Kana, whose names begin with kana; Long, whose days run together besides, and
 /// which says AM in the afternoon. The territory Elsewhere, 276, has other separators, one of which is no ASCII,
 /// and a kana for a currency. The sort is called Test.
-class CaseLibrary {
+class CaseLibrary : public TinyLibrary {
  public:
   explicit CaseLibrary(const SortBuilder& sort = example_sort());
-  ~CaseLibrary() { close(); }
-  CaseLibrary(const CaseLibrary&) = delete;
-  CaseLibrary& operator=(const CaseLibrary&) = delete;
-
-  /// Releases everything: whether each block came back, once.
-  bool close();
-  Hooks& hooks() { return hooks_; }
-
-  /// A locale that is kept to the end, with English or another language and binary order or a sort.
-  LXLocale* locale(const TinyCodepage& codepage, const std::string& language = "English",
-                   const std::string& sort = "");
-  /// A locale to change; the caller releases it.
-  LXLocale* new_locale(const TinyCodepage& codepage, const std::string& language = "English",
-                       const std::string& sort = "");
-
- private:
-  ScratchDirectory directory_;
-  Hooks hooks_;
-  std::map<std::string, LXLocale*> locales_;
-  bool open_ = false;
 };
 
 }  // namespace lx::test

@@ -10,11 +10,75 @@
 
 namespace lx::test {
 
+/// Gives `put` a buffer and its size in units, in bytes with LX_CHARACTERS, of which each character may take six,
+/// and gives back what it wrote: so many units as it says, or in characters up to what is as it was. Nothing
+/// behind the room is touched.
+template <class Unit, class Put>
+std::vector<Unit> put_into(int32_t size, uint32_t flags, int32_t* result, Put put) {
+  constexpr Unit kCanary = static_cast<Unit>(0xA5A5A5A5);
+  const bool by_chars = sizeof(Unit) == 1 && (flags & LX_CHARACTERS) != 0;
+  const size_t room = static_cast<size_t>(std::max(size, 0)) * (by_chars ? 6 : 1);
+  std::vector<Unit> buffer(room + 4, kCanary);
+  *result = put(buffer.data(), size);
+  EXPECT_LE(*result, std::max(size, 0));
+  EXPECT_EQ(std::vector<Unit>(buffer.begin() + static_cast<ptrdiff_t>(room), buffer.end()),
+            std::vector<Unit>(4, kCanary))
+      << "behind the size " << size;
+  size_t end = static_cast<size_t>(std::max(*result, 0));
+  if (by_chars)
+    for (end = room; end > 0 && buffer[end - 1] == kCanary;) --end;
+  buffer.resize(end);
+  return buffer;
+}
+
+/// What a call wrote in a locale, without the null that LX_TERMINATE asks for.
+template <class F>
+struct Written {
+  Units text;
+  Text<typename F::Unit> units;
+  int32_t result, code;
+};
+template <class F, class Put>
+Written<F> written(const F& form, LXLocale* in, int32_t size, uint32_t flags, Put put) {
+  Written<F> made{};
+  auto out = put_into<typename F::Unit>(size, flags, &made.result, put);
+  made.code = LXGetError(in);
+  if (made.result > 0 && (flags & LX_TERMINATE) != 0) {
+    EXPECT_EQ(out.at(out.size() - 1), 0);
+    out.pop_back();
+  }
+  made.units.assign(out.begin(), out.end());
+  made.text = decode(form, in, made.units);
+  return made;
+}
+
+/// The tokens of a text, which is changed, in a codepage; what is left counts down to 0 with the last one.
+template <class F>
+std::vector<Units> tokens_of(const F& form, const TinyCodepage& cp, LXLocale* in,
+                             std::vector<typename F::Unit>& text, int32_t length,
+                             const std::vector<typename F::Unit>& set, int32_t set_length, uint32_t flags) {
+  using Unit = typename F::Unit;
+  std::vector<Units> tokens;
+  Unit* next = nullptr;
+  states.result = 0;
+  for (Unit* at = text.data(); at != nullptr; at = next) {
+    const Unit* const token = form.tok(in, at, &length, set.data(), set_length, &next, flags);
+    EXPECT_EQ(next == nullptr, length == 0);
+    if (token == nullptr) break;
+    const Unit* const end = text.data() + text.size();
+    states.text = cp.shift ? states.token : 0;
+    tokens.push_back(decode(form, in, Text<Unit>(token, std::find(token, end, Unit{0}))));
+    states.text = 0;
+  }
+  return tokens;
+}
+
 class CaseTest : public testing::Test {
  protected:
   void TearDown() override { EXPECT_TRUE(library.close()); }
 
   size_t below(size_t n) { return random() % n; }
+  int any(size_t end) { return static_cast<int>(below(end)); }
   template <class List>
   auto any_of(const List& list) {
     return list[below(std::size(list))];

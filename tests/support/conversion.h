@@ -1,40 +1,14 @@
-// What conversion and mapping give: a character in the units of a form, as a small codepage has it; a model of an
-// output of any size; and an open conversion that is called with buffers of their exact sizes.
+// What conversion and mapping give: a model of an output of any size; and an open conversion that is called with buffers of their exact sizes.
 #pragma once
 
 #include <gtest/gtest.h>
 
 #include <string>
-#include <type_traits>
 #include <vector>
 
 #include "lx.h"
-#include "support/forms.h"
-#include "support/tiny_codepages.h"
 
 namespace lx::test {
-
-/// A character of a codepage, or its substitution byte.
-template <class F>
-std::vector<typename F::Unit> units_of(const TinyCodepage& cp, LXUChar u) {
-  if constexpr (std::is_same_v<F, Unicode>) {
-    return {u};
-  } else if constexpr (std::is_same_v<F, Wide>) {
-    LXWChar code = 0;
-    for (char byte : cp.encode({u})) code = code << 8 | static_cast<uint8_t>(byte);
-    return {code};
-  } else {
-    const std::string bytes = cp.encode({u});
-    return {bytes.begin(), bytes.end()};
-  }
-}
-template <class F>
-std::vector<typename F::Unit> units_of(const TinyCodepage& cp, const Units& text) {
-  std::vector<typename F::Unit> all;
-  for (LXUChar u : text)
-    for (auto unit : units_of<F>(cp, u)) all.push_back(unit);
-  return all;
-}
 
 /// What a conversion should give: pieces of output, one a character, in order.
 template <class Unit>

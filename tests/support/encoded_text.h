@@ -1,5 +1,5 @@
-// A text in the units of a form, made from the mappings of a small codepage and not by the library, and where
-// its characters and shift bytes stand.
+// A text in the units of a form, made from the mappings of a small codepage and not by the library, with its
+// substitution for what it has not, and where its characters and shift bytes stand.
 #pragma once
 
 #include <algorithm>
@@ -7,6 +7,7 @@
 #include <type_traits>
 #include <vector>
 
+#include "codepage/lxcodepage.h"
 #include "support/forms.h"
 #include "support/tiny_codepages.h"
 
@@ -25,13 +26,16 @@ struct Encoded {
       : shift_in(static_cast<Unit>(cp.shift_in)) {
     constexpr bool kBytes = sizeof(Unit) == 1;
     for (const LXUChar u : text) {
-      const TinyCharacter& c = *cp.find(u);
-      const std::string bytes = cp.encode({u}, &state);
-      codes.push_back(std::is_same_v<F, Unicode> ? u : c.code);
-      if (std::is_same_v<F, Ex> && bytes.size() > c.bytes.size()) add_shift(static_cast<Unit>(bytes[0]));
+      const LXShiftState before = state;
+      std::string bytes = cp.encode({u}, &state);
+      if (state != before) {
+        if (std::is_same_v<F, Ex>) add_shift(static_cast<Unit>(bytes[0]));
+        bytes.erase(0, 1);
+      }
+      codes.push_back(std::is_same_v<F, Unicode> ? u : pack(bytes_of(bytes.data()), bytes.size()));
       start.push_back(units.size());
       if (kBytes)
-        units.insert(units.end(), c.bytes.begin(), c.bytes.end());
+        units.insert(units.end(), bytes.begin(), bytes.end());
       else
         units.push_back(static_cast<Unit>(codes.back()));
       end.push_back(units.size());
@@ -66,10 +70,5 @@ struct Encoded {
     return all;
   }
 };
-
-/// Whether a codepage has all characters of a text.
-inline bool has_all(const TinyCodepage& cp, const Units& text) {
-  return std::all_of(text.begin(), text.end(), [&](LXUChar u) { return cp.find(u) != nullptr; });
-}
 
 }  // namespace lx::test

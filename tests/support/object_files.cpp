@@ -2,6 +2,7 @@
 
 #include <unistd.h>
 
+#include <algorithm>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
@@ -86,26 +87,39 @@ bool ScratchDirectory::exists(const std::string& name) const {
   return access(file(name).c_str(), F_OK) == 0;
 }
 
-void ScratchDirectory::write_locale(const std::vector<Codepage>& codepages) const {
-  ByteString language = copy(kBuiltInLanguage.sections.section[0]);
-  put_le16(language.data() + 2 * format::language::kDefaultTerritory, 840);
-  if (!codepages.empty())
-    put_le16(language.data() + 2 * format::language::kDefaultCodepage, codepages.front().id);
-  write("la_00001.nls", object_file({language}));
-  write("te_00840.nls", object_file({copy(kBuiltInTerritory.sections.section[0])}));
-  std::vector<ControlRecord> records{{1, 0, "English"}, {840, 1, "UnitedStates"}};
-  for (const Codepage& codepage : codepages) {
+void ScratchDirectory::write_locale(const std::vector<Codepage>& codepages, std::vector<Object> others) const {
+  static constexpr const char* kPrefixes[] = {"la", "te", "cp", "so"};
+  const auto order = [](const ControlRecord& r) { return std::pair(r.type, r.id); };
+  std::vector<ControlRecord> records;
+  const auto add = [&](const ControlRecord& record, const ByteString& content) {
     char name[32];
-    snprintf(name, sizeof(name), "cp_%05d.nls", codepage.id);
-    write(name, object_file(codepage.sections, codepage.version));
-    records.push_back({codepage.id, 2, codepage.name});
+    snprintf(name, sizeof(name), "%s_%05d.nls", kPrefixes[record.type], record.id);
+    write(name, content);
+    records.push_back(record);
+  };
+  for (const Codepage& codepage : codepages)
+    add({codepage.id, LX_CODEPAGE, codepage.name}, object_file(codepage.sections, codepage.version));
+  ByteString language = payload_of(kBuiltInLanguage);
+  put_le16(language.data() + 2 * format::language::kDefaultTerritory, 840);
+  if (!codepages.empty()) {
+    const auto first = std::min_element(codepages.begin(), codepages.end(),
+                                        [](const auto& a, const auto& b) { return a.id < b.id; });
+    put_le16(language.data() + 2 * format::language::kDefaultCodepage, first->id);
   }
+  others.push_back({{1, LX_LANGUAGE, "English"}, language});
+  others.push_back({{840, LX_TERRITORY, "UnitedStates"}, payload_of(kBuiltInTerritory)});
+  for (const Object& object : others) add(object.record, object_file({object.payload}));
+  std::sort(records.begin(), records.end(),
+            [&](const ControlRecord& a, const ControlRecord& b) { return order(a) < order(b); });
   write("control.nls", control_file(records));
 }
 
 std::vector<ByteString> ascii_codepage() {
   const Sections& built_in = kBuiltInCodepage.sections;
   return {copy(built_in.section[0]), {}, copy(built_in.section[2])};
+}
+ByteString payload_of(const BuiltIn& object) {
+  return copy(object.sections.section[0]);
 }
 
 }  // namespace lx::test

@@ -5,6 +5,7 @@
 #include <string>
 #include <vector>
 
+#include "core/lxobjtypes.h"
 #include "locale/lxlocale.h"
 
 namespace lx::test {
@@ -36,19 +37,26 @@ class ScratchDirectory {
   ByteString read(const std::string& name) const;
   bool exists(const std::string& name) const;
 
-  /// Writes a control file with English 1, UnitedStates 840 (their payloads are the built-in ones, with the
-  /// language's defaults pointing at 840 and at the first codepage), and the codepages given.
+  /// Writes English 1, UnitedStates 840 (their payloads are the built-in ones, with the language's defaults
+  /// pointing at 840 and at the codepage of the lowest identifier), the codepages and other objects given, and
+  /// the control file.
   struct Codepage {
     uint16_t id;
     std::string name;
     std::vector<ByteString> sections;
     uint32_t version = 2;
   };
-  void write_locale(const std::vector<Codepage>& codepages) const;
+  struct Object {
+    ControlRecord record;
+    ByteString payload;
+  };
+  void write_locale(const std::vector<Codepage>& codepages, std::vector<Object> others = {}) const;
 
  private:
   std::string path_;
 };
+
+ByteString payload_of(const BuiltIn& object);
 
 /// Payload and low array of a single-byte codepage that is US-ASCII in its first half; a base to change in
 /// tests.

@@ -35,8 +35,7 @@ struct TinyCodepage {
   const TinyCharacter* find(uint16_t unicode) const;
 };
 
-/// Packs a codepage from its mappings as the locale-data compiler does, but for the width tables, which stay
-/// empty.
+/// Packs a codepage from its mappings as the locale-data compiler does.
 class CodepageBuilder {
  public:
   CodepageBuilder(uint16_t id, std::string name, uint8_t width);
@@ -44,16 +43,12 @@ class CodepageBuilder {
   CodepageBuilder& lead(uint8_t first, uint8_t last, uint8_t length);
   /// `count` characters from this packed code and this Unicode value on, both ways.
   CodepageBuilder& map(uint32_t code, uint16_t unicode, unsigned count = 1);
-  struct Range {
-    uint32_t code;
-    uint16_t unicode;
-    unsigned count = 1;
-  };
-  CodepageBuilder& map(const std::vector<Range>& ranges) {
-    for (const Range& range : ranges) map(range.code, range.unicode, range.count);
+  CodepageBuilder& ascii() { return map(0, 0, 0x80); }
+  /// The characters of a text, from this code on.
+  CodepageBuilder& text(uint32_t code, const char* ascii) {
+    for (; *ascii != 0; ++ascii) map(code++, static_cast<uint16_t>(*ascii));
     return *this;
   }
-  CodepageBuilder& ascii() { return map(0, 0, 0x80); }
   CodepageBuilder& shift(uint8_t out, uint8_t in);
   CodepageBuilder& substitution(uint8_t byte) { return model_.header.substitution = byte, *this; }
   TinyCodepage build() const;
@@ -66,7 +61,7 @@ class CodepageBuilder {
 
 /// ASCII and U+00A0 to U+00FF, with the euro sign in place of U+00A4.
 TinyCodepage tiny_single();
-/// One and two bytes; second bytes that are ASCII letters; single-byte katakana.
+/// One and two bytes; second bytes that are ASCII letters; single-byte katakana, and width tables.
 TinyCodepage tiny_shift_jis();
 /// One to three bytes; 0x5C is the yen sign, so that ASCII is not copied as it is.
 TinyCodepage tiny_euc();
@@ -79,10 +74,17 @@ TinyCodepage tiny_utf8();
 /// All of these, and US-ASCII with the identifier 367.
 std::vector<TinyCodepage> tiny_codepages();
 
-/// The library on a scratch directory. Bad files are refused, not replaced by the built-in codepage.
+/// Two of which a test may make more: one and two bytes, and EBCDIC with small letters where 930 has them, or
+/// where all others do.
+TinyCodepage shift_jis(uint16_t id, const char* name);
+TinyCodepage ebcdic(uint16_t id, const char* name, bool katakana);
+
+/// The library on a scratch directory with English, UnitedStates, these codepages, and other objects. Bad files
+/// are refused, not replaced by the built-in objects.
 class TinyLibrary {
  public:
-  explicit TinyLibrary(const std::vector<TinyCodepage>& codepages = tiny_codepages());
+  explicit TinyLibrary(const std::vector<TinyCodepage>& codepages = tiny_codepages(),
+                       const std::vector<ScratchDirectory::Object>& others = {});
   ~TinyLibrary() { close(); }
   TinyLibrary(const TinyLibrary&) = delete;
   TinyLibrary& operator=(const TinyLibrary&) = delete;
@@ -91,11 +93,15 @@ class TinyLibrary {
   bool close();
   Hooks& hooks() { return hooks_; }
 
-  /// A locale of this codepage, kept to the end; throws when there is none.
-  LXLocale* locale(const TinyCodepage& codepage);
+  /// A locale that is kept to the end, with English or another language and binary order or a sort; throws when
+  /// there is none.
+  LXLocale* locale(const TinyCodepage& codepage, const std::string& language = "English",
+                   const std::string& sort = "");
+  /// A locale to change; the caller releases it.
+  LXLocale* new_locale(const TinyCodepage& codepage, const std::string& language = "English",
+                       const std::string& sort = "");
   /// The loaded codepage, or null with the code.
   const LXObject* object(uint16_t id, int32_t* rc);
-  const LXObject* object(const TinyCodepage& codepage);
 
  private:
   ScratchDirectory directory_;

@@ -6,7 +6,7 @@
 namespace lx::test {
 namespace {
 
-constexpr uint32_t kCase = LX_CASE_INSENSITIVE, kWidth = LX_WIDTH_INSENSITIVE, kBlanks = LX_IGNORE_BLANKS;
+constexpr uint32_t kCase = LX_CASE_INSENSITIVE, kWidth = LX_WIDTH_INSENSITIVE;
 
 std::string encoded(const TinyCodepage& cp, const Units& text, size_t from = 0) {
   return cp.encode({text.begin() + static_cast<ptrdiff_t>(from), text.end()});
@@ -102,13 +102,10 @@ TEST_F(Compare, AllFormsFollowTheModel) {
     }
 }
 
+/// Two copies for special mappings, which are refused, and one for folding, without which the texts compare.
 TEST_F(Compare, MemoryThatFails) {
-  const TinyCodepage& single = case_codepage("SINGLE");
   const std::string text(300, 'x'), blank = text + " ";
-  LXLocale *const in = library.locale(single), *const mapping = library.locale(single, "Special");
-  library.hooks().fail_at(1);
-  EXPECT_EQ(LXStrcmp(in, blank.c_str(), -1, text.c_str(), -1, kBlanks), 1);  // the blank counts
-  EXPECT_EQ(LXGetError(in), LX_OK);
+  LXLocale* const mapping = library.locale(case_codepage("SINGLE"), "Special");
   for (size_t failing : {1u, 2u, 3u}) {
     library.hooks().fail_at(failing);
     EXPECT_EQ(LXStrcmp(mapping, blank.c_str(), -1, text.c_str(), -1, kCase), failing == 3 ? 1 : 0);

@@ -114,7 +114,6 @@ TEST_F(Strings, ConcatenationKeepsTextsWhole) {
 TEST_F(Strings, TokensComeOutWhole) {
   for_all([&](const auto& kind, const TinyCodepage& cp, LXLocale* in) {
     using K = std::decay_t<decltype(kind)>;
-    using Unit = typename K::Unit;
     const Units letters = alphabet(cp), text = any_text(letters, 9),
                 set = letters.substr(random() % letters.size(), 2);
     const Encoded<K> whole(cp, text);
@@ -133,21 +132,9 @@ TEST_F(Strings, TokensComeOutWhole) {
         at = end + 1;
       }
       if (chars == 0 || (tail && set.find(text[chars - 1]) != Units::npos)) expected.push_back({});
-      std::vector<Units> tokens;
-      int32_t length = cut == -2 ? n32(text.size()) : cut;
-      const uint32_t flags = cut == -2 ? LX_CHARACTERS : 0;
-      Unit* next = nullptr;
-      states.result = 0;
-      for (Unit* at = block.data(); at != nullptr; at = next) {
-        const Unit* const token = K::tok(in, at, &length, delimiters.data(), -1, &next, flags);
-        ASSERT_EQ(next == nullptr, length == 0);
-        if (token == nullptr) break;
-        const Unit* const block_end = block.data() + block.size();
-        const Text<Unit> units(token, std::find(token, block_end, Unit{0}));
-        states.text = cp.shift ? states.token : 0;
-        tokens.push_back(decode(kind, in, units));
-        states.text = 0;
-      }
+      const auto tokens = cut == -2
+                              ? tokens_of(kind, cp, in, block, n32(text.size()), delimiters, -1, LX_CHARACTERS)
+                              : tokens_of(kind, cp, in, block, cut, delimiters, -1, 0);
       ASSERT_EQ(tokens, expected) << testing::PrintToString(whole.units) << " set "
                                   << testing::PrintToString(delimiters) << " length " << cut;
     }
