@@ -1,5 +1,4 @@
-// The trace: what the core and locale handles say at which level, the events of a call, and silence when the
-// trace is off.
+// What the core and locale handles say in the trace, and at which level.
 #include <unistd.h>
 
 #include <algorithm>
@@ -177,40 +176,6 @@ TEST_F(TraceTest, Texts) {
   }
   for (const CaseRow& row : case_rows("core/trace_texts.txt")) expected += row[0] + "\n";
   EXPECT_EQ(said, expected);
-}
-
-TEST_F(TraceTest, Events) {
-  directory.write_locale({{367, "US-ASCII", ascii_codepage()}});
-  char drive[4], directory_part[256], file[15], extension[5];
-  RecordingTrace::set_level(RAS1_LEVEL_EVENTS);
-  init();
-  LXGetObjFromName(nullptr, LX_LANGUAGE, "X", 1, 0, &ignored);
-  const auto entry = reinterpret_cast<intptr_t>(LXGetObjFromID(nullptr, LX_CODEPAGE, 367, 0, &ignored));
-  LXSetLocale("X", 0);
-  LXGetLocale("X", 0, nullptr);
-  LXLocale* const locale = LXGetLocale("English", 0, nullptr);
-  LXConvertLocale(locale, file, 0);
-  LXReleaseLocale(locale);
-  SplitPath("/d/name.ext", drive, directory_part, file, extension);
-  LXTerm();
-  LXTerm();
-  RecordingTrace::set_level(0);
-  std::vector<intptr_t> values;  // of the calls from outside; -1 is an exit without one
-  int depth = 0;
-  for (const TraceRecord& record : RecordingTrace::take()) {
-    EXPECT_NE(record.kind, TraceRecord::kMessage) << record.text;
-    EXPECT_FALSE(record.unit.empty());
-    EXPECT_GT(record.line, 0);
-    depth += record.kind == TraceRecord::kEntry ? 1 : -1;
-    ASSERT_GE(depth, 0);
-    if (depth == 0) values.push_back(record.kind == TraceRecord::kExitValue ? record.value : -1);
-  }
-  EXPECT_EQ(depth, 0) << "each entry has its exit";
-  EXPECT_EQ(values,
-            (std::vector<intptr_t>{LX_OK, 0, entry, LX_E_NO_LANGUAGE, 0, reinterpret_cast<intptr_t>(locale), 1,
-                                   0, -1, LX_OK, LX_E_NOT_INITIALIZED}));
-  use([] { LXSetLocale("X", 0); })();
-  EXPECT_TRUE(RecordingTrace::take().empty()) << "the trace is off";
 }
 
 }  // namespace
