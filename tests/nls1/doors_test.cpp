@@ -227,7 +227,8 @@ class DoorsTest : public LibraryTest {
     EXPECT_EQ(depth, 0) << name;
     char* end = nullptr;
     const auto number = static_cast<int32_t>(std::strtoll(outcome.c_str(), &end, 10));
-    if (end != outcome.c_str() && !records.empty()) {
+    const bool has_own = name.rfind("LXCom", 0) != 0;  // in those two the common codepage is looked up
+    if (end != outcome.c_str() && !records.empty() && has_own) {
       EXPECT_EQ(records.back().kind, TraceRecord::kExitValue) << name;
       EXPECT_EQ(static_cast<int32_t>(records.back().value), number) << name;
     }
