@@ -59,24 +59,6 @@ class TraceTest : public LibraryTest {
       terminate();
     };
   }
-  /// With another content of a file, which need not be there otherwise.
-  Action with_file(const std::string& name, const ByteString& content, const Action& action = kNothing) {
-    return [=] {
-      const ByteString whole = directory.read(name);
-      directory.write(name, content);
-      use(action)();
-      directory.write(name, whole);
-      if (whole.empty()) std::filesystem::remove(directory.file(name));
-    };
-  }
-  Action with_byte(const std::string& name, size_t at, uint8_t value, const Action& action = kNothing) {
-    ByteString content = directory.read(name);
-    content[at] = value;
-    return with_file(name, content, action);
-  }
-  Action with_aliases(const std::string& text, const Action& action = kNothing) {
-    return with_file("alias.txt", ByteString(text.begin(), text.end()), action);
-  }
   Action without_memory(size_t n) {
     return [this, n] {
       hooks.fail_at(n);
@@ -89,7 +71,8 @@ class TraceTest : public LibraryTest {
 };
 int32_t TraceTest::ignored;
 
-// All of the texts, each at its level only: core/trace_texts.txt holds, by action, what is said.
+// Each text at its level only: core/trace_texts.txt holds, by action, what is said. What is said of damaged files
+// and of aliases shows in tests/cases/cli/trace.txt.
 TEST_F(TraceTest, Texts) {
   if (access(kDefaultControl, F_OK) == 0) GTEST_SKIP();
   directory.write_locale({{367, "US-ASCII", ascii_codepage()}});
@@ -106,8 +89,6 @@ TEST_F(TraceTest, Texts) {
       terminate();
     };
   };
-  ByteString short_table = directory.read("control.nls");
-  short_table.pop_back();
   const std::string long_path(250, 'x'), path = directory.path(), none = directory.file("none");
   const struct {
     const char* name;
@@ -122,16 +103,6 @@ TEST_F(TraceTest, Texts) {
       {"no memory for the area", without_memory(1)},
       {"no memory for the manager", without_memory(2)},
       {"no memory for the records", without_memory(5)},
-      {"bad header", with_byte("control.nls", 0, 0)},
-      {"table before the start", with_byte("control.nls", format::header_section_offset(0) + 3, 0xFF)},
-      {"short table", with_file("control.nls", short_table)},
-      {"refused object",
-       with_byte("cp_00367.nls", format::kHeaderBytes + format::codepage::kWidth, 0,
-                 [] { LXGetObjFromID(nullptr, LX_CODEPAGE, 367, LX_FIND_AND_LOAD, &ignored); })},
-      {"alias", with_aliases("UTF-8 utf8\n")},
-      {"alias without a codepage", with_aliases(" one\n")},
-      {"long codepage name", with_aliases(std::string(33, 'n') + "\n")},
-      {"long alias", with_aliases("A " + std::string(65, 'a') + "\n")},
       {"no memory for an alias",
        [&] {
          directory.write_text("alias.txt", "A one\n");
@@ -141,7 +112,6 @@ TEST_F(TraceTest, Texts) {
          without_memory(calls)();
          std::filesystem::remove(directory.file("alias.txt"));
        }},
-      {"alias looked up", with_aliases("A one\n", [] { LXGetCodepageFromAlias(nullptr, "One"); })},
       {"file rewritten", use([&] { LXCloseFile(open_data(), 0); })},
       {"file gone", use([&] {
          LXFile* file = open_data();
