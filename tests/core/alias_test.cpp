@@ -74,8 +74,10 @@ TEST_F(AliasTest, NoMemoryKeepsWhatWasRead) {
   const size_t calls = hooks.calls();
   EXPECT_EQ(LXTerm(), LX_OK);
   hooks.fail_at(calls - 1);  // the record of the second alias
-  EXPECT_EQ(init(), LX_OK);
+  const auto said = messages(RAS1_LEVEL_ERRORS, [&] { EXPECT_EQ(init(), LX_OK); });
   EXPECT_EQ(all(), "A=ONE ");
+  const std::string bytes = std::to_string(sizeof(AliasRecord));
+  EXPECT_EQ(said.at(0), "Unable to allocate " + bytes + " bytes for codepage A, alias two");
 }
 
 }  // namespace

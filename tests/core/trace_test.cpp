@@ -7,7 +7,6 @@
 #include <set>
 #include <sstream>
 
-#include "core/lxalias.h"
 #include "core/tiny_directory.h"
 #include "support/case_rows.h"
 
@@ -31,8 +30,7 @@ class TraceTest : public LibraryTest {
         {"0x[0-9a-f]+", "ADDRESS"},
         {"\n", "\\n"},
         {allocation(sizeof(GlobalArea)), "allocate AREA "},
-        {allocation(sizeof(LXObjManager)), "allocate MANAGER "},
-        {allocation(sizeof(AliasRecord)), "allocate ALIAS "}};
+        {allocation(sizeof(LXObjManager)), "allocate MANAGER "}};
     for (const auto& [what, name] : names) text = std::regex_replace(text, std::regex(what), name);
     return text;
   }
@@ -103,15 +101,6 @@ TEST_F(TraceTest, Texts) {
       {"no memory for the area", without_memory(1)},
       {"no memory for the manager", without_memory(2)},
       {"no memory for the records", without_memory(5)},
-      {"no memory for an alias",
-       [&] {
-         directory.write_text("alias.txt", "A one\n");
-         init();
-         const size_t calls = hooks.calls();
-         terminate();
-         without_memory(calls)();
-         std::filesystem::remove(directory.file("alias.txt"));
-       }},
       {"file rewritten", use([&] { LXCloseFile(open_data(), 0); })},
       {"file gone", use([&] {
          LXFile* file = open_data();

@@ -1,7 +1,6 @@
 // Locale handles: names in all three forms, defaults and fallback, the default locale, enumeration, the
 // operating system's name, release.
 #include <cstdio>
-#include <type_traits>
 
 #include "core/tiny_directory.h"
 #include "support/case_rows.h"
@@ -207,36 +206,39 @@ TEST_F(LocaleTest, OperatingSystemName) {
   }
 }
 
-/// The lines "type name"; what is not ASCII in a name shows its number.
 template <class Unit>
-int32_t add_line(void* user, int32_t type, const Unit* name) {
-  auto& lines = *static_cast<std::vector<std::string>*>(user);
-  std::string text = std::to_string(type) + " ";
-  for (; *name != 0; ++name) {
-    const auto unit = static_cast<std::make_unsigned_t<Unit>>(*name);
-    text += unit < 128 ? std::string(1, static_cast<char>(unit)) : "<" + std::to_string(unit) + ">";
-  }
-  lines.push_back(text);
-  return text == "3 Last" ? 0 : 7;
+using Names = std::vector<std::basic_string<Unit>>;
+/// Adds a name behind the digit of its type; the fourth is the last one.
+template <class Unit>
+int32_t add_name(void* user, int32_t type, const Unit* name) {
+  auto& names = *static_cast<Names<Unit>*>(user);
+  names.push_back(static_cast<Unit>('0' + type) + std::basic_string<Unit>(name));
+  return names.size() == 4 ? 0 : 7;
 }
 
 TEST_F(LocaleTest, Enumeration) {
-  const std::string x(32, 'x');
   directory.write("cp_00367.nls", object_file(ascii_codepage()));
   directory.write("control.nls", control_file({{1, LX_LANGUAGE, "English"},
                                                {840, LX_TERRITORY, "UnitedStates"},
-                                               {367, LX_CODEPAGE, "\xE9" + x},
+                                               {367, LX_CODEPAGE, "\xE9" + std::string(32, 'x')},
                                                {2, LX_SORT, "Last"},
                                                {3, LX_SORT, "Behind"}}));
   ASSERT_EQ(init(), LX_OK);
-  std::vector<std::string> bytes, wide, unicode;
-  EXPECT_EQ(LXEnumLocales(add_line<char>, &bytes), 0);
-  EXPECT_EQ(LXEnumLocalesW(add_line<LXWChar>, &wide), 0);
-  EXPECT_EQ(LXEnumLocalesU(add_line<LXUChar>, &unicode), 0);
-  EXPECT_EQ(bytes, (std::vector<std::string>{"0 English", "1 UnitedStates", "2 <233>" + x, "3 Last"}));
-  EXPECT_EQ(wide, bytes) << "widened byte by byte, without a sign";
-  bytes[2] = "2 <65533>" + x;
-  EXPECT_EQ(unicode, bytes) << "through the common codepage";
+  Names<char> bytes;
+  Names<LXWChar> wide, widened_bytes;
+  Names<LXUChar> unicode, converted;
+  EXPECT_EQ(LXEnumLocales(add_name<char>, &bytes), 0);
+  EXPECT_EQ(LXEnumLocalesW(add_name<LXWChar>, &wide), 0);
+  EXPECT_EQ(LXEnumLocalesU(add_name<LXUChar>, &unicode), 0);
+  EXPECT_EQ(bytes, (Names<char>{"0English", "1UnitedStates", "2\xE9" + std::string(32, 'x'), "3Last"}));
+  for (const std::string& name : bytes) {
+    widened_bytes.push_back(widened<LXWChar>(name));
+    converted.push_back(widened<LXUChar>(name));
+  }
+  widened_bytes[2][1] = 0xE9;
+  converted[2][1] = 0xFFFD;
+  EXPECT_EQ(wide, widened_bytes) << "byte by byte, without a sign";
+  EXPECT_EQ(unicode, converted) << "through the common codepage";
 }
 
 }  // namespace
