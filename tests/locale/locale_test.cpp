@@ -8,47 +8,32 @@
 namespace lx::test {
 namespace {
 
-namespace words = lx::format::language;
-
 class LocaleTest : public LibraryTest {
  protected:
-  /// The built-in language with other defaults.
-  static ByteString language(uint16_t territory, uint16_t codepage, uint16_t sort) {
-    const Bytes built_in = kBuiltInLanguage.sections.section[0];
-    ByteString payload(built_in.data, built_in.data + built_in.size);
-    put_le16(payload.data() + 2 * words::kDefaultTerritory, territory);
-    put_le16(payload.data() + 2 * words::kDefaultCodepage, codepage);
-    put_le16(payload.data() + 2 * words::kDefaultSort, sort);
-    return object_file({payload});
-  }
-
   // English, French, and three whose defaults are not there, although objects of other types stand where they
   // would be.
   void write_directory() {
     directory.write_locale({{367, "US-ASCII", ascii_codepage()},
                             {850, "Tiny", tiny_shift_jis().file.sections},
                             {930, "Shift", tiny_shift().file.sections}});
+    directory.write("la_00001.nls", language_file(840, 367, 0));
+    directory.write("la_00002.nls", language_file(250, 850, 5));
+    directory.write("la_00003.nls", language_file(9999, 367, 0));
+    directory.write("la_00004.nls", language_file(840, 9999, 0));
+    directory.write("la_00005.nls", language_file(840, 367, 9999));
     directory.write("te_00250.nls", directory.read("te_00840.nls"));
     directory.write("so_00005.nls", object_file({SortBuilder{}.payload()}));
-    std::vector<ControlRecord> records;
-    const auto add_language = [&](const char* name, uint16_t territory, uint16_t codepage, uint16_t sort) {
-      const auto id = static_cast<uint16_t>(records.size() + 1);
-      records.push_back({id, LX_LANGUAGE, name});
-      directory.write("la_0000" + std::to_string(id) + ".nls", language(territory, codepage, sort));
-    };
-    add_language("English", 840, 367, 0);
-    add_language("French", 250, 850, 5);
-    add_language("NoTerritory", 9999, 367, 0);
-    add_language("NoCodepage", 840, 9999, 0);
-    add_language("NoSort", 840, 367, 9999);
-    for (const ControlRecord& record : std::vector<ControlRecord>{{250, LX_TERRITORY, "France"},
-                                                                  {840, LX_TERRITORY, "UnitedStates"},
-                                                                  {367, LX_CODEPAGE, "US-ASCII"},
-                                                                  {850, LX_CODEPAGE, "Tiny"},
-                                                                  {930, LX_CODEPAGE, "Shift"},
-                                                                  {5, LX_SORT, "Default"}})
-      records.push_back(record);
-    directory.write("control.nls", control_file(records));
+    directory.write("control.nls", control_file({{1, LX_LANGUAGE, "English"},
+                                                 {2, LX_LANGUAGE, "French"},
+                                                 {3, LX_LANGUAGE, "NoTerritory"},
+                                                 {4, LX_LANGUAGE, "NoCodepage"},
+                                                 {5, LX_LANGUAGE, "NoSort"},
+                                                 {250, LX_TERRITORY, "France"},
+                                                 {840, LX_TERRITORY, "UnitedStates"},
+                                                 {367, LX_CODEPAGE, "US-ASCII"},
+                                                 {850, LX_CODEPAGE, "Tiny"},
+                                                 {930, LX_CODEPAGE, "Shift"},
+                                                 {5, LX_SORT, "Default"}}));
   }
   void init_directory() {
     write_directory();
@@ -109,7 +94,7 @@ TEST_F(LocaleTest, Names) {
 
 // A default that exists only as an object of another type, next to the empty range, is not found.
 TEST_F(LocaleTest, AnObjectOfAnotherTypeIsNotFound) {
-  directory.write("la_00007.nls", language(7, 367, 0));
+  directory.write("la_00007.nls", language_file(7, 367, 0));
   directory.write("control.nls", control_file({{7, LX_LANGUAGE, "English"}, {367, LX_CODEPAGE, "US-ASCII"}}));
   ASSERT_EQ(init(), LX_OK);
   EXPECT_EQ(LXSetLocale("English", LX_FALLBACK), LX_E_NO_TERRITORY);
@@ -140,7 +125,7 @@ TEST_F(LocaleTest, OtherCodesOfLookUps) {
 // The 16-bit name goes through the common codepage; where there is none, the name is empty.
 TEST_F(LocaleTest, UnicodeNamesNeedTheCommonCodepage) {
   write_directory();
-  directory.write("la_00001.nls", language(840, 850, 0));
+  directory.write("la_00001.nls", language_file(840, 850, 0));
   directory.write("control.nls", control_file({{1, LX_LANGUAGE, "English"},
                                                {2, LX_LANGUAGE, "French"},
                                                {840, LX_TERRITORY, "UnitedStates"},

@@ -7,7 +7,6 @@
 #include <thread>
 
 #include "core/library_fixture.h"
-#include "core/lxobjtypes.h"
 #include "nls1/failing_init.h"
 #include "support/case_rows.h"
 
@@ -56,11 +55,7 @@ class Nls1Test : public LibraryTest {
   /// English and Japanese with what they need, and a sort that has no file.
   void write_directory() {
     directory.write_locale({{367, "US-ASCII", ascii_codepage()}, {954, "JapanEUC", ascii_codepage()}});
-    ByteString language = directory.read("la_00001.nls");
-    uint8_t* words = language.data() + format::kHeaderBytes;
-    put_le16(words + 2 * format::language::kDefaultTerritory, 392);
-    put_le16(words + 2 * format::language::kDefaultCodepage, 954);
-    directory.write("la_00002.nls", language);
+    directory.write("la_00002.nls", language_file(392, 954, 0));
     directory.write("te_00392.nls", directory.read("te_00840.nls"));
     directory.write("control.nls", control_file({{1, LX_LANGUAGE, "English"},
                                                  {2, LX_LANGUAGE, "Japanese"},
