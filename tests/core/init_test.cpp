@@ -48,14 +48,17 @@ TEST_F(InitTest, WorksOnTheBuiltInObjects) {
   EXPECT_EQ(rc, LX_E_NO_LANGUAGE);
 }
 
-// The area of a failed call serves a further try (else it would be lost), unless that has other hooks.
+// The area of a failed call serves a further try, unless that has other hooks.
 TEST_F(InitTest, TriesAgainAfterAFailedCall) {
   Hooks other_hooks;
   for (Hooks* next : {&hooks, &other_hooks}) {
     hooks.fail_at(2);
     EXPECT_EQ(init_with_locale(), LX_E_NOT_INITIALIZED);
     hooks.fail_at(0);
-    EXPECT_EQ(LXInit(directory.path().c_str(), Hooks::allocate, Hooks::release, next, 0), LX_OK);
+    const std::vector<std::string> said = messages(RAS1_LEVEL_DETAIL, [&] {
+      EXPECT_EQ(LXInit(directory.path().c_str(), Hooks::allocate, Hooks::release, next, 0), LX_OK);
+    });
+    EXPECT_EQ(said.at(0) == "Creating global area", next == &other_hooks);
     EXPECT_EQ(hooks.live_blocks() == 0, next == &other_hooks);
     EXPECT_EQ(LXTerm(), LX_OK);
     EXPECT_EQ(next->live_blocks(), 0u);
