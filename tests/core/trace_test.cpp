@@ -69,8 +69,8 @@ class TraceTest : public LibraryTest {
 };
 int32_t TraceTest::ignored;
 
-// Each text at its level only: core/trace_texts.txt holds, by action, what is said. What is said of damaged files
-// and of aliases shows in tests/cases/cli/trace.txt.
+// Each text at its level only: core/trace_texts.txt holds, by action, what is said. What is said of damaged
+// files and of aliases shows in tests/cases/cli/trace.txt.
 TEST_F(TraceTest, Texts) {
   if (access(kDefaultControl, F_OK) == 0) GTEST_SKIP();
   directory.write_locale({{367, "US-ASCII", ascii_codepage()}});

@@ -1,5 +1,5 @@
-// Locale items: which are texts and which are numbers, texts that the codepage has not and the longest ones. What may be
-// set to what, in every form and size, stands in tests/cases/items.txt.
+// Locale items: which are texts and which are numbers, texts that the codepage has not and the longest ones.
+// What may be set to what, in every form and size, stands in tests/cases/items.txt.
 #include <set>
 
 #include "core/tiny_directory.h"

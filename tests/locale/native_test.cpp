@@ -148,9 +148,10 @@ TEST_F(NativeTest, ConventionsOfTheSystem) {
   } rows[] = {
       // A text of two bytes is no separator.
       {"Latin1", "de_DE", {"3;3;0", "2;3;0", ",", ".", ".", "'", "\xA4", "", "~"}},
-      // Of another codepage, or of no known one: numbers and groupings only. A name that the system refuses: nothing.
+      // Of another codepage, or of no known one: numbers and groupings only.
       {"US-ASCII", "de_DE", {"3;3;0", "2;3;0", ".", ",", ".", ",", "$", "", "-"}},
       {"Latin1", "xx_YY", {"3;3;0", "2;3;0", ".", ",", ".", ",", "$", "", "-"}},
+      // A name that the system refuses: nothing.
       {"Latin1", "xx_XX", {"3;0", "3;0", ".", ",", ".", ",", "$", "", "-"}},
   };
   for (const auto& row : rows) {

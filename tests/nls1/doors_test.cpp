@@ -209,7 +209,7 @@ std::vector<Row> rows() {
 
 class DoorsTest : public LibraryTest {
  protected:
-  /// Calls a door. Each entry has its exit, the last one with the result, and without the trace nothing is said.
+  /// Calls a door. Each entry has its exit, the last one with the result; without the trace nothing is said.
   static std::string call(const std::string& name, const Visit& visit) {
     EXPECT_TRUE(RecordingTrace::take().empty()) << "before " << name;
     RecordingTrace::set_level(RAS1_LEVEL_EVENTS);

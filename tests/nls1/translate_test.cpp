@@ -1,6 +1,6 @@
 // Translation of strings between codepages by number: random texts against the conversions between locales, for
-// every pair of kinds and every size; then what only translation does, row by row; then refusals. What it says in the trace
-// shows in tests/cases/cli/translate.txt.
+// every pair of kinds and every size; then what only translation does, row by row; then refusals. What it says
+// in the trace shows in tests/cases/cli/translate.txt.
 #include <random>
 
 #include "core/library_fixture.h"
