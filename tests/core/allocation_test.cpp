@@ -198,8 +198,6 @@ TEST_F(AllocationTest, EveryAllocationFails) {
        LX_E_NOT_INITIALIZED},
       // Locales.
       {"LXGetLocale", kLoads, makes([&](int32_t* code) { return LXGetLocale(kEverything, 0, code); })},
-      {"LXGetLocale, old codepage", kLoads,
-       makes([&](int32_t* code) { return LXGetLocale("English.Old", 0, code); })},
       {"LXGetLocale, user", kLoads,
        makes([&](int32_t* code) { return LXGetLocale(nullptr, LX_USER_LOCALE | LX_FALLBACK, code); })},
       {"LXGetLocaleW", kLoads,
@@ -207,8 +205,6 @@ TEST_F(AllocationTest, EveryAllocationFails) {
       {"LXGetLocaleU", kLoads,
        makes([&](int32_t* code) { return LXGetLocaleU(everything16.c_str(), 0, code); })},
       {"LXSetLocale", kLoads, [&](LXLocale*) { return LXSetLocale(kEverything, 0); }},
-      {"LXSetLocaleW", kLoads, [&](LXLocale*) { return LXSetLocaleW(everything32.c_str(), LX_FALLBACK); }},
-      {"LXSetLocaleU", kLoads, [&](LXLocale*) { return LXSetLocaleU(everything16.c_str(), 0); }},
       {"LXConvertNativeLocale", kLoads | kCopes,
        makes([](int32_t* code) { return LXConvertNativeLocale("de_DE", LX_FALLBACK, code); })},
       // Items of a locale.
@@ -216,8 +212,6 @@ TEST_F(AllocationTest, EveryAllocationFails) {
        stores([](LXLocale* l) { return LXSetLocaleNumInfo(l, 5, kElsewhereId); })},
       {"codepage of a locale", kLoads | kCopes,
        stores([](LXLocale* l) { return LXSetLocaleNumInfo(l, 9, tiny_shift().file.id); })},
-      {"codepage by name", kLoads | kCopes,
-       stores([](LXLocale* l) { return LXSetLocaleTextInfo(l, 10, "TINY-EUC", -1, 0); })},
       {"LXSetLocaleTextInfo", kCopes,
        stores([&](LXLocale* l) { return LXSetLocaleTextInfo(l, 81, long_text.c_str(), -1, 0); })},
       {"LXSetLocaleTextInfoU", kCopes,

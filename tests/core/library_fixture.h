@@ -12,6 +12,8 @@
 #include <string>
 #include <vector>
 
+#include "core/lxformat.h"
+#include "core/lxobjtypes.h"
 #include "core/lxrecords.h"
 #include "lx.h"
 #include "platform/ras1.h"
@@ -97,6 +99,17 @@ class LibraryTest : public ::testing::Test {
     unsetenv("LX_LANG");
   }
 };
+
+/// The built-in language with other defaults.
+inline ByteString language_file(uint16_t territory, uint16_t codepage, uint16_t sort) {
+  namespace words = format::language;
+  const Bytes built_in = kBuiltInLanguage.sections.section[0];
+  ByteString payload(built_in.data, built_in.data + built_in.size);
+  put_le16(payload.data() + 2 * words::kDefaultTerritory, territory);
+  put_le16(payload.data() + 2 * words::kDefaultCodepage, codepage);
+  put_le16(payload.data() + 2 * words::kDefaultSort, sort);
+  return object_file({payload});
+}
 
 inline constexpr char kDefaultControl[] = "/Tessarin/locale/control.nls";
 

@@ -34,20 +34,16 @@ std::string name_of(const LXObject* object) {
 // A control file that opens ends the search, whatever it holds.
 TEST_F(ObjManTest, SearchOrder) {
   if (access(kDefaultControl, F_OK) == 0) GTEST_SKIP();
-  ScratchDirectory environment, half_header, bad_magic, beyond_end, before_start;
+  ScratchDirectory environment, bad_magic, before_start;
   ByteString file = control_file({{1, LX_LANGUAGE, "Given"}});
   directory.write("control.nls", file);
-  half_header.write("control.nls", ByteString(file.begin(), file.begin() + 40));
-  put_le32(file.data() + format::header_section_offset(0), 0x01000000);
-  beyond_end.write("control.nls", file);
   put_le32(file.data() + format::header_section_offset(0), 0x80000000);
   before_start.write("control.nls", file);
   file[0] ^= 1;
   bad_magic.write("control.nls", file);
   environment.write("control.nls", control_file({{1, LX_LANGUAGE, "Environment"}}));
   const std::string given = directory.path(), env = environment.path(), none = directory.file("none"), unset,
-                    half = half_header.path(), bad = bad_magic.path(), beyond = beyond_end.path(),
-                    before = before_start.path();
+                    bad = bad_magic.path(), before = before_start.path();
   // A control-file name takes 13 bytes beside the directory, in 256.
   const std::string longest(243, 'x'), too_long(244, 'x'), over_buffer(256, 'x');
   const struct {
@@ -64,9 +60,7 @@ TEST_F(ObjManTest, SearchOrder) {
       {"nothing at all", unset, unset, LX_E_FILE_NOT_FOUND, "English", {"/Tessarin/locale"}},
       {"a variable whose control file's name does not fit", unset, too_long, LX_E_FILE_IO, "English", {}},
       {"a variable that does not fit", none, over_buffer, LX_E_FILE_IO, "English", {none}},
-      {"half a header", half, env, LX_E_FILE_IO, "English", {half}},
       {"wrong magic number", bad, env, LX_E_CORRUPT, "English", {bad}},
-      {"a table beyond the end", beyond, env, LX_E_FILE_IO, "English", {beyond}},
       {"a table before the start", before, env, LX_E_FILE_IO, "English", {before}},
   };
   for (const auto& c : cases) {
@@ -88,75 +82,34 @@ TEST_F(ObjManTest, SearchOrder) {
   }
 }
 
-TEST_F(ObjManTest, TableAnywhereInTheFile) {
-  const ByteString table = control_file({{1, LX_LANGUAGE, "One"}, {2, LX_LANGUAGE, "Two"}});
-  ByteString moved(table.begin(), table.begin() + format::kHeaderBytes);
-  moved.resize(moved.size() + 1000);
-  moved.insert(moved.end(), table.begin() + format::kHeaderBytes, table.end());
-  put_le32(moved.data() + format::header_section_offset(0), format::kHeaderBytes + 1000);
-  // Bytes behind the last whole record do not count.
-  put_le16(moved.data() + format::header_section_size(0), 2 * format::kRecordBytes - 1);
-  directory.write("control.nls", moved);
-  ASSERT_EQ(init(), LX_OK);
-  EXPECT_EQ(name_of(by_id(LX_LANGUAGE, 1, LX_FIND_ONLY)), "One");
-  EXPECT_EQ(by_id(LX_LANGUAGE, 2, LX_FIND_ONLY), nullptr);
-}
-
-TEST_F(ObjManTest, EveryEntryIsFoundAndNoOther) {
-  std::vector<ControlRecord> tables[] = {
-      {{1, LX_LANGUAGE, "English"}, {367, LX_CODEPAGE, "US-ASCII"}, {850, LX_CODEPAGE, "IBM-850"}},
-      {{7, LX_SORT, "Default"}},
-      {{7, LX_LANGUAGE, "German"}, {8, LX_LANGUAGE, "Greek"}},
-      {},
-      {{3, LX_LANGUAGE, "L"}},
-  };
-  for (int id : {0, 1, 3, 4, 100, 0x7FFF, 0x8000, 0xFFFF})
-    tables[4].push_back({static_cast<uint16_t>(id), LX_CODEPAGE, "C" + std::to_string(id)});
-  for (const std::vector<ControlRecord>& records : tables) {
-    SCOPED_TRACE(records.size());
-    directory.write("control.nls", control_file(records));
-    ASSERT_EQ(init(), LX_OK);
-    for (int32_t type : {-1, 0, 1, 2, 3, 4}) {
-      for (const ControlRecord& record : records) {
-        LXObject* found = by_name(type, record.name, LX_FIND_ONLY);
-        EXPECT_EQ(name_of(found), type == record.type ? record.name : "") << type;
-        EXPECT_EQ(rc, type == record.type ? LX_OK : LX_E_NOT_FOUND);
-        if (type != record.type) continue;
-        EXPECT_EQ(by_id(type, record.id, LX_FIND_ONLY), found);
-        const auto next = static_cast<uint16_t>(record.id + 1);
-        const auto is_next = [&](const ControlRecord& r) { return r.type == type && r.id == next; };
-        EXPECT_EQ(by_id(type, next, LX_FIND_ONLY) != nullptr,
-                  std::any_of(records.begin(), records.end(), is_next));
-      }
-      EXPECT_EQ(by_id(type, 9999, LX_FIND_ONLY), nullptr);
-      EXPECT_EQ(rc, LX_E_NOT_FOUND);
-    }
-    EXPECT_EQ(LXTerm(), LX_OK);
-  }
+/// A control file whose table stands somewhere in it. Bytes behind the last whole record do not count.
+ByteString moved_table(const std::vector<ControlRecord>& records) {
+  constexpr size_t kGapBytes = 1000;
+  const size_t rest_bytes = records.empty() ? 0 : format::kRecordBytes - 1;
+  ByteString file = control_file(records);
+  const size_t table_bytes = file.size() - format::kHeaderBytes;
+  file.insert(file.begin() + format::kHeaderBytes, kGapBytes, 0xA5);
+  file.resize(file.size() + rest_bytes);
+  put_le32(file.data() + format::header_section_offset(0), format::kHeaderBytes + kGapBytes);
+  put_le16(file.data() + format::header_section_size(0), static_cast<uint16_t>(table_bytes + rest_bytes));
+  return file;
 }
 
 TEST_F(ObjManTest, LookUps) {
   std::vector<ControlRecord> table;
-  bool open = false;
   for (const CaseRow& row : case_rows("core/look_ups.txt")) {
     SCOPED_TRACE(row.where);
-    if (row[0] == "table") {
+    if (row[0] == "table") table.clear();
+    if (row[0] == "entry")
+      table.push_back({static_cast<uint16_t>(row.number(2)), static_cast<uint8_t>(row.number(1)), row[3]});
+    if (row.fields.size() < 5) {
       terminate();
-      table.clear();
-      open = false;
+      directory.write("control.nls", moved_table(table));
+      ASSERT_EQ(init(), LX_OK);
       continue;
     }
     const int32_t type = row.number(1), number = row.number(2);
     const std::string& name = row[3];
-    if (row[0] == "entry") {
-      table.push_back({static_cast<uint16_t>(number), static_cast<uint8_t>(type), name});
-      continue;
-    }
-    if (!open) {
-      directory.write("control.nls", control_file(table));
-      ASSERT_EQ(init(), LX_OK);
-      open = true;
-    }
     const auto expect = [&](const LXObject* found) {
       const std::string shown = found != nullptr ? std::to_string(found->disk.id) + " " + found->disk.name : "";
       EXPECT_EQ(found != nullptr ? shown : rc == LX_OK ? "nothing" : "none", row[4]);
@@ -174,28 +127,21 @@ TEST_F(ObjManTest, LookUps) {
   EXPECT_EQ(LXGetObjFromNameW(nullptr, LX_TERRITORY, beyond, 3, LX_FIND_ONLY, &rc), nullptr);
 }
 
-TEST_F(ObjManTest, LoadsAsManySectionsAsCountedOnce) {
+// A multibyte codepage needs its first three sections; a count above four counts four.
+TEST_F(ObjManTest, LoadsAsManySectionsAsCounted) {
   std::vector<ByteString> sections = tiny_shift_jis().file.sections;
   sections[3] = {1, 2, 3};
   ByteString file = object_file(sections);
   directory.write_locale({{850, "Tiny", sections}});
-  // A multibyte codepage needs its first three; a count above four counts four.
   for (uint16_t counted : {uint16_t{2}, uint16_t{3}, uint16_t{4}, uint16_t{0xFFFF}}) {
     SCOPED_TRACE(counted);
     put_le16(file.data() + format::kHeaderSections, counted);
     directory.write("cp_00850.nls", file);
     ASSERT_EQ(init(), LX_OK);
-    LXObject* const found = by_name(LX_CODEPAGE, "tiny", LX_FIND_ONLY);
+    const LXObject* const found = by_id(LX_CODEPAGE, 850);
     ASSERT_NE(found, nullptr);
-    const std::vector<std::string> path{directory.file("cp_00850.nls")};
-    EXPECT_EQ(opened([&] { EXPECT_EQ(by_id(LX_CODEPAGE, 850, 2), found); }), path);
     EXPECT_EQ(rc, counted < 3 ? LX_E_CORRUPT : LX_OK);
-    EXPECT_EQ(opened([&] { EXPECT_EQ(by_name(LX_CODEPAGE, "TINY"), found); }), std::vector<std::string>{});
     EXPECT_EQ(found->section[3] != nullptr, counted > 3);
-    for (size_t i = 0; i < std::min<size_t>(counted, 4) && counted > 2; ++i) {
-      ASSERT_NE(found->section[i], nullptr) << i;
-      EXPECT_EQ(memcmp(found->section[i], sections[i].data(), sections[i].size()), 0) << i;
-    }
     EXPECT_EQ(LXTerm(), LX_OK);
   }
 }

@@ -3,8 +3,6 @@
 #pragma once
 
 #include "core/library_fixture.h"
-#include "core/lxformat.h"
-#include "core/lxobjtypes.h"
 #include "support/sort_builder.h"
 #include "support/tiny_codepages.h"
 

@@ -1,5 +1,4 @@
-// The trace: what the core and locale handles say at which level, the events of a call, and silence when the
-// trace is off.
+// What the core and locale handles say in the trace, and at which level.
 #include <unistd.h>
 
 #include <algorithm>
@@ -8,7 +7,6 @@
 #include <set>
 #include <sstream>
 
-#include "core/lxalias.h"
 #include "core/tiny_directory.h"
 #include "support/case_rows.h"
 
@@ -32,8 +30,7 @@ class TraceTest : public LibraryTest {
         {"0x[0-9a-f]+", "ADDRESS"},
         {"\n", "\\n"},
         {allocation(sizeof(GlobalArea)), "allocate AREA "},
-        {allocation(sizeof(LXObjManager)), "allocate MANAGER "},
-        {allocation(sizeof(AliasRecord)), "allocate ALIAS "}};
+        {allocation(sizeof(LXObjManager)), "allocate MANAGER "}};
     for (const auto& [what, name] : names) text = std::regex_replace(text, std::regex(what), name);
     return text;
   }
@@ -60,24 +57,6 @@ class TraceTest : public LibraryTest {
       terminate();
     };
   }
-  /// With another content of a file, which need not be there otherwise.
-  Action with_file(const std::string& name, const ByteString& content, const Action& action = kNothing) {
-    return [=] {
-      const ByteString whole = directory.read(name);
-      directory.write(name, content);
-      use(action)();
-      directory.write(name, whole);
-      if (whole.empty()) std::filesystem::remove(directory.file(name));
-    };
-  }
-  Action with_byte(const std::string& name, size_t at, uint8_t value, const Action& action = kNothing) {
-    ByteString content = directory.read(name);
-    content[at] = value;
-    return with_file(name, content, action);
-  }
-  Action with_aliases(const std::string& text, const Action& action = kNothing) {
-    return with_file("alias.txt", ByteString(text.begin(), text.end()), action);
-  }
   Action without_memory(size_t n) {
     return [this, n] {
       hooks.fail_at(n);
@@ -90,7 +69,8 @@ class TraceTest : public LibraryTest {
 };
 int32_t TraceTest::ignored;
 
-// All of the texts, each at its level only: core/trace_texts.txt holds, by action, what is said.
+// Each text at its level only: core/trace_texts.txt holds, by action, what is said. What is said of damaged
+// files and of aliases shows in tests/cases/cli/trace.txt.
 TEST_F(TraceTest, Texts) {
   if (access(kDefaultControl, F_OK) == 0) GTEST_SKIP();
   directory.write_locale({{367, "US-ASCII", ascii_codepage()}});
@@ -107,8 +87,6 @@ TEST_F(TraceTest, Texts) {
       terminate();
     };
   };
-  ByteString short_table = directory.read("control.nls");
-  short_table.pop_back();
   const std::string long_path(250, 'x'), path = directory.path(), none = directory.file("none");
   const struct {
     const char* name;
@@ -123,26 +101,6 @@ TEST_F(TraceTest, Texts) {
       {"no memory for the area", without_memory(1)},
       {"no memory for the manager", without_memory(2)},
       {"no memory for the records", without_memory(5)},
-      {"bad header", with_byte("control.nls", 0, 0)},
-      {"table before the start", with_byte("control.nls", format::header_section_offset(0) + 3, 0xFF)},
-      {"short table", with_file("control.nls", short_table)},
-      {"refused object",
-       with_byte("cp_00367.nls", format::kHeaderBytes + format::codepage::kWidth, 0,
-                 [] { LXGetObjFromID(nullptr, LX_CODEPAGE, 367, LX_FIND_AND_LOAD, &ignored); })},
-      {"alias", with_aliases("UTF-8 utf8\n")},
-      {"alias without a codepage", with_aliases(" one\n")},
-      {"long codepage name", with_aliases(std::string(33, 'n') + "\n")},
-      {"long alias", with_aliases("A " + std::string(65, 'a') + "\n")},
-      {"no memory for an alias",
-       [&] {
-         directory.write_text("alias.txt", "A one\n");
-         init();
-         const size_t calls = hooks.calls();
-         terminate();
-         without_memory(calls)();
-         std::filesystem::remove(directory.file("alias.txt"));
-       }},
-      {"alias looked up", with_aliases("A one\n", [] { LXGetCodepageFromAlias(nullptr, "One"); })},
       {"file rewritten", use([&] { LXCloseFile(open_data(), 0); })},
       {"file gone", use([&] {
          LXFile* file = open_data();
@@ -177,40 +135,6 @@ TEST_F(TraceTest, Texts) {
   }
   for (const CaseRow& row : case_rows("core/trace_texts.txt")) expected += row[0] + "\n";
   EXPECT_EQ(said, expected);
-}
-
-TEST_F(TraceTest, Events) {
-  directory.write_locale({{367, "US-ASCII", ascii_codepage()}});
-  char drive[4], directory_part[256], file[15], extension[5];
-  RecordingTrace::set_level(RAS1_LEVEL_EVENTS);
-  init();
-  LXGetObjFromName(nullptr, LX_LANGUAGE, "X", 1, 0, &ignored);
-  const auto entry = reinterpret_cast<intptr_t>(LXGetObjFromID(nullptr, LX_CODEPAGE, 367, 0, &ignored));
-  LXSetLocale("X", 0);
-  LXGetLocale("X", 0, nullptr);
-  LXLocale* const locale = LXGetLocale("English", 0, nullptr);
-  LXConvertLocale(locale, file, 0);
-  LXReleaseLocale(locale);
-  SplitPath("/d/name.ext", drive, directory_part, file, extension);
-  LXTerm();
-  LXTerm();
-  RecordingTrace::set_level(0);
-  std::vector<intptr_t> values;  // of the calls from outside; -1 is an exit without one
-  int depth = 0;
-  for (const TraceRecord& record : RecordingTrace::take()) {
-    EXPECT_NE(record.kind, TraceRecord::kMessage) << record.text;
-    EXPECT_FALSE(record.unit.empty());
-    EXPECT_GT(record.line, 0);
-    depth += record.kind == TraceRecord::kEntry ? 1 : -1;
-    ASSERT_GE(depth, 0);
-    if (depth == 0) values.push_back(record.kind == TraceRecord::kExitValue ? record.value : -1);
-  }
-  EXPECT_EQ(depth, 0) << "each entry has its exit";
-  EXPECT_EQ(values,
-            (std::vector<intptr_t>{LX_OK, 0, entry, LX_E_NO_LANGUAGE, 0, reinterpret_cast<intptr_t>(locale), 1,
-                                   0, -1, LX_OK, LX_E_NOT_INITIALIZED}));
-  use([] { LXSetLocale("X", 0); })();
-  EXPECT_TRUE(RecordingTrace::take().empty()) << "the trace is off";
 }
 
 }  // namespace

@@ -103,13 +103,17 @@ TEST_F(NativeTest, UserLocale) {
   const auto user = [&] {
     return LXGetUserLocale(buffer, sizeof(buffer)) == 2 ? std::string(buffer) : "failed";
   };
-  EXPECT_EQ(user(), "English_UnitedStates.US-ASCII@Binary");
-  setenv("LANG", "fr_FR", 1);
-  EXPECT_EQ(user(), "French_France.Latin1@Default");
-  setenv("LC_ALL", "", 1);
-  EXPECT_EQ(user(), "French_France.Latin1@Default");
-  setenv("LC_ALL", "it_IT", 1);
-  EXPECT_EQ(user(), "Italian_Italy.Latin1@Default");
+  const struct {
+    const char *lang, *lc_all, *locale;
+  } rows[] = {{"", "", "English_UnitedStates.US-ASCII@Binary"},
+              {"fr_FR", "", "French_France.Latin1@Default"},
+              {"fr_FR", "it_IT", "Italian_Italy.Latin1@Default"}};
+  EXPECT_EQ(user(), rows[0].locale);
+  for (const auto& row : rows) {
+    setenv("LANG", row.lang, 1);
+    setenv("LC_ALL", row.lc_all, 1);
+    EXPECT_EQ(user(), row.locale);
+  }
   for (const char* name : {"LC_ALL", "LANG"}) unsetenv(name);
 
   // The longest name that can be kept, and one more.
@@ -137,37 +141,36 @@ TEST_F(NativeTest, UserLocale) {
 }
 
 TEST_F(NativeTest, ConventionsOfTheSystem) {
-  system.known["de_DE"] = german;
-  LXLocale* locale = LXGetLocale("English.Latin1", 0, nullptr);
-  ASSERT_NE(locale, nullptr);
-  LXMapNativeInfo("de_DE", locale);
-  EXPECT_EQ(system.set, (Strings{"de_DE", "C"}));
-  EXPECT_EQ(numbers(locale), (Strings{"2", "3", "4", "1", "0", "0", "1", "3", "2"}));
-  EXPECT_EQ(item(locale, 62), "3;3;0");
-  EXPECT_EQ(item(locale, 68), "2;3;0");
-  const Strings separators{item(locale, 59), item(locale, 60), item(locale, 66), item(locale, 67)};
-  EXPECT_EQ(separators, (Strings{",", ".", ".", "'"})) << "one of two bytes is not copied";
-  EXPECT_EQ(item(locale, 64) + item(locale, 71) + item(locale, 72), "\xA4~");
-  LXUChar units[4];
-  EXPECT_EQ(LXGetLocaleTextInfoU(locale, 64, units, 4, 0), 2);
-  EXPECT_EQ(units[0], 0x20AC);
-  EXPECT_EQ(LXReleaseLocale(locale), 0);
-
-  // Another codepage: numbers and groupings only. A name that the system refuses: nothing.
-  locale = LXGetLocale("English.US-ASCII", 0, nullptr);
-  LXMapNativeInfo("de_DE", locale);
-  EXPECT_EQ(item(locale, 62) + item(locale, 59) + item(locale, 60) + item(locale, 64), "3;3;0.,$");
-  EXPECT_EQ(LXReleaseLocale(locale), 0);
-  locale = LXGetLocale("English.Latin1", 0, nullptr);
-  system.known["xx_YY"] = german;
-  LXMapNativeInfo("xx_YY", locale);
-  EXPECT_EQ(item(locale, 62) + item(locale, 59), "3;3;0.") << "a name of no known codepage";
-  EXPECT_EQ(LXReleaseLocale(locale), 0);
-  locale = LXGetLocale("English.Latin1", 0, nullptr);
-  LXMapNativeInfo("xx_XX", locale);
-  EXPECT_EQ(item(locale, 62) + item(locale, 59), "3;0.");
-  EXPECT_EQ(LXReleaseLocale(locale), 0);
-  EXPECT_EQ(system.current, "C");
+  system.known["de_DE"] = system.known["xx_YY"] = german;
+  const struct {
+    const char *codepage, *native;
+    Strings texts;  // items 62, 68, 59, 60, 66, 67, 64, 71, 72
+  } rows[] = {
+      // A text of two bytes is no separator.
+      {"Latin1", "de_DE", {"3;3;0", "2;3;0", ",", ".", ".", "'", "\xA4", "", "~"}},
+      // Of another codepage, or of no known one: numbers and groupings only.
+      {"US-ASCII", "de_DE", {"3;3;0", "2;3;0", ".", ",", ".", ",", "$", "", "-"}},
+      {"Latin1", "xx_YY", {"3;3;0", "2;3;0", ".", ",", ".", ",", "$", "", "-"}},
+      // A name that the system refuses: nothing.
+      {"Latin1", "xx_XX", {"3;0", "3;0", ".", ",", ".", ",", "$", "", "-"}},
+  };
+  for (const auto& row : rows) {
+    SCOPED_TRACE(std::string(row.codepage) + " " + row.native);
+    LXLocale* locale = LXGetLocale((std::string("English.") + row.codepage).c_str(), 0, nullptr);
+    const Strings before = numbers(locale), of_system{"2", "3", "4", "1", "0", "0", "1", "3", "2"};
+    system.set.clear();
+    LXMapNativeInfo(row.native, locale);
+    EXPECT_EQ(system.set, (Strings{row.native, "C"}));
+    EXPECT_EQ(numbers(locale), row.texts[0] != "3;0" ? of_system : before);
+    Strings texts;
+    for (int32_t number : {62, 68, 59, 60, 66, 67, 64, 71, 72}) texts.push_back(item(locale, number));
+    EXPECT_EQ(texts, row.texts);
+    LXUChar units[4];
+    EXPECT_EQ(LXGetLocaleTextInfoU(locale, 64, units, 4, 0), 2);
+    EXPECT_EQ(units[0], row.texts[6] == "$" ? '$' : 0x20AC);
+    EXPECT_EQ(LXReleaseLocale(locale), 0);
+    EXPECT_EQ(system.current, "C");
+  }
 }
 
 TEST_F(NativeTest, UserLocaleAndConvertedNamesHaveTheConventions) {

@@ -1,5 +1,5 @@
 // Every exported function as a door: what it answers, and what it writes, without the library, with undefined
-// flags, and where no locale is given, as doors.txt says.
+// flags, and where no locale is given, as doors.txt says; and the events of each call.
 #include <fstream>
 #include <set>
 #include <sstream>
@@ -209,6 +209,32 @@ std::vector<Row> rows() {
 
 class DoorsTest : public LibraryTest {
  protected:
+  /// Calls a door. Each entry has its exit, the last one with the result; without the trace nothing is said.
+  static std::string call(const std::string& name, const Visit& visit) {
+    EXPECT_TRUE(RecordingTrace::take().empty()) << "before " << name;
+    RecordingTrace::set_level(RAS1_LEVEL_EVENTS);
+    const std::string outcome = exported().at(name)(visit);
+    RecordingTrace::set_level(0);
+    const std::vector<TraceRecord> records = RecordingTrace::take();
+    int depth = 0;
+    for (const TraceRecord& record : records) {
+      EXPECT_NE(record.kind, TraceRecord::kMessage) << name << ": " << record.text;
+      EXPECT_FALSE(record.unit.empty()) << name;
+      EXPECT_GT(record.line, 0) << name;
+      depth += record.kind == TraceRecord::kEntry ? 1 : -1;
+      EXPECT_GE(depth, 0) << name;
+    }
+    EXPECT_EQ(depth, 0) << name;
+    char* end = nullptr;
+    const auto number = static_cast<int32_t>(std::strtoll(outcome.c_str(), &end, 10));
+    const bool has_own = name.rfind("LXCom", 0) != 0;  // in those two the common codepage is looked up
+    if (end != outcome.c_str() && !records.empty() && has_own) {
+      EXPECT_EQ(records.back().kind, TraceRecord::kExitValue) << name;
+      EXPECT_EQ(static_cast<int32_t>(records.back().value), number) << name;
+    }
+    return outcome;
+  }
+
   /// Every door says what it says without a library, and reads nothing. With `only_locale` the doors that take
   /// a locale, when none is given.
   static void expect_outside(const char* when, bool only_locale = false) {
@@ -218,7 +244,7 @@ class DoorsTest : public LibraryTest {
         for (const std::string& name : row.names) {
           if (!row.needs_library || (only_locale && !row.has_locale)) continue;
           for (LXLocale* given : {static_cast<LXLocale*>(nullptr), only_locale ? nullptr : poison<LXLocale>()})
-            EXPECT_EQ(exported().at(name)({given, false, false}), row.outside) << name;
+            EXPECT_EQ(call(name, {given, false, false}), row.outside) << name;
         }
     });
   }
@@ -230,7 +256,7 @@ class DoorsTest : public LibraryTest {
     LXLocale* const common = lx::globals.default_locale;
     for (LXLocale* given : {static_cast<LXLocale*>(nullptr), other}) {
       common->last_error = other->last_error = kNothingStored;
-      EXPECT_EQ(exported().at(name)({given, true, ordinary, flags}), outcome) << name;
+      EXPECT_EQ(call(name, {given, true, ordinary, flags}), outcome) << name;
       EXPECT_EQ((given != nullptr ? given : common)->last_error, error) << name;
       EXPECT_EQ((given != nullptr ? common : other)->last_error, kNothingStored) << name;
     }

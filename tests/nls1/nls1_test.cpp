@@ -7,7 +7,6 @@
 #include <thread>
 
 #include "core/library_fixture.h"
-#include "core/lxobjtypes.h"
 #include "nls1/failing_init.h"
 #include "support/case_rows.h"
 
@@ -42,15 +41,8 @@ std::string thread_name() {
 
 /// That there is no library for any service; the table of doors says what each of them answers.
 void expect_refusals() {
-  int32_t rc = -1;
-  NLS1_PrivateFunction_GetProcessLocale();
   EXPECT_EQ(NLS1_PrivateFunction_GetThreadLocale(), nullptr);
-  EXPECT_EQ(NLS1_GetLocale(1, 0, 0, &rc), nullptr);
-  EXPECT_EQ(rc, 1) << "a code of its own";
   EXPECT_EQ(NLS1_SetLocale(1, 0, 0), LX_E_NOT_INITIALIZED);
-  EXPECT_EQ(NLS1_SetNativeFromLocale(nullptr, LC_ALL, 0), LX_E_NOT_INITIALIZED);
-  EXPECT_EQ(NLS1_GetLanguageId("English", &rc), 0);
-  EXPECT_EQ(NLS1_GetLocaleNumInfo(nullptr, LX_ITEM_DEFAULT_CODEPAGE, 0), -1);
 }
 
 class Nls1Test : public LibraryTest {
@@ -63,11 +55,7 @@ class Nls1Test : public LibraryTest {
   /// English and Japanese with what they need, and a sort that has no file.
   void write_directory() {
     directory.write_locale({{367, "US-ASCII", ascii_codepage()}, {954, "JapanEUC", ascii_codepage()}});
-    ByteString language = directory.read("la_00001.nls");
-    uint8_t* words = language.data() + format::kHeaderBytes;
-    put_le16(words + 2 * format::language::kDefaultTerritory, 392);
-    put_le16(words + 2 * format::language::kDefaultCodepage, 954);
-    directory.write("la_00002.nls", language);
+    directory.write("la_00002.nls", language_file(392, 954, 0));
     directory.write("te_00392.nls", directory.read("te_00840.nls"));
     directory.write("control.nls", control_file({{1, LX_LANGUAGE, "English"},
                                                  {2, LX_LANGUAGE, "Japanese"},
@@ -79,6 +67,14 @@ class Nls1Test : public LibraryTest {
                                                  {5, LX_SORT, "Default"}}));
     directory.write_text("alias.txt", "JapanEUC ujis\n");
     setenv("NLS1_LOCALEDIR", directory.path().c_str(), 1);
+  }
+
+  /// That `action` says `text` at this level, and at no other.
+  static void expect_said(uint32_t level, const std::string& text, const std::function<void()>& action) {
+    for (bool at_level : {true, false}) {
+      const std::vector<std::string> texts = messages(at_level ? level : ~level, action);
+      EXPECT_EQ(std::count(texts.begin(), texts.end(), text) != 0, at_level) << text;
+    }
   }
 
   /// Runs `body` in a process that ends as a program does.
@@ -188,6 +184,8 @@ TEST_F(Nls1Test, LocalesFromIdentifiers) {
       EXPECT_EQ(locale != nullptr ? name_of(locale) : std::to_string(rc), row[4]);
       EXPECT_EQ(locale != nullptr, rc == LX_OK);
       LXReleaseLocale(locale);
+      if (row.fields.size() > 5)
+        expect_said(RAS1_LEVEL_DETAIL, row[5], [&] { NLS1_GetLocale(both, codepage, flags, nullptr); });
       // The process's default: undefined flags are taken off.
       ASSERT_EQ(NLS1_SetLocale(0, 0, 0), LX_OK);
       const int32_t set_code = rc == LX_E_INVALID ? LX_OK : rc;
@@ -212,15 +210,22 @@ TEST_F(Nls1Test, NativeLocales) {
     EXPECT_EQ(rc, LX_OK);
     EXPECT_EQ(name_of(locale), kJapanese);
     EXPECT_EQ(NLS1_GetLocaleNumInfo(locale, LX_ITEM_DEFAULT_CODEPAGE, 0), 954) << "a number here";
-    EXPECT_EQ(NLS1_SetNativeFromLocale(locale, LC_NUMERIC, 0), LX_E_NO_NATIVE);
-    EXPECT_EQ(NLS1_SetNativeFromLocale(locale, LC_NUMERIC, LX_FALLBACK), LX_OK);
-    EXPECT_EQ(NLS1_SetNativeFromLocale(locale, 99, LX_FALLBACK), LX_E_NO_NATIVE) << "no such category";
+    const auto set = [&](int32_t category, int32_t flags, int32_t code) {
+      EXPECT_EQ(NLS1_SetNativeFromLocale(locale, category, flags), code);
+    };
+    expect_said(RAS1_LEVEL_ERRORS, "NLS1_ConvertLocale failed with rc = 32",
+                [&] { set(LC_NUMERIC, 0, LX_E_NO_NATIVE); });
+    set(LC_NUMERIC, LX_FALLBACK, LX_OK);
+    expect_said(RAS1_LEVEL_ERRORS, "setlocale failed to setlocale to C",
+                [&] { set(99, LX_FALLBACK, LX_E_NO_NATIVE); });
     LXReleaseLocale(locale);
     for (const char* unknown : {"xx_XX", "", static_cast<const char*>(nullptr)}) {
       EXPECT_EQ(NLS1_ConvertNativeLocale(unknown, 0, &rc), nullptr);
       EXPECT_EQ(rc, LX_E_NO_LANGUAGE);
       EXPECT_EQ(NLS1_SetLocaleFromNative(unknown, NLS1_THREAD), LX_E_NO_LANGUAGE);
     }
+    expect_said(RAS1_LEVEL_ERRORS, "LXConvertNativeLocale failed for xx_XX with rc 31",
+                [] { NLS1_ConvertNativeLocale("xx_XX", 0, nullptr); });
     if (setlocale(LC_ALL, "C.UTF-8") != nullptr) {
       EXPECT_EQ(NLS1_SetNativeLocale(kJapaneseInJapan, 0, LC_CTYPE, 0), LX_E_NO_NATIVE);
       EXPECT_EQ(NLS1_SetNativeLocale(NLS1_LANGUAGE_TERRITORY(1, 840), 367, LC_CTYPE, 0), LX_OK);
@@ -244,29 +249,35 @@ TEST_F(Nls1Test, NativeLocales) {
 TEST_F(Nls1Test, ObjectsByNameAndIdentifier) {
   write_directory();
   in_process("objects", [] {
-    const std::map<std::string, int32_t (*)(const char*, int32_t*)> id_of{{"language", NLS1_GetLanguageId},
-                                                                          {"territory", NLS1_GetTerritoryId},
-                                                                          {"codepage", NLS1_GetCodepageId},
-                                                                          {"sort", NLS1_GetSortId}};
+    const struct {
+      const char* type;
+      int32_t (*id_of)(const char*, int32_t*);
+      int32_t (*name_of)(int32_t, char*, int32_t);
+    } types[] = {{"language", NLS1_GetLanguageId, NLS1_GetLanguageName},
+                 {"territory", NLS1_GetTerritoryId, NLS1_GetTerritoryName},
+                 {"codepage", NLS1_GetCodepageId, NLS1_GetCodepageName},
+                 {"sort", NLS1_GetSortId, NLS1_GetSortName}};
+    const auto functions = [&](const CaseRow& row) {
+      return *std::find_if(types, types + 4, [&](const auto& type) { return type.type == row[0]; });
+    };
     for (const CaseRow& row : case_rows("nls1/object_names.txt")) {
       SCOPED_TRACE(row.where);
       const char* const name = row[1].empty() ? nullptr : row[1].c_str();
       int32_t rc = -1;
-      EXPECT_EQ(id_of.at(row[0])(name, &rc), row.number(2));
+      EXPECT_EQ(functions(row).id_of(name, &rc), row.number(2));
       EXPECT_EQ(rc, row.number(3));
-      EXPECT_EQ(id_of.at(row[0])(name, nullptr), row.number(2));
+      EXPECT_EQ(functions(row).id_of(name, nullptr), row.number(2));
     }
-    const std::map<std::string, int32_t (*)(int32_t, char*, int32_t)> name_of_id{
-        {"language", NLS1_GetLanguageName},
-        {"territory", NLS1_GetTerritoryName},
-        {"codepage", NLS1_GetCodepageName},
-        {"sort", NLS1_GetSortName}};
     for (const CaseRow& row : case_rows("nls1/object_identifiers.txt")) {
       SCOPED_TRACE(row.where);
       char name[40] = "#";
-      EXPECT_EQ(name_of_id.at(row[0])(row.number(1), name, row.number(2)), row.number(4));
+      EXPECT_EQ(functions(row).name_of(row.number(1), name, row.number(2)), row.number(4));
       EXPECT_EQ(name, row[3]);
     }
+    expect_said(RAS1_LEVEL_ERRORS, "Object name length (8) for Japanese exceeds output buffer length (8)", [] {
+      char name[8];
+      NLS1_GetLanguageName(2, name, sizeof(name));
+    });
   });
   // Without sorts the search by identifier looks at the entry beside them: another type is not found.
   directory.write("control.nls", control_file({{1, LX_LANGUAGE, "English"}, {5, LX_CODEPAGE, "Five"}}));
@@ -309,50 +320,21 @@ TEST_F(Nls1Test, Environment) {
   });
 }
 
-/// Each message at its level, and at no other.
-TEST_F(Nls1Test, Messages) {
-  const auto initialise = [] { NLS1_PrivateFunction_GetProcessLocale(); };
-  const struct {
-    uint32_t level;
-    const char* text;
-    std::function<void()> action;
-    enum { kNothing, kNoEnglish, kWhole } directory = kWhole;
-  } cases[] = {
-      {RAS1_LEVEL_PROCESS, "Unable to determine location of locale definitions\n", initialise, cases->kNothing},
-      {RAS1_LEVEL_PROCESS, "Unable to initialize Lexicor, rc = 11",
-       [&] {
-         init_failure = LX_E_NOT_INITIALIZED;
-         initialise();
-       },
-       cases->kNothing},
-      {RAS1_LEVEL_PROCESS, "Unable to set global locale, rc = 31", initialise, cases->kNoEnglish},
-      {RAS1_LEVEL_PROCESS, "Unable to set thread locale, rc = 31", [] { thread_name(); }, cases->kNoEnglish},
-      {RAS1_LEVEL_DETAIL, "Invalid Language 3", [] { NLS1_GetLocale(3, 0, 0, nullptr); }},
-      {RAS1_LEVEL_DETAIL, "Invalid Territory 9", [] { NLS1_GetLocale(9 * 65536 + 1, 0, 0, nullptr); }},
-      {RAS1_LEVEL_DETAIL, "Invalid Codepage -7", [] { NLS1_SetLocale(1, -7, 0); }},
-      {RAS1_LEVEL_ERRORS, "LXConvertNativeLocale failed for xx_XX with rc 31",
-       [] { NLS1_ConvertNativeLocale("xx_XX", 0, nullptr); }},
-      {RAS1_LEVEL_ERRORS, "NLS1_ConvertLocale failed with rc = 32",
-       [] { NLS1_SetNativeLocale(2, 0, LC_ALL, 0); }},
-      {RAS1_LEVEL_ERRORS, "setlocale failed to setlocale to C",
-       [] { NLS1_SetNativeFromLocale(nullptr, 99, 0); }},
-      {RAS1_LEVEL_ERRORS, "Object name length (8) for Japanese exceeds output buffer length (8)",
-       [] {
-         char name[8];
-         NLS1_GetLanguageName(2, name, sizeof(name));
-       }},
-  };
-  for (const auto& c : cases) {
-    if (c.directory != c.kNothing) write_directory();
-    if (c.directory == c.kNoEnglish)
-      directory.write("control.nls", control_file({{2, LX_LANGUAGE, "Japanese"}}));
-    for (bool at_level : {true, false}) {
-      in_process(c.text, [&] {
-        const std::vector<std::string> texts = messages(at_level ? c.level : ~c.level, c.action);
-        EXPECT_EQ(std::count(texts.begin(), texts.end(), c.text) != 0, at_level);
+TEST_F(Nls1Test, MessagesOfTheInitialisation) {
+  const auto expect = [](int32_t failure, const std::string& text) {
+    for (uint32_t level : {uint32_t{RAS1_LEVEL_PROCESS}, ~uint32_t{RAS1_LEVEL_PROCESS}})
+      in_process(text, [&] {
+        init_failure = failure;
+        const std::vector<std::string> texts = messages(level, [] { thread_name(); });
+        EXPECT_EQ(std::count(texts.begin(), texts.end(), text) != 0, level == RAS1_LEVEL_PROCESS);
       });
-    }
-  }
+  };
+  expect(LX_OK, "Unable to determine location of locale definitions\n");
+  expect(LX_E_NOT_INITIALIZED, "Unable to initialize Lexicor, rc = 11");
+  write_directory();
+  directory.write("control.nls", control_file({{2, LX_LANGUAGE, "Japanese"}}));
+  expect(LX_OK, "Unable to set global locale, rc = 31");
+  expect(LX_OK, "Unable to set thread locale, rc = 31");
 }
 
 }  // namespace

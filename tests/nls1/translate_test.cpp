@@ -1,5 +1,6 @@
 // Translation of strings between codepages by number: random texts against the conversions between locales, for
-// every pair of kinds and every size; then what only translation does, row by row; then refusals and messages.
+// every pair of kinds and every size; then what only translation does, row by row; then refusals. What it says
+// in the trace shows in tests/cases/cli/translate.txt.
 #include <random>
 
 #include "core/library_fixture.h"
@@ -184,31 +185,15 @@ TEST_F(TranslateTest, CodepagesThatCannotBeHad) {
       EXPECT_EQ(rc, static_cast<uint32_t>(code)) << from << " to " << to;
     }
     EXPECT_EQ(out, '#');
-    EXPECT_EQ(NLS1_TranslateString(367, 367, &out, 1, "a", 1, nullptr, 0, nullptr), 1);
+    const auto fail = [] { NLS1_TranslateString(1, 2, nullptr, 0, "a", 1, nullptr, 0, nullptr); };
+    EXPECT_EQ(messages(RAS1_LEVEL_ERRORS, fail),
+              (std::vector<std::string>{"Unable to locate codepage 2", "Unable to locate codepage 1"}));
+    const auto translate = [&] {
+      EXPECT_EQ(NLS1_TranslateString(367, 367, &out, 1, "a", -1, nullptr, 0, nullptr), 1);
+    };
+    EXPECT_EQ(messages(RAS1_LEVEL_DETAIL, translate).back(), "Source length = 1");
   });
   unsetenv("NLS1_LOCALEDIR");
-}
-
-TEST(Translate, Messages) {
-  expect_in_child("messages", [] {
-    TinyLibrary library;
-    for (const CaseRow& row : case_rows("nls1/translation_messages.txt")) {
-      SCOPED_TRACE(row.where);
-      RecordingTrace::take();
-      RecordingTrace::set_level(static_cast<uint32_t>(row.number(0)) | RAS1_LEVEL_EVENTS);
-      const Translated t = translate(codepage_of_letter(row[1]), codepage_of_letter(row[2]), {'a', 0, 0, 0},
-                                     row.number(3), 8, 0, 8);
-      RecordingTrace::set_level(0);
-      std::string found = " ";
-      for (const TraceRecord& record : RecordingTrace::take()) {
-        if (record.unit != "qrlnsts") continue;
-        if (record.kind == TraceRecord::kEntry) found += "entry";
-        if (record.kind == TraceRecord::kMessage) found += "; " + record.text;
-        if (record.kind == TraceRecord::kExitValue) found += "; " + std::to_string(record.value);
-      }
-      EXPECT_EQ(found, " entry; " + (row[4].empty() ? "" : row[4] + "; ") + std::to_string(t.result));
-    }
-  });
 }
 
 }  // namespace
