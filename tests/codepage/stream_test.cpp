@@ -93,7 +93,8 @@ TEST_F(Stream, Ratio) {
 }
 
 TEST_F(Stream, ClosingReportsAFailingFree) {
-  LXConversion* const conversion = LXOpenConversion(locale(case_codepage("EUC")), locale(case_codepage("SINGLE")));
+  LXConversion* const conversion =
+      LXOpenConversion(locale(case_codepage("EUC")), locale(case_codepage("SINGLE")));
   ASSERT_NE(conversion, nullptr);
   library.hooks().fail_frees(true);
   EXPECT_EQ(LXCloseConversion(conversion), LX_E_FREE);

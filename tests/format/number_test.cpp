@@ -6,6 +6,7 @@
 #include <cstdio>
 #include <cstring>
 #include <sstream>
+#include <tuple>
 
 #include "support/case_test.h"
 
@@ -232,6 +233,13 @@ TEST_F(NumberTest, OnlyTheListedStepsOfADoubleAreTaken) {
         LXStrDoubleNextState(step / 50 - 1, step % 50 - 2, &value, parts, parts + 1, parts + 2, parts + 3) >= 0;
   }
   EXPECT_EQ(steps, 9 * 10 + 4 + 1 + 2 + 2 + 2);
+  double value = 0;
+  int32_t state = 0, mantissa_sign = 1, fraction = 0, exponent_sign = 1, exponent = 0;
+  for (int32_t c :
+       {int32_t{LX_CLASS_NEGATIVE}, 1, int32_t{LX_CLASS_DECIMAL}, 5, 14, int32_t{LX_CLASS_NEGATIVE}, 0, 7})
+    state = LXStrDoubleNextState(state, c, &value, &mantissa_sign, &fraction, &exponent_sign, &exponent);
+  EXPECT_EQ(std::tie(state, value, mantissa_sign, fraction, exponent_sign, exponent),
+            std::make_tuple(8, 1.5, -1, -1, -1, 7));
 }
 
 }  // namespace
