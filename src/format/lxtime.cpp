@@ -196,7 +196,7 @@ size_t write_time(const LXLocale& locale, const LXTime& time, Unit* buffer, size
 }
 
 template <class Unit>
-int32_t format_time(LXLocale* given, const LXTime& time, Unit* buffer, LXShiftState state, int32_t size,
+int32_t format_time(LXLocale* given, const LXTime* time, Unit* buffer, LXShiftState state, int32_t size,
                     const Text<Unit>& format, uint32_t flags, Form form) {
   Call call(unit, given);
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, -1);
@@ -214,13 +214,13 @@ int32_t format_time(LXLocale* given, const LXTime& time, Unit* buffer, LXShiftSt
       if (characters) {
         uint8_t work[kWorkBytes] = {};  // cleared, since nested formats may leave places unwritten
         const size_t room = least(least(most, kWorkBytes) * kWorkBytesPerChar, kWorkBytes);
-        const size_t filled = write_time<Kind>(locale, time, work, room, in, state, flags, &code);
+        const size_t filled = write_time<Kind>(locale, *time, work, room, in, state, flags, &code);
         const Part copied = copy_chars(cp, form, state, work, filled, most - null, buffer);
         if (null != 0) buffer[copied.units] = 0;
         return copied.chars;
       }
     }
-    return write_time<Kind>(locale, time, buffer, most, in, state, flags, &code);
+    return write_time<Kind>(locale, *time, buffer, most, in, state, flags, &code);
   });
   return call.end(code, static_cast<int32_t>(written + null));
 }
@@ -231,25 +231,25 @@ extern "C" {
 
 int32_t LXTimeToString(LXLocale* locale, const LXTime* time, char* buffer, int32_t size, const char* format,
                        int32_t format_length, uint32_t flags) {
-  return format_time(locale, *time, bytes_of(buffer), LX_SHIFT_SINGLE, size, text_of(format, format_length),
+  return format_time(locale, time, bytes_of(buffer), LX_SHIFT_SINGLE, size, text_of(format, format_length),
                      flags, Form::kPlain);
 }
 
 int32_t LXTimeToStringW(LXLocale* locale, const LXTime* time, LXWChar* buffer, int32_t size,
                         const LXWChar* format, int32_t format_length, uint32_t flags) {
-  return format_time(locale, *time, buffer, LX_SHIFT_SINGLE, size, text_of(format, format_length), flags,
+  return format_time(locale, time, buffer, LX_SHIFT_SINGLE, size, text_of(format, format_length), flags,
                      Form::kWide);
 }
 
 int32_t LXTimeToStringU(LXLocale* locale, const LXTime* time, LXUChar* buffer, int32_t size,
                         const LXUChar* format, int32_t format_length, uint32_t flags) {
-  return format_time(locale, *time, buffer, LX_SHIFT_SINGLE, size, text_of(format, format_length), flags,
+  return format_time(locale, time, buffer, LX_SHIFT_SINGLE, size, text_of(format, format_length), flags,
                      Form::kUnicode);
 }
 
 int32_t LXTimeToStringEx(LXLocale* locale, const LXTime* time, char* buffer, LXShiftState state, int32_t size,
                          const char* format, LXShiftState format_state, int32_t format_length, uint32_t flags) {
-  return format_time(locale, *time, bytes_of(buffer), state, size, text_of(format, format_length, format_state),
+  return format_time(locale, time, bytes_of(buffer), state, size, text_of(format, format_length, format_state),
                      flags, Form::kEx);
 }
 
