@@ -2,18 +2,15 @@
 #include "codepage_model.h"
 
 #include <algorithm>
-#include <cstdio>
 #include <set>
 #include <tuple>
+
+#include "lexicor/hex.h"
 
 namespace lexicor_data {
 namespace {
 
-std::string hex(uint32_t v, int digits) {
-  char text[16];
-  std::snprintf(text, sizeof text, "%0*X", digits, static_cast<unsigned>(v));
-  return text;
-}
+using lexicor_cli::hex_text;
 
 uint32_t utf8_code(uint32_t u) {
   if (u < 0x80) return u;
@@ -63,7 +60,8 @@ CodepageModel to_model(const CodepageSource& source, const std::string& file_nam
     return model;
   }
   auto fail = [&](const Mapping& m, const std::string& what) {
-    throw SourceError(file_name, 0, 0, "<U" + hex(m.unicode, 4) + "> and code " + hex(m.code, 2) + ": " + what);
+    throw SourceError(file_name, 0, 0,
+                      "<U" + hex_text(m.unicode, 4) + "> and code " + hex_text(m.code, 2) + ": " + what);
   };
   std::set<uint32_t> codes_beyond;
   for (const Mapping& m : source.mappings) {

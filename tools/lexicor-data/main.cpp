@@ -1,6 +1,5 @@
 // lexicor-data: compiles the sources of a locale directory, dumps objects as sources, and checks directories.
 // Exit codes: 0 done, 1 an error in the data, 2 a wrong command line.
-#include <CLI/CLI.hpp>
 #include <cstdio>
 #include <exception>
 #include <filesystem>
@@ -12,8 +11,9 @@
 #include "compile.h"
 #include "control_source.h"
 #include "core/lxformat.h"
+#include "lexicor/arguments.h"
+#include "lexicor/command.h"
 #include "lexicor/descriptors.h"
-#include "lexicor/parse_fault.h"
 #include "ucm.h"
 
 namespace {
@@ -21,7 +21,8 @@ namespace {
 using namespace lexicor_data;
 namespace fs = std::filesystem;
 
-constexpr int kDone = 0, kDataError = 1, kUsageError = 2;
+using lexicor_cli::kDataError;
+using lexicor_cli::kDone;
 
 Control read_control_file(const std::string& path) {
   return unpack_control(read_object(read_file(path), path).sections[0], path);
@@ -80,42 +81,37 @@ int check(const std::string& directory) {
 
 int main(int argc, char** argv) {
   lexicor_cli::open_closed_descriptors();
-  CLI::App app("Compiles, dumps and checks Lexicor locale data.", "lexicor-data");
-  app.require_subcommand(1);
+  lexicor_cli::CommandLine line("lexicor-data", "Compiles, dumps and checks Lexicor locale data.");
   std::string source, out, file, control_file, directory;
   CompileOptions options;
 
-  CLI::App* compile_command =
-      app.add_subcommand("compile", "Compile a source directory into a locale directory");
-  compile_command->add_option("SRC", source, "the directory with control.txt")->required();
-  compile_command->add_option("OUT", out, "the locale directory")->required();
-  compile_command->add_flag("--verbose", options.verbose, "list section sizes and each character left out");
-  compile_command->add_option("--report", options.report_file, "a file for the list of characters left out");
+  auto compile_command = line.add_subcommand("compile", "Compile a source directory into a locale directory");
+  compile_command.add_option("SRC", source, "the directory with control.txt").required();
+  compile_command.add_option("OUT", out, "the locale directory").required();
+  compile_command.add_flag("--verbose", options.verbose, "list section sizes and each character left out");
+  compile_command.add_option("--report", options.report_file, "a file for the list of characters left out");
 
-  CLI::App* dump_command = app.add_subcommand("dump", "Print the source of an object or of a control file");
-  dump_command->add_option("FILE", file, "an object, such as cp_00819.nls, or control.nls")->required();
-  dump_command->add_option("--control", control_file, "the control file that names objects");
+  auto dump_command = line.add_subcommand("dump", "Print the source of an object or of a control file");
+  dump_command.add_option("FILE", file, "an object, such as cp_00819.nls, or control.nls").required();
+  dump_command.add_option("--control", control_file, "the control file that names objects");
 
-  CLI::App* check_command = app.add_subcommand("check", "Check a compiled or a source directory");
-  check_command->add_option("DIR", directory, "the directory")->required();
+  auto check_command = line.add_subcommand("check", "Check a compiled or a source directory");
+  check_command.add_option("DIR", directory, "the directory").required();
 
   try {
-    app.parse(argc, argv);
-  } catch (const CLI::ParseError& error) {
-    if (error.get_exit_code() == 0) return app.exit(error);
-    std::cerr << "lexicor-data: " << lexicor_cli::parse_fault(app, error) << '\n';
-    return kUsageError;
-  }
-  try {
-    if (*compile_command) compile_directory(source, out, options, std::cerr);
-    if (*dump_command) dump(file, control_file);
-    if (*check_command) return check(directory);
+    if (!line.parse(argc, argv)) return kDone;
+    if (compile_command.given()) compile_directory(source, out, options, std::cerr);
+    if (dump_command.given()) dump(file, control_file);
+    if (check_command.given()) return check(directory);
     std::cout.flush();
     if (!std::cout) throw SourceError("standard output", 0, 0, "cannot be written");
   } catch (const SourceError& error) {
     // A place in a source stands first, as compilers write it.
     std::cerr << (error.line > 0 ? "" : "lexicor-data: ") << error.what() << '\n';
     return kDataError;
+  } catch (const lexicor_cli::Failure& failure) {
+    std::cerr << "lexicor-data: " << failure.what() << '\n';
+    return failure.code();
   } catch (const std::exception& error) {
     std::cerr << "lexicor-data: " << error.what() << '\n';
     return kDataError;

@@ -2,22 +2,18 @@
 // level with a zero byte: what follows from that is checked here.
 #include "sort_check.h"
 
-#include <cstdio>
 #include <vector>
 
+#include "lexicor/hex.h"
 #include "ucm.h"
 
 namespace lexicor_data {
 namespace {
 
+using lexicor_cli::hex_text;
+
 /// Below it the high byte of a weight could be taken for a secondary or tertiary weight of a shorter key.
 constexpr uint16_t kLowestPrimary = 0x0200;
-
-std::string hex(unsigned value, int digits) {
-  char text[16];
-  std::snprintf(text, sizeof text, "%0*X", digits, value);
-  return text;
-}
 
 class Checker {
  public:
@@ -54,7 +50,7 @@ class Checker {
   }
 
   [[noreturn]] void fail_primary(SortPlace place, uint16_t primary) const {
-    fail(place, "primary weight " + hex(primary, 4) + " is below 0200");
+    fail(place, "primary weight " + hex_text(primary, 4) + " is below 0200");
   }
 
   void check_element(const SortElement& element) {
@@ -78,15 +74,15 @@ class Checker {
     note(defaulted_[set.primary], set.secondary == sort_.default_secondary,
          set.tertiary == sort_.default_tertiary);
     if ((bare_[set.primary] & defaulted_[set.primary]) != 0) {
-      fail(place, "primary weight " + hex(set.primary, 4) +
+      fail(place, "primary weight " + hex_text(set.primary, 4) +
                       " occurs both with a default weight and without a weight on the same level");
     }
   }
 
   void check_level(uint8_t weight, uint8_t lowest, const char* level, SortPlace place) const {
     if (weight == 0 || weight >= lowest) return;
-    fail(place,
-         std::string(level) + " weight " + hex(weight, 4) + " is below the default one, " + hex(lowest, 4));
+    fail(place, std::string(level) + " weight " + hex_text(weight, 4) + " is below the default one, " +
+                    hex_text(lowest, 4));
   }
 
   static void note(uint8_t& levels, bool secondary, bool tertiary) {

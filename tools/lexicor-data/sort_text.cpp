@@ -4,13 +4,13 @@
 
 #include <algorithm>
 #include <cctype>
-#include <cstdio>
 #include <istream>
 #include <ostream>
 #include <set>
 #include <tuple>
 #include <vector>
 
+#include "lexicor/hex.h"
 #include "line_text.h"
 #include "sort_check.h"
 #include "ucm.h"
@@ -33,9 +33,7 @@ constexpr LevelName kLevels[] = {
 constexpr const char* kNoLevels = "none";
 
 std::string hex(unsigned value) {
-  char text[16];
-  std::snprintf(text, sizeof text, "%04X", value);
-  return text;
+  return lexicor_cli::hex_text(value, 4);
 }
 
 bool is_surrogate(unsigned code) {
@@ -132,9 +130,9 @@ struct Insertion {
   bool contraction = false;  ///< the range's ends are the two characters
 };
 
-class Reader {
+class SortReader {
  public:
-  Reader(std::istream& in, const std::string& file) : in_(in), file_(file) {}
+  SortReader(std::istream& in, const std::string& file) : in_(in), file_(file) {}
 
   SortSource read() {
     std::string text;
@@ -502,7 +500,7 @@ bool SortElement::ignored() const {
 }
 
 SortSource read_sort(std::istream& in, const std::string& file_name) {
-  return Reader(in, file_name).read();
+  return SortReader(in, file_name).read();
 }
 
 void write_sort(std::ostream& out, const SortSource& sort) {

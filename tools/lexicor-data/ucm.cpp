@@ -4,16 +4,18 @@
 #include "ucm.h"
 
 #include <algorithm>
-#include <cstdio>
 #include <istream>
 #include <map>
 #include <ostream>
 #include <tuple>
 
+#include "lexicor/hex.h"
 #include "line_text.h"
 
 namespace lexicor_data {
 namespace {
+
+using lexicor_cli::hex_text;
 
 constexpr uint32_t kLastCodePoint = 0x10FFFF;
 constexpr size_t kMaxCodeBytes = 4;
@@ -47,14 +49,8 @@ std::string located(const std::string& file, int line, int column, const std::st
   return text + ": " + what;
 }
 
-std::string hex(uint32_t value, int digits) {
-  char text[16];
-  std::snprintf(text, sizeof text, "%0*X", digits, static_cast<unsigned>(value));
-  return text;
-}
-
 std::string byte_text(uint32_t byte) {
-  return "\\x" + hex(byte, 2);
+  return "\\x" + hex_text(byte, 2);
 }
 
 std::string code_text(uint32_t code, unsigned bytes) {
@@ -64,7 +60,7 @@ std::string code_text(uint32_t code, unsigned bytes) {
 }
 
 std::string unicode_text(uint32_t unicode) {
-  return "<U" + hex(unicode, 4) + ">";
+  return "<U" + hex_text(unicode, 4) + ">";
 }
 
 uint32_t first_byte(const Mapping& mapping) {
@@ -176,9 +172,9 @@ class Cursor {
   size_t at_ = 0;
 };
 
-class Reader {
+class UcmReader {
  public:
-  Reader(std::istream& in, const std::string& file) : in_(in), file_(file) {}
+  UcmReader(std::istream& in, const std::string& file) : in_(in), file_(file) {}
 
   CodepageSource read() {
     std::string text;
@@ -285,7 +281,7 @@ class Reader {
       if (last < first) cursor.fail(start, "the range runs backwards");
       if (first == 0) cursor.fail(start, "the byte 00 cannot begin a longer character");
       for (uint32_t byte = first; byte <= last; ++byte) {
-        if (source_.leads[byte] != 1) cursor.fail(start, "lead " + hex(byte, 2) + " is named twice");
+        if (source_.leads[byte] != 1) cursor.fail(start, "lead " + hex_text(byte, 2) + " is named twice");
         source_.leads[byte] = static_cast<uint8_t>(digit - '0');
       }
       if (!cursor.done() && !is_blank(cursor.peek())) cursor.fail_expected("a blank between ranges");
@@ -447,8 +443,8 @@ std::string leads_text(const std::array<uint8_t, 256>& leads) {
     while (last < 255 && leads[last + 1] == leads[first]) ++last;
     if (leads[first] != 1) {
       if (!text.empty()) text += ' ';
-      text += hex(first, 2);
-      if (last > first) text += '-' + hex(last, 2);
+      text += hex_text(first, 2);
+      if (last > first) text += '-' + hex_text(last, 2);
       text += ':' + std::to_string(leads[first]);
     }
     first = last + 1;
@@ -465,7 +461,7 @@ SourceError::SourceError(std::string file_name, int line_number, int column_numb
       column(column_number) {}
 
 CodepageSource read_ucm(std::istream& in, const std::string& file_name) {
-  return Reader(in, file_name).read();
+  return UcmReader(in, file_name).read();
 }
 
 void write_ucm(std::ostream& out, const CodepageSource& source) {

@@ -1,10 +1,59 @@
-// Hands declarations on to the argument parser.
+// Hands declarations on to the argument parser, and says what it refuses.
 #include "arguments.h"
 
 #include <CLI/CLI.hpp>
 #include <limits>
+#include <sstream>
+
+#include "command.h"
+#include "near_names.h"
+#include "output.h"
 
 namespace lexicor_cli {
+namespace {
+
+/// The subcommand that was named, with those above it: "lexicor sort".
+std::string command_text(const CLI::App& app) {
+  for (const CLI::App* command : app.get_subcommands()) return app.get_name() + " " + command_text(*command);
+  return app.get_name();
+}
+
+/// The long names of the options that the named subcommand takes.
+std::vector<std::string> option_names(const CLI::App& app) {
+  std::vector<std::string> names;
+  for (const CLI::App* at = &app; at != nullptr;) {
+    for (const CLI::Option* option : at->get_options()) {
+      for (const std::string& name : option->get_lnames()) names.push_back("--" + name);
+    }
+    const std::vector<CLI::App*> below = at->get_subcommands();
+    at = below.empty() ? nullptr : below[0];
+  }
+  return names;
+}
+
+/// What is wrong with a command line, said by name: the parser alone names what it misses first, which hides the
+/// misspelt argument that was meant for it.
+std::string parse_fault(const CLI::App& app, const CLI::ParseError& error) {
+  const std::vector<std::string> left = app.remaining(true);
+  const std::string help = "'" + command_text(app) + " --help' shows those there are";
+  std::vector<std::string> commands;
+  for (const CLI::App* command : app.get_subcommands([](const CLI::App*) { return true; }))
+    commands.push_back(command->get_name());
+  for (const std::string& argument : left) {
+    const bool option = argument.size() > 1 && argument[0] == '-';
+    const bool command = !option && !commands.empty() && app.get_subcommands().empty();
+    if (!option && !command) continue;
+    const std::string name = argument.substr(0, argument.find('='));
+    const std::string near = did_you_mean(nearest_name(name, option ? option_names(app) : commands));
+    return (option ? "unknown option " + name : "unknown command '" + name + "'") +
+           (near.empty() ? "; " + help : near);
+  }
+  if (!left.empty())
+    return "unexpected argument '" + left[0] + "'; '" + command_text(app) + " --help' says more";
+  return std::string(error.what()) + "; '" + command_text(app) + " --help' says more";
+}
+
+}  // namespace
 
 using Option = Arguments::Option;
 
@@ -64,6 +113,39 @@ Option Arguments::add_flag(const char* name, std::string& value, const std::vect
 
 void Arguments::footer(const char* text) {
   command_.footer(text);
+}
+
+bool Arguments::given() const {
+  return static_cast<bool>(command_);
+}
+
+CommandLine::CommandLine(const char* program, const char* summary, const char* version)
+    : program_(std::make_unique<CLI::App>(summary, program)) {
+  if (version != nullptr) program_->set_version_flag("--version", std::string(program) + " " + version);
+}
+CommandLine::~CommandLine() = default;
+
+Arguments CommandLine::arguments() {
+  return Arguments(*program_);
+}
+
+Arguments CommandLine::add_subcommand(const char* name, const char* summary) {
+  program_->require_subcommand(1);
+  return Arguments(*program_->add_subcommand(name, summary)->fallthrough());
+}
+
+bool CommandLine::parse(int argc, char** argv) {
+  try {
+    program_->parse(argc, argv);
+    return true;
+  } catch (const CLI::ParseError& error) {
+    std::ostringstream out, err;
+    if (program_->exit(error, out, err) != 0) throw Failure(kUsageError, parse_fault(*program_, error));
+    std::string text = out.str();
+    if (!text.empty() && text.back() != '\n') text += '\n';
+    Output().write(text);
+    return false;
+  }
 }
 
 }  // namespace lexicor_cli

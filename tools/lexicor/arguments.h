@@ -1,8 +1,9 @@
-// What a subcommand declares of its arguments. The argument parser behind it has a large header, which only
-// arguments.cpp and the main files include.
+// The command line of a program: what it declares of its arguments, and how they are read. The argument parser behind
+// it has a large header, which arguments.cpp alone includes.
 #pragma once
 
 #include <cstdint>
+#include <memory>
 #include <optional>
 #include <string>
 #include <vector>
@@ -14,6 +15,7 @@ class Option;
 
 namespace lexicor_cli {
 
+/// The arguments of a program, or of one of its subcommands.
 class Arguments {
  public:
   /// One option or positional argument.
@@ -36,6 +38,8 @@ class Arguments {
   };
 
   explicit Arguments(CLI::App& command) : command_(command) {}
+  /// For a subcommand: whether it is the one that was named.
+  bool given() const;
 
   /// `name` without a dash: a positional argument. The value keeps what it holds when the argument is not
   /// given.
@@ -53,6 +57,25 @@ class Arguments {
 
  private:
   CLI::App& command_;
+};
+
+class CommandLine {
+ public:
+  /// With a version, --version prints it.
+  CommandLine(const char* program, const char* summary, const char* version = nullptr);
+  ~CommandLine();
+  CommandLine(const CommandLine&) = delete;
+  CommandLine& operator=(const CommandLine&) = delete;
+
+  /// What may stand before a subcommand or behind it.
+  Arguments arguments();
+  /// A command line names one of the subcommands, where there are any.
+  Arguments add_subcommand(const char* name, const char* summary);
+  /// False: a question for help or the version, which is answered. Throws a Failure that names what is wrong.
+  bool parse(int argc, char** argv);
+
+ private:
+  std::unique_ptr<CLI::App> program_;
 };
 
 /// The keys of a map, for one_of().

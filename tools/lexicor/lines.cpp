@@ -25,7 +25,7 @@ namespace {
 constexpr int32_t kLineCodes = 4096;  // of a longer line as many at a time
 constexpr size_t kMostEolCodes = 5;
 
-const std::map<std::string, uint32_t> kKinds = {
+const std::map<std::string, uint32_t> kLineEnds = {
     {"lf", LX_EOL_LF}, {"crlf", LX_EOL_CRLF}, {"nl", LX_EOL_THIRD}, {"other", LX_EOL_FOURTH}};
 
 struct LinesOptions {
@@ -186,7 +186,7 @@ class Rewriter {
   void report() const {
     uint64_t all = 0;
     std::string kinds;
-    for (const auto& [name, kind] : kKinds) {
+    for (const auto& [name, kind] : kLineEnds) {
       const auto found = found_.find(kind);
       if (found == found_.end()) continue;
       all += found->second;
@@ -209,7 +209,7 @@ int rewrite_lines(const LinesOptions& options, const CommonOptions& common) {
   const Session session(common);
   const Codepage codepage(session, read_catalogue(), options.from);
   uint32_t find = options.find.empty() ? LX_EOL_ALL : 0;
-  for (const std::string& name : options.find) find |= kKinds.at(name);
+  for (const std::string& name : options.find) find |= kLineEnds.at(name);
   Input input(options.files);
   Source source(input, codepage);
   Output output(options.output);
@@ -218,7 +218,7 @@ int rewrite_lines(const LinesOptions& options, const CommonOptions& common) {
   source.show(progress);
   Stream in(codepage.locale(), source, LX_STREAM_READ);
   Stream out(codepage.locale(), target, LX_STREAM_WRITE);
-  Rewriter rewriter(codepage, find, kKinds.at(options.eol));
+  Rewriter rewriter(codepage, find, kLineEnds.at(options.eol));
   const int32_t code = rewriter.run(in, out);
   source.rethrow();
   out.close();
@@ -242,11 +242,11 @@ Run declare_lines(Arguments& command, const CommonOptions& common) {
           "line end to write: lf, crlf, nl (new line of EBCDIC), or other (a fourth one of the codepage)")
       .required()
       .type_name("KIND")
-      .one_of(keys_of(kKinds));
+      .one_of(keys_of(kLineEnds));
   command.add_option("--find", options->find, "line ends to rewrite, separated by commas; else all four kinds")
       .type_name("KIND,...")
       .divided_by(',')
-      .one_of(keys_of(kKinds));
+      .one_of(keys_of(kLineEnds));
   command.add_flag("--report", options->report, "say on standard error how many line ends there were");
   command.add_option("-o,--output", options->output, "output file, replaced when it is complete")
       .type_name("OUT");

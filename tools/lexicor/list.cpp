@@ -24,7 +24,7 @@ constexpr size_t kLineChars = 100;
 constexpr struct {
   const char* title;
   int type;
-} kKinds[] = {
+} kObjectKinds[] = {
     {"codepages", LX_CODEPAGE}, {"languages", LX_LANGUAGE}, {"territories", LX_TERRITORY}, {"sorts", LX_SORT}};
 
 struct ListOptions {
@@ -137,7 +137,7 @@ std::string list_text(const ListOptions& options, const Catalogue& catalogue) {
   const auto heading = [&](const std::string& title) {
     if (all) out << (out.tellp() > 0 ? "\n" : "") << title << '\n';
   };
-  for (const auto& kind : kKinds) {
+  for (const auto& kind : kObjectKinds) {
     if (!all && options.what != kind.title) continue;
     if (options.json) {
       json[kind.title] = json_objects(catalogue, kind.type);

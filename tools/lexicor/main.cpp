@@ -2,7 +2,6 @@
 // Exit codes: 0 done, 1 an error in the data or the files, 2 a wrong command line, and of `compare` 3 and 4.
 #include <lx.h>
 
-#include <CLI/CLI.hpp>
 #include <utility>
 #include <vector>
 
@@ -49,28 +48,22 @@ constexpr char kFooter[] =
     "  lexicor convert --help";
 
 int run(int argc, char** argv) {
-  CLI::App app("Lexicor: national-language support. Codepage conversion and locale data.", "lexicor");
+  CommandLine line("lexicor", "Lexicor: national-language support. Codepage conversion and locale data.",
+                   LX_VERSION);
   CommonOptions common;
-  app.set_version_flag("--version", "lexicor " LX_VERSION);
-  app.add_option("--locale-dir", common.locale_dir,
-                 "locale directory; else LX_LOCALEDIR, else the one beside the program")
-      ->type_name("DIR");
-  app.require_subcommand(1);
-  app.footer(kFooter);
-  std::vector<std::pair<const CLI::App*, Run>> runs;
+  line.arguments()
+      .add_option("--locale-dir", common.locale_dir,
+                  "locale directory; else LX_LOCALEDIR, else the one beside the program")
+      .type_name("DIR");
+  line.arguments().footer(kFooter);
+  std::vector<std::pair<Arguments, Run>> runs;
   for (const Subcommand& subcommand : kSubcommands) {
-    CLI::App* command = app.add_subcommand(subcommand.name, subcommand.summary);
-    command->fallthrough();
-    Arguments arguments(*command);
-    runs.emplace_back(command, subcommand.declare(arguments, common));
+    Arguments arguments = line.add_subcommand(subcommand.name, subcommand.summary);
+    runs.emplace_back(arguments, subcommand.declare(arguments, common));
   }
-  try {
-    app.parse(argc, argv);
-  } catch (const CLI::ParseError& error) {
-    return answer_parse(app, error);
-  }
-  for (const auto& [command, action] : runs) {
-    if (*command) return action();
+  if (!line.parse(argc, argv)) return kDone;
+  for (const auto& [arguments, action] : runs) {
+    if (arguments.given()) return action();
   }
   return kUsageError;
 }

@@ -24,7 +24,7 @@ namespace lexicor_cli {
 
 namespace {
 
-constexpr size_t kMostBytes = std::numeric_limits<int32_t>::max();
+constexpr size_t kMostTranslated = std::numeric_limits<int32_t>::max();
 // A byte becomes at most one character of four bytes, with a shift byte before it; the text gets one at its
 // end.
 constexpr size_t kGrowth = 5;
@@ -63,8 +63,8 @@ template <class Look>
 std::vector<char> read_whole(Pieces& pieces, bool show_progress, Look look) {
   std::vector<char> text;
   pieces.each(show_progress, [&](const char* data, size_t bytes) {
-    if (bytes > kMostBytes - text.size())
-      throw Failure(kDataError, "the input is longer than " + std::to_string(kMostBytes) +
+    if (bytes > kMostTranslated - text.size())
+      throw Failure(kDataError, "the input is longer than " + std::to_string(kMostTranslated) +
                                     " bytes; 'lexicor convert' takes any length");
     look(data, bytes);
     text.insert(text.end(), data, data + bytes);
@@ -103,7 +103,8 @@ std::vector<char> read_units(const Side& target, const Input& input, Pieces& pie
 
 /// The size that the output needs at most, up to what the library takes.
 size_t needed_bytes(size_t text_bytes) {
-  return static_cast<size_t>(std::min<uint64_t>(kMostBytes, uint64_t{text_bytes} * kGrowth + kClosingBytes));
+  return static_cast<size_t>(
+      std::min<uint64_t>(kMostTranslated, uint64_t{text_bytes} * kGrowth + kClosingBytes));
 }
 
 int translate(const TranslateOptions& options, const CommonOptions& common) {
@@ -130,7 +131,7 @@ int translate(const TranslateOptions& options, const CommonOptions& common) {
   if (code != LX_OK && code != LX_E_SIZE)
     throw Failure(kDataError, "the translation failed: " + describe_code(static_cast<int>(code)));
   const auto rest = static_cast<size_t>(consumed);
-  if (code == LX_E_SIZE && options.size == 0 && needed < kMostBytes) throw input.cut_at(rest);
+  if (code == LX_E_SIZE && options.size == 0 && needed < kMostTranslated) throw input.cut_at(rest);
   if (written > 0) output.write(buffer.get(), static_cast<size_t>(written));
   output.commit();
   if (code == LX_OK) {
