@@ -69,13 +69,15 @@ TEST_F(CatalogTest, ALoadedCatalogIsSearchedFromTheDensePlace) {
   EXPECT_EQ(message(loaded, 1, 2), "b") << "the file is not read again";
 }
 
-/// What a function wrote to a buffer of exactly this size; a sanitizer sees a write behind it.
+/// What a function wrote to a buffer of this size. Nothing is written behind it.
 template <class Unit, class Fetch>
 Text<Unit> written(size_t size, Fetch fetch) {
-  std::vector<Unit> buffer(size, Unit{'x'});
+  constexpr Unit kCanary{'x'};
+  std::vector<Unit> buffer(size + 4, kCanary);
   EXPECT_EQ(fetch(buffer.data(), static_cast<int32_t>(size)), LX_OK);
-  const auto end = std::find(buffer.begin(), buffer.end(), Unit{0});
-  EXPECT_NE(end, buffer.end()) << "not terminated";
+  EXPECT_EQ(std::count(buffer.end() - 4, buffer.end(), kCanary), 4);
+  const auto end = std::find(buffer.begin(), buffer.end() - 4, Unit{0});
+  EXPECT_NE(end, buffer.end() - 4) << "not terminated";
   return {buffer.begin(), end};
 }
 

@@ -1,7 +1,5 @@
-// Codepage aliases: the alias file's lines, its limits, and look-ups.
+// Codepage aliases: look-ups, and whose they are. The alias file's lines stand in tests/cases/cli/aliases.txt.
 #include "core/library_fixture.h"
-#include "core/lxalias.h"
-#include "support/case_rows.h"
 
 namespace lx::test {
 namespace {
@@ -13,31 +11,7 @@ class AliasTest : public LibraryTest {
     directory.write_text("alias.txt", text);
     ASSERT_EQ(init(), LX_OK);
   }
-
-  /// Every alias in file order, as "codepage=alias ".
-  static std::string all() {
-    std::string list;
-    EXPECT_EQ(LXEnumAliases(
-                  nullptr,
-                  [](void* user, const char* codepage, const char* alias) {
-                    *static_cast<std::string*>(user) += std::string(codepage) + "=" + alias + " ";
-                    return 1;
-                  },
-                  &list),
-              LX_OK);
-    return list;
-  }
 };
-
-TEST_F(AliasTest, Lines) {
-  for (const CaseRow& row : case_rows("core/alias_lines.txt")) {
-    SCOPED_TRACE(row.where);
-    load(row[0]);
-    const std::string aliases = all();
-    EXPECT_EQ(aliases.substr(0, aliases.find_last_not_of(' ') + 1), row[1]);
-    EXPECT_EQ(LXTerm(), LX_OK);
-  }
-}
 
 TEST_F(AliasTest, LookUpAndEnumeration) {
   load("UTF-8 utf8\nIBM-850 850 Latin-1\nIBM-437 latin-1 437\n");
@@ -67,17 +41,6 @@ TEST_F(AliasTest, EachManagerHasItsOwn) {
   EXPECT_STREQ(LXGetObjFromID(nullptr, LX_LANGUAGE, 1, LX_FIND_ONLY, &rc)->disk.name, "English");
   EXPECT_EQ(LXTermObjManager(own), LX_OK);
   EXPECT_EQ(LXTermObjManager(nullptr), LX_E_INVALID);
-}
-
-TEST_F(AliasTest, NoMemoryKeepsWhatWasRead) {
-  load("A one two three\n");
-  const size_t calls = hooks.calls();
-  EXPECT_EQ(LXTerm(), LX_OK);
-  hooks.fail_at(calls - 1);  // the record of the second alias
-  const auto said = messages(RAS1_LEVEL_ERRORS, [&] { EXPECT_EQ(init(), LX_OK); });
-  EXPECT_EQ(all(), "A=ONE ");
-  const std::string bytes = std::to_string(sizeof(AliasRecord));
-  EXPECT_EQ(said.at(0), "Unable to allocate " + bytes + " bytes for codepage A, alias two");
 }
 
 }  // namespace

@@ -2,6 +2,7 @@
 #include <climits>
 
 #include "core/library_fixture.h"
+#include "core/lxalias.h"
 
 namespace lx::test {
 namespace {
@@ -63,6 +64,30 @@ TEST_F(InitTest, TriesAgainAfterAFailedCall) {
     EXPECT_EQ(LXTerm(), LX_OK);
     EXPECT_EQ(next->live_blocks(), 0u);
   }
+}
+
+// What is said of each block that the beginning of a use needs. Aliases that were read stay.
+TEST_F(InitTest, SaysForWhatThereIsNoMemory) {
+  directory.write_locale({{367, "US-ASCII", ascii_codepage()}});
+  directory.write_text("alias.txt", "A one two three\n");
+  ASSERT_EQ(init(), LX_OK);
+  const size_t calls = hooks.calls();
+  const struct {
+    size_t allocation, bytes;
+    const char* what;
+  } rows[] = {{1, sizeof(GlobalArea), "globals"},
+              {2, sizeof(LXObjManager), "object manager"},
+              {5, 3 * format::kRecordBytes, "control data"},
+              {calls - 1, sizeof(AliasRecord), "codepage A, alias two"}};
+  for (const auto& row : rows) {
+    terminate();
+    hooks.fail_at(row.allocation);
+    const std::vector<std::string> said = messages(RAS1_LEVEL_ERRORS, [&] { init(); });
+    EXPECT_EQ(said.at(0), "Unable to allocate " + std::to_string(row.bytes) + " bytes for " + row.what);
+  }
+  hooks.fail_at(0);
+  EXPECT_STREQ(LXGetCodepageFromAlias(nullptr, "one"), "A");
+  EXPECT_EQ(LXGetCodepageFromAlias(nullptr, "two"), nullptr);
 }
 
 int32_t counted_frees;

@@ -101,14 +101,13 @@ class LibraryTest : public ::testing::Test {
 };
 
 /// The built-in language with other defaults.
-inline ByteString language_file(uint16_t territory, uint16_t codepage, uint16_t sort) {
+inline ByteString language(uint16_t territory, uint16_t codepage, uint16_t sort) {
   namespace words = format::language;
-  const Bytes built_in = kBuiltInLanguage.sections.section[0];
-  ByteString payload(built_in.data, built_in.data + built_in.size);
+  ByteString payload = payload_of(kBuiltInLanguage);
   put_le16(payload.data() + 2 * words::kDefaultTerritory, territory);
   put_le16(payload.data() + 2 * words::kDefaultCodepage, codepage);
   put_le16(payload.data() + 2 * words::kDefaultSort, sort);
-  return object_file({payload});
+  return payload;
 }
 
 inline constexpr char kDefaultControl[] = "/Tessarin/locale/control.nls";

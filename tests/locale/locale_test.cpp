@@ -15,25 +15,13 @@ class LocaleTest : public LibraryTest {
   void write_directory() {
     directory.write_locale({{367, "US-ASCII", ascii_codepage()},
                             {850, "Tiny", tiny_shift_jis().file.sections},
-                            {930, "Shift", tiny_shift().file.sections}});
-    directory.write("la_00001.nls", language_file(840, 367, 0));
-    directory.write("la_00002.nls", language_file(250, 850, 5));
-    directory.write("la_00003.nls", language_file(9999, 367, 0));
-    directory.write("la_00004.nls", language_file(840, 9999, 0));
-    directory.write("la_00005.nls", language_file(840, 367, 9999));
-    directory.write("te_00250.nls", directory.read("te_00840.nls"));
-    directory.write("so_00005.nls", object_file({SortBuilder{}.payload()}));
-    directory.write("control.nls", control_file({{1, LX_LANGUAGE, "English"},
-                                                 {2, LX_LANGUAGE, "French"},
-                                                 {3, LX_LANGUAGE, "NoTerritory"},
-                                                 {4, LX_LANGUAGE, "NoCodepage"},
-                                                 {5, LX_LANGUAGE, "NoSort"},
-                                                 {250, LX_TERRITORY, "France"},
-                                                 {840, LX_TERRITORY, "UnitedStates"},
-                                                 {367, LX_CODEPAGE, "US-ASCII"},
-                                                 {850, LX_CODEPAGE, "Tiny"},
-                                                 {930, LX_CODEPAGE, "Shift"},
-                                                 {5, LX_SORT, "Default"}}));
+                            {930, "Shift", tiny_shift().file.sections}},
+                           {{{2, LX_LANGUAGE, "French"}, language(250, 850, 5)},
+                            {{3, LX_LANGUAGE, "NoTerritory"}, language(9999, 367, 0)},
+                            {{4, LX_LANGUAGE, "NoCodepage"}, language(840, 9999, 0)},
+                            {{5, LX_LANGUAGE, "NoSort"}, language(840, 367, 9999)},
+                            {{250, LX_TERRITORY, "France"}, payload_of(kBuiltInTerritory)},
+                            {{5, LX_SORT, "Default"}, SortBuilder{}.payload()}});
   }
   void init_directory() {
     write_directory();
@@ -62,12 +50,7 @@ class LocaleTest : public LibraryTest {
 
 TEST_F(LocaleTest, Names) {
   init_directory();
-  std::vector<CaseRow> rows = case_rows("locale/locale_names.txt");
-  const std::string long_name(100000, 'x');
-  rows.push_back({"long", {"French@" + long_name, "0", "33"}});
-  rows.push_back({"long, with fallback", {"French@" + long_name, "4", "2 250 850 5 0"}});
-  rows.push_back({"long, of the user", {"French@" + long_name.substr(0, 500), "2", "33"}});
-  for (const CaseRow& row : rows) {
+  for (const CaseRow& row : case_rows("locale/locale_names.txt")) {
     const int32_t flags = row.number(1);
     const bool of_user = (flags & LX_USER_LOCALE) != 0;
     if (of_user) setenv("LX_LANG", row[0].c_str(), 1);
@@ -94,7 +77,7 @@ TEST_F(LocaleTest, Names) {
 
 // A default that exists only as an object of another type, next to the empty range, is not found.
 TEST_F(LocaleTest, AnObjectOfAnotherTypeIsNotFound) {
-  directory.write("la_00007.nls", language_file(7, 367, 0));
+  directory.write("la_00007.nls", object_file({language(7, 367, 0)}));
   directory.write("control.nls", control_file({{7, LX_LANGUAGE, "English"}, {367, LX_CODEPAGE, "US-ASCII"}}));
   ASSERT_EQ(init(), LX_OK);
   EXPECT_EQ(LXSetLocale("English", LX_FALLBACK), LX_E_NO_TERRITORY);
@@ -124,12 +107,8 @@ TEST_F(LocaleTest, OtherCodesOfLookUps) {
 
 // The 16-bit name goes through the common codepage; where there is none, the name is empty.
 TEST_F(LocaleTest, UnicodeNamesNeedTheCommonCodepage) {
-  write_directory();
-  directory.write("la_00001.nls", language_file(840, 850, 0));
-  directory.write("control.nls", control_file({{1, LX_LANGUAGE, "English"},
-                                               {2, LX_LANGUAGE, "French"},
-                                               {840, LX_TERRITORY, "UnitedStates"},
-                                               {850, LX_CODEPAGE, "Tiny"}}));
+  directory.write_locale({{850, "Tiny", tiny_shift_jis().file.sections}},
+                         {{{2, LX_LANGUAGE, "French"}, language(840, 850, 0)}});
   ASSERT_EQ(init(), LX_OK);
   int32_t rc = -1;
   LXLocale* locale = create<LXUChar, LXGetLocaleU>("French", 0, &rc);
@@ -191,14 +170,22 @@ TEST_F(LocaleTest, OperatingSystemName) {
   }
 }
 
-template <class Unit>
-using Names = std::vector<std::basic_string<Unit>>;
-/// Adds a name behind the digit of its type; the fourth is the last one.
-template <class Unit>
-int32_t add_name(void* user, int32_t type, const Unit* name) {
-  auto& names = *static_cast<Names<Unit>*>(user);
-  names.push_back(static_cast<Unit>('0' + type) + std::basic_string<Unit>(name));
-  return names.size() == 4 ? 0 : 7;
+/// That the names come with their types up to the fourth, which is the last one. A byte that is not ASCII becomes
+/// `unit`.
+template <class Unit, class Door>
+void expect_names(Door* enumerate, Unit unit) {
+  std::vector<std::pair<int32_t, std::basic_string<Unit>>> names,
+      expected{{0, widened<Unit>("English")},
+               {1, widened<Unit>("UnitedStates")},
+               {2, unit + widened<Unit>(std::string(32, 'x'))},
+               {3, widened<Unit>("Last")}};
+  const auto add = [](void* user, int32_t type, const Unit* name) {
+    auto& all = *static_cast<decltype(names)*>(user);
+    all.emplace_back(type, name);
+    return all.size() == 4 ? 0 : 7;
+  };
+  EXPECT_EQ(enumerate(add, &names), 0);
+  EXPECT_EQ(names, expected);
 }
 
 TEST_F(LocaleTest, Enumeration) {
@@ -209,21 +196,9 @@ TEST_F(LocaleTest, Enumeration) {
                                                {2, LX_SORT, "Last"},
                                                {3, LX_SORT, "Behind"}}));
   ASSERT_EQ(init(), LX_OK);
-  Names<char> bytes;
-  Names<LXWChar> wide, widened_bytes;
-  Names<LXUChar> unicode, converted;
-  EXPECT_EQ(LXEnumLocales(add_name<char>, &bytes), 0);
-  EXPECT_EQ(LXEnumLocalesW(add_name<LXWChar>, &wide), 0);
-  EXPECT_EQ(LXEnumLocalesU(add_name<LXUChar>, &unicode), 0);
-  EXPECT_EQ(bytes, (Names<char>{"0English", "1UnitedStates", "2\xE9" + std::string(32, 'x'), "3Last"}));
-  for (const std::string& name : bytes) {
-    widened_bytes.push_back(widened<LXWChar>(name));
-    converted.push_back(widened<LXUChar>(name));
-  }
-  widened_bytes[2][1] = 0xE9;
-  converted[2][1] = 0xFFFD;
-  EXPECT_EQ(wide, widened_bytes) << "byte by byte, without a sign";
-  EXPECT_EQ(unicode, converted) << "through the common codepage";
+  expect_names(LXEnumLocales, '\xE9');
+  expect_names(LXEnumLocalesW, LXWChar{0xE9});    // byte by byte, without a sign
+  expect_names(LXEnumLocalesU, LXUChar{0xFFFD});  // through the common codepage
 }
 
 }  // namespace
