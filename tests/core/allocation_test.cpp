@@ -4,13 +4,11 @@
 
 #include "core/tiny_directory.h"
 #include "support/catalog_builder.h"
+#include "support/forms.h"
 #include "support/system_locale.h"
 
 namespace lx::test {
 namespace {
-
-using Wide = std::basic_string<LXWChar>;
-using Unicode = std::basic_string<LXUChar>;
 
 constexpr char kEverything[] = "English_Elsewhere.TINY-SHIFT@Default";
 
@@ -73,11 +71,9 @@ class AllocationTest : public LibraryTest {
     std::string state = std::to_string(locale->changed) + ' ' + std::to_string(locale->flags);
     for (int32_t item = 1; item <= LX_ITEM_LOCALE_STRING; ++item) {
       char bytes[300] = "";
-      LXUChar units[300] = {};
       LXGetLocaleTextInfo(locale, item, bytes, sizeof(bytes), 0);
-      LXGetLocaleTextInfoU(locale, item, units, 300, 0);
-      state += '|' + std::to_string(LXGetLocaleNumInfo(locale, item, 0)) + bytes;
-      for (const LXUChar* unit = units; *unit != 0; ++unit) state += ' ' + std::to_string(*unit);
+      state +=
+          '|' + std::to_string(LXGetLocaleNumInfo(locale, item, 0)) + bytes + shown(test::item(locale, item));
     }
     return state;
   }
@@ -146,11 +142,10 @@ TEST_F(AllocationTest, EveryAllocationFails) {
   const std::string path = directory.path(), control = directory.file("control.nls"),
                     catalog = directory.file("catalog");
   const std::string long_text(400, 'a'), longer = long_text + "  ";
-  const Unicode long_units = widened<LXUChar>(long_text + 'b'),
-                capitals = widened<LXUChar>(std::string(400, 'A') + 'B'), catalog16 = widened<LXUChar>(catalog),
-                missing16(400, 'd');
-  const Unicode everything16 = widened<LXUChar>(kEverything);
-  const Wide everything32 = widened<LXWChar>(kEverything), long_codes(400, 'a');
+  const Units long_units = widened<LXUChar>(long_text + 'b'),
+              capitals = widened<LXUChar>(std::string(400, 'A') + 'B'), catalog16 = widened<LXUChar>(catalog),
+              missing16(400, 'd'), everything16 = widened<LXUChar>(kEverything);
+  const Text<LXWChar> everything32 = widened<LXWChar>(kEverything), long_codes(400, 'a');
   const LXUChar currency[] = {0x3041, 0x3042, 0x3043, 'A', 0};
   const LXUChar* const currency16 = currency;
   char grouping[] = "\3\3";

@@ -137,15 +137,5 @@ TEST_F(InitTest, TermReportsTheFirstFailingRelease) {
   }
 }
 
-TEST_F(InitTest, EnvironmentAccess) {
-  char buffer[16] = "#";
-  EXPECT_EQ(LXGetEnv("LX_LANG", buffer, sizeof(buffer)), 0);
-  setenv("LX_LANG", "abcde", 1);
-  for (int32_t size : {-1, 5}) EXPECT_EQ(LXGetEnv("LX_LANG", buffer, size), 6);
-  EXPECT_STREQ(buffer, "#");
-  EXPECT_EQ(LXGetEnv("LX_LANG", buffer, 6), 6);
-  EXPECT_STREQ(buffer, "abcde");
-}
-
 }  // namespace
 }  // namespace lx::test

@@ -24,8 +24,9 @@
 namespace lx::test {
 
 /// Runs `action` with its assertions in a process of its own, so that a crash, or the end that a sanitizer
-/// makes, is one failure.
-inline void expect_in_child(const char* what, const std::function<void()>& action) {
+/// makes, is one failure. `end` ends the process.
+inline void expect_in_child(const std::string& what, const std::function<void()>& action,
+                            void (*end)(int) = _exit) {
   SCOPED_TRACE(what);
   const auto run = [&] {
     ::testing::TestPartResultArray failures;
@@ -37,7 +38,12 @@ inline void expect_in_child(const char* what, const std::function<void()>& actio
     for (int i = 0; i < failures.size(); ++i) fprintf(stderr, "%s\n", failures.GetTestPartResult(i).message());
     return failures.size();
   };
-  EXPECT_EXIT(_exit(run() == 0 ? 0 : 3), ::testing::ExitedWithCode(0), "");
+  EXPECT_EXIT(end(run() == 0 ? 0 : 3), ::testing::ExitedWithCode(0), "");
+}
+
+/// The same in a process that ends as a program does.
+inline void expect_in_program(const std::string& what, const std::function<void()>& action) {
+  expect_in_child(what, action, exit);
 }
 
 class LibraryTest : public ::testing::Test {

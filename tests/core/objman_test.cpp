@@ -1,5 +1,5 @@
-// The object manager: where the control file is searched, look-ups by name and identifier, loading, and the
-// built-in data that stand in.
+// The object manager: where the control file is searched, look-ups by name, identifier and alias, loading, and
+// the built-in data that stand in.
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -19,6 +19,11 @@ class ObjManTest : public LibraryTest {
  protected:
   static LXObject* by_name(int32_t type, const std::string& name, int32_t mode = LX_FIND_AND_LOAD) {
     return LXGetObjFromName(nullptr, type, name.c_str(), static_cast<int32_t>(name.size()), mode, &rc);
+  }
+  /// A directory of one language, with aliases.
+  static void write(const ScratchDirectory& directory, const char* name, const char* aliases) {
+    directory.write("control.nls", control_file({{1, LX_LANGUAGE, name}}));
+    directory.write_text("alias.txt", aliases);
   }
   static LXObject* by_id(int32_t type, uint16_t id, int32_t mode = LX_FIND_AND_LOAD) {
     return LXGetObjFromID(nullptr, type, id, mode, &rc);
@@ -215,6 +220,11 @@ TEST_F(ObjManTest, LoadsThatFail) {
           EXPECT_EQ(entry->section[i], stands_in ? object.built_in->sections.section[i].data : nullptr);
         EXPECT_EQ(by_id(object.type, object.id), stands_in ? entry : nullptr) << "it is loaded, or tried again";
         EXPECT_EQ(rc, stands_in ? LX_OK : damage.code);
+        for (const int32_t flags : {0, int32_t{LX_FALLBACK}}) {
+          LXLocale* locale = LXGetLocale("English_UnitedStates.TINY-SJIS@Default", flags, &rc);
+          EXPECT_EQ(rc, stands_in ? LX_OK : LX_E_NOT_INITIALIZED) << "not that something is not there";
+          LXReleaseLocale(locale);
+        }
         std::filesystem::remove(directory.file(object.file));
         directory.write(object.file, sound);
         EXPECT_EQ(by_id(object.type, object.id), entry) << "mended on disk";
@@ -251,6 +261,37 @@ TEST_F(ObjManTest, ManyThreadsLoadAnObjectOnce) {
   }
 }
 
+// The lines of alias files stand in tests/cases/cli/aliases.txt.
+TEST_F(ObjManTest, Aliases) {
+  write(directory, "English", "UTF-8 utf8\nIBM-850 850 Latin-1\nIBM-437 latin-1 437\n");
+  ASSERT_EQ(init(), LX_OK);
+  EXPECT_STREQ(LXGetCodepageFromAlias(nullptr, "Utf8"), "UTF-8");
+  EXPECT_STREQ(LXGetCodepageFromAlias(nullptr, "437"), "IBM-437");
+  EXPECT_STREQ(LXGetCodepageFromAlias(nullptr, "LATIN-1"), "IBM-850") << "the first in file order";
+  for (const char* unknown : {"", "UTF", "UTF88", "UTF-8", "IBM-850"})
+    EXPECT_EQ(LXGetCodepageFromAlias(nullptr, unknown), nullptr) << unknown;
+  int calls = 0;
+  const auto two = [](void* user, const char*, const char*) { return ++*static_cast<int*>(user) < 2 ? 1 : 0; };
+  EXPECT_EQ(LXEnumAliases(nullptr, two, &calls), LX_OK);
+  EXPECT_EQ(calls, 2);
+}
+
+TEST_F(ObjManTest, EachManagerHasItsOwn) {
+  ScratchDirectory other;
+  write(other, "Other", "B one\n");
+  write(directory, "English", "A one\n");
+  ASSERT_EQ(init(), LX_OK);
+  LXObjManager* own = LXInitObjManager(other.path().c_str(), 0, &rc);
+  EXPECT_EQ(rc, LX_OK);
+  ASSERT_NE(own, nullptr);
+  EXPECT_STREQ(LXGetCodepageFromAlias(own, "ONE"), "B");
+  EXPECT_STREQ(LXGetCodepageFromAlias(nullptr, "ONE"), "A");
+  EXPECT_STREQ(LXGetObjFromID(own, LX_LANGUAGE, 1, LX_FIND_ONLY, &rc)->disk.name, "Other");
+  EXPECT_STREQ(LXGetObjFromID(nullptr, LX_LANGUAGE, 1, LX_FIND_ONLY, &rc)->disk.name, "English");
+  EXPECT_EQ(LXTermObjManager(own), LX_OK);
+  EXPECT_EQ(LXTermObjManager(nullptr), LX_E_INVALID);
+}
+
 TEST_F(ObjManTest, FileAndDirectoryNames) {
   char buffer[32];
   EXPECT_EQ(LXGetControlFileName("/d", buffer, 15), buffer);
@@ -270,7 +311,7 @@ TEST_F(ObjManTest, FileAndDirectoryNames) {
   strcpy(buffer, "#");
   EXPECT_EQ(LXGetDataLocation(buffer, sizeof(buffer), 0), -1);
   setenv("LX_LOCALEDIR", "/some/where", 1);
-  EXPECT_EQ(LXGetDataLocation(buffer, 11, 0), 0);
+  for (const int32_t size : {-1, 11}) EXPECT_EQ(LXGetDataLocation(buffer, size, 0), 0);
   EXPECT_EQ(LXGetDataLocation(buffer, 16, 1), 0);
   EXPECT_EQ(buffer[0], '#');
   EXPECT_EQ(LXGetDataLocation(buffer, 12, 0), 12);

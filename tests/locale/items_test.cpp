@@ -1,4 +1,4 @@
-// Locale items: which are texts and which are numbers, texts that the codepage has not and the longest ones.
+// Locale items: which are texts and which are numbers, and texts that the codepage has not.
 // What may be set to what, in every form and size, stands in tests/cases/items.txt.
 #include <set>
 
@@ -8,21 +8,7 @@
 namespace lx::test {
 namespace {
 
-class ItemTest : public LibraryTest {
- protected:
-  /// A locale of a tiny codepage, which the caller releases.
-  LXLocale* open(const TinyCodepage& codepage) {
-    write_tiny_directory(directory);
-    EXPECT_EQ(init(), LX_OK);
-    return LXGetLocale(("English_UnitedStates." + codepage.file.name).c_str(), 0, nullptr);
-  }
-  template <class F>
-  static Units text_in(const F& form, LXLocale* locale, int32_t number, int32_t flags) {
-    return decode(form, locale, made<typename F::Unit>([&](auto* to, int32_t size) {
-                    return form.get_item(locale, number, to, size, flags) - 1;
-                  }));
-  }
-};
+class ItemTest : public LibraryTest {};
 
 // An item is a text or a number, and the other functions refuse it.
 TEST_F(ItemTest, EachIsATextOrANumber) {
@@ -45,33 +31,24 @@ TEST_F(ItemTest, EachIsATextOrANumber) {
   }
 }
 
-/// Beyond what the codepage has, the U form keeps the caller's text, and the others have the substitution.
+// Beyond what the codepage has, the U form keeps the caller's text, and the others have the substitution.
 TEST_F(ItemTest, TextsThatTheCodepageHasNot) {
-  LXLocale* locale = open(tiny_single());
+  write_tiny_directory(directory);
+  ASSERT_EQ(init(), LX_OK);
+  LXLocale* locale = LXGetLocale("English_UnitedStates.TINY-SINGLE", 0, nullptr);
   const Units any{'A', 0x3041, 0x20AC, 0x4E9C, 0xE0};
   ASSERT_EQ(LXSetLocaleTextInfoU(locale, 64, any.data(), count_of(any), 0), 1);
   EXPECT_EQ(item(locale, 64), any);
-  const Units whole{'A', '?', 0x20AC, '?', 0xE0};
-  EXPECT_EQ(text_in(kPlain, locale, 64, 0), whole);
-  EXPECT_EQ(text_in(kWide, locale, 64, 0), whole);
+  char bytes[9];
+  LXWChar codes[9];
+  EXPECT_EQ(LXGetLocaleTextInfo(locale, 64, bytes, 9, 0), 6);
+  EXPECT_STREQ(bytes, "A?\xA4?\xE0");
+  EXPECT_EQ(LXGetLocaleTextInfoW(locale, 64, codes, 9, 0), 6);
+  EXPECT_EQ(Text<LXWChar>(codes), (Text<LXWChar>{'A', '?', 0xA4, '?', 0xE0}));
   ASSERT_EQ(LXSetLocaleNumInfo(locale, 5, kElsewhereId), 1);
   EXPECT_EQ(item(locale, 64), any) << "what was set stays";
-  EXPECT_EQ(LXReleaseLocale(locale), 0);
-}
-
-TEST_F(ItemTest, LongestTextAndTrace) {
-  LXLocale* locale = open(tiny_utf8());
-  // Longer than every text before, and than the work buffer.
-  const Units longest(263, 0x3042), longer(264, 0x3042);
-  EXPECT_EQ(LXSetLocaleTextInfoU(locale, 81, longest.data(), 263, 0), 1);
-  EXPECT_EQ(strlen(locale->texts[7]), 3u * 263);
-  for (int32_t length : {264, -1}) {
-    EXPECT_EQ(LXSetLocaleTextInfoU(locale, 81, longer.c_str(), length, 0), 0);
-    EXPECT_EQ(LXGetError(locale), LX_E_NOT_FOUND);
-  }
-  EXPECT_EQ(item(locale, 81), longest);
-  const auto traced = messages(RAS1_LEVEL_INPUT, [&] { LXSetLocaleTextInfo(locale, 64, "EUR!", 3, 0); });
-  EXPECT_EQ(traced, std::vector<std::string>{"type = 64, buffer size = 3, data = EUR"});
+  EXPECT_EQ(messages(RAS1_LEVEL_INPUT, [&] { LXSetLocaleTextInfo(locale, 64, "EUR!", 3, 0); }),
+            std::vector<std::string>{"type = 64, buffer size = 3, data = EUR"});
   EXPECT_EQ(LXReleaseLocale(locale), 0);
 }
 

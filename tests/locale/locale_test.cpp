@@ -75,36 +75,6 @@ TEST_F(LocaleTest, Names) {
   for (const LXWChar* wide : {name, marks}) EXPECT_EQ(LXSetLocaleW(wide, 0), LX_E_NO_LANGUAGE);
 }
 
-// A default that exists only as an object of another type, next to the empty range, is not found.
-TEST_F(LocaleTest, AnObjectOfAnotherTypeIsNotFound) {
-  directory.write("la_00007.nls", object_file({language(7, 367, 0)}));
-  directory.write("control.nls", control_file({{7, LX_LANGUAGE, "English"}, {367, LX_CODEPAGE, "US-ASCII"}}));
-  ASSERT_EQ(init(), LX_OK);
-  EXPECT_EQ(LXSetLocale("English", LX_FALLBACK), LX_E_NO_TERRITORY);
-}
-
-// Of an object that cannot be loaded: built-in data are no failure, and another code than 37 is given as 11.
-TEST_F(LocaleTest, OtherCodesOfLookUps) {
-  write_directory();
-  for (const char* file : {"te_00250.nls", "cp_00850.nls", "so_00005.nls"}) {
-    const ByteString content = directory.read(file);
-    directory.write(file, {});
-    for (uint32_t options : {0u, LX_NO_DEFAULTS})
-      for (int32_t flags : {0, int32_t{LX_FALLBACK}}) {
-        SCOPED_TRACE(file + std::to_string(options));
-        ASSERT_EQ(init(directory.path().c_str(), options), LX_OK);
-        int32_t rc = -1;
-        LXLocale* locale = LXGetLocale("French_France.Tiny@Default", flags, &rc);
-        const bool created = file[0] != 's' && options == 0;
-        EXPECT_EQ(locale != nullptr, created);
-        EXPECT_EQ(rc, created ? LX_OK : LX_E_NOT_INITIALIZED);
-        LXReleaseLocale(locale);
-        EXPECT_EQ(LXTerm(), LX_OK);
-      }
-    directory.write(file, content);
-  }
-}
-
 // The 16-bit name goes through the common codepage; where there is none, the name is empty.
 TEST_F(LocaleTest, UnicodeNamesNeedTheCommonCodepage) {
   directory.write_locale({{850, "Tiny", tiny_shift_jis().file.sections}},
