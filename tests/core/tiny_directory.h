@@ -3,8 +3,7 @@
 #pragma once
 
 #include "core/library_fixture.h"
-#include "support/sort_builder.h"
-#include "support/tiny_codepages.h"
+#include "support/case_library.h"
 
 namespace lx::test {
 
@@ -16,14 +15,8 @@ inline void write_tiny_directory(const ScratchDirectory& directory) {
   ByteString elsewhere = payload_of(kBuiltInTerritory);
   const uint8_t* const currency = elsewhere.data() + 2 * (format::territory::kInternationalCurrency - 1);
   put_le16(elsewhere.data() + le16(currency), 0x3041);
-  SortBuilder sort;
-  for (LXUChar u = 'a'; u <= 'z'; ++u) {
-    sort.characters[u].weights = {u, 1, 1, 0};
-    sort.characters[static_cast<LXUChar>(u - 'a' + 'A')].weights = {u, 1, 2, 0};
-  }
-  sort.characters['z'].char_class = 7;  // not appended: comparison needs room for its levels
   directory.write_locale(files, {{{kElsewhereId, LX_TERRITORY, "Elsewhere"}, elsewhere},
-                                 {{kSortId, LX_SORT, "Default"}, sort.payload()}});
+                                 {{kSortId, LX_SORT, "Default"}, example_sort().payload()}});
   directory.write_text("alias.txt", "TINY-UTF8 one two\nOld three\n");
 }
 

@@ -10,8 +10,6 @@
 #include "nls1/failing_init.h"
 #include "support/case_rows.h"
 
-int32_t lx::test::init_failure;
-
 extern "C" {
 int32_t __real_LXInit(const char*, LXAllocHook, LXFreeHook, void*, uint32_t);
 int32_t __wrap_LXInit(const char* directory, LXAllocHook allocate, LXFreeHook release, void* context,
@@ -77,7 +75,7 @@ class Nls1Test : public LibraryTest {
 TEST_F(Nls1Test, EightThreads) {
   write_directory();
   setenv("LC_ALL", "C.UTF-8", 1);
-  expect_in_program("threads", [] {
+  expect_in_child("threads", exit, [] {
     std::atomic<int> ready{0}, changed{0};
     std::vector<std::thread> threads;
     const auto meet = [](std::atomic<int>& arrived) {
@@ -109,7 +107,7 @@ TEST_F(Nls1Test, EightThreads) {
 
 TEST_F(Nls1Test, ThreadsReleaseTheirLocales) {
   write_directory();
-  expect_in_child("blocks", [this] {
+  expect_in_child("blocks", _exit, [this] {
     // The program's own initialisation comes first, so the blocks are its hooks'.
     ASSERT_EQ(init(), LX_OK);
     EXPECT_EQ(thread_name(), kEnglish);
@@ -130,7 +128,7 @@ TEST_F(Nls1Test, ThreadsReleaseTheirLocales) {
 }
 
 TEST_F(Nls1Test, WithoutALibrary) {
-  expect_in_program("initialisation fails", [] {
+  expect_in_child("initialisation fails", exit, [] {
     atexit([] {
       if (LXTerm() != LX_OK) _exit(4);
     });
@@ -145,7 +143,7 @@ TEST_F(Nls1Test, WithoutALibrary) {
     expect_refusals();
   });
   write_directory();
-  expect_in_program("after the end of the process", [] {
+  expect_in_child("after the end of the process", exit, [] {
     // Registered before the library's, so it runs after them.
     atexit([] {
       expect_refusals();
@@ -159,7 +157,7 @@ TEST_F(Nls1Test, WithoutALibrary) {
 
 TEST_F(Nls1Test, LocalesFromIdentifiers) {
   write_directory();
-  expect_in_program("creation", [] {
+  expect_in_child("creation", exit, [] {
     for (const CaseRow& row : case_rows("nls1/locale_identifiers.txt")) {
       SCOPED_TRACE(row.where);
       const int32_t both = NLS1_LANGUAGE_TERRITORY(row.number(0), row.number(1));
@@ -190,7 +188,7 @@ TEST_F(Nls1Test, LocalesFromIdentifiers) {
 
 TEST_F(Nls1Test, NativeLocales) {
   write_directory();
-  expect_in_program("native", [] {
+  expect_in_child("native", exit, [] {
     int32_t rc = -1;
     LXLocale* locale = NLS1_ConvertNativeLocale("ja_JP.eucJP", 0, &rc);
     EXPECT_EQ(rc, LX_OK);
@@ -234,7 +232,7 @@ TEST_F(Nls1Test, NativeLocales) {
 
 TEST_F(Nls1Test, ObjectsByNameAndIdentifier) {
   write_directory();
-  expect_in_program("objects", [] {
+  expect_in_child("objects", exit, [] {
     const struct {
       const char* type;
       int32_t (*id_of)(const char*, int32_t*);
@@ -267,7 +265,7 @@ TEST_F(Nls1Test, ObjectsByNameAndIdentifier) {
   // The search by identifier looks at the entry beside types that have none: another type is not found.
   directory.write("la_00840.nls", directory.read("la_00001.nls"));
   directory.write("control.nls", control_file({{840, LX_LANGUAGE, "English"}, {5, LX_CODEPAGE, "Five"}}));
-  expect_in_program("another type", [] {
+  expect_in_child("another type", exit, [] {
     EXPECT_EQ(messages(RAS1_LEVEL_PROCESS, [] { EXPECT_EQ(thread_name(), "null"); }),
               (Strings{"Unable to set global locale, rc = 34", "Unable to set thread locale, rc = 34"}));
     char name[40] = "#";
@@ -277,17 +275,14 @@ TEST_F(Nls1Test, ObjectsByNameAndIdentifier) {
   });
 }
 
-TEST_F(Nls1Test, Environment) {
+TEST_F(Nls1Test, TheUsersLocaleOfTheCoresDirectory) {
   write_directory();
-  expect_in_program("the user's locale", [] {
+  expect_in_child("variables", exit, [this] {
+    unsetenv("NLS1_LOCALEDIR");
+    setenv("LX_LOCALEDIR", directory.path().c_str(), 1);
     setenv("LX_LANG", "Japanese", 1);
     EXPECT_EQ(thread_name(), kJapanese);
     EXPECT_EQ(name_of(nullptr), kJapanese);
-  });
-  expect_in_program("the core's directory", [this] {
-    unsetenv("NLS1_LOCALEDIR");
-    setenv("LX_LOCALEDIR", directory.path().c_str(), 1);
-    EXPECT_EQ(NLS1_GetTerritoryId("Japan", nullptr), 392);
   });
 }
 
