@@ -135,7 +135,6 @@ TEST_F(CatalogTest, ALoadedCatalogIsSearchedFromTheDensePlace) {
   EXPECT_EQ(message(loaded, 1, 2), "b");
   const ByteString with_zero = catalog_file({{1, {{0, "z"}, {1, "a"}, {2, "b"}}}});
   EXPECT_EQ(message(open(with_zero, LX_CATALOG_LOAD), 1, 2), "72");
-  EXPECT_EQ(message(open(with_zero, 0), 1, 2), "b");
   directory.write("catalog", {});
   EXPECT_EQ(message(loaded, 1, 2), "b") << "the file is not read again";
 }

@@ -35,9 +35,7 @@ Call makes(const std::function<LXLocale*(int32_t*)>& make) {
     int32_t rc = -1;
     LXLocale* locale = make(&rc);
     EXPECT_EQ(locale != nullptr, rc == LX_OK);
-    if (locale != nullptr) {
-      EXPECT_EQ(LXReleaseLocale(locale), 0);
-    }
+    EXPECT_EQ(LXReleaseLocale(locale), 0);
     return rc;
   };
 }

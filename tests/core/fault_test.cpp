@@ -6,7 +6,6 @@
 #include <set>
 
 #include "core/library_fixture.h"
-#include "core/lxformat.h"
 #include "support/damage.h"
 #include "support/tiny_codepages.h"
 

@@ -81,8 +81,8 @@ TEST_F(InitTest, SaysForWhatThereIsNoMemory) {
   for (const auto& row : rows) {
     terminate();
     hooks.fail_at(row.allocation);
-    const std::vector<std::string> said = messages(RAS1_LEVEL_ERRORS, [&] { init(); });
-    EXPECT_EQ(said.at(0), "Unable to allocate " + std::to_string(row.bytes) + " bytes for " + row.what);
+    EXPECT_EQ(messages(RAS1_LEVEL_ERRORS, [&] { init(); }).at(0),
+              "Unable to allocate " + std::to_string(row.bytes) + " bytes for " + row.what);
   }
   hooks.fail_at(0);
   EXPECT_STREQ(LXGetCodepageFromAlias(nullptr, "one"), "A");

@@ -3,7 +3,6 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
-#include <algorithm>
 #include <atomic>
 #include <cstring>
 #include <filesystem>
@@ -17,17 +16,11 @@ namespace {
 
 class ObjManTest : public LibraryTest {
  protected:
-  /// A directory of one language, with aliases.
-  static void write(const ScratchDirectory& directory, const char* name, const char* aliases) {
-    directory.write("control.nls", control_file({{1, LX_LANGUAGE, name}}));
-    directory.write_text("alias.txt", aliases);
-  }
   static LXObject* by_id(int32_t type, uint16_t id, int32_t mode = LX_FIND_AND_LOAD) {
     return LXGetObjFromID(nullptr, type, id, mode, &rc);
   }
-  static int32_t rc;
+  static inline int32_t rc;
 };
-int32_t ObjManTest::rc;
 
 std::string name_of(const LXObject* object) {
   return object != nullptr ? object->disk.name : "";
@@ -252,8 +245,10 @@ TEST_F(ObjManTest, ManyThreadsLoadAnObjectOnce) {
 // What alias files hold and how an alias is found stands in tests/cases/cli/aliases.txt.
 TEST_F(ObjManTest, EachManagerHasItsOwn) {
   ScratchDirectory other;
-  write(other, "Other", "B one\n");
-  write(directory, "English", "A one two\n");
+  other.write("control.nls", control_file({{1, LX_LANGUAGE, "Other"}}));
+  other.write_text("alias.txt", "B one\n");
+  directory.write("control.nls", control_file({{1, LX_LANGUAGE, "English"}}));
+  directory.write_text("alias.txt", "A one two\n");
   ASSERT_EQ(init(), LX_OK);
   LXObjManager* own = LXInitObjManager(other.path().c_str(), 0, &rc);
   EXPECT_EQ(rc, LX_OK);
@@ -284,8 +279,7 @@ TEST_F(ObjManTest, FileAndDirectoryNames) {
   ::testing::internal::CaptureStderr();
   EXPECT_EQ(LXGetDataFileName("/d", LX_SORT, 1, buffer, 15), nullptr);
   EXPECT_EQ(::testing::internal::GetCapturedStderr(), "Buffer provided = 15, needed = 16\n");
-  EXPECT_EQ(LXGetDataFileName("/d", 4, 1, buffer, sizeof(buffer)), nullptr);
-  EXPECT_EQ(LXGetDataFileName("/d", -1, 1, buffer, sizeof(buffer)), nullptr);
+  for (const int32_t type : {4, -1}) EXPECT_EQ(LXGetDataFileName("/d", type, 1, buffer, 32), nullptr);
   strcpy(buffer, "#");
   EXPECT_EQ(LXGetDataLocation(buffer, sizeof(buffer), 0), -1);
   setenv("LX_LOCALEDIR", "/some/where", 1);

@@ -116,9 +116,9 @@ TEST_F(NativeTest, UserLocale) {
   EXPECT_EQ(user(), "Italian_Italy.Latin1@Default");
   EXPECT_EQ(system.set, (Strings{"", std::string(1023, 'x')}));
   system.current = std::string(1024, 'x');
-  const Strings traced = messages(RAS1_LEVEL_ERRORS, [&] { EXPECT_EQ(user(), "failed"); });
-  EXPECT_EQ(traced, Strings{"Unable to save current locale to restore. len 1024 > 1024 '" +
-                            std::string(1024, 'x') + "'"});
+  EXPECT_EQ(
+      messages(RAS1_LEVEL_ERRORS, [&] { EXPECT_EQ(user(), "failed"); }),
+      Strings{"Unable to save current locale to restore. len 1024 > 1024 '" + std::string(1024, 'x') + "'"});
   EXPECT_EQ(LXSetLocale(nullptr, LX_USER_LOCALE), LX_E_NO_NATIVE);
   EXPECT_EQ(system.set, Strings{}) << "the system's locale is left alone";
 
@@ -165,10 +165,8 @@ TEST_F(NativeTest, UserLocaleAndConvertedNamesHaveTheConventions) {
   int32_t rc = -1;
   EXPECT_EQ(LXGetLocale(nullptr, LX_USER_LOCALE, &rc), nullptr);
   EXPECT_EQ(rc, LX_E_NO_LANGUAGE) << "no German here";
-  const auto user = [&] { return LXGetLocale(nullptr, LX_USER_LOCALE | LX_FALLBACK, &rc); };
-  const auto convert = [&] { return LXConvertNativeLocale("de_DE", LX_FALLBACK | 0x1, &rc); };
-  for (const std::function<LXLocale*()>& create : {std::function<LXLocale*()>(user), {convert}}) {
-    LXLocale* locale = create();
+  for (LXLocale* locale : {LXGetLocale(nullptr, LX_USER_LOCALE | LX_FALLBACK, &rc),
+                           LXConvertNativeLocale("de_DE", LX_FALLBACK | LX_TERRITORY_VALUES, &rc)}) {
     ASSERT_NE(locale, nullptr);
     EXPECT_EQ(item(locale, 88), "English_UnitedStates.Latin1@Binary");
     EXPECT_EQ(item(locale, 62) + item(locale, 59), "3;3;0,");

@@ -4,7 +4,6 @@
 #include <random>
 
 #include "core/library_fixture.h"
-#include "core/lxformat.h"
 #include "nls1.h"
 #include "support/case_rows.h"
 #include "support/tiny_codepages.h"
