@@ -22,10 +22,6 @@ class ObjManTest : public LibraryTest {
   static inline int32_t rc;
 };
 
-std::string name_of(const LXObject* object) {
-  return object != nullptr ? object->disk.name : "";
-}
-
 // A control file that opens ends the search, whatever it holds.
 TEST_F(ObjManTest, SearchOrder) {
   if (access(kDefaultControl, F_OK) == 0) GTEST_SKIP();
@@ -72,7 +68,7 @@ TEST_F(ObjManTest, SearchOrder) {
     std::vector<std::string> expected;
     for (const std::string& name : c.opened) expected.push_back(name + "/control.nls");
     EXPECT_EQ(paths, expected);
-    EXPECT_EQ(name_of(by_id(LX_LANGUAGE, 1, LX_FIND_ONLY)), c.language);
+    EXPECT_STREQ(by_id(LX_LANGUAGE, 1, LX_FIND_ONLY)->disk.name, c.language);
     LXObjManager* own = nullptr;
     std::string said;
     for (const auto& text : messages(RAS1_LEVEL_ERRORS, [&] { own = LXInitObjManager(path, 0, &rc); }))

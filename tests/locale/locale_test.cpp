@@ -14,7 +14,7 @@ class LocaleTest : public LibraryTest {
  protected:
   // English, French, and three whose defaults are not there, although objects of other types stand where they
   // would be.
-  void write_directory() {
+  void init_directory() {
     directory.write_locale({{367, "US-ASCII", ascii_codepage()},
                             {850, "Tiny", tiny_shift_jis().file.sections},
                             {930, "Shift", tiny_shift().file.sections}},
@@ -24,9 +24,6 @@ class LocaleTest : public LibraryTest {
                             {{5, LX_LANGUAGE, "NoSort"}, language(840, 367, 9999)},
                             {{250, LX_TERRITORY, "France"}, payload_of(kBuiltInTerritory)},
                             {{5, LX_SORT, "Default"}, SortBuilder{}.payload()}});
-  }
-  void init_directory() {
-    write_directory();
     ASSERT_EQ(init(), LX_OK);
   }
 

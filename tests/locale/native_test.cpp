@@ -134,12 +134,14 @@ TEST_F(NativeTest, UserLocale) {
 }
 
 TEST_F(NativeTest, ConventionsOfTheSystem) {
-  system.known["de_DE"] = system.known["xx_YY"] = german;
+  system.known["de_DE"] = system.known["xx_YY"] = system.known["de_AT"] = german;
+  system.known["de_AT"].mon_decimal_point = apostrophe;
   const struct {
     const char *codepage, *native, *conventions;
   } rows[] = {
       // A text of two bytes is no separator.
       {"Latin1", "de_DE", "234100132 3;3;0 2;3;0 , . . ' \xA4  ~"},
+      {"Latin1", "de_AT", "234100132 3;3;0 2;3;0 , . ' ' \xA4  ~"},
       // Of another codepage, or of no known one: numbers and groupings only.
       {"US-ASCII", "de_DE", "234100132 3;3;0 2;3;0 . , . , $  -"},
       {"Latin1", "xx_YY", "234100132 3;3;0 2;3;0 . , . , $  -"},
