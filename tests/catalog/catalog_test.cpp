@@ -1,14 +1,86 @@
-// Catalogs that are as they should be: every message in both modes, in every codepage, form and size, and where
-// a catalog is looked for.
+// Catalogs: every message in both modes, in every codepage, form and size; where a catalog is looked for; and
+// damaged ones, every truncation and changed byte: 71 or a safe result, no memory that the file does not justify,
+// nothing left behind.
 #include <algorithm>
 #include <random>
 
-#include "catalog/catalog_fixture.h"
-#include "core/lxformat.h"
+#include "core/library_fixture.h"
+#include "support/catalog_builder.h"
+#include "support/damage.h"
 #include "support/encoded_text.h"
 
 namespace lx::test {
 namespace {
+
+namespace fmt = format::catalog;
+
+constexpr size_t kSecondSet = fmt::kHeaderBytes + fmt::kSetBytes;
+constexpr size_t kIndex = fmt::kHeaderBytes + 2 * fmt::kSetBytes;  // of the first set
+constexpr size_t kMostForOpening = 6000;                           // the search list and its path
+
+ByteString small_catalog() {
+  return catalog_file({{1, {{1, "one"}, {2, "two"}}}, {3, {{4, "four"}}}}, "English.TINY-SJIS");
+}
+
+struct CatalogCloser {
+  void operator()(LXCatalog* catalog) const { EXPECT_EQ(LXCloseCatalog(catalog), LX_OK); }
+};
+using CatalogPtr = std::unique_ptr<LXCatalog, CatalogCloser>;
+
+constexpr uint32_t kModes[] = {0, LX_CATALOG_LOAD};
+
+class CatalogTest : public LibraryTest {
+ protected:
+  void SetUp() override {
+    unsetenv("LX_NLSPATH");
+    // What catalogs need of the locale directory is loaded before files and memory are looked at.
+    library.locale(tiny_shift_jis());
+    LXReleaseLocale(LXGetLocale("", LX_FALLBACK, nullptr));
+  }
+  void TearDown() override { EXPECT_TRUE(library.close()); }
+
+  LXLocale* single() { return library.locale(tiny_single()); }
+
+  /// Opens the catalog that was written last, or writes one.
+  CatalogPtr open(uint32_t flags) {
+    return CatalogPtr(LXOpenCatalog(single(), nullptr, directory.file("catalog").c_str(), flags));
+  }
+  CatalogPtr open(const ByteString& file, uint32_t flags) {
+    directory.write("catalog", file);
+    return open(flags);
+  }
+
+  /// Opens in both modes and asks for everything: each answer has one of the codes and is terminated.
+  void use(const ByteString& file) {
+    directory.write("catalog", file);
+    library.hooks().fail_at(0);
+    for (uint32_t mode : kModes) {
+      const CatalogPtr catalog = open(mode);
+      if (catalog == nullptr) {
+        EXPECT_EQ(LXGetError(single()), LX_E_CATALOG);
+        continue;
+      }
+      for (uint32_t set : {0, 1, 3, 4})
+        for (uint32_t number : {0, 1, 2, 4}) {
+          std::string text(40, 'x');
+          const int32_t code = LXGetMessage(catalog.get(), set, number, text.data(), 40, nullptr);
+          EXPECT_TRUE(code == LX_OK || code == LX_E_CATALOG || code == LX_E_MESSAGE) << code;
+          EXPECT_NE(text.find('\0'), std::string::npos);
+        }
+    }
+    EXPECT_LT(library.hooks().largest(), kMostForOpening);
+  }
+
+  /// The message, or its code as a number.
+  static std::string message(const CatalogPtr& catalog, uint32_t set, uint32_t number,
+                             const char* default_text = nullptr) {
+    char text[300] = "";
+    const int32_t code = LXGetMessage(catalog.get(), set, number, text, sizeof(text), default_text);
+    return code == LX_OK ? text : std::to_string(code);
+  }
+
+  TinyLibrary library;
+};
 
 using Numbers = std::vector<uint32_t>;
 
@@ -56,7 +128,6 @@ TEST_F(CatalogTest, BothModesFindWhatIsThereAndNothingElse) {
 // A loaded catalog is searched from where a number stands when all numbers from 1 on are there: found at once
 // there, whatever stands elsewhere, and not found behind a number 0.
 TEST_F(CatalogTest, ALoadedCatalogIsSearchedFromTheDensePlace) {
-  namespace fmt = format::catalog;
   ByteString others = catalog_file({{1, {{1, "a"}, {2, "b"}, {3, "c"}}}});
   const size_t index = fmt::kHeaderBytes + fmt::kSetBytes;
   for (size_t entry : {0, 2}) fmt::put_word(&others[index + entry * fmt::kEntryBytes + fmt::kEntryNumber], 9);
@@ -64,18 +135,19 @@ TEST_F(CatalogTest, ALoadedCatalogIsSearchedFromTheDensePlace) {
   EXPECT_EQ(message(loaded, 1, 2), "b");
   const ByteString with_zero = catalog_file({{1, {{0, "z"}, {1, "a"}, {2, "b"}}}});
   EXPECT_EQ(message(open(with_zero, LX_CATALOG_LOAD), 1, 2), "72");
-  EXPECT_EQ(message(open(with_zero, 0), 1, 2), "b");
   directory.write("catalog", {});
   EXPECT_EQ(message(loaded, 1, 2), "b") << "the file is not read again";
 }
 
-/// What a function wrote to a buffer of exactly this size; a sanitizer sees a write behind it.
+/// What a function wrote to a buffer of this size. Nothing is written behind it.
 template <class Unit, class Fetch>
 Text<Unit> written(size_t size, Fetch fetch) {
-  std::vector<Unit> buffer(size, Unit{'x'});
+  constexpr Unit kCanary{'x'};
+  std::vector<Unit> buffer(size + 4, kCanary);
   EXPECT_EQ(fetch(buffer.data(), static_cast<int32_t>(size)), LX_OK);
-  const auto end = std::find(buffer.begin(), buffer.end(), Unit{0});
-  EXPECT_NE(end, buffer.end()) << "not terminated";
+  EXPECT_EQ(std::count(buffer.end() - 4, buffer.end(), kCanary), 4);
+  const auto end = std::find(buffer.begin(), buffer.end() - 4, Unit{0});
+  EXPECT_NE(end, buffer.end() - 4) << "not terminated";
   return {buffer.begin(), end};
 }
 
@@ -124,16 +196,12 @@ TEST_F(CatalogTest, ArgumentsAndCodes) {
   directory.write("catalog", catalog_file({{1, {{1, "text"}}}}));
   const std::string path = directory.file("catalog");
   LXLocale* locale = single();
-  for (const std::string& name : {path, std::string()}) {
-    const Units units_of_name = units(name);
-    const Text<LXWChar> codes(name.begin(), name.end());
-    const CatalogPtr catalogs[] = {CatalogPtr(LXOpenCatalog(locale, "", name.c_str(), 0)),
-                                   CatalogPtr(LXOpenCatalogW(locale, nullptr, codes.c_str(), 0)),
-                                   CatalogPtr(LXOpenCatalogU(locale, nullptr, units_of_name.c_str(), 0))};
-    EXPECT_EQ(LXGetError(locale), name.empty() ? LX_E_INVALID : LX_OK);
-    for (const CatalogPtr& catalog : catalogs) EXPECT_EQ(message(catalog, 1, 1), name.empty() ? "70" : "text");
-  }
-  EXPECT_EQ(LXOpenCatalog(locale, nullptr, path.c_str(), 0x80000063u), nullptr) << "undefined flags";
+  const Text<LXWChar> codes(path.begin(), path.end());
+  for (LXCatalog* opened :
+       {LXOpenCatalog(locale, "", path.c_str(), 0), LXOpenCatalogW(locale, nullptr, codes.c_str(), 0),
+        LXOpenCatalogU(locale, nullptr, units(path).c_str(), 0)})
+    EXPECT_EQ(message(CatalogPtr(opened), 1, 1), "text");
+  EXPECT_EQ(message(nullptr, 1, 1), "70");
   const CatalogPtr catalog = open(0);
   for (int32_t size : {0, 4}) {
     char text[4] = "abc";
@@ -189,6 +257,93 @@ TEST_F(CatalogTest, MemoryHelpers) {
   LXMcSetZero(larger + 2, 6);
   EXPECT_EQ(std::string(larger, 8), std::string("ab\0\0\0\0\0\0", 8));
   EXPECT_EQ(LXMcFree(LXMcRealloc(larger, 8, 1)), 1);
+}
+
+TEST_F(CatalogTest, TruncatedAndChangedFiles) {
+  for_each_damage(small_catalog(), [&](const ByteString& file) { use(file); });
+}
+
+// What a wrong integer does: "open" that a loaded catalog is refused, else the first and the last message. A
+// catalog that is not loaded can always be opened.
+TEST_F(CatalogTest, WrongIntegers) {
+  const uint32_t end = static_cast<uint32_t>(small_catalog().size());
+  struct Case {
+    size_t offset;
+    uint32_t value;
+    const char* loaded;
+    const char* in_file;
+  };
+  const Case cases[] = {
+      {fmt::kHeaderMagic, 0x476CF462, "open", "71 71"},
+      {fmt::kHeaderVersion, 0x20000000, "open", "71 71"},
+      {fmt::kHeaderByteOrder, 3 - LXMcGetByteOrder(), "open", "71 71"},
+      {fmt::kHeaderSets, 0, "open", "71 71"},
+      {fmt::kHeaderSets, 1, "one 72", "one 72"},
+      {fmt::kHeaderSets, 3, "open", "one four"},
+      {fmt::kHeaderSets, 0xFFFFFFFF, "open", "71 71"},
+      {fmt::kHeaderFirstSet, end - 27, "open", "71 71"},
+      {fmt::kHeaderFirstSet, 0xFFFFFFFF, "open", "71 71"},
+      {fmt::kHeaderLocale, 0x58585858, "open", "71 71"},                           // no such locale
+      {fmt::kHeaderBytes + fmt::kSetNext, fmt::kHeaderBytes, "one 72", "one 72"},  // a loop
+      {fmt::kHeaderBytes + fmt::kSetNext, 0x80000000, "open", "one 71"},
+      {fmt::kHeaderBytes + fmt::kSetMessages, 0, "72 four", "72 four"},
+      {fmt::kHeaderBytes + fmt::kSetMessages, 0xFFFFFFFF, "open", "one four"},
+      {fmt::kHeaderBytes + fmt::kSetIndex, end, "open", "71 four"},
+      {fmt::kHeaderBytes + fmt::kSetIndex, 0xFFFFFFFC, "open", "71 four"},
+      {kSecondSet + fmt::kSetTexts, end - 4, "open", "one 71"},
+      {kSecondSet + fmt::kSetTextBytes, 0xFFFFFFFF, "open", "one 71"},
+      {kSecondSet + fmt::kSetUnread, 0xFFFFFFFF, "one four", "one four"},
+      {kIndex + fmt::kEntryTextBytes, 0xFFFFFFFF, "71 four", "71 four"},
+      {kIndex + fmt::kEntryTextBytes, 2, "on four", "on four"},  // a text without its null
+      {kIndex + fmt::kEntryTextBytes, 0, " four", " four"},
+      {kIndex + fmt::kEntryTextBytes, 8, "one four", "one four"},
+      {kIndex + fmt::kEntryText, 5, "71 four", "71 four"},
+      {kIndex + fmt::kEntryText, 0xFFFFFFFF, "71 four", "71 four"},
+  };
+  for (const Case& c : cases) {
+    SCOPED_TRACE(std::to_string(c.offset) + " " + std::to_string(c.value));
+    ByteString file = small_catalog();
+    fmt::put_word(&file[c.offset], c.value);
+    use(file);
+    for (uint32_t mode : kModes) {
+      const CatalogPtr catalog = open(mode);
+      const std::string opened = mode == 0 ? c.in_file : c.loaded;
+      ASSERT_EQ(catalog == nullptr, opened == "open");
+      if (catalog != nullptr) {
+        EXPECT_EQ(message(catalog, 1, 1) + " " + message(catalog, 3, 4), opened);
+      }
+    }
+  }
+  // No default text stands in for a damaged catalog, nor for one of the other byte order.
+  ByteString other = small_catalog();
+  for (size_t at = 0; at < fmt::kHeaderLocale; at += 4) std::reverse(&other[at], &other[at + 4]);
+  EXPECT_EQ(message(open(other, 0), 1, 1, "default"), "71");
+  ByteString no_null = small_catalog();
+  std::fill_n(no_null.begin() + fmt::kHeaderLocale, fmt::kHeaderLocaleBytes, 'E');
+  EXPECT_EQ(message(open(no_null, 0), 1, 1), "71");
+  // The first index entry must be in the file, even of a set without messages.
+  ByteString behind = catalog_file({});
+  fmt::put_word(&behind[fmt::kHeaderBytes + fmt::kSetIndex], static_cast<uint32_t>(behind.size()));
+  EXPECT_EQ(message(open(behind, 0), 1, 1), "72");
+  EXPECT_EQ(open(LX_CATALOG_LOAD), nullptr);
+}
+
+// In a file with room for thousands of sets a chain that ends early ends there, and one that loops ends too.
+TEST_F(CatalogTest, TheChainEndsAtTheLatestWithTheCountOfSets) {
+  ByteString file = small_catalog();
+  file.resize(3000 * fmt::kSetBytes);
+  fmt::put_word(&file[fmt::kHeaderSets], 2990);
+  EXPECT_EQ(message(open(file, 0), 9, 1), "72");
+  EXPECT_EQ(open(LX_CATALOG_LOAD), nullptr);
+  fmt::put_word(&file[kSecondSet + fmt::kSetNext], fmt::kHeaderBytes);
+  for (uint32_t mode : kModes) EXPECT_EQ(message(open(file, mode), 9, 1), "72");
+}
+
+TEST_F(CatalogTest, FailingFreesAreNotReported) {
+  library.hooks().fail_frees(true);
+  for (uint32_t mode : kModes) EXPECT_EQ(message(open(small_catalog(), mode), 3, 4), "four");
+  EXPECT_EQ(LXGetError(single()), LX_OK);
+  library.hooks().fail_frees(false);
 }
 
 }  // namespace

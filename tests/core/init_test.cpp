@@ -2,6 +2,7 @@
 #include <climits>
 
 #include "core/library_fixture.h"
+#include "core/lxalias.h"
 
 namespace lx::test {
 namespace {
@@ -9,7 +10,8 @@ namespace {
 class InitTest : public LibraryTest {};
 
 TEST_F(InitTest, CountsUsesAndEndsWithTheLast) {
-  ASSERT_EQ(init_with_locale(), LX_OK);
+  directory.write_locale({{367, "US-ASCII", ascii_codepage()}});
+  ASSERT_EQ(init(), LX_OK);
   Hooks other_hooks;
   ScratchDirectory other_directory;
   EXPECT_EQ(
@@ -32,12 +34,9 @@ TEST_F(InitTest, WorksOnTheBuiltInObjects) {
   for (uint32_t options : {0u, 0x80000000u, 0x00000001u, 0x80000003u}) {
     EXPECT_EQ(init(directory.path().c_str(), options), LX_W_DEFAULTS);
     EXPECT_EQ(init(), LX_OK) << "a further use is no warning";
-    for (const char* name : {"", "English_UnitedStates.US-ASCII@BINARY"}) {
-      LXLocale* locale = LXGetLocale(name, 0, nullptr);
-      ASSERT_NE(locale, nullptr) << name;
-      EXPECT_EQ(LXNumChars(locale, "text", -1), 4);
-      EXPECT_EQ(LXReleaseLocale(locale), 0);
-    }
+    LXLocale* locale = LXGetLocale("English_UnitedStates.US-ASCII@BINARY", 0, nullptr);
+    EXPECT_EQ(LXNumChars(locale, "text", -1), 4);
+    EXPECT_EQ(LXReleaseLocale(locale), 0);
     terminate();
   }
   EXPECT_EQ(init(directory.path().c_str(), LX_NO_DEFAULTS), LX_W_DEFAULTS);
@@ -50,10 +49,11 @@ TEST_F(InitTest, WorksOnTheBuiltInObjects) {
 
 // The area of a failed call serves a further try, unless that has other hooks.
 TEST_F(InitTest, TriesAgainAfterAFailedCall) {
+  directory.write_locale({{367, "US-ASCII", ascii_codepage()}});
   Hooks other_hooks;
   for (Hooks* next : {&hooks, &other_hooks}) {
     hooks.fail_at(2);
-    EXPECT_EQ(init_with_locale(), LX_E_NOT_INITIALIZED);
+    EXPECT_EQ(init(), LX_E_NOT_INITIALIZED);
     hooks.fail_at(0);
     const std::vector<std::string> said = messages(RAS1_LEVEL_DETAIL, [&] {
       EXPECT_EQ(LXInit(directory.path().c_str(), Hooks::allocate, Hooks::release, next, 0), LX_OK);
@@ -65,19 +65,40 @@ TEST_F(InitTest, TriesAgainAfterAFailedCall) {
   }
 }
 
-int32_t counted_frees;
-int32_t count_free(void* context, void* block) {
-  EXPECT_EQ(context, nullptr);
-  ++counted_frees;
-  free(block);
-  return INT_MIN;  // any non-zero value is success
+// What is said of each block that the beginning of a use needs. Aliases that were read stay.
+TEST_F(InitTest, SaysForWhatThereIsNoMemory) {
+  directory.write_locale({{367, "US-ASCII", ascii_codepage()}});
+  directory.write_text("alias.txt", "A one two three\n");
+  ASSERT_EQ(init(), LX_OK);
+  const size_t calls = hooks.calls();
+  const struct {
+    size_t allocation, bytes;
+    const char* what;
+  } rows[] = {{1, sizeof(GlobalArea), "globals"},
+              {2, sizeof(LXObjManager), "object manager"},
+              {5, 3 * format::kRecordBytes, "control data"},
+              {calls - 1, sizeof(AliasRecord), "codepage A, alias two"}};
+  for (const auto& row : rows) {
+    terminate();
+    hooks.fail_at(row.allocation);
+    EXPECT_EQ(messages(RAS1_LEVEL_ERRORS, [&] { init(); }).at(0),
+              "Unable to allocate " + std::to_string(row.bytes) + " bytes for " + row.what);
+  }
+  hooks.fail_at(0);
+  EXPECT_STREQ(LXGetCodepageFromAlias(nullptr, "one"), "A");
+  EXPECT_EQ(LXGetCodepageFromAlias(nullptr, "two"), nullptr);
 }
 
 TEST_F(InitTest, TakesEitherHookAlone) {
-  counted_frees = 0;
-  EXPECT_EQ(LXInit(directory.path().c_str(), nullptr, count_free, nullptr, 0), LX_W_DEFAULTS);
+  static int32_t frees = 0;
+  const auto release = [](void* context, void* block) {
+    EXPECT_EQ(context, nullptr);
+    ++frees;
+    return free(block), INT_MIN;  // any non-zero value is success
+  };
+  EXPECT_EQ(LXInit(directory.path().c_str(), nullptr, release, nullptr, 0), LX_W_DEFAULTS);
   EXPECT_EQ(LXTerm(), LX_OK);
-  EXPECT_GT(counted_frees, 0);
+  EXPECT_GT(frees, 0);
   const auto allocate = [](void* context, size_t bytes) {
     return context == nullptr ? malloc(bytes) : nullptr;
   };
@@ -88,10 +109,10 @@ TEST_F(InitTest, TakesEitherHookAlone) {
   EXPECT_EQ(LXDefFree(this, block), 1);
 }
 
-// What the last LXTerm returns when the free hook reports failure: 1 from the default locale and from the
-// manager, 21 from an object with a section that was allocated rather than read. Data that was read goes
-// through LXUnloadFile, which does not report.
-TEST_F(InitTest, TermReportsTheFirstFailingRelease) {
+// What is returned when the free hook reports failure. The last LXTerm: 1 from the default locale and from the
+// manager, 21 from an object with a section that was allocated rather than read. Data that was read goes through
+// LXUnloadFile, which does not report; nor does the previous default locale.
+TEST_F(InitTest, FailingFrees) {
   directory.write_locale(
       {{367, "US-ASCII", ascii_codepage()}, {500, "Old", version1_codepage(ascii_codepage()), 1}});
   const struct {
@@ -99,27 +120,28 @@ TEST_F(InitTest, TermReportsTheFirstFailingRelease) {
     bool default_locale;
     int32_t code;
   } cases[] = {{367, false, 1}, {500, false, LX_E_FREE}, {500, true, 1}};
+  const auto transfer = [](void*, char*, int32_t) { return 0; };
   for (const auto& c : cases) {
     SCOPED_TRACE(c.code);
     ASSERT_EQ(init(), LX_OK);
     int32_t rc = -1;
     LXGetObjFromID(nullptr, LX_CODEPAGE, c.codepage, LX_FIND_AND_LOAD, &rc);
     ASSERT_EQ(rc, LX_OK);
+    LXLocale* const locale = LXGetLocale("", 0, nullptr);
+    LXStream* const stream = LXOpenStream(locale, transfer, nullptr, LX_STREAM_READ);
     if (c.default_locale) LXSetLocale("", 0);
+    const LXLocale* const previous = globals.default_locale;
     hooks.fail_frees(true);
+    EXPECT_EQ(LXCloseStream(stream, locale), 0);
+    EXPECT_EQ(LXGetError(locale), LX_E_FREE);
+    EXPECT_EQ(LXReleaseLocale(locale), 1);
+    if (c.default_locale) {
+      EXPECT_EQ(LXSetLocale("", 0), LX_OK);
+      EXPECT_NE(globals.default_locale, previous);
+    }
     EXPECT_EQ(LXTerm(), c.code);
     hooks.fail_frees(false);
   }
-}
-
-TEST_F(InitTest, EnvironmentAccess) {
-  char buffer[16] = "#";
-  EXPECT_EQ(LXGetEnv("LX_LANG", buffer, sizeof(buffer)), 0);
-  setenv("LX_LANG", "abcde", 1);
-  for (int32_t size : {-1, 5}) EXPECT_EQ(LXGetEnv("LX_LANG", buffer, size), 6);
-  EXPECT_STREQ(buffer, "#");
-  EXPECT_EQ(LXGetEnv("LX_LANG", buffer, 6), 6);
-  EXPECT_STREQ(buffer, "abcde");
 }
 
 }  // namespace

@@ -2,11 +2,9 @@
 // environment without the library's variables, and a check at the end that nothing is left behind.
 #pragma once
 
-#include <gtest/gtest-spi.h>
 #include <gtest/gtest.h>
 #include <unistd.h>
 
-#include <cstdio>
 #include <cstdlib>
 #include <functional>
 #include <string>
@@ -23,21 +21,15 @@
 
 namespace lx::test {
 
-/// Runs `action` with its assertions in a process of its own, so that a crash, or the end that a sanitizer
-/// makes, is one failure.
-inline void expect_in_child(const char* what, const std::function<void()>& action) {
+/// Runs `action` with its assertions in a process of its own, which `end` ends, so that a crash, or the end that a
+/// sanitizer makes, is one failure.
+inline void expect_in_child(const std::string& what, void (*end)(int), const std::function<void()>& action) {
   SCOPED_TRACE(what);
   const auto run = [&] {
-    ::testing::TestPartResultArray failures;
-    {
-      ::testing::ScopedFakeTestPartResultReporter reporter(
-          ::testing::ScopedFakeTestPartResultReporter::INTERCEPT_ALL_THREADS, &failures);
-      action();
-    }
-    for (int i = 0; i < failures.size(); ++i) fprintf(stderr, "%s\n", failures.GetTestPartResult(i).message());
-    return failures.size();
+    action();
+    end(::testing::Test::HasFailure() ? 3 : 0);
   };
-  EXPECT_EXIT(_exit(run() == 0 ? 0 : 3), ::testing::ExitedWithCode(0), "");
+  EXPECT_EXIT(run(), ::testing::ExitedWithCode(0), "");
 }
 
 class LibraryTest : public ::testing::Test {
@@ -57,12 +49,6 @@ class LibraryTest : public ::testing::Test {
     return LXInit(path, Hooks::allocate, Hooks::release, &hooks, options);
   }
   int32_t init() { return init(directory.path().c_str()); }
-
-  /// English, UnitedStates and one codepage, the common one.
-  int32_t init_with_locale() {
-    directory.write_locale({{367, "US-ASCII", ascii_codepage()}});
-    return init();
-  }
 
   static void terminate() {
     while (LXTerm() != LX_E_NOT_INITIALIZED) {
@@ -101,14 +87,13 @@ class LibraryTest : public ::testing::Test {
 };
 
 /// The built-in language with other defaults.
-inline ByteString language_file(uint16_t territory, uint16_t codepage, uint16_t sort) {
+inline ByteString language(uint16_t territory, uint16_t codepage, uint16_t sort) {
   namespace words = format::language;
-  const Bytes built_in = kBuiltInLanguage.sections.section[0];
-  ByteString payload(built_in.data, built_in.data + built_in.size);
+  ByteString payload = payload_of(kBuiltInLanguage);
   put_le16(payload.data() + 2 * words::kDefaultTerritory, territory);
   put_le16(payload.data() + 2 * words::kDefaultCodepage, codepage);
   put_le16(payload.data() + 2 * words::kDefaultSort, sort);
-  return object_file({payload});
+  return payload;
 }
 
 inline constexpr char kDefaultControl[] = "/Tessarin/locale/control.nls";

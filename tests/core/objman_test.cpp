@@ -1,9 +1,8 @@
-// The object manager: where the control file is searched, look-ups by name and identifier, loading, and the
-// built-in data that stand in.
+// The object manager: where the control file is searched, look-ups by name, identifier and alias, loading, and
+// the built-in data that stand in.
 #include <sys/stat.h>
 #include <unistd.h>
 
-#include <algorithm>
 #include <atomic>
 #include <cstring>
 #include <filesystem>
@@ -17,19 +16,11 @@ namespace {
 
 class ObjManTest : public LibraryTest {
  protected:
-  static LXObject* by_name(int32_t type, const std::string& name, int32_t mode = LX_FIND_AND_LOAD) {
-    return LXGetObjFromName(nullptr, type, name.c_str(), static_cast<int32_t>(name.size()), mode, &rc);
-  }
   static LXObject* by_id(int32_t type, uint16_t id, int32_t mode = LX_FIND_AND_LOAD) {
     return LXGetObjFromID(nullptr, type, id, mode, &rc);
   }
-  static int32_t rc;
+  static inline int32_t rc;
 };
-int32_t ObjManTest::rc;
-
-std::string name_of(const LXObject* object) {
-  return object != nullptr ? object->disk.name : "";
-}
 
 // A control file that opens ends the search, whatever it holds.
 TEST_F(ObjManTest, SearchOrder) {
@@ -46,20 +37,24 @@ TEST_F(ObjManTest, SearchOrder) {
                     bad = bad_magic.path(), before = before_start.path();
   // A control-file name takes 13 bytes beside the directory, in 256.
   const std::string longest(243, 'x'), too_long(244, 'x'), over_buffer(256, 'x');
+  const std::string not_made = "Unable to construct control file name in directory " + too_long +
+                               "\ncontrol size = 256\n",
+                    not_opened = "Unable to open " + none + "/control.nls, err = 1000\n";
   const struct {
     const char* what;
     const std::string &given, &env;
     int32_t code;
     const char* language;
     std::vector<std::string> opened;  // directories
+    std::string said = "";            // among the errors
   } cases[] = {
       {"the directory given", given, env, LX_OK, "Given", {given}},
       {"none given", unset, env, LX_OK, "Environment", {env}},
       {"the longest name goes on", longest, env, LX_OK, "Environment", {longest, env}},
-      {"a longer one ends the search", too_long, env, LX_E_FILE_IO, "English", {}},
+      {"a longer one ends the search", too_long, env, LX_E_FILE_IO, "English", {}, not_made},
       {"nothing at all", unset, unset, LX_E_FILE_NOT_FOUND, "English", {"/Tessarin/locale"}},
       {"a variable whose control file's name does not fit", unset, too_long, LX_E_FILE_IO, "English", {}},
-      {"a variable that does not fit", none, over_buffer, LX_E_FILE_IO, "English", {none}},
+      {"a variable that does not fit", none, over_buffer, LX_E_FILE_IO, "English", {none}, not_opened},
       {"wrong magic number", bad, env, LX_E_CORRUPT, "English", {bad}},
       {"a table before the start", before, env, LX_E_FILE_IO, "English", {before}},
   };
@@ -73,8 +68,12 @@ TEST_F(ObjManTest, SearchOrder) {
     std::vector<std::string> expected;
     for (const std::string& name : c.opened) expected.push_back(name + "/control.nls");
     EXPECT_EQ(paths, expected);
-    EXPECT_EQ(name_of(by_id(LX_LANGUAGE, 1, LX_FIND_ONLY)), c.language);
-    LXObjManager* own = LXInitObjManager(path, 0, &rc);
+    EXPECT_STREQ(by_id(LX_LANGUAGE, 1, LX_FIND_ONLY)->disk.name, c.language);
+    LXObjManager* own = nullptr;
+    std::string said;
+    for (const auto& text : messages(RAS1_LEVEL_ERRORS, [&] { own = LXInitObjManager(path, 0, &rc); }))
+      said += text + "\n";
+    EXPECT_NE(said.find(c.said), std::string::npos) << said;
     EXPECT_EQ(rc, c.code);
     ASSERT_NE(own, nullptr);
     EXPECT_EQ(LXTermObjManager(own), LX_OK);
@@ -198,6 +197,11 @@ TEST_F(ObjManTest, LoadsThatFail) {
           EXPECT_EQ(entry->section[i], stands_in ? object.built_in->sections.section[i].data : nullptr);
         EXPECT_EQ(by_id(object.type, object.id), stands_in ? entry : nullptr) << "it is loaded, or tried again";
         EXPECT_EQ(rc, stands_in ? LX_OK : damage.code);
+        for (const int32_t flags : {0, int32_t{LX_FALLBACK}}) {
+          LXLocale* locale = LXGetLocale("English_UnitedStates.TINY-SJIS@Default", flags, &rc);
+          EXPECT_EQ(rc, stands_in ? LX_OK : LX_E_NOT_INITIALIZED) << "not that something is not there";
+          LXReleaseLocale(locale);
+        }
         std::filesystem::remove(directory.file(object.file));
         directory.write(object.file, sound);
         EXPECT_EQ(by_id(object.type, object.id), entry) << "mended on disk";
@@ -234,13 +238,35 @@ TEST_F(ObjManTest, ManyThreadsLoadAnObjectOnce) {
   }
 }
 
+// What alias files hold and how an alias is found stands in tests/cases/cli/aliases.txt.
+TEST_F(ObjManTest, EachManagerHasItsOwn) {
+  ScratchDirectory other;
+  other.write("control.nls", control_file({{1, LX_LANGUAGE, "Other"}}));
+  other.write_text("alias.txt", "B one\n");
+  directory.write("control.nls", control_file({{1, LX_LANGUAGE, "English"}}));
+  directory.write_text("alias.txt", "A one two\n");
+  ASSERT_EQ(init(), LX_OK);
+  LXObjManager* own = LXInitObjManager(other.path().c_str(), 0, &rc);
+  EXPECT_EQ(rc, LX_OK);
+  ASSERT_NE(own, nullptr);
+  EXPECT_STREQ(LXGetCodepageFromAlias(own, "ONE"), "B");
+  EXPECT_STREQ(LXGetCodepageFromAlias(nullptr, "ONE"), "A");
+  EXPECT_STREQ(LXGetObjFromID(own, LX_LANGUAGE, 1, LX_FIND_ONLY, &rc)->disk.name, "Other");
+  EXPECT_STREQ(LXGetObjFromID(nullptr, LX_LANGUAGE, 1, LX_FIND_ONLY, &rc)->disk.name, "English");
+  int calls = 0;
+  const auto stop = [](void* user, const char*, const char*) { return ++*static_cast<int*>(user), 0; };
+  EXPECT_EQ(LXEnumAliases(nullptr, stop, &calls), LX_OK);
+  EXPECT_EQ(calls, 1);
+  EXPECT_EQ(LXTermObjManager(own), LX_OK);
+  EXPECT_EQ(LXTermObjManager(nullptr), LX_E_INVALID);
+}
+
 TEST_F(ObjManTest, FileAndDirectoryNames) {
   char buffer[32];
   EXPECT_EQ(LXGetControlFileName("/d", buffer, 15), buffer);
   EXPECT_STREQ(buffer, "/d/control.nls");
   strcpy(buffer, "#");
   EXPECT_EQ(LXGetControlFileName("/d", buffer, 14), nullptr);
-  EXPECT_EQ(LXGetControlFileName("/directory", buffer, 5), nullptr);
   EXPECT_STREQ(buffer, "#");
 
   ASSERT_EQ(init(), LX_W_DEFAULTS);
@@ -249,12 +275,11 @@ TEST_F(ObjManTest, FileAndDirectoryNames) {
   ::testing::internal::CaptureStderr();
   EXPECT_EQ(LXGetDataFileName("/d", LX_SORT, 1, buffer, 15), nullptr);
   EXPECT_EQ(::testing::internal::GetCapturedStderr(), "Buffer provided = 15, needed = 16\n");
-  EXPECT_EQ(LXGetDataFileName("/d", 4, 1, buffer, sizeof(buffer)), nullptr);
-  EXPECT_EQ(LXGetDataFileName("/d", -1, 1, buffer, sizeof(buffer)), nullptr);
+  for (const int32_t type : {4, -1}) EXPECT_EQ(LXGetDataFileName("/d", type, 1, buffer, 32), nullptr);
   strcpy(buffer, "#");
   EXPECT_EQ(LXGetDataLocation(buffer, sizeof(buffer), 0), -1);
   setenv("LX_LOCALEDIR", "/some/where", 1);
-  EXPECT_EQ(LXGetDataLocation(buffer, 11, 0), 0);
+  for (const int32_t size : {-1, 11}) EXPECT_EQ(LXGetDataLocation(buffer, size, 0), 0);
   EXPECT_EQ(LXGetDataLocation(buffer, 16, 1), 0);
   EXPECT_EQ(buffer[0], '#');
   EXPECT_EQ(LXGetDataLocation(buffer, 12, 0), 12);

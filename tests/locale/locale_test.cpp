@@ -1,9 +1,11 @@
 // Locale handles: names in all three forms, defaults and fallback, the default locale, enumeration, the
-// operating system's name, release.
+// operating system's name, release; and items, of which tests/cases/items.txt says what may be set to what.
 #include <cstdio>
+#include <set>
 
 #include "core/tiny_directory.h"
 #include "support/case_rows.h"
+#include "support/forms.h"
 
 namespace lx::test {
 namespace {
@@ -12,31 +14,16 @@ class LocaleTest : public LibraryTest {
  protected:
   // English, French, and three whose defaults are not there, although objects of other types stand where they
   // would be.
-  void write_directory() {
+  void init_directory() {
     directory.write_locale({{367, "US-ASCII", ascii_codepage()},
                             {850, "Tiny", tiny_shift_jis().file.sections},
-                            {930, "Shift", tiny_shift().file.sections}});
-    directory.write("la_00001.nls", language_file(840, 367, 0));
-    directory.write("la_00002.nls", language_file(250, 850, 5));
-    directory.write("la_00003.nls", language_file(9999, 367, 0));
-    directory.write("la_00004.nls", language_file(840, 9999, 0));
-    directory.write("la_00005.nls", language_file(840, 367, 9999));
-    directory.write("te_00250.nls", directory.read("te_00840.nls"));
-    directory.write("so_00005.nls", object_file({SortBuilder{}.payload()}));
-    directory.write("control.nls", control_file({{1, LX_LANGUAGE, "English"},
-                                                 {2, LX_LANGUAGE, "French"},
-                                                 {3, LX_LANGUAGE, "NoTerritory"},
-                                                 {4, LX_LANGUAGE, "NoCodepage"},
-                                                 {5, LX_LANGUAGE, "NoSort"},
-                                                 {250, LX_TERRITORY, "France"},
-                                                 {840, LX_TERRITORY, "UnitedStates"},
-                                                 {367, LX_CODEPAGE, "US-ASCII"},
-                                                 {850, LX_CODEPAGE, "Tiny"},
-                                                 {930, LX_CODEPAGE, "Shift"},
-                                                 {5, LX_SORT, "Default"}}));
-  }
-  void init_directory() {
-    write_directory();
+                            {930, "Shift", tiny_shift().file.sections}},
+                           {{{2, LX_LANGUAGE, "French"}, language(250, 850, 5)},
+                            {{3, LX_LANGUAGE, "NoTerritory"}, language(9999, 367, 0)},
+                            {{4, LX_LANGUAGE, "NoCodepage"}, language(840, 9999, 0)},
+                            {{5, LX_LANGUAGE, "NoSort"}, language(840, 367, 9999)},
+                            {{250, LX_TERRITORY, "France"}, payload_of(kBuiltInTerritory)},
+                            {{5, LX_SORT, "Default"}, SortBuilder{}.payload()}});
     ASSERT_EQ(init(), LX_OK);
   }
 
@@ -62,12 +49,7 @@ class LocaleTest : public LibraryTest {
 
 TEST_F(LocaleTest, Names) {
   init_directory();
-  std::vector<CaseRow> rows = case_rows("locale/locale_names.txt");
-  const std::string long_name(100000, 'x');
-  rows.push_back({"long", {"French@" + long_name, "0", "33"}});
-  rows.push_back({"long, with fallback", {"French@" + long_name, "4", "2 250 850 5 0"}});
-  rows.push_back({"long, of the user", {"French@" + long_name.substr(0, 500), "2", "33"}});
-  for (const CaseRow& row : rows) {
+  for (const CaseRow& row : case_rows("locale/locale_names.txt")) {
     const int32_t flags = row.number(1);
     const bool of_user = (flags & LX_USER_LOCALE) != 0;
     if (of_user) setenv("LX_LANG", row[0].c_str(), 1);
@@ -92,44 +74,10 @@ TEST_F(LocaleTest, Names) {
   for (const LXWChar* wide : {name, marks}) EXPECT_EQ(LXSetLocaleW(wide, 0), LX_E_NO_LANGUAGE);
 }
 
-// A default that exists only as an object of another type, next to the empty range, is not found.
-TEST_F(LocaleTest, AnObjectOfAnotherTypeIsNotFound) {
-  directory.write("la_00007.nls", language_file(7, 367, 0));
-  directory.write("control.nls", control_file({{7, LX_LANGUAGE, "English"}, {367, LX_CODEPAGE, "US-ASCII"}}));
-  ASSERT_EQ(init(), LX_OK);
-  EXPECT_EQ(LXSetLocale("English", LX_FALLBACK), LX_E_NO_TERRITORY);
-}
-
-// Of an object that cannot be loaded: built-in data are no failure, and another code than 37 is given as 11.
-TEST_F(LocaleTest, OtherCodesOfLookUps) {
-  write_directory();
-  for (const char* file : {"te_00250.nls", "cp_00850.nls", "so_00005.nls"}) {
-    const ByteString content = directory.read(file);
-    directory.write(file, {});
-    for (uint32_t options : {0u, LX_NO_DEFAULTS})
-      for (int32_t flags : {0, int32_t{LX_FALLBACK}}) {
-        SCOPED_TRACE(file + std::to_string(options));
-        ASSERT_EQ(init(directory.path().c_str(), options), LX_OK);
-        int32_t rc = -1;
-        LXLocale* locale = LXGetLocale("French_France.Tiny@Default", flags, &rc);
-        const bool created = file[0] != 's' && options == 0;
-        EXPECT_EQ(locale != nullptr, created);
-        EXPECT_EQ(rc, created ? LX_OK : LX_E_NOT_INITIALIZED);
-        LXReleaseLocale(locale);
-        EXPECT_EQ(LXTerm(), LX_OK);
-      }
-    directory.write(file, content);
-  }
-}
-
 // The 16-bit name goes through the common codepage; where there is none, the name is empty.
 TEST_F(LocaleTest, UnicodeNamesNeedTheCommonCodepage) {
-  write_directory();
-  directory.write("la_00001.nls", language_file(840, 850, 0));
-  directory.write("control.nls", control_file({{1, LX_LANGUAGE, "English"},
-                                               {2, LX_LANGUAGE, "French"},
-                                               {840, LX_TERRITORY, "UnitedStates"},
-                                               {850, LX_CODEPAGE, "Tiny"}}));
+  directory.write_locale({{850, "Tiny", tiny_shift_jis().file.sections}},
+                         {{{2, LX_LANGUAGE, "French"}, language(840, 850, 0)}});
   ASSERT_EQ(init(), LX_OK);
   int32_t rc = -1;
   LXLocale* locale = create<LXUChar, LXGetLocaleU>("French", 0, &rc);
@@ -162,22 +110,6 @@ TEST_F(LocaleTest, DefaultLocale) {
   EXPECT_EQ(hooks.live_blocks(), blocks);
 }
 
-TEST_F(LocaleTest, ReleaseReportsAnyFailingFree) {
-  init_directory();
-  EXPECT_EQ(LXReleaseLocale(nullptr), 0);
-  LXLocale* locale = LXGetLocale("French", 0, nullptr);
-  ASSERT_NE(locale, nullptr);
-  hooks.fail_frees(true);
-  EXPECT_EQ(LXReleaseLocale(locale), 1);
-  hooks.fail_frees(false);
-  // The new default is in force all the same when the previous one cannot be given back.
-  ASSERT_EQ(LXSetLocale("French", 0), LX_OK);
-  hooks.fail_frees(true);
-  EXPECT_EQ(LXSetLocale("English", 0), LX_OK);
-  hooks.fail_frees(false);
-  EXPECT_EQ(describe(lx::globals.default_locale), "1 840 367 - C0");
-}
-
 TEST_F(LocaleTest, OperatingSystemName) {
   init_directory();
   for (const CaseRow& row : case_rows("locale/system_names.txt")) {
@@ -191,14 +123,22 @@ TEST_F(LocaleTest, OperatingSystemName) {
   }
 }
 
-template <class Unit>
-using Names = std::vector<std::basic_string<Unit>>;
-/// Adds a name behind the digit of its type; the fourth is the last one.
-template <class Unit>
-int32_t add_name(void* user, int32_t type, const Unit* name) {
-  auto& names = *static_cast<Names<Unit>*>(user);
-  names.push_back(static_cast<Unit>('0' + type) + std::basic_string<Unit>(name));
-  return names.size() == 4 ? 0 : 7;
+/// That the names come with their types up to the fourth, which is the last one. A byte that is not ASCII becomes
+/// `unit`.
+template <class Unit, class Door>
+void expect_names(Door* enumerate, Unit unit) {
+  std::vector<std::pair<int32_t, std::basic_string<Unit>>> names,
+      expected{{0, widened<Unit>("English")},
+               {1, widened<Unit>("UnitedStates")},
+               {2, unit + widened<Unit>(std::string(32, 'x'))},
+               {3, widened<Unit>("Last")}};
+  const auto add = [](void* user, int32_t type, const Unit* name) {
+    auto& all = *static_cast<decltype(names)*>(user);
+    all.emplace_back(type, name);
+    return all.size() == 4 ? 0 : 7;
+  };
+  EXPECT_EQ(enumerate(add, &names), 0);
+  EXPECT_EQ(names, expected);
 }
 
 TEST_F(LocaleTest, Enumeration) {
@@ -209,21 +149,49 @@ TEST_F(LocaleTest, Enumeration) {
                                                {2, LX_SORT, "Last"},
                                                {3, LX_SORT, "Behind"}}));
   ASSERT_EQ(init(), LX_OK);
-  Names<char> bytes;
-  Names<LXWChar> wide, widened_bytes;
-  Names<LXUChar> unicode, converted;
-  EXPECT_EQ(LXEnumLocales(add_name<char>, &bytes), 0);
-  EXPECT_EQ(LXEnumLocalesW(add_name<LXWChar>, &wide), 0);
-  EXPECT_EQ(LXEnumLocalesU(add_name<LXUChar>, &unicode), 0);
-  EXPECT_EQ(bytes, (Names<char>{"0English", "1UnitedStates", "2\xE9" + std::string(32, 'x'), "3Last"}));
-  for (const std::string& name : bytes) {
-    widened_bytes.push_back(widened<LXWChar>(name));
-    converted.push_back(widened<LXUChar>(name));
+  expect_names(LXEnumLocales, '\xE9');
+  expect_names(LXEnumLocalesW, LXWChar{0xE9});    // byte by byte, without a sign
+  expect_names(LXEnumLocalesU, LXUChar{0xFFFD});  // through the common codepage
+}
+
+// An item is a text or a number, and the other functions refuse it.
+TEST_F(LocaleTest, EachItemIsATextOrANumber) {
+  ASSERT_EQ(init("/nonexistent"), LX_W_DEFAULTS);
+  ASSERT_EQ(LXSetLocale("", 0), LX_OK);
+  const std::set<int32_t> numbers{1, 5, 9, 11, 58, 63, 69, 70, 73, 74, 75, 76, 77, 78, 82, 83, 84, 85, 86, 87};
+  for (int32_t item = -1; item <= LX_ITEM_LOCALE_STRING + 1; ++item) {
+    SCOPED_TRACE(item);
+    const bool is_number = numbers.count(item) != 0;
+    const bool is_text = !is_number && item > 0 && item <= LX_ITEM_LOCALE_STRING;
+    EXPECT_EQ(LXGetLocaleNumInfo(nullptr, item, 0) != -1, is_number);
+    EXPECT_EQ(LXGetError(nullptr), is_number ? LX_OK : LX_E_ITEM);
+    in_all_forms([&](const auto& form) {
+      typename std::decay_t<decltype(form)>::Unit text[40];
+      EXPECT_EQ(form.get_item(nullptr, item, text, 40, 0) != -1, is_text);
+      EXPECT_EQ(LXGetError(nullptr), is_text ? LX_OK : LX_E_ITEM);
+    });
   }
-  widened_bytes[2][1] = 0xE9;
-  converted[2][1] = 0xFFFD;
-  EXPECT_EQ(wide, widened_bytes) << "byte by byte, without a sign";
-  EXPECT_EQ(unicode, converted) << "through the common codepage";
+}
+
+// Beyond what the codepage has, the U form keeps the caller's text, and the others have the substitution.
+TEST_F(LocaleTest, TextsThatTheCodepageHasNot) {
+  write_tiny_directory(directory);
+  ASSERT_EQ(init(), LX_OK);
+  LXLocale* locale = LXGetLocale("English_UnitedStates.TINY-SINGLE", 0, nullptr);
+  const Units any{'A', 0x3041, 0x20AC, 0x4E9C, 0xE0};
+  ASSERT_EQ(LXSetLocaleTextInfoU(locale, 64, any.data(), count_of(any), 0), 1);
+  EXPECT_EQ(item(locale, 64), any);
+  char bytes[9];
+  LXWChar codes[9];
+  EXPECT_EQ(LXGetLocaleTextInfo(locale, 64, bytes, 9, 0), 6);
+  EXPECT_STREQ(bytes, "A?\xA4?\xE0");
+  EXPECT_EQ(LXGetLocaleTextInfoW(locale, 64, codes, 9, 0), 6);
+  EXPECT_EQ(Text<LXWChar>(codes), (Text<LXWChar>{'A', '?', 0xA4, '?', 0xE0}));
+  ASSERT_EQ(LXSetLocaleNumInfo(locale, 5, kElsewhereId), 1);
+  EXPECT_EQ(item(locale, 64), any) << "what was set stays";
+  EXPECT_EQ(messages(RAS1_LEVEL_INPUT, [&] { LXSetLocaleTextInfo(locale, 64, "EUR!", 3, 0); }),
+            std::vector<std::string>{"type = 64, buffer size = 3, data = EUR"});
+  EXPECT_EQ(LXReleaseLocale(locale), 0);
 }
 
 }  // namespace

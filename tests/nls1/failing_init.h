@@ -6,6 +6,6 @@
 namespace lx::test {
 
 /// The code that LXInit fails with; 0: it goes on.
-extern int32_t init_failure;
+inline int32_t init_failure;
 
 }  // namespace lx::test

@@ -10,8 +10,6 @@
 #include "nls1/failing_init.h"
 #include "support/case_rows.h"
 
-int32_t lx::test::init_failure;
-
 extern "C" {
 int32_t __real_LXInit(const char*, LXAllocHook, LXFreeHook, void*, uint32_t);
 int32_t __wrap_LXInit(const char* directory, LXAllocHook allocate, LXFreeHook release, void* context,
@@ -23,6 +21,8 @@ int32_t __wrap_LXInit(const char* directory, LXAllocHook allocate, LXFreeHook re
 
 namespace lx::test {
 namespace {
+
+using Strings = std::vector<std::string>;
 
 constexpr int kThreads = 8;
 constexpr char kEnglish[] = "English_UnitedStates.US-ASCII@Binary";
@@ -52,40 +52,22 @@ class Nls1Test : public LibraryTest {
     for (const char* variable : {"NLS1_LOCALEDIR", "LC_ALL", "LANG", "LX_TRACE"}) unsetenv(variable);
   }
 
-  /// English and Japanese with what they need, and a sort that has no file.
+  /// English and Japanese with what they need, and a sort that is none.
   void write_directory() {
-    directory.write_locale({{367, "US-ASCII", ascii_codepage()}, {954, "JapanEUC", ascii_codepage()}});
-    directory.write("la_00002.nls", language_file(392, 954, 0));
-    directory.write("te_00392.nls", directory.read("te_00840.nls"));
-    directory.write("control.nls", control_file({{1, LX_LANGUAGE, "English"},
-                                                 {2, LX_LANGUAGE, "Japanese"},
-                                                 {392, LX_TERRITORY, "Japan"},
-                                                 {840, LX_TERRITORY, "UnitedStates"},
-                                                 {40001, LX_TERRITORY, "Far"},
-                                                 {367, LX_CODEPAGE, "US-ASCII"},
-                                                 {954, LX_CODEPAGE, "JapanEUC"},
-                                                 {5, LX_SORT, "Default"}}));
+    const ByteString territory = payload_of(kBuiltInTerritory);
+    directory.write_locale({{367, "US-ASCII", ascii_codepage()}, {954, "JapanEUC", ascii_codepage()}},
+                           {{{2, LX_LANGUAGE, "Japanese"}, language(392, 954, 0)},
+                            {{392, LX_TERRITORY, "Japan"}, territory},
+                            {{40001, LX_TERRITORY, "Far"}, territory},
+                            {{5, LX_SORT, "Default"}, {}}});
     directory.write_text("alias.txt", "JapanEUC ujis\n");
     setenv("NLS1_LOCALEDIR", directory.path().c_str(), 1);
   }
 
-  /// That `action` says `text` at this level, and at no other.
-  static void expect_said(uint32_t level, const std::string& text, const std::function<void()>& action) {
-    for (bool at_level : {true, false}) {
-      const std::vector<std::string> texts = messages(at_level ? level : ~level, action);
-      EXPECT_EQ(std::count(texts.begin(), texts.end(), text) != 0, at_level) << text;
-    }
-  }
-
-  /// Runs `body` in a process that ends as a program does.
-  static void in_process(const std::string& what, const std::function<void()>& body) {
-    SCOPED_TRACE(what);
-    EXPECT_EXIT(
-        {
-          body();
-          exit(HasFailure() ? 3 : 0);
-        },
-        ::testing::ExitedWithCode(0), "");
+  /// The last message of `action` at a level.
+  static std::string said(uint32_t level, const std::function<void()>& action) {
+    const Strings texts = messages(level, action);
+    return texts.empty() ? "" : texts.back();
   }
 };
 
@@ -93,7 +75,7 @@ class Nls1Test : public LibraryTest {
 TEST_F(Nls1Test, EightThreads) {
   write_directory();
   setenv("LC_ALL", "C.UTF-8", 1);
-  in_process("threads", [] {
+  expect_in_child("threads", exit, [] {
     std::atomic<int> ready{0}, changed{0};
     std::vector<std::thread> threads;
     const auto meet = [](std::atomic<int>& arrived) {
@@ -125,7 +107,7 @@ TEST_F(Nls1Test, EightThreads) {
 
 TEST_F(Nls1Test, ThreadsReleaseTheirLocales) {
   write_directory();
-  in_process("blocks", [this] {
+  expect_in_child("blocks", _exit, [this] {
     // The program's own initialisation comes first, so the blocks are its hooks'.
     ASSERT_EQ(init(), LX_OK);
     EXPECT_EQ(thread_name(), kEnglish);
@@ -142,17 +124,18 @@ TEST_F(Nls1Test, ThreadsReleaseTheirLocales) {
     }).join();
     EXPECT_EQ(hooks.wrong_frees(), 0u);
     expect_refusals();
-    _exit(HasFailure() ? 3 : 0);  // what the last LXTerm left behind are handles that nobody may release
-  });
+  });  // what the last LXTerm left behind are handles that nobody may release
 }
 
 TEST_F(Nls1Test, WithoutALibrary) {
-  in_process("initialisation fails", [] {
+  expect_in_child("initialisation fails", exit, [] {
     atexit([] {
       if (LXTerm() != LX_OK) _exit(4);
     });
-    init_failure = LX_E_MEMORY;
-    expect_refusals();
+    init_failure = LX_E_NOT_INITIALIZED;
+    EXPECT_EQ(messages(RAS1_LEVEL_PROCESS, expect_refusals),
+              (Strings{"Unable to determine location of locale definitions\n",
+                       "Unable to initialize Lexicor, rc = 11"}));
     init_failure = 0;
     expect_refusals();  // it is not tried again
     // The program's own initialisation, which the library's exit routines leave alone.
@@ -160,7 +143,7 @@ TEST_F(Nls1Test, WithoutALibrary) {
     expect_refusals();
   });
   write_directory();
-  in_process("after the end of the process", [] {
+  expect_in_child("after the end of the process", exit, [] {
     // Registered before the library's, so it runs after them.
     atexit([] {
       expect_refusals();
@@ -174,7 +157,7 @@ TEST_F(Nls1Test, WithoutALibrary) {
 
 TEST_F(Nls1Test, LocalesFromIdentifiers) {
   write_directory();
-  in_process("creation", [] {
+  expect_in_child("creation", exit, [] {
     for (const CaseRow& row : case_rows("nls1/locale_identifiers.txt")) {
       SCOPED_TRACE(row.where);
       const int32_t both = NLS1_LANGUAGE_TERRITORY(row.number(0), row.number(1));
@@ -184,8 +167,9 @@ TEST_F(Nls1Test, LocalesFromIdentifiers) {
       EXPECT_EQ(locale != nullptr ? name_of(locale) : std::to_string(rc), row[4]);
       EXPECT_EQ(locale != nullptr, rc == LX_OK);
       LXReleaseLocale(locale);
-      if (row.fields.size() > 5)
-        expect_said(RAS1_LEVEL_DETAIL, row[5], [&] { NLS1_GetLocale(both, codepage, flags, nullptr); });
+      if (row.fields.size() > 5) {
+        EXPECT_EQ(said(RAS1_LEVEL_DETAIL, [&] { NLS1_GetLocale(both, codepage, flags, nullptr); }), row[5]);
+      }
       // The process's default: undefined flags are taken off.
       ASSERT_EQ(NLS1_SetLocale(0, 0, 0), LX_OK);
       const int32_t set_code = rc == LX_E_INVALID ? LX_OK : rc;
@@ -204,7 +188,7 @@ TEST_F(Nls1Test, LocalesFromIdentifiers) {
 
 TEST_F(Nls1Test, NativeLocales) {
   write_directory();
-  in_process("native", [] {
+  expect_in_child("native", exit, [] {
     int32_t rc = -1;
     LXLocale* locale = NLS1_ConvertNativeLocale("ja_JP.eucJP", 0, &rc);
     EXPECT_EQ(rc, LX_OK);
@@ -213,19 +197,19 @@ TEST_F(Nls1Test, NativeLocales) {
     const auto set = [&](int32_t category, int32_t flags, int32_t code) {
       EXPECT_EQ(NLS1_SetNativeFromLocale(locale, category, flags), code);
     };
-    expect_said(RAS1_LEVEL_ERRORS, "NLS1_ConvertLocale failed with rc = 32",
-                [&] { set(LC_NUMERIC, 0, LX_E_NO_NATIVE); });
+    EXPECT_EQ(said(RAS1_LEVEL_ERRORS, [&] { set(LC_NUMERIC, 0, LX_E_NO_NATIVE); }),
+              "NLS1_ConvertLocale failed with rc = 32");
     set(LC_NUMERIC, LX_FALLBACK, LX_OK);
-    expect_said(RAS1_LEVEL_ERRORS, "setlocale failed to setlocale to C",
-                [&] { set(99, LX_FALLBACK, LX_E_NO_NATIVE); });
+    EXPECT_EQ(said(RAS1_LEVEL_ERRORS, [&] { set(99, LX_FALLBACK, LX_E_NO_NATIVE); }),
+              "setlocale failed to setlocale to C");
     LXReleaseLocale(locale);
     for (const char* unknown : {"xx_XX", "", static_cast<const char*>(nullptr)}) {
       EXPECT_EQ(NLS1_ConvertNativeLocale(unknown, 0, &rc), nullptr);
       EXPECT_EQ(rc, LX_E_NO_LANGUAGE);
       EXPECT_EQ(NLS1_SetLocaleFromNative(unknown, NLS1_THREAD), LX_E_NO_LANGUAGE);
     }
-    expect_said(RAS1_LEVEL_ERRORS, "LXConvertNativeLocale failed for xx_XX with rc 31",
-                [] { NLS1_ConvertNativeLocale("xx_XX", 0, nullptr); });
+    EXPECT_EQ(said(RAS1_LEVEL_ERRORS, [] { NLS1_ConvertNativeLocale("xx_XX", 0, nullptr); }),
+              "LXConvertNativeLocale failed for xx_XX with rc 31");
     if (setlocale(LC_ALL, "C.UTF-8") != nullptr) {
       EXPECT_EQ(NLS1_SetNativeLocale(kJapaneseInJapan, 0, LC_CTYPE, 0), LX_E_NO_NATIVE);
       EXPECT_EQ(NLS1_SetNativeLocale(NLS1_LANGUAGE_TERRITORY(1, 840), 367, LC_CTYPE, 0), LX_OK);
@@ -248,7 +232,7 @@ TEST_F(Nls1Test, NativeLocales) {
 
 TEST_F(Nls1Test, ObjectsByNameAndIdentifier) {
   write_directory();
-  in_process("objects", [] {
+  expect_in_child("objects", exit, [] {
     const struct {
       const char* type;
       int32_t (*id_of)(const char*, int32_t*);
@@ -274,67 +258,32 @@ TEST_F(Nls1Test, ObjectsByNameAndIdentifier) {
       EXPECT_EQ(functions(row).name_of(row.number(1), name, row.number(2)), row.number(4));
       EXPECT_EQ(name, row[3]);
     }
-    expect_said(RAS1_LEVEL_ERRORS, "Object name length (8) for Japanese exceeds output buffer length (8)", [] {
-      char name[8];
-      NLS1_GetLanguageName(2, name, sizeof(name));
-    });
+    char name[8];
+    EXPECT_EQ(said(RAS1_LEVEL_ERRORS, [&] { NLS1_GetLanguageName(2, name, sizeof(name)); }),
+              "Object name length (8) for Japanese exceeds output buffer length (8)");
   });
-  // Without sorts the search by identifier looks at the entry beside them: another type is not found.
-  directory.write("control.nls", control_file({{1, LX_LANGUAGE, "English"}, {5, LX_CODEPAGE, "Five"}}));
-  in_process("another type", [] {
+  // The search by identifier looks at the entry beside types that have none: another type is not found.
+  directory.write("la_00840.nls", directory.read("la_00001.nls"));
+  directory.write("control.nls", control_file({{840, LX_LANGUAGE, "English"}, {5, LX_CODEPAGE, "Five"}}));
+  expect_in_child("another type", exit, [] {
+    EXPECT_EQ(messages(RAS1_LEVEL_PROCESS, [] { EXPECT_EQ(thread_name(), "null"); }),
+              (Strings{"Unable to set global locale, rc = 34", "Unable to set thread locale, rc = 34"}));
     char name[40] = "#";
     EXPECT_EQ(NLS1_GetSortName(5, name, sizeof(name)), LX_E_NOT_FOUND);
-    EXPECT_EQ(NLS1_GetLocale(NLS1_LANGUAGE_TERRITORY(1, 1), 0, 0, nullptr), nullptr);
+    EXPECT_EQ(NLS1_GetLocale(NLS1_LANGUAGE_TERRITORY(840, 840), 0, 0, nullptr), nullptr);
     EXPECT_EQ(name_of(nullptr), "none") << "English has no territory here";
-    EXPECT_EQ(thread_name(), "null");
   });
 }
 
-// Whatever the environment holds, the first call ends with a usable library.
-TEST_F(Nls1Test, Environment) {
-  if (access(kDefaultControl, F_OK) == 0) GTEST_SKIP() << "the default directory exists";
-  std::vector<std::string> values = {"", "/", "%s%n%99999d", "\xFF\x01\n;=;_.@", "_._@.;LC_CTYPE=", "../../.."};
-  // Sizes: locale names are read into 132 bytes, paths into 256 with 13 for the control file's name.
-  for (size_t bytes : {10, 11, 131, 132, 133, 242, 243, 244, 255, 256, 257, 65536})
-    values.push_back(std::string(bytes, 'x'));
-  for (const char* variable : {"NLS1_LOCALEDIR", "LX_LOCALEDIR", "LX_LANG", "LC_ALL"}) {
-    for (const std::string& value : values) {
-      in_process(variable + ("=" + value).substr(0, 40) + " " + std::to_string(value.size()), [&] {
-        setenv(variable, value.c_str(), 1);
-        EXPECT_EQ(thread_name(), kEnglish);
-        EXPECT_EQ(name_of(nullptr), kEnglish);
-        EXPECT_EQ(NLS1_GetLanguageId("English", nullptr), 1);
-      });
-    }
-  }
+TEST_F(Nls1Test, TheUsersLocaleOfTheCoresDirectory) {
   write_directory();
-  in_process("the user's locale", [] {
+  expect_in_child("variables", exit, [this] {
+    unsetenv("NLS1_LOCALEDIR");
+    setenv("LX_LOCALEDIR", directory.path().c_str(), 1);
     setenv("LX_LANG", "Japanese", 1);
     EXPECT_EQ(thread_name(), kJapanese);
     EXPECT_EQ(name_of(nullptr), kJapanese);
   });
-  in_process("the core's directory", [this] {
-    unsetenv("NLS1_LOCALEDIR");
-    setenv("LX_LOCALEDIR", directory.path().c_str(), 1);
-    EXPECT_EQ(NLS1_GetTerritoryId("Japan", nullptr), 392);
-  });
-}
-
-TEST_F(Nls1Test, MessagesOfTheInitialisation) {
-  const auto expect = [](int32_t failure, const std::string& text) {
-    for (uint32_t level : {uint32_t{RAS1_LEVEL_PROCESS}, ~uint32_t{RAS1_LEVEL_PROCESS}})
-      in_process(text, [&] {
-        init_failure = failure;
-        const std::vector<std::string> texts = messages(level, [] { thread_name(); });
-        EXPECT_EQ(std::count(texts.begin(), texts.end(), text) != 0, level == RAS1_LEVEL_PROCESS);
-      });
-  };
-  expect(LX_OK, "Unable to determine location of locale definitions\n");
-  expect(LX_E_NOT_INITIALIZED, "Unable to initialize Lexicor, rc = 11");
-  write_directory();
-  directory.write("control.nls", control_file({{2, LX_LANGUAGE, "Japanese"}}));
-  expect(LX_OK, "Unable to set global locale, rc = 31");
-  expect(LX_OK, "Unable to set thread locale, rc = 31");
 }
 
 }  // namespace

@@ -4,7 +4,6 @@
 #include <random>
 
 #include "core/library_fixture.h"
-#include "core/lxformat.h"
 #include "nls1.h"
 #include "support/case_rows.h"
 #include "support/tiny_codepages.h"
@@ -12,9 +11,7 @@
 namespace lx::test {
 namespace {
 
-constexpr int32_t kTerm = LX_TERMINATE, kChars = LX_CHARACTERS, kPad = NLS1_PAD, kDrop = NLS1_DROP_BLANKS;
-// Single byte, two kinds of multibyte, shift-sensitive, UTF-16.
-constexpr int32_t S = 9001, J = 9002, V = 57352, H = 9005, U = NLS1_UTF16;
+constexpr int32_t kTerm = LX_TERMINATE, kChars = LX_CHARACTERS;
 
 // In a block of its size, so that whoever reads or writes beyond it is seen.
 using Bytes = std::vector<char>;
@@ -39,7 +36,7 @@ struct Pair {
   const TinyCodepage* from;
   Bytes input;
 
-  static int32_t number(const TinyCodepage* cp) { return cp != nullptr ? cp->file.id : U; }
+  static int32_t number(const TinyCodepage* cp) { return cp != nullptr ? cp->file.id : NLS1_UTF16; }
 
   /// What the conversion of the core gives, counted as the translation counts.
   int32_t convert(const Bytes& text, int32_t length, int32_t size, int32_t flags, char* out) const {
@@ -91,7 +88,7 @@ struct Pair {
 };
 
 TEST(Translate, AgreesWithConversion) {
-  expect_in_child("random texts", [] {
+  expect_in_child("random texts", _exit, [] {
     TinyLibrary library;
     const std::vector<TinyCodepage> all = tiny_codepages();
     std::mt19937 random(8);
@@ -126,20 +123,26 @@ TEST(Translate, AgreesWithConversion) {
   });
 }
 
-int32_t codepage_of_letter(const std::string& letter) {
-  return std::map<std::string, int32_t>{{"S", S}, {"J", J}, {"V", V}, {"H", H}, {"U", U}, {"1", 1}, {"2", 2}}
-      .at(letter);
-}
-int32_t flags_of_letters(const std::string& letters) {
-  const std::map<char, int32_t> flags{{'p', kPad},  {'d', kDrop}, {'c', kChars},
-                                      {'t', kTerm}, {'1', 1},     {'!', 0x100}};
+/// The codepage of a letter, or the flags of some.
+int32_t number_of(const std::string& letters) {
+  static const std::map<char, int32_t> numbers{{'S', 9001},
+                                               {'J', 9002},
+                                               {'V', 57352},
+                                               {'H', 9005},
+                                               {'U', NLS1_UTF16},
+                                               {'p', NLS1_PAD},
+                                               {'d', NLS1_DROP_BLANKS},
+                                               {'c', kChars},
+                                               {'t', kTerm},
+                                               {'1', 1},
+                                               {'!', 0x100}};
   int32_t sum = 0;
-  for (char letter : letters) sum |= flags.at(letter);
+  for (char letter : letters) sum |= numbers.at(letter);
   return sum;
 }
 
 TEST(Translate, Ends) {
-  expect_in_child("rows", [] {
+  expect_in_child("rows", _exit, [] {
     // A single-byte codepage has no shift states, whatever it says.
     std::vector<TinyCodepage> codepages = tiny_codepages();
     codepages[0].file.sections[0][format::codepage::kShiftOut] = 'a';
@@ -148,13 +151,12 @@ TEST(Translate, Ends) {
     for (const CaseRow& row : case_rows("nls1/translation_ends.txt")) {
       SCOPED_TRACE(row.where);
       const Bytes input(row[4].begin(), row[4].end()), output(row[5].begin(), row[5].end());
-      const int32_t size = row.number(2), flags = flags_of_letters(row[3]), consumed = row.number(6);
+      const int32_t size = row.number(2), flags = number_of(row[3]), consumed = row.number(6);
       const int32_t length = row.fields.size() > 8 ? row.number(8) : static_cast<int32_t>(input.size());
       const bool by_chars = (flags & kChars) != 0;
       // One byte more where a character is taken back for the shift byte.
       const size_t room = by_chars ? output.size() + 1 : static_cast<size_t>(std::max(size, 0));
-      Translated t =
-          translate(codepage_of_letter(row[0]), codepage_of_letter(row[1]), input, length, size, flags, room);
+      Translated t = translate(number_of(row[0]), number_of(row[1]), input, length, size, flags, room);
       EXPECT_EQ(t.result, by_chars || consumed < 0 ? consumed : static_cast<int32_t>(output.size()));
       EXPECT_EQ(t.consumed, std::max(consumed, 0));
       EXPECT_EQ(t.rc, static_cast<uint32_t>(row.number(7)));
@@ -173,11 +175,11 @@ TEST_F(TranslateTest, CodepagesThatCannotBeHad) {
   unlink(directory.file("cp_00954.nls").c_str());
   directory.write_text("cp_00955.nls", std::string(100, 'x'));
   setenv("NLS1_LOCALEDIR", directory.path().c_str(), 1);
-  expect_in_child("codepages", [] {
-    const int32_t cases[][3] = {{367, 954, LX_E_NO_CODEPAGE}, {954, 367, LX_E_NO_CODEPAGE},
-                                {367, 955, LX_E_CORRUPT},     {955, 367, LX_E_NO_CODEPAGE},
-                                {367, 1, LX_E_NOT_FOUND},     {65536 + 367, 367, LX_E_NOT_FOUND},
-                                {-1, U, LX_E_NOT_FOUND}};
+  expect_in_child("codepages", _exit, [] {
+    const int32_t cases[][3] = {{367, 954, LX_E_NO_CODEPAGE},    {954, 367, LX_E_NO_CODEPAGE},
+                                {367, 955, LX_E_CORRUPT},        {955, 367, LX_E_NO_CODEPAGE},
+                                {367, 1, LX_E_NOT_FOUND},        {65536 + 367, 367, LX_E_NOT_FOUND},
+                                {-1, NLS1_UTF16, LX_E_NOT_FOUND}};
     char out = '#';
     uint32_t rc = 99;
     for (const auto& [to, from, code] : cases) {

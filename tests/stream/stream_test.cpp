@@ -1,13 +1,40 @@
-// Character streams against a scripted callback that moves any number of bytes, fails or ends at any call: the
-// bytes that pass are those of the text, whatever the form and the codepage.
+// Line ends in strings, in the four forms against one model on characters; and character streams against a
+// scripted callback that moves any number of bytes, fails or ends at any call: the bytes that pass are those of
+// the text, whatever the form and the codepage.
 #include <cstring>
 
-#include "stream/line_texts.h"
 #include "stream/lxstream.h"
 #include "stream/stream_peer.h"
+#include "support/case_test.h"
 
 namespace lx::test {
 namespace {
+
+/// A text full of line ends of every kind.
+Units random_text(const TinyCodepage& cp, std::mt19937& random, size_t most) {
+  const Units ends = line_ends(cp), often = ends.substr(0, 2);
+  Units alphabet = ends + often + often + LXUChar(cp.characters.back().unicode), text(random() % most, 0);
+  for (size_t i = 0; i < cp.characters.size(); i += cp.characters.size() / 7)
+    alphabet.push_back(cp.characters[i].unicode);
+  for (LXUChar& u : text) u = alphabet[random() % alphabet.size()];
+  return text;
+}
+
+struct FoundEol {
+  size_t past;  // characters up to and with it
+  uint32_t kind;
+  int32_t length;
+};
+/// The line ends one after the other at each character, in the order in which they are looked for.
+FoundEol find_eol(const Units& ends, const Units& text, size_t from, uint32_t kinds) {
+  for (size_t i = from; i < text.size(); ++i) {
+    const bool pair = text[i] == ends[1] && i + 1 < text.size() && text[i + 1] == ends[0];
+    if ((kinds & LX_EOL_CRLF) != 0 && pair) return {i + 2, LX_EOL_CRLF, 2};
+    for (const auto& [kind, end] : {std::pair{LX_EOL_LF, 0}, {LX_EOL_THIRD, 2}, {LX_EOL_FOURTH, 3}})
+      if ((kinds & kind) != 0 && text[i] == ends[static_cast<size_t>(end)]) return {i + 1, kind, 1};
+  }
+  return {text.size(), LX_EOL_NONE, 0};
+}
 
 class Streams : public CaseTest {
  protected:
@@ -17,6 +44,33 @@ class Streams : public CaseTest {
     for (const TinyCodepage& cp : case_codepages()) {
       SCOPED_TRACE(cp.file.name);
       body(cp, library.locale(cp));
+    }
+  }
+  /// Looks for line ends in the text, in a block of its exact size and with `behind` after it: by its length in
+  /// units and in characters and, without a null in it and nothing behind, null-terminated.
+  template <class F>
+  static void find_in(LXLocale* locale, const TinyCodepage& cp, const Units& text, const Units& behind,
+                      uint32_t kinds) {
+    const FoundEol model = find_eol(line_ends(cp), text, 0, kinds != 0 ? kinds : LX_EOL_LF);
+    const Encoded<F> before(cp, text.substr(0, model.past)), whole(cp, text);
+    auto units = whole.units;
+    const bool terminated = behind.empty() && std::count(units.begin(), units.end(), 0) == 0;
+    const auto rest = Encoded<F>(cp, behind).units;
+    units.insert(units.end(), rest.begin(), rest.end());
+    // A count of characters looks at the byte behind the last one.
+    if (terminated || rest.empty()) units.push_back(terminated ? 0 : 0x41);
+    units.shrink_to_fit();
+    for (const auto& [length, flag] :
+         {std::pair(whole.size(), 0u), {count_of(text), LX_CHARACTERS}, {-1, 0u}}) {
+      if (length < 0 && !terminated) continue;
+      SCOPED_TRACE(length);
+      uint32_t kind = 1;
+      int32_t eol_length = -1;
+      const auto* end = F::get_eol(locale, units.data(), length, &kind, &eol_length, kinds | flag);
+      EXPECT_EQ(LXGetError(locale), LX_OK);
+      EXPECT_EQ(kind, model.kind);
+      EXPECT_EQ(eol_length, model.length);
+      EXPECT_EQ(end, model.kind == LX_EOL_NONE ? nullptr : units.data() + before.size());
     }
   }
   LXStream* open(LXLocale* locale, Peer& peer) {
@@ -36,6 +90,41 @@ class Streams : public CaseTest {
     return script;
   }
 };
+
+TEST_F(Streams, LineEndsAreFoundAlikeInAllForms) {
+  in_all_codepages([&](const TinyCodepage& cp, LXLocale* locale) {
+    for (int round = 0; round < 300; ++round) {
+      const Units text = random_text(cp, random, 9), behind = random_text(cp, random, 1 + round % 3);
+      const uint32_t kinds = (random() % 16) << 8;
+      SCOPED_TRACE(kinds);
+      forms_of(cp, [&](const auto& form) {
+        find_in<std::decay_t<decltype(form)>>(locale, cp, text, behind, kinds);
+      });
+    }
+  });
+}
+
+// The order is fixed and line feeds add up; two together are no line end that anybody wants, and stay.
+TEST_F(Streams, LineEndsAreStored) {
+  const std::pair<uint32_t, std::string> rows[] = {
+      // flags, indexes of the line ends
+      {0, "0"},       {0x1000, "0"},  {0x100, "0"},   {0x200, "10"}, {0x400, "2"},     {0x800, "3"},
+      {0x1200, "10"}, {0x1100, "00"}, {0x300, "010"}, {0xC00, "32"}, {0x1F00, "32010"}};
+  in_all_codepages([&](const TinyCodepage& cp, LXLocale* locale) {
+    for (const auto& [flags, order] : rows) {
+      SCOPED_TRACE(flags);
+      Units text;
+      for (char index : order) text += line_ends(cp)[static_cast<size_t>(index - '0')];
+      in_all_forms([&, flags = flags](const auto& form) {
+        using F = std::decay_t<decltype(form)>;
+        const auto expected = Encoded<F>(cp, text).units;
+        std::vector<typename F::Unit> out(expected.size());
+        EXPECT_EQ(F::put_eol(locale, out.data(), flags), out.data() + out.size());
+        EXPECT_EQ(out, expected);
+      });
+    }
+  });
+}
 
 /// The bytes that a stream of a form carries: units, or bytes that begin and end in the single-byte state.
 template <class F>
@@ -90,8 +179,7 @@ TEST_F(Streams, ReadingLosesNothing) {
     for (int round = 0; round < 100; ++round) {
       const Units text = random_text(cp, random, 60);
       Peer peer{true, stream_bytes<Wide>(cp, text), random_script(150)};
-      Peer units{true, stream_bytes<Unicode>(cp, text), random_script(150)};
-      LXStream *const in = open(locale, peer), *const in_units = open(locale, units);
+      LXStream* const in = open(locale, peer);
       std::vector<LXWChar> codes;
       for (;;) {
         const LXWChar code = LXReadCharW(in, locale);
@@ -106,14 +194,7 @@ TEST_F(Streams, ReadingLosesNothing) {
           EXPECT_EQ(LXUngetCharW(in, locale, codes.back()), 1);
       }
       EXPECT_EQ(codes, Encoded<Wide>(cp, text).codes);
-      Units read;
-      for (;;) {
-        const LXUChar u = LXReadCharU(in_units, locale);
-        if (u != LX_STREAM_NO_UNIT) read.push_back(u);
-        if (u == LX_STREAM_NO_UNIT && units.calls > units.script.size()) break;
-      }
-      EXPECT_EQ(read, text);
-      EXPECT_EQ(LXCloseStream(in, locale) + LXCloseStream(in_units, locale), 2);
+      EXPECT_EQ(LXCloseStream(in, locale), 1);
     }
   });
 }
@@ -192,18 +273,6 @@ TEST_F(Streams, LinesAreThoseOfTheModel) {
   in_all_codepages([&](const TinyCodepage& cp, LXLocale* locale) {
     for (int round = 0; round < 150; ++round) in_all_forms([&](const auto& form) { check(form, cp, locale); });
   });
-}
-
-TEST_F(Streams, ModesAndFailingFrees) {
-  LXLocale* locale = library.locale(case_codepage("SJIS"));
-  Peer peer{false};
-  EXPECT_EQ(LXOpenStream(locale, Peer::transfer, &peer, 0x80000052u), nullptr);
-  EXPECT_EQ(LXGetError(locale), LX_E_INVALID);
-  LXStream* stream = open(locale, peer);
-  library.hooks().fail_frees(true);
-  EXPECT_EQ(LXCloseStream(stream, locale), 0);
-  EXPECT_EQ(LXGetError(locale), LX_E_FREE);
-  library.hooks().fail_frees(false);
 }
 
 }  // namespace
