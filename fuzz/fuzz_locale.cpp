@@ -4,14 +4,16 @@
 #include <iterator>
 
 #include "support/object_files.h"
+#include "support/use_codepage.h"
 
 namespace {
 
-constexpr const char* kFiles[] = {"la_00001.nls", "te_00840.nls", "so_00001.nls", "control.nls", "alias.txt"};
+constexpr const char* kFiles[] = {"la_00001.nls", "te_00840.nls", "so_00001.nls",
+                                  "control.nls",  "alias.txt",    "cp_00819.nls"};
 constexpr int32_t kUnits = 0x10000;
 
 /// Every character, with its neighbours in pairs.
-void use_text(LXLocale* locale) {
+void use_characters(LXLocale* locale) {
   static LXUChar units[kUnits], mapped[2 * kUnits];
   static uint8_t key[64];
   for (int32_t u = 0; u < kUnits; ++u) units[u] = static_cast<LXUChar>(u);
@@ -53,20 +55,20 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
   using namespace lx::test;
   static const ScratchDirectory directory;
   if (size == 0) return 0;
-  directory.write_locale({{367, "US-ASCII", ascii_codepage()}});
+  directory.write_locale({{367, "US-ASCII", ascii_codepage()}, {819, "Fuzz", ascii_codepage()}});
   directory.write("control.nls", control_file({{1, LX_LANGUAGE, "English"},
                                                {840, LX_TERRITORY, "UnitedStates"},
                                                {367, LX_CODEPAGE, "US-ASCII"},
+                                               {819, LX_CODEPAGE, "Fuzz"},
                                                {1, LX_SORT, "Default"}}));
   for (const char* other : {"so_00001.nls", "alias.txt"}) directory.write(other, {});
   directory.write(kFiles[data[0] % std::size(kFiles)], {data + 1, data + size});
   LXInit(directory.path().c_str(), nullptr, nullptr, nullptr, 0);
-  for (const char* name : {"", "English_UnitedStates.US-ASCII@BINARY"})
-    LXReleaseLocale(LXGetLocale(name, LX_FALLBACK, nullptr));
-  LXLocale* locale = LXGetLocale("English@Default", 0, nullptr);
-  if (locale == nullptr) locale = LXGetLocale("English", 0, nullptr);
-  if (locale != nullptr) use_text(locale), use_items(locale);
-  LXReleaseLocale(locale);
+  for (const char* name : {"", "English_UnitedStates.US-ASCII@BINARY", "English", "English.Fuzz@Default"}) {
+    LXLocale* const locale = LXGetLocale(name, LX_FALLBACK, nullptr);
+    if (locale != nullptr) look_up(locale, 7), use_text(locale, 1), use_characters(locale), use_items(locale);
+    LXReleaseLocale(locale);
+  }
   int32_t rc = LX_OK;
   for (int32_t type = LX_LANGUAGE; type <= LX_SORT; ++type)
     for (int32_t id = 0; id <= 0xFFFF; id += 257)
