@@ -141,11 +141,11 @@ void for_each_text(const ShippedCodepage& codepage, const std::function<void(con
     if (codepage.source.leads[b] == 1 && !shift_byte) visit(std::string(1, byte(b)));
     const bool leads = codepage.shift() ? b >= 0x40 && b <= 0xFE : codepage.source.leads[b] == 2;
     if (!leads) continue;
-    for (uint32_t c = codepage.shift() ? 0x40 : 0; c <= 0xFF; ++c) visit(text_of_code(codepage, b << 8 | c, 2));
+    for (uint32_t c = codepage.shift() ? 0x40 : 0; c <= 0xFF; ++c) visit(codepage.text_of(b << 8 | c));
   }
   for (const lexicor_data::Mapping& mapping : codepage.source.mappings)
     if (mapping.bytes > 2 && mapping.precision != 1 && mapping.unicode <= 0xFFFF)
-      visit(text_of_code(codepage, mapping.code, mapping.bytes));
+      visit(codepage.text_of(mapping.code));
 }
 
 void compare(const ShippedCodepage& codepage, const std::string& peer_name, const Peer& peer,
