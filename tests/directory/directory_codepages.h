@@ -1,4 +1,4 @@
-// The codepages of the shipped directory as their sources say, for tests that compare the library with them.
+// The codepages of the shipped directory, their sources and what the objects hold of them.
 #pragma once
 
 #include <fstream>
@@ -6,15 +6,17 @@
 #include <string>
 #include <vector>
 
+#include "codepage_unpack.h"
 #include "compile.h"
-#include "support/forms.h"
 
 namespace lx::test {
 
 struct ShippedCodepage {
   lexicor_data::ObjectName name;
-  std::string text;
+  std::string text;  // of the source
   lexicor_data::CodepageSource source;
+  lexicor_data::ObjectFile object;
+  lexicor_data::CodepageModel model;  // of the object
 
   bool shift() const { return source.kind == lexicor_data::CodepageClass::kShiftStateful; }
 
@@ -30,25 +32,17 @@ struct ShippedCodepage {
 
 /// All codepages of the control file in its order.
 inline std::vector<ShippedCodepage> shipped_codepages() {
+  using namespace lexicor_data;
   std::vector<ShippedCodepage> all;
-  for (const lexicor_data::ObjectName& object : lexicor_data::read_source_control(LEXICOR_DATA_DIR).objects) {
-    if (object.type != lexicor_data::ObjectType::kCodepage) continue;
+  for (const ObjectName& name : read_source_control(LEXICOR_DATA_DIR).objects) {
+    if (name.type != lexicor_data::ObjectType::kCodepage) continue;
     std::stringstream text;
-    text << std::ifstream(LEXICOR_DATA_DIR "/" + source_file_name(object), std::ios::binary).rdbuf();
-    all.push_back({object, text.str(), lexicor_data::read_ucm(text, object.name)});
+    text << std::ifstream(LEXICOR_DATA_DIR "/" + source_file_name(name), std::ios::binary).rdbuf();
+    const ObjectFile object =
+        read_object(read_file(LEXICOR_LOCALE_DIR "/" + object_file_name(name)), name.name);
+    all.push_back({name, text.str(), read_ucm(text, name.name), object, unpack_codepage(object, name)});
   }
   return all;
-}
-
-/// A text from Unicode, and a whole one to it, with shift bytes where the codepage has them.
-inline std::string from_unicode(LXLocale* l, const Units& text) {
-  const auto encode_closed = [&](char* to, int32_t room) {
-    return LXUnicodeToStringEx(l, to, LX_SHIFT_SINGLE, room, text.data(), count_of(text), LX_TERMINATE) - 1;
-  };
-  return made<char>(encode_closed, 5 * text.size() + 2);
-}
-inline Units to_unicode(LXLocale* l, const std::string& bytes) {
-  return decode(kEx, l, bytes);
 }
 
 }  // namespace lx::test

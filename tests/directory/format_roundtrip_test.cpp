@@ -56,13 +56,13 @@ Units names_of(LXLocale* l) {
 
 struct RoundTrip {
   ListedDifferences differences;
-  size_t trips = 0, cases = 0;
+  size_t cases = 0;
 
   /// Gives a case to all forms that can have its text.
   template <class Case>
   void run(const Place& place, const Units& whole, Case test) {
     const auto one = [&](const auto& form) {
-      if (place.can(form, whole)) test(form), ++trips;
+      if (place.can(form, whole)) test(form);
     };
     in_all_forms(one);
   }
@@ -170,7 +170,6 @@ TEST(FormatRoundTrip, EveryLocale) {
   LXEnumNativeLocales(add, &own);
   for (const std::string& name : own) pairs.insert(name.substr(0, name.find('.')));
   RoundTrip trip;
-  size_t ebcdic = 0, shift = 0;
   const auto objects = lexicor_data::read_source_control(LEXICOR_DATA_DIR).objects;
   for (const std::string& pair : pairs) {
     const Units names = names_of(locale_with("UTF-8", pair).get());
@@ -179,15 +178,11 @@ TEST(FormatRoundTrip, EveryLocale) {
       const bool all = own.count(pair + "." + object.name) != 0 || object.name == "UTF-8";
       const Place place{pair, object.name, all ? 1U : 7U};
       if (!all && place.seen(kEx, names) != names) continue;
-      shift += place.is(LX_ITEM_CODEPAGE_SHIFT);
-      ebcdic += !place.is(LX_ITEM_CODEPAGE_ASCII);
       times(&trip, place);
       numbers(&trip, place);
     }
   }
-  EXPECT_GT(ebcdic, 1500U);
-  EXPECT_GT(shift, 250U);
-  EXPECT_GT(trip.trips, 400000U);
+  EXPECT_GT(trip.cases, 1000000U);
   trip.differences.expect_listed("format_roundtrip_exceptions.txt");
 }
 

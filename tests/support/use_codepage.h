@@ -28,7 +28,8 @@ inline void look_up(LXLocale* locale, unsigned step) {
     char* const p = block.data() + kMaxCharBytes - walk;
     for (size_t i = 0; i < walk; ++i) p[i] = static_cast<char>(i == 0 ? first : pair * (2 * i - 1));
     LXGetCharType(locale, p, LX_CTYPE1);
-    for (LXWChar code : {pair, first << 24 | pair << 8 | first}) LXGetCharTypeW(locale, code, LX_CTYPE3);
+    for (LXWChar code : {pair, LXWChar{first} << 24 | pair << 8 | first})
+      LXGetCharTypeW(locale, code, LX_CTYPE3);
     LXStringToUnicode(units.data(), kMaxCharBytes, locale, p, bytes, 0);
     for (LXShiftState state : {LX_SHIFT_SINGLE, LX_SHIFT_DOUBLE}) {
       LXGetCharTypeEx(locale, p, state, LX_CTYPE2);
