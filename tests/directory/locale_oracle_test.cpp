@@ -57,18 +57,6 @@ Text16 widen(const Text& text) {
 }
 
 using DatePtr = IcuPtr<UDateFormat, udat_close>;
-DatePtr open_date(UDateFormatStyle time, UDateFormatStyle date, const std::string& locale,
-                  const Text16& pattern = {}) {
-  UErrorCode error = U_ZERO_ERROR;
-  return DatePtr(udat_open(time, date, locale.c_str(), u"UTC", -1, pattern.data(),
-                           static_cast<int32_t>(pattern.size()), &error));
-}
-
-Text16 formatted(const DatePtr& format, UDate milliseconds) {
-  return icu([&](UChar* out, int32_t room, UErrorCode* status) {
-    return udat_format(format.get(), milliseconds, out, room, nullptr, status);
-  });
-}
 
 /// The ways in which what is written may differ, as locale_differences.txt explains them. What ICU is asked, or
 /// both texts, are changed accordingly.
@@ -214,9 +202,14 @@ struct TimePeer {
 
   Text16 operator()(UDateFormatStyle time, UDateFormatStyle date, Text16 pattern, UDate when,
                     const Kinds& kinds) {
+    const auto open = [](UDateFormatStyle t, UDateFormatStyle d, const char* locale, const Text16& text) {
+      UErrorCode error = U_ZERO_ERROR;
+      const auto length = static_cast<int32_t>(text.size());
+      return DatePtr(udat_open(t, d, icu_locale(locale).c_str(), u"UTC", -1, text.data(), length, &error));
+    };
     DatePtr& format = formats[{Text16{char16_t(time + 2), char16_t(date + 2)} + pattern, kinds}];
     if (!format) {
-      const DatePtr own = open_date(time, date, icu_locale(territory.locale), pattern);
+      const DatePtr own = open(time, date, territory.locale, pattern);
       pattern = icu([&](UChar* out, int32_t room, UErrorCode* error) {
         return udat_toPattern(own.get(), 0, out, room, error);
       });
@@ -224,10 +217,11 @@ struct TimePeer {
       if (has(kinds, "era")) pattern = with(pattern, u"G ", u"");
       if (has(kinds, "stand_alone")) pattern = with(pattern, u"EEEE", u"cccc");
       const bool of_territory = territory.language == std::string(language.name) && !has(kinds, "one_language");
-      const char* const texts = of_territory ? territory.locale : language.locale;
-      format = open_date(UDAT_PATTERN, UDAT_PATTERN, icu_locale(texts), pattern);
+      format = open(UDAT_PATTERN, UDAT_PATTERN, of_territory ? territory.locale : language.locale, pattern);
     }
-    return formatted(format, when);
+    return icu([&](UChar* out, int32_t room, UErrorCode* error) {
+      return udat_format(format.get(), when, out, room, nullptr, error);
+    });
   }
 };
 
