@@ -1,5 +1,5 @@
 #!/bin/bash
-# Real and long texts through the command-line programs, beside the system's own iconv, sort and gencat; and the commands
+# Real and long texts through the command-line programs, beside the system's own iconv and gencat; and the commands
 # of the README. What the programs write and say about small texts stands in tests/cases/cli.
 # Arguments: source directory, build directory.
 set -euE -o pipefail
