@@ -47,15 +47,10 @@ class Comparison {
     check_single_bytes();
     check_from_unicode();
     check_characters();
-    if (model_.is_multibyte()) {
-      for (size_t field : {cp::kFullWidth, cp::kPairs, cp::kTypeTrie, cp::kTypeRecords})
-        EXPECT_EQ(u16(field) % 4, 0U);
-      check_other_sequences();
-      return;
-    }
-    for (size_t field = cp::kFullWidth; field < cp::kFixedBytes; field += 2) EXPECT_EQ(u16(field), 0U);
-    EXPECT_EQ(payload().size(), cp::kFixedBytes);
-    EXPECT_TRUE(codepage_.object.sections[1].empty());
+    if (!model_.is_multibyte()) return;
+    for (size_t field : {cp::kFullWidth, cp::kPairs, cp::kTypeTrie, cp::kTypeRecords})
+      EXPECT_EQ(u16(field) % 4, 0U);
+    check_other_sequences();
   }
 
  private:
@@ -265,10 +260,8 @@ TEST(EveryCodepage, HoldsWhatItsSourceSaysAndConverts) {
   const Library library(LEXICOR_LOCALE_DIR);
   for (const ShippedCodepage& codepage : shipped_codepages()) {
     SCOPED_TRACE(codepage.name.name);
-    std::stringstream text;
-    write_ucm(text, codepage.source);
-    EXPECT_TRUE(text.str() == codepage.text) << "not in the form that is written";
-    const CompiledObject compiled = compile_object(text, "source", codepage.name, {});
+    std::ifstream source(LEXICOR_DATA_DIR "/" + source_file_name(codepage.name));
+    const CompiledObject compiled = compile_object(source, "source", codepage.name, {});
     EXPECT_TRUE(compiled.bytes == write_object(codepage.object));
     std::istringstream dump(dump_object(codepage.object, codepage.name, nullptr, "object"));
     EXPECT_TRUE(dump.str() == kept(codepage.source, compiled));

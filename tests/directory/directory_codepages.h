@@ -2,7 +2,6 @@
 #pragma once
 
 #include <fstream>
-#include <sstream>
 #include <string>
 #include <vector>
 
@@ -13,7 +12,6 @@ namespace lx::test {
 
 struct ShippedCodepage {
   lexicor_data::ObjectName name;
-  std::string text;  // of the source
   lexicor_data::CodepageSource source;
   lexicor_data::ObjectFile object;
   lexicor_data::CodepageModel model;  // of the object
@@ -36,11 +34,10 @@ inline std::vector<ShippedCodepage> shipped_codepages() {
   std::vector<ShippedCodepage> all;
   for (const ObjectName& name : read_source_control(LEXICOR_DATA_DIR).objects) {
     if (name.type != lexicor_data::ObjectType::kCodepage) continue;
-    std::stringstream text;
-    text << std::ifstream(LEXICOR_DATA_DIR "/" + source_file_name(name), std::ios::binary).rdbuf();
+    std::ifstream source(LEXICOR_DATA_DIR "/" + source_file_name(name));
     const ObjectFile object =
         read_object(read_file(LEXICOR_LOCALE_DIR "/" + object_file_name(name)), name.name);
-    all.push_back({name, text.str(), read_ucm(text, name.name), object, unpack_codepage(object, name)});
+    all.push_back({name, read_ucm(source, name.name), object, unpack_codepage(object, name)});
   }
   return all;
 }

@@ -103,10 +103,6 @@ std::string shown(uint32_t u) {
   snprintf(digits, sizeof(digits), "U+%04X", u);
   return u == kNone ? "none" : digits;
 }
-std::string shown(const std::string& bytes) {
-  return testing::PrintToString(bytes);
-}
-
 /// Calls `visit(code)` for every character that the codepage's bytes can form: the first bytes of longer
 /// characters with all second bytes, and of those that are longer still the ones that the source maps.
 void for_each_code(const ShippedCodepage& codepage, const std::function<void(uint32_t)>& visit) {
@@ -136,7 +132,8 @@ void compare(const ShippedCodepage& codepage, const std::string& peer_name, cons
                        : theirs == kNone                      ? "only-ours"
                                                               : "other-value";
     differences->add(head, std::string("to-unicode ") + kind,
-                     shown(text) + ":" + shown(ours) + "/" + shown(theirs));
+                     testing::PrintToString(text) + ":" + testing::PrintToString(ours) + "/" +
+                         testing::PrintToString(theirs));
   });
   for (uint32_t u = 0; u <= 0xFFFF; ++u) {
     if (u >= 0xD800 && u <= 0xDFFF) continue;
@@ -151,7 +148,8 @@ void compare(const ShippedCodepage& codepage, const std::string& peer_name, cons
       if (read != u && read != kNone) place = peer_name + " *", kind += "-" + family(u, read);
     }
     differences->add(place, "from-unicode " + kind,
-                     codepage.source.name + " " + shown(u) + ":" + shown(ours) + "/" + shown(theirs));
+                     codepage.source.name + " " + shown(u) + ":" + testing::PrintToString(ours) + "/" +
+                         testing::PrintToString(theirs));
   }
 }
 
