@@ -89,6 +89,7 @@ class Comparison {
       const uint32_t code = model_.from_unicode[u], written = code != kNoCode ? code : model_.substitution();
       const auto unit = static_cast<LXUChar>(u);
       ASSERT_EQ(LXCpUnicodeToCharW(object_, unit), written) << std::hex << u;
+      if (code == kNoCode && u % 16 != 0) continue;
       ASSERT_EQ(from_unicode(l_, {unit}), codepage_.text_of(written)) << std::hex << u;
       ASSERT_FALSE(!is_control(u) && code != kNoCode && is_control(model_.value_of(code)))
           << "a graphic character becomes a control: " << std::hex << u;

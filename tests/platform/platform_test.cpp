@@ -1,8 +1,7 @@
 // The standalone platform layer: environment, once-only blocks and trace; locks are seen where threads load
-// objects. What happens at the start or the end of a process, or depends on its environment, is seen from outside: the program runs in a role (see
-// kRoles at the end), and tests/cases/cli/platform.txt says what that writes.
+// objects. What happens at the start or the end of a process, or depends on its environment, is seen from outside:
+// the program runs in a role (kRoles), and tests/cases/cli/platform.txt says what that writes.
 #include <gtest/gtest.h>
-#include <pthread.h>
 #include <sys/auxv.h>
 #include <unistd.h>
 

@@ -2,6 +2,7 @@
 // loading has accepted a codepage, none of it may leave the object's sections or read beyond a character.
 #pragma once
 
+#include <algorithm>
 #include <stdexcept>
 #include <string>
 #include <vector>
@@ -20,6 +21,7 @@ inline void look_up(LXLocale* locale, unsigned step) {
   const LXObject* const object = locale->codepage;
   const Codepage& cp = codepage_of(*object);
   std::vector<char> block(kMaxCharBytes), other(kMaxCharBytes);
+  std::vector<char> followed(2 * kMaxCharBytes);  // a shift byte has its character behind it
   std::vector<LXUChar> units(kMaxCharBytes);
   for (unsigned pair = 0; pair <= 0xFFFF; pair += step) {
     const uint8_t first = static_cast<uint8_t>(pair >> 8);
@@ -27,12 +29,13 @@ inline void look_up(LXLocale* locale, unsigned step) {
     const int32_t bytes = static_cast<int32_t>(walk);
     char* const p = block.data() + kMaxCharBytes - walk;
     for (size_t i = 0; i < walk; ++i) p[i] = static_cast<char>(i == 0 ? first : pair * (2 * i - 1));
+    std::copy(p, p + walk, followed.begin());
     LXGetCharType(locale, p, LX_CTYPE1);
     for (LXWChar code : {pair, LXWChar{first} << 24 | pair << 8 | first})
       LXGetCharTypeW(locale, code, LX_CTYPE3);
     LXStringToUnicode(units.data(), kMaxCharBytes, locale, p, bytes, 0);
     for (LXShiftState state : {LX_SHIFT_SINGLE, LX_SHIFT_DOUBLE}) {
-      LXGetCharTypeEx(locale, p, state, LX_CTYPE2);
+      LXGetCharTypeEx(locale, followed.data(), state, LX_CTYPE2);
       LXStringToUnicodeEx(units.data(), kMaxCharBytes, locale, p, state, bytes, 0);
     }
     LXCpStrToUnicode(object, p, bytes, units.data());
