@@ -10,6 +10,7 @@
 #include "core/lxformat.h"
 #include "support/conversion.h"
 #include "support/tiny_codepages.h"
+#include "support/use_codepage.h"
 
 namespace lx::test {
 namespace {
@@ -134,70 +135,17 @@ void compare(const S& s, const LXObject* object, std::mt19937* random, unsigned 
   }
 }
 
-/// Calls everything that looks up characters with every pair of bytes, at the very end of a block.
-void look_up(CodepageObject* made, unsigned step) {
-  const LXObject* object = made->object();
-  LXLocale* locale = made->locale();
-  const Codepage& cp = codepage_of(*object);
-  std::vector<char> block(4);
-  std::vector<LXUChar> units(4);
-  uint32_t seen = 0;
-  for (unsigned pair = 0; pair <= 0xFFFF; pair += step) {
-    const uint8_t first = static_cast<uint8_t>(pair >> 8);
-    const size_t walk = cp.length(first) < 2 ? cp.width : cp.length(first);
-    char* p = block.data() + 4 - walk;
-    for (size_t i = 0; i < walk; ++i) p[i] = static_cast<char>(i == 0 ? first : pair * (2 * i - 1));
-    const int32_t bytes = static_cast<int32_t>(walk);
-    if (cp.width > 1) {
-      const auto record = fmt::TypeRecord::read(LXGetMbCtype(object, p));
-      seen += LXCpMbToUnicode(object, p) + record.type + record.case_delta;
-    }
-    seen += LXGetCharType(locale, p, LX_CTYPE1);
-    seen += LXGetCharTypeW(locale, static_cast<LXWChar>(pair), LX_CTYPE1);
-    seen += static_cast<uint32_t>(LXStringToUnicode(units.data(), 4, locale, p, bytes, 0));
-    for (LXShiftState state : {LX_SHIFT_SINGLE, LX_SHIFT_DOUBLE})
-      seen += static_cast<uint32_t>(LXStringToUnicodeEx(units.data(), 4, locale, p, state, bytes, 0));
-    seen += static_cast<uint32_t>(LXCpStrToUnicode(object, p, bytes, units.data()));
-  }
-  EXPECT_NE(seen, 0u);
-}
-
-/// Walks and converts a text of all bytes that ends anywhere, in every form, and as a stream.
-void use_text(LXLocale* locale) {
+/// Everything, and a stream.
+void use_everything(LXLocale* locale, unsigned step) {
+  look_up(locale, step);
+  use_text(locale, step);
   std::string all;
   for (int b = 0; b < 512; ++b) all.push_back(static_cast<char>(b < 256 ? b : 511 - b));
-  for (size_t cut = 0; cut < kMaxCharBytes; ++cut) {
-    const std::vector<char> text(all.begin(), all.end() - static_cast<ptrdiff_t>(cut));  // of its exact size
-    const char *const data = text.data(), *const end = data + text.size();
-    const int32_t bytes = static_cast<int32_t>(text.size());
-    LXUChar unicode[1100];
-    LXWChar codes[1100];
-    char out[5200];
-    LXShiftState end_state = LX_SHIFT_SINGLE;
-    EXPECT_LE(LXMoveStringPointer(locale, data, bytes, 0), end);
-    const int32_t units = LXStringToUnicode(unicode, 1100, locale, data, bytes, 0);
-    ASSERT_GE(units, 0);
-    EXPECT_LE(units, bytes);
-    const int32_t wide = LXMbToWide(locale, codes, 1100, data, bytes, 0);
-    EXPECT_EQ(wide, LXNumChars(locale, data, bytes));
-    EXPECT_GE(LXWideToMb(locale, out, sizeof(out), codes, wide, 0), 0);
-    for (LXShiftState state : {LX_SHIFT_SINGLE, LX_SHIFT_DOUBLE}) {
-      EXPECT_LE(LXMoveStringPointerEx(locale, data, state, bytes, &end_state, 0), end);
-      EXPECT_GE(LXMbToWideEx(locale, codes, 1100, data, state, bytes, 0), 0);
-      EXPECT_GE(LXUnicodeToStringEx(locale, out, state, sizeof(out), unicode, units, LX_TERMINATE), 0);
-      EXPECT_GE(LXConvertStringEx(locale, out, state, 300, locale, data, state, bytes, LX_TERMINATE), 0);
-    }
-  }
   Conversion conversion(locale, locale);
   size_t at = 0;
   for (int steps = 0; steps < 5000 && at < all.size(); ++steps)
     at += conversion.call(all.substr(at, 5), 8).taken;
   EXPECT_EQ(at, all.size()) << "the stream stands still";
-}
-
-void use_everything(CodepageObject* made, unsigned step) {
-  look_up(made, step);
-  use_text(made->locale());
 }
 
 class Validate : public testing::Test {
@@ -345,7 +293,7 @@ TEST_F(Validate, NotRefused) {
     change.apply(cp.file.sections);
     CodepageObject made(cp.file.id, cp.file.sections);
     ASSERT_EQ(made.code(), LX_OK);
-    use_everything(&made, 3);
+    use_everything(made.locale(), 3);
     cp.file.sections.resize(format::kMaxSections);
     compare(cp.file.sections, made.object(), &random, 20);
   }
@@ -357,7 +305,7 @@ TEST_F(Validate, WholeAndEveryTruncation) {
     SCOPED_TRACE(cp.file.name);
     CodepageObject whole(cp.file.id, cp.file.sections);
     ASSERT_EQ(whole.code(), LX_OK);
-    use_everything(&whole, 1);
+    use_everything(whole.locale(), 1);
     compare(cp.file.sections, whole.object(), &random, 1);
     for (size_t section = 0; section < cp.file.sections.size(); ++section) {
       const size_t size = cp.file.sections[section].size();
@@ -366,7 +314,7 @@ TEST_F(Validate, WholeAndEveryTruncation) {
         sections[section].resize(cut);
         CodepageObject made(cp.file.id, sections);
         EXPECT_TRUE(section != 0 || made.code() == LX_E_CORRUPT) << cut;
-        if (made.code() == LX_OK) look_up(&made, 997);
+        if (made.code() == LX_OK) look_up(made.locale(), 997);
       }
     }
   }
@@ -398,7 +346,7 @@ TEST_F(Validate, RandomDamage) {
       ASSERT_TRUE(made.code() == LX_OK || made.code() == LX_E_CORRUPT);
       ++(made.code() == LX_OK ? accepted : refused);
       if (made.code() != LX_OK) continue;
-      use_everything(&made, 251);
+      use_everything(made.locale(), 251);
       compare(sections, made.object(), &random, 500);
       if (HasFatalFailure()) return;
     }

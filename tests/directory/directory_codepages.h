@@ -1,37 +1,45 @@
-// The codepages of the shipped directory as their sources say, for tests that compare the library with them.
+// The codepages of the shipped directory, their sources and what the objects hold of them.
 #pragma once
 
+#include <fstream>
 #include <string>
 #include <vector>
 
-#include "support/forms.h"
-#include "ucm.h"
+#include "codepage_unpack.h"
+#include "compile.h"
 
 namespace lx::test {
 
 struct ShippedCodepage {
-  uint16_t id;
+  lexicor_data::ObjectName name;
   lexicor_data::CodepageSource source;
+  lexicor_data::ObjectFile object;
+  lexicor_data::CodepageModel model;  // of the object
 
   bool shift() const { return source.kind == lexicor_data::CodepageClass::kShiftStateful; }
+
+  /// The bytes of one character as a whole text: between Shift-Out and Shift-In where it is a double-byte character
+  /// of a shift-stateful codepage.
+  std::string text_of(uint32_t code) const {
+    std::string bytes;
+    for (size_t i = lexicor_data::code_bytes(code); i-- > 0;) bytes += static_cast<char>(code >> 8 * i);
+    if (!shift() || code <= 0xFF) return bytes;
+    return static_cast<char>(lexicor_data::kShiftOut) + bytes + static_cast<char>(lexicor_data::kShiftIn);
+  }
 };
 
-/// All codepages of the control file in its order, read once.
-const std::vector<ShippedCodepage>& shipped_codepages();
-
-/// The bytes of one character as a whole text: between Shift-Out and Shift-In where it is a double-byte
-/// character of a shift-stateful codepage.
-std::string text_of_code(const ShippedCodepage& codepage, uint32_t code, size_t bytes);
-
-/// A text from Unicode, and a whole one to it, with shift bytes where the codepage has them.
-inline std::string from_unicode(LXLocale* l, const Units& text) {
-  const auto encode_closed = [&](char* to, int32_t room) {
-    return LXUnicodeToStringEx(l, to, LX_SHIFT_SINGLE, room, text.data(), count_of(text), LX_TERMINATE) - 1;
-  };
-  return made<char>(encode_closed, 5 * text.size() + 2);
-}
-inline Units to_unicode(LXLocale* l, const std::string& bytes) {
-  return decode(kEx, l, bytes);
+/// All codepages of the control file in its order.
+inline std::vector<ShippedCodepage> shipped_codepages() {
+  using namespace lexicor_data;
+  std::vector<ShippedCodepage> all;
+  for (const ObjectName& name : read_source_control(LEXICOR_DATA_DIR).objects) {
+    if (name.type != lexicor_data::ObjectType::kCodepage) continue;
+    std::ifstream source(LEXICOR_DATA_DIR "/" + source_file_name(name));
+    const ObjectFile object =
+        read_object(read_file(LEXICOR_LOCALE_DIR "/" + object_file_name(name)), name.name);
+    all.push_back({name, read_ucm(source, name.name), object, unpack_codepage(object, name)});
+  }
+  return all;
 }
 
 }  // namespace lx::test

@@ -1,5 +1,5 @@
-// Every shipped codepage against ICU's converter of the same name in the source, and against iconv where glibc
-// has the charset: all characters of up to four bytes, and all 65,536 Unicode values. What differs is counted
+// Every shipped codepage, whose object is what the library converts by (codepages_test.cpp), against ICU's converter
+// of the same name in the source, and against iconv where glibc has the charset: all characters of up to four bytes, and all 65,536 Unicode values. What differs is counted
 // by codepage, direction and kind, and must be what peer_differences.txt lists, each line with its reason.
 #include <gtest/gtest.h>
 #include <iconv.h>
@@ -10,13 +10,11 @@
 #include <functional>
 #include <map>
 #include <memory>
-#include <set>
 #include <sstream>
 
 #include "directory/directory_codepages.h"
-#include "directory/icu_peer.h"
 #include "directory/listed_differences.h"
-#include "support/library.h"
+#include "import/icu_text.h"
 
 namespace lx::test {
 namespace {
@@ -77,29 +75,6 @@ Convert iconv_of(const std::string& to, const std::string& from) {
   };
 }
 
-/// The library's own conversion, in the same shape.
-Peer library_peer(const ShippedCodepage& codepage) {
-  const std::shared_ptr<LXLocale> locale = locale_with(codepage.source.name);
-  const std::string substitution(1, static_cast<char>(codepage.source.substitution));
-  const auto decode = [locale](const std::string& text) {
-    std::string bytes;
-    for (LXUChar u : test::to_unicode(locale.get(), text))
-      bytes += {static_cast<char>(u), static_cast<char>(u >> 8)};
-    return bytes;
-  };
-  std::set<uint32_t> substitutes_for;
-  if (codepage.source.utf8) substitutes_for.insert(codepage.source.substitution);
-  for (const lexicor_data::Mapping& mapping : codepage.source.mappings)
-    if (mapping.precision != 3 && mapping.bytes == 1 && mapping.code == codepage.source.substitution)
-      substitutes_for.insert(mapping.unicode);
-  const auto encode = [=](const std::string& unit) {
-    const auto u = static_cast<LXUChar>(static_cast<uint8_t>(unit[0]) | static_cast<uint8_t>(unit[1]) << 8);
-    const std::string text = test::from_unicode(locale.get(), {u});
-    return text == substitution && substitutes_for.count(u) == 0 ? std::string() : text;
-  };
-  return {decode, encode};
-}
-
 bool is_private(uint32_t u) {
   return u >= 0xE000 && u <= 0xF8FF;
 }
@@ -110,7 +85,7 @@ std::string family(uint32_t written, uint32_t read) {
   const auto form = [](UChar32 c) {
     UErrorCode status = U_ZERO_ERROR;
     const auto unit = static_cast<UChar>(c);
-    return icu([&](UChar* out, int32_t room, UErrorCode* error) {
+    return lexicor_import::icu_text("NFKC", [&](UChar* out, int32_t room, UErrorCode* error) {
       return unorm2_normalize(unorm2_getNFKCInstance(&status), &unit, 1, out, room, error);
     });
   };
@@ -128,52 +103,53 @@ std::string shown(uint32_t u) {
   snprintf(digits, sizeof(digits), "U+%04X", u);
   return u == kNone ? "none" : digits;
 }
-std::string shown(const std::string& bytes) {
-  return testing::PrintToString(bytes);
-}
-
-/// Calls `visit(text)` for every character that the codepage's bytes can form: the first bytes of longer
+/// Calls `visit(code)` for every character that the codepage's bytes can form: the first bytes of longer
 /// characters with all second bytes, and of those that are longer still the ones that the source maps.
-void for_each_text(const ShippedCodepage& codepage, const std::function<void(const std::string&)>& visit) {
-  const auto byte = [](uint32_t b) { return static_cast<char>(b); };
+void for_each_code(const ShippedCodepage& codepage, const std::function<void(uint32_t)>& visit) {
   for (uint32_t b = 0; b <= 0xFF; ++b) {
     const bool shift_byte = codepage.shift() && (b == lexicor_data::kShiftOut || b == lexicor_data::kShiftIn);
-    if (codepage.source.leads[b] == 1 && !shift_byte) visit(std::string(1, byte(b)));
+    if (codepage.source.leads[b] == 1 && !shift_byte) visit(b);
     const bool leads = codepage.shift() ? b >= 0x40 && b <= 0xFE : codepage.source.leads[b] == 2;
-    if (!leads) continue;
-    for (uint32_t c = codepage.shift() ? 0x40 : 0; c <= 0xFF; ++c) visit(text_of_code(codepage, b << 8 | c, 2));
+    for (uint32_t c = codepage.shift() ? 0x40 : 0; leads && c <= 0xFF; ++c) visit(b << 8 | c);
   }
   for (const lexicor_data::Mapping& mapping : codepage.source.mappings)
-    if (mapping.bytes > 2 && mapping.precision != 1 && mapping.unicode <= 0xFFFF)
-      visit(text_of_code(codepage, mapping.code, mapping.bytes));
+    if (mapping.bytes > 2 && mapping.precision != 1 && mapping.unicode <= 0xFFFF) visit(mapping.code);
 }
 
 void compare(const ShippedCodepage& codepage, const std::string& peer_name, const Peer& peer,
              ListedDifferences* differences) {
-  const Peer library = library_peer(codepage);
   const std::string head = peer_name + " " + codepage.source.name;
-  for_each_text(codepage, [&](const std::string& text) {
-    const uint32_t ours = library.to_unicode(text), theirs = peer.to_unicode(text);
+  const auto value_of = [&](uint32_t code) {
+    const uint32_t u = codepage.model.value_of(code);
+    return u == lexicor_data::kNoValue ? kNone : u;
+  };
+  for_each_code(codepage, [&](uint32_t code) {
+    const std::string text = codepage.text_of(code);
+    const uint32_t ours = value_of(code), theirs = peer.to_unicode(text);
     if (ours == theirs) return;
     const char* kind = is_private(ours) || is_private(theirs) ? "private-use"
                        : ours == kNone                        ? "only-theirs"
                        : theirs == kNone                      ? "only-ours"
                                                               : "other-value";
     differences->add(head, std::string("to-unicode ") + kind,
-                     shown(text) + ":" + shown(ours) + "/" + shown(theirs));
+                     testing::PrintToString(text) + ":" + testing::PrintToString(ours) + "/" +
+                         testing::PrintToString(theirs));
   });
   for (uint32_t u = 0; u <= 0xFFFF; ++u) {
     if (u >= 0xD800 && u <= 0xDFFF) continue;
-    const std::string ours = library.from_unicode(u), theirs = peer.from_unicode(u);
+    const uint32_t code = codepage.model.from_unicode[u];
+    const std::string ours = code != lexicor_data::kNoCode ? codepage.text_of(code) : "";
+    const std::string theirs = peer.from_unicode(u);
     if (ours == theirs) continue;
     std::string place = head, kind = is_private(u) ? "private-use" : "other-bytes";
     if (!is_private(u) && ours.empty() != theirs.empty()) {
-      const uint32_t read = ours.empty() ? peer.to_unicode(theirs) : library.to_unicode(ours);
+      const uint32_t read = ours.empty() ? peer.to_unicode(theirs) : value_of(code);
       kind = ours.empty() ? "only-theirs" : "only-ours";
       if (read != u && read != kNone) place = peer_name + " *", kind += "-" + family(u, read);
     }
     differences->add(place, "from-unicode " + kind,
-                     codepage.source.name + " " + shown(u) + ":" + shown(ours) + "/" + shown(theirs));
+                     codepage.source.name + " " + shown(u) + ":" + testing::PrintToString(ours) + "/" +
+                         testing::PrintToString(theirs));
   }
 }
 
@@ -210,7 +186,6 @@ std::vector<std::string> iconv_names(const ShippedCodepage& codepage) {
 }
 
 TEST(Peers, CodepagesConvertAsInIcuAndIconv) {
-  const Library library(LEXICOR_LOCALE_DIR);
   ListedDifferences differences;
   size_t icu = 0, iconv = 0;
   for (const ShippedCodepage& codepage : shipped_codepages()) {

@@ -1,8 +1,7 @@
 // The standalone platform layer: environment, once-only blocks and trace; locks are seen where threads load
-// objects. What happens at the start or the end of a process, or depends on its environment, is seen from outside: the program runs in a role (see
-// kRoles at the end), and tests/cases/cli/platform.txt says what that writes.
+// objects. What happens at the start or the end of a process, or depends on its environment, is seen from outside:
+// the program runs in a role (kRoles), and tests/cases/cli/platform.txt says what that writes.
 #include <gtest/gtest.h>
-#include <pthread.h>
 #include <sys/auxv.h>
 #include <unistd.h>
 
@@ -12,6 +11,7 @@
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <map>
 #include <mutex>
 #include <set>
 #include <string>
@@ -258,10 +258,7 @@ TEST(Trace, LevelsChangeWhenItIsConfigured) {
   EXPECT_EQ(RAS1_Sync(&unit), 0u);
 }
 
-const struct {
-  const char* name;
-  int (*run)();
-} kRoles[] = {
+const std::map<std::string, int (*)()> kRoles = {
     {"environment", role_environment},
     {"end_order", role_end_order},
     {"end_waits", role_end_waits},
@@ -279,9 +276,7 @@ const struct {
 int main(int argc, char** argv) {
   if (argc == 3 && strcmp(argv[1], "--role") == 0) {
     alarm(60);  // a role that hangs fails
-    for (const auto& role : kRoles)
-      if (strcmp(role.name, argv[2]) == 0) return role.run();
-    return 99;
+    return kRoles.at(argv[2])();
   }
   testing::InitGoogleTest(&argc, argv);
   return RUN_ALL_TESTS();

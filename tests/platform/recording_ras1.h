@@ -3,7 +3,9 @@
 #pragma once
 
 #include <cstdint>
+#include <mutex>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "platform/ras1.h"
@@ -28,13 +30,22 @@ struct TraceRecord {
 };
 
 /// The one trace of the process; safe to use from every thread.
-class RecordingTrace {
- public:
-  /// Sets the level of all units (sum of the RAS1_LEVEL bits; 0, as at the start: trace nothing).
-  static void set_level(uint32_t level);
+struct RecordingTrace {
+  static inline std::mutex mutex;
+  static inline uint32_t level = 0;
+  static inline std::vector<TraceRecord> records;
 
+  /// Sets the level of all units (sum of the RAS1_LEVEL bits; 0, as at the start: trace nothing).
+  static void set_level(uint32_t new_level) {
+    std::lock_guard<std::mutex> held(mutex);
+    level = new_level;
+    __atomic_fetch_add(&RAS1_ChangeCounter, 1, __ATOMIC_RELAXED);
+  }
   /// Returns the records in the order in which they were made, and forgets them.
-  static std::vector<TraceRecord> take();
+  static std::vector<TraceRecord> take() {
+    std::lock_guard<std::mutex> held(mutex);
+    return std::exchange(records, {});
+  }
 };
 
 }  // namespace lx::test

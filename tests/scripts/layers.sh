@@ -6,6 +6,8 @@ cd "$1"
 
 bad=0
 complain() { echo "$1" >&2; bad=1; }
+# The quoted includes of a folder: file, line and header.
+includes() { grep -rnoP '^#include "\K[^"]+' "$1" --include='*.cpp' --include='*.h' || true; }
 
 declare -A below=(
   [platform]="platform"
@@ -22,13 +24,12 @@ declare -A below=(
 for room in src/*/; do
   room=$(basename "$room")
   [ -n "${below[$room]:-}" ] || { complain "src/$room: a room that the layers do not know"; continue; }
-  while IFS=: read -r file line text; do
-    included=${text#*\"}; included=${included%%/*}
-    case " ${below[$room]} lx lx.h\" nls1.h\" " in
-      *" $included "*) ;;
-      *) complain "$file:$line: src/$room may not include $text" ;;
+  while IFS=: read -r file line header; do
+    case " ${below[$room]} lx lx.h nls1.h " in
+      *" ${header%%/*} "*) ;;
+      *) complain "$file:$line: src/$room may not include $header" ;;
     esac
-  done < <(grep -rn '^#include "' "src/$room" || true)
+  done < <(includes "src/$room")
 done
 
 # Symbols: what a room leaves undefined may stand in it, below it, or outside. Of what stands above all rooms the
@@ -48,15 +49,12 @@ for room in "${!below[@]}"; do
   done
 done
 
-while IFS=: read -r file line text; do
-  case "$text" in
-    *'"lx.h"'* | *'"lx/'* | *'"nls1.h"'*) ;;
-    *)
-      header=${text#*\"}; header=${header%\"*}
-      [ -f "tools/lexicor/$header" ] || complain "$file:$line: the command line uses public headers only, not $text"
-      ;;
+while IFS=: read -r file line header; do
+  case "$header" in
+    lx.h | lx/* | nls1.h) ;;
+    *) [ -f "tools/lexicor/$header" ] || complain "$file:$line: the command line uses public headers only, not $header" ;;
   esac
-done < <(grep -rn '^#include "' tools/lexicor --include='*.cpp' --include='*.h' || true)
+done < <(includes tools/lexicor)
 
 # The library itself: no C++ containers, exceptions, new or run-time types.
 while IFS= read -r hit; do complain "$hit: src/ uses libc only"; done < <(

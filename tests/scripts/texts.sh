@@ -1,5 +1,5 @@
 #!/bin/bash
-# Real and long texts through the command-line programs, beside the system's own iconv, sort and gencat; and the commands
+# Real and long texts through the command-line programs, beside the system's own iconv and gencat; and the commands
 # of the README. What the programs write and say about small texts stands in tests/cases/cli.
 # Arguments: source directory, build directory.
 set -euE -o pipefail
@@ -35,25 +35,6 @@ for shift in '' x xx; do
     convert IBM939 UTF-8 mapped | cmp - <(printf '%s' "$shift" | "$lexicor" map "$mapping" && repeated sample)
   done
 done
-
-# --- 100,000 lines: keys beside comparison, nothing lost, and the binary order of the system.
-python3 -c '
-import random
-random.seed(1)
-for _ in range(100000):
-    print("".join(random.choices("aàbcdhlnñoôszAÀCHÑ \u0301\u00ad-中ガ", k=random.randrange(9))))' >words
-LC_ALL=C sort words >binary
-"$lexicor" sort --locale English@BINARY words | cmp - binary
-for locale in English@Default Spanish@SpanishTraditional French@FrenchCanadian Vietnamese@Vietnamese; do
-  "$lexicor" sort --locale $locale -o compared words
-  "$lexicor" sort --locale $locale --key words | cmp - compared
-  LC_ALL=C sort compared | cmp - binary
-done
-if script --version >/dev/null 2>&1; then
-  cat words words words >many
-  script -qec "'$lexicor' sort --locale English@Default --key -o out many" /dev/null >shown
-  grep -q ' 100 %' shown
-fi
 
 [ ! -s said ]
 

@@ -1,10 +1,7 @@
 // The catalog compiler's files: the way to a source and back, and damage. Their bytes, what sources become and
 // what is said of them stands in tests/cases/cli.
 #include <gtest/gtest.h>
-#include <unistd.h>
 
-#include <filesystem>
-#include <fstream>
 #include <iterator>
 #include <random>
 #include <sstream>
@@ -13,23 +10,17 @@
 #include "gencat.h"
 #include "lexicor/command.h"
 #include "support/damage.h"
+#include "support/object_files.h"
 
 namespace lexicor_gencat {
 namespace {
 
-namespace fs = std::filesystem;
 using lexicor_cli::Failure;
 
 // Texts of random bytes, of random characters and of odd shift bytes, as sources in UTF-8 and in the codepage
 // itself.
 TEST(CatalogCompiler, DumpCompilesToTheSameBytes) {
-  const fs::path directory = fs::path(testing::TempDir()) / ("lexicor-gencat-" + std::to_string(getpid()));
-  fs::create_directory(directory);
-  const std::string source = directory / "z.msg", file = directory / "z.cat", again = directory / "again.cat";
-  const auto contents = [](const std::string& path) {
-    std::ifstream in(path, std::ios::binary);
-    return std::string{std::istreambuf_iterator<char>(in), {}};
-  };
+  const lx::test::ScratchDirectory directory;
   lexicor_cli::Session session({LEXICOR_LOCALE_DIR});
   std::mt19937 random(20);
   auto below = [&](uint32_t limit) { return static_cast<uint32_t>(random() % limit); };
@@ -54,21 +45,21 @@ TEST(CatalogCompiler, DumpCompilesToTheSameBytes) {
       const std::string bytes = pack_catalog(catalog);
       for (const char* encoding : {"", codepage}) {
         Options options;
-        options.catalog = file;
-        options.output = source;
+        options.catalog = directory.file("z.cat");
+        options.output = directory.file("z.msg");
         options.source_encoding = encoding;
-        std::ofstream(file, std::ios::binary) << bytes;
+        directory.write_text("z.cat", bytes);
         dump(session, options);
-        options.catalog = again;
-        options.sources = {source};
+        options.catalog = directory.file("again.cat");
+        options.sources = {options.output};
         options.fresh = true;
         std::ostringstream log;
         ASSERT_TRUE(compile(session, options, log)) << log.str();
-        ASSERT_EQ(contents(again), bytes) << codepage << " as " << encoding << "\n" << contents(source);
+        const auto again = directory.read("again.cat");
+        ASSERT_EQ(std::string(again.begin(), again.end()), bytes) << codepage << " as " << encoding;
       }
     }
   }
-  fs::remove_all(directory);
 }
 
 TEST(CatalogCompiler, DamageIsNamedOrHarmless) {

@@ -1,41 +1,20 @@
-// What sources become and what is written of objects, where a transcript cannot show it: damaged objects, and
-// packing. tests/cases/cli says the rest, and faults_test.cpp what is wrong with sources.
+// Objects and sources, where a transcript cannot show it: damage, and what is not written. tests/cases/cli says the
+// rest, tests/cases/faults what is wrong with sources, and directory/codepages_test.cpp what every codepage holds.
 #include <gtest/gtest.h>
 
 #include <sstream>
 
 #include "compile.h"
 #include "core/lxobjtypes.h"
-#include "row_packer.h"
+#include "support/damage.h"
 #include "support/tiny_codepages.h"
-#include "ucm.h"
 
 namespace lexicor_data {
 namespace {
 
-// Equal rows once, contained rows reused.
-TEST(RowPacker, SharesRows) {
-  RowPacker<int> packer(0);
-  packer.place({{{1, 2, 3, 4}, 0}, {{2, 3}, 0}, {{4, 5}, 0}, {{1, 2, 3, 4}, 0}});
-  EXPECT_EQ(packer.pool(), (std::vector<int>{1, 2, 3, 4, 5}));
-}
-
-TEST(Ucm, WriterRefusesTextThatCannotBeReadBack) {
-  for (const char* text : {"a \"quoted\" word", "two\nlines"}) {
-    CodepageSource source;
-    source.source = text;
-    std::ostringstream out;
-    EXPECT_THROW(write_ucm(out, source), SourceError) << text;
-  }
-}
-
 // Whatever a byte of an object becomes, checking and dumping end with a source or a SourceError, and the source
 // of a sort is one that is read and written again.
 TEST(Objects, AnyByteMayBeWrong) {
-  const auto built_in = [](const lx::BuiltIn& object) {
-    const lx::Bytes payload = object.sections.section[0];
-    return std::vector<ByteVector>{ByteVector(payload.data, payload.data + payload.size)};
-  };
   std::istringstream sort(
       "@defaults 0001 0001\n@insert secondary ; 0041\n@specials 2700..27FF ; 0400\n@primaries 4E00..4FFF ; "
       "8000\n"
@@ -47,8 +26,8 @@ TEST(Objects, AnyByteMayBeWrong) {
   const struct {
     ObjectName name;
     std::vector<ByteVector> sections;
-  } objects[] = {{{ObjectType::kLanguage, 1, "L", 0}, built_in(lx::kBuiltInLanguage)},
-                 {{ObjectType::kTerritory, 1, "T", 0}, built_in(lx::kBuiltInTerritory)},
+  } objects[] = {{{ObjectType::kLanguage, 1, "L", 0}, {lx::test::payload_of(lx::kBuiltInLanguage)}},
+                 {{ObjectType::kTerritory, 1, "T", 0}, {lx::test::payload_of(lx::kBuiltInTerritory)}},
                  {{ObjectType::kCodepage, 1, "C", 0}, lx::test::tiny_euc().file.sections},
                  {sort_name, read_object(compile_object(sort, "sort", sort_name, {}).bytes, "sort").sections}};
   for (const auto& object : objects) {
@@ -66,17 +45,17 @@ TEST(Objects, AnyByteMayBeWrong) {
     };
     use(sound);
     EXPECT_EQ(refused, 0u) << object.name.name;
-    uint32_t step = 0;
-    for (size_t at = 0; at < sound.size(); at += 1 + step % 23, ++step) {
-      for (const uint8_t value : {static_cast<uint8_t>(sound[at] ^ (1U << step % 8)), uint8_t{0xFF}}) {
-        ByteVector bytes = sound;
-        bytes[at] = value;
-        use(bytes);
-      }
-    }
-    for (size_t size = 0; size < sound.size(); size += 1 + size / 16)
-      use(ByteVector(sound.begin(), sound.begin() + static_cast<std::ptrdiff_t>(size)));
+    lx::test::for_each_damage(sound, use, 23);
     EXPECT_GT(refused, 0u) << object.name.name;
+  }
+}
+
+TEST(Objects, SourcesRefuseTextThatCannotBeReadBack) {
+  for (const char* text : {"a \"quoted\" word", "two\nlines"}) {
+    CodepageSource source;
+    source.source = text;
+    std::ostringstream out;
+    EXPECT_THROW(write_ucm(out, source), SourceError) << text;
   }
 }
 
