@@ -74,6 +74,8 @@ class CaseLocale {
                                                        {"thousands", LX_ITEM_THOUSANDS},
                                                        {"grouping", LX_ITEM_GROUPING},
                                                        {"digits", LX_ITEM_DIGITS},
+                                                       {"monetary-decimal", LX_ITEM_MONETARY_DECIMAL},
+                                                       {"monetary-thousands", LX_ITEM_MONETARY_THOUSANDS},
                                                        {"currency", LX_ITEM_CURRENCY},
                                                        {"currency-grouping", LX_ITEM_MONETARY_GROUPING},
                                                        {"currency-digits", LX_ITEM_CURRENCY_DIGITS},

@@ -6,10 +6,9 @@ namespace lx::test {
 
 namespace {
 
-template <class R>
-void compare(R& r, bool by_weight) {
+template <class R, class Door>
+void compare(R& r, const Door& door, bool by_weight) {
   const auto a = r.input(), b = r.input("", 0, "length2");
-  const auto door = by_weight ? R::Form::coll : R::Form::cmp;
   const int32_t result = door(r.l, a.data(), a.length, b.data(), b.length, r.flags);
   r.number(by_weight && r.l->sort != nullptr ? (result > 0) - (result < 0) : result);
 }
@@ -39,8 +38,8 @@ void key(R& r) {
 }  // namespace
 
 Families compare_families() {
-  return {{"compare", in_four_forms([](auto& r) { compare(r, false); })},
-          {"collate", in_four_forms([](auto& r) { compare(r, true); })},
+  return {{"compare", in_four_forms([](auto& r) { compare(r, r.form.cmp, false); })},
+          {"collate", in_four_forms([](auto& r) { compare(r, r.form.coll, true); })},
           {"key", in_four_forms([](auto& r) { key(r); })}};
 }
 

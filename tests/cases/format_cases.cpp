@@ -7,10 +7,31 @@ namespace lx::test {
 
 namespace {
 
-/// What was written at a size, with and without a null: the expected text in the form, the result and the code.
+/// What smaller buffers hold: whole characters that leave the single-byte state, as many as fit, and code 40 unless
+/// they are all. By characters, bytes are made in six for each, and then cut.
+template <class R, class Put>
+void expect_smaller(R& r, const Units& text, int32_t all, Put put) {
+  for (const uint32_t flags : {0u, uint32_t{LX_TERMINATE}, uint32_t{LX_TERMINATE | LX_CHARACTERS}})
+    for (int32_t size = 1; size <= all; ++size) {
+      SCOPED_TRACE("size " + std::to_string(size) + " flags " + std::to_string(flags));
+      const auto made = written(r.form, r.l, size, r.flags | flags,
+                                [&](auto* to, int32_t room) { return put(to, room, r.flags | flags); });
+      const bool chars = (flags & LX_CHARACTERS) != 0;
+      const size_t room = static_cast<size_t>(size) - (flags != 0 ? 1 : 0), most = R::kBytes ? 3 : 0;
+      const Units part = text.substr(0, chars || !R::kBytes ? room : made.text.size());
+      EXPECT_TRUE(made.text == part || (chars && R::kBytes && 6 * size < all + 4)) << shown(made.text);
+      EXPECT_TRUE(made.code == LX_E_SIZE || (made.code == LX_OK && (chars || part == text)));
+      EXPECT_EQ(made.result, (chars ? count_of(made.text) : count_of(made.units)) + (flags != 0 ? 1 : 0));
+      EXPECT_TRUE(chars || made.text == text || made.units.size() + most >= room);
+      EXPECT_EQ(decode(r.form, r.l, made.units + encode(r.form, r.l, units("1"))), made.text + units("1"));
+    }
+}
+
+/// What was written at a size, with and without a null: the expected text in the form, the result and the code. Where
+/// the case gives no size, at every smaller one too.
 template <class R, class Put>
 void expect_written(R& r, Put put) {
-  const int32_t size = r.given().number("size", 120);
+  const int32_t given = r.given().number("size", -1000), size = given != -1000 ? given : 120;
   const bool any = r.expected().has("any");
   static const CaseText nothing;
   const CaseText& text = any ? nothing : r.expected().text();
@@ -29,6 +50,9 @@ void expect_written(R& r, Put put) {
     const int32_t count = (r.flags & LX_CHARACTERS) != 0 ? count_of(text.values) : count_of(whole);
     EXPECT_EQ(result, returns != 0 ? returns : count + (null != 0));
   }
+  if (size == given || r.null || any || text.raw() || r.error != LX_OK || states.output != 0) return;
+  expect_smaller(r, text.units(), count_of(whole), put);
+  put(std::vector<typename R::Unit>(120).data(), 120, r.flags);  // stores the code of the case
 }
 
 Value::Kind kind_of(const std::string& word) {
@@ -85,6 +109,20 @@ void grouping_size(R& r) {
   EXPECT_EQ(next, word == "none" ? nullptr : text.data() + (word == "untouched" ? 77 : std::stoi(word)));
 }
 
+/// The class of what a text begins with, where "," or "." separates and "pos" and "-" are signs, and the place behind it.
+template <class R>
+void digit(R& r) {
+  const auto text = r.input("", states.text);
+  const auto given = [&](const char* ascii) {
+    return Encoded<typename R::Form>(r.cp, units(ascii)).terminated();
+  };
+  const typename R::Unit* end = nullptr;
+  r.number(R::Form::digit(r.l, text.data(), text.length, &end, given(",x").data(), given(".").data(),
+                          given("pos").data(), given("-").data(), r.given().number("ascii", r.cp.shift ? 0 : 1),
+                          r.flags));
+  r.place(end, text);
+}
+
 constexpr std::pair<const char*, int32_t LXTime::*> kFields[] = {
     {"seconds", &LXTime::seconds}, {"minutes", &LXTime::minutes},
     {"hours", &LXTime::hours},     {"day", &LXTime::day},
@@ -101,7 +139,10 @@ void write_time(R& r) {
   const LXTime time = time_of(r.given(), {9, 5, 14, 4, 6, 103, 5, 184});
   const auto format = r.input("", states.second);
   expect_written(r, [&](auto* to, int32_t size, uint32_t flags) {
-    return R::Form::write_time(r.l, &time, to, size, format.data(), format.length, flags);
+    const bool by_chars =
+        (flags & ~r.flags & LX_CHARACTERS) != 0;  // which count the characters of the format too
+    const int32_t length = by_chars ? count_of(format.start) : format.length;
+    return R::Form::write_time(r.l, &time, to, size, format.data(), length, flags);
   });
 }
 template <class R>
@@ -119,6 +160,7 @@ void read_time(R& r) {
 Families format_families() {
   return {{"write", in_four_forms([](auto& r) { write_number(r); })},
           {"read", in_four_forms([](auto& r) { read_number(r); })},
+          {"digit", in_four_forms([](auto& r) { digit(r); })},
           {"grouping-size", in_four_forms([](auto& r) { grouping_size(r); })},
           {"write-time", in_four_forms([](auto& r) { write_time(r); })},
           {"read-time", in_four_forms([](auto& r) { read_time(r); })}};

@@ -16,6 +16,8 @@ struct Piece {
   LXUChar unicode, first, source;
 };
 
+using lexicor_data::SpecialMapping;
+
 class Map : public CaseTest {
  protected:
   LXLocale* locale(const TinyCodepage& cp) { return library.locale(cp, "Special"); }
@@ -37,16 +39,16 @@ class Map : public CaseTest {
   /// `cp` null: Unicode itself.
   static std::vector<Piece> mapped(const TinyCodepage* cp, const Units& text, uint32_t mode) {
     static const std::vector<SpecialMapping> none;
-    const auto& specials = mode == LX_MAP_UPPER   ? upper_specials()
-                           : mode == LX_MAP_LOWER ? lower_specials()
+    const auto& specials = mode == LX_MAP_UPPER   ? special_language().special_upper
+                           : mode == LX_MAP_LOWER ? special_language().special_lower
                                                   : none;
     std::vector<Piece> pieces;
     for (size_t i = 0; i < text.size(); ++i) {
       const SpecialMapping* match = nullptr;
       for (const bool pair : {false, true})
         for (const SpecialMapping& s : specials)
-          if (match == nullptr && s.first == text[i] && (s.second != 0) == pair &&
-              (!pair || (i + 1 < text.size() && s.second == text[i + 1])))
+          if (match == nullptr && s.from[0] == text[i] && (s.from[1] != 0) == pair &&
+              (!pair || (i + 1 < text.size() && s.from[1] == text[i + 1])))
             match = &s;
       if (match == nullptr) {
         const LXUChar u = alone(text[i], mode, cp != nullptr && cp->width == 1);
@@ -57,9 +59,9 @@ class Map : public CaseTest {
         pieces.push_back({has ? u : text[i], text[i], text[i]});
         continue;
       }
-      if (match->second != 0) ++i;
-      pieces.push_back({match->result1, match->first, text[i]});
-      if (match->result2 != 0) pieces.push_back({match->result2, text[i], text[i]});
+      if (match->from[1] != 0) ++i;
+      pieces.push_back({match->to[0], match->from[0], text[i]});
+      if (match->to[1] != 0) pieces.push_back({match->to[1], text[i], text[i]});
     }
     return pieces;
   }

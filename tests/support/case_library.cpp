@@ -1,22 +1,19 @@
 #include "support/case_library.h"
 
 #include <cstring>
+#include <fstream>
 #include <stdexcept>
 
-#include "codepage/lxunicode.h"
-#include "core/lxbytes.h"
-#include "core/lxformat.h"
-#include "core/lxobjtypes.h"
-#include "lx.h"
+#include "language_toml.h"
 #include "object_file.h"
+#include "territory_toml.h"
 
 namespace lx::test {
 
 namespace {
 
 namespace fmt = format::codepage;
-namespace words = format::language;
-namespace lands = format::territory;
+using lexicor_data::LanguageSource;
 
 /// Gives a codepage another pair of widths behind those that it has, which move to the end of the payload.
 void add_pair(TinyCodepage* cp, const fmt::WidthPair& pair) {
@@ -30,58 +27,24 @@ void add_pair(TinyCodepage* cp, const fmt::WidthPair& pair) {
   lexicor_data::append_record(payload, pair);
 }
 
-void add_specials(ByteString* payload, size_t count, size_t table,
-                  const std::vector<SpecialMapping>& specials) {
-  put_le16(payload->data() + 2 * count, static_cast<uint16_t>(specials.size()));
-  put_le16(payload->data() + 2 * table, static_cast<uint16_t>(payload->size()));
-  for (const SpecialMapping& s : specials)
-    for (const uint16_t u : {s.first, s.second, s.result1, s.result2}) {
-      payload->resize(payload->size() + 2);
-      put_le16(payload->data() + payload->size() - 2, u);
-    }
+/// A source beside this file.
+template <class Source>
+Source source_of(const std::string& name, Source (*read)(std::istream&, const std::string&)) {
+  std::ifstream file(LEXICOR_TESTS_DIR "/support/locale/" + name);
+  return read(file, name);
 }
-ByteString special_language() {
-  ByteString payload = payload_of(kBuiltInLanguage);
-  add_specials(&payload, words::kUpperSpecials, words::kUpperSpecialTable, upper_specials());
-  add_specials(&payload, words::kLowerSpecials, words::kLowerSpecialTable, lower_specials());
-  return payload;
+LanguageSource read_language(std::istream& in, const std::string& name) {
+  using lexicor_data::ObjectType;
+  return lexicor_data::read_language(
+      in, name, {{{ObjectType::kTerritory, 840, "UnitedStates"}, {ObjectType::kCodepage, 367, "US-ASCII"}}});
 }
-ByteString kana_language(bool long_names) {
-  ByteString payload = payload_of(kBuiltInLanguage);
-  for (unsigned word = words::kFirstDay; word < words::kLastText - 1; ++word) {
-    uint8_t* const name = payload.data() + le16(payload.data() + 2 * word);
-    if (le16(name) != 0) put_le16(name, static_cast<uint16_t>(0x3041 + word));
-    if (long_names && word > words::kFirstDay && word < words::kFirstDay + 7) put_le16(name - 2, 'x');
-  }
-  if (long_names) put_le16(payload.data() + le16(payload.data() + 2 * words::kLastText), 'A');
-  return payload;
-}
-
-ByteString elsewhere() {
-  ByteString payload = payload_of(kBuiltInTerritory);
-  const uint16_t separators[] = {',', '.', ';', ',', 0xE0};
-  for (size_t i = 0; i < std::size(separators); ++i)
-    put_le16(payload.data() + 2 * (lands::kSeparators + i), separators[i]);
-  put_le16(payload.data() + 2 * lands::kNumbers, 3);
-  put_le16(payload.data() + 2 * lands::kFlags, 0);
-  put_le16(payload.data() + le16(payload.data() + 2 * (lands::kInternationalCurrency - 1)), 0x3041);
-  return payload;
+ByteString language(const std::string& name) {
+  return pack_language(source_of(name, read_language), name);
 }
 
 std::vector<TinyCodepage> with_common(std::vector<TinyCodepage> codepages) {
   codepages.push_back(tiny_codepages().back());
   return codepages;
-}
-
-/// Gives the characters of several bytes of a loaded codepage their other case.
-void set_cases(const TinyCodepage& cp, LXLocale* in) {
-  for (const TinyCharacter& c : cp.characters) {
-    if (c.code <= 0xFF) continue;
-    const uint16_t upper = unicode_upper(c.unicode);
-    const TinyCharacter* const other = cp.find(upper != c.unicode ? upper : unicode_lower(c.unicode));
-    auto* const record = const_cast<uint8_t*>(LXGetMbCtypeW(in->codepage, c.code));
-    put_le32(record + 4, other != nullptr ? other->code - c.code : 0);
-  }
 }
 
 }  // namespace
@@ -112,15 +75,9 @@ const TinyCodepage& case_codepage(const std::string& name) {
   throw std::runtime_error("no codepage " + name);
 }
 
-const std::vector<SpecialMapping>& upper_specials() {
-  static const std::vector<SpecialMapping> specials{{0xDF, 0, 'S', 'S'},      {'i', 'j', 'A', 0},
-                                                    {'q', 'q', 'R', 'Q'},     {'r', 0, 0x2603, 0},
-                                                    {0x3042, 0, 'H', 0x3041}, {'h', 0x3043, 0x3044, 0}};
-  return specials;
-}
-const std::vector<SpecialMapping>& lower_specials() {
-  static const std::vector<SpecialMapping> specials{{'I', 'J', 'a', 'b'}, {'Q', 0, 0x3041, 0}};
-  return specials;
+const LanguageSource& special_language() {
+  static const LanguageSource source = source_of("special.toml", read_language);
+  return source;
 }
 
 TestWeight letter(uint16_t primary, uint8_t secondary, uint8_t tertiary, uint8_t char_class) {
@@ -158,13 +115,12 @@ SortBuilder example_sort() {
 }
 
 CaseLibrary::CaseLibrary(const SortBuilder& sort)
-    : TinyLibrary(with_common(case_codepages()), {{{2, LX_LANGUAGE, "Special"}, special_language()},
-                                                  {{3, LX_LANGUAGE, "Kana"}, kana_language(false)},
-                                                  {{4, LX_LANGUAGE, "Long"}, kana_language(true)},
-                                                  {{276, LX_TERRITORY, "Elsewhere"}, elsewhere()},
-                                                  {{1, LX_SORT, "Test"}, sort.payload()}}) {
-  for (const TinyCodepage& codepage : case_codepages())
-    if (codepage.width > 1) set_cases(codepage, locale(codepage));
-}
+    : TinyLibrary(with_common(case_codepages()),
+                  {{{2, LX_LANGUAGE, "Special"}, language("special.toml")},
+                   {{3, LX_LANGUAGE, "Kana"}, language("kana.toml")},
+                   {{4, LX_LANGUAGE, "Long"}, language("long.toml")},
+                   {{276, LX_TERRITORY, "Elsewhere"},
+                    pack_territory(source_of("elsewhere.toml", lexicor_data::read_territory), "Elsewhere")},
+                   {{1, LX_SORT, "Test"}, sort.payload()}}) {}
 
 }  // namespace lx::test
