@@ -218,8 +218,8 @@ CodepageObject::CodepageObject(uint16_t id, const std::vector<ByteString>& secti
   object_.disk.id = id;
   object_.disk.type = LX_CODEPAGE;
   locale_.codepage = &object_;
-  code_ = kCodepageType.validate(id, exact).code;
-  if (code_ != LX_OK) return;
+  fault_ = kCodepageType.validate(id, exact);
+  if (fault_) return;
   object_.derived = derive_codepage(id, exact);
   if (object_.derived == nullptr) throw std::runtime_error("no memory for a codepage");
   const lx::Codepage& cp = codepage_of(object_);

@@ -119,7 +119,8 @@ class CodepageObject {
   CodepageObject(const CodepageObject&) = delete;
   CodepageObject& operator=(const CodepageObject&) = delete;
 
-  int32_t code() const { return code_; }  // of the validation; there is no object unless it is 0
+  int32_t code() const { return fault_.code; }  // of the validation; there is no object unless it is 0
+  std::string reason() const { return fault_ ? fault_.reason : ""; }
   const LXObject* object() const { return &object_; }
   LXLocale* locale() { return &locale_; }
 
@@ -127,7 +128,7 @@ class CodepageObject {
   std::vector<ByteString> sections_;
   LXObject object_{};
   LXLocale locale_{};
-  int32_t code_;
+  Fault fault_;
 };
 
 }  // namespace lx::test
