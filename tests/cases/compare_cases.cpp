@@ -35,11 +35,31 @@ void key(R& r) {
   }
 }
 
+/// The weights of a character, or of a pair, and their class.
+void weights(CaseRun<Unicode>& r) {
+  const Units text = r.given().text().units();
+  LXWeights w[2] = {};
+  uint8_t char_class = 0;
+  const int32_t sets =
+      text.size() > 1
+          ? LXSortGetCombination(r.l->sort, text[0], text[1], &w->primary, &w->secondary, &w->tertiary,
+                                 &w->special, &char_class)
+          : LXSortGetWeights(r.l->sort, text[0], &w->primary, &w->secondary, &w->tertiary, &w->special,
+                             &w[1].primary, &w[1].secondary, &w[1].tertiary, &w[1].special, &char_class);
+  r.l->last_error = LX_OK;  // which these do not touch
+  r.number(sets);
+  for (int32_t i = 0; i < sets; ++i)
+    for (const int weight : {w[i].primary, uint16_t{w[i].secondary}, uint16_t{w[i].tertiary}, w[i].special})
+      r.number(weight);
+  if (sets > 0) r.number(char_class);
+}
+
 }  // namespace
 
 Families compare_families() {
   return {{"compare", in_four_forms([](auto& r) { compare(r, r.form.cmp, false); })},
           {"collate", in_four_forms([](auto& r) { compare(r, r.form.coll, true); })},
+          {"weights", {nullptr, nullptr, nullptr, weights}},
           {"key", in_four_forms([](auto& r) { key(r); })}};
 }
 

@@ -4,6 +4,7 @@
 
 #include "codepage/lxcodepage.h"
 #include "core/lxformat.h"
+#include "support/damage.h"
 #include "support/tiny_codepages.h"
 
 namespace lx::test {
@@ -13,7 +14,6 @@ namespace fmt = format::codepage;
 using S = std::vector<ByteString>;
 
 constexpr uint16_t kId = 9100;
-constexpr size_t kFixedBytes1 = fmt::in_version1(fmt::kFixedBytes);
 
 /// The sections with the range of all bytes in every node and the values at a multiple of four, as an upgrade
 /// leaves them. The upgrade sets no shift bytes.
@@ -94,28 +94,19 @@ TEST(Upgrade, OfASingleByteCodepageNothingElseIsTaken) {
   }
 }
 
-/// Through the door, and as files.
+/// Through the door, and as files. Fields stand four bytes further in front.
 TEST(Upgrade, Damaged) {
-  const struct {
-    const char* what;
-    void (*apply)(S&);
-  } damages[] = {
-      {"no whole fixed part", [](S& s) { s[0].resize(kFixedBytes1 - 1); }},
-      {"no payload to speak of", [](S& s) { s[0].resize(5); }},
-      {"values behind the section",
-       [](S& s) { s[1].resize(le16(&s[0][fmt::in_version1(fmt::kUnicodeValues)]) - 1u); }},
-      {"an offset that cannot be moved",
-       [](S& s) { put_le16(&s[0][fmt::in_version1(fmt::kTypeTrie)], 0xFFFD); }},
-      {"values that cannot be moved",
-       [](S& s) {
-         s[1].resize(50000);
-         put_le16(&s[0][fmt::in_version1(fmt::kUnicodeValues)], 45000);
-       }},
+  const char* const damages[][2] = {
+      {"no whole fixed part", "0:size = fixed-5"},
+      {"no payload to speak of", "0:size = 5"},
+      {"values behind the section", "1:size = @4370-1"},
+      {"an offset that cannot be moved", "0:type_trie-4 = 0xFFFD"},
+      {"values that cannot be moved", "1:size = 50000; 0:unicode_values-4 = 45000"},
   };
-  for (const auto& damage : damages) {
-    SCOPED_TRACE(damage.what);
+  for (const auto& [what, changes] : damages) {
+    SCOPED_TRACE(what);
     S old = multibyte();
-    damage.apply(old);
+    change_sections(&old, changes);
     TinyLibrary library({file_of(old)});
     EXPECT_EQ(upgrade(&library, old, 0, 0), S(2));
     int32_t rc = -1;

@@ -114,6 +114,13 @@ SortBuilder example_sort() {
   return sort;
 }
 
+SortBuilder sort_without_insertion() {
+  SortBuilder sort = example_sort();
+  for (const LXUChar inserted : units("yz12")) sort.characters.erase(inserted);
+  sort.characters['x'] = letter(0x203);
+  return sort;
+}
+
 CaseLibrary::CaseLibrary(const SortBuilder& sort)
     : TinyLibrary(with_common(case_codepages()),
                   {{{2, LX_LANGUAGE, "Special"}, language("special.toml")},
@@ -121,6 +128,7 @@ CaseLibrary::CaseLibrary(const SortBuilder& sort)
                    {{4, LX_LANGUAGE, "Long"}, language("long.toml")},
                    {{276, LX_TERRITORY, "Elsewhere"},
                     pack_territory(source_of("elsewhere.toml", lexicor_data::read_territory), "Elsewhere")},
-                   {{1, LX_SORT, "Test"}, sort.payload()}}) {}
+                   {{1, LX_SORT, "Test"}, sort.payload()},
+                   {{2, LX_SORT, "Steady"}, sort_without_insertion().payload()}}) {}
 
 }  // namespace lx::test

@@ -29,9 +29,11 @@ TestWeight special(uint16_t weight);
 /// a to c, A above a on the tertiary level, an acute accent, a hyphen that is special, "ch" after c, ae as an
 /// expansion, digits that insert on the lower levels, and z, y and U+51xx that insert primaries.
 SortBuilder example_sort();
+/// The same, but that nothing inserts, and with x, which is as "ch".
+SortBuilder sort_without_insertion();
 
 /// Languages: English, and Special, Kana and Long of support/locale; there is also the territory Elsewhere, 276. The
-/// sort is called Test.
+/// sorts are called Test and Steady.
 class CaseLibrary : public TinyLibrary {
  public:
   explicit CaseLibrary(const SortBuilder& sort = example_sort());

@@ -36,13 +36,13 @@ size_t operand(const S& s, const std::string& name) {
                                                      {"type_records", fmt::kTypeRecords},
                                                      {"unicode_values", fmt::kUnicodeValues},
                                                      {"fixed", fmt::kFixedBytes}};
-  const size_t types = le16(&s[0][fmt::kTypeTrie]);
   if (isdigit(name[0]) != 0) return std::stoul(name, nullptr, 0);
   if (name.rfind("size", 0) == 0) return s.at(std::stoul(name.substr(4))).size();
   if (name == "unode") return 0;
-  if (name == "tnode") return types;
+  if (name[0] == '@') return le16(&s[0][std::stoul(name.substr(1))]);
+  if (name == "tnode") return le16(&s[0][fmt::kTypeTrie]);
   if (name.rfind("unode.", 0) == 0) return child_at<fmt::UnicodeNode>(s[1], 0, name.substr(6));
-  if (name.rfind("tnode.", 0) == 0) return child_at<fmt::TypeNode>(s[0], types, name.substr(6));
+  if (name.rfind("tnode.", 0) == 0) return child_at<fmt::TypeNode>(s[0], operand(s, "tnode"), name.substr(6));
   return kFields.at(name);
 }
 
