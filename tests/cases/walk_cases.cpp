@@ -51,6 +51,18 @@ void put(R& r) {
   EXPECT_EQ(testing::PrintToString(out), testing::PrintToString(expected));
 }
 
+/// A packed code: its length, zero bytes counted, and what is stored of it.
+void packed(CaseRun<Plain>& r) {
+  const auto code = static_cast<LXWChar>(std::stoul(r.given().word(), nullptr, 16));
+  const std::string bytes = r.expected().text().bytes(r.cp);
+  std::vector<char> stored(bytes.size()), put(bytes.size());  // exact
+  r.number(LXStrByteLength(code));
+  EXPECT_EQ(LXWToMb(stored.data(), code), count_of(bytes));
+  EXPECT_EQ(LXPutChar(r.l, put.data(), code), 0);
+  EXPECT_EQ(std::string(stored.begin(), stored.end()), bytes);
+  EXPECT_EQ(put, stored);
+}
+
 }  // namespace
 
 Families walk_families() {
@@ -58,7 +70,7 @@ Families walk_families() {
       {"count", in_bytes([](auto& r) { count(r); })},    {"move", in_bytes([](auto& r) { move(r); })},
       {"next", in_bytes([](auto& r) { next(r); })},      {"previous", in_bytes([](auto& r) { previous(r); })},
       {"code", in_bytes([](auto& r) { character(r); })}, {"valid", in_bytes([](auto& r) { valid(r); })},
-      {"put", in_bytes([](auto& r) { put(r); })}};
+      {"put", in_bytes([](auto& r) { put(r); })},        {"packed", {packed, nullptr, nullptr, nullptr}}};
 }
 
 }  // namespace lx::test

@@ -5,7 +5,7 @@
 #include <stdexcept>
 
 #include "language_toml.h"
-#include "object_file.h"
+#include "support/damage.h"
 #include "territory_toml.h"
 
 namespace lx::test {
@@ -14,18 +14,6 @@ namespace {
 
 namespace fmt = format::codepage;
 using lexicor_data::LanguageSource;
-
-/// Gives a codepage another pair of widths behind those that it has, which move to the end of the payload.
-void add_pair(TinyCodepage* cp, const fmt::WidthPair& pair) {
-  ByteString& payload = cp->file.sections[0];
-  const uint8_t* const pairs = payload.data() + le16(payload.data() + fmt::kPairs);
-  const uint16_t count = le16(payload.data() + fmt::kPairCount);
-  const ByteString moved(pairs, pairs + size_t{count} * fmt::WidthPair::kBytes);
-  put_le16(payload.data() + fmt::kPairs, static_cast<uint16_t>(payload.size()));
-  put_le16(payload.data() + fmt::kPairCount, static_cast<uint16_t>(count + 1));
-  payload.insert(payload.end(), moved.begin(), moved.end());
-  lexicor_data::append_record(payload, pair);
-}
 
 /// A source beside this file.
 template <class Source>
@@ -60,7 +48,10 @@ const std::vector<TinyCodepage>& case_codepages() {
     for (TinyCodepage& cp : made) cp.file.name.erase(0, strlen("TINY-"));
     made.push_back(ebcdic(930, "K930", true));
     made.push_back(shift_jis(9012, "ODD"));
-    add_pair(&made.back(), {0x8141, '!'});
+    // Another pair of widths, behind those that it has: all move to the end of the payload.
+    change_sections(
+        &made.back().file.sections,
+        "0:size = @6*8+size0+8; 0:size0 = @4368:@6*8 0x8141 0 0x21 0; 0:pairs = size0; 0:pair_count = @6+1");
     for (TinyCodepage& cp : made)
       for (size_t i = 0; i < 4; ++i)
         cp.file.sections[0][fmt::kLineEnds + i] = static_cast<uint8_t>(cp.find(line_ends(cp)[i])->code);

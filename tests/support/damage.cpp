@@ -67,7 +67,7 @@ ByteString bytes_of(const S& s, size_t section, const std::string& value) {
   const size_t colon = value.find(':');
   if (colon != std::string::npos) {
     const uint8_t* const from = &s[section][result(s, value.substr(0, colon))];
-    return ByteString(from, from + std::stoul(value.substr(colon + 1)));
+    return ByteString(from, from + result(s, value.substr(colon + 1)));
   }
   if (value.size() == 2)
     bytes.push_back(static_cast<uint8_t>(std::stoul(value, nullptr, 16)));
