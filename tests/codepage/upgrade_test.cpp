@@ -80,12 +80,10 @@ TEST(Upgrade, GivesBackEveryCodepage) {
 TEST(Upgrade, OfASingleByteCodepageNothingElseIsTaken) {
   TinyLibrary library({tiny_single()});
   const S expected = full_ranges(tiny_single().file.sections);
-  for (uint8_t width : {uint8_t{0}, uint8_t{1}}) {
+  for (const uint8_t width : {uint8_t{0}, uint8_t{1}}) {
     S old = version1_codepage(expected);
     old[0][fmt::kWidth] = width;
-    for (size_t field = fmt::kFullWidth; field < fmt::kFixedBytes; field += 2)
-      put_le16(&old[0][fmt::in_version1(field)], 0x1234);
-    old[0].push_back(0x77);
+    change_sections(&old, "0:full_width-4 = 0x1234 0x1234 0x1234 0x1234 0x1234; 0:size = size0+1");
     S made = upgrade(&library, old, fmt::kFixedBytes, 0);
     EXPECT_EQ(made[0][fmt::kWidth], width);
     made[0][fmt::kWidth] = 1;

@@ -30,10 +30,6 @@ extern "C" int snprintf(char* buffer, size_t size, const char* format, ...) noex
 namespace lx::test {
 namespace {
 
-std::vector<std::string> words(const char* list) {
-  std::istringstream in(list);
-  return {std::istream_iterator<std::string>(in), {}};
-}
 /// The model: separators are put into the digits one by one, as a grouping text says.
 std::string grouped(std::string digits, const std::string& grouping, char separator) {
   std::istringstream sizes(grouping);
@@ -80,9 +76,10 @@ Units model(double value, const Style& style) {
 class NumberTest : public CaseTest {
  protected:
   Style random_style() {
-    static const auto groupings = words("3;0 3 3;2;0 0 ; 1;1 2;0;5 1;0 4;3 9999999999999;0");
-    static const auto separators = words(".,' ,.' '., .', ,'. ',.");
-    const std::string two = any_of(separators);
+    static const std::vector<std::string> groupings{"3;0", "3",     "3;2;0", "0",   ";",
+                                                    "1;1", "2;0;5", "1;0",   "4;3", "9999999999999;0"};
+    static const char* const separators[] = {".,'", ",.'", "'.,", ".',", ",'.", "',."};
+    const char* const two = any_of(separators);
     return {two[0], two[1], any_of(groupings), any(10)};
   }
   double random_double() {
