@@ -56,19 +56,9 @@ void expect_written(R& r, Put put) {
 }
 
 Value::Kind kind_of(const std::string& word) {
-  if (word == "long") return Value::kLong;
-  if (word == "double") return Value::kDouble;
-  if (word == "amount") return Value::kAmount;
-  throw CaseError("no kind of number: " + word);
-}
-
-template <class R>
-void write_number(R& r) {
-  const Value::Kind kind = kind_of(r.given().word());
-  const Value value{kind, std::strtod(r.given().word().c_str(), nullptr)};
-  expect_written(r, [&](auto* to, int32_t size, uint32_t flags) {
-    return write(typename R::Form(), r.l, value, to, size, flags);
-  });
+  static const std::map<std::string, Value::Kind> kKinds{
+      {"long", Value::kLong}, {"double", Value::kDouble}, {"amount", Value::kAmount}};
+  return kKinds.at(word);
 }
 
 /// "|" in the text stands where reading ends.
@@ -98,31 +88,6 @@ void read_number(R& r) {
             static_cast<ptrdiff_t>(whole.behind(end, whole.units.size(), whole.units.size())));
 }
 
-template <class R>
-void grouping_size(R& r) {
-  const auto text = r.input();
-  int32_t remaining = std::stoi(r.given().word());
-  const typename R::Unit* next = text.data() + 77;
-  r.number(R::Form::grouping_size(r.l, text.data(), &remaining, &next));
-  r.number(remaining);
-  const std::string word = r.expected().word();
-  EXPECT_EQ(next, word == "none" ? nullptr : text.data() + (word == "untouched" ? 77 : std::stoi(word)));
-}
-
-/// The class of what a text begins with, where "," or "." separates and "pos" and "-" are signs, and the place behind it.
-template <class R>
-void digit(R& r) {
-  const auto text = r.input("", states.text);
-  const auto given = [&](const char* ascii) {
-    return Encoded<typename R::Form>(r.cp, units(ascii)).terminated();
-  };
-  const typename R::Unit* end = nullptr;
-  r.number(R::Form::digit(r.l, text.data(), text.length, &end, given(",x").data(), given(".").data(),
-                          given("pos").data(), given("-").data(), r.given().number("ascii", r.cp.shift ? 0 : 1),
-                          r.flags));
-  r.place(end, text);
-}
-
 constexpr std::pair<const char*, int32_t LXTime::*> kFields[] = {
     {"seconds", &LXTime::seconds}, {"minutes", &LXTime::minutes},
     {"hours", &LXTime::hours},     {"day", &LXTime::day},
@@ -133,37 +98,61 @@ LXTime time_of(const CaseWords& words, LXTime time) {
   return time;
 }
 
-/// 4 July 2003, 14:05:09, a Friday.
 template <class R>
-void write_time(R& r) {
-  const LXTime time = time_of(r.given(), {9, 5, 14, 4, 6, 103, 5, 184});
-  const auto format = r.input("", states.second);
-  expect_written(r, [&](auto* to, int32_t size, uint32_t flags) {
-    const bool by_chars =
-        (flags & ~r.flags & LX_CHARACTERS) != 0;  // which count the characters of the format too
-    const int32_t length = by_chars ? count_of(format.start) : format.length;
-    return R::Form::write_time(r.l, &time, to, size, format.data(), length, flags);
-  });
-}
-template <class R>
-void read_time(R& r) {
-  constexpr LXTime kUntouched{-1, -2, -3, -4, -5, -6, -7, -8};
-  const auto text = r.input("", states.text), format = r.input("", states.second, "format-length");
-  LXTime got = kUntouched;
-  r.number(R::Form::read_time(r.l, &got, text.data(), text.length, format.data(), format.length, r.flags));
-  const LXTime expected = time_of(r.expected(), kUntouched);
-  for (const auto& [name, field] : kFields) EXPECT_EQ(got.*field, expected.*field) << name;
+std::vector<typename R::Unit> terminated(const R& r, const char* ascii) {
+  return Encoded<typename R::Form>(r.cp, units(ascii)).terminated();
 }
 
 }  // namespace
 
 Families format_families() {
-  return {{"write", in_four_forms([](auto& r) { write_number(r); })},
-          {"read", in_four_forms([](auto& r) { read_number(r); })},
-          {"digit", in_four_forms([](auto& r) { digit(r); })},
-          {"grouping-size", in_four_forms([](auto& r) { grouping_size(r); })},
-          {"write-time", in_four_forms([](auto& r) { write_time(r); })},
-          {"read-time", in_four_forms([](auto& r) { read_time(r); })}};
+  return {
+      {"write", in_four_forms([](auto& r) {
+         const Value::Kind kind = kind_of(r.given().word());
+         const Value value{kind, std::strtod(r.given().word().c_str(), nullptr)};
+         expect_written(r, [&](auto* to, int32_t size, uint32_t flags) {
+           return write(r.form, r.l, value, to, size, flags);
+         });
+       })},
+      {"read", in_four_forms([](auto& r) { read_number(r); })},
+      {"grouping-size", in_four_forms([](auto& r) {
+         const auto text = r.input();
+         int32_t remaining = std::stoi(r.given().word());
+         const auto* next = text.data() + 77;
+         r.number(r.form.grouping_size(r.l, text.data(), &remaining, &next));
+         r.number(remaining);
+         const std::string word = r.expected().word();
+         EXPECT_EQ(next, word == "none" ? nullptr : text.data() + (word == "untouched" ? 77 : std::stoi(word)));
+       })},
+      // The class of what a text begins with, where "," or "." separates and "pos" and "-" are signs, and the place behind it.
+      {"digit", in_four_forms([](auto& r) {
+         const auto text = r.input("", states.text);
+         const auto* end = text.data();
+         r.number(r.form.digit(r.l, text.data(), text.length, &end, terminated(r, ",x").data(),
+                               terminated(r, ".").data(), terminated(r, "pos").data(),
+                               terminated(r, "-").data(), r.given().number("ascii", r.cp.shift ? 0 : 1),
+                               r.flags));
+         r.place(end, text);
+       })},
+      // 4 July 2003, 14:05:09, a Friday.
+      {"write-time", in_four_forms([](auto& r) {
+         const LXTime time = time_of(r.given(), {9, 5, 14, 4, 6, 103, 5, 184});
+         const auto format = r.input("", states.second);
+         expect_written(r, [&](auto* to, int32_t size, uint32_t flags) {
+           // These count the characters of the format too.
+           const bool by_chars = (flags & ~r.flags & LX_CHARACTERS) != 0;
+           const int32_t length = by_chars ? count_of(format.start) : format.length;
+           return r.form.write_time(r.l, &time, to, size, format.data(), length, flags);
+         });
+       })},
+      {"read-time", in_four_forms([](auto& r) {
+         constexpr LXTime kUntouched{-1, -2, -3, -4, -5, -6, -7, -8};
+         const auto text = r.input("", states.text), format = r.input("", states.second, "format-length");
+         LXTime got = kUntouched;
+         r.number(r.form.read_time(r.l, &got, text.data(), text.length, format.data(), format.length, r.flags));
+         const LXTime expected = time_of(r.expected(), kUntouched);
+         for (const auto& [name, field] : kFields) EXPECT_EQ(got.*field, expected.*field) << name;
+       })}};
 }
 
 }  // namespace lx::test

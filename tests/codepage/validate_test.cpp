@@ -7,6 +7,7 @@
 
 #include "codepage/lxcodepage.h"
 #include "core/lxformat.h"
+#include "support/case_library.h"
 #include "support/case_rows.h"
 #include "support/conversion.h"
 #include "support/damage.h"
@@ -114,11 +115,6 @@ void use_everything(CodepageObject* made, unsigned step) {
 
 class Validate : public testing::Test {
  protected:
-  static TinyCodepage tiny(const std::string& name) {
-    for (const TinyCodepage& cp : tiny_codepages())
-      if (cp.file.name == "TINY-" + name) return cp;
-    throw std::runtime_error("no codepage " + name);
-  }
   void TearDown() override { EXPECT_TRUE(library_.close()); }
 
   TinyLibrary library_{{tiny_single()}};
@@ -128,7 +124,7 @@ TEST_F(Validate, RefusedWithItsReasonOrSafe) {
   std::mt19937 random(5);
   for (const CaseRow& row : case_rows("codepage/damage.txt")) {
     SCOPED_TRACE(row.where + " " + row[0]);
-    TinyCodepage cp = tiny(row[1]);
+    TinyCodepage cp = case_codepage(row[1]);
     S& sections = cp.file.sections;
     change_sections(&sections, row[2]);
     CodepageObject made(cp.file.id, sections);

@@ -137,7 +137,7 @@ SortBuilder random_sort(std::mt19937* random, unsigned inserting) {
   for (int i = 0; i < 3; ++i)
     sort.pairs.push_back(
         {static_cast<LXUChar>('a' + below(4)), static_cast<LXUChar>('a' + below(4)), weight()});
-  sort.computed[0x4E] = {2, kAppendAll, static_cast<uint16_t>(0x300 - 0x50)};
+  sort.computed[0x4E] = {lexicor_data::SortPageKind::kPrimary, 0x300 - 0x50, kAppendAll, {}};
   return sort;
 }
 

@@ -14,6 +14,7 @@ namespace {
 
 namespace fmt = format::codepage;
 using lexicor_data::LanguageSource;
+using lexicor_data::SortPageKind;
 
 /// A source beside this file.
 template <class Source>
@@ -98,10 +99,10 @@ SortBuilder example_sort() {
                      {0xFF21, letter(0x200)}};
   sort.expansions = {{0xE6, {letter(0x200, 2, 1), {0x208, 1, 1, 0}}}};
   sort.pairs = {{'c', 'h', letter(0x203)}, {'c', 'h', letter(0x999)}};
-  sort.computed = {{0x4E, {2, kAppendAll, 0x3000}},
-                   {0x4F, {2, kAppendAll, 0x3100}},
-                   {0x51, {2, 7, 0x3200}},
-                   {0x20, {4, kAppendAll, 0x50}}};
+  sort.computed = {{0x4E, {SortPageKind::kPrimary, 0x3000, kAppendAll, {}}},
+                   {0x4F, {SortPageKind::kPrimary, 0x3100, kAppendAll, {}}},
+                   {0x51, {SortPageKind::kPrimary, 0x3200, 7, {}}},
+                   {0x20, {SortPageKind::kSpecial, 0x50, kAppendAll, {}}}};
   return sort;
 }
 
