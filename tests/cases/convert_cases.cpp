@@ -117,6 +117,16 @@ Families convert_families() {
           }
         },
         nullptr, nullptr}},
+      {"ratio",
+       {nullptr,
+        [](auto& r) {
+          const TinyCodepage &from = case_codepage(r.given().word()), &to = case_codepage(r.given().word());
+          LXLocale* const target = r.library.locale(to);
+          LXGetCharTypeU(target, 'A', 0);  // stores another code
+          r.number(LXConversionRatio(target, r.library.locale(from)));
+          EXPECT_EQ(LXGetError(target), LX_OK);
+        },
+        nullptr, nullptr}},
       // The entry of a character or pair in the table of a selector. What is not found leaves the results as they were.
       {"special",
        {nullptr, nullptr, nullptr,

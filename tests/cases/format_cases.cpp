@@ -7,15 +7,17 @@ namespace lx::test {
 
 namespace {
 
-/// What smaller buffers hold: whole characters that leave the single-byte state, as many as fit, and code 40 unless
-/// they are all. By characters, bytes are made in six for each, and then cut.
+/// What smaller buffers hold, from a state on: whole characters that leave the single-byte state, as many as fit, and
+/// code 40 unless they are all. By characters, bytes are made in six for each, and then cut.
 template <class R, class Put>
-void expect_smaller(R& r, const Units& text, int32_t all, Put put) {
+void expect_smaller(R& r, const Units& text, int32_t all, LXShiftState state, Put put) {
   for (const uint32_t flags : {0u, uint32_t{LX_TERMINATE}, uint32_t{LX_TERMINATE | LX_CHARACTERS}})
     for (int32_t size = 1; size <= all; ++size) {
       SCOPED_TRACE("size " + std::to_string(size) + " flags " + std::to_string(flags));
+      states.output = states.text = state;
       const auto made = written(r.form, r.l, size, r.flags | flags,
                                 [&](auto* to, int32_t room) { return put(to, room, r.flags | flags); });
+      states.output = 0;
       const bool chars = (flags & LX_CHARACTERS) != 0;
       const size_t room = static_cast<size_t>(size) - (flags != 0 ? 1 : 0), most = R::kBytes ? 3 : 0;
       const Units part = text.substr(0, chars || !R::kBytes ? room : made.text.size());
@@ -23,8 +25,10 @@ void expect_smaller(R& r, const Units& text, int32_t all, Put put) {
       EXPECT_TRUE(made.code == LX_E_SIZE || (made.code == LX_OK && (chars || part == text)));
       EXPECT_EQ(made.result, (chars ? count_of(made.text) : count_of(made.units)) + (flags != 0 ? 1 : 0));
       EXPECT_TRUE(chars || made.text == text || made.units.size() + most >= room);
+      if (made.units.empty()) continue;
       EXPECT_EQ(decode(r.form, r.l, made.units + encode(r.form, r.l, units("1"))), made.text + units("1"));
     }
+  states.text = 0;
 }
 
 /// What was written at a size, with and without a null: the expected text in the form, the result and the code. Where
@@ -51,7 +55,9 @@ void expect_written(R& r, Put put) {
     EXPECT_EQ(result, returns != 0 ? returns : count + (null != 0));
   }
   if (size == given || r.null || any || text.raw() || r.error != LX_OK || states.output != 0) return;
-  expect_smaller(r, text.units(), count_of(whole), put);
+  const bool shifts = r.cp.shift && std::is_same_v<typename R::Form, Ex>;
+  for (const LXShiftState state : {0u, shifts ? 1u : 0u})
+    expect_smaller(r, text.units(), count_of(whole), state, put);
   put(std::vector<typename R::Unit>(120).data(), 120, r.flags);  // stores the code of the case
 }
 

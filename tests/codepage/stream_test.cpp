@@ -1,5 +1,5 @@
-// Streaming conversion: any split of the input and of the output gives the bytes of the whole; what the ratio
-// is. The steps one by one are cases.
+// Streaming conversion: any split of the input and of the output gives the bytes of the whole. The
+// steps one by one are cases.
 #include "support/case_test.h"
 #include "support/conversion.h"
 
@@ -67,21 +67,6 @@ TEST_F(Stream, AnySplitGivesTheWhole) {
       }
     }
   }
-}
-
-TEST_F(Stream, Ratio) {
-  const auto expect = [&](const TinyCodepage& to, const TinyCodepage& from, int32_t ratio) {
-    LXGetCharTypeU(locale(to), 'A', 0);
-    EXPECT_EQ(LXConversionRatio(locale(to), locale(from)), ratio) << to.file.name;
-    EXPECT_EQ(LXGetError(locale(to)), LX_OK);
-  };
-  const TinyCodepage &single = case_codepage("SINGLE"), &sjis = case_codepage("SJIS");
-  for (const TinyCodepage& same : case_codepages()) expect(same, same, 1);
-  expect(single, sjis, 1);
-  expect(sjis, single, 2);
-  expect(case_codepage("FOUR"), sjis, 4);
-  expect(case_codepage("UTF8"), single, 3);
-  expect(case_codepage("SHIFT"), sjis, 3);
 }
 
 TEST_F(Stream, ClosingReportsAFailingFree) {
