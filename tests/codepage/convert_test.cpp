@@ -103,17 +103,17 @@ TEST_F(Convert, BetweenCodepages) {
 /// rely on it.
 TEST_F(Convert, UndefinedFlagsBesideCharacters) {
   LXLocale* const l = locale(case_codepage("SJIS"));
-  const LXWChar codes[] = {'a', 0};
-  LXWChar wide[4];
-  LXUChar unicode[4];
-  char out[4];
   const I flags = LX_CHARACTERS | 0x10;
-  EXPECT_EQ(LXConvertString(l, out, 4, l, "a", 1, flags), 0);
-  EXPECT_EQ(LXConvertStringEx(l, out, 0, 4, l, "a", 0, 1, flags), 0);
-  EXPECT_EQ(LXConvertStringW(l, wide, 4, l, codes, 1, flags), 0);
-  EXPECT_EQ(LXGetError(l), LX_E_INVALID);
-  EXPECT_EQ(LXStringToUnicode(unicode, 4, l, "a", 1, flags), -1);
-  EXPECT_EQ(LXMbToWide(l, wide, 4, "a", 1, flags), -1);
+  LXWChar codes[4];
+  const auto refuse = [&](const auto& form) {
+    typename std::decay_t<decltype(form)>::Unit in[] = {'a', 0}, out[4];
+    LXUChar unicode[4];
+    EXPECT_EQ(form.convert(l, out, 4, l, in, 1, flags), 0);
+    EXPECT_EQ(LXGetError(l), LX_E_INVALID);
+    EXPECT_EQ(form.decode(unicode, 4, l, in, 1, flags), -1);
+  };
+  refuse(kPlain), refuse(kEx), refuse(kWide);
+  EXPECT_EQ(LXMbToWide(l, codes, 4, "a", 1, flags), -1);
 }
 
 /// ASCII is moved in blocks: another character at every place of a text that is longer than two of them, also

@@ -108,7 +108,7 @@ TEST(Upgrade, Damaged) {
     TinyLibrary library({file_of(old)});
     EXPECT_EQ(upgrade(&library, old, 0, 0), S(2));
     int32_t rc = -1;
-    EXPECT_EQ(library.object(kId, &rc), nullptr);
+    EXPECT_EQ(LXGetObjFromID(nullptr, LX_CODEPAGE, kId, LX_FIND_AND_LOAD, &rc), nullptr);
     EXPECT_EQ(rc, LX_E_CORRUPT);
     EXPECT_TRUE(library.close());
   }
@@ -117,7 +117,7 @@ TEST(Upgrade, Damaged) {
 TEST(Upgrade, AtLoad) {
   TinyLibrary library({file_of(multibyte())});
   int32_t rc = -1;
-  const LXObject* const object = library.object(kId, &rc);
+  const LXObject* const object = LXGetObjFromID(nullptr, LX_CODEPAGE, kId, LX_FIND_AND_LOAD, &rc);
   ASSERT_NE(object, nullptr);
   EXPECT_EQ(object->disk.flags, kObjectOwned0 | kObjectOwned0 << 1) << "the payload is its own, and the trie";
   EXPECT_EQ(LXCpUnicodeToCharW(object, 0x2603), '?');
