@@ -28,6 +28,7 @@ template <class F>
 struct CaseRun {
   using Form = F;
   using Unit = typename F::Unit;
+  static constexpr F form{};
   const Case& c;
   const TinyCodepage& cp;
   CaseLibrary& library;
@@ -90,6 +91,13 @@ struct CaseRun {
   }
   void text(const std::vector<Unit>& got, LXShiftState state = 0) {
     EXPECT_EQ(testing::PrintToString(got), testing::PrintToString(units(c.expected.text(), state)));
+  }
+  /// What was written is the expected text, with a null or without, and how much the function says it is.
+  void expect_output(const std::vector<Unit>& out, int32_t result, bool null_too = false) {
+    auto text = units(c.expected.text(), states.output);
+    if (null_too) text.push_back(0);
+    EXPECT_EQ(testing::PrintToString(out), testing::PrintToString(text));
+    EXPECT_EQ(result, c.expected.number("returns", count_of(text)));
   }
   /// What `put` writes into a buffer of this size.
   template <class Put>

@@ -52,19 +52,17 @@ class CaseLocale {
  public:
   CaseLocale(CaseLibrary& library, const Case& c, const TinyCodepage& cp) {
     std::string language = "English", sort;
-    bool changed = c.family == "items";  // which sets them
+    std::vector<const CaseWords::Word*> values;
     for (const CaseWords& with : c.with)
       for (const CaseWords::Word& w : with.all)
         if (w.name == "language" || w.name == "sort")
           (w.name == "sort" ? sort : language) = w.value;
         else
-          changed = true;
+          values.push_back(&w);
+    const bool changed = !values.empty() || c.family == "items";  // which sets them
     locale_ = changed ? library.new_locale(cp, language, sort) : library.locale(cp, language, sort);
-    if (!changed) return;
-    own_.reset(locale_);
-    for (const CaseWords& with : c.with)
-      for (const CaseWords::Word& w : with.all)
-        if (w.name != "language" && w.name != "sort") set(w);
+    if (changed) own_.reset(locale_);
+    for (const CaseWords::Word* w : values) set(*w);
   }
   LXLocale* get() const { return locale_; }
 
@@ -74,6 +72,8 @@ class CaseLocale {
                                                        {"thousands", LX_ITEM_THOUSANDS},
                                                        {"grouping", LX_ITEM_GROUPING},
                                                        {"digits", LX_ITEM_DIGITS},
+                                                       {"monetary-decimal", LX_ITEM_MONETARY_DECIMAL},
+                                                       {"monetary-thousands", LX_ITEM_MONETARY_THOUSANDS},
                                                        {"currency", LX_ITEM_CURRENCY},
                                                        {"currency-grouping", LX_ITEM_MONETARY_GROUPING},
                                                        {"currency-digits", LX_ITEM_CURRENCY_DIGITS},
@@ -111,19 +111,20 @@ class Cases : public testing::TestWithParam<std::string> {
     const auto of_kind = [&](const std::string& m) { return (m[0] == '@') == codepage; };
     return std::any_of(c.marks.begin(), c.marks.end(), of_kind) && !named(c, mark);
   }
+  template <class Is>
+  static bool any_word(const Case& c, Is is) {
+    const auto& given = c.given.all;
+    const auto& expected = c.expected.all;
+    return std::any_of(given.begin(), given.end(), is) || std::any_of(expected.begin(), expected.end(), is);
+  }
   static bool fits(const Case& c, const TinyCodepage& cp) {
-    if (c.family == "stream")
-      return named(c, "@" + cp.file.name);  // its texts are of the codepages that it names
-    for (const CaseWords* words : {&c.given, &c.expected})
-      for (const CaseWords::Word& w : words->all)
-        if (w.quoted && w.name != "says" && !w.text.in(cp)) return false;
-    return !excluded(c, "@" + cp.file.name, true) && (cp.file.name != "ODD" || named(c, "@ODD"));
+    const std::string mark = "@" + cp.file.name;
+    if (c.family == "stream") return named(c, mark);  // its texts are of the codepages that it names
+    const auto lacks = [&](const CaseWords::Word& w) { return w.quoted && w.name != "says" && !w.text.in(cp); };
+    return !any_word(c, lacks) && !excluded(c, mark, true) && (cp.file.name != "ODD" || named(c, mark));
   }
   static bool raw(const Case& c) {
-    for (const CaseWords* words : {&c.given, &c.expected})
-      for (const CaseWords::Word& w : words->all)
-        if (w.text.raw()) return true;
-    return false;
+    return any_word(c, [](const CaseWords::Word& w) { return w.text.raw(); });
   }
 
   template <class F>

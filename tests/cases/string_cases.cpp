@@ -18,66 +18,10 @@ void expect_span(R& r, int32_t got, const CaseText& text) {
       got, static_cast<int32_t>(whole.behind(static_cast<size_t>(at), whole.units.size(), whole.units.size())));
 }
 
-template <class R>
-void find_character(R& r) {
-  const auto text = r.input();
-  r.place(R::Form::chr(r.l, text.data(), text.length, r.character(), r.flags), text);
-}
-template <class R>
-void span(R& r, bool of_the_set) {
+template <class R, class Door>
+void span(R& r, const Door& door) {
   const auto text = r.input(), set = r.input("", 0, "set-length");
-  const auto door = of_the_set ? R::Form::spn : R::Form::cspn;
   expect_span(r, door(r.l, text.data(), text.length, set.data(), set.length, r.flags), *text.text);
-}
-template <class R>
-void find(R& r) {
-  const auto text = r.input(), part = r.input("", 0, "part-length");
-  r.place(R::Form::str(r.l, text.data(), text.length, part.data(), part.length, r.flags), text);
-}
-template <class R>
-void copy(R& r) {
-  const auto text = r.input("", states.text);
-  int32_t result = 0;
-  const int32_t room = r.given().number("size", 99);
-  const auto out = r.output(room, &result, [&](auto* to, int32_t size) {
-    return R::Form::cpy(r.l, to, size, text.data(), text.length, r.flags);
-  });
-  auto expected = r.units(r.expected().text(), states.text);
-  if (r.null && expected.size() + 1 == text.block.size() && room == 99) expected.push_back(0);
-  EXPECT_EQ(testing::PrintToString(out), testing::PrintToString(expected));
-}
-template <class R>
-void join(R& r) {
-  auto buffer = r.input().block;
-  const auto text = r.input("", states.text);
-  buffer.resize(buffer.size() - (r.null ? 1 : 0));
-  buffer.push_back(0);
-  const int32_t size = r.given().number("size", 99);
-  buffer.resize(99);
-  const int32_t result = R::Form::cat(r.l, buffer.data(), size, text.data(), text.length, r.flags);
-  const auto end = std::find(buffer.begin(), buffer.end(), 0);
-  EXPECT_EQ(result, r.expected().number("returns", static_cast<int32_t>(end - buffer.begin()) + 1));
-  r.text({buffer.begin(), end});
-}
-template <class R>
-void tokens(R& r) {
-  auto text = r.input();
-  const auto set = r.input();
-  for (const Units& token :
-       tokens_of(typename R::Form(), r.cp, r.l, text.block, text.length, set.block, set.length, r.flags))
-    EXPECT_EQ(shown(token), shown(r.expected().text().units()));
-}
-template <class R>
-void truncate(R& r) {
-  auto text = r.input().block;
-  if (!r.null) text.push_back(0);
-  const std::vector<char> before = text;
-  const int32_t result = R::Form::truncate(r.l, text.data(), r.given().number("size", 99), r.flags);
-  auto expected = r.units(r.expected().text());
-  EXPECT_EQ(result, r.expected().number("returns", count_of(expected) + 1));
-  expected.push_back(0);
-  expected.insert(expected.end(), before.begin() + count_of(expected), before.end());
-  EXPECT_EQ(testing::PrintToString(text), testing::PrintToString(expected));
 }
 template <class R>
 std::vector<typename R::Unit> terminated(R& r) {
@@ -85,25 +29,70 @@ std::vector<typename R::Unit> terminated(R& r) {
   text.push_back(0);
   return text;
 }
-void terminate(CaseRun<Ex>& r) {
-  int32_t result = 0;
-  r.text(r.output(2, &result,
-                  [&](char* to, int32_t) { return LXTerminateStringEx(r.l, to, states.text, r.flags); }));
-  r.number(result);
-}
 
 }  // namespace
 
 Families string_families() {
-  return {{"character", in_four_forms([](auto& r) { find_character(r); })},
-          {"span", in_four_forms([](auto& r) { span(r, true); })},
-          {"span-to", in_four_forms([](auto& r) { span(r, false); })},
-          {"find", in_four_forms([](auto& r) { find(r); })},
-          {"copy", in_four_forms([](auto& r) { copy(r); })},
-          {"join", in_four_forms([](auto& r) { join(r); })},
-          {"tokens", in_four_forms([](auto& r) { tokens(r); })},
-          {"truncate", in_bytes([](auto& r) { truncate(r); })},
-          {"terminate", {nullptr, terminate, nullptr, nullptr}},
+  return {{"character", in_four_forms([](auto& r) {
+             const auto text = r.input();
+             r.place(r.form.chr(r.l, text.data(), text.length, r.character(), r.flags), text);
+           })},
+          {"span", in_four_forms([](auto& r) { span(r, r.form.spn); })},
+          {"span-to", in_four_forms([](auto& r) { span(r, r.form.cspn); })},
+          {"find", in_four_forms([](auto& r) {
+             const auto text = r.input(), part = r.input("", 0, "part-length");
+             r.place(r.form.str(r.l, text.data(), text.length, part.data(), part.length, r.flags), text);
+           })},
+          {"copy", in_four_forms([](auto& r) {
+             const auto text = r.input("", states.text);
+             int32_t result = 0;
+             const int32_t room = r.given().number("size", 99);
+             const auto out = r.output(room, &result, [&](auto* to, int32_t size) {
+               return r.form.cpy(r.l, to, size, text.data(), text.length, r.flags);
+             });
+             states.output = states.text;
+             r.expect_output(out, result, r.null && room == 99 && r.error == LX_OK);
+           })},
+          {"join", in_four_forms([](auto& r) {
+             auto buffer = r.input().block;
+             const auto text = r.input("", states.text);
+             buffer.resize(buffer.size() - (r.null ? 1 : 0));
+             buffer.push_back(0);
+             const int32_t size = r.given().number("size", 99);
+             buffer.resize(99);
+             const int32_t result = r.form.cat(r.l, buffer.data(), size, text.data(), text.length, r.flags);
+             const auto end = std::find(buffer.begin(), buffer.end(), 0);
+             EXPECT_EQ(result, r.expected().number("returns", static_cast<int32_t>(end - buffer.begin()) + 1));
+             r.text({buffer.begin(), end});
+           })},
+          {"tokens", in_four_forms([](auto& r) {
+             auto text = r.input();
+             const auto set = r.input();
+             for (const Units& token :
+                  tokens_of(r.form, r.cp, r.l, text.block, text.length, set.block, set.length, r.flags))
+               EXPECT_EQ(shown(token), shown(r.expected().text().units()));
+           })},
+          {"truncate", in_bytes([](auto& r) {
+             auto text = r.input().block;
+             if (!r.null) text.push_back(0);
+             const std::vector<char> before = text;
+             const int32_t result = r.form.truncate(r.l, text.data(), r.given().number("size", 99), r.flags);
+             auto expected = r.units(r.expected().text());
+             EXPECT_EQ(result, r.expected().number("returns", count_of(expected) + 1));
+             expected.push_back(0);
+             expected.insert(expected.end(), before.begin() + count_of(expected), before.end());
+             EXPECT_EQ(testing::PrintToString(text), testing::PrintToString(expected));
+           })},
+          {"terminate",
+           {nullptr,
+            [](auto& r) {
+              int32_t result = 0;
+              r.text(r.output(2, &result, [&](char* to, int32_t) {
+                return LXTerminateStringEx(r.l, to, states.text, r.flags);
+              }));
+              r.number(result);
+            },
+            nullptr, nullptr}},
           {"length",
            {nullptr, nullptr, [](auto& r) { r.number(LXWcslen(r.l, terminated(r).data())); },
             [](auto& r) { r.number(LXStrlenU(r.l, terminated(r).data())); }}}};

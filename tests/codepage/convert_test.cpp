@@ -103,17 +103,17 @@ TEST_F(Convert, BetweenCodepages) {
 /// rely on it.
 TEST_F(Convert, UndefinedFlagsBesideCharacters) {
   LXLocale* const l = locale(case_codepage("SJIS"));
-  const LXWChar codes[] = {'a', 0};
-  LXWChar wide[4];
-  LXUChar unicode[4];
-  char out[4];
   const I flags = LX_CHARACTERS | 0x10;
-  EXPECT_EQ(LXConvertString(l, out, 4, l, "a", 1, flags), 0);
-  EXPECT_EQ(LXConvertStringEx(l, out, 0, 4, l, "a", 0, 1, flags), 0);
-  EXPECT_EQ(LXConvertStringW(l, wide, 4, l, codes, 1, flags), 0);
-  EXPECT_EQ(LXGetError(l), LX_E_INVALID);
-  EXPECT_EQ(LXStringToUnicode(unicode, 4, l, "a", 1, flags), -1);
-  EXPECT_EQ(LXMbToWide(l, wide, 4, "a", 1, flags), -1);
+  LXWChar codes[4];
+  const auto refuse = [&](const auto& form) {
+    typename std::decay_t<decltype(form)>::Unit in[] = {'a', 0}, out[4];
+    LXUChar unicode[4];
+    EXPECT_EQ(form.convert(l, out, 4, l, in, 1, flags), 0);
+    EXPECT_EQ(LXGetError(l), LX_E_INVALID);
+    EXPECT_EQ(form.decode(unicode, 4, l, in, 1, flags), -1);
+  };
+  refuse(kPlain), refuse(kEx), refuse(kWide);
+  EXPECT_EQ(LXMbToWide(l, codes, 4, "a", 1, flags), -1);
 }
 
 /// ASCII is moved in blocks: another character at every place of a text that is longer than two of them, also
@@ -165,36 +165,28 @@ TEST(ConvertOneWay, ReadingDiffersFromWriting) {
   EXPECT_TRUE(library.close());
 }
 
-TEST_F(Convert, ByCodepageObjectAndThroughTheCommonOne) {
-  const LXObject* const object = locale(case_codepage("EUC"))->codepage;
+/// The common codepage, with a null behind what is stored; nothing gives -1.
+TEST_F(Convert, ThroughTheCommonCodepage) {
   const struct {
     std::string text;  // no more bytes than these may be read
-    I length, by_object, by_common;
-  } rows[] = {
-      {{"ab\0", 3}, -1, 2, 2}, {{"ab\0", 3}, -2, 2, 2}, {{"ab\0z", 4}, 4, 2, 2}, {"abc", 3, 3, 3},
-      {"abc", 2, 2, 2},        {{"\0", 1}, -1, -1, -1}, {{"\0a", 2}, 2, 0, -1},  {"a", 0, 0, -1},
-  };
+    I length, result;
+  } rows[] = {{{"ab\0", 3}, -1, 2}, {{"ab\0", 3}, -2, 2}, {{"ab\0z", 4}, 4, 2}, {"abc", 3, 3},
+              {"abc", 2, 2},        {{"\0", 1}, -1, -1},  {{"\0a", 2}, 2, -1},  {"a", 0, -1}};
   for (const auto& row : rows) {
     SCOPED_TRACE(testing::PrintToString(row.text) + std::to_string(row.length));
     const std::vector<char> text(row.text.begin(), row.text.end());
-    std::vector<LXUChar> units(static_cast<size_t>(std::max(row.by_object, 0)) + 1, 0xA5A5);
-    EXPECT_EQ(LXCpStrToUnicode(object, text.data(), row.length, units.data()), row.by_object);
-    EXPECT_TRUE(std::equal(units.begin(), units.end() - 1, row.text.begin()));
-    EXPECT_EQ(units.back(), 0xA5A5) << "no null is stored";
-    EXPECT_EQ(LXComStrToUnicode(text.data(), row.length, units.data()), row.by_common);
-    EXPECT_TRUE(std::equal(units.begin(), units.end() - 1, row.text.begin()));
-    EXPECT_EQ(units.back(), 0);
     const std::vector<LXUChar> input(row.text.begin(), row.text.end());
-    std::vector<char> out(units.size(), '\xA5');
-    EXPECT_EQ(LXComUnicodeToStr(input.data(), row.length, out.data()), row.by_common);
-    EXPECT_TRUE(std::equal(out.begin(), out.end() - 1, row.text.begin()));
-    EXPECT_EQ(out.back(), 0);
+    const auto stored = static_cast<size_t>(std::max(row.result, 0));
+    std::vector<LXUChar> units(stored + 1, 0xA5A5);
+    EXPECT_EQ(LXComStrToUnicode(text.data(), row.length, units.data()), row.result);
+    std::vector<char> out(stored + 1, '\xA5');
+    EXPECT_EQ(LXComUnicodeToStr(input.data(), row.length, out.data()), row.result);
+    const std::string expected = row.text.substr(0, stored) + '\0';
+    EXPECT_TRUE(std::equal(units.begin(), units.end(), expected.begin()));
+    EXPECT_TRUE(std::equal(out.begin(), out.end(), expected.begin()));
   }
-  const LXUChar units[] = {'a', 0, 0x3042, 0x4E02, 0}, beyond[] = {0xE9, 0x3042, 0};
-  char out[16] = {};
-  EXPECT_EQ(LXCpUnicodeToStr(object, units, 0, -1, out), 1);
-  EXPECT_EQ(LXCpUnicodeToStr(object, units, 1, 4, out), 7) << "a length goes past nulls";
-  EXPECT_EQ(std::string(out, 8), std::string("a\0\xA4\xA2\x8F\xB0\xA1\0", 8));
+  const LXUChar beyond[] = {0xE9, 0x3042, 0};
+  char out[3];
   EXPECT_EQ(LXComUnicodeToStr(beyond, -1, out), 2);
   EXPECT_STREQ(out, "??");
   LXUChar unit[2];

@@ -16,6 +16,8 @@ struct Piece {
   LXUChar unicode, first, source;
 };
 
+using lexicor_data::SpecialMapping;
+
 class Map : public CaseTest {
  protected:
   LXLocale* locale(const TinyCodepage& cp) { return library.locale(cp, "Special"); }
@@ -37,29 +39,32 @@ class Map : public CaseTest {
   /// `cp` null: Unicode itself.
   static std::vector<Piece> mapped(const TinyCodepage* cp, const Units& text, uint32_t mode) {
     static const std::vector<SpecialMapping> none;
-    const auto& specials = mode == LX_MAP_UPPER   ? upper_specials()
-                           : mode == LX_MAP_LOWER ? lower_specials()
+    const auto& specials = mode == LX_MAP_UPPER   ? special_language().special_upper
+                           : mode == LX_MAP_LOWER ? special_language().special_lower
                                                   : none;
     std::vector<Piece> pieces;
     for (size_t i = 0; i < text.size(); ++i) {
       const SpecialMapping* match = nullptr;
       for (const bool pair : {false, true})
         for (const SpecialMapping& s : specials)
-          if (match == nullptr && s.first == text[i] && (s.second != 0) == pair &&
-              (!pair || (i + 1 < text.size() && s.second == text[i + 1])))
+          if (match == nullptr && s.from[0] == text[i] && (s.from[1] != 0) == pair &&
+              (!pair || (i + 1 < text.size() && s.from[1] == text[i + 1])))
             match = &s;
       if (match == nullptr) {
         const LXUChar u = alone(text[i], mode, cp != nullptr && cp->width == 1);
         // The width tables of UTF-8 are those of all Unicode.
         const bool wide = cp != nullptr && cp->file.name == "UTF8" &&
                           (mode == LX_MAP_FULL_WIDTH || mode == LX_MAP_HALF_WIDTH);
-        const bool has = cp == nullptr || wide || cp->find(u) != nullptr;
+        bool has = cp == nullptr || wide || cp->find(u) != nullptr;
+        // A character of several bytes has its other case among these.
+        if (cp != nullptr && has && (mode & 4) != 0)
+          has = (cp->find(u)->code > 0xFF) == (cp->find(text[i])->code > 0xFF);
         pieces.push_back({has ? u : text[i], text[i], text[i]});
         continue;
       }
-      if (match->second != 0) ++i;
-      pieces.push_back({match->result1, match->first, text[i]});
-      if (match->result2 != 0) pieces.push_back({match->result2, text[i], text[i]});
+      if (match->from[1] != 0) ++i;
+      pieces.push_back({match->to[0], match->from[0], text[i]});
+      if (match->to[1] != 0) pieces.push_back({match->to[1], text[i], text[i]});
     }
     return pieces;
   }
@@ -175,24 +180,6 @@ TEST_F(Map, CodepageDoors) {
   EXPECT_EQ(mapped[1], 0x8140u) << "what the codepage has not is copied";
   EXPECT_EQ(LXUnicodeToUpper(single, 0xFF), 0x178);
   EXPECT_EQ(LXUnicodeToF2H(single, LXUnicodeToH2F(single, 'A')), 'A');
-}
-
-/// The language Special: exact matches in the table of the selector, 44 for upper and 45 for lower case.
-TEST_F(Map, SpecialsOfALanguage) {
-  const LXObject* const language = locale(case_codepage("SINGLE"))->language;
-  const struct {
-    LXUChar first, second;
-    int32_t selector, result;
-    LXUChar result1, result2;
-  } rows[] = {{0xDF, 0, 44, 2, 'S', 'S'},  {'r', 0, 44, 1, 0x2603, 0}, {'i', 'j', 44, 1, 'A', 0},
-              {'i', 'k', 44, 0, 7, 8},     {'Q', 0, 44, 0, 7, 8},      {'Q', 0, 45, 1, 0x3041, 0},
-              {'I', 'J', 45, 2, 'a', 'b'}, {0xDF, 0, 45, 0, 7, 8}};
-  for (const auto& row : rows) {
-    LXUChar result1 = 7, result2 = 8;
-    EXPECT_EQ(LXLangGetSpecial(language, row.first, row.second, &result1, &result2, row.selector), row.result);
-    EXPECT_EQ(result1, row.result1);
-    EXPECT_EQ(result2, row.result == 1 ? result2 : row.result2);
-  }
 }
 
 /// With LX_CHARACTERS at most 512 bytes are mapped, and six for each character of the size.

@@ -1,5 +1,4 @@
-// Walking, counting, packing and storing characters, in every kind of text: rules on random valid text, and
-// packed codes.
+// Walking and counting characters in every kind of text: rules on random valid text.
 #include "core/lxrecords.h"
 #include "support/case_test.h"
 
@@ -101,34 +100,6 @@ TEST_F(Navigation, EveryCharacterForwardsAndBackwards) {
       }
       counts(cp, text, initial);
     }
-  }
-}
-
-TEST_F(Navigation, PackedCodes) {
-  const struct {
-    uint32_t code;
-    int32_t length;  // zero bytes counted
-    std::string bytes;
-  } rows[] = {{0x00, 1, {"\0", 1}},
-              {0x41, 1, "A"},
-              {0x82A0, 2, "\x82\xA0"},
-              {0x8200, 2, {"\x82\0", 2}},
-              {0x820041, 3, "\x82\x41"},
-              {0x8FB0A1, 3, "\x8F\xB0\xA1"},
-              {0x90000030, 4, "\x90\x30"},
-              {0x90308130, 4, "\x90\x30\x81\x30"},
-              {0x90300030, 4, "\x90\x30\x30"},
-              {0x90008100, 4, {"\x90\x81\0", 3}}};
-  LXLocale* locale = library.locale(case_codepage("SINGLE"));
-  for (const auto& row : rows) {
-    SCOPED_TRACE(row.code);
-    EXPECT_EQ(LXStrByteLength(row.code), row.length);
-    EXPECT_EQ(LXByteLengthW(locale, row.code), row.length);
-    std::vector<char> stored(row.bytes.size()), put(row.bytes.size());  // exact
-    EXPECT_EQ(LXWToMb(stored.data(), row.code), count_of(row.bytes));
-    EXPECT_EQ(LXPutChar(locale, put.data(), row.code), 0);
-    EXPECT_EQ(std::string(stored.begin(), stored.end()), row.bytes);
-    EXPECT_EQ(put, stored);
   }
 }
 

@@ -1,5 +1,5 @@
-// Streaming conversion: any split of the input and of the output gives the bytes of the whole; what the ratio
-// is. The steps one by one are cases.
+// Streaming conversion: any split of the input and of the output gives the bytes of the whole. The
+// steps one by one are cases.
 #include "support/case_test.h"
 #include "support/conversion.h"
 
@@ -50,24 +50,16 @@ TEST_F(Stream, AnySplitGivesTheWhole) {
       const Units text = random_text(from);
       const std::string input = from.encode({text.begin(), text.end()});
       const std::string expected = to.encode({text.begin(), text.end()});
-      const auto roomy = [] { return 4000; };
       int32_t code = -1;
-      for (size_t at = 0; at <= input.size(); ++at) {
-        Conversion split(locale(to), locale(from));
-        std::string output = convert(split, input.substr(0, at), roomy, &code);
-        EXPECT_TRUE(code == LX_OK || code == LX_E_INPUT_CUT);
-        output += convert(split, input.substr(at), roomy, &code);
-        EXPECT_EQ(code, LX_OK);
-        ASSERT_EQ(printed(output), printed(expected)) << at;
-      }
-      for (int round = 0; round < 30; ++round) {
+      for (int round = 0; round < 60; ++round) {
         Conversion pieces(locale(to), locale(from));
         std::string output;
         const auto room = [&] { return kLeastRoom + static_cast<int32_t>(random() % 6); };
-        const size_t longest = 1 + random() % 12;
+        const size_t longest = 1 + random() % (round % 2 == 0 ? 12 : input.size());
         for (size_t at = 0; at < input.size();) {
           const size_t n = std::min<size_t>(1 + random() % longest, input.size() - at);
           output += convert(pieces, input.substr(at, n), room, &code);
+          EXPECT_TRUE(code == LX_OK || code == LX_E_INPUT_CUT);
           at += n;
         }
         EXPECT_EQ(code, LX_OK);
@@ -75,21 +67,6 @@ TEST_F(Stream, AnySplitGivesTheWhole) {
       }
     }
   }
-}
-
-TEST_F(Stream, Ratio) {
-  const auto expect = [&](const TinyCodepage& to, const TinyCodepage& from, int32_t ratio) {
-    LXGetCharTypeU(locale(to), 'A', 0);
-    EXPECT_EQ(LXConversionRatio(locale(to), locale(from)), ratio) << to.file.name;
-    EXPECT_EQ(LXGetError(locale(to)), LX_OK);
-  };
-  const TinyCodepage &single = case_codepage("SINGLE"), &sjis = case_codepage("SJIS");
-  for (const TinyCodepage& same : case_codepages()) expect(same, same, 1);
-  expect(single, sjis, 1);
-  expect(sjis, single, 2);
-  expect(case_codepage("FOUR"), sjis, 4);
-  expect(case_codepage("UTF8"), single, 3);
-  expect(case_codepage("SHIFT"), sjis, 3);
 }
 
 TEST_F(Stream, ClosingReportsAFailingFree) {

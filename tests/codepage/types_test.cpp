@@ -1,7 +1,6 @@
 // Character types through the doors, the type records, and the tables of the built-in codepage.
 #include "codepage/lxcodepage.h"
 #include "codepage/lxunicode.h"
-#include "core/lxmemory.h"
 #include "support/case_test.h"
 
 namespace lx::test {
@@ -59,17 +58,14 @@ TEST_F(Types, BytesWithoutACharacterAndShiftBytes) {
 /// As the compiler packs it, but for page 0, which has all its bytes, and for the two line ends and the
 /// substitution behind the low array.
 TEST(BuiltInCodepage, Payload) {
-  const auto section = [](size_t n) {
-    const Bytes bytes = kBuiltInCodepage.sections.section[n];
-    return ByteString(bytes.data, bytes.data + bytes.size);
-  };
+  const std::vector<ByteString> built_in = ascii_codepage();
   ByteString packed = CodepageBuilder(1, "US-ASCII", 1).ascii().build().file.sections[0];
   fmt::PageEntry{fmt::kKindByte, 0xFF, 0x00, 0xFF, 0, 0}.write(&packed[fmt::kPages]);
-  EXPECT_EQ(section(0), packed);
+  EXPECT_EQ(built_in[0], packed);
   ByteString low;
   for (unsigned b = 0; b < 256; ++b) low.push_back(b < 0x80 ? static_cast<uint8_t>(b) : '?');
   low.insert(low.end(), {0x0A, 0x0A, '?'});
-  EXPECT_EQ(section(2), low);
+  EXPECT_EQ(built_in[2], low);
 }
 
 /// In force when there is no directory; its derived data are compiled in and must be what loading would derive.
@@ -87,11 +83,9 @@ TEST(BuiltInCodepage, DerivedData) {
     all.insert(all.end(), {c.rows != nullptr, c.codes32 != nullptr});
     return all;
   };
-  EXPECT_EQ(kCodepageType.validate(1, kBuiltInCodepage.sections).code, LX_OK);
-  void* derived = derive_codepage(1, kBuiltInCodepage.sections);
-  ASSERT_NE(derived, nullptr);
-  EXPECT_EQ(values(derived), values(kBuiltInCodepage.derived));
-  EXPECT_TRUE(hook_free(derived));
+  const CodepageObject loaded(1, ascii_codepage());
+  ASSERT_EQ(loaded.code(), LX_OK);
+  EXPECT_EQ(values(loaded.object()->derived), values(kBuiltInCodepage.derived));
 }
 
 }  // namespace

@@ -4,6 +4,7 @@
 
 #include "codepage/lxcodepage.h"
 #include "core/lxformat.h"
+#include "support/damage.h"
 #include "support/tiny_codepages.h"
 
 namespace lx::test {
@@ -13,7 +14,6 @@ namespace fmt = format::codepage;
 using S = std::vector<ByteString>;
 
 constexpr uint16_t kId = 9100;
-constexpr size_t kFixedBytes1 = fmt::in_version1(fmt::kFixedBytes);
 
 /// The sections with the range of all bytes in every node and the values at a multiple of four, as an upgrade
 /// leaves them. The upgrade sets no shift bytes.
@@ -80,12 +80,10 @@ TEST(Upgrade, GivesBackEveryCodepage) {
 TEST(Upgrade, OfASingleByteCodepageNothingElseIsTaken) {
   TinyLibrary library({tiny_single()});
   const S expected = full_ranges(tiny_single().file.sections);
-  for (uint8_t width : {uint8_t{0}, uint8_t{1}}) {
+  for (const uint8_t width : {uint8_t{0}, uint8_t{1}}) {
     S old = version1_codepage(expected);
     old[0][fmt::kWidth] = width;
-    for (size_t field = fmt::kFullWidth; field < fmt::kFixedBytes; field += 2)
-      put_le16(&old[0][fmt::in_version1(field)], 0x1234);
-    old[0].push_back(0x77);
+    change_sections(&old, "0:full_width-4 = 0x1234 0x1234 0x1234 0x1234 0x1234; 0:size = size0+1");
     S made = upgrade(&library, old, fmt::kFixedBytes, 0);
     EXPECT_EQ(made[0][fmt::kWidth], width);
     made[0][fmt::kWidth] = 1;
@@ -94,32 +92,23 @@ TEST(Upgrade, OfASingleByteCodepageNothingElseIsTaken) {
   }
 }
 
-/// Through the door, and as files.
+/// Through the door, and as files. Fields stand four bytes further in front.
 TEST(Upgrade, Damaged) {
-  const struct {
-    const char* what;
-    void (*apply)(S&);
-  } damages[] = {
-      {"no whole fixed part", [](S& s) { s[0].resize(kFixedBytes1 - 1); }},
-      {"no payload to speak of", [](S& s) { s[0].resize(5); }},
-      {"values behind the section",
-       [](S& s) { s[1].resize(le16(&s[0][fmt::in_version1(fmt::kUnicodeValues)]) - 1u); }},
-      {"an offset that cannot be moved",
-       [](S& s) { put_le16(&s[0][fmt::in_version1(fmt::kTypeTrie)], 0xFFFD); }},
-      {"values that cannot be moved",
-       [](S& s) {
-         s[1].resize(50000);
-         put_le16(&s[0][fmt::in_version1(fmt::kUnicodeValues)], 45000);
-       }},
+  const char* const damages[][2] = {
+      {"no whole fixed part", "0:size = fixed-5"},
+      {"no payload to speak of", "0:size = 5"},
+      {"values behind the section", "1:size = @4370-1"},
+      {"an offset that cannot be moved", "0:type_trie-4 = 0xFFFD"},
+      {"values that cannot be moved", "1:size = 50000; 0:unicode_values-4 = 45000"},
   };
-  for (const auto& damage : damages) {
-    SCOPED_TRACE(damage.what);
+  for (const auto& [what, changes] : damages) {
+    SCOPED_TRACE(what);
     S old = multibyte();
-    damage.apply(old);
+    change_sections(&old, changes);
     TinyLibrary library({file_of(old)});
     EXPECT_EQ(upgrade(&library, old, 0, 0), S(2));
     int32_t rc = -1;
-    EXPECT_EQ(library.object(kId, &rc), nullptr);
+    EXPECT_EQ(LXGetObjFromID(nullptr, LX_CODEPAGE, kId, LX_FIND_AND_LOAD, &rc), nullptr);
     EXPECT_EQ(rc, LX_E_CORRUPT);
     EXPECT_TRUE(library.close());
   }
@@ -128,7 +117,7 @@ TEST(Upgrade, Damaged) {
 TEST(Upgrade, AtLoad) {
   TinyLibrary library({file_of(multibyte())});
   int32_t rc = -1;
-  const LXObject* const object = library.object(kId, &rc);
+  const LXObject* const object = LXGetObjFromID(nullptr, LX_CODEPAGE, kId, LX_FIND_AND_LOAD, &rc);
   ASSERT_NE(object, nullptr);
   EXPECT_EQ(object->disk.flags, kObjectOwned0 | kObjectOwned0 << 1) << "the payload is its own, and the trie";
   EXPECT_EQ(LXCpUnicodeToCharW(object, 0x2603), '?');

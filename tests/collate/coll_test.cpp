@@ -5,6 +5,7 @@
 
 #include "collate/lxsort.h"
 #include "support/case_test.h"
+#include "support/damage.h"
 
 namespace lx::test {
 namespace {
@@ -35,46 +36,6 @@ class CollateTest : public ::testing::Test {
   std::unique_ptr<CaseLibrary> library;
   LXLocale* in = nullptr;
 };
-
-std::string shown_weights(const LXWeights& w) {
-  std::string text;
-  for (unsigned weight :
-       {unsigned{w.primary}, unsigned{w.secondary}, unsigned{w.tertiary}, unsigned{w.special}})
-    text += std::to_string(weight) + ' ';
-  return text;
-}
-
-TEST_F(CollateTest, Weights) {
-  open(example_sort());
-  const LXObject* const sort = in->sort;
-  const struct {
-    LXUChar first, second;  // of a pair
-    int32_t sets;
-    LXWeights weights[2];
-    uint8_t char_class;
-  } rows[] = {{'z', 0, 1, {{0x221, 1, 1, 0}, {}}, 7},
-              {0xE6, 0, 2, {{0x200, 2, 1, 0}, {0x208, 1, 1, 0}}, kAppendAll},
-              {'-', 0, 1, {{0, 0, 0, 7}, {}}, kAppendAll},
-              {0x4E05, 0, 1, {{0x3005, 0, 0, 0}, {}}, kAppendAll},
-              {0x2010, 0, 1, {{0, 0, 0, 0x60}, {}}, kAppendAll},
-              {0x401, 0, 0, {{}, {}}, 0},                         // of a page that is not covered
-              {'c', 'h', 1, {{0x203, 1, 1, 0}, {}}, kAppendAll},  // the first record counts
-              {'h', 'c', 0, {{}, {}}, 0}};
-  for (const auto& row : rows) {
-    SCOPED_TRACE(row.first);
-    LXWeights w[2] = {};
-    uint8_t char_class = 0;
-    const int32_t sets =
-        row.second != 0
-            ? LXSortGetCombination(sort, row.first, row.second, &w->primary, &w->secondary, &w->tertiary,
-                                   &w->special, &char_class)
-            : LXSortGetWeights(sort, row.first, &w->primary, &w->secondary, &w->tertiary, &w->special,
-                               &w[1].primary, &w[1].secondary, &w[1].tertiary, &w[1].special, &char_class);
-    EXPECT_EQ(sets, row.sets);
-    for (int i = 0; i < row.sets; ++i) EXPECT_EQ(shown_weights(w[i]), shown_weights(row.weights[i]));
-    EXPECT_TRUE(sets == 0 || char_class == row.char_class) << char_class;
-  }
-}
 
 /// A character is read ahead whether a pair begins with the one before it or not. U+FFFF, which stands for none,
 /// is left where it is.
@@ -176,7 +137,7 @@ SortBuilder random_sort(std::mt19937* random, unsigned inserting) {
   for (int i = 0; i < 3; ++i)
     sort.pairs.push_back(
         {static_cast<LXUChar>('a' + below(4)), static_cast<LXUChar>('a' + below(4)), weight()});
-  sort.computed[0x4E] = {2, kAppendAll, static_cast<uint16_t>(0x300 - 0x50)};
+  sort.computed[0x4E] = {lexicor_data::SortPageKind::kPrimary, 0x300 - 0x50, kAppendAll, {}};
   return sort;
 }
 
@@ -242,35 +203,23 @@ TEST_F(CollateTest, KeysOrderAsComparisonDoes) {
   EXPECT_GT(different, 100000);
 }
 
-TEST_F(CollateTest, SpecialsBehindPairs) {
-  SortBuilder sort = example_sort();
-  for (LXUChar inserted : units("yz12")) sort.characters.erase(inserted);
-  sort.characters['x'] = letter(0x203);  // as "ch"
-  open(sort);
-  EXPECT_EQ(compare(kUnicode, units("ch"), units("x")), 0);
-  EXPECT_EQ(compare(kUnicode, units("ch-"), units("x-")), 1) << "the third character, not the second";
-  EXPECT_EQ(compare(kUnicode, units("ch-a"), units("x-b")), -1);
-}
-
 /// Every table lies inside the payload, or the sort is refused.
 TEST_F(CollateTest, BadSorts) {
-  const ByteString good = example_sort().payload();
-  const auto refused = [](const ByteString& payload) {
+  const auto refused = [](const std::string& changes) {
+    std::vector<ByteString> sorts{example_sort().payload()};
+    change_sections(&sorts, changes);
     Sections sections{};
-    sections.section[0] = {payload.data(), payload.size()};
+    sections.section[0] = {sorts[0].data(), sorts[0].size()};
     return static_cast<bool>(kSortType.validate(1, sections));
   };
-  EXPECT_FALSE(refused(good));
-  for (size_t field : {2, 4, 8, 8 + 4 * 0x4E, 1030, 1032, 1034}) {
-    ByteString bad = good;
-    bad[field] = bad[field + 1] = 0xFF;
-    EXPECT_EQ(refused(bad), field != 8 + 4 * 0x4E) << field << ": any base of a computed page will do";
-  }
-  ByteString end_outside = good;
-  put_le16(&end_outside[8], 600);  // of the first page, whose weights begin inside
-  EXPECT_TRUE(refused(end_outside));
-  for (size_t bytes = 0; bytes < good.size(); bytes += 97)
-    EXPECT_TRUE(refused({good.begin(), good.begin() + static_cast<ptrdiff_t>(bytes)})) << bytes;
+  EXPECT_FALSE(refused(""));
+  EXPECT_FALSE(refused("0:320 = 65535")) << "any base of a computed page will do";
+  // The weights of the first page begin inside with 600.
+  for (const char* bad : {"0:2 = 65535", "0:4 = 65535", "0:8 = 65535", "0:8 = 600", "0:1030 = 65535",
+                          "0:1032 = 65535", "0:1034 = 65535", "0:size = size0-1"})
+    EXPECT_TRUE(refused(bad)) << bad;
+  for (size_t bytes = 0; bytes < 1400; bytes += 97)
+    EXPECT_TRUE(refused("0:size = " + std::to_string(bytes))) << bytes;
 }
 
 }  // namespace

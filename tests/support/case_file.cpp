@@ -150,12 +150,6 @@ std::string CaseWords::word() const {
     if (!w.used && !w.quoted && w.value.empty()) return w.used = true, w.name;
   throw CaseError("a word is missing");
 }
-std::vector<std::string> CaseWords::rest() const {
-  std::vector<std::string> words;
-  for (const Word& w : all)
-    if (!w.used && !w.quoted && w.value.empty() && w.name != "refused") w.used = true, words.push_back(w.name);
-  return words;
-}
 int32_t CaseWords::number(const std::string& name, int32_t otherwise) const {
   const Word* const found = find(name, false);
   return found != nullptr ? static_cast<int32_t>(std::strtoll(found->value.c_str(), nullptr, 0)) : otherwise;

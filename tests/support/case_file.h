@@ -56,8 +56,6 @@ class CaseWords {
   const CaseText& text(const std::string& name = "") const;
   /// The next word that is not used; throws when there is none.
   std::string word() const;
-  /// All words that are not used, but for "refused" and those with values.
-  std::vector<std::string> rest() const;
   /// The number of this name.
   int32_t number(const std::string& name, int32_t otherwise) const;
   /// The words that nobody used.

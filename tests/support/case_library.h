@@ -5,6 +5,7 @@
 #include <string>
 #include <vector>
 
+#include "source_model.h"
 #include "support/forms.h"
 #include "support/sort_builder.h"
 #include "support/tiny_codepages.h"
@@ -19,12 +20,8 @@ const TinyCodepage& case_codepage(const std::string& name);
 /// The line feed, the carriage return and the two further line ends of one of these codepages.
 Units line_ends(const TinyCodepage& cp);
 
-struct SpecialMapping {
-  uint16_t first, second, result1, result2;  // second and result2 0 for none
-};
-/// Of the language Special. U+2603 is in UTF8 alone.
-const std::vector<SpecialMapping>& upper_specials();
-const std::vector<SpecialMapping>& lower_specials();
+/// The source of the language Special.
+const lexicor_data::LanguageSource& special_language();
 
 TestWeight letter(uint16_t primary, uint8_t secondary = 1, uint8_t tertiary = 1,
                   uint8_t char_class = kAppendAll);
@@ -32,10 +29,11 @@ TestWeight special(uint16_t weight);
 /// a to c, A above a on the tertiary level, an acute accent, a hyphen that is special, "ch" after c, ae as an
 /// expansion, digits that insert on the lower levels, and z, y and U+51xx that insert primaries.
 SortBuilder example_sort();
+/// The same, but that nothing inserts, and with x, which is as "ch".
+SortBuilder sort_without_insertion();
 
-/// Languages: English; Special; Kana, whose names begin with kana; Long, whose days run together besides, and
-/// which says AM in the afternoon. The territory Elsewhere, 276, has other separators, one of which is no ASCII,
-/// and a kana for a currency. The sort is called Test.
+/// Languages: English, and Special, Kana and Long of support/locale; there is also the territory Elsewhere, 276. The
+/// sorts are called Test and Steady.
 class CaseLibrary : public TinyLibrary {
  public:
   explicit CaseLibrary(const SortBuilder& sort = example_sort());

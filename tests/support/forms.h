@@ -7,6 +7,7 @@
 #include <ctime>
 #include <memory>
 #include <string>
+#include <tuple>
 #include <utility>
 #include <vector>
 
@@ -45,6 +46,7 @@ inline ShiftStates states;
   static constexpr auto next_weight = LXStrGetNextWeight##FORM;  \
   static constexpr auto map = LXMapString##FORM;                 \
   static constexpr auto grouping_size = LXStrGroupingSize##FORM; \
+  static constexpr auto digit = LXStrGetDigit##FORM;             \
   static constexpr auto write_long = LXLongToString##FORM;       \
   static constexpr auto write_double = LXDoubleToString##FORM;   \
   static constexpr auto write_amount = LXCurrencyToString##FORM; \
@@ -94,106 +96,89 @@ struct Unicode {
 };
 #undef LX_TEST_FORM
 
-/// As the plain form, with the states of `states`.
-struct Ex {
+/// What stands where among the arguments of a door of the Ex form: one of the plain form's; of `states` the state of
+/// the text, of a second text or of the output, or where the state behind the result or a token goes; or no flags.
+struct ExPlaces {
+  enum Place { A, T, S, O, R, K, Z };
+};
+
+/// A door of the Ex form that is called as the plain one.
+template <auto kDoor, ExPlaces::Place... kPlaces>
+class ExDoor : ExPlaces {
+ public:
+  template <class... Given>
+  auto operator()(Given... given) const {
+    return call(std::tuple(given...), std::make_index_sequence<sizeof...(kPlaces)>());
+  }
+
+ private:
+  static constexpr Place kPlace[] = {kPlaces...};
+
+  template <class Given, size_t... kAt>
+  static auto call(const Given& given, std::index_sequence<kAt...>) {
+    return kDoor(argument<kAt>(given)...);
+  }
+  template <size_t kAt, class Given>
+  static auto argument(const Given& given) {
+    constexpr Place place = kPlace[kAt];
+    if constexpr (place == A)
+      return std::get<given_before(kAt)>(given);
+    else if constexpr (place == R || place == K)
+      return place == R ? &states.result : &states.token;
+    else
+      return place == T ? states.text : place == S ? states.second : place == O ? states.output : 0;
+  }
+  static constexpr size_t given_before(size_t at) {
+    size_t count = 0;
+    for (size_t i = 0; i < at; ++i) count += kPlace[i] == A;
+    return count;
+  }
+};
+
+struct Ex : ExPlaces {
   using Unit = char;
   using Char = LXWChar;
-  using In = LXLocale*;
   static constexpr const char* name = "Ex";
-  static int32_t cat(In in, char* to, int32_t size, const char* t, int32_t n, uint32_t f) {
-    return LXStrcatEx(in, to, states.output, size, t, states.text, n, f);
-  }
-  static char* chr(In in, const char* t, int32_t n, LXWChar c, uint32_t f) {
-    return LXStrchrEx(in, t, states.text, n, c, &states.result, f);
-  }
-  static int32_t cpy(In in, char* to, int32_t size, const char* t, int32_t n, uint32_t f) {
-    return LXStrcpyEx(in, to, size, t, states.text, n, &states.result, f);
-  }
-  template <class Result, auto kDoor>
-  static Result search(In in, const char* t, int32_t n, const char* s, int32_t m, uint32_t f) {
-    return kDoor(in, t, states.text, n, s, states.second, m, &states.result, f);
-  }
-  static constexpr auto cspn = search<int32_t, LXStrcspnEx>;
-  static constexpr auto spn = search<int32_t, LXStrspnEx>;
-  static constexpr auto str = search<char*, LXStrstrEx>;
-  static char* tok(In in, char* t, int32_t* n, const char* s, int32_t m, char** next, uint32_t f) {
-    return LXStrtokEx(in, t, &states.result, n, s, states.second, m, next, &states.token, f);
-  }
-  template <auto kDoor>
-  static int32_t compare(In in, const char* a, int32_t n, const char* b, int32_t m, uint32_t f) {
-    return kDoor(in, a, states.text, n, b, states.second, m, f);
-  }
-  static constexpr auto cmp = compare<LXStrcmpEx>;
-  static constexpr auto coll = compare<LXStrcollEx>;
-  static int32_t xfrm(In in, uint8_t* to, int32_t size, const char* t, int32_t n, uint32_t f) {
-    return LXStrxfrmEx(in, to, size, t, states.text, n, f);
-  }
-  static int32_t next_weight(In in, const char** t, int32_t* n, uint16_t* counter, LXWeights* first,
-                             LXWeights* second, uint8_t* char_class, LXUChar* ahead) {
-    return LXStrGetNextWeightEx(in, t, &states.result, n, counter, first, second, char_class, ahead);
-  }
+  static constexpr ExDoor<LXStrcatEx, A, A, O, A, A, T, A, A> cat{};
+  static constexpr ExDoor<LXStrchrEx, A, A, T, A, A, R, A> chr{};
+  static constexpr ExDoor<LXStrcpyEx, A, A, A, A, T, A, R, A> cpy{};
+  static constexpr ExDoor<LXStrcspnEx, A, A, T, A, A, S, A, R, A> cspn{};
+  static constexpr ExDoor<LXStrspnEx, A, A, T, A, A, S, A, R, A> spn{};
+  static constexpr ExDoor<LXStrstrEx, A, A, T, A, A, S, A, R, A> str{};
+  static constexpr ExDoor<LXStrtokEx, A, A, R, A, A, S, A, A, K, A> tok{};
+  static constexpr ExDoor<LXStrcmpEx, A, A, T, A, A, S, A, A> cmp{};
+  static constexpr ExDoor<LXStrcollEx, A, A, T, A, A, S, A, A> coll{};
+  static constexpr ExDoor<LXStrxfrmEx, A, A, A, A, T, A, A> xfrm{};
+  static constexpr ExDoor<LXStrGetNextWeightEx, A, A, R, A, A, A, A, A, A> next_weight{};
   static constexpr auto map = LXMapStringEx;
-  static int32_t encode(In in, char* to, int32_t size, const LXUChar* from, int32_t n, int32_t f) {
-    return LXUnicodeToStringEx(in, to, states.output, size, from, n, f);
-  }
-  static int32_t decode(LXUChar* to, int32_t size, In in, const char* from, int32_t n, int32_t f) {
-    return LXStringToUnicodeEx(to, size, in, from, states.text, n, f);
-  }
-  static int32_t convert(In to_l, char* to, int32_t size, In in, const char* from, int32_t n, int32_t f) {
-    return LXConvertStringEx(to_l, to, states.output, size, in, from, states.text, n, f);
-  }
+  static constexpr ExDoor<LXUnicodeToStringEx, A, A, O, A, A, A, A> encode{};
+  static constexpr ExDoor<LXStringToUnicodeEx, A, A, A, A, T, A, A> decode{};
+  static constexpr ExDoor<LXConvertStringEx, A, A, O, A, A, A, T, A, A> convert{};
   static constexpr auto grouping_size = LXStrGroupingSize;
-  template <class Value, auto kDoor>
-  static int32_t write(In in, Value value, char* to, int32_t size, uint32_t f) {
-    return kDoor(in, value, to, states.output, size, f);
-  }
-  static constexpr auto write_long = write<int32_t, LXLongToStringEx>;
-  static constexpr auto write_double = write<double, LXDoubleToStringEx>;
-  static constexpr auto write_amount = write<double, LXCurrencyToStringEx>;
-  static int32_t read_long(In in, const char* t, int32_t n, const char** end, int32_t base, uint32_t f) {
-    return LXStringToLongEx(in, t, states.text, n, end, base, f);
-  }
-  static double read_double(In in, const char* t, int32_t n, const char** end, uint32_t f) {
-    return LXStringToDoubleEx(in, t, states.text, n, end, f);
-  }
-  static int32_t write_time(In in, const LXTime* time, char* to, int32_t size, const char* by, int32_t m,
-                            uint32_t f) {
-    return LXTimeToStringEx(in, time, to, states.output, size, by, states.second, m, f);
-  }
-  static int32_t read_time(In in, LXTime* time, const char* t, int32_t n, const char* by, int32_t m,
-                           uint32_t f) {
-    return LXStringToTimeEx(in, time, t, states.text, n, by, states.second, m, f);
-  }
-  static int32_t set_item(In in, int32_t item, const char* t, int32_t n, int32_t f) {
-    return LXSetLocaleTextInfoEx(in, item, t, states.text, n, f);
-  }
-  static int32_t get_item(In in, int32_t item, char* to, int32_t size, int32_t f) {
-    return LXGetLocaleTextInfoEx(in, item, to, states.output, size, f);
-  }
+  static constexpr ExDoor<LXStrGetDigitEx, A, A, T, A, A, A, A, A, A, A, A> digit{};
+  static constexpr ExDoor<LXLongToStringEx, A, A, A, O, A, A> write_long{};
+  static constexpr ExDoor<LXDoubleToStringEx, A, A, A, O, A, A> write_double{};
+  static constexpr ExDoor<LXCurrencyToStringEx, A, A, A, O, A, A> write_amount{};
+  static constexpr ExDoor<LXStringToLongEx, A, A, T, A, A, A, A> read_long{};
+  static constexpr ExDoor<LXStringToDoubleEx, A, A, T, A, A, A> read_double{};
+  static constexpr ExDoor<LXTimeToStringEx, A, A, A, O, A, A, S, A, A> write_time{};
+  static constexpr ExDoor<LXStringToTimeEx, A, A, A, T, A, A, S, A, A> read_time{};
+  static constexpr ExDoor<LXSetLocaleTextInfoEx, A, A, A, T, A, A> set_item{};
+  static constexpr ExDoor<LXGetLocaleTextInfoEx, A, A, A, O, A, A> get_item{};
   static constexpr auto read_string = LXReadStringEx;
   static constexpr auto get_eol = LXGetEolEx;
   static constexpr auto put_eol = LXPutEolEx;
-  static int32_t truncate(In in, char* t, int32_t size, uint32_t f) {
-    return LXTruncateStringEx(in, t, states.text, size, f);
-  }
-  static int32_t count(In in, const char* t, int32_t n) { return LXNumCharsEx(in, t, states.text, n); }
-  static char* move(In in, const char* t, int32_t n, int32_t f) {
-    return LXMoveStringPointerEx(in, t, states.text, n, &states.result, f);
-  }
-  static char* next(In in, const char* t) { return LXNextCharEx(in, t, states.text, &states.result, 0); }
-  static char* previous(In in, const char* start, const char* t) {
-    return LXPrevCharEx(in, start, t, states.text, &states.result);
-  }
-  static LXWChar code(In in, const char* t) { return LXGetCharEx(in, t, states.text); }
-  static int32_t length(In in, const char* t) { return LXByteLengthEx(in, t, states.text); }
-  static int32_t valid(In in, const char* t) { return LXValidCharEx(in, t, states.text); }
-  static int32_t put(In in, char* to, LXWChar c) { return LXPutCharEx(in, to, states.output, c), 0; }
-  static int32_t to_codes(In in, LXWChar* to, int32_t size, const char* t, int32_t n, int32_t f) {
-    return LXMbToWideEx(in, to, size, t, states.text, n, f);
-  }
-  static int32_t from_codes(In in, char* to, int32_t size, const LXWChar* t, int32_t n, int32_t f) {
-    return LXWideToMbEx(in, to, states.output, size, t, n, f);
-  }
+  static constexpr ExDoor<LXTruncateStringEx, A, A, T, A, A> truncate{};
+  static constexpr ExDoor<LXNumCharsEx, A, A, T, A> count{};
+  static constexpr ExDoor<LXMoveStringPointerEx, A, A, T, A, R, A> move{};
+  static constexpr ExDoor<LXNextCharEx, A, A, T, R, Z> next{};
+  static constexpr ExDoor<LXPrevCharEx, A, A, A, T, R> previous{};
+  static constexpr ExDoor<LXGetCharEx, A, A, T> code{};
+  static constexpr ExDoor<LXByteLengthEx, A, A, T> length{};
+  static constexpr ExDoor<LXValidCharEx, A, A, T> valid{};
+  static constexpr ExDoor<LXPutCharEx, A, A, O, A> put{};
+  static constexpr ExDoor<LXMbToWideEx, A, A, A, A, T, A, A> to_codes{};
+  static constexpr ExDoor<LXWideToMbEx, A, A, O, A, A, A, A> from_codes{};
 };
 
 inline constexpr Plain kPlain;

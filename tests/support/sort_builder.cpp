@@ -16,11 +16,7 @@ ByteString SortBuilder::payload() const {
   lexicor_data::SortSource sort;
   sort.default_secondary = default_secondary;
   sort.default_tertiary = default_tertiary;
-  for (const auto& [page, found] : computed) {
-    const bool primary = (found.flags & fmt::kPagePrimary) != 0;
-    sort.pages[page] = {
-        primary ? SortPageKind::kPrimary : SortPageKind::kSpecial, found.base, found.char_class, {}};
-  }
+  for (const auto& [page, found] : computed) sort.pages[page] = found;
   const auto add = [&](LXUChar u, uint8_t count, const TestWeight& weight, const LXWeights& second) {
     sort.pages[u >> 8].kind = SortPageKind::kTable;
     sort.characters[u] = {{set_of(weight.weights), set_of(second)}, count, weight.char_class, {}};

@@ -6,6 +6,7 @@
 #include <vector>
 
 #include "lx.h"
+#include "sort_text.h"
 #include "support/object_files.h"
 
 namespace lx::test {
@@ -24,17 +25,13 @@ struct SortBuilder {
     LXUChar first, second;
     TestWeight weight;
   };
-  struct Page {
-    uint8_t flags, char_class;
-    uint16_t base;
-  };
 
   uint8_t default_secondary = 1;
   uint8_t default_tertiary = 1;
   std::map<LXUChar, TestWeight> characters;
   std::map<LXUChar, std::pair<TestWeight, LXWeights>> expansions;  // first and second set
   std::vector<Pair> pairs;
-  std::map<uint8_t, Page> computed;
+  std::map<uint8_t, lexicor_data::SortPage> computed;
 
   ByteString payload() const;
 };

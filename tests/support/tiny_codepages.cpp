@@ -34,26 +34,6 @@ CodepageBuilder::CodepageBuilder(uint16_t id, std::string name, uint8_t width) :
   model_.from_unicode.assign(0x10000, lexicor_data::kNoCode);
 }
 
-CodepageBuilder& CodepageBuilder::lead(uint8_t first, uint8_t last, uint8_t length) {
-  for (unsigned b = first; b <= last; ++b) model_.header.leads[b] = length;
-  return *this;
-}
-
-CodepageBuilder& CodepageBuilder::map(uint32_t code, uint16_t unicode, unsigned count) {
-  for (unsigned i = 0; i < count; ++i) {
-    model_.to_unicode[code + i] = static_cast<uint16_t>(unicode + i);
-    model_.from_unicode[unicode + i] = code + i;
-  }
-  return *this;
-}
-
-CodepageBuilder& CodepageBuilder::shift(uint8_t out, uint8_t in) {
-  shift_out_ = out, shift_in_ = in;
-  model_.header.kind = CodepageClass::kShiftStateful;
-  model_.header.ascii = false;
-  return *this;
-}
-
 TinyCodepage CodepageBuilder::build() const {
   const lexicor_data::CodepageSource& header = model_.header;
   lexicor_data::CodepageModel model = model_;
@@ -203,10 +183,6 @@ LXLocale* TinyLibrary::locale(const TinyCodepage& codepage, const std::string& l
   return locales_[key] = made;
 }
 
-const LXObject* TinyLibrary::object(uint16_t id, int32_t* rc) {
-  return LXGetObjFromID(nullptr, LX_CODEPAGE, id, LX_FIND_AND_LOAD, rc);
-}
-
 CodepageObject::CodepageObject(uint16_t id, const std::vector<ByteString>& sections) : sections_(sections) {
   sections_.resize(format::kMaxSections);
   Sections exact;
@@ -218,8 +194,8 @@ CodepageObject::CodepageObject(uint16_t id, const std::vector<ByteString>& secti
   object_.disk.id = id;
   object_.disk.type = LX_CODEPAGE;
   locale_.codepage = &object_;
-  code_ = kCodepageType.validate(id, exact).code;
-  if (code_ != LX_OK) return;
+  fault_ = kCodepageType.validate(id, exact);
+  if (fault_) return;
   object_.derived = derive_codepage(id, exact);
   if (object_.derived == nullptr) throw std::runtime_error("no memory for a codepage");
   const lx::Codepage& cp = codepage_of(object_);

@@ -40,16 +40,30 @@ class CodepageBuilder {
  public:
   CodepageBuilder(uint16_t id, std::string name, uint8_t width);
   /// Bytes that begin characters of `length` bytes.
-  CodepageBuilder& lead(uint8_t first, uint8_t last, uint8_t length);
+  CodepageBuilder& lead(uint8_t first, uint8_t last, uint8_t length) {
+    for (unsigned b = first; b <= last; ++b) model_.header.leads[b] = length;
+    return *this;
+  }
   /// `count` characters from this packed code and this Unicode value on, both ways.
-  CodepageBuilder& map(uint32_t code, uint16_t unicode, unsigned count = 1);
+  CodepageBuilder& map(uint32_t code, uint16_t unicode, unsigned count = 1) {
+    for (unsigned i = 0; i < count; ++i) {
+      model_.to_unicode[code + i] = static_cast<uint16_t>(unicode + i);
+      model_.from_unicode[unicode + i] = code + i;
+    }
+    return *this;
+  }
   CodepageBuilder& ascii() { return map(0, 0, 0x80); }
   /// The characters of a text, from this code on.
   CodepageBuilder& text(uint32_t code, const char* ascii) {
     for (; *ascii != 0; ++ascii) map(code++, static_cast<uint16_t>(*ascii));
     return *this;
   }
-  CodepageBuilder& shift(uint8_t out, uint8_t in);
+  CodepageBuilder& shift(uint8_t out, uint8_t in) {
+    shift_out_ = out, shift_in_ = in;
+    model_.header.kind = lexicor_data::CodepageClass::kShiftStateful;
+    model_.header.ascii = false;
+    return *this;
+  }
   CodepageBuilder& substitution(uint8_t byte) { return model_.header.substitution = byte, *this; }
   TinyCodepage build() const;
 
@@ -100,8 +114,6 @@ class TinyLibrary {
   /// A locale to change; the caller releases it.
   LXLocale* new_locale(const TinyCodepage& codepage, const std::string& language = "English",
                        const std::string& sort = "");
-  /// The loaded codepage, or null with the code.
-  const LXObject* object(uint16_t id, int32_t* rc);
 
  private:
   ScratchDirectory directory_;
@@ -119,7 +131,8 @@ class CodepageObject {
   CodepageObject(const CodepageObject&) = delete;
   CodepageObject& operator=(const CodepageObject&) = delete;
 
-  int32_t code() const { return code_; }  // of the validation; there is no object unless it is 0
+  int32_t code() const { return fault_.code; }  // of the validation; there is no object unless it is 0
+  std::string reason() const { return fault_ ? fault_.reason : ""; }
   const LXObject* object() const { return &object_; }
   LXLocale* locale() { return &locale_; }
 
@@ -127,7 +140,7 @@ class CodepageObject {
   std::vector<ByteString> sections_;
   LXObject object_{};
   LXLocale locale_{};
-  int32_t code_;
+  Fault fault_;
 };
 
 }  // namespace lx::test
