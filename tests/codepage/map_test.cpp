@@ -8,8 +8,8 @@
 namespace lx::test {
 namespace {
 
-constexpr uint32_t kModes[] = {LX_MAP_FULL_WIDTH, LX_MAP_HALF_WIDTH,   LX_MAP_COPY,         LX_MAP_LOWER,
-                               LX_MAP_UPPER,      LX_MAP_LOWER_SIMPLE, LX_MAP_UPPER_SIMPLE, LX_MAP_DIGITS};
+constexpr uint32_t kMappings[] = {LX_MAP_FULL_WIDTH, LX_MAP_HALF_WIDTH,   LX_MAP_COPY,         LX_MAP_LOWER,
+                                  LX_MAP_UPPER,      LX_MAP_LOWER_SIMPLE, LX_MAP_UPPER_SIMPLE, LX_MAP_DIGITS};
 
 /// One character of the result, and the first and the last character of the input that it comes from.
 struct Piece {
@@ -110,7 +110,7 @@ TEST_F(Map, EveryFormFollowsTheModel) {
   for (const TinyCodepage& cp : case_codepages()) {
     if (cp.shift || cp.file.name == "ODD") continue;
     for (int n = 0; n < 320 && !HasFatalFailure(); ++n) {
-      const uint32_t mode = kModes[n % 8];
+      const uint32_t mode = kMappings[n % 8];
       const Units text = random_text(&cp);
       follow_model(kPlain, cp, text, mode);
       follow_model(kEx, cp, text, mode);
@@ -125,7 +125,7 @@ TEST_F(Map, ShiftStatesStayValid) {
   const TinyCodepage& cp = case_codepage("SHIFT");
   LXLocale* const in = locale(cp);
   for (int n = 0; n < 400 && !HasFatalFailure(); ++n) {
-    const uint32_t mode = kModes[n % 8];
+    const uint32_t mode = kMappings[n % 8];
     if (mode == LX_MAP_COPY) continue;
     const Units text = random_text(&cp);
     LXShiftState input_end = LX_SHIFT_SINGLE;

@@ -23,7 +23,7 @@ class FileTest : public LibraryTest {
   }
   void put(LXFile* file, const char* text) {
     ASSERT_NE(file, nullptr);
-    ASSERT_EQ(write(file->descriptor, text, strlen(text)), static_cast<ssize_t>(strlen(text)));
+    ASSERT_EQ(::write(file->descriptor, text, strlen(text)), static_cast<ssize_t>(strlen(text)));
   }
   std::string text_of(const std::string& name) {
     const ByteString content = directory.read(name);

@@ -5,7 +5,7 @@
 
 namespace lx::test {
 
-namespace fmt = lx::format::sort;
+namespace so = lx::format::sort;
 
 ByteString SortBuilder::payload() const {
   using lexicor_data::SortElement;
@@ -25,14 +25,14 @@ ByteString SortBuilder::payload() const {
   for (const auto& [u, sets] : expansions) add(u, 2, sets.first, sets.second);
   ByteString bytes = pack_sort(sort, "a test's sort");
   // Pairs in any order and more than once, which the compiler would not write: their table is the last one.
-  put_le16(&bytes[fmt::kContractionCount], static_cast<uint16_t>(pairs.size()));
+  put_le16(&bytes[so::kContractionCount], static_cast<uint16_t>(pairs.size()));
   for (const Pair& pair : pairs) {
     const LXWeights& w = pair.weight.weights;
-    const unsigned flags = (w.special != 0 ? fmt::WeightRecord::kSpecial : 0u) |
-                           static_cast<unsigned>(pair.weight.char_class << fmt::WeightRecord::kClassShift);
+    const unsigned flags = (w.special != 0 ? so::WeightRecord::kSpecial : 0u) |
+                           static_cast<unsigned>(pair.weight.char_class << so::WeightRecord::kClassShift);
     const uint16_t weight = w.special != 0 ? w.special : w.primary;
-    const fmt::WeightRecord record{weight, w.secondary, w.tertiary, static_cast<uint16_t>(flags)};
-    lexicor_data::append_record(bytes, fmt::Contraction{pair.first, pair.second, record});
+    const so::WeightRecord record{weight, w.secondary, w.tertiary, static_cast<uint16_t>(flags)};
+    lexicor_data::append_record(bytes, so::Contraction{pair.first, pair.second, record});
   }
   return bytes;
 }
