@@ -4,6 +4,7 @@
 #include "core/lxrecords.h"
 #include "support/case_test.h"
 #include "support/conversion.h"
+#include "support/slowness.h"
 
 namespace lx::test {
 namespace {
@@ -109,7 +110,7 @@ class Map : public CaseTest {
 TEST_F(Map, EveryFormFollowsTheModel) {
   for (const TinyCodepage& cp : case_codepages()) {
     if (cp.shift || cp.file.name == "ODD") continue;
-    for (int n = 0; n < 320 && !HasFatalFailure(); ++n) {
+    for (int n = 0; n < 320 / kSlowness && !HasFatalFailure(); ++n) {
       const uint32_t mode = kMappings[n % 8];
       const Units text = random_text(&cp);
       follow_model(kPlain, cp, text, mode);
@@ -124,7 +125,7 @@ TEST_F(Map, EveryFormFollowsTheModel) {
 TEST_F(Map, ShiftStatesStayValid) {
   const TinyCodepage& cp = case_codepage("SHIFT");
   LXLocale* const in = locale(cp);
-  for (int n = 0; n < 400 && !HasFatalFailure(); ++n) {
+  for (int n = 0; n < 400 / kSlowness && !HasFatalFailure(); ++n) {
     const uint32_t mode = kMappings[n % 8];
     if (mode == LX_MAP_COPY) continue;
     const Units text = random_text(&cp);

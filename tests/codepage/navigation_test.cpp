@@ -1,6 +1,7 @@
 // Walking and counting characters in every kind of text: rules on random valid text.
 #include "core/lxrecords.h"
 #include "support/case_test.h"
+#include "support/slowness.h"
 
 namespace lx::test {
 namespace {
@@ -61,7 +62,7 @@ TEST_F(Navigation, EveryCharacterForwardsAndBackwards) {
   for (const TinyCodepage& cp : case_codepages()) {
     SCOPED_TRACE(cp.file.name);
     LXLocale* const in = library.locale(cp);
-    for (int round = 0; round < (cp.shift ? 400 : 60); ++round) {
+    for (int round = 0; round < (cp.shift ? 400 : 60) / kSlowness; ++round) {
       const LXShiftState initial = random() % 2;
       const Encoded<Ex> text = random_text(cp, random() % 12, initial);
       const std::vector<char> bytes = text.terminated();

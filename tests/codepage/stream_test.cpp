@@ -2,6 +2,7 @@
 // steps one by one are cases.
 #include "support/case_test.h"
 #include "support/conversion.h"
+#include "support/slowness.h"
 
 namespace lx::test {
 namespace {
@@ -51,7 +52,7 @@ TEST_F(Stream, AnySplitGivesTheWhole) {
       const std::string input = from.encode({text.begin(), text.end()});
       const std::string expected = to.encode({text.begin(), text.end()});
       int32_t code = -1;
-      for (int round = 0; round < 60; ++round) {
+      for (int round = 0; round < 60 / kSlowness; ++round) {
         Conversion pieces(locale(to), locale(from));
         std::string output;
         const auto room = [&] { return kLeastRoom + static_cast<int32_t>(random() % 6); };

@@ -11,6 +11,7 @@
 #include "support/case_rows.h"
 #include "support/conversion.h"
 #include "support/damage.h"
+#include "support/slowness.h"
 #include "support/tiny_codepages.h"
 #include "support/use_codepage.h"
 
@@ -111,7 +112,7 @@ TEST_F(Validate, RandomDamage) {
   for (const TinyCodepage& cp : tiny_codepages()) {
     SCOPED_TRACE(cp.file.name);
     int accepted = 0, refused = 0;
-    for (int round = 0; round < 400; ++round) {
+    for (int round = 0; round < 400 / kSlowness; ++round) {
       S sections = cp.file.sections;
       const size_t nodes = le16(&sections[0][fmt::kUnicodeValues]);
       for (size_t n = 1 + random() % 3; n > 0; --n) {

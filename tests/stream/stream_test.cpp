@@ -6,6 +6,7 @@
 #include "stream/lxstream.h"
 #include "stream/stream_peer.h"
 #include "support/case_test.h"
+#include "support/slowness.h"
 
 namespace lx::test {
 namespace {
@@ -93,7 +94,7 @@ class Streams : public CaseTest {
 
 TEST_F(Streams, LineEndsAreFoundAlikeInAllForms) {
   in_all_codepages([&](const TinyCodepage& cp, LXLocale* locale) {
-    for (int round = 0; round < 300; ++round) {
+    for (int round = 0; round < 300 / kSlowness; ++round) {
       const Units text = random_text(cp, random, 9), behind = random_text(cp, random, 1 + round % 3);
       const uint32_t kinds = (random() % 16) << 8;
       SCOPED_TRACE(kinds);
@@ -153,7 +154,7 @@ TEST_F(Streams, WritingLosesNothing) {
         scripts.emplace_back(n, 1);
         scripts.back().insert(scripts.back().end(), stop == 0 ? 400 : 60, stop);
       }
-    for (int round = 0; round < 100; ++round) scripts.push_back(random_script(200));
+    for (int round = 0; round < 100 / kSlowness; ++round) scripts.push_back(random_script(200));
     for (const auto& script : scripts) {
       const Units text = random_text(cp, random, 80);
       forms_of(cp, [&](const auto& form) {
@@ -176,7 +177,7 @@ TEST_F(Streams, WritingLosesNothing) {
 
 TEST_F(Streams, ReadingLosesNothing) {
   in_all_codepages([&](const TinyCodepage& cp, LXLocale* locale) {
-    for (int round = 0; round < 100; ++round) {
+    for (int round = 0; round < 100 / kSlowness; ++round) {
       const Units text = random_text(cp, random, 60);
       Peer peer{true, stream_bytes<Wide>(cp, text), random_script(150)};
       LXStream* const in = open(locale, peer);
@@ -271,7 +272,8 @@ TEST_F(Streams, LinesAreThoseOfTheModel) {
     EXPECT_EQ(LXCloseStream(stream, locale), 1);
   };
   in_all_codepages([&](const TinyCodepage& cp, LXLocale* locale) {
-    for (int round = 0; round < 150; ++round) in_all_forms([&](const auto& form) { check(form, cp, locale); });
+    for (int round = 0; round < 150 / kSlowness; ++round)
+      in_all_forms([&](const auto& form) { check(form, cp, locale); });
   });
 }
 

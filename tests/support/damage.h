@@ -6,12 +6,15 @@
 #include <vector>
 
 #include "support/object_files.h"
+#include "support/slowness.h"
 
 namespace lx::test {
 
-/// Calls `use` with each damaged form of a file's bytes: every `step`th truncation, and byte changed.
+/// Calls `use` with each damaged form of a file's bytes: every `step`th truncation, and byte
+/// changed.
 template <class Bytes, class Use>
 void for_each_damage(const Bytes& whole, Use use, size_t step = 1) {
+  step *= kSlowness;
   for (size_t size = 0; size < whole.size(); size += step)
     use(Bytes(whole.begin(), whole.begin() + static_cast<std::ptrdiff_t>(size)));
   Bytes bytes = whole;

@@ -2,6 +2,7 @@
 // with every length that cuts; memory that fails.
 #include "codepage/lxunicode.h"
 #include "support/case_test.h"
+#include "support/slowness.h"
 
 namespace lx::test {
 namespace {
@@ -72,7 +73,7 @@ class Compare : public CaseTest {
 
 TEST_F(Compare, AllFormsFollowTheModel) {
   for (const char* name : {"SINGLE", "SJIS", "UTF8", "SHIFT"})
-    for (unsigned n = 0; n < 2400 && !HasFailure(); ++n) {
+    for (unsigned n = 0; n < 2400u / kSlowness && !HasFailure(); ++n) {
       const TinyCodepage& cp = case_codepage(name);
       LXLocale* const in = library.locale(cp);
       const uint32_t options = n % 3 == 0 ? 0 : n % 3 == 1 ? kCase : kWidth;

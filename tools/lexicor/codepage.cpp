@@ -115,6 +115,7 @@ int32_t Codepage::char_bytes(const char* text, LXShiftState state) const {
 
 size_t Codepage::whole_bytes(const char* text, size_t bytes, LXShiftState state,
                              LXShiftState* end_state) const {
+  *end_state = state;  // which no bytes leave as it is
   const char* const end =
       LXMoveStringPointerEx(locale_, text, state, static_cast<int32_t>(bytes), end_state, 0);
   return static_cast<size_t>(end - text);

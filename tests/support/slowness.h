@@ -1,0 +1,13 @@
+// A build with sanitizers is ten times slower, and looks for other faults: it takes every kSlowness-th round of a
+// model, byte to damage and object of the shipped directory.
+#pragma once
+
+namespace lx::test {
+
+#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+constexpr int kSlowness = 8;
+#else
+constexpr int kSlowness = 1;
+#endif
+
+}  // namespace lx::test
