@@ -1,22 +1,9 @@
 // The family of items.txt.
 #include "cases/case_runner.h"
-#include "core/lxrecords.h"
 
 namespace lx::test {
 
 namespace {
-
-/// All that a caller can see of a locale.
-std::string state_of(LXLocale* l) {
-  std::string state = std::to_string(l->changed) + ' ' + std::to_string(l->changed_unicode);
-  for (int32_t number = LX_ITEM_LANGUAGE_ID; number <= LX_ITEM_LOCALE_STRING; ++number) {
-    char bytes[300] = "";
-    LXGetLocaleTextInfo(l, number, bytes, sizeof(bytes), 0);
-    state += '|' + std::to_string(LXGetLocaleNumInfo(l, number, 0)) + bytes;
-    if (LXGetError(l) != LX_OK) state += shown(item(l, number));
-  }
-  return state;
-}
 
 /// Sets an item, as text and by number; what fails or has no length changes nothing.
 template <class R>

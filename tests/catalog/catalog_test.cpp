@@ -339,12 +339,5 @@ TEST_F(CatalogTest, TheChainEndsAtTheLatestWithTheCountOfSets) {
   for (uint32_t mode : kModes) EXPECT_EQ(message(open(file, mode), 9, 1), "72");
 }
 
-TEST_F(CatalogTest, FailingFreesAreNotReported) {
-  library.hooks().fail_frees(true);
-  for (uint32_t mode : kModes) EXPECT_EQ(message(open(small_catalog(), mode), 3, 4), "four");
-  EXPECT_EQ(LXGetError(single()), LX_OK);
-  library.hooks().fail_frees(false);
-}
-
 }  // namespace
 }  // namespace lx::test

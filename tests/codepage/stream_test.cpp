@@ -70,14 +70,5 @@ TEST_F(Stream, AnySplitGivesTheWhole) {
   }
 }
 
-TEST_F(Stream, ClosingReportsAFailingFree) {
-  LXConversion* const conversion =
-      LXOpenConversion(locale(case_codepage("EUC")), locale(case_codepage("SINGLE")));
-  ASSERT_NE(conversion, nullptr);
-  library.hooks().fail_frees(true);
-  EXPECT_EQ(LXCloseConversion(conversion), LX_E_FREE);
-  library.hooks().fail_frees(false);
-}
-
 }  // namespace
 }  // namespace lx::test

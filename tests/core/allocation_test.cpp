@@ -65,17 +65,6 @@ class AllocationTest : public LibraryTest {
   }
 
   /// Every item in the forms that show all of it.
-  static std::string state_of(LXLocale* locale) {
-    std::string state = std::to_string(locale->changed) + ' ' + std::to_string(locale->flags);
-    for (int32_t item = 1; item <= LX_ITEM_LOCALE_STRING; ++item) {
-      char bytes[300] = "";
-      LXGetLocaleTextInfo(locale, item, bytes, sizeof(bytes), 0);
-      state +=
-          '|' + std::to_string(LXGetLocaleNumInfo(locale, item, 0)) + bytes + shown(test::item(locale, item));
-    }
-    return state;
-  }
-
   LXLocale* begin() {
     EXPECT_EQ(init(), LX_OK);
     EXPECT_EQ(LXSetLocale("English", 0), LX_OK);

@@ -129,11 +129,13 @@ TEST_F(InitTest, FailingFrees) {
     ASSERT_EQ(rc, LX_OK);
     LXLocale* const locale = LXGetLocale("", 0, nullptr);
     LXStream* const stream = LXOpenStream(locale, transfer, nullptr, LX_STREAM_READ);
+    LXConversion* const conversion = LXOpenConversion(locale, locale);
     if (c.default_locale) LXSetLocale("", 0);
     const LXLocale* const previous = globals.default_locale;
     hooks.fail_frees(true);
     EXPECT_EQ(LXCloseStream(stream, locale), 0);
     EXPECT_EQ(LXGetError(locale), LX_E_FREE);
+    EXPECT_EQ(LXCloseConversion(conversion), LX_E_FREE);
     EXPECT_EQ(LXReleaseLocale(locale), 1);
     if (c.default_locale) {
       EXPECT_EQ(LXSetLocale("", 0), LX_OK);

@@ -8,13 +8,13 @@
 #include <unicode/unorm2.h>
 
 #include <functional>
-#include <map>
 #include <memory>
 #include <sstream>
 
 #include "directory/directory_codepages.h"
 #include "directory/listed_differences.h"
 #include "import/icu_text.h"
+#include "support/case_rows.h"
 
 namespace lx::test {
 namespace {
@@ -161,25 +161,12 @@ std::string icu_name(const ShippedCodepage& codepage) {
   return icu == "ICU" ? name : std::string();
 }
 
-/// glibc's charsets that a codepage may be: its own name and customary ones, CP and the number where no
-/// multibyte table of another maker has that name.
+/// glibc's charsets that a codepage may be: the listed one, or its own name and customary ones, CP and the number where
+/// no multibyte table of another maker has that name.
 std::vector<std::string> iconv_names(const ShippedCodepage& codepage) {
-  static const std::map<std::string, std::string> others = {{"Latin1", "ISO-8859-1"},
-                                                            {"IBM838", "IBM9030"},
-                                                            {"IBM942", "IBM932"},
-                                                            {"IBM1363", "UHC"},
-                                                            {"IBM1386", "GBK"},
-                                                            {"JapanEUC", "EUC-JP"},
-                                                            {"MS932", "CP932"},
-                                                            {"MS936", "CP936"},
-                                                            {"MS949", "UHC"},
-                                                            {"MS950", "BIG5"},
-                                                            {"MacRoman", "MACINTOSH"},
-                                                            {"MacCyrillic", "MAC-CYRILLIC"},
-                                                            {"MacCentralEurope", "MAC-CENTRALEUROPE"}};
   const std::string& name = codepage.source.name;
-  const auto known = others.find(name);
-  if (known != others.end()) return {known->second};
+  for (const CaseRow& row : case_rows("directory/iconv_names.txt"))
+    if (row[0] == name) return {row[1]};
   const size_t digits = name.find_first_of("0123456789");
   if (codepage.source.width > 1 || digits == std::string::npos) return {name};
   return {name, "CP" + name.substr(digits)};

@@ -49,28 +49,7 @@ done < <(grep '^build/m64/bin/' "$source_dir/README.md")
 # since it stores texts in the order in which their sets begin.
 command -v gencat >/dev/null || exit 0
 mkdir sources && cp "$samples"/catalog/*.msg sources
-awk 'BEGIN {
-  srand(7)
-  split("a|é|日本|\\n|\\t|\\\\|\\q|\\101|\\60x|\"|\\\"|  |$|#|%d|\\\n|x", piece, "|")
-  for (file = 1; file <= 80; ++file) {
-    name = "sources/" file ".msg"; quoted = 0; split("", used); set = 1
-    for (line = int(rand() * 12); line >= 0; --line) {
-      kind = int(rand() * 10)
-      if (kind == 0) { set += int(rand() * 3); print "$set " set " x" >name }
-      else if (kind == 1) print "$ comment \"" >name
-      else if (kind == 2) { quoted = rand() < 0.7; print quoted ? "$quote \"" : "$quote" >name }
-      else {
-        number = 1 + int(rand() * 40)
-        if (used[set, number]++) continue
-        text = ""
-        for (count = int(rand() * 6); count > 0; --count) text = text piece[1 + int(rand() * 17)]
-        if (quoted) { gsub(/"/, "", text); sub(/\\$/, "", text); text = "\"" text "\"" }
-        printf "%d%s%s\n", number, rand() < 0.5 ? " " : "\t", text >name
-      }
-    }
-    close(name)
-  }
-}'
+csplit -sz -f sources/random -b %d.msg "$source_dir/tests/cases/gencat_sources.msg" '/^\$ --- /' '{*}'
 compared=0
 for source in sources/*.msg; do
   # Sources that the system has complaints about are no measure.

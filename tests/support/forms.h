@@ -235,6 +235,17 @@ inline Units item(LXLocale* l, int32_t number) {
       [&](LXUChar* to, int32_t size) { return LXGetLocaleTextInfoU(l, number, to, size, 0) - 1; });
 }
 
+/// All that a caller can see of a locale.
+inline std::string state_of(LXLocale* l) {
+  std::string state;
+  for (int32_t number = LX_ITEM_LANGUAGE_ID; number <= LX_ITEM_LOCALE_STRING; ++number) {
+    char bytes[300] = "";
+    LXGetLocaleTextInfo(l, number, bytes, sizeof(bytes), 0);
+    state += std::to_string(LXGetLocaleNumInfo(l, number, 0)) + bytes + shown(item(l, number)) + '|';
+  }
+  return state;
+}
+
 /// What is written in all forms; `flags` go to both directions, LX_INTERNATIONAL to writing alone.
 struct Value {
   enum Kind { kLong, kDouble, kAmount } kind;
