@@ -3,7 +3,6 @@
 #include <fstream>
 #include <set>
 #include <sstream>
-#include <tuple>
 
 #include "core/library_fixture.h"
 #include "nls1.h"
@@ -148,12 +147,11 @@ struct Caller<Function> {
   template <size_t... I>
   static std::string call(const Visit& visit, std::index_sequence<I...>) {
     Arguments arguments(visit);
-    const std::tuple<P...> given{arguments.template make<P>(I, I + 1 == sizeof...(P))...};
     if constexpr (std::is_void_v<R>) {
-      std::apply(Function, given);
+      Function(arguments.template make<P>(I, I + 1 == sizeof...(P))...);
       return "-" + arguments.written();
     } else {
-      return arguments.outcome(std::apply(Function, given));
+      return arguments.outcome(Function(arguments.template make<P>(I, I + 1 == sizeof...(P))...));
     }
   }
 };
