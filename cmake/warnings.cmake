@@ -12,9 +12,10 @@ if(LEXICOR_SANITIZE)
   target_link_options(lexicor_flags INTERFACE -fsanitize=${LEXICOR_SANITIZE})
 endif()
 
-# Stands behind lexicor_flags. In the programs beside the library undefined behaviour is looked for without the checks that the standard library
-# multiplies: the address sanitizer sees what they would.
+# Stands behind lexicor_flags. In the programs beside the library undefined behaviour is looked for without the checks
+# that the standard library multiplies: the address sanitizer sees what they would.
 add_library(lexicor_tool_flags INTERFACE)
+target_compile_definitions(lexicor_tool_flags INTERFACE _FILE_OFFSET_BITS=64)
 if(LEXICOR_SANITIZE MATCHES undefined)
   target_compile_options(lexicor_tool_flags INTERFACE -fno-sanitize=null,alignment,object-size,vptr)
 endif()

@@ -62,7 +62,7 @@ size_t result(const S& s, const std::string& expression) {
   return left;
 }
 
-ByteString bytes_of(const S& s, size_t section, const std::string& value) {
+ByteString value_of(const S& s, size_t section, const std::string& value) {
   ByteString bytes;
   const size_t colon = value.find(':');
   if (colon != std::string::npos) {
@@ -94,7 +94,7 @@ void change_sections(S* sections, const std::string& changes) {
         section.resize(result(sound, value));
         continue;
       }
-      for (const uint8_t byte : bytes_of(sound, number, value)) section.at(at++) = byte;
+      for (const uint8_t byte : value_of(sound, number, value)) section.at(at++) = byte;
     }
   }
 }
