@@ -130,7 +130,8 @@ Families format_families() {
          const std::string word = r.expected().word();
          EXPECT_EQ(next, word == "none" ? nullptr : text.data() + (word == "untouched" ? 77 : std::stoi(word)));
        })},
-      // The class of what a text begins with, where "," or "." separates and "pos" and "-" are signs, and the place behind it.
+      // The class of what a text begins with, where "," or "." separates and "pos" and "-" are signs, and the place
+      // behind it.
       {"digit", in_four_forms([](auto& r) {
          const auto text = r.input("", states.text);
          const auto* end = text.data();

@@ -97,7 +97,7 @@ TEST(Upgrade, Damaged) {
   const char* const damages[][2] = {
       {"no whole fixed part", "0:size = fixed-5"},
       {"no payload to speak of", "0:size = 5"},
-      {"values behind the section", "1:size = @4370-1"},
+      {"values behind the section", "1:size = @old.unicode_values-1"},
       {"an offset that cannot be moved", "0:type_trie-4 = 0xFFFD"},
       {"values that cannot be moved", "1:size = 50000; 0:unicode_values-4 = 45000"},
   };

@@ -1,6 +1,7 @@
 // Every shipped codepage, whose object is what the library converts by (codepages_test.cpp), against ICU's converter
-// of the same name in the source, and against iconv where glibc has the charset: all characters of up to four bytes, and all 65,536 Unicode values. What differs is counted
-// by codepage, direction and kind, and must be what peer_differences.txt lists, each line with its reason.
+// of the same name in the source, and against iconv where glibc has the charset: all characters of up to four bytes,
+// and all 65,536 Unicode values. What differs is counted by codepage, direction and kind, and must be what
+// peer_differences.txt lists, each line with its reason.
 #include <gtest/gtest.h>
 #include <iconv.h>
 #include <unicode/uchar.h>
@@ -14,6 +15,7 @@
 #include "directory/directory_codepages.h"
 #include "directory/listed_differences.h"
 #include "import/icu_text.h"
+#include "lexicor/hex.h"
 #include "support/case_rows.h"
 
 namespace lx::test {
@@ -98,11 +100,6 @@ std::string family(uint32_t written, uint32_t read) {
   return u_isdigit(w) && u_isdigit(r) ? "digit" : "sign";
 }
 
-std::string shown(uint32_t u) {
-  char digits[12];
-  snprintf(digits, sizeof(digits), "U+%04X", u);
-  return u == kNone ? "none" : digits;
-}
 /// Calls `visit(code)` for every character that the codepage's bytes can form: the first bytes of longer
 /// characters with all second bytes, and of those that are longer still the ones that the source maps.
 void for_each_code(const ShippedCodepage& codepage, const std::function<void(uint32_t)>& visit) {
@@ -148,8 +145,8 @@ void compare(const ShippedCodepage& codepage, const std::string& peer_name, cons
       if (read != u && read != kNone) place = peer_name + " *", kind += "-" + family(u, read);
     }
     differences->add(place, "from-unicode " + kind,
-                     codepage.source.name + " " + shown(u) + ":" + testing::PrintToString(ours) + "/" +
-                         testing::PrintToString(theirs));
+                     codepage.source.name + " " + lexicor_cli::code_point_name(u) + ":" +
+                         testing::PrintToString(ours) + "/" + testing::PrintToString(theirs));
   }
 }
 

@@ -6,10 +6,10 @@
 
 #include "core/library_fixture.h"
 #include "nls1.h"
-#include "nls1/failing_init.h"
 #include "support/case_rows.h"
 
 namespace lx::test {
+extern int32_t init_failure;  // of LXInit; nls1_test.cpp
 namespace {
 
 constexpr int32_t kNothingStored = 99;

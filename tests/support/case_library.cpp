@@ -52,7 +52,8 @@ const std::vector<TinyCodepage>& case_codepages() {
     // Another pair of widths, behind those that it has: all move to the end of the payload.
     change_sections(
         &made.back().file.sections,
-        "0:size = @6*8+size0+8; 0:size0 = @4368:@6*8 0x8141 0 0x21 0; 0:pairs = size0; 0:pair_count = @6+1");
+        "0:size = @pair_count*8+size0+8; 0:size0 = @pairs:@pair_count*8 0x8141 0 0x21 0; 0:pairs = size0; "
+        "0:pair_count = @pair_count+1");
     for (TinyCodepage& cp : made)
       for (size_t i = 0; i < 4; ++i)
         cp.file.sections[0][fmt::kLineEnds + i] = static_cast<uint8_t>(cp.find(line_ends(cp)[i])->code);

@@ -1,4 +1,5 @@
-// What conversion and mapping give: a model of an output of any size; and an open conversion that is called with buffers of their exact sizes.
+// What conversion and mapping give: a model of an output of any size; and an open conversion that is called with
+// buffers of their exact sizes.
 #pragma once
 
 #include <gtest/gtest.h>

@@ -20,26 +20,32 @@ size_t child_at(const ByteString& section, size_t root, const std::string& byte)
 }
 
 size_t operand(const S& s, const std::string& name) {
-  static const std::map<std::string, size_t> kFields{{"width", fmt::kWidth},
-                                                     {"flags", fmt::kFlags},
-                                                     {"substitution", fmt::kSubstitution},
-                                                     {"line_ends", fmt::kLineEnds},
-                                                     {"shift_out", fmt::kShiftOut},
-                                                     {"shift_in", fmt::kShiftIn},
-                                                     {"lengths", fmt::kLengths},
-                                                     {"unicode", fmt::kUnicode},
-                                                     {"pages", fmt::kPages},
-                                                     {"full_width", fmt::kFullWidth},
-                                                     {"pairs", fmt::kPairs},
-                                                     {"pair_count", fmt::kPairCount},
-                                                     {"type_trie", fmt::kTypeTrie},
-                                                     {"type_records", fmt::kTypeRecords},
-                                                     {"unicode_values", fmt::kUnicodeValues},
-                                                     {"fixed", fmt::kFixedBytes}};
+  static const std::map<std::string, size_t> kFields{
+      {"width", fmt::kWidth},
+      {"flags", fmt::kFlags},
+      {"substitution", fmt::kSubstitution},
+      {"line_ends", fmt::kLineEnds},
+      {"shift_out", fmt::kShiftOut},
+      {"shift_in", fmt::kShiftIn},
+      {"lengths", fmt::kLengths},
+      {"unicode", fmt::kUnicode},
+      {"pages", fmt::kPages},
+      {"full_width", fmt::kFullWidth},
+      {"pairs", fmt::kPairs},
+      {"pair_count", fmt::kPairCount},
+      {"type_trie", fmt::kTypeTrie},
+      {"type_records", fmt::kTypeRecords},
+      {"unicode_values", fmt::kUnicodeValues},
+      {"old.unicode_values", fmt::in_version1(fmt::kUnicodeValues)},
+      {"fixed", fmt::kFixedBytes},
+      {"unode", 0}};
   if (isdigit(name[0]) != 0) return std::stoul(name, nullptr, 0);
   if (name.rfind("size", 0) == 0) return s.at(std::stoul(name.substr(4))).size();
-  if (name == "unode") return 0;
-  if (name[0] == '@') return le16(&s[0][std::stoul(name.substr(1))]);
+  if (name[0] == '@') return le16(&s[0][operand(s, name.substr(1))]);
+  if (name.rfind("low.", 0) == 0)
+    return fmt::PageEntry::read(
+               &s[0][fmt::kPages + fmt::PageEntry::kBytes * std::stoul(name.substr(4), nullptr, 16)])
+        .low;
   if (name == "tnode") return le16(&s[0][fmt::kTypeTrie]);
   if (name.rfind("unode.", 0) == 0) return child_at<fmt::UnicodeNode>(s[1], 0, name.substr(6));
   if (name.rfind("tnode.", 0) == 0) return child_at<fmt::TypeNode>(s[0], operand(s, "tnode"), name.substr(6));

@@ -32,9 +32,9 @@ void for_each_damage(const Bytes& whole, Use use, size_t step = 1) {
 /// Changes the sections of an object: "SECTION:OFFSET = VALUE ...", or "SECTION:size = SIZE"; more changes stand
 /// behind ";". A value of two hexadecimal digits is a byte, "OFFSET:COUNT" copies bytes of the section, and all else
 /// is a word. Offsets, sizes and words are numbers and names with + - * / between them, which are done from left to
-/// right, before anything is changed: the fields of a codepage's payload; "size0" to "size3"; "@OFFSET", a word of
-/// section 0; "unode" and "tnode", the root of the tries to Unicode and of types, and "unode.XX", the node that byte XX
-/// leads to.
+/// right, before anything is changed: the fields of a codepage's payload; "@FIELD", its value; "size0" to "size3";
+/// "low.XX", the place of page XX in section 2; "unode" and "tnode", the root of the tries to Unicode and of types, and
+/// "unode.XX", the node that byte XX leads to.
 void change_sections(std::vector<ByteString>* sections, const std::string& changes);
 
 }  // namespace lx::test

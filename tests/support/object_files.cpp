@@ -9,6 +9,7 @@
 #include <iterator>
 #include <stdexcept>
 
+#include "compile.h"
 #include "control_source.h"
 #include "core/lxformat.h"
 #include "object_file.h"
@@ -88,13 +89,12 @@ bool ScratchDirectory::exists(const std::string& name) const {
 }
 
 void ScratchDirectory::write_locale(const std::vector<Codepage>& codepages, std::vector<Object> others) const {
-  static constexpr const char* kPrefixes[] = {"la", "te", "cp", "so"};
   const auto order = [](const ControlRecord& r) { return std::pair(r.type, r.id); };
   std::vector<ControlRecord> records;
   const auto add = [&](const ControlRecord& record, const ByteString& content) {
-    char name[32];
-    snprintf(name, sizeof(name), "%s_%05d.nls", kPrefixes[record.type], record.id);
-    write(name, content);
+    write(
+        lexicor_data::object_file_name({static_cast<lexicor_data::ObjectType>(record.type), record.id, "", 0}),
+        content);
     records.push_back(record);
   };
   for (const Codepage& codepage : codepages)

@@ -1,5 +1,5 @@
-// What looks up, walks and converts the characters of a codepage, called with bytes, codes and values of all kinds: once
-// loading has accepted a codepage, none of it may leave the object's sections or read beyond a character.
+// What looks up, walks and converts the characters of a codepage, called with bytes, codes and values of all kinds:
+// once loading has accepted a codepage, none of it may leave the object's sections or read beyond a character.
 #pragma once
 
 #include <algorithm>

@@ -132,6 +132,7 @@ class Import {
   void read_code_points() {
     for (uint32_t unicode = 0; unicode < kCodePoints; ++unicode) {
       if (unicode >= 0xD800 && unicode <= 0xDFFF) continue;
+      if (unicode == 0x40000) unicode = 0xF0000;  // no character stands in these planes
       Bytes bytes = converter_.encode(unicode);
       if (converter_.is_shift_stateful() && bytes.size() > 2 && bytes.front() == kShiftOut) {
         bytes.erase(bytes.begin());

@@ -19,3 +19,10 @@ target_compile_definitions(lexicor_tool_flags INTERFACE _FILE_OFFSET_BITS=64)
 if(LEXICOR_SANITIZE MATCHES undefined)
   target_compile_options(lexicor_tool_flags INTERFACE -fno-sanitize=null,alignment,object-size,vptr)
 endif()
+
+# A target that compiles headers once; others with the same flags reuse them.
+function(lexicor_headers target)
+  file(CONFIGURE OUTPUT ${CMAKE_CURRENT_BINARY_DIR}/headers.cpp CONTENT "")
+  add_library(${target} OBJECT ${CMAKE_CURRENT_BINARY_DIR}/headers.cpp)
+  target_precompile_headers(${target} PRIVATE ${ARGN})
+endfunction()
