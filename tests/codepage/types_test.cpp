@@ -86,6 +86,7 @@ TEST(BuiltInCodepage, DerivedData) {
   const CodepageObject loaded(1, ascii_codepage());
   ASSERT_EQ(loaded.code(), LX_OK);
   EXPECT_EQ(values(loaded.object()->derived), values(kBuiltInCodepage.derived));
+  EXPECT_EQ(LXCpMbToUnicode(loaded.object(), "A"), kNoUnicode) << "it has no characters of several bytes";
 }
 
 }  // namespace
