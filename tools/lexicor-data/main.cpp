@@ -1,5 +1,6 @@
 // lexicor-data: compiles the sources of a locale directory, dumps objects as sources, and checks directories.
 // Exit codes: 0 done, 1 an error in the data, 2 a wrong command line.
+#include <csignal>
 #include <cstdio>
 #include <exception>
 #include <filesystem>
@@ -14,6 +15,7 @@
 #include "lexicor/arguments.h"
 #include "lexicor/command.h"
 #include "lexicor/descriptors.h"
+#include "lexicor/output.h"
 #include "ucm.h"
 
 namespace {
@@ -112,6 +114,8 @@ int main(int argc, char** argv) {
   } catch (const lexicor_cli::Failure& failure) {
     std::cerr << "lexicor-data: " << failure.what() << '\n';
     return failure.code();
+  } catch (const lexicor_cli::BrokenPipe&) {  // where SIGPIPE was ignored from the start
+    return 128 + SIGPIPE;
   } catch (const std::exception& error) {
     std::cerr << "lexicor-data: " << error.what() << '\n';
     return kDataError;
