@@ -1,4 +1,4 @@
-// Every shipped codepage: its object holds what its source says, by the library's look-ups, and texts of its
+// Every shipped object holds what its source says; codepages by the library's look-ups as well, and texts of their
 // characters are converted whole and in runs.
 #include <gtest/gtest.h>
 
@@ -250,6 +250,19 @@ TEST(EveryCodepage, HoldsWhatItsSourceSaysAndConverts) {
     Comparison(codepage, compiled, locale.get()).run();
     check_whole_text(codepage.model, locale.get());
     check_runs(locale.get(), codepage.name.id);
+  }
+}
+
+// Those of languages, territories and sort orders are kept as they are dumped, behind a line of comment.
+TEST(EverySource, IsTheDumpOfItsObject) {
+  const Control control = read_source_control(LEXICOR_DATA_DIR);
+  for (const ObjectName& name : control.objects) {
+    if (name.type == lexicor_data::ObjectType::kCodepage) continue;
+    const ObjectFile object =
+        read_object(read_file(LEXICOR_LOCALE_DIR "/" + object_file_name(name)), name.name);
+    const ByteVector source = read_file(LEXICOR_DATA_DIR "/" + source_file_name(name));
+    const std::string text(std::find(source.begin(), source.end(), '\n') + 1, source.end());
+    EXPECT_EQ(dump_object(object, name, &control, name.name), text) << name.name;
   }
 }
 

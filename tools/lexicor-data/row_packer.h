@@ -40,14 +40,11 @@ class RowPacker {
   struct Pending {
     size_t request;
     std::vector<size_t> borders;  ///< for each prefix, its longest proper prefix that is also its suffix
-  };
-  struct Match {
-    size_t overlap;  ///< elements at the array's end that are the row's start
-    size_t found;    ///< where the whole row stands, or the array's size
+    size_t overlap = 0;           ///< elements at the array's end that are the row's start
   };
 
   static std::vector<size_t> borders_of(const Row& row);
-  Match match(const Request& request, const std::vector<size_t>& borders, size_t from) const;
+  bool find(const Request& request, size_t from, Pending& pending, size_t& position) const;
 
   Element filler_;
   Row pool_;
@@ -64,25 +61,28 @@ std::vector<size_t> RowPacker<Element>::borders_of(const Row& row) {
   return borders;
 }
 
-/// One pass over the array from `from` on (Knuth, Morris and Pratt).
+/// Goes on from `from` to the array's end (Knuth, Morris and Pratt); true if the whole row stands there.
 template <typename Element>
-auto RowPacker<Element>::match(const Request& request, const std::vector<size_t>& borders, size_t from) const
-    -> Match {
+bool RowPacker<Element>::find(const Request& request, size_t from, Pending& pending, size_t& position) const {
   const Row& row = request.row;
-  size_t length = 0;
+  size_t length = pending.overlap;
   for (size_t i = std::max(from, request.first_index); i < pool_.size(); ++i) {
-    while (length > 0 && pool_[i] != row[length]) length = borders[length];
+    while (length > 0 && pool_[i] != row[length]) length = pending.borders[length];
     if (pool_[i] == row[length]) ++length;
-    if (length == row.size()) return {length, i + 1 - length};
+    if (length == row.size()) {
+      position = i + 1 - length;
+      return true;
+    }
   }
-  return {length, pool_.size()};
+  pending.overlap = length;
+  return false;
 }
 
 template <typename Element>
 std::vector<size_t> RowPacker<Element>::place(const std::vector<Request>& requests) {
   // Longest first, so that shorter rows find themselves in longer ones.
   std::vector<Pending> pending;
-  for (size_t i = 0; i < requests.size(); ++i) pending.push_back({i, borders_of(requests[i].row)});
+  for (size_t i = 0; i < requests.size(); ++i) pending.push_back({i, borders_of(requests[i].row), 0});
   std::sort(pending.begin(), pending.end(), [&](const Pending& a, const Pending& b) {
     const Request &x = requests[a.request], &y = requests[b.request];
     if (x.row.size() != y.row.size()) return x.row.size() > y.row.size();
@@ -98,15 +98,11 @@ std::vector<size_t> RowPacker<Element>::place(const std::vector<Request>& reques
     size_t best = 0, best_overlap = 0, best_padding = 0, kept = 0;
     for (size_t i = 0; i < pending.size(); ++i) {
       const Request& request = requests[pending[i].request];
-      const size_t length = request.row.size();
-      const Match m = match(request, pending[i].borders, grown_from > length ? grown_from - length : 0);
-      if (m.found < pool_.size()) {
-        position[pending[i].request] = m.found;
-        continue;
-      }
+      if (find(request, grown_from, pending[i], position[pending[i].request])) continue;
+      const size_t overlap = pending[i].overlap;
       const size_t padding = request.first_index > pool_.size() ? request.first_index - pool_.size() : 0;
-      if (kept == 0 || (padding != best_padding ? padding < best_padding : m.overlap > best_overlap)) {
-        best = kept, best_overlap = m.overlap, best_padding = padding;
+      if (kept == 0 || (padding != best_padding ? padding < best_padding : overlap > best_overlap)) {
+        best = kept, best_overlap = overlap, best_padding = padding;
       }
       if (kept != i) pending[kept] = std::move(pending[i]);
       ++kept;
