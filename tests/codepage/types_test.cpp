@@ -46,6 +46,7 @@ TEST_F(Types, BytesWithoutACharacterAndShiftBytes) {
   // A lead byte on its own is a single byte when it comes as a code.
   LXLocale* sjis = library.locale(case_codepage("SJIS"));
   EXPECT_EQ(LXGetCharTypeW(sjis, 0x82, LX_CTYPE1), 0u);
+  EXPECT_EQ(LXGetCharTypeW(sjis, 0x100, LX_CTYPE1), 0u);
   EXPECT_EQ(LXGetCharType(sjis, "\x82\x20", LX_CTYPE2), 0u) << "a pair without a character";
 
   LXLocale* shift = library.locale(case_codepage("SHIFT"));

@@ -130,11 +130,13 @@ TEST_F(InitTest, FailingFrees) {
     LXLocale* const locale = LXGetLocale("", 0, nullptr);
     LXStream* const stream = LXOpenStream(locale, transfer, nullptr, LX_STREAM_READ);
     LXConversion* const conversion = LXOpenConversion(locale, locale);
+    LXFile* const file = LXOpenFile(1, (directory.path() + "/control.nls").c_str(), LX_READ, 0, &rc);
     if (c.default_locale) LXSetLocale("", 0);
     const LXLocale* const previous = globals.default_locale;
     hooks.fail_frees(true);
     EXPECT_EQ(LXCloseStream(stream, locale), 0);
     EXPECT_EQ(LXGetError(locale), LX_E_FREE);
+    EXPECT_EQ(LXCloseFile(file, 0), LX_E_FREE);
     EXPECT_EQ(LXCloseConversion(conversion), LX_E_FREE);
     EXPECT_EQ(LXReleaseLocale(locale), 1);
     if (c.default_locale) {

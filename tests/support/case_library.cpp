@@ -111,6 +111,7 @@ SortBuilder sort_without_insertion() {
   SortBuilder sort = example_sort();
   for (const LXUChar inserted : units("yz12")) sort.characters.erase(inserted);
   sort.characters['x'] = letter(0x203);
+  sort.characters[' '] = letter(0x100);
   return sort;
 }
 
