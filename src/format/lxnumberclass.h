@@ -104,10 +104,7 @@ struct Classifier {
       go_on_at(*in, ahead);
       return static_cast<int32_t>(c - uint32_t{digits.zero});
     }
-    Cursor any(*in);  // a copy, so that `in` can stay in registers
-    const int32_t found = take_any(&any);
-    go_on_at(*in, any);
-    return found;
+    return take_any(in);
   }
 
  private:
