@@ -133,16 +133,17 @@ int32_t find_special(Text* text, const Mapper& mapper, const Specials& specials,
 /// Maps up to the end, a cut character, or the first one that does not fit.
 template <class Text, class Mapper>
 void map_all(Text& text, const Mapper& mapper, const SpecialFilter& filter, const Runs& runs) {
+  const bool special = filter.any();
   for (;;) {
     if constexpr (Text::kRuns && Mapper::kCase) {
       if (text.in.p != text.in.end && *text.in.p < runs.below) map_run(text, runs, filter);
-      if (!filter.any()) copy_caseless(text);
+      if (!special && map_rest(text, mapper, runs.below)) continue;
     }
     typename Text::Char c;
     if (!text.take(&c)) break;
     bool written = true;
     LXUChar results[2];
-    const bool maybe = filter.any() && filter.may_begin(mapper.unicode(c));
+    const bool maybe = special && filter.may_begin(mapper.unicode(c));
     const int32_t count = maybe ? find_special(&text, mapper, filter.specials(), &c, results) : 0;
     if (count != 0) {
       written = text.put(mapper.value(results[0]), c);

@@ -91,8 +91,9 @@ template <class Text>
   text.out.p += i;
 }
 
-/// Copies the characters of several bytes that have no case, as far as they are whole and fit.
-inline void copy_caseless(LeadByteText& text) {
+/// What map_run() leaves: copies whole characters of several bytes that have no case; false for none.
+template <class Mapper>
+bool map_rest(LeadByteText& text, const Mapper&, unsigned) {
   const uint8_t* const p = text.in.p;
   const uint8_t* const lengths = text.in.cp.caseless;
   const size_t n = most_units(text);
@@ -106,11 +107,26 @@ inline void copy_caseless(LeadByteText& text) {
            lengths[p[i + 2 * length]] == length && lengths[p[i + 3 * length]] == length)
       i += 4 * length;
   }
-  if (i == 0) return;
+  if (i == 0) return false;
   memmove(text.out.p, text.in.p, i);
   text.in.p += i;
   text.out.p += i;
+  return true;
 }
-inline void copy_caseless(UnicodeText&) {}
+
+/// ... and maps the characters of Unicode text.
+template <class Mapper>
+bool map_rest(UnicodeText& text, const Mapper& mapper, unsigned below) {
+  auto [p, end] = text.in;
+  auto [to, to_end] = text.out;
+  for (; p != end && to != to_end && *p >= below; ++p, ++to) {
+    LXUChar mapped = *p;
+    mapper.alone({mapped}, &mapped);
+    *to = mapped;
+  }
+  const bool any = p != text.in.p;
+  text = {{p, end}, {to, to_end}};
+  return any;
+}
 
 }  // namespace lx
