@@ -114,8 +114,7 @@ struct CodepageMapper {
   }
 };
 
-/// Looks for the character that was just taken, then for it and the next one, which is taken too when the pair
-/// is there: the number of results.
+/// Looks for the character just taken, then for it and the next one, which goes too: the number of results.
 template <class Text, class Mapper>
 int32_t find_special(Text* text, const Mapper& mapper, const Specials& specials, typename Text::Char* c,
                      LXUChar results[2]) {

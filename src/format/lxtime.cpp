@@ -38,16 +38,17 @@ class TimeFormatter {
       : locale_(locale), time_(time), symbols_(time_symbols<Text>(locale)), current_(current) {}
 
   /// Writes as much as there is before a failure: the code.
-  int32_t expand(Cursor format, Sink* out, int depth = 0) const {
+  int32_t expand(const Cursor& format, Sink* out, int depth = 0) const {
     const int32_t code = walk(format, out, depth);
     close_text(*out);
     return code;
   }
 
  private:
-  int32_t walk(Cursor format, Sink* out, int depth) const {
+  int32_t walk(const Cursor& text, Sink* out, int depth) const {
     const Sink start = *out;
-    Sink to = *out;  // a copy, as is what other functions move: this one stays in registers
+    Cursor format(text);  // copies, as is what other functions move: these stay in registers
+    Sink to = *out;
     Value value{};
     int32_t code = LX_OK;
     while (code == LX_OK && format.p != format.end) {
