@@ -114,7 +114,7 @@ struct CodepageMapper {
   }
 };
 
-/// Looks for the character just taken, then for it and the next one, which goes too: the number of results.
+/// The results for the character just taken, or for it and the next one, which is then taken too: how many.
 template <class Text, class Mapper>
 int32_t find_special(Text* text, const Mapper& mapper, const Specials& specials, typename Text::Char* c,
                      LXUChar results[2]) {

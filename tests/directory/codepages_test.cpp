@@ -2,6 +2,7 @@
 // characters are converted whole and in runs.
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <bitset>
 #include <random>
 #include <set>
