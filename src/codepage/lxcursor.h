@@ -94,7 +94,7 @@ struct LeadByteCursor {
   template <class V>
   bool next(V* value) {
     if (p == end) return false;
-    if (kUtf8 && *p < cp.same_below) {  // apart: the next character does not wait for the length of this one
+    if (*p < cp.same_below) {  // apart: the next character does not wait for the length of this one
       *value = *p++;
       return true;
     }

@@ -215,27 +215,26 @@ void ShiftSink::put_run(const LXUChar* values, size_t count) {
     const uint32_t* const page_start = cp.page_start;
     const uint16_t* const codes = cp.codes16;
     uint8_t* q = p;
-    LXShiftState s = state;
-    for (; i < count; ++i) {
-      const unsigned u = values[i];
-      const uint16_t code = codes[page_start[u >> 8] + (u & 0xFF)];
-      if (code <= 0xFF) {
-        if (s != LX_SHIFT_SINGLE) {
-          *q++ = cp.shift_in;
-          s = LX_SHIFT_SINGLE;
+    const auto code_at = [=](size_t at) {
+      return unsigned{codes[page_start[values[at] >> 8] + (values[at] & 0xFFu)]};
+    };
+    while (i < count) {
+      unsigned code = code_at(i);
+      if (shift_due(code <= 0xFF ? 1 : 2)) *q++ = take_shift_byte();
+      if (state == LX_SHIFT_SINGLE) {
+        for (; code <= 0xFF; code = code_at(i)) {
+          *q++ = static_cast<uint8_t>(code);
+          if (++i == count) break;
         }
-        *q++ = static_cast<uint8_t>(code);
       } else {
-        if (s == LX_SHIFT_SINGLE) {
-          *q++ = cp.shift_out;
-          s = LX_SHIFT_DOUBLE;
+        for (; code > 0xFF; code = code_at(i)) {
+          put_le16(q, static_cast<uint16_t>(code << 8 | code >> 8));
+          q += 2;
+          if (++i == count) break;
         }
-        put_le16(q, static_cast<uint16_t>(code << 8 | code >> 8));
-        q += 2;
       }
     }
     p = q;
-    state = s;
   }
   for (; i < count; ++i) put(values[i]);
 }
