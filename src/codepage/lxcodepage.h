@@ -107,6 +107,7 @@ inline void store_code(uint8_t* p, uint32_t code, size_t count) {
 /// The code whose bytes are those that storing `code` leaves: a zero byte behind the first one is not stored,
 /// since the lengths of the encodings carry none.
 inline uint32_t without_zero_bytes(uint32_t code) {
+  if (code <= 0xFFFF) return code;  // none stands inside
   uint32_t kept = 0;
   for (int shift = 24; shift > 0; shift -= 8)
     if ((code >> shift & 0xFF) != 0) kept = kept << 8 | (code >> shift & 0xFF);

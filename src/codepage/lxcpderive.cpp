@@ -102,8 +102,12 @@ void fill_codes(const Codepage& cp, Code* codes) {
   for (size_t page = 0; page < kRow; ++page) {
     if (cp.page_start[page] == 0) continue;
     Code* row = codes + cp.page_start[page];
-    for (size_t low = 0; low < kRow; ++low)
-      row[low] = static_cast<Code>(without_zero_bytes(cp.pages.code(static_cast<uint16_t>(page << 8 | low))));
+    const fmt::PageEntry entry = cp.pages.entry(page);
+    for (unsigned low = 0; low < kRow; ++low) {
+      const bool maps = entry.maps(low);
+      const uint32_t code = maps ? entry.code(low, cp.pages.low_array, cp.pages.high_array) : cp.substitution;
+      row[low] = static_cast<Code>(without_zero_bytes(code));
+    }
   }
 }
 

@@ -79,6 +79,8 @@ class TrieCheck {
     if (heights_[index] != 0) return heights_[index];
     const Node node = trie_.node(index);
     size_t tallest = 1;
+    // Where the highest entry that a leaf can lead to exists, all do.
+    if (node.leaf != 0 && trie_.has_entry(node.next(node.mask))) return heights_[index] = 1;
     for (unsigned byte = node.lowest; byte <= node.highest; ++byte) {
       if (node.leaf != 0) {
         if (!trie_.has_entry(node.next(byte))) return refuse(trie_.no_entry, index);
@@ -180,6 +182,11 @@ class Validator {
     for (size_t number = 0; number < kAnyByte; ++number) {
       const fmt::PageEntry page = pages.entry(number);
       const size_t place = fmt::kPages + number * fmt::PageEntry::kBytes;
+      // Where the highest element exists, all do, and codes of as many bytes as the width need no look.
+      if (holds_element(2, page.low + page.mask, page.low_bytes()) &&
+          holds_element(3, page.high + page.mask, page.high_bytes()) &&
+          page.low_bytes() + page.high_bytes() <= width_)
+        continue;
       for (unsigned byte = page.lowest; byte <= page.highest; ++byte) {
         if (!holds_element(2, page.low + (byte & page.mask), page.low_bytes()))
           return corrupt("a page leads outside the low array", place);

@@ -13,13 +13,18 @@ namespace fmt = format::sort;
 
 constexpr size_t kPages = 256;
 constexpr size_t kPageElements = 256;
+constexpr unsigned kAppendsAll =
+    LX_APPEND_PRIMARY | LX_APPEND_SECONDARY | LX_APPEND_TERTIARY | LX_APPEND_SPECIAL;
 
 fmt::Page page_at(const uint8_t* payload, size_t page) {
   return fmt::Page::read(payload + fmt::kPages + fmt::Page::kBytes * page);
 }
-fmt::WeightRecord table_record(const uint8_t* payload, LXUChar u) {
-  const size_t number = page_at(payload, u >> 8).base + (u & 0xFFu);
-  return fmt::WeightRecord::read(payload + le16(payload + fmt::kWeights) + fmt::WeightRecord::kBytes * number);
+/// The weight records of a table page, by low byte.
+const uint8_t* table_records(const uint8_t* payload, const fmt::Page& page) {
+  return payload + le16(payload + fmt::kWeights) + fmt::WeightRecord::kBytes * page.base;
+}
+fmt::WeightRecord record_at(const uint8_t* records, size_t low) {
+  return fmt::WeightRecord::read(records + fmt::WeightRecord::kBytes * low);
 }
 fmt::Expansion expansion_at(const uint8_t* payload, size_t i) {
   return fmt::Expansion::read(payload + le16(payload + fmt::kExpansions) + fmt::Expansion::kBytes * i);
@@ -36,8 +41,7 @@ Element element_of(const fmt::WeightRecord& record) {
 }
 
 /// An expansion has no weights until its record is found.
-Element table_element(const uint8_t* payload, LXUChar u) {
-  const fmt::WeightRecord record = table_record(payload, u);
+Element table_element(const fmt::WeightRecord& record) {
   return record.is_expansion() ? Element() : element_of(record);
 }
 
@@ -50,6 +54,7 @@ void note_set(Sort* sort, const Element& set) {
     sort->appends_all = false;
 }
 void note_insertion(Sort* sort, const Element& element) {
+  if (element.char_class() == kAppendsAll) return;
   if (element.sets() != 2) return note_set(sort, element);
   note_set(sort, sort->first_set(element));
   note_set(sort, sort->second_set(element));
@@ -80,9 +85,10 @@ void fill_pages(Sort* sort, Element* elements, const bool (&flat)[kPages]) {
     if (computed) note_insertion(sort, Sort::computed(page, 0));
     if (computed) note_insertion(sort, Sort::computed(page, 1));
     if (!flat[number]) continue;
+    const uint8_t* const records = computed ? nullptr : table_records(payload, record);
     for (size_t low = 0; low < kPageElements; ++low) {
       const auto u = static_cast<LXUChar>(number << 8 | low);
-      elements[low] = computed ? Sort::computed(page, u) : table_element(payload, u);
+      elements[low] = computed ? Sort::computed(page, u) : table_element(record_at(records, low));
       note_insertion(sort, elements[low]);
     }
     page.elements = elements;
@@ -95,8 +101,9 @@ void fill_expansions(Sort* sort) {
   // From the back: of several records of a character the first counts.
   for (size_t i = le16(payload + fmt::kExpansionCount); i-- > 0;) {
     const LXUChar u = expansion_at(payload, i).character;
-    if (!page_at(payload, u >> 8).is_table()) continue;
-    const fmt::WeightRecord pointing = table_record(payload, u);
+    const fmt::Page page = page_at(payload, u >> 8);
+    if (!page.is_table()) continue;
+    const fmt::WeightRecord pointing = record_at(table_records(payload, page), u & 0xFFu);
     if (!pointing.is_expansion()) continue;
     const Element element({0, 0, 0, static_cast<uint16_t>(i)}, 2, pointing.char_class());
     flat_element(*sort, u) = element;

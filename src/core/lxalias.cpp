@@ -3,7 +3,6 @@
 // the current codepage; '#' in column 1 begins a comment.
 #include "core/lxalias.h"
 
-#include <ctype.h>
 #include <stdio.h>
 #include <string.h>
 
@@ -25,6 +24,10 @@ constexpr size_t kNameBytes = sizeof(LXObjManager::directory) + 16;
 
 bool is_separator(char c) {
   return c == ' ' || c == '\t' || c == '\n' || c == '\r' || c == '\0';
+}
+
+char upper_case(char c) {
+  return c >= 'a' && c <= 'z' ? static_cast<char>(c - 'a' + 'A') : c;
 }
 
 /// A piece of the file's text.
@@ -112,8 +115,7 @@ class AliasReader {
       return false;
     }
     memcpy(record->codepage, codepage_.begin, codepage_.bytes());
-    for (size_t i = 0; i < alias.bytes(); ++i)
-      record->alias[i] = static_cast<char>(toupper(static_cast<unsigned char>(alias.begin[i])));
+    for (size_t i = 0; i < alias.bytes(); ++i) record->alias[i] = upper_case(alias.begin[i]);
     *tail_ = record;
     tail_ = &record->next;
     LX_TRACE(unit, RAS1_LEVEL_DETAIL, "Saved alias %s, length = %d", record->alias, alias.printable_bytes());
