@@ -18,6 +18,19 @@ inline constexpr unsigned kAscii = 0x80;
 inline constexpr size_t kBlock = 16;              // units looked at or moved at a time
 inline constexpr size_t kUtf8Batch = kBlock / 2;  // characters written at a time
 
+/// The bytes that begin characters of several bytes, in ranges: two for characters of two bytes, which may be
+/// the same, and one for those of three.
+struct LeadRanges {
+  struct Range {
+    uint8_t first;
+    uint8_t others;  // how many bytes follow it
+  };
+  Range two[2];
+  Range three;
+  bool has_three;
+  bool known;  // else the first bytes are otherwise
+};
+
 #if defined(__SSE2__)
 
 inline constexpr bool kVectors = true;
@@ -133,6 +146,56 @@ class Utf8Block {
   unsigned ours_ = 0;   // before the first longer character
 };
 
+/// A block of multibyte text at the start of a character, where every byte is one bit. No character waits for
+/// the length of the one before.
+class CharBlock {
+ public:
+  static constexpr size_t kBytes = 8 * sizeof(size_t);
+
+  CharBlock(const uint8_t* p, const LeadRanges& leads) {
+    size_t two = 0, three = 0;
+    for (size_t i = 0; i < kBytes; i += kBlock) {
+      const __m128i bytes = load_block(p + i);
+      two |= size_t{byte_mask(_mm_or_si128(in(leads.two[0], bytes), in(leads.two[1], bytes)))} << i;
+      if (leads.has_three) three |= size_t{byte_mask(in(leads.three, bytes))} << i;
+    }
+    if (three == 0) {
+      // A byte that can begin a character continues one behind a byte that does: in a series every other one.
+      constexpr size_t kOdd = SIZE_MAX / 3 * 2;
+      const size_t ends = ((two << 1 | kOdd) - two) ^ kOdd;
+      trails_ = ends ^ two;
+      longer_ = (ends & two) >> (kBytes - 1);
+    } else {
+      const size_t any = two | three;
+      trails_ = any << 1 | three << 2;
+      known_ = (any & trails_) == 0;
+      longer_ = (any >> (kBytes - 1)) + (three >> (kBytes - 1)) + (three >> (kBytes - 2) & 1);
+    }
+  }
+  /// False where a character of three bytes is followed by what could begin another one.
+  bool known() const { return known_; }
+  size_t chars() const { return kBytes - ones(trails_); }
+  /// The bytes of the characters that begin in the block.
+  size_t bytes() const { return kBytes + longer_; }
+
+ private:
+  static __m128i in(LeadRanges::Range range, __m128i bytes) {
+    const __m128i above = _mm_sub_epi8(bytes, _mm_set1_epi8(static_cast<char>(range.first)));
+    return _mm_cmpeq_epi8(_mm_min_epu8(above, _mm_set1_epi8(static_cast<char>(range.others))), above);
+  }
+  static size_t ones(size_t bits) {
+    constexpr size_t kAll = SIZE_MAX;
+    bits -= bits >> 1 & kAll / 3;
+    bits = (bits & kAll / 5) + (bits >> 2 & kAll / 5);
+    bits = (bits + (bits >> 4)) & kAll / 17;
+    return bits * (kAll / 255) >> (kBytes - 8);
+  }
+
+  size_t trails_;
+  size_t longer_;
+  bool known_ = true;
+};
+
 /// Writes a batch of characters when all of them have one or two bytes, and maybe one byte behind the last one.
 inline bool put_short_batch(const uint16_t* values, uint8_t** p) {
   const __m128i v = load_block(values);
@@ -183,6 +246,14 @@ class Utf8Block {
 inline bool put_short_batch(const uint16_t*, uint8_t**) {
   return false;
 }
+class CharBlock {
+ public:
+  static constexpr size_t kBytes = 8 * sizeof(size_t);
+  CharBlock(const uint8_t*, const LeadRanges&) {}
+  bool known() const { return false; }
+  size_t chars() const { return 0; }
+  size_t bytes() const { return 0; }
+};
 
 #endif
 

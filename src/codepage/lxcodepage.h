@@ -3,6 +3,7 @@
 // then.
 #pragma once
 
+#include "codepage/lxblock.h"
 #include "core/lxbytes.h"
 #include "core/lxformat.h"
 #include "core/lxobjman.h"
@@ -58,6 +59,7 @@ struct Codepage {
   // Bytes below this are the Unicode values of the same number, both ways, wherever they begin a character:
   // 0x100 for ISO 8859-1, 0x80 where ASCII is, else 0.
   uint16_t same_below;
+  LeadRanges leads;
   // By first byte: the length of the characters of several bytes that begin with it, if none of them has
   // another case; else 0.
   uint8_t caseless[256];

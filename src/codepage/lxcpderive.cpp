@@ -122,6 +122,26 @@ uint16_t same_below(const Codepage& cp) {
   return static_cast<uint16_t>(below & 0x180);
 }
 
+LeadRanges lead_ranges(const Codepage& cp) {
+  LeadRanges leads{};
+  size_t twos = 0, threes = 0;
+  for (unsigned b = 0; b < kRow; ++b) {
+    const uint8_t length = cp.length(static_cast<uint8_t>(b));
+    if (length == 1) continue;
+    if (length > 3) return leads;
+    if (b != 0 && cp.length(static_cast<uint8_t>(b - 1)) == length) {
+      ++(length == 2 ? leads.two[twos - 1] : leads.three).others;
+      continue;
+    }
+    if (length == 2 ? twos++ == 2 : threes++ == 1) return leads;
+    (length == 2 ? leads.two[twos - 1] : leads.three).first = static_cast<uint8_t>(b);
+  }
+  if (twos == 1) leads.two[1] = leads.two[0];
+  leads.has_three = threes != 0;
+  leads.known = twos != 0;
+  return leads;
+}
+
 bool has_two_level_rows(const Codepage& cp, size_t nodes) {
   if (nodes == 0 || cp.leaf[0] != 0) return false;
   for (size_t i = 1; i < nodes; ++i)
@@ -222,6 +242,7 @@ void* derive_codepage(uint16_t id, const Sections& sections) {
   }
   cp->two_level_rows = has_two_level_rows(*cp, nodes.count());
   cp->same_below = same_below(*cp);
+  if (!cp->single_byte) cp->leads = lead_ranges(*cp);
   cp->plain_digits = has_plain_digits(*cp);
   fill_caseless(cp);
   return block;

@@ -202,17 +202,53 @@ inline UnicodeCursor like(const UnicodeCursor&, const LXUChar* p, size_t units, 
   return {p, p + units};
 }
 
+/// A place behind characters, and how many they are.
+struct Passed {
+  const uint8_t* p;
+  size_t chars;
+};
+
+/// Passes whole blocks of multibyte text, of at most `most` characters. Of values alone, so that the cursor
+/// stays in registers.
+Passed pass_blocks(const Codepage& cp, const uint8_t* p, const uint8_t* end, size_t most);
+
+/// Passes the characters up to the next shift byte, at most `most`; of other text none.
+template <class Cursor>
+size_t pass_in_state(Cursor* in, size_t most) {
+  size_t chars = 0;
+  if constexpr (Cursor::kShifts) {
+    const size_t width = in->length();
+    const uint8_t* p = in->p;
+    for (; chars < most && room(p, in->end) >= width && !in->cp.is_shift(*p); p += width) ++chars;
+    in->p = p;
+  }
+  return chars;
+}
+
+/// Passes at most `most` characters: how many there were.
+template <class Cursor>
+size_t pass_chars(Cursor* in, size_t most) {
+  size_t chars = 0;
+  if constexpr (Cursor::kOneUnit) {
+    chars = least(most, room(in->p, in->end));
+    in->p += chars;
+  } else {
+    if constexpr (!Cursor::kShifts) {
+      if (most >= CharBlock::kBytes && room(in->p, in->end) > CharBlock::kBytes) {
+        const Passed run = pass_blocks(in->cp, in->p, in->end, most);
+        in->p = run.p;
+        chars = run.chars;
+      }
+    }
+    while (chars < most && in->pass()) chars += 1 + pass_in_state(in, most - chars - 1);
+  }
+  return chars;
+}
+
 /// Passes all characters that are left: how many they are.
 template <class Cursor>
 size_t pass_all(Cursor* in) {
-  size_t chars = 0;
-  if constexpr (Cursor::kOneUnit) {
-    chars = room(in->p, in->end);
-    in->p = in->end;
-  } else {
-    while (in->pass()) ++chars;
-  }
-  return chars;
+  return pass_chars(in, SIZE_MAX);
 }
 
 /// The state at a place of a text; of a text without shift bytes the one that was given.

@@ -149,6 +149,23 @@ size_t ShiftCursor::read_run(LXUChar* values, size_t most, unsigned) {
   return n;
 }
 
+Passed pass_blocks(const Codepage& cp, const uint8_t* p, const uint8_t* end, size_t most) {
+  const LeadRanges leads = cp.leads;
+  size_t chars = 0;
+  // So many characters have at least the bytes that are looked at, also where no end is known.
+  while (kVectors && leads.known && most - chars >= CharBlock::kBytes &&
+         room(p, end) >= CharBlock::kBytes + kMaxCharBytes) {
+    const CharBlock block(p, leads);
+    if (block.known()) {
+      chars += block.chars();
+      p += block.bytes();
+      continue;
+    }
+    for (size_t i = 0; i < CharBlock::kBytes / kMaxCharBytes; ++i, ++chars) p += cp.length(*p);
+  }
+  return {p, chars};
+}
+
 template <>
 void SingleByteSink::put_run(const LXUChar* values, size_t count) {
   constexpr size_t kBatch = 8;

@@ -4,18 +4,19 @@
 namespace lx {
 namespace {
 
-/// Passes a character as LX_CHARACTERS counts it, with the shift bytes on both sides: false, with nothing
-/// passed, at the end and before a character that it cuts.
+/// Passes at most `most` characters as LX_CHARACTERS counts them, with the shift bytes on both sides; none at the
+/// end and before a character that it cuts. How many there were.
 template <class Cursor>
-bool pass_counted(Cursor* in) {
+size_t pass_counted(Cursor* in, size_t most) {
   if constexpr (Cursor::kShifts) {
-    Cursor ahead(*in);
-    if (!ahead.pass()) return false;
-    ahead.pass_shift();
-    go_on_at(*in, ahead);
-    return true;
+    size_t chars = 0;
+    for (Cursor ahead(*in); chars < most && ahead.pass(); ++chars) {
+      ahead.pass_shift();
+      go_on_at(*in, ahead);
+    }
+    return chars;
   } else {
-    return in->pass();
+    return pass_chars(in, most);
   }
 }
 
@@ -25,17 +26,14 @@ size_t bytes_of_chars(const Codepage& cp, const uint8_t* text, LXShiftState stat
   const uint8_t* const end = most == SIZE_MAX ? no_end<const uint8_t>() : text + most;
   return with_kind<uint8_t>(cp, Form::kEx, [&](auto kind) {
     auto in = decltype(kind)::Cursor::over(cp, text, end, state);
-    for (int32_t left = chars; left > 0 && pass_counted(&in);) --left;
+    pass_counted(&in, chars > 0 ? static_cast<size_t>(chars) : 0);
     return room(text, in.p);
   });
 }
 
 int32_t chars_counted(const Codepage& cp, const uint8_t* text, LXShiftState state, size_t bytes) {
-  return with_cursor(cp, Form::kEx, state, text, bytes, [](auto in) {
-    int32_t chars = 0;
-    while (pass_counted(&in)) ++chars;
-    return chars;
-  });
+  return with_cursor(cp, Form::kEx, state, text, bytes,
+                     [](auto in) { return static_cast<int32_t>(pass_counted(&in, SIZE_MAX)); });
 }
 
 int32_t chars_in_bytes(const Codepage& cp, const uint8_t* text, LXShiftState state, size_t bytes) {
@@ -47,7 +45,8 @@ Part whole_chars(const Codepage& cp, Form form, const uint8_t* text, LXShiftStat
                  size_t text_bytes) {
   return with_cursor(cp, form, state, text, bytes, [&](auto in) {
     size_t chars = 0;
-    for (auto ahead(in); ahead.pass(); go_on_at(in, ahead)) ++chars;
+    if constexpr (!decltype(in)::kShifts) chars = pass_all(&in);
+    for (auto ahead(in); ahead.pass(); go_on_at(in, ahead)) ++chars;  // a shift byte before no character stays
     if constexpr (decltype(in)::kShifts)
       if (in.p < in.end && cp.is_shift(*in.p) && (*in.p == cp.shift_in || in.p + 1 == text + text_bytes))
         ++in.p;
@@ -58,8 +57,7 @@ Part whole_chars(const Codepage& cp, Form form, const uint8_t* text, LXShiftStat
 Part copy_chars(const Codepage& cp, Form form, LXShiftState state, const uint8_t* text, size_t bytes,
                 size_t chars, uint8_t* out) {
   return with_cursor(cp, form, state, text, bytes, [&](auto in) {
-    size_t n = 0;
-    while (n < chars && in.pass()) ++n;
+    const size_t n = pass_chars(&in, chars);
     size_t copied = room(text, in.p);
     memcpy(out, text, copied);
     if (state_at(in, LX_SHIFT_SINGLE) == LX_SHIFT_DOUBLE && copied != 0) out[copied++] = cp.shift_in;

@@ -53,7 +53,7 @@ typename Kind::Cursor given_text(const Codepage& cp, const Text<Unit>& text, boo
   if (text.length < 0 || !characters)
     return Kind::cursor(cp, text.p, text_units(text.p, text.length), text.state);
   auto in = Kind::Cursor::over(cp, text.p, no_end<const Unit>(), text.state);
-  for (int32_t left = text.length; left > 0; --left) in.pass();
+  pass_chars(&in, static_cast<size_t>(text.length));
   return Kind::cursor(cp, text.p, room(text.p, in.p), text.state);
 }
 

@@ -104,6 +104,27 @@ TEST_F(Navigation, EveryCharacterForwardsAndBackwards) {
   }
 }
 
+TEST_F(Navigation, LongTextsAreWalkedByTheLengthsOfTheirBytes) {
+  for (const TinyCodepage& cp : case_codepages()) {
+    SCOPED_TRACE(cp.file.name);
+    LXLocale* const in = library.locale(cp);
+    for (int round = 0; round < 400 / kSlowness && !cp.shift; ++round) {
+      auto bytes = random_text(cp, random() % 300, LX_SHIFT_SINGLE).units;
+      for (size_t faults = bytes.empty() ? 0 : random() % 4; faults > 0; --faults)
+        bytes[random() % bytes.size()] = static_cast<uint8_t>(random());
+      const std::vector<char> text(bytes.begin(), bytes.end());
+      int32_t at = 0, chars = 0;
+      for (const auto size = static_cast<int32_t>(text.size()); at < size; ++chars) {
+        const int32_t length = LXByteLength(in, &text[static_cast<size_t>(at)]);
+        if (length > size - at) break;
+        at += length;
+      }
+      ASSERT_EQ(LXNumChars(in, text.data(), static_cast<int32_t>(text.size())), chars);
+      ASSERT_EQ(LXMoveStringPointer(in, text.data(), chars, LX_CHARACTERS), text.data() + at);
+    }
+  }
+}
+
 TEST_F(Navigation, SwapsWholeUnitsOnly) {
   for (int32_t bytes = -1; bytes <= 5; ++bytes) {
     std::vector<char> buffer{'a', 'b', 'c', 'd', 'e'};
