@@ -93,7 +93,7 @@ class Differences {
   void compare_written(const std::string& place, const std::string& area, const Text16& ours, Peer peer,
                        const Text16& code = {}) {
     const auto equal = [&](const Kinds& kinds) {
-      return level(ours, kinds, code) == level(ascii_signs(peer(kinds)), kinds, code);
+      return level(ascii_signs(ours), kinds, code) == level(ascii_signs(peer(kinds)), kinds, code);
     };
     if (equal({})) return;
     Kinds kinds(kKinds.begin(), kKinds.end());

@@ -114,7 +114,9 @@ void import_territories(const fs::path& directory) {
 
 void import_sorts(const fs::path& directory, const std::vector<Codepage>& codepages) {
   std::set<char16_t> written;
-  for (const Codepage& codepage : codepages) written.merge(repertoire(directory, codepage.name));
+  // Georgian has a page of its own, for which the largest sort has no room beside its contractions.
+  for (const Codepage& codepage : codepages)
+    if (codepage.name != std::string("GEORGIAN-PS")) written.merge(repertoire(directory, codepage.name));
   fs::create_directories(directory / "sorts");
   for (const Sort& row : kSorts) {
     Notes notes;
