@@ -133,7 +133,9 @@ class Import {
   }
 
   void read_code_points() {
-    for (uint32_t unicode = 0; unicode < kCodePoints; ++unicode) {
+    // No codepage of one byte has characters beyond the first plane.
+    const uint32_t end = source_.width == 1 ? 0x10000 : kCodePoints;
+    for (uint32_t unicode = 0; unicode < end; ++unicode) {
       if (unicode >= 0xD800 && unicode <= 0xDFFF) continue;
       if (unicode == 0x40000) unicode = 0xF0000;  // no character stands in these planes
       Bytes bytes = converter_.encode(unicode);
