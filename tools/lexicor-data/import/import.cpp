@@ -108,7 +108,7 @@ void import_territories(const fs::path& directory) {
     }
     for (const std::string& note : notes) std::printf("%s: %s\n", row.name, note.c_str());
     write_file(directory / "territories" / (std::string(row.name) + ".toml"),
-               source_comment(row.locale) + out.str());
+               territory_comment(row) + out.str());
   }
 }
 

@@ -221,6 +221,15 @@ void read_region(const Territory& row, Overrides& overrides, TerritorySource& te
 
 }  // namespace
 
+std::string territory_comment(const Territory& row) {
+  std::string comment = source_comment(row.locale);
+  comment.pop_back();  // the end of the line
+  for (const Fact& fact : kFacts)
+    if (country_of(row.locale) == fact.country)
+      comment += std::string(" Since ") + fact.since + " " + fact.overrides + ": " + fact.source + ".";
+  return comment + '\n';
+}
+
 TerritorySource import_territory(const Territory& row, Notes& notes) {
   const std::string locale = icu_locale(row.locale);
   Overrides overrides = overrides_of(row);
