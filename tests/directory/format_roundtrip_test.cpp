@@ -1,7 +1,8 @@
-// What the library writes it reads: numbers, amounts and times of every shipped language and territory, in
-// every codepage that has all of their letters, in all four forms, which write the same characters. What does
-// not come back is what format_roundtrip_exceptions.txt lists. And where the names of the operating system lead, and
-// what their codepages can hold.
+// What the library writes it reads: numbers, amounts and times of every shipped language and territory, in UTF-8, in
+// the codepages that the operating system's names give them and in some of those that have all of their letters, so
+// that every codepage meets many, in all four forms, which write the same characters. What does not come back is what
+// format_roundtrip_exceptions.txt lists. And where the names of the operating system lead, and what their codepages
+// can hold.
 #include <gtest/gtest.h>
 
 #include <cmath>
@@ -44,6 +45,12 @@ struct Place {
   bool has_directives(bool plain) const {
     const auto letters = encode(kEx, l, units("%#a"));
     return is(LX_ITEM_CODEPAGE_ASCII) || letters == "\x6C\x7B\x81" || (!plain && codepage == "IBM930");
+  }
+  /// Whether byte forms cut a name.
+  bool has_long_name() const {
+    for (int32_t number = LX_ITEM_DAY; number <= LX_ITEM_AFTERNOON; ++number)
+      if (encode(kEx, l, item(l, number)).size() > 31) return true;
+    return false;
   }
 };
 
@@ -91,8 +98,7 @@ struct RoundTrip {
       const std::string example = shown(text) + " reads as " + std::to_string(value);
       if (end != static_cast<ptrdiff_t>(text.find(' '))) return fail("number", place, form.name, example);
       EXPECT_EQ(value, strtod(shown(text).c_str(), nullptr)) << example;
-      const std::string territory = place.pair.substr(place.pair.find('_') + 1);
-      differences.add(amount ? "grouped_amount" : "grouped_number", territory, example);
+      differences.add(amount ? "amount" : "number", "blank", example);
     });
   }
 
@@ -109,8 +115,9 @@ struct RoundTrip {
         return differences.add("directives", place.codepage, ascii_format);
       const Units written = decode(form, l, text), expected = place.seen(form, whole);
       if (code != LX_OK || written != expected) {
-        const bool cut = code == LX_OK && written.size() < expected.size() && kBytes;
-        fail(cut ? "name" : "time_characters", place, cut ? "" : form.name, shown(written));
+        const bool cut = code == LX_OK && written.size() < expected.size() && kBytes && place.has_long_name();
+        if (cut) return differences.add("name", "long", place.pair + "." + place.codepage);
+        fail("time_characters", place, form.name, shown(written));
       }
       LXTime back{-1, -1, -1, -1, -1, -10000, -1, -1};  // what is not read cannot be written again
       const auto exact = std::vector(text.begin(), text.end());
@@ -173,6 +180,8 @@ TEST(FormatRoundTrip, EveryLocale) {
   RoundTrip trip;
   int count = 0;
   const auto objects = lexicor_data::read_source_control(LEXICOR_DATA_DIR).objects;
+  constexpr int kPairs = 16;  // of those whose letters a codepage has, it takes one in so many
+  std::map<std::string, int> met;
   for (const std::string& pair : pairs) {
     const Units names = names_of(locale_with("UTF-8", pair).get());
     for (const auto& object : objects) {
@@ -180,12 +189,12 @@ TEST(FormatRoundTrip, EveryLocale) {
       const bool all = own.count(pair + "." + object.name) != 0 || object.name == "UTF-8";
       if (count++ % kSlowness != 0) continue;
       const Place place{pair, object.name, all ? 1U : 7U};
-      if (!all && place.seen(kEx, names) != names) continue;
+      if (!all && (place.seen(kEx, names) != names || met[object.name]++ % kPairs != 0)) continue;
       times(&trip, place);
       numbers(&trip, place);
     }
   }
-  EXPECT_GT(trip.cases * kSlowness, 900000U);
+  EXPECT_GT(trip.cases * kSlowness, 600000U);
   trip.differences.expect_listed("format_roundtrip_exceptions.txt");
 }
 

@@ -63,27 +63,41 @@ bool is_default(const std::string& name, const char* converter) {
   return U_SUCCESS(error) && first != nullptr && std::strcmp(first, converter) == 0;
 }
 
+/// Whether IANA has the codepage under a name of five digits: IBM00858, IBM01140.
+bool has_euro_name(uint16_t id) {
+  return id == 858 || (id >= 1140 && id <= 1149);
+}
+
+/// Whether the identifier is what IBM calls the codepage; others are of a registry or of vendors.
+bool has_ibm_number(const Codepage& codepage) {
+  static const std::set<uint16_t> registry{115, 119, 2082, 2259};
+  return codepage.id < 10000 && registry.count(codepage.id) == 0 && !starts_with(codepage.name, "CP");
+}
+
 std::vector<std::string> customary_names(const Codepage& codepage) {
   const std::string name = codepage.name, id = std::to_string(codepage.id);
   std::vector<std::string> names;
   if (starts_with(name, "IBM")) {
     const std::string number = std::to_string(std::stoul(name.substr(3))), padded = name.substr(3);
-    for (const char* form : {"ibm", "ibm-", "cp", "cp-", "ccsid"}) {
+    for (const char* form : {"ibm", "ibm-", "cp", "cp-", "ccsid", "csIBM"}) {
       names.push_back(form + number);
       names.push_back(form + padded);
     }
+    if (has_euro_name(codepage.id)) names.push_back("csIBM" + std::string(5 - number.size(), '0') + number);
   } else if (starts_with(name, "MS")) {
-    for (const char* form : {"windows-", "windows", "cp", "win", "win-", "ms-"}) names.push_back(form + id);
+    for (const char* form :
+         {"windows-", "windows", "cp", "win", "win-", "ms-", "cswindows", "x-cp", "dos-", "ms"})
+      names.push_back(form + id);
   } else if (starts_with(name, "ISO-8859-")) {
     const std::string part = name.substr(9);
-    for (const char* form : {"iso8859-", "iso_8859-", "iso8859_", "iso8859", "iso-8859_", "8859-", "8859_"}) {
+    for (const char* form :
+         {"iso8859-", "iso_8859-", "iso8859_", "iso8859", "iso-8859_", "8859-", "8859_", "csISO8859"}) {
       names.push_back(form + part);
     }
     names.push_back("windows-" + std::to_string(28590 + std::stoul(part)));
   }
-  if (!starts_with(name, "IBM") && codepage.origin != kComputed && codepage.id < 10000 && codepage.id != 2259) {
-    names.push_back("cp" + id);
-    names.push_back("ibm-" + id);
+  if (!starts_with(name, "IBM") && has_ibm_number(codepage)) {
+    for (const char* form : {"cp", "ibm-", "ibm"}) names.push_back(form + id);
   }
   return names;
 }

@@ -21,6 +21,7 @@ constexpr size_t kMaxCodeBytes = 4;
 constexpr uint32_t kCodePoints = 0x110000;
 constexpr size_t kRangeOfBytes = 2;  // where the dash stands in "F9-FC"
 constexpr uint32_t kNone = 0xFFFFFFFF;
+constexpr char kLowLetters[] = "low-letters";
 
 /// A packed code with its length, as a key: codes of different lengths never meet.
 struct Code {
@@ -57,8 +58,10 @@ class Import {
     read_codes();
     read_code_points();
     set_family();
-    straighten_controls();
-    for (const std::string& word : words(codepage.overrides)) apply_override(word);
+    const std::vector<std::string> overrides = words(codepage.overrides);
+    const bool low_letters = std::count(overrides.begin(), overrides.end(), kLowLetters) != 0;
+    if (source_.ascii && !low_letters) straighten_controls();
+    for (const std::string& word : overrides) apply_override(word);
     drop_other_signs();
     set_substitution();
     set_line_ends();
@@ -130,7 +133,9 @@ class Import {
   }
 
   void read_code_points() {
-    for (uint32_t unicode = 0; unicode < kCodePoints; ++unicode) {
+    // No codepage of one byte has characters beyond the first plane.
+    const uint32_t end = source_.width == 1 ? 0x10000 : kCodePoints;
+    for (uint32_t unicode = 0; unicode < end; ++unicode) {
       if (unicode >= 0xD800 && unicode <= 0xDFFF) continue;
       if (unicode == 0x40000) unicode = 0xF0000;  // no character stands in these planes
       Bytes bytes = converter_.encode(unicode);
@@ -171,7 +176,6 @@ class Import {
   }
 
   void straighten_controls() {
-    if (!source_.ascii) return;
     bool changed = false;
     for (uint32_t byte = 0; byte <= 0x7F; byte = byte == 0x1F ? 0x7F : byte + 1) {
       if (value_of(byte) == byte && byte_of(byte) == byte) continue;
@@ -193,6 +197,7 @@ class Import {
 
   void apply_override(const std::string& word) {
     source_.source += "; " + word;
+    if (word == kLowLetters) return;
     if (word == "assigned") return read_as_assigned();
     const size_t sign = word.find_first_of("=>");
     if (sign == std::string::npos) throw std::runtime_error("override " + word + " says nothing");

@@ -17,7 +17,7 @@
 //
 // Controls: tables of the DOS family put U+001A, U+001C and U+007F at each other's bytes, after the controls of
 // a terminal. In every ASCII-based source 00 to 1F and 7F stand for themselves, as in all other systems'
-// tables.
+// tables, but where a national standard has letters there (the override "low-letters").
 //
 // Of the mappings from Unicode alone only those stay whose code reads as the same sign (same_sign.h); those of
 // the overrides too.

@@ -108,13 +108,15 @@ void import_territories(const fs::path& directory) {
     }
     for (const std::string& note : notes) std::printf("%s: %s\n", row.name, note.c_str());
     write_file(directory / "territories" / (std::string(row.name) + ".toml"),
-               source_comment(row.locale) + out.str());
+               territory_comment(row) + out.str());
   }
 }
 
 void import_sorts(const fs::path& directory, const std::vector<Codepage>& codepages) {
   std::set<char16_t> written;
-  for (const Codepage& codepage : codepages) written.merge(repertoire(directory, codepage.name));
+  // Georgian has a page of its own, for which the largest sort has no room beside its contractions.
+  for (const Codepage& codepage : codepages)
+    if (codepage.name != std::string("GEORGIAN-PS")) written.merge(repertoire(directory, codepage.name));
   fs::create_directories(directory / "sorts");
   for (const Sort& row : kSorts) {
     Notes notes;

@@ -5,9 +5,9 @@
 // default codepage is UTF-8, which alone holds the texts of every language and territory.
 //
 // Territory: symbols of Latin digits with marks of direction left out, no-break spaces as spaces, U+2212 as "-"
-// and U+2019 as "'"; two fraction digits for numbers; the layout of currency amounts as ICU writes 1 and -1;
-// the list separator is ";" where the decimal one is ",". Time is the medium style, the dates short and full;
-// the next shorter style where a format would be too long.
+// and U+2019 as "'"; two fraction digits for numbers, those of ISO 4217 for amounts with the code; the layout of
+// currency amounts as ICU writes 1 and -1; the list separator is ";" where the decimal one is ",". Time is the
+// medium style, the dates short and full; the next shorter style where a format would be too long.
 #pragma once
 
 #include <string>
@@ -23,6 +23,9 @@ using Notes = std::vector<std::string>;
 
 /// The first line of a file: where it came from.
 std::string source_comment(const char* locale);
+
+/// The same with the facts that CLDR does not know.
+std::string territory_comment(const Territory& territory);
 
 lexicor_data::LanguageSource import_language(const Language& language, const lexicor_data::Control& control);
 lexicor_data::TerritorySource import_territory(const Territory& territory, Notes& notes);

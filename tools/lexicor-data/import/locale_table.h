@@ -22,12 +22,24 @@ struct Territory {
   const char* overrides;  ///< "key=value", separated by "|"
 };
 
+/// What CLDR does not know yet.
+struct Fact {
+  const char* country;
+  const char* overrides;  ///< as those of a territory
+  const char* since;
+  const char* source;
+};
+
 inline constexpr Language kLanguages[] = {
 #include "languages.inc"
 };
 
 inline constexpr Territory kTerritories[] = {
 #include "territories.inc"
+};
+
+inline constexpr Fact kFacts[] = {
+#include "facts.inc"
 };
 
 /// The locale as ICU takes it: Gregorian calendar and Latin digits, whatever its own are.

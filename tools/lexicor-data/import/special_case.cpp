@@ -68,7 +68,7 @@ std::vector<SpecialMapping> special_mappings(const std::string& locale, bool upp
   uloc_getLanguage(locale.c_str(), language, sizeof language, &error);
   require(error, "language");
   const std::string code = language;
-  const std::string rules = code == "az" || code == "lt" || code == "tr" ? code : "";
+  const std::string rules = code == "el" ? "" : code;  // Greek capitals keep their accents
   const auto library = [&](char16_t unit) {
     return static_cast<char16_t>(upper ? lx::unicode_upper(unit) : lx::unicode_lower(unit));
   };

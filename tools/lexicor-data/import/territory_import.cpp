@@ -6,6 +6,7 @@
 #include <unicode/uregion.h>
 
 #include <map>
+#include <set>
 #include <sstream>
 
 #include "date_pattern.h"
@@ -23,15 +24,39 @@ constexpr uint16_t kNumberDigits = 2;
 
 using Overrides = std::map<std::string, std::string>;
 
-Overrides parse_overrides(const char* text) {
-  Overrides overrides;
+void add_overrides(const char* text, Overrides& overrides) {
   std::istringstream in(text);
   for (std::string part; std::getline(in, part, '|');) {
     const size_t sign = part.find('=');
     if (sign == std::string::npos) throw std::runtime_error("override " + part + " says nothing");
-    overrides[part.substr(0, sign)] = part.substr(sign + 1);
+    if (!overrides.emplace(part.substr(0, sign), part.substr(sign + 1)).second)
+      throw std::runtime_error("two overrides " + part.substr(0, sign));
   }
+}
+
+std::string country_of(const char* locale) {
+  UErrorCode error = U_ZERO_ERROR;
+  char code[ULOC_COUNTRY_CAPACITY] = {};
+  uloc_getCountry(locale, code, sizeof code, &error);
+  require(error, "country");
+  return code;
+}
+
+/// What the territory's row and the facts say of it.
+Overrides overrides_of(const Territory& row) {
+  Overrides overrides;
+  add_overrides(row.overrides, overrides);
+  for (const Fact& fact : kFacts)
+    if (country_of(row.locale) == fact.country) add_overrides(fact.overrides, overrides);
   return overrides;
+}
+
+/// Fraction digits by ISO 4217; CLDR has fewer where daily use has none.
+uint16_t iso_fraction_digits(const std::u16string& currency) {
+  static const std::set<std::u16string> none{u"BIF", u"CLP", u"DJF", u"GNF", u"ISK", u"JPY", u"KMF", u"KRW",
+                                             u"PYG", u"RWF", u"UGX", u"VND", u"VUV", u"XAF", u"XOF", u"XPF"};
+  static const std::set<std::u16string> three{u"BHD", u"IQD", u"JOD", u"KWD", u"LYD", u"OMR", u"TND"};
+  return none.count(currency) != 0 ? 0 : three.count(currency) != 0 ? 3 : 2;
 }
 
 std::u16string widen(const std::string& text) {
@@ -157,11 +182,11 @@ void read_currency(const std::string& locale, Overrides& overrides, TerritorySou
   UErrorCode error = U_ZERO_ERROR;
   const int32_t digits = ucurr_getDefaultFractionDigits(territory.international_currency.c_str(), &error);
   require(error, "fraction digits");
-  territory.digits = {kNumberDigits, static_cast<uint16_t>(digits), static_cast<uint16_t>(digits)};
-  take_digit(overrides, "international_digits", territory.digits[2]);
+  territory.digits = {kNumberDigits, static_cast<uint16_t>(digits),
+                      iso_fraction_digits(territory.international_currency)};
 }
 
-/// The format of the first style that is short enough.
+/// The format of the first style that is short enough; empty: there is none.
 std::u16string format_of(const std::string& locale, bool time, int style, Notes& notes) {
   for (; style <= UDAT_SHORT; ++style) {
     UErrorCode error = U_ZERO_ERROR;
@@ -174,17 +199,14 @@ std::u16string format_of(const std::string& locale, bool time, int style, Notes&
           return udat_toPattern(format.get(), 0, out, room, status);
         })));
     if (lexicor_data::utf8_bytes(text) <= lexicor_data::kMaxFormatBytes) return text;
-    notes.push_back(std::string(time ? "time" : "date") + " style " + std::to_string(style) +
-                    " is too long, the next shorter one is taken");
+    notes.push_back(std::string(time ? "time" : "date") + " style " + std::to_string(style) + " is too long");
   }
-  throw std::runtime_error("no format is short enough");
+  return {};
 }
 
 void read_region(const Territory& row, Overrides& overrides, TerritorySource& territory) {
   UErrorCode error = U_ZERO_ERROR;
-  char code[ULOC_COUNTRY_CAPACITY] = {};
-  uloc_getCountry(row.locale, code, sizeof code, &error);
-  const URegion* region = uregion_getRegionFromCode(code, &error);
+  const URegion* region = uregion_getRegionFromCode(country_of(row.locale).c_str(), &error);
   require(error, "region");
   territory.abbreviation = widen(uloc_getISO3Country(row.locale));
   const bool other = take(overrides, "abbreviation", territory.abbreviation);
@@ -199,9 +221,18 @@ void read_region(const Territory& row, Overrides& overrides, TerritorySource& te
 
 }  // namespace
 
+std::string territory_comment(const Territory& row) {
+  std::string comment = source_comment(row.locale);
+  comment.pop_back();  // the end of the line
+  for (const Fact& fact : kFacts)
+    if (country_of(row.locale) == fact.country)
+      comment += std::string(" Since ") + fact.since + " " + fact.overrides + ": " + fact.source + ".";
+  return comment + '\n';
+}
+
 TerritorySource import_territory(const Territory& row, Notes& notes) {
   const std::string locale = icu_locale(row.locale);
-  Overrides overrides = parse_overrides(row.overrides);
+  Overrides overrides = overrides_of(row);
   TerritorySource territory;
   read_region(row, overrides, territory);
   territory.flags[0] = territory.flags[5] = territory.flags[6] = true;
@@ -216,7 +247,10 @@ TerritorySource import_territory(const Territory& row, Notes& notes) {
   territory.time_format = format_of(locale, true, UDAT_MEDIUM, notes);
   territory.short_date_format = format_of(locale, false, UDAT_SHORT, notes);
   territory.long_date_format = format_of(locale, false, UDAT_FULL, notes);
+  take(overrides, "time", territory.time_format);
   take(overrides, "long_date", territory.long_date_format);
+  if (territory.time_format.empty() || territory.long_date_format.empty())
+    throw std::runtime_error("no format is short enough");
   take_digit(overrides, "positive_position", territory.positive_position);
   take_digit(overrides, "negative_position", territory.negative_position);
   if (!overrides.empty()) throw std::runtime_error("unknown override " + overrides.begin()->first);
