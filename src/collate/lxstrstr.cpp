@@ -1,6 +1,7 @@
 // Search for a substring: exactly, or by the locale's sort where case or width does not count.
 #include <cstring>
 
+#include "core/lxmemory.h"
 #include "text/lxfold.h"
 #include "text/lxsearch.h"
 
@@ -33,20 +34,83 @@ int32_t collate(LXLocale* locale, const Walk<UnicodeCursor>& at, const LXUChar* 
   return LXStrcollU(locale, at.start, static_cast<int32_t>(end - at.start), part.p, part_units, options);
 }
 
+/// A part that is looked for in time that grows with the lengths of both texts, by the algorithm of Knuth, Morris
+/// and Pratt: behind so many characters that agree and one that does not, the next place to try is known.
 template <class Cursor>
-bool begins_with(const Cursor& text, const Cursor& part) {
+class PartSearch {
+ public:
+  explicit PartSearch(const Cursor& part)
+      : count_(count_of(part)), block_(count_ <= SIZE_MAX / sizeof(Char) ? count_ * sizeof(Char) : SIZE_MAX) {
+    Char* const chars = block_.template as<Char>();
+    size_t n = 0, border = 0;
+    for (Walk at(part); chars != nullptr && at.next(); ++n) {
+      if (n != 0) border = agreeing(at, border);
+      chars[n] = {at.value, static_cast<uint32_t>(at.units()), border};
+    }
+  }
+  /// False without memory.
+  explicit operator bool() const { return static_cast<bool>(block_); }
+
+  Place<Cursor> find(const Cursor& text) const {
+    Walk at(text);
+    size_t read = 0, agree = 0;
+    for (Walk ahead(text); ahead.next();) {
+      agree = agreeing(ahead, agree);
+      if (++read >= count_) at.next();
+      if (agree == count_) return {at.start, at.in};
+    }
+    return {nullptr, text};
+  }
+
+ private:
+  struct Char {
+    typename Cursor::Value value;
+    uint32_t units;
+    size_t border;  // as many characters at the beginning are those up to here, this one included
+  };
+
+  static size_t count_of(const Cursor& part) {
+    Cursor in(part);
+    return pass_all(&in);
+  }
+  /// How many characters of the part agree when so many did before this one.
+  size_t agreeing(const Walk<Cursor>& at, size_t agree) const {
+    const Char* const chars = block_.template as<Char>();
+    for (;; agree = chars[agree - 1].border) {
+      if (chars[agree].value == at.value && chars[agree].units == at.units()) return agree + 1;
+      if (agree == 0) return 0;
+    }
+  }
+
+  size_t count_;
+  WorkBuffer block_;
+};
+
+/// Adds to `*compared` how many characters were compared.
+template <class Cursor>
+bool begins_with(const Cursor& text, const Cursor& part, size_t* compared) {
   Walk at(text);
-  for (Walk wanted(part); wanted.next();)
+  for (Walk wanted(part); wanted.next(); ++*compared)
     if (!at.next() || !at.same_as(wanted)) return false;
   return true;
 }
 
 template <class Cursor>
 Place<Cursor> find_exactly(const Cursor& text, const Cursor& part) {
+  constexpr size_t kWorthIt = 1024;
   Walk first(part);
   if (!first.next()) return {text.p, text};
-  for (Walk at(text); at.next();)
-    if (at.same_as(first) && begins_with(at.in, first.in)) return {at.start, at.in};
+  size_t compared = 0;
+  bool has_memory = true;
+  for (Walk at(text); at.next();) {
+    if (!at.same_as(first)) continue;
+    if (begins_with(at.in, first.in, &compared)) return {at.start, at.in};
+    // Where much agrees in vain, preparing the part pays.
+    if (!has_memory || compared < kWorthIt + room(text.p, at.start)) continue;
+    const PartSearch search(part);
+    if (search) return search.find(text);
+    has_memory = false;
+  }
   return {nullptr, text};
 }
 Place<SingleByteCursor> find_exactly(const SingleByteCursor& text, const SingleByteCursor& part) {

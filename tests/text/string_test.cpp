@@ -1,6 +1,7 @@
 // The string family in all forms against models that work on characters: random texts, every cut of a length
 // and every size of a buffer, in blocks of their exact sizes.
 #include "support/case_test.h"
+#include "support/slowness.h"
 
 namespace lx::test {
 namespace {
@@ -76,6 +77,26 @@ TEST_F(Strings, SearchesAndCopiesFollowTheModel) {
     EXPECT_EQ(K::cpy(in, out.data(), n32(out.size()), all.data(), -1, 0), n32(all.size()));
     EXPECT_TRUE(std::equal(all.begin(), all.end(), out.begin()));
     EXPECT_EQ(K::cpy(in, out.data(), chars + 1, all.data(), -1, LX_CHARACTERS), chars + 1);
+  });
+}
+
+/// Long texts of which nearly all agrees with the part, with memory for the search and without.
+TEST_F(Strings, PartsOfLongTextsAreFound) {
+  for_all([&](const auto& kind, const TinyCodepage& cp, LXLocale* in) {
+    using K = std::decay_t<decltype(kind)>;
+    if (random() % kSlowness != 0) return;
+    const Units letters = alphabet(cp).substr(0, 2);
+    Units text = any_text(letters, 20) + letters[0], part;
+    while (text.size() < 2000) text += text.substr(random() % text.size() / 2);
+    part = text.substr(random() % text.size(), random() % 80) + any_text(letters, 1);
+    const Encoded<K> whole(cp, text), wanted(cp, part);
+    const size_t at = text.find(part);
+    library.hooks().fail_at(random() % 2);
+    ASSERT_EQ(K::str(in, whole.units.data(), whole.size(), wanted.units.data(), wanted.size(), 0),
+              part.empty()        ? whole.units.data()
+              : at == Units::npos ? nullptr
+                                  : whole.units.data() + whole.start[at]);
+    library.hooks().fail_at(0);
   });
 }
 
