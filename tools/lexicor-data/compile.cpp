@@ -44,9 +44,10 @@ bool same_mappings(const CodepageSource& a, const CodepageSource& b) {
 
 ObjectFile pack_source(const CodepageSource& source, const ObjectName& name, const std::string& file_name,
                        CompiledObject& result) {
-  if (source.name != name.name) {
-    throw SourceError(file_name, 1, 1, "the code set name is " + source.name + ", not " + name.name);
-  }
+  result.warnings = source.warnings;
+  result.bases = source.bases;
+  if (source.name != name.name)
+    result.warnings.push_back(file_name + ": the code set name is " + source.name + ", the object's " + name.name);
   if (source.utf8 != (name.id == format::codepage::kUtf8Id)) {
     throw SourceError(file_name, 1, 1,
                       "UTF-8, and only UTF-8, has the identifier " + std::to_string(format::codepage::kUtf8Id));
@@ -56,8 +57,10 @@ ObjectFile pack_source(const CodepageSource& source, const ObjectName& name, con
     if (source.leads[byte] != length)
       throw SourceError(file_name, 1, 1, "the leads of UTF-8 are C2-DF:2 E0-EF:3");
   }
-  PackedCodepage packed =
-      pack_codepage(to_model(source, file_name, result.left_out), file_name, result.left_out);
+  CodepageModel model = to_model(source, file_name, result.left_out);
+  if (model.value_of(0) != 0)
+    throw SourceError(file_name, 0, 0, "<U0000> \\x00 |0 is missing: a text ends with the byte 00");
+  PackedCodepage packed = pack_codepage(std::move(model), file_name, result.left_out);
   result.retyped_chars = packed.retyped_chars;
   result.type_rows = packed.type_rows;
   check_object(packed.object, name, file_name);

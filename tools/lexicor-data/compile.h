@@ -16,6 +16,8 @@ struct CompiledObject {
   ByteVector bytes;               ///< the file
   std::vector<LeftOut> left_out;  ///< a codepage's characters that it does not hold
   size_t retyped_chars = 0;       ///< a codepage's characters that have the type of their row, not their own
+  std::vector<std::string> warnings;      ///< what was passed over in the source
+  std::vector<std::string> bases;         ///< the files that it was made of beside its source
   TypeRows type_rows = TypeRows::kExact;  ///< how a codepage's type rows are packed
 };
 
