@@ -36,6 +36,10 @@ void SourceErrors::add(const SourceError& error) {
   }
 }
 
+void SourceErrors::add_all(const SourceErrors& errors) {
+  for (const SourceError& error : errors.list_) add(error);
+}
+
 void SourceErrors::throw_if_any() const {
   if (list_.empty()) return;
   SourceError first = list_.front();

@@ -38,6 +38,7 @@ class SourceErrors {
     }
   }
   void add(const SourceError& error);
+  void add_all(const SourceErrors& errors);
   bool empty() const { return list_.empty(); }
   bool full() const { return list_.size() >= kMostOfFile; }
   const std::vector<SourceError>& list() const { return list_; }

@@ -116,7 +116,8 @@ class UcmReader {
     const char precision = read_precision(line);
     if (sequence) return skip(start);
     if (precision == '2') return;  // says which substitution stands for the character, which has none here
-    if (precision == '-' && header_.base().empty()) line.fail(start, "only a mapping of a base can be taken back");
+    if (precision == '-' && header_.base().empty())
+      line.fail(start, "only a mapping of a base can be taken back");
     mapping.precision = static_cast<uint8_t>(precision == '4' ? 1 : precision - '0');
     for (;; ++mapping.unicode, ++mapping.code) {
       if (precision == '-') {
@@ -157,7 +158,8 @@ class UcmReader {
 
   void say_what_was_skipped() {
     if (skipped_ == 0) return;
-    const std::string what = std::to_string(skipped_) + " mappings of several code points or characters are left out";
+    const std::string what =
+        std::to_string(skipped_) + " mappings of several code points or characters are left out";
     source_.warnings.emplace_back(SourceError(file_, first_skipped_.line, first_skipped_.column, what).what());
   }
 
@@ -166,7 +168,7 @@ class UcmReader {
     const bool had_errors = !errors_.empty();
     SourceErrors header_errors;
     header_.settle(header_errors);
-    for (const SourceError& error : header_errors.list()) errors_.add(error);
+    errors_.add_all(header_errors);
     if (!header_errors.empty()) return;
     if (source_.utf8 && place_ != Place::kHeader)
       errors_.attempt([&] { header_.fail("CHARMAP", "CHARMAP stands in a computed codepage"); });
@@ -191,17 +193,19 @@ class UcmReader {
       if (to_unicode(m)) codes.insert(m.code);
     }
     for (const Mapping& m : base.mappings) {
-      // A mapping of the file takes the place of those of the base that contradict it.
-      if ((from_unicode(m) && values.count(m.unicode) != 0) || (to_unicode(m) && codes.count(m.code) != 0)) continue;
       if (is_taken_back(m)) continue;
+      // A mapping of the file takes the place of those of the base that contradict it.
+      if ((from_unicode(m) && values.count(m.unicode) != 0) || (to_unicode(m) && codes.count(m.code) != 0))
+        continue;
       source_.mappings.push_back(m);
       places_.push_back({base_place(), base_place()});
     }
     for (const TakenBack& taken : taken_back_) {
       if (taken.found) continue;
       errors_.add(SourceError(file_, taken.place.line, taken.place.column,
-                              "the base " + header_.base() + " has no mapping " + unicode_text(taken.mapping.unicode) +
-                                  " " + code_text(taken.mapping.code, taken.mapping.bytes) + " left to take back"));
+                              "the base " + header_.base() + " has no mapping " +
+                                  unicode_text(taken.mapping.unicode) + " " +
+                                  code_text(taken.mapping.code, taken.mapping.bytes) + ""));
     }
   }
 
@@ -301,7 +305,8 @@ class UcmReader {
         to_unicode, &Mapping::code, [](const Mapping& m) { return "code " + code_text(m.code, m.bytes); },
         [](const Places& p) { return p.code; });
     refuse(
-        from_unicode, &Mapping::unicode, [](const Mapping& m) { return "code point " + unicode_text(m.unicode); },
+        from_unicode, &Mapping::unicode,
+        [](const Mapping& m) { return "code point " + unicode_text(m.unicode); },
         [](const Places& p) { return p.unicode; });
   }
 
@@ -309,7 +314,8 @@ class UcmReader {
   void sort_errors() {
     std::vector<SourceError> list = errors_.list();
     std::stable_sort(list.begin(), list.end(), [&](const SourceError& a, const SourceError& b) {
-      return std::make_tuple(a.file != file_, a.line, a.column) < std::make_tuple(b.file != file_, b.line, b.column);
+      return std::make_tuple(a.file != file_, a.line, a.column) <
+             std::make_tuple(b.file != file_, b.line, b.column);
     });
     errors_ = SourceErrors();
     for (const SourceError& error : list) errors_.add(error);

@@ -15,10 +15,13 @@ namespace {
 using lexicor_cli::hex_text;
 
 /// Keys that say something, and those of other systems that say nothing that the mappings do not.
-constexpr const char* kKeys[] = {
-    "code_set_name",     "base",         "uconv_class",   "mb_cur_max",        "subchar",        "subchar1",
-    "lexicor:line_ends", "lexicor:leads", "lexicor:ascii", "lexicor:algorithm", "lexicor:source", "icu:base",
-    "icu:state",         "icu:charsetFamily"};
+constexpr const char* kKeys[] = {"code_set_name",     "base",
+                                 "uconv_class",       "mb_cur_max",
+                                 "subchar",           "subchar1",
+                                 "lexicor:line_ends", "lexicor:leads",
+                                 "lexicor:ascii",     "lexicor:algorithm",
+                                 "lexicor:source",    "icu:base",
+                                 "icu:state",         "icu:charsetFamily"};
 constexpr const char* kIdleKeys[] = {"mb_cur_min", "char_name_mask", "code_set_alias"};
 constexpr char kOwnKeys[] = "lexicor:", kForeignKeys[] = "icu:";
 
@@ -67,9 +70,9 @@ void UcmHeader::refuse_or_pass_over(const std::string& key, Position start) {
                [&](const char* known) { return !has(known); });
   const std::string meant = lexicor_cli::nearest_name(key, missing);
   if (!meant.empty() || begins_with(key, kOwnKeys))
-    throw SourceError(file_, start.line, start.column,
-                      "unknown key <" + key + ">" +
-                          (meant.empty() ? "" : lexicor_cli::did_you_mean("<" + meant + ">")));
+    throw SourceError(
+        file_, start.line, start.column,
+        "unknown key <" + key + ">" + (meant.empty() ? "" : lexicor_cli::did_you_mean("<" + meant + ">")));
   warn(start, "unknown key <" + key + "> is passed over");
 }
 
@@ -177,7 +180,9 @@ void UcmHeader::settle(SourceErrors& errors) {
     return std::nullopt;
   };
   for (const char* key : {"code_set_name", "mb_cur_max"})
-    errors.attempt([&] { if (!has(key)) fail(key, "key <" + std::string(key) + "> is missing"); });
+    errors.attempt([&] {
+      if (!has(key)) fail(key, "key <" + std::string(key) + "> is missing");
+    });
   if (!errors.empty()) return;
   settle_class();
   settle_leads();
@@ -186,8 +191,7 @@ void UcmHeader::settle(SourceErrors& errors) {
   settle_substitution(byte_of);
   errors.attempt([&] { check_width(); });
   errors.attempt([&] { check_single("subchar", source_.substitution); });
-  for (const uint8_t byte : source_.line_ends)
-    errors.attempt([&] { check_single("lexicor:line_ends", byte); });
+  for (const uint8_t byte : source_.line_ends) errors.attempt([&] { check_single("lexicor:line_ends", byte); });
 }
 
 /// Other systems call a codepage of single bytes one of several bytes when it has a state table.

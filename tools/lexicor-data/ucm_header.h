@@ -51,7 +51,7 @@ class UcmHeader {
   std::map<std::string, Position> keys_;
   std::string base_;
   UcmStates states_;
-  std::string family_;          ///< <icu:charsetFamily>
+  std::string family_;  ///< <icu:charsetFamily>
   size_t substitution_bytes_ = 1;
   int substitution_of_one_byte_ = -1;  ///< <subchar1>
 };

@@ -13,9 +13,9 @@ struct Position {
   int column = 0;
 };
 
-std::string byte_text(uint32_t byte);                   ///< \xHH
-std::string code_text(uint32_t code, unsigned bytes);   ///< \xHH\xHH
-std::string unicode_text(uint32_t unicode);             ///< <UXXXX>
+std::string byte_text(uint32_t byte);                  ///< \xHH
+std::string code_text(uint32_t code, unsigned bytes);  ///< \xHH\xHH
+std::string unicode_text(uint32_t unicode);            ///< <UXXXX>
 
 /// A position in one line. Comments (# outside quotes) and blanks at the end are not part of the line.
 class UcmLine {

@@ -14,7 +14,7 @@ namespace {
 
 using lexicor_cli::hex_text;
 
-constexpr uint8_t kTakenBack = 0xFF;    // as a precision: a mapping of the base that does not hold
+constexpr uint8_t kTakenBack = 0xFF;  // as a precision: a mapping of the base that does not hold
 constexpr size_t kShortestRange = 3;
 
 std::string in_quotes(const std::string& text) {
@@ -97,8 +97,8 @@ std::vector<Mapping> difference(const CodepageSource& source, const CodepageSour
     if (to_unicode(m)) codes.insert(m.code);
   }
   for (Mapping m : base.mappings) {
-    const bool contradicted = (from_unicode(m) && values.count(m.unicode) != 0) ||
-                              (to_unicode(m) && codes.count(m.code) != 0);
+    const bool contradicted =
+        (from_unicode(m) && values.count(m.unicode) != 0) || (to_unicode(m) && codes.count(m.code) != 0);
     if (contradicted || in_source.count(key(m)) != 0) continue;
     m.precision = kTakenBack;
     lines.push_back(m);

@@ -159,7 +159,6 @@ class Import {
     return found == to_unicode_.end() ? kNone : found->second;
   }
 
-
   void set_family() {
     const std::optional<bool> ascii = lexicor_data::ascii_family(byte_of_);
     if (!ascii) throw std::runtime_error("neither ASCII-based nor EBCDIC");
