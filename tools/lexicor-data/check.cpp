@@ -163,7 +163,7 @@ SourceErrors check_source_directory(const std::string& directory, std::ostream& 
   std::set<std::string> used;
   std::mutex used_lock;
   check_all(control, errors, [&](const ObjectName& name) {
-    const std::string path = directory + '/' + source_file_name(name);
+    const std::string path = source_path(directory, name);
     std::ifstream in = open(path);
     const CompiledObject object = compile_object(in, path, name, control);
     {

@@ -100,6 +100,10 @@ std::vector<std::string> source_folders() {
   return folders;
 }
 
+std::string source_path(const std::string& directory, const ObjectName& name) {
+  return directory + '/' + source_file_name(name);
+}
+
 std::string source_file_name(const ObjectName& name) {
   const SourcePlace& place = kSourcePlaces[static_cast<size_t>(name.type)];
   return std::string(place.directory) + '/' + name.name + place.extension;

@@ -38,6 +38,9 @@ std::string dump_object(const ObjectFile& object, const ObjectName& name, const 
 std::string object_file_name(const ObjectName& name);
 std::string source_file_name(const ObjectName& name);
 
+/// The path of an object's source.
+std::string source_path(const std::string& directory, const ObjectName& name);
+
 /// The folders of a source directory that hold sources of objects.
 std::vector<std::string> source_folders();
 

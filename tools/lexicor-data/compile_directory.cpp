@@ -161,7 +161,7 @@ class DirectoryCompiler {
   // -- compiling ----------------------------------------------------------------------------------------------
 
   CompiledObject compile(const ObjectName& name) const {
-    const std::string file = source_ + '/' + source_file_name(name);
+    const std::string file = source_path(source_, name);
     std::ifstream in = open_source(file);
     return compile_object(in, file, name, control_);
   }
@@ -174,7 +174,7 @@ class DirectoryCompiler {
 
   void describe_made(const ObjectName& name, Made& made) {
     made.entry = describe_object(name, made.object.bytes);
-    const std::string file = source_file_name(name);
+    const std::string file = in_source(source_path(source_, name));
     made.entry.sources[file] = digests_.of(file);
     // A language names other objects.
     if (name.type == ObjectType::kLanguage) made.entry.sources[kControlSource] = digests_.of(kControlSource);

@@ -2,6 +2,7 @@
 #include "source_error.h"
 
 #include <algorithm>
+#include <tuple>
 
 namespace lexicor_data {
 namespace {
@@ -38,6 +39,14 @@ void SourceErrors::add(const SourceError& error) {
 
 void SourceErrors::add_all(const SourceErrors& errors) {
   for (const SourceError& error : errors.list_) add(error);
+}
+
+void SourceErrors::sort(const std::string& file) {
+  const auto place = [&](const SourceError& error) {
+    return std::make_tuple(error.file != file, error.line, error.column);
+  };
+  std::stable_sort(list_.begin(), list_.end(),
+                   [&](const SourceError& a, const SourceError& b) { return place(a) < place(b); });
 }
 
 void SourceErrors::throw_if_any() const {

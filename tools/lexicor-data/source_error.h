@@ -42,6 +42,8 @@ class SourceErrors {
   bool empty() const { return list_.empty(); }
   bool full() const { return list_.size() >= kMostOfFile; }
   const std::vector<SourceError>& list() const { return list_; }
+  /// Puts errors in the order of their places; those of other files than this come last.
+  void sort(const std::string& file);
   /// Throws what was collected, as one error that carries the others.
   void throw_if_any() const;
 

@@ -7,7 +7,7 @@
 #include <iterator>
 
 #include "lexicor/near_names.h"
-#include "ucm.h"
+#include "source_error.h"
 
 namespace lexicor_data {
 namespace {
@@ -56,8 +56,8 @@ void TomlTable::fail(const toml::node& at, const std::string& what) const {
 }
 
 const toml::node& TomlTable::node(const std::string& key) {
-  const toml::node* found = table_.get(key);
-  if (found == nullptr) fail(table_, "the key " + key + " is missing");
+  const toml::node* found = table_->get(key);
+  if (found == nullptr) fail(*table_, "the key " + key + " is missing");
   return *found;
 }
 
@@ -69,70 +69,89 @@ std::u16string TomlTable::text_of(const toml::node& node) const {
 }
 
 std::u16string TomlTable::text(const std::string& key) {
-  return text_of(node(key));
+  return reading(key, [&] { return text_of(node(key)); });
 }
 
 char16_t TomlTable::character(const std::string& key) {
-  const toml::node& at = node(key);
-  const std::u16string units = text_of(at);
-  if (units.size() != 1) fail(at, "expected one character up to U+FFFF");
-  return units[0];
+  return reading(key, [&] {
+    const toml::node& at = node(key);
+    const std::u16string units = text_of(at);
+    if (units.size() != 1) fail(at, "expected one character up to U+FFFF");
+    return units[0];
+  });
 }
 
 uint16_t TomlTable::number(const std::string& key, int64_t highest) {
-  const toml::node& at = node(key);
-  const auto value = at.is_integer() ? at.as_integer()->get() : -1;
-  if (value < 0 || value > highest) fail(at, "expected a number from 0 to " + std::to_string(highest));
-  return static_cast<uint16_t>(value);
+  return reading(key, [&] {
+    const toml::node& at = node(key);
+    const auto value = at.is_integer() ? at.as_integer()->get() : -1;
+    if (value < 0 || value > highest) fail(at, "expected a number from 0 to " + std::to_string(highest));
+    return static_cast<uint16_t>(value);
+  });
 }
 
 bool TomlTable::flag(const std::string& key) {
-  const toml::node& at = node(key);
-  if (!at.is_boolean()) fail(at, "expected true or false");
-  return at.as_boolean()->get();
+  return reading(key, [&] {
+    const toml::node& at = node(key);
+    if (!at.is_boolean()) fail(at, "expected true or false");
+    return at.as_boolean()->get();
+  });
 }
 
 std::vector<std::u16string> TomlTable::texts(const std::string& key, size_t fewest, size_t most) {
-  const toml::node& at = node(key);
-  const toml::array* list = at.as_array();
-  if (list == nullptr || list->size() < fewest || list->size() > most) {
-    fail(at, "expected a list of " + std::to_string(fewest) +
-                 (most == fewest ? "" : " to " + std::to_string(most)) + " texts");
-  }
-  std::vector<std::u16string> texts;
-  for (const toml::node& item : *list) texts.push_back(text_of(item));
-  return texts;
+  return reading(key, [&] {
+    const toml::node& at = node(key);
+    const toml::array* list = at.as_array();
+    if (list == nullptr || list->size() < fewest || list->size() > most) {
+      fail(at, "expected a list of " + std::to_string(fewest) +
+                   (most == fewest ? "" : " to " + std::to_string(most)) + " texts");
+    }
+    std::vector<std::u16string> texts;
+    for (const toml::node& item : *list) texts.push_back(text_of(item));
+    return texts;
+  });
 }
 
 TomlTable TomlTable::table(const std::string& key) {
-  const toml::node& at = node(key);
-  if (!at.is_table()) fail(at, "expected a table");
-  return TomlTable(*at.as_table(), file_name_);
+  const auto found = reading(key, [&] {
+    const toml::node& at = node(key);
+    if (!at.is_table()) fail(at, "expected a table");
+    return at.as_table();
+  });
+  static const toml::table kNone;
+  TomlTable table(found != nullptr ? *found : kNone, file_name_, errors_);
+  table.is_none_ = found == nullptr;
+  return table;
 }
 
 std::vector<TomlTable> TomlTable::tables(const std::string& key) {
-  const toml::node& at = node(key);
-  const toml::array* list = at.as_array();
-  if (list == nullptr) fail(at, "expected a list of tables");
-  std::vector<TomlTable> tables;
-  for (const toml::node& item : *list) {
-    if (!item.is_table()) fail(item, "expected a table");
-    tables.emplace_back(*item.as_table(), file_name_);
-  }
-  return tables;
+  return reading(key, [&] {
+    const toml::node& at = node(key);
+    const toml::array* list = at.as_array();
+    if (list == nullptr) fail(at, "expected a list of tables");
+    std::vector<TomlTable> tables;
+    for (const toml::node& item : *list) {
+      if (!item.is_table()) fail(item, "expected a table");
+      tables.emplace_back(*item.as_table(), file_name_, errors_);
+    }
+    return tables;
+  });
 }
 
-void TomlTable::allow(const std::vector<std::string>& keys) const {
-  for (const auto& [key, value] : table_) {
+void TomlTable::allow(const std::vector<std::string>& keys) {
+  for (const auto& [key, value] : *table_) {
     const std::string name(key.str());
     if (std::find(keys.begin(), keys.end(), name) != keys.end()) continue;
     std::vector<std::string> missing;
     std::copy_if(keys.begin(), keys.end(), std::back_inserter(missing),
                  [&](const std::string& known) { return !has(known); });
+    const std::string meant = lexicor_cli::nearest_name(name, missing);
     const toml::source_position at = key.source().begin;
-    throw SourceError(
-        file_name_, static_cast<int>(at.line), static_cast<int>(at.column),
-        "unknown key " + name + lexicor_cli::did_you_mean(lexicor_cli::nearest_name(name, missing)));
+    reading(name, [&]() -> bool {
+      throw SourceError(file_name_, static_cast<int>(at.line), static_cast<int>(at.column),
+                        "unknown key " + name + lexicor_cli::did_you_mean(meant));
+    });
+    misspelt_.insert(meant);
   }
 }
 

@@ -45,7 +45,7 @@ class UcmReader {
       errors_.add(SourceError(file_, line_ + 1, 1, "CHARMAP is missing"));
     if (is_sound && place_ == Place::kMappings)
       errors_.add(SourceError(file_, line_ + 1, 1, "END CHARMAP is missing"));
-    sort_errors();
+    errors_.sort(file_);
     errors_.throw_if_any();
     say_what_was_skipped();
     std::sort(source_.mappings.begin(), source_.mappings.end(), in_table_order);
@@ -308,17 +308,6 @@ class UcmReader {
         from_unicode, &Mapping::unicode,
         [](const Mapping& m) { return "code point " + unicode_text(m.unicode); },
         [](const Places& p) { return p.unicode; });
-  }
-
-  /// In the order of the file; those of its base come last.
-  void sort_errors() {
-    std::vector<SourceError> list = errors_.list();
-    std::stable_sort(list.begin(), list.end(), [&](const SourceError& a, const SourceError& b) {
-      return std::make_tuple(a.file != file_, a.line, a.column) <
-             std::make_tuple(b.file != file_, b.line, b.column);
-    });
-    errors_ = SourceErrors();
-    for (const SourceError& error : list) errors_.add(error);
   }
 
   std::istream& in_;
