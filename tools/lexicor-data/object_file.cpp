@@ -21,13 +21,17 @@ void align4(ByteVector& bytes) {
   while (bytes.size() % 4 != 0) bytes.push_back(0);
 }
 
+bool is_line(const std::string& text) {
+  return std::none_of(text.begin(), text.end(),
+                      [](char c) { return static_cast<uint8_t>(c) < ' ' || c == 0x7F; });
+}
+
 /// What stands behind the sections, when it is a line of text.
 std::string text_behind(const ByteVector& bytes, size_t end) {
   end = (end + 3) / 4 * 4;
   if (end >= bytes.size()) return "";
   const std::string text(bytes.begin() + static_cast<std::ptrdiff_t>(end), bytes.end());
-  const auto is_control = [](char c) { return static_cast<uint8_t>(c) < ' ' || c == 0x7F; };
-  return std::any_of(text.begin(), text.end(), is_control) ? "" : text;
+  return is_line(text) ? text : "";
 }
 
 }  // namespace
@@ -50,8 +54,10 @@ ByteVector write_object(const ObjectFile& object) {
     header.section[i] = {static_cast<uint16_t>(section.size()), static_cast<uint32_t>(out.size())};
     out.insert(out.end(), section.begin(), section.end());
   }
-  if (!object.made_from.empty()) align4(out);
-  out.insert(out.end(), object.made_from.begin(), object.made_from.end());
+  if (!object.made_from.empty() && is_line(object.made_from)) {
+    align4(out);
+    out.insert(out.end(), object.made_from.begin(), object.made_from.end());
+  }
   header.write(out.data());
   return out;
 }

@@ -17,7 +17,7 @@ inline constexpr uint16_t kCompilerVersion = 2;
 struct ObjectFile {
   std::vector<ByteVector> sections;  ///< 1 to 4
   uint32_t version = 2;              ///< the format version of the header
-  std::string made_from;             ///< one line about the source, or nothing
+  std::string made_from;             ///< one line about the source; one with control characters is not written
   uint16_t compiler = 0;             ///< the version of the compiler's output; 0: not this compiler's
   Digest digest{};                   ///< as the header records it
 };

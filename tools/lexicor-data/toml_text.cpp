@@ -7,6 +7,7 @@
 #include <iterator>
 
 #include "lexicor/near_names.h"
+#include "line_text.h"
 #include "source_error.h"
 
 namespace lexicor_data {
@@ -39,6 +40,45 @@ void append_utf8(std::string& out, uint32_t value) {
   const int trails = value < 0x800 ? 1 : value < 0x10000 ? 2 : 3;
   out += static_cast<char>((0xFF00 >> (trails + 1) & 0xFF) | value >> (6 * trails));
   for (int i = trails - 1; i >= 0; --i) out += static_cast<char>(0x80 | (value >> (6 * i) & 0x3F));
+}
+
+/// The end of the string that begins at `at`, or of the text: behind the closing quotes, one or three of them.
+size_t end_of_string(const std::string& text, size_t at) {
+  const char quote = text[at];
+  const std::string triple(3, quote);
+  const size_t quotes = text.compare(at, 3, triple) == 0 ? 3 : 1;
+  for (at += quotes; at < text.size(); ++at) {
+    if (quotes == 1 && text[at] == '\n') return at;
+    if (quote == '"' && text[at] == '\\')
+      ++at;
+    else if (text.compare(at, quotes, triple, 0, quotes) == 0)
+      return at + quotes;
+  }
+  return text.size();
+}
+
+/// Only texts and comments hold characters outside ASCII. The parser has no defined behaviour where others do.
+void refuse_bare_characters(const std::string& text, const std::string& file_name) {
+  size_t at = text.compare(0, sizeof kByteOrderMark - 1, kByteOrderMark) == 0 ? sizeof kByteOrderMark - 1 : 0;
+  while (at < text.size()) {
+    if (text[at] == '"' || text[at] == '\'') {
+      at = end_of_string(text, at);
+    } else if (text[at] == '#') {
+      at = std::min(text.find('\n', at), text.size());
+    } else if (static_cast<uint8_t>(text[at]) < 0x80) {
+      ++at;
+    } else {
+      const std::string before = text.substr(0, at);
+      const auto line = std::count(before.begin(), before.end(), '\n');
+      const auto is_trail = [](char c) { return (static_cast<uint8_t>(c) & 0xC0) == 0x80; };
+      const size_t begin = before.rfind('\n') + 1;  // 0 when there is none
+      const auto trails =
+          std::count_if(before.begin() + static_cast<std::ptrdiff_t>(begin), before.end(), is_trail);
+      throw SourceError(file_name, static_cast<int>(line) + 1,
+                        static_cast<int>(at - begin) - static_cast<int>(trails) + 1,
+                        "a character outside ASCII stands outside of texts and comments");
+    }
+  }
 }
 
 bool is_high_surrogate(uint32_t unit) {
@@ -157,6 +197,7 @@ void TomlTable::allow(const std::vector<std::string>& keys) {
 
 toml::table parse_toml(std::istream& in, const std::string& file_name) {
   const std::string text{std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>()};
+  refuse_bare_characters(text, file_name);
   try {
     return toml::parse(text, file_name);
   } catch (const toml::parse_error& error) {
