@@ -20,7 +20,8 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     std::istringstream compiled(text);
     const CompiledObject object = compile_object(compiled, "fuzz/Fuzz.ucm", name, {});
     std::istringstream dumped(dump_object(read_object(object.bytes, "object"), name, nullptr, "object"));
-    lx::test::must(compile_object(dumped, "dump", name, {}).bytes == object.bytes, "a dump compiles to the same");
+    lx::test::must(compile_object(dumped, "dump", name, {}).bytes == object.bytes,
+                   "a dump compiles to the same");
   } catch (const SourceError&) {
   }
   return 0;

@@ -38,7 +38,8 @@ inline std::vector<ShippedCodepage> shipped_codepages() {
     if (name.type != lexicor_data::ObjectType::kCodepage || count++ % kSlowness != 0) continue;
     const ObjectFile object =
         read_object(read_file(LEXICOR_LOCALE_DIR "/" + object_file_name(name)), name.name);
-    all.push_back({name, read_ucm_file(source_path(LEXICOR_DATA_DIR, name)), object, unpack_codepage(object, name)});
+    all.push_back(
+        {name, read_ucm_file(source_path(LEXICOR_DATA_DIR, name)), object, unpack_codepage(object, name)});
   }
   return all;
 }

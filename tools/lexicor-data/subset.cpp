@@ -152,7 +152,7 @@ class Subset {
           << object.name.name << '\n';
       total += object.bytes;
     }
-    size_t all = 0;
+    uintmax_t all = 0;
     for (const ObjectName& name : control_.objects) all += fs::file_size(in_directory(object_file_name(name)));
     out << std::setw(kBytesChars) << total << "  in " << manifest.objects.size() << " of "
         << control_.objects.size() << " objects, which have " << all << '\n';
