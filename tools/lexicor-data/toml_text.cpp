@@ -3,6 +3,7 @@
 
 #include <algorithm>
 #include <cstdio>
+#include <cstring>
 #include <istream>
 #include <iterator>
 
@@ -42,44 +43,83 @@ void append_utf8(std::string& out, uint32_t value) {
   for (int i = trails - 1; i >= 0; --i) out += static_cast<char>(0x80 | (value >> (6 * i) & 0x3F));
 }
 
-/// The end of the string that begins at `at`, or of the text: behind the closing quotes, one or three of them.
-size_t end_of_string(const std::string& text, size_t at) {
-  const char quote = text[at];
-  const std::string triple(3, quote);
-  const size_t quotes = text.compare(at, 3, triple) == 0 ? 3 : 1;
-  for (at += quotes; at < text.size(); ++at) {
-    if (quotes == 1 && text[at] == '\n') return at;
-    if (quote == '"' && text[at] == '\\')
-      ++at;
-    else if (text.compare(at, quotes, triple, 0, quotes) == 0)
-      return at + quotes;
-  }
-  return text.size();
-}
+/// Looks for what the parser has no defined behaviour on: characters outside ASCII beside texts and comments, and table
+/// headers without a name. Behind an error of another kind it may miss some, but there the parser does not come.
+class Precheck {
+ public:
+  Precheck(const std::string& text, const std::string& file_name) : text_(text), file_name_(file_name) {}
 
-/// Only texts and comments hold characters outside ASCII. The parser has no defined behaviour where others do.
-void refuse_bare_characters(const std::string& text, const std::string& file_name) {
-  size_t at = text.compare(0, sizeof kByteOrderMark - 1, kByteOrderMark) == 0 ? sizeof kByteOrderMark - 1 : 0;
-  while (at < text.size()) {
-    if (text[at] == '"' || text[at] == '\'') {
-      at = end_of_string(text, at);
-    } else if (text[at] == '#') {
-      at = std::min(text.find('\n', at), text.size());
-    } else if (static_cast<uint8_t>(text[at]) < 0x80) {
-      ++at;
-    } else {
-      const std::string before = text.substr(0, at);
-      const auto line = std::count(before.begin(), before.end(), '\n');
-      const auto is_trail = [](char c) { return (static_cast<uint8_t>(c) & 0xC0) == 0x80; };
-      const size_t begin = before.rfind('\n') + 1;  // 0 when there is none
-      const auto trails =
-          std::count_if(before.begin() + static_cast<std::ptrdiff_t>(begin), before.end(), is_trail);
-      throw SourceError(file_name, static_cast<int>(line) + 1,
-                        static_cast<int>(at - begin) - static_cast<int>(trails) + 1,
-                        "a character outside ASCII stands outside of texts and comments");
+  void run() {
+    const size_t mark_bytes = sizeof kByteOrderMark - 1;
+    if (text_.compare(0, mark_bytes, kByteOrderMark) == 0) at_ = mark_bytes;
+    bool at_line_start = true;
+    int depth = 0;  // of brackets
+    while (at_ < text_.size()) {
+      const char c = text_[at_];
+      if (static_cast<uint8_t>(c) >= 0x80)
+        fail("a character outside ASCII stands outside of texts and comments");
+      if (c == '[' && at_line_start && depth == 0) check_header();
+      depth += (c == '[' || c == '{') - (c == ']' || c == '}');
+      at_line_start = c == '\n' || (at_line_start && is_blank(c));
+      if (c == '"' || c == '\'')
+        skip_string();
+      else if (c == '#')
+        at_ = std::min(text_.find('\n', at_), text_.size());
+      else
+        ++at_;
     }
   }
-}
+
+ private:
+  [[noreturn]] void fail(const std::string& what) const {
+    const auto is_trail = [](char c) { return (static_cast<uint8_t>(c) & 0xC0) == 0x80; };
+    int line = 1, column = 1;
+    for (size_t i = 0; i < at_; ++i) {
+      if (text_[i] == '\n')
+        ++line, column = 1;
+      else if (!is_trail(text_[i]))
+        ++column;
+    }
+    throw SourceError(file_name_, line, column, what);
+  }
+
+  void skip_blanks() {
+    while (at_ < text_.size() && is_blank(text_[at_])) ++at_;
+  }
+
+  /// Behind one or two brackets stands a key; the parser itself says what is wrong with another bracket.
+  void check_header() {
+    const size_t begin = at_++;
+    skip_blanks();
+    if (at_ < text_.size() && text_[at_] == '[') ++at_;
+    skip_blanks();
+    const char c = at_ < text_.size() ? text_[at_] : ']';
+    const bool is_key = (c >= '0' && c <= '9') || (c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z');
+    if (!is_key && (c == '\0' || strchr("_-\"'[]", c) == nullptr)) fail("expected the name of a table");
+    at_ = begin;
+  }
+
+  /// Goes behind the closing quotes, one or three of them.
+  void skip_string() {
+    const char quote = text_[at_];
+    const std::string triple(3, quote);
+    const size_t quotes = text_.compare(at_, 3, triple) == 0 ? 3 : 1;
+    for (at_ += quotes; at_ < text_.size(); ++at_) {
+      if (quotes == 1 && text_[at_] == '\n') return;
+      if (quote == '"' && text_[at_] == '\\') {
+        ++at_;
+      } else if (text_.compare(at_, quotes, triple, 0, quotes) == 0) {
+        at_ += quotes;
+        return;
+      }
+    }
+    at_ = text_.size();
+  }
+
+  const std::string& text_;
+  const std::string& file_name_;
+  size_t at_ = 0;
+};
 
 bool is_high_surrogate(uint32_t unit) {
   return unit >= 0xD800 && unit <= 0xDBFF;
@@ -197,7 +237,7 @@ void TomlTable::allow(const std::vector<std::string>& keys) {
 
 toml::table parse_toml(std::istream& in, const std::string& file_name) {
   const std::string text{std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>()};
-  refuse_bare_characters(text, file_name);
+  Precheck(text, file_name).run();
   try {
     return toml::parse(text, file_name);
   } catch (const toml::parse_error& error) {
