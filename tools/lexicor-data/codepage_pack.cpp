@@ -263,8 +263,11 @@ Packing pack_sections(const CodepageModel& model) {
 }
 
 /// The first section that is too large, or the number of sections.
-size_t overflow(const std::vector<ByteVector>& sections) {
-  return static_cast<size_t>(std::find_if_not(sections.begin(), sections.end(), fits) - sections.begin());
+size_t overflow(const CodepageModel& model) {
+  const size_t sections = model.is_multibyte() && !model.header.utf8 ? lx::format::kMaxSections : 0;
+  for (size_t section = 0; section < sections; ++section)
+    if (!section_fits(model, section)) return section;
+  return lx::format::kMaxSections;
 }
 
 // -- leaving characters out ---------------------------------------------------------------------------------
@@ -400,9 +403,7 @@ CodepageSource without(const CodepageSource& source, const std::unordered_set<ui
 PackedCodepage pack_codepage(CodepageModel model, const std::string& file_name,
                              std::vector<LeftOut>& left_out) {
   PackedCodepage result;
-  Packing packing = pack_sections(model);
-  while (overflow(packing.sections) < packing.sections.size()) {
-    const size_t section = overflow(packing.sections);
+  for (size_t section = overflow(model); section < lx::format::kMaxSections; section = overflow(model)) {
     const RowsBy by = section == kPayload || section == kTrie ? RowsBy::kCode : RowsBy::kUnicode;
     const CodepageSource source = to_source(model);
     const auto cuts = cuts_in_order(source, by);
@@ -425,9 +426,9 @@ PackedCodepage pack_codepage(CodepageModel model, const std::string& file_name,
       dropped = std::move(dropped_now);
     }
     if (enough > cuts.size()) throw SourceError(file_name, 0, 0, "the codepage does not fit its object");
-    packing = pack_sections(model);
     for (const Mapping& m : dropped) left_out.push_back({m, "no room"});
   }
+  Packing packing = pack_sections(model);
   result.object.sections = std::move(packing.sections);
   result.retyped_chars = packing.retyped_chars;
   result.type_rows = packing.type_rows;

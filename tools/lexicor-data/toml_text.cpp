@@ -87,7 +87,7 @@ class Precheck {
     while (at_ < text_.size() && is_blank(text_[at_])) ++at_;
   }
 
-  /// Behind one or two brackets stands a key; the parser itself says what is wrong with another bracket.
+  /// Behind one or two brackets stands a key; of a closing bracket the parser itself says that it is too early.
   void check_header() {
     const size_t begin = at_++;
     skip_blanks();
@@ -95,7 +95,7 @@ class Precheck {
     skip_blanks();
     const char c = at_ < text_.size() ? text_[at_] : ']';
     const bool is_key = (c >= '0' && c <= '9') || (c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z');
-    if (!is_key && (c == '\0' || strchr("_-\"'[]", c) == nullptr)) fail("expected the name of a table");
+    if (!is_key && (c == '\0' || strchr("_-\"']", c) == nullptr)) fail("expected the name of a table");
     at_ = begin;
   }
 

@@ -69,22 +69,22 @@ std::string UcmLine::word() {
   return line_.substr(start, at_ - start);
 }
 
-std::string UcmLine::bracketed() {
-  expect('<', "a key in angle brackets");
-  const size_t end = line_.find('>', at_);
-  if (end == std::string::npos) fail("the key has no closing bracket");
+std::string UcmLine::up_to(char closing, const char* missing) {
+  const size_t end = line_.find(closing, at_);
+  if (end == std::string::npos) fail(missing);
   const std::string text = line_.substr(at_, end - at_);
   at_ = end + 1;
   return text;
 }
 
+std::string UcmLine::bracketed() {
+  expect('<', "a key in angle brackets");
+  return up_to('>', "the key has no closing bracket");
+}
+
 std::string UcmLine::quoted() {
   expect('"', "a text in quotes");
-  const size_t end = line_.find('"', at_);
-  if (end == std::string::npos) fail("the text has no closing quote");
-  const std::string text = line_.substr(at_, end - at_);
-  at_ = end + 1;
-  return text;
+  return up_to('"', "the text has no closing quote");
 }
 
 uint32_t UcmLine::hex_number(int least, int most) {

@@ -50,6 +50,7 @@ class UcmLine {
   uint8_t byte();
 
  private:
+  std::string up_to(char closing, const char* missing);
   std::string found() const;
 
   const std::string& file_;
