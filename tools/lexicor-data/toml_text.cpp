@@ -43,8 +43,8 @@ void append_utf8(std::string& out, uint32_t value) {
   for (int i = trails - 1; i >= 0; --i) out += static_cast<char>(0x80 | (value >> (6 * i) & 0x3F));
 }
 
-/// Looks for what the parser has no defined behaviour on: characters outside ASCII beside texts and comments, and table
-/// headers without a name. Behind an error of another kind it may miss some, but there the parser does not come.
+/// Looks for what the parser has no defined behaviour on: characters outside ASCII beside texts and comments, or in a text
+/// that stands in a number, and table headers without a name. Behind an error of another kind it may miss some, but there the parser does not come.
 class Precheck {
  public:
   Precheck(const std::string& text, const std::string& file_name) : text_(text), file_name_(file_name) {}
@@ -101,6 +101,9 @@ class Precheck {
 
   /// Goes behind the closing quotes, one or three of them.
   void skip_string() {
+    constexpr char kBefore[] = " \t\r\n=,.[{\xBF";  // the last ends a byte-order mark
+    if (at_ > 0 && strchr(kBefore, text_[at_ - 1]) == nullptr)
+      fail("a text begins without a blank or a sign before it");
     const char quote = text_[at_];
     const std::string triple(3, quote);
     const size_t quotes = text_.compare(at_, 3, triple) == 0 ? 3 : 1;
