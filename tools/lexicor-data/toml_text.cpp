@@ -44,7 +44,7 @@ void append_utf8(std::string& out, uint32_t value) {
 }
 
 /// Looks for what the parser has no defined behaviour on: characters outside ASCII beside texts and comments, or in a text
-/// that stands in a number, and table headers without a name. Behind an error of another kind it may miss some, but there the parser does not come.
+/// that stands in a number. Behind an error of another kind it may miss some, but there the parser does not come.
 class Precheck {
  public:
   Precheck(const std::string& text, const std::string& file_name) : text_(text), file_name_(file_name) {}
@@ -52,15 +52,10 @@ class Precheck {
   void run() {
     const size_t mark_bytes = sizeof kByteOrderMark - 1;
     if (text_.compare(0, mark_bytes, kByteOrderMark) == 0) at_ = mark_bytes;
-    bool at_line_start = true;
-    int depth = 0;  // of brackets
     while (at_ < text_.size()) {
       const char c = text_[at_];
       if (static_cast<uint8_t>(c) >= 0x80)
         fail("a character outside ASCII stands outside of texts and comments");
-      if (c == '[' && at_line_start && depth == 0) check_header();
-      depth += (c == '[' || c == '{') - (c == ']' || c == '}');
-      at_line_start = c == '\n' || (at_line_start && is_blank(c));
       if (c == '"' || c == '\'')
         skip_string();
       else if (c == '#')
@@ -81,22 +76,6 @@ class Precheck {
         ++column;
     }
     throw SourceError(file_name_, line, column, what);
-  }
-
-  void skip_blanks() {
-    while (at_ < text_.size() && is_blank(text_[at_])) ++at_;
-  }
-
-  /// Behind one or two brackets stands a key; of a closing bracket the parser itself says that it is too early.
-  void check_header() {
-    const size_t begin = at_++;
-    skip_blanks();
-    if (at_ < text_.size() && text_[at_] == '[') ++at_;
-    skip_blanks();
-    const char c = at_ < text_.size() ? text_[at_] : ']';
-    const bool is_key = (c >= '0' && c <= '9') || (c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z');
-    if (!is_key && (c == '\0' || strchr("_-\"']", c) == nullptr)) fail("expected the name of a table");
-    at_ = begin;
   }
 
   /// Goes behind the closing quotes, one or three of them.

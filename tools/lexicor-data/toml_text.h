@@ -1,8 +1,6 @@
 // What the TOML sources share: reading a table key by key with the place of every error, and writing texts.
 #pragma once
 
-#include <toml++/toml.h>
-
 #include <cstdint>
 #include <iosfwd>
 #include <set>
@@ -10,6 +8,7 @@
 #include <vector>
 
 #include "source_error.h"
+#include "toml_parser.h"
 
 namespace lexicor_data {
 
