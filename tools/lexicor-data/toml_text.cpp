@@ -3,7 +3,6 @@
 
 #include <algorithm>
 #include <cstdio>
-#include <cstring>
 #include <istream>
 #include <iterator>
 
@@ -56,7 +55,10 @@ class Precheck {
       const char c = text_[at_];
       if (static_cast<uint8_t>(c) >= 0x80)
         fail("a character outside ASCII stands outside of texts and comments");
-      if (c == '"' || c == '\'')
+      const bool is_text = c == '"' || c == '\'';
+      if (is_text && in_token_) fail("a text begins inside a key or a value");
+      follow(c);
+      if (is_text)
         skip_string();
       else if (c == '#')
         at_ = std::min(text_.find('\n', at_), text_.size());
@@ -78,11 +80,47 @@ class Precheck {
     throw SourceError(file_name_, line, column, what);
   }
 
+  /// Follows whether a key or a value goes on; the parser takes all signs but blanks, commas and closing brackets for
+  /// parts of a value.
+  void follow(char c) {
+    switch (c) {
+      case ' ':
+      case '\t':
+      case '\r':
+      case '#':
+        in_token_ = false;
+        return;
+      case '\n':
+        in_token_ = false;
+        in_value_ = !open_.empty();
+        return;
+      case ',':
+        in_token_ = false;
+        in_value_ = open_.empty() || open_.back() == '[';
+        return;
+      case '=':
+        in_token_ = in_value_;
+        in_value_ = true;
+        return;
+      case '[':
+      case '{':
+        if (in_token_) return;
+        open_.push_back(c);
+        in_value_ = c == '[';
+        return;
+      case ']':
+      case '}':
+        in_token_ = false;
+        in_value_ = true;
+        if (!open_.empty()) open_.pop_back();
+        return;
+      default:
+        in_token_ = true;
+    }
+  }
+
   /// Goes behind the closing quotes, one or three of them.
   void skip_string() {
-    constexpr char kBefore[] = " \t\r\n=,.[{\xBF";  // the last ends a byte-order mark
-    if (at_ > 0 && strchr(kBefore, text_[at_ - 1]) == nullptr)
-      fail("a text begins without a blank or a sign before it");
     const char quote = text_[at_];
     const std::string triple(3, quote);
     const size_t quotes = text_.compare(at_, 3, triple) == 0 ? 3 : 1;
@@ -101,6 +139,8 @@ class Precheck {
   const std::string& text_;
   const std::string& file_name_;
   size_t at_ = 0;
+  bool in_token_ = false, in_value_ = false;
+  std::string open_;  ///< brackets
 };
 
 bool is_high_surrogate(uint32_t unit) {
