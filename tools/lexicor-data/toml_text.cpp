@@ -124,6 +124,7 @@ class Precheck {
     const char quote = text_[at_];
     const std::string triple(3, quote);
     const size_t quotes = text_.compare(at_, 3, triple) == 0 ? 3 : 1;
+    if (quotes == 3 && !in_value_) fail("a key has one quote at its begin");
     for (at_ += quotes; at_ < text_.size(); ++at_) {
       if (quotes == 1 && text_[at_] == '\n') return;
       if (quote == '"' && text_[at_] == '\\') {
