@@ -47,6 +47,21 @@ LX_API int32_t LXSetLocaleU(const LXUChar* name, int32_t flags);
  * other than 0x1 and LX_FALLBACK); nothing is then written. */
 LX_API int32_t LXConvertLocale(LXLocale* locale, char* buffer, int32_t flags);
 
+/* The bytes of a digest. */
+#define LX_DIGEST_BYTES 32
+
+/* Writes a digest of one of the locale's four objects to `buffer` of `size` bytes. `type` is LX_LANGUAGE,
+ * LX_TERRITORY, LX_CODEPAGE or LX_SORT. Returns LX_DIGEST_BYTES, or 0, with nothing written, and last error
+ * LX_E_INVALID (type) or LX_E_SIZE (`size` below LX_DIGEST_BYTES); 0 also when there is no locale.
+ *
+ * A digest is the SHA-256 of an object's data as they are in use: it is equal as long as the data are, in every
+ * process and with every word size, whatever file they come from. A program that stores what it made with a locale,
+ * such as sort keys in an index, stores the digests beside it (of keys: those of the sort and of the codepage) and
+ * makes it anew when they differ. Built-in objects have digests like any other. Binary order, which has no data, has
+ * 32 zero bytes. Values that a caller has set in a locale have no part in it. The data are read as a whole: call it
+ * once, not for each text. */
+LX_API int32_t LXGetLocaleDigest(LXLocale* locale, int32_t type, uint8_t* buffer, int32_t size);
+
 /* Gets the type and the null-terminated name of an object, valid during the call; 0 ends the enumeration. */
 typedef int32_t (*LXLocaleCallback)(void* user, int32_t type, const char* name);
 /* As LXLocaleCallback; the name is packed codes. */

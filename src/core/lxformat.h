@@ -18,15 +18,21 @@ inline constexpr size_t kMaxSectionBytes = 65535;
 inline constexpr uint32_t kFormatVersion = 2;
 
 // Common file header: the control file and every object file begin with it. Of the sizes of sections 1 to 3 the
-// low 16 bits are used. The origin says what the file was made from; loaders do not read it.
+// low 16 bits are used. Maker, compiler and digest identify the data; loaders do not read them, nor what stands
+// behind the sections.
 //
-//   0       4        8          10      12         16      20         24 .. 40         76
-//   +-------+--------+----------+-------+----------+-------+----------+-----+----------+
-//   | magic | format | sections | size0 | offset0  | size1 | offset1  | ... | origin   |
-//   +-------+--------+----------+-------+----------+-------+----------+-----+----------+
-//     u32     u32      u16        u16     u32        u32     u32              36 bytes
+//   0       4        8          10      12         16      20         24 .. 40      42         44       76
+//   +-------+--------+----------+-------+----------+-------+----------+-----+-------+----------+--------+
+//   | magic | format | sections | size0 | offset0  | size1 | offset1  | ... | maker | compiler | digest |
+//   +-------+--------+----------+-------+----------+-------+----------+-----+-------+----------+--------+
+//     u32     u32      u16        u16     u32        u32     u32              u16     u16        32 bytes
 //
-//   format: the version in the top four bits
+//   format:   the version in the top four bits
+//   maker:    kMaker when the two fields behind it hold what follows
+//   compiler: the version of the compiler's output
+//   digest:   SHA-256 of the sections, as digest_of() takes it
+//
+// Behind the last section, at a multiple of four: what the object was made from, as UTF-8 up to the end of the file.
 inline constexpr size_t kHeaderBytes = 76;
 inline constexpr size_t kHeaderSections = 8;
 inline constexpr size_t header_section_size(size_t n) {
@@ -37,7 +43,9 @@ inline constexpr size_t header_section_offset(size_t n) {
 }
 
 struct Header {
-  static constexpr size_t kOrigin = 40;
+  static constexpr size_t kIdentity = 40;
+  static constexpr uint16_t kMaker = 0x584C;  // "LX"
+  static constexpr size_t kDigestBytes = 32;
   static constexpr int kVersionShift = 28;
   struct Section {
     uint16_t bytes;
@@ -48,7 +56,9 @@ struct Header {
   uint32_t format = kFormatVersion << kVersionShift;
   uint16_t sections = 0;
   Section section[kMaxSections] = {};
-  char origin[kHeaderBytes - kOrigin] = {};
+  uint16_t maker = 0;
+  uint16_t compiler = 0;
+  uint8_t digest[kDigestBytes] = {};
 
   uint32_t version() const { return format >> kVersionShift; }
 
@@ -56,7 +66,9 @@ struct Header {
     Header header{le32(p), le32(p + 4), le16(p + kHeaderSections)};
     for (size_t n = 0; n < kMaxSections; ++n)
       header.section[n] = {le16(p + header_section_size(n)), le32(p + header_section_offset(n))};
-    memcpy(header.origin, p + kOrigin, sizeof(header.origin));
+    header.maker = le16(p + kIdentity);
+    header.compiler = le16(p + kIdentity + 2);
+    memcpy(header.digest, p + kIdentity + 4, sizeof(header.digest));
     return header;
   }
   void write(uint8_t* p) const {
@@ -67,7 +79,9 @@ struct Header {
       put_le16(p + header_section_size(n), section[n].bytes);
       put_le32(p + header_section_offset(n), section[n].offset);
     }
-    memcpy(p + kOrigin, origin, sizeof(origin));
+    put_le16(p + kIdentity, maker);
+    put_le16(p + kIdentity + 2, compiler);
+    memcpy(p + kIdentity + 4, digest, sizeof(digest));
   }
 };
 

@@ -24,6 +24,11 @@ const ObjectType* object_type(uint8_t type) {
   return type < format::kTypes ? kObjectTypes[type] : nullptr;
 }
 
+void keep_sizes(LXObject* entry, const Sections& sections) {
+  for (size_t i = 0; i < format::kMaxSections; ++i)
+    entry->section_bytes[i] = static_cast<uint32_t>(sections.section[i].size);
+}
+
 /// The sections of an object while it is loaded: freed unless they are handed to the entry.
 class Loading {
  public:
@@ -52,6 +57,7 @@ class Loading {
     entry->file = file;
     entry->derived = derived;
     entry->disk.flags = owned_;
+    keep_sizes(entry, sections_);
     for (size_t i = format::kMaxSections; i-- > 1;) entry->section[i] = take(i);
     __atomic_store_n(&entry->section[0], take(0), __ATOMIC_RELEASE);
   }
@@ -163,6 +169,7 @@ LXObject* LXLoadDefaultObj(LXObjManager*, LXObject* entry) {
   // Flagged as built-in, the compiled-in data are never freed and never written.
   entry->disk.flags = kObjectBuiltIn;
   entry->derived = const_cast<void*>(data->derived);
+  keep_sizes(entry, data->sections);
   for (size_t i = format::kMaxSections; i-- > 1;)
     entry->section[i] = const_cast<uint8_t*>(data->sections.section[i].data);
   __atomic_store_n(&entry->section[0], const_cast<uint8_t*>(data->sections.section[0].data), __ATOMIC_RELEASE);

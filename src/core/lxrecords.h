@@ -27,6 +27,7 @@ struct LXObject {
   LXFile* file;
   uint8_t* section[4];  // 0: the payload
   void* derived;        // acceleration data that the object's room made at load; null when it makes none
+  uint32_t section_bytes[4];
 };
 
 namespace lx {

@@ -6,7 +6,7 @@
 #include <vector>
 
 #include "codepage_unpack.h"
-#include "compile.h"
+#include "compile_directory.h"
 #include "support/slowness.h"
 
 namespace lx::test {
@@ -36,10 +36,10 @@ inline std::vector<ShippedCodepage> shipped_codepages() {
   int count = 0;
   for (const ObjectName& name : read_source_control(LEXICOR_DATA_DIR).objects) {
     if (name.type != lexicor_data::ObjectType::kCodepage || count++ % kSlowness != 0) continue;
-    std::ifstream source(LEXICOR_DATA_DIR "/" + source_file_name(name));
     const ObjectFile object =
         read_object(read_file(LEXICOR_LOCALE_DIR "/" + object_file_name(name)), name.name);
-    all.push_back({name, read_ucm(source, name.name), object, unpack_codepage(object, name)});
+    all.push_back(
+        {name, read_ucm_file(source_path(LEXICOR_DATA_DIR, name)), object, unpack_codepage(object, name)});
   }
   return all;
 }

@@ -13,7 +13,7 @@
 #include <set>
 #include <vector>
 
-#include "compile.h"
+#include "compile_directory.h"
 #include "directory/listed_differences.h"
 #include "import/locale_table.h"
 #include "support/forms.h"

@@ -47,6 +47,35 @@ class LocaleTest : public LibraryTest {
                                       create<LXUChar, LXGetLocaleU>};
 };
 
+// A digest is of the data in use: equal for equal data, whoever holds them; zeros for binary order. What cannot be
+// answered writes nothing.
+TEST_F(LocaleTest, Digests) {
+  init_directory();
+  ASSERT_EQ(LXSetLocale("English", 0), LX_OK);
+  using Digest = std::vector<uint8_t>;
+  const auto digest = [](LXLocale* locale, int32_t type, size_t size, int32_t code) {
+    Digest bytes(size, 0xEE);
+    const int32_t written = LXGetLocaleDigest(locale, type, bytes.data(), static_cast<int32_t>(size));
+    EXPECT_EQ(LXGetError(locale), code);
+    EXPECT_EQ(written, code == LX_OK ? LX_DIGEST_BYTES : 0);
+    return bytes;
+  };
+  const auto of_name = [&](const char* name, int32_t type) {
+    LXLocale* locale = LXGetLocale(name, 0, nullptr);
+    const Digest bytes = digest(locale, type, LX_DIGEST_BYTES, LX_OK);
+    LXReleaseLocale(locale);
+    return bytes;
+  };
+  EXPECT_EQ(of_name("English_France", LX_TERRITORY), of_name("English", LX_TERRITORY));
+  EXPECT_NE(of_name("French", LX_LANGUAGE), of_name("English", LX_LANGUAGE));
+  EXPECT_NE(of_name("English.Tiny", LX_CODEPAGE), of_name("English.Shift", LX_CODEPAGE));
+  EXPECT_NE(of_name("English@Default", LX_SORT), Digest(LX_DIGEST_BYTES, 0));
+  EXPECT_EQ(of_name("English@Binary", LX_SORT), Digest(LX_DIGEST_BYTES, 0));
+  for (int32_t type : {-1, LX_SORT + 1})
+    EXPECT_EQ(digest(nullptr, type, LX_DIGEST_BYTES, LX_E_INVALID), Digest(LX_DIGEST_BYTES, 0xEE));
+  EXPECT_EQ(digest(nullptr, LX_SORT, LX_DIGEST_BYTES - 1, LX_E_SIZE), Digest(LX_DIGEST_BYTES - 1, 0xEE));
+}
+
 TEST_F(LocaleTest, Names) {
   init_directory();
   for (const CaseRow& row : case_rows("locale/locale_names.txt")) {

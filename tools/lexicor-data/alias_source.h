@@ -4,13 +4,20 @@
 #pragma once
 
 #include <istream>
+#include <map>
 #include <string>
 
 #include "source_model.h"
 
 namespace lexicor_data {
 
-/// Checks that the library would read the whole file and that every codepage exists. Throws SourceError.
-void check_aliases(std::istream& in, const std::string& file_name, const Control& control);
+using Aliases = std::map<std::string, std::string>;  ///< codepages by alias_key()
+
+/// The form in which aliases are compared.
+std::string alias_key(const std::string& alias);
+
+/// Reads the aliases as the library does and checks that it would read the whole file and that every codepage exists.
+/// Throws SourceError.
+Aliases read_aliases(std::istream& in, const std::string& file_name, const Control& control);
 
 }  // namespace lexicor_data

@@ -1,18 +1,24 @@
 // Checks of whole directories. A fault in one file does not hide those of the others.
 #include "check.h"
 
-#include <cstdio>
 #include <filesystem>
 #include <fstream>
 #include <functional>
+#include <mutex>
+#include <ostream>
+#include <set>
 
 #include "alias_source.h"
 #include "codepage_unpack.h"
-#include "compile.h"
+#include "compile_directory.h"
 #include "control_source.h"
 #include "core/lxbytes.h"
 #include "core/lxformat.h"
+#include "lexicor/hex.h"
 #include "line_text.h"
+#include "manifest.h"
+#include "object_check.h"
+#include "parallel.h"
 #include "sense.h"
 #include "sort_check.h"
 #include "sort_pack.h"
@@ -21,21 +27,6 @@ namespace lexicor_data {
 namespace {
 
 namespace format = lx::format;
-
-/// Collects the messages of what a step throws.
-class Faults {
- public:
-  bool attempt(const std::function<void()>& step) {
-    try {
-      step();
-      return true;
-    } catch (const SourceError& error) {
-      messages.emplace_back(error.what());
-      return false;
-    }
-  }
-  std::vector<std::string> messages;
-};
 
 /// What each Unicode value becomes is a whole character of the codepage, as its length table sees it.
 void check_codes(const CodepageModel& model, const std::string& file_name) {
@@ -71,15 +62,46 @@ void check_defaults(const ByteVector& payload, const Control& control, const std
   }
 }
 
+/// The header of an object of this compiler records the digest of its sections.
+void check_digest(const ObjectFile& object, const std::string& path) {
+  if (object.compiler != 0 && object.digest != digest_of_sections(object.sections))
+    throw SourceError(path, 0, 0, "the digest in the header is not that of the content");
+}
+
 void check_file(const std::string& path, const ObjectName& name, const Control& control) {
   const ObjectFile object = read_object(read_file(path), path);
-  const std::string dumped = dump_object(object, name, &control, path);
+  dump_object(object, name, &control, path);
   if (name.type == ObjectType::kSort) check_sort(unpack_sort(object.sections[0]), path);
   if (name.type == ObjectType::kLanguage) check_defaults(object.sections[0], control, path);
   if (name.type == ObjectType::kCodepage) check_codes(unpack_codepage(object, name), path);
-  if (is_own_origin(object.origin) && object.origin != origin_of(dumped)) {
-    throw SourceError(path, 0, 0, "the checksum in the header is not that of the content");
+  check_digest(object, path);
+}
+
+/// Whether every file is the one that the manifest describes. What is wrong already needs no second word.
+void check_manifest(const std::string& directory, const Control& control, SourceErrors& errors) {
+  const std::string path = directory + '/' + kManifestFile;
+  const Manifest manifest = read_manifest(read_file(path), path);
+  std::set<std::string> bad;
+  for (const SourceError& error : errors.list()) bad.insert(error.file);
+  const auto compare = [&](const std::string& file, const std::string& sha256) {
+    const std::string full = directory + '/' + file;
+    if (bad.count(full) != 0) return;
+    errors.attempt([&] {
+      if (digest_text(digest_of_bytes(read_file(full))) != sha256)
+        throw SourceError(full, 0, 0, std::string("is not the file that ") + kManifestFile + " describes");
+    });
+  };
+  for (const auto& [file, sha256] : manifest.files) compare(file, sha256);
+  for (const ObjectName& name : control.objects) {
+    const ManifestObject* entry = manifest.find(name);
+    if (entry != nullptr)
+      compare(object_file_name(name), entry->sha256);
+    else
+      errors.add(SourceError(path, 0, 0, "does not list " + object_file_name(name)));
   }
+  for (const ManifestObject& object : manifest.objects)
+    if (control.find(object.name.type, object.name.id) == nullptr)
+      errors.add(SourceError(path, 0, 0, object.file + " is not in the control file"));
 }
 
 std::ifstream open(const std::string& path) {
@@ -88,64 +110,79 @@ std::ifstream open(const std::string& path) {
   return in;
 }
 
+/// Runs a check of every object; its errors come in the order of the objects.
+void check_all(const Control& control, SourceErrors& errors,
+               const std::function<void(const ObjectName&)>& check) {
+  std::vector<SourceErrors> found(control.objects.size());
+  const ValidatorInUse validator;
+  for_each_parallel(found.size(), [&](size_t i) { found[i].attempt([&] { check(control.objects[i]); }); });
+  for (const SourceErrors& of_object : found) errors.add_all(of_object);
+}
+
 }  // namespace
 
-std::vector<std::string> check_compiled_directory(const std::string& directory) {
-  Faults faults;
+SourceErrors check_compiled_directory(const std::string& directory) {
+  SourceErrors errors;
   const std::string control_file = directory + '/' + format::kControlFile;
   Control control;
-  const bool has_control = faults.attempt([&] {
+  bool is_own = false;
+  const bool has_control = errors.attempt([&] {
     const ObjectFile object = read_object(read_file(control_file), control_file);
     control = unpack_control(object.sections[0], control_file);
-    if (compile_control(control, control_file) != read_file(control_file) && is_own_origin(object.origin)) {
-      throw SourceError(control_file, 0, 0, "the checksum in the header is not that of the content");
-    }
+    is_own = object.compiler != 0;
+    check_digest(object, control_file);
   });
-  if (!has_control) return faults.messages;
+  if (!has_control) return errors;
 
-  for (const ObjectName& name : control.objects) {
-    faults.attempt([&] { check_file(directory + '/' + object_file_name(name), name, control); });
-  }
+  check_all(control, errors, [&](const ObjectName& name) {
+    check_file(directory + '/' + object_file_name(name), name, control);
+  });
   const std::string alias_file = directory + '/' + format::kAliasFile;
-  faults.attempt([&] {
+  errors.attempt([&] {
     std::ifstream in = open(alias_file);
     if (in.peek() == static_cast<unsigned char>(kByteOrderMark[0]))
       throw SourceError(alias_file, 1, 1, "begins with a byte-order mark, which the library takes for a name");
-    check_aliases(in, alias_file, control);
+    read_aliases(in, alias_file, control);
   });
   // Objects that nobody lists are left from an earlier directory.
-  faults.attempt([&] {
-    for (const auto& entry : std::filesystem::directory_iterator(directory)) {
-      const std::string file = entry.path().filename().string();
-      if (entry.path().extension() != format::kDataExtension || file == format::kControlFile) continue;
-      bool listed = false;
-      for (const ObjectName& name : control.objects) listed = listed || object_file_name(name) == file;
-      if (!listed) throw SourceError(entry.path().string(), 0, 0, "is not in the control file");
-    }
-  });
-  return faults.messages;
+  for (const auto& entry : std::filesystem::directory_iterator(directory)) {
+    const std::string file = entry.path().filename().string();
+    if (entry.path().extension() != format::kDataExtension || file == format::kControlFile) continue;
+    bool listed = false;
+    for (const ObjectName& name : control.objects) listed = listed || object_file_name(name) == file;
+    if (!listed) errors.add(SourceError(entry.path().string(), 0, 0, "is not in the control file"));
+  }
+  if (is_own) errors.attempt([&] { check_manifest(directory, control, errors); });
+  return errors;
 }
 
-std::vector<std::string> check_source_directory(const std::string& directory) {
-  Faults faults;
+SourceErrors check_source_directory(const std::string& directory, std::ostream& log) {
+  SourceErrors errors;
   Control control;
-  if (!faults.attempt([&] { control = read_source_control(directory); })) return faults.messages;
-  for (const ObjectName& name : control.objects) {
-    const std::string path = directory + '/' + source_file_name(name);
-    faults.attempt([&] {
-      std::ifstream in = open(path);
-      compile_object(in, path, name, control);
-      in = open(path);
-      if (name.type == ObjectType::kLanguage) check_language_sense(in, path);
-      if (name.type == ObjectType::kTerritory) check_territory_sense(in, path);
-    });
-  }
-  const std::string alias_file = directory + '/' + format::kAliasFile;
-  faults.attempt([&] {
-    std::ifstream in = open(alias_file);
-    check_aliases(in, alias_file, control);
+  if (!errors.attempt([&] { control = read_source_control(directory); })) return errors;
+  std::set<std::string> used;
+  std::mutex used_lock;
+  check_all(control, errors, [&](const ObjectName& name) {
+    const std::string path = source_path(directory, name);
+    std::ifstream in = open(path);
+    const CompiledObject object = compile_object(in, path, name, control);
+    {
+      const std::lock_guard<std::mutex> guard(used_lock);
+      used.insert(path);
+      used.insert(object.bases.begin(), object.bases.end());
+    }
+    in = open(path);
+    if (name.type == ObjectType::kLanguage) check_language_sense(in, path);
+    if (name.type == ObjectType::kTerritory) check_territory_sense(in, path);
   });
-  return faults.messages;
+  const std::string alias_file = directory + '/' + format::kAliasFile;
+  errors.attempt([&] {
+    std::ifstream in = open(alias_file);
+    read_aliases(in, alias_file, control);
+  });
+  if (!errors.empty()) return errors;
+  say_unused(directory, log, [&](const std::string& file) { return used.count(directory + '/' + file) != 0; });
+  return errors;
 }
 
 }  // namespace lexicor_data

@@ -3,7 +3,6 @@
 
 #include <algorithm>
 #include <set>
-#include <tuple>
 
 #include "lexicor/hex.h"
 
@@ -54,6 +53,8 @@ CodepageModel to_model(const CodepageSource& source, const std::string& file_nam
   model.header = source;
   model.header.source.clear();
   model.header.mappings.clear();
+  model.header.bases.clear();
+  model.header.warnings.clear();
   model.from_unicode.assign(0x10000, kNoCode);
   if (source.utf8) {
     fill_utf8(model);
@@ -105,9 +106,7 @@ CodepageSource to_source(const CodepageModel& model) {
   for (const auto& [code, u] : model.to_unicode) {
     if (model.from_unicode[u] != code) add(u, code, 3);
   }
-  std::sort(source.mappings.begin(), source.mappings.end(), [](const Mapping& a, const Mapping& b) {
-    return std::tie(a.unicode, a.precision, a.code) < std::tie(b.unicode, b.precision, b.code);
-  });
+  std::sort(source.mappings.begin(), source.mappings.end(), in_table_order);
   return source;
 }
 

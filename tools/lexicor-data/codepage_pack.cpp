@@ -3,7 +3,7 @@
 
 #include <algorithm>
 #include <map>
-#include <set>
+#include <unordered_set>
 
 #include "codepage/lxunicode.h"
 #include "core/lxbytes.h"
@@ -209,37 +209,65 @@ bool fits(const ByteVector& section) {
   return section.size() <= lx::format::kMaxSectionBytes;
 }
 
-Packing pack_sections(const CodepageModel& model) {
-  Pages pages = build_pages(model, TwoByteKind::kWords);
-  if (!fits(pages.low)) pages = build_pages(model, TwoByteKind::kByteArrays);
-  const ByteVector fixed = fixed_part(model, pages);
+/// From the tightest to the loosest, which takes the least room as a rule.
+constexpr TypeRows kTypeRows[] = {TypeRows::kExact, TypeRows::kShared, TypeRows::kUniform, TypeRows::kLoose};
 
+Pages pack_pages(const CodepageModel& model) {
+  const Pages pages = build_pages(model, TwoByteKind::kWords);
+  return fits(pages.low) ? pages : build_pages(model, TwoByteKind::kByteArrays);
+}
+
+/// The payload with the first of the type rows with which it fits, or else with the last.
+void pack_payload(Packing& packing, const CodepageModel& model, const Pages& pages) {
+  const ByteVector fixed = fixed_part(model, pages);
+  packing.sections[kPayload] = fixed;
+  if (!model.is_multibyte()) return;
+  for (TypeRows rows : kTypeRows) {
+    packing.sections[kPayload] = fixed;
+    packing.retyped_chars = append_variable_part(packing.sections[kPayload], model, rows);
+    packing.type_rows = rows;
+    if (fits(packing.sections[kPayload])) return;
+  }
+}
+
+/// Whether one section fits; the others are not looked at.
+bool section_fits(const CodepageModel& model, size_t section) {
+  if (section == kTrie) return fits(build_unicode_trie(model).section);
+  if (section != kPayload) {
+    const Pages pages = pack_pages(model);
+    return fits(section == kLow ? pages.low : pages.high);
+  }
+  const ByteVector fixed = fixed_part(model, Pages());  // which has the same size whatever the pages are
+  return std::any_of(std::rbegin(kTypeRows), std::rend(kTypeRows), [&](TypeRows rows) {
+    ByteVector payload = fixed;
+    append_variable_part(payload, model, rows);
+    return fits(payload);
+  });
+}
+
+Packing pack_sections(const CodepageModel& model) {
+  const Pages pages = pack_pages(model);
   Packing packing;
   std::vector<ByteVector>& sections = packing.sections;
   sections.resize(lx::format::kMaxSections);
-  sections[kPayload] = fixed;
   sections[kLow] = pages.low;
   sections[kHigh] = pages.high;
-  if (model.is_multibyte()) {
-    for (TypeRows rows : {TypeRows::kExact, TypeRows::kShared, TypeRows::kUniform, TypeRows::kLoose}) {
-      sections[kPayload] = fixed;
-      packing.retyped_chars = append_variable_part(sections[kPayload], model, rows);
-      packing.type_rows = rows;
-      if (fits(sections[kPayload])) break;
-    }
-    if (!model.header.utf8) {
-      const UnicodeTrie trie = build_unicode_trie(model);
-      sections[kTrie] = trie.section;
-      lx::put_le16(&sections[kPayload][cp::kUnicodeValues], static_cast<uint16_t>(trie.values_offset));
-    }
+  pack_payload(packing, model, pages);
+  if (model.is_multibyte() && !model.header.utf8) {
+    const UnicodeTrie trie = build_unicode_trie(model);
+    sections[kTrie] = trie.section;
+    lx::put_le16(&sections[kPayload][cp::kUnicodeValues], static_cast<uint16_t>(trie.values_offset));
   }
   while (sections.back().empty()) sections.pop_back();
   return packing;
 }
 
 /// The first section that is too large, or the number of sections.
-size_t overflow(const std::vector<ByteVector>& sections) {
-  return static_cast<size_t>(std::find_if_not(sections.begin(), sections.end(), fits) - sections.begin());
+size_t overflow(const CodepageModel& model) {
+  const size_t sections = model.is_multibyte() && !model.header.utf8 ? lx::format::kMaxSections : 0;
+  for (size_t section = 0; section < sections; ++section)
+    if (!section_fits(model, section)) return section;
+  return lx::format::kMaxSections;
 }
 
 // -- leaving characters out ---------------------------------------------------------------------------------
@@ -339,10 +367,10 @@ std::vector<std::vector<uint32_t>> cuts_in_order(const CodepageSource& source, R
 }
 
 /// The source without some characters, which go to `dropped`.
-CodepageSource without(const CodepageSource& source, const std::set<uint32_t>& numbers, RowsBy by,
+CodepageSource without(const CodepageSource& source, const std::unordered_set<uint32_t>& numbers, RowsBy by,
                        std::vector<Mapping>& dropped) {
   std::vector<bool> gone(source.mappings.size());
-  std::set<uint32_t> codes, values;
+  std::unordered_set<uint32_t> codes, values;
   auto drop = [&](size_t i) {
     gone[i] = true;
     codes.insert(source.mappings[i].code);
@@ -375,9 +403,7 @@ CodepageSource without(const CodepageSource& source, const std::set<uint32_t>& n
 PackedCodepage pack_codepage(CodepageModel model, const std::string& file_name,
                              std::vector<LeftOut>& left_out) {
   PackedCodepage result;
-  Packing packing = pack_sections(model);
-  while (overflow(packing.sections) < packing.sections.size()) {
-    const size_t section = overflow(packing.sections);
+  for (size_t section = overflow(model); section < lx::format::kMaxSections; section = overflow(model)) {
     const RowsBy by = section == kPayload || section == kTrie ? RowsBy::kCode : RowsBy::kUnicode;
     const CodepageSource source = to_source(model);
     const auto cuts = cuts_in_order(source, by);
@@ -386,24 +412,23 @@ PackedCodepage pack_codepage(CodepageModel model, const std::string& file_name,
     std::vector<Mapping> dropped;
     while (enough - too_few > 1) {
       const size_t count = (too_few + enough) / 2;
-      std::set<uint32_t> numbers;
+      std::unordered_set<uint32_t> numbers;
       for (size_t i = 0; i < count; ++i) numbers.insert(cuts[i].begin(), cuts[i].end());
       std::vector<Mapping> dropped_now;
       std::vector<LeftOut> none;
       CodepageModel rest = to_model(without(source, numbers, by, dropped_now), file_name, none);
-      Packing smaller = pack_sections(rest);
-      if (section < smaller.sections.size() && !fits(smaller.sections[section])) {
+      if (!section_fits(rest, section)) {
         too_few = count;
         continue;
       }
       enough = count;
       model = std::move(rest);
-      packing = std::move(smaller);
       dropped = std::move(dropped_now);
     }
     if (enough > cuts.size()) throw SourceError(file_name, 0, 0, "the codepage does not fit its object");
     for (const Mapping& m : dropped) left_out.push_back({m, "no room"});
   }
+  Packing packing = pack_sections(model);
   result.object.sections = std::move(packing.sections);
   result.retyped_chars = packing.retyped_chars;
   result.type_rows = packing.type_rows;

@@ -1,15 +1,12 @@
-// Compiling and dumping. An object records the checksum of what dump prints for it, so the compiler dumps each
-// object that it has packed; that the dump says what was packed is checked on the way.
+// Compiling and dumping of one object. That the packed tables of a codepage say what its source says is checked on the
+// way.
 #include "compile.h"
 
 #include <cstdio>
-#include <filesystem>
-#include <fstream>
+#include <iterator>
 #include <ostream>
-#include <set>
 #include <sstream>
 
-#include "alias_source.h"
 #include "codepage_pack.h"
 #include "codepage_unpack.h"
 #include "control_source.h"
@@ -44,9 +41,11 @@ bool same_mappings(const CodepageSource& a, const CodepageSource& b) {
 
 ObjectFile pack_source(const CodepageSource& source, const ObjectName& name, const std::string& file_name,
                        CompiledObject& result) {
-  if (source.name != name.name) {
-    throw SourceError(file_name, 1, 1, "the code set name is " + source.name + ", not " + name.name);
-  }
+  result.warnings = source.warnings;
+  result.bases = source.bases;
+  if (source.name != name.name)
+    result.warnings.push_back(file_name + ": the code set name is " + source.name + ", the object's " +
+                              name.name);
   if (source.utf8 != (name.id == format::codepage::kUtf8Id)) {
     throw SourceError(file_name, 1, 1,
                       "UTF-8, and only UTF-8, has the identifier " + std::to_string(format::codepage::kUtf8Id));
@@ -56,10 +55,13 @@ ObjectFile pack_source(const CodepageSource& source, const ObjectName& name, con
     if (source.leads[byte] != length)
       throw SourceError(file_name, 1, 1, "the leads of UTF-8 are C2-DF:2 E0-EF:3");
   }
-  PackedCodepage packed =
-      pack_codepage(to_model(source, file_name, result.left_out), file_name, result.left_out);
+  CodepageModel model = to_model(source, file_name, result.left_out);
+  if (model.value_of(0) != 0)
+    throw SourceError(file_name, 0, 0, "<U0000> \\x00 |0 is missing: a text ends with the byte 00");
+  PackedCodepage packed = pack_codepage(std::move(model), file_name, result.left_out);
   result.retyped_chars = packed.retyped_chars;
   result.type_rows = packed.type_rows;
+  packed.object.made_from = source.source;
   check_object(packed.object, name, file_name);
   if (!same_mappings(to_source(packed.model), to_source(unpack_codepage(packed.object, name)))) {
     throw std::logic_error(file_name + ": the packed tables do not say what the source says");
@@ -67,63 +69,20 @@ ObjectFile pack_source(const CodepageSource& source, const ObjectName& name, con
   return std::move(packed.object);
 }
 
-ByteVector to_bytes(const std::string& text) {
-  return ByteVector(text.begin(), text.end());
+void write_codepage(std::ostream& out, const ObjectFile& object, const ObjectName& name) {
+  CodepageSource source = to_source(unpack_codepage(object, name));
+  source.source = object.made_from;
+  write_ucm(out, source);
 }
 
-std::ifstream open_source(const std::string& path) {
-  std::ifstream in(path, std::ios::binary);
-  if (!in) throw SourceError(path, 0, 0, "cannot be opened");
-  return in;
-}
-
-/// A text file as the library reads it, without a byte-order mark and with line feeds as line ends.
-ByteVector plain_lines(const std::string& path) {
-  std::ifstream in = open_source(path);
-  std::string text, line;
-  for (int number = 0; next_line(in, &line, &number);) text += line + '\n';
-  return to_bytes(text);
-}
-
-void describe(std::ostream& out, const LeftOut& left_out) {
-  char text[64];
-  std::snprintf(text, sizeof text, "  <U%04X> %0*X |%d ", static_cast<unsigned>(left_out.mapping.unicode),
-                2 * left_out.mapping.bytes, static_cast<unsigned>(left_out.mapping.code),
-                left_out.mapping.precision);
-  out << text << left_out.reason << '\n';
-}
-
-/// One line that counts by reason.
-void count_left_out(std::ostream& log, const std::string& file_name, const std::vector<LeftOut>& left_out) {
-  std::map<std::string, size_t> counts;
-  for (const LeftOut& entry : left_out) ++counts[entry.reason];
-  log << file_name << ": left out:";
-  const char* separator = " ";
-  for (const auto& [reason, count] : counts) {
-    log << separator << count << ' ' << reason;
-    separator = ", ";
-  }
-  log << '\n';
-}
-
-/// Removes objects of an earlier compilation that the list no longer has; files of another origin stay.
-void remove_unlisted(const std::string& out, const Control& control, std::ostream& log) {
-  std::set<std::string> listed{format::kControlFile};
-  for (const ObjectName& name : control.objects) listed.insert(object_file_name(name));
-  std::vector<std::filesystem::path> unlisted;
-  for (const auto& entry : std::filesystem::directory_iterator(out)) {
-    if (entry.path().extension() != format::kDataExtension || !entry.is_regular_file()) continue;
-    if (listed.count(entry.path().filename().string()) == 0) unlisted.push_back(entry.path());
-  }
-  for (const std::filesystem::path& path : unlisted) {
-    try {
-      if (!is_own_origin(read_object(read_file(path.string()), path.string()).origin)) continue;
-    } catch (const SourceError&) {
-      continue;
-    }
-    std::filesystem::remove(path);
-    log << path.string() << ": removed, it is not listed any more\n";
-  }
+/// The first line of a text source, when it is a comment: it says where the facts come from.
+std::string first_comment(const std::string& text) {
+  std::istringstream in(text);
+  std::string line;
+  int number = 0;
+  if (!next_line(in, &line, &number) || line.empty() || line[0] != '#') return "";
+  const size_t begin = line.find_first_not_of("# \t");
+  return begin == std::string::npos ? "" : line.substr(begin, line.find_last_not_of(" \t") + 1 - begin);
 }
 
 }  // namespace
@@ -135,13 +94,26 @@ std::string object_file_name(const ObjectName& name) {
   return text;
 }
 
+std::vector<std::string> source_folders() {
+  std::vector<std::string> folders;
+  for (const SourcePlace& place : kSourcePlaces) folders.push_back(place.directory);
+  return folders;
+}
+
+std::string source_path(const std::string& directory, const ObjectName& name) {
+  return directory + '/' + source_file_name(name);
+}
+
 std::string source_file_name(const ObjectName& name) {
   const SourcePlace& place = kSourcePlaces[static_cast<size_t>(name.type)];
   return std::string(place.directory) + '/' + name.name + place.extension;
 }
 
-CompiledObject compile_object(std::istream& in, const std::string& file_name, const ObjectName& name,
+CompiledObject compile_object(std::istream& stream, const std::string& file_name, const ObjectName& name,
                               const Control& control) {
+  const std::string text{std::istreambuf_iterator<char>(stream), std::istreambuf_iterator<char>()};
+  if (stream.bad()) throw SourceError(file_name, 0, 0, "cannot be read");
+  std::istringstream in(text);
   CompiledObject result;
   ObjectFile object;
   switch (name.type) {
@@ -158,20 +130,19 @@ CompiledObject compile_object(std::istream& in, const std::string& file_name, co
       object.sections = {pack_sort(read_sort(in, file_name), file_name)};
       break;
   }
-  object.origin = origin_of(dump_object(object, name, &control, file_name));
+  if (name.type != ObjectType::kCodepage) {
+    object.made_from = first_comment(text);
+    check_object(object, name, file_name);
+  }
   result.bytes = write_object(object);
   return result;
 }
 
 ByteVector compile_control(const Control& control, const std::string& file_name) {
-  std::ostringstream text;
-  write_control(text, control);
   ObjectFile object;
   object.sections = {pack_control(control)};
-  if (object.sections[0].size() > format::kMaxSectionBytes) {
+  if (object.sections[0].size() > format::kMaxSectionBytes)
     throw SourceError(file_name, 0, 0, "there are more objects than a control file holds");
-  }
-  object.origin = origin_of(text.str());
   return write_object(object);
 }
 
@@ -179,6 +150,7 @@ std::string dump_object(const ObjectFile& object, const ObjectName& name, const 
                         const std::string& file_name) {
   check_object(object, name, file_name);
   std::ostringstream out;
+  if (name.type != ObjectType::kCodepage && !object.made_from.empty()) out << "# " << object.made_from << '\n';
   switch (name.type) {
     case ObjectType::kLanguage:
       write_language(out, unpack_language(object.sections[0]), control);
@@ -187,64 +159,13 @@ std::string dump_object(const ObjectFile& object, const ObjectName& name, const 
       write_territory(out, unpack_territory(object.sections[0]));
       break;
     case ObjectType::kCodepage:
-      write_ucm(out, to_source(unpack_codepage(object, name)));
+      write_codepage(out, object, name);
       break;
     case ObjectType::kSort:
       write_sort(out, unpack_sort(object.sections[0]));
       break;
   }
   return out.str();
-}
-
-Control read_source_control(const std::string& directory) {
-  const std::string file_name = directory + "/control.txt";
-  std::ifstream in = open_source(file_name);
-  return read_control(in, file_name);
-}
-
-void compile_directory(const std::string& source, const std::string& out, const CompileOptions& options,
-                       std::ostream& log) {
-  const Control control = read_source_control(source);
-  const std::string alias_file = source + '/' + format::kAliasFile;
-  {
-    std::ifstream aliases = open_source(alias_file);
-    check_aliases(aliases, alias_file, control);
-  }
-  std::vector<std::pair<std::string, ByteVector>> files;
-  std::ostringstream report;
-  for (const ObjectName& name : control.objects) {
-    const std::string file_name = source + '/' + source_file_name(name);
-    std::ifstream in = open_source(file_name);
-    CompiledObject object = compile_object(in, file_name, name, control);
-    if (options.verbose) {
-      log << object_file_name(name) << ' ' << name.name << ':';
-      for (const ByteVector& section : read_object(object.bytes, file_name).sections)
-        log << ' ' << section.size();
-      log << '\n';
-    }
-    if (object.retyped_chars != 0) {
-      log << file_name << ": " << object.retyped_chars
-          << " characters of unassigned type have the type of their row\n";
-    }
-    if (!object.left_out.empty()) {
-      count_left_out(log, file_name, object.left_out);
-      count_left_out(report, source_file_name(name), object.left_out);
-      for (const LeftOut& entry : object.left_out) {
-        describe(report, entry);
-        if (options.verbose) describe(log, entry);
-      }
-    }
-    files.emplace_back(object_file_name(name), std::move(object.bytes));
-  }
-  files.emplace_back(format::kAliasFile, plain_lines(alias_file));
-  // The control file comes last: until then a reader does not see the new objects.
-  files.emplace_back(format::kControlFile, compile_control(control, source + "/control.txt"));
-
-  std::error_code error;
-  std::filesystem::create_directories(out, error);
-  for (const auto& [name, bytes] : files) write_file(out + '/' + name, bytes);
-  remove_unlisted(out, control, log);
-  if (!options.report_file.empty()) write_file(options.report_file, to_bytes(report.str()));
 }
 
 }  // namespace lexicor_data

@@ -1,4 +1,4 @@
-// From sources to objects and back: one object at a time, and a whole directory.
+// From sources to objects and back, one object at a time.
 #pragma once
 
 #include <iosfwd>
@@ -16,11 +16,13 @@ struct CompiledObject {
   ByteVector bytes;               ///< the file
   std::vector<LeftOut> left_out;  ///< a codepage's characters that it does not hold
   size_t retyped_chars = 0;       ///< a codepage's characters that have the type of their row, not their own
+  std::vector<std::string> warnings;      ///< what was passed over in the source
+  std::vector<std::string> bases;         ///< the files that it was made of beside its source
   TypeRows type_rows = TypeRows::kExact;  ///< how a codepage's type rows are packed
 };
 
 /// Compiles the source of the object that `control` lists as `name`.
-CompiledObject compile_object(std::istream& in, const std::string& file_name, const ObjectName& name,
+CompiledObject compile_object(std::istream& stream, const std::string& file_name, const ObjectName& name,
                               const Control& control);
 
 /// The control file.
@@ -36,17 +38,10 @@ std::string dump_object(const ObjectFile& object, const ObjectName& name, const 
 std::string object_file_name(const ObjectName& name);
 std::string source_file_name(const ObjectName& name);
 
-struct CompileOptions {
-  bool verbose = false;     ///< list what is left out, and the sizes of sections
-  std::string report_file;  ///< where to list what is left out; empty: nowhere
-};
+/// The path of an object's source.
+std::string source_path(const std::string& directory, const ObjectName& name);
 
-/// Compiles a source directory. Nothing is written before everything is compiled; objects of an earlier run
-/// that are not listed any more are removed. Notes go to `log`.
-void compile_directory(const std::string& source, const std::string& out, const CompileOptions& options,
-                       std::ostream& log);
-
-/// The list of a source directory.
-Control read_source_control(const std::string& directory);
+/// The folders of a source directory that hold sources of objects.
+std::vector<std::string> source_folders();
 
 }  // namespace lexicor_data

@@ -9,7 +9,7 @@
 #include "core/lxbytes.h"
 #include "core/lxformat.h"
 #include "line_text.h"
-#include "ucm.h"
+#include "source_error.h"
 
 namespace lexicor_data {
 namespace {
@@ -113,12 +113,14 @@ const ObjectName* Control::find(ObjectType type, const std::string& name) const 
 
 Control read_control(std::istream& in, const std::string& file_name) {
   Control control;
+  SourceErrors errors;
   std::string text;
-  for (int line = 0; next_line(in, &text, &line);) {
+  for (int line = 0; !errors.full() && next_line(in, &text, &line);) {
     text.resize(std::min(text.find('#'), text.size()));
     if (text.find_first_not_of(" \t") == std::string::npos) continue;
-    control.objects.push_back(parse_line(text, file_name, line));
+    errors.attempt([&] { control.objects.push_back(parse_line(text, file_name, line)); });
   }
+  errors.throw_if_any();
   if (control.objects.empty()) throw SourceError(file_name, 0, 0, "lists no objects");
   refuse_duplicates(control, file_name);
   std::sort(control.objects.begin(), control.objects.end(), [](const ObjectName& a, const ObjectName& b) {

@@ -58,8 +58,13 @@ std::vector<SpecialMapping> read_specials(TomlTable& root, const std::string& ke
     entry.allow({"from", "to"});
     auto read = [&](const char* name, char16_t(&units)[2]) {
       const std::u16string text = entry.text(name);
-      if (text.empty() || text.size() > 2) entry.fail(entry.node(name), "expected one or two characters");
-      std::copy(text.begin(), text.end(), units);
+      entry.reading(name, [&] {
+        const toml::node& at = entry.node(name);
+        if (at.is_string() && (text.empty() || text.size() > 2))
+          entry.fail(at, "expected one or two characters");
+        std::copy_n(text.begin(), std::min<size_t>(text.size(), 2), units);
+        return true;
+      });
     };
     read("from", special.from);
     read("to", special.to);
@@ -117,7 +122,8 @@ size_t month_count(const std::array<std::u16string, 13>& months) {
 
 LanguageSource read_language(std::istream& in, const std::string& file_name, const Control& control) {
   const toml::table parsed = parse_toml(in, file_name);
-  TomlTable root(parsed, file_name);
+  SourceErrors errors;
+  TomlTable root(parsed, file_name, &errors);
   root.allow({"abbreviation", "name", "default", "days", "short_days", "months", "short_months", "morning",
               "afternoon", "special_upper", "special_lower"});
   LanguageSource language;
@@ -125,9 +131,13 @@ LanguageSource read_language(std::istream& in, const std::string& file_name, con
   language.name = root.text("name");
   TomlTable defaults = root.table("default");
   defaults.allow({"territory", "codepage", "sort"});
-  language.territory = read_default(defaults, "territory", ObjectType::kTerritory, control);
-  language.codepage = read_default(defaults, "codepage", ObjectType::kCodepage, control);
-  language.sort = read_default(defaults, "sort", ObjectType::kSort, control);
+  auto default_of = [&](ObjectType type) {
+    const std::string key = kTypeNames[static_cast<size_t>(type)];
+    return defaults.reading(key, [&] { return read_default(defaults, key, type, control); });
+  };
+  language.territory = default_of(ObjectType::kTerritory);
+  language.codepage = default_of(ObjectType::kCodepage);
+  language.sort = default_of(ObjectType::kSort);
   auto read_list = [&](const char* key, auto& list, size_t fewest) {
     const auto texts = root.texts(key, fewest, list.size());
     std::copy(texts.begin(), texts.end(), list.begin());
@@ -140,6 +150,8 @@ LanguageSource read_language(std::istream& in, const std::string& file_name, con
   language.afternoon = root.text("afternoon");
   language.special_upper = read_specials(root, "special_upper");
   language.special_lower = read_specials(root, "special_lower");
+  errors.sort(file_name);
+  errors.throw_if_any();
   return language;
 }
 

@@ -9,14 +9,14 @@
 #include <string>
 
 #include "check.h"
-#include "compile.h"
+#include "compile_directory.h"
 #include "control_source.h"
 #include "core/lxformat.h"
 #include "lexicor/arguments.h"
 #include "lexicor/command.h"
 #include "lexicor/descriptors.h"
 #include "lexicor/output.h"
-#include "ucm.h"
+#include "subset.h"
 
 namespace {
 
@@ -70,13 +70,17 @@ int check(const std::string& directory) {
   const bool compiled = fs::exists(fs::path(directory) / lx::format::kControlFile);
   const bool source = fs::exists(fs::path(directory) / "control.txt");
   if (!compiled && !source) throw SourceError(directory, 0, 0, "holds neither control.nls nor control.txt");
-  std::vector<std::string> faults;
+  SourceErrors faults;
   if (compiled) faults = check_compiled_directory(directory);
-  if (source) {
-    for (const std::string& fault : check_source_directory(directory)) faults.push_back(fault);
-  }
-  for (const std::string& fault : faults) std::cerr << fault << '\n';
+  if (source) faults.add_all(check_source_directory(directory, std::cerr));
+  for (const SourceError& fault : faults.list()) std::cerr << fault.what() << '\n';
   return faults.empty() ? kDone : kDataError;
+}
+
+/// A place in a source stands first, as compilers write it.
+void say(const SourceError& errors) {
+  for (const SourceError& error : errors.all())
+    std::cerr << (error.line > 0 ? "" : "lexicor-data: ") << error.what() << '\n';
 }
 
 }  // namespace
@@ -86,12 +90,18 @@ int main(int argc, char** argv) {
   lexicor_cli::CommandLine line("lexicor-data", "Compiles, dumps and checks Lexicor locale data.");
   std::string source, out, file, control_file, directory;
   CompileOptions options;
+  SubsetRequest subset;
 
   auto compile_command = line.add_subcommand("compile", "Compile a source directory into a locale directory");
   compile_command.add_option("SRC", source, "the directory with control.txt").required();
   compile_command.add_option("OUT", out, "the locale directory").required();
   compile_command.add_flag("--verbose", options.verbose, "list section sizes and each character left out");
   compile_command.add_option("--report", options.report_file, "a file for the list of characters left out");
+  compile_command.add_flag("--all", options.all, "compile sources too that are unchanged since the last run");
+  compile_command.footer(
+      "Every error of every source is said, and then nothing is written. Objects whose sources are those of "
+      "the last\n"
+      "run into OUT stay as they are; with --all, --verbose or --report all are compiled.");
 
   auto dump_command = line.add_subcommand("dump", "Print the source of an object or of a control file");
   dump_command.add_option("FILE", file, "an object, such as cp_00819.nls, or control.nls").required();
@@ -100,16 +110,29 @@ int main(int argc, char** argv) {
   auto check_command = line.add_subcommand("check", "Check a compiled or a source directory");
   check_command.add_option("DIR", directory, "the directory").required();
 
+  auto subset_command = line.add_subcommand("subset", "Copy what some locales and codepages need");
+  subset_command.add_option("DIR", directory, "a compiled directory").required();
+  subset_command.add_option("OUT", out, "the smaller directory").required();
+  subset_command.add_option("--locale", subset.locales, "LANGUAGE[_TERRITORY][.CODEPAGE][@SORT] ...")
+      .type_name("");
+  subset_command.add_option("--codepage", subset.codepages, "codepages beside those of the locales ...")
+      .type_name("");
+  subset_command.footer(
+      "Objects keep their bytes. The defaults of each language and US-ASCII belong to what a locale needs.\n"
+      "\n"
+      "Example:\n"
+      "  lexicor-data subset locale small --locale Swedish_Sweden German.Latin1 --codepage IBM930 sjis");
+
   try {
     if (!line.parse(argc, argv)) return kDone;
     if (compile_command.given()) compile_directory(source, out, options, std::cerr);
     if (dump_command.given()) dump(file, control_file);
     if (check_command.given()) return check(directory);
+    if (subset_command.given()) make_subset(directory, out, subset, std::cout, std::cerr);
     std::cout.flush();
     if (!std::cout) throw SourceError("standard output", 0, 0, "cannot be written");
   } catch (const SourceError& error) {
-    // A place in a source stands first, as compilers write it.
-    std::cerr << (error.line > 0 ? "" : "lexicor-data: ") << error.what() << '\n';
+    say(error);
     return kDataError;
   } catch (const lexicor_cli::Failure& failure) {
     std::cerr << "lexicor-data: " << failure.what() << '\n';

@@ -14,15 +14,6 @@ namespace {
 namespace format = lx::format;
 namespace cp = lx::format::codepage;
 
-/// The library with the standard hooks, from which its validators take memory.
-class Library {
- public:
-  Library() { LXInit("", nullptr, nullptr, nullptr, LX_NO_DEFAULTS); }
-  ~Library() { LXTerm(); }
-  Library(const Library&) = delete;
-  Library& operator=(const Library&) = delete;
-};
-
 class Check {
  public:
   Check(const ObjectFile& object, const ObjectName& name, const std::string& file_name)
@@ -56,7 +47,7 @@ class Check {
   }
 
   void check_sound() const {
-    const Library library;
+    const ValidatorInUse validator;
     lx::Sections sections;
     for (size_t i = 0; i < object_.sections.size(); ++i)
       sections.section[i] = {object_.sections[i].data(), object_.sections[i].size()};
@@ -150,6 +141,14 @@ class Check {
 };
 
 }  // namespace
+
+ValidatorInUse::ValidatorInUse() {
+  LXInit("", nullptr, nullptr, nullptr, LX_NO_DEFAULTS);
+}
+
+ValidatorInUse::~ValidatorInUse() {
+  LXTerm();
+}
 
 void check_object(const ObjectFile& object, const ObjectName& name, const std::string& file_name) {
   Check(object, name, file_name).run();

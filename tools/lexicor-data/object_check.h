@@ -9,6 +9,16 @@
 
 namespace lexicor_data {
 
+/// The validators take their memory from the library: it is initialised while there is one of these. Threads that check
+/// objects need one around them all.
+class ValidatorInUse {
+ public:
+  ValidatorInUse();
+  ~ValidatorInUse();
+  ValidatorInUse(const ValidatorInUse&) = delete;
+  ValidatorInUse& operator=(const ValidatorInUse&) = delete;
+};
+
 /// Throws a SourceError that names the file: with what the library's validator finds wrong, in which section
 /// and at which offset, or else with what loads but what the compiler never writes, such as tables out of
 /// order.

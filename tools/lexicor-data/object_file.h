@@ -1,30 +1,28 @@
-// The container that every file of a locale directory shares: the common header and up to four sections. The
-// header's unread bytes record, as ASCII, the compiler's version and the start of the SHA-256 of the object's
-// canonical source, that is, of what `lexicor-data dump` prints for it.
+// The container that every file of a locale directory shares: the common header, up to four sections, and behind them
+// what they were made from. Loaders read neither that nor the header's identity: the version of the compiler's output
+// and the digest of the sections.
 #pragma once
 
-#include <array>
 #include <cstdint>
 #include <string>
 #include <vector>
 
+#include "digest.h"
+
 namespace lexicor_data {
 
-using ByteVector = std::vector<uint8_t>;
+/// The version of what this compiler writes. It counts up whenever the same source gives other bytes.
+inline constexpr uint16_t kCompilerVersion = 2;
 
 struct ObjectFile {
   std::vector<ByteVector> sections;  ///< 1 to 4
   uint32_t version = 2;              ///< the format version of the header
-  std::string origin;                ///< the unread bytes up to the first null
+  std::string made_from;             ///< one line about the source; one with control characters is not written
+  uint16_t compiler = 0;             ///< the version of the compiler's output; 0: not this compiler's
+  Digest digest{};                   ///< as the header records it
 };
 
-/// "lexicor-data 1 " and the first eight bytes of the checksum of a canonical source, in hexadecimal.
-std::string origin_of(const std::string& canonical_source);
-
-/// Whether an origin was written by origin_of, for whatever source.
-bool is_own_origin(const std::string& origin);
-
-/// The bytes of the file. Every section holds at most kMaxSectionBytes.
+/// The bytes of the file, with its identity. Every section holds at most kMaxSectionBytes.
 ByteVector write_object(const ObjectFile& object);
 
 /// Reads the container; a bad header or a section outside the file is a SourceError.

@@ -93,12 +93,17 @@ std::vector<size_t> RowPacker<Element>::place(const std::vector<Request>& reques
   std::vector<size_t> position(requests.size());
   size_t grown_from = 0;  // the array up to here was searched for every pending row
   while (!pending.empty()) {
+    // Most rows do not begin in the new part of the array: they need not be searched for.
+    Row grown(pool_.begin() + static_cast<std::ptrdiff_t>(grown_from), pool_.end());
+    std::sort(grown.begin(), grown.end());
     // One pass drops the rows that the array now holds and finds the row to go on with: one that needs no
     // padding before it, with the longest overlap; the first of the order among equals.
     size_t best = 0, best_overlap = 0, best_padding = 0, kept = 0;
     for (size_t i = 0; i < pending.size(); ++i) {
       const Request& request = requests[pending[i].request];
-      if (find(request, grown_from, pending[i], position[pending[i].request])) continue;
+      const bool may_stand =
+          pending[i].overlap != 0 || std::binary_search(grown.begin(), grown.end(), request.row[0]);
+      if (may_stand && find(request, grown_from, pending[i], position[pending[i].request])) continue;
       const size_t overlap = pending[i].overlap;
       const size_t padding = request.first_index > pool_.size() ? request.first_index - pool_.size() : 0;
       if (kept == 0 || (padding != best_padding ? padding < best_padding : overlap > best_overlap)) {

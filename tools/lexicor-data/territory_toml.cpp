@@ -109,7 +109,8 @@ void read_table(TomlTable& table, const char* name, TerritorySource& territory) 
 
 TerritorySource read_territory(std::istream& in, const std::string& file_name) {
   const toml::table parsed = parse_toml(in, file_name);
-  TomlTable root(parsed, file_name);
+  SourceErrors errors;
+  TomlTable root(parsed, file_name, &errors);
   TerritorySource territory;
   for (const char* name : kTables) {
     if (same(name, "")) {
@@ -119,6 +120,8 @@ TerritorySource read_territory(std::istream& in, const std::string& file_name) {
     TomlTable table = root.table(name);
     read_table(table, name, territory);
   }
+  errors.sort(file_name);
+  errors.throw_if_any();
   return territory;
 }
 

@@ -1,39 +1,16 @@
-// A codepage's source: a table in the .ucm form, read, checked and written.
-//
-// The form is the field's own (header keys in angle brackets, then CHARMAP ... END CHARMAP with a line
-// `<U0041> \x41 |0` a mapping), with these keys:
-//
-//   <code_set_name>        the object's name, in quotes
-//   <uconv_class>          "SBCS", "MBCS" or "EBCDIC_STATEFUL"
-//   <mb_cur_max>           the longest character in bytes; in EBCDIC_STATEFUL that of the double-byte state
-//   <subchar>              the substitution byte, \xHH
-//   <lexicor:line_ends>    four bytes: line feed, carriage return, two further line ends
-//   <lexicor:ascii>        yes: digit zero is 0x30 and minus is 0x2D; no: EBCDIC
-//   <lexicor:leads>        MBCS: ranges of first bytes of longer characters with their length,
-//                          `81-9F:2 E0-FC:2 8F:3`; a byte not named begins a one-byte character
-//   <lexicor:algorithm>    "UTF-8": the mapping is computed and no CHARMAP follows
-//   <lexicor:source>       where the facts were taken from
-//
-// EBCDIC_STATEFUL: Shift-Out is 0x0E and Shift-In 0x0F; one-byte mappings belong to the single-byte state,
-// longer ones to the double-byte state. Precision |0 maps both ways, |1 only from Unicode, |3 only to Unicode.
+// A codepage's source: a table in the .ucm form, read, checked and written. docs/codepage-sources.md describes the
+// form.
 #pragma once
 
 #include <array>
 #include <cstdint>
 #include <iosfwd>
-#include <stdexcept>
 #include <string>
 #include <vector>
 
-namespace lexicor_data {
+#include "source_error.h"
 
-/// An error in a source: what, in which file, and where in it (1-based; 0: not known).
-struct SourceError : std::runtime_error {
-  SourceError(std::string file_name, int line_number, int column_number, const std::string& what);
-  std::string file;
-  int line;
-  int column;
-};
+namespace lexicor_data {
 
 struct Mapping {
   uint32_t unicode = 0;   ///< a code point, above 0xFFFF too
@@ -41,6 +18,15 @@ struct Mapping {
   uint8_t bytes = 1;      ///< length of the character
   uint8_t precision = 0;  ///< 0 both ways, 1 from Unicode only, 3 to Unicode only
 };
+
+inline bool from_unicode(const Mapping& m) {
+  return m.precision != 3;
+}
+inline bool to_unicode(const Mapping& m) {
+  return m.precision != 1;
+}
+/// The order of a table: by code point, then precision, then code.
+bool in_table_order(const Mapping& a, const Mapping& b);
 
 enum class CodepageClass { kSingleByte, kMultiByte, kShiftStateful };
 
@@ -54,7 +40,10 @@ struct CodepageSource {
   bool ascii = true;
   bool utf8 = false;               ///< computed, no mappings
   std::array<uint8_t, 256> leads;  ///< length by first byte, all 1 unless MBCS
-  std::vector<Mapping> mappings;   ///< sorted by (unicode, precision, code)
+  std::vector<Mapping> mappings;   ///< in table order
+
+  std::vector<std::string> bases;     ///< the files that it was read from beside its own
+  std::vector<std::string> warnings;  ///< what was passed over, with its place
 
   CodepageSource() { leads.fill(1); }
 };
@@ -62,10 +51,15 @@ struct CodepageSource {
 inline constexpr uint8_t kShiftOut = 0x0E;
 inline constexpr uint8_t kShiftIn = 0x0F;
 
-/// Reads and checks a table: keys, ranges, lengths against leads, duplicates. Throws SourceError.
+/// Reads and checks a table: keys, ranges, lengths against leads, duplicates. A base is looked for beside
+/// `file_name`. Throws SourceError.
 CodepageSource read_ucm(std::istream& in, const std::string& file_name);
+CodepageSource read_ucm_file(const std::string& path);
 
-/// Writes the canonical text: read_ucm(write_ucm(x)) is x, and equal tables give equal bytes.
+/// Writes the plain table, a line a mapping: read_ucm(write_ucm(x)) is x, and equal tables give equal bytes.
 void write_ucm(std::ostream& out, const CodepageSource& source);
+
+/// Writes the table as a short source: characters in a row as ranges and, with a base, only what differs from it.
+void write_ucm_source(std::ostream& out, const CodepageSource& source, const CodepageSource* base);
 
 }  // namespace lexicor_data

@@ -6,8 +6,10 @@
 
 #include "arguments.h"
 #include "command.h"
+#include "hex.h"
 #include "locale.h"
 #include "output.h"
+#include "provenance.h"
 #include "report.h"
 #include "session.h"
 
@@ -104,6 +106,42 @@ std::string readable(const Json& value) {
                          : value.dump(-1, ' ', false, Json::error_handler_t::replace);
 }
 
+/// The objects of a locale: by type, what item names them.
+constexpr struct {
+  const char* type;
+  int32_t name_item;
+} kObjects[] = {{"language", LX_ITEM_LANGUAGE},
+                {"territory", LX_ITEM_TERRITORY},
+                {"codepage", LX_ITEM_CODEPAGE},
+                {"sort", LX_ITEM_SORT}};
+
+/// The digest of the data that the library uses, in hexadecimal.
+Json digest_of(LXLocale* locale, int32_t type) {
+  uint8_t digest[LX_DIGEST_BYTES];
+  if (LXGetLocaleDigest(locale, type, digest, sizeof digest) == 0) return Json();
+  std::string text;
+  for (const uint8_t byte : digest) text += hex_text(byte, 2);
+  for (char& c : text) c = c >= 'A' ? static_cast<char>(c - 'A' + 'a') : c;
+  return text;
+}
+
+/// What the locale's objects were made from; a manifest that tells of other data says nothing of these.
+Json objects_of(LXLocale* locale) {
+  const Provenance provenance;
+  Json rows = Json::array();
+  for (int32_t type = LX_LANGUAGE; type <= LX_SORT; ++type) {
+    const std::string name = text_item(locale, kObjects[type].name_item).value_or("");
+    const Json digest = digest_of(locale, type);
+    const Json source = digest == provenance.digest_of(type, name) ? provenance.source_of(type, name) : Json();
+    rows.push_back({{"type", kObjects[type].type},
+                    {"name", name},
+                    {"digest", digest},
+                    {"made_from", source},
+                    {"compiler", source.is_null() ? Json() : provenance.compiler()}});
+  }
+  return rows;
+}
+
 std::string info_text(LXLocale* locale, bool json) {
   std::ostringstream out;
   Json rows = Json::array();
@@ -119,7 +157,16 @@ std::string info_text(LXLocale* locale, bool json) {
             << "  " << readable(value) << '\n';
     }
   }
-  return json ? json_text({{"items", rows}}) : out.str();
+  const Json objects = objects_of(locale);
+  if (json) return json_text({{"items", rows}, {"objects", objects}});
+  for (const Json& object : objects) {
+    const std::string type = object["type"].get<std::string>();
+    for (const char* field : {"digest", "made_from"})
+      if (!object[field].is_null())
+        out << std::string(kNumberChars + 2, ' ') << padded(type + '_' + field, kNameChars) << "  "
+            << readable(object[field]) << '\n';
+  }
+  return out.str();
 }
 
 int info(const InfoOptions& options, const CommonOptions& common) {

@@ -11,6 +11,7 @@
 #include "catalogue.h"
 #include "command.h"
 #include "output.h"
+#include "provenance.h"
 #include "report.h"
 #include "session.h"
 
@@ -78,10 +79,13 @@ void write_objects(std::ostream& out, const Catalogue& catalogue, int type) {
   }
 }
 
-Json json_objects(const Catalogue& catalogue, int type) {
+Json json_objects(const Catalogue& catalogue, const Provenance& provenance, int type) {
   Json rows = Json::array();
   for (const CatalogueObject& object : objects_of(catalogue, type)) {
-    Json row = {{"id", object.id}, {"name", object.name}};
+    Json row = {{"id", object.id},
+                {"name", object.name},
+                {"digest", provenance.digest_of(type, object.name)},
+                {"made_from", provenance.source_of(type, object.name)}};
     if (type == LX_CODEPAGE) row["aliases"] = catalogue.aliases_of(object.name);
     rows.push_back(row);
   }
@@ -131,6 +135,7 @@ Json json_names(const NameTable& table, const NameRows& rows) {
 }
 
 std::string list_text(const ListOptions& options, const Catalogue& catalogue) {
+  const Provenance provenance;
   std::ostringstream out;
   Json json = Json::object();
   const bool all = options.what.empty();
@@ -140,7 +145,7 @@ std::string list_text(const ListOptions& options, const Catalogue& catalogue) {
   for (const auto& kind : kObjectKinds) {
     if (!all && options.what != kind.title) continue;
     if (options.json) {
-      json[kind.title] = json_objects(catalogue, kind.type);
+      json[kind.title] = json_objects(catalogue, provenance, kind.type);
     } else {
       heading(kind.title);
       write_objects(out, catalogue, kind.type);
@@ -178,7 +183,9 @@ Run declare_list(Arguments& command, const CommonOptions& common) {
   command.footer(
       "Each line has the identifier, the name and, of a codepage, its aliases. Locales are the operating "
       "system's\n"
-      "names, with the locale that each stands for.\n"
+      "names, with the locale that each stands for. JSON has the digest of each object's data too, and what "
+      "they\n"
+      "were made from.\n"
       "\n"
       "Examples:\n"
       "  lexicor list codepages\n"

@@ -6,6 +6,7 @@
 #include <stdexcept>
 #include <tuple>
 
+#include "codepage_defaults.h"
 #include "same_sign.h"
 
 namespace lexicor_import {
@@ -163,22 +164,16 @@ class Import {
     return found == to_unicode_.end() ? kNone : found->second;
   }
 
-  uint32_t byte_of(uint32_t unicode) const {
-    const auto found = from_unicode_.find(unicode);
-    return found == from_unicode_.end() || found->second.bytes != 1 ? kNone : found->second.packed;
-  }
-
   void set_family() {
-    source_.ascii = byte_of('0') == '0' && byte_of('-') == '-';
-    if (!source_.ascii && (byte_of('0') != 0xF0 || byte_of('-') != 0x60)) {
-      throw std::runtime_error("neither ASCII-based nor EBCDIC");
-    }
+    const std::optional<bool> ascii = lexicor_data::ascii_family(byte_of_);
+    if (!ascii) throw std::runtime_error("neither ASCII-based nor EBCDIC");
+    source_.ascii = *ascii;
   }
 
   void straighten_controls() {
     bool changed = false;
     for (uint32_t byte = 0; byte <= 0x7F; byte = byte == 0x1F ? 0x7F : byte + 1) {
-      if (value_of(byte) == byte && byte_of(byte) == byte) continue;
+      if (value_of(byte) == byte && byte_of_(byte) == byte) continue;
       to_unicode_[{byte, 1}] = byte;
       from_unicode_[byte] = {byte, 1};
       changed = true;
@@ -249,17 +244,13 @@ class Import {
 
   void set_substitution() {
     source_.substitution = source_.ascii ? 0x3F : 0x6F;
-    if (value_of(source_.substitution) != '?' || byte_of('?') != source_.substitution)
+    if (value_of(source_.substitution) != '?' || byte_of_('?') != source_.substitution)
       throw std::runtime_error("the question mark is not that of its family");
   }
 
   void set_line_ends() {
-    const uint32_t line_feed = byte_of(0x0A), carriage_return = byte_of(0x0D), next_line = byte_of(0x85);
-    if (line_feed == kNone || carriage_return == kNone)
-      throw std::runtime_error("no line feed or carriage return");
-    const uint32_t third = source_.ascii || next_line == kNone ? line_feed : next_line;
-    source_.line_ends = {static_cast<uint8_t>(line_feed), static_cast<uint8_t>(carriage_return),
-                         static_cast<uint8_t>(third), static_cast<uint8_t>(line_feed)};
+    if (!byte_of_(0x0A) || !byte_of_(0x0D)) throw std::runtime_error("no line feed or carriage return");
+    source_.line_ends = lexicor_data::usual_line_ends(source_.ascii, byte_of_);
   }
 
   void write_mappings() {
@@ -274,9 +265,7 @@ class Import {
       const auto forth = from_unicode_.find(unicode);
       if (forth == from_unicode_.end() || !(forth->second == code)) add(unicode, code, 3);
     }
-    std::sort(source_.mappings.begin(), source_.mappings.end(), [](const Mapping& a, const Mapping& b) {
-      return std::tie(a.unicode, a.precision, a.code) < std::tie(b.unicode, b.precision, b.code);
-    });
+    std::sort(source_.mappings.begin(), source_.mappings.end(), lexicor_data::in_table_order);
   }
 
   Converter& converter_;
@@ -286,6 +275,11 @@ class Import {
       longest_cut_{};  ///< of leads that begin no assigned character: the length they announce
   std::map<Code, uint32_t> to_unicode_;
   std::map<uint32_t, Code> from_unicode_;
+  const lexicor_data::ByteOf byte_of_ = [this](uint32_t unicode) -> std::optional<uint8_t> {
+    const auto found = from_unicode_.find(unicode);
+    if (found == from_unicode_.end() || found->second.bytes != 1) return std::nullopt;
+    return static_cast<uint8_t>(found->second.packed);
+  };
 };
 
 /// UTF-8 as the library computes it: 16-bit values, so its characters have up to three bytes.

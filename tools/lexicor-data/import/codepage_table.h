@@ -22,6 +22,12 @@ struct Codepage {
   const char* aliases;    ///< blank-separated
 };
 
+/// A codepage whose source says what differs from that of another one.
+struct Sibling {
+  const char* name;
+  const char* base;
+};
+
 /// Every codepage, by ascending identifier.
 std::vector<Codepage> all_codepages();
 

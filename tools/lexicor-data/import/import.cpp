@@ -6,6 +6,7 @@
 #include <exception>
 #include <filesystem>
 #include <fstream>
+#include <map>
 #include <set>
 #include <sstream>
 #include <stdexcept>
@@ -27,6 +28,10 @@ namespace fs = std::filesystem;
 
 constexpr Codepage kCodepages[] = {
 #include "codepages.inc"
+};
+
+constexpr Sibling kSiblings[] = {
+#include "siblings.inc"
 };
 
 using lexicor_data::Control;
@@ -61,28 +66,40 @@ Control control_list(const fs::path& file, const std::vector<Codepage>& codepage
   return lexicor_data::read_control(in, file.string());
 }
 
-std::string import_text(const Codepage& codepage) {
-  Counts left_out;
-  std::ostringstream out;
-  try {
-    lexicor_data::write_ucm(out, import_codepage(codepage, left_out));
-  } catch (const std::exception& error) {
-    throw std::runtime_error(std::string(codepage.name) + ": " + error.what());
+using Tables = std::map<std::string, lexicor_data::CodepageSource>;  // by name
+
+/// The tables of all codepages; prints what they leave out.
+Tables import_tables(const std::vector<Codepage>& codepages) {
+  Tables tables;
+  for (const Codepage& codepage : codepages) {
+    Counts left_out;
+    try {
+      tables[codepage.name] = import_codepage(codepage, left_out);
+    } catch (const std::exception& error) {
+      throw std::runtime_error(std::string(codepage.name) + ": " + error.what());
+    }
+    for (const auto& [reason, count] : left_out)
+      std::printf("%s: left out: %s %zu\n", codepage.name, reason.c_str(), count);
   }
-  for (const auto& [reason, count] : left_out)
-    std::printf("%s: left out: %s %zu\n", codepage.name, reason.c_str(), count);
+  return tables;
+}
+
+std::string source_text(const Tables& tables, const Codepage& codepage) {
+  const lexicor_data::CodepageSource* base = nullptr;
+  for (const Sibling& sibling : kSiblings)
+    if (std::string(sibling.name) == codepage.name) base = &tables.at(sibling.base);
+  std::ostringstream out;
+  lexicor_data::write_ucm_source(out, tables.at(codepage.name), base);
   return out.str();
 }
 
-/// The 16-bit values that a codepage's source maps.
-std::set<char16_t> repertoire(const fs::path& directory, const std::string& codepage) {
-  const std::string file = (directory / "codepages" / (codepage + ".ucm")).string();
-  std::ifstream in(file, std::ios::binary);
+/// The 16-bit values that any codepage is written from.
+std::set<char16_t> written_values(const Tables& tables) {
   std::set<char16_t> values;
-  for (const lexicor_data::Mapping& mapping : lexicor_data::read_ucm(in, file).mappings) {
-    if (mapping.precision != 3 && mapping.unicode <= 0xFFFF)
-      values.insert(static_cast<char16_t>(mapping.unicode));
-  }
+  for (const auto& [name, table] : tables)
+    for (const lexicor_data::Mapping& mapping : table.mappings)
+      if (lexicor_data::from_unicode(mapping) && mapping.unicode <= 0xFFFF)
+        values.insert(static_cast<char16_t>(mapping.unicode));
   return values;
 }
 
@@ -112,11 +129,8 @@ void import_territories(const fs::path& directory) {
   }
 }
 
-void import_sorts(const fs::path& directory, const std::vector<Codepage>& codepages) {
-  std::set<char16_t> written;
-  // Georgian has a page of its own, for which the largest sort has no room beside its contractions.
-  for (const Codepage& codepage : codepages)
-    if (codepage.name != std::string("GEORGIAN-PS")) written.merge(repertoire(directory, codepage.name));
+void import_sorts(const fs::path& directory, const Tables& tables) {
+  const std::set<char16_t> written = written_values(tables);
   fs::create_directories(directory / "sorts");
   for (const Sort& row : kSorts) {
     Notes notes;
@@ -134,8 +148,9 @@ void import_sorts(const fs::path& directory, const std::vector<Codepage>& codepa
 void run(const fs::path& directory) {
   const std::vector<Codepage> codepages = all_codepages();
   fs::create_directories(directory / "codepages");
+  const Tables tables = import_tables(codepages);
   for (const Codepage& codepage : codepages) {
-    write_file(directory / "codepages" / (std::string(codepage.name) + ".ucm"), import_text(codepage));
+    write_file(directory / "codepages" / (std::string(codepage.name) + ".ucm"), source_text(tables, codepage));
   }
   std::ostringstream aliases;
   write_aliases(aliases, codepages);
@@ -144,7 +159,7 @@ void run(const fs::path& directory) {
   const Control control = control_list(directory / "control.txt", codepages);
   import_languages(directory, control);
   import_territories(directory);
-  import_sorts(directory, codepages);
+  import_sorts(directory, tables);
   std::ostringstream list;
   lexicor_data::write_control(list, control);
   write_file(directory / "control.txt", kControlHead + list.str());
