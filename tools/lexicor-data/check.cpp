@@ -130,11 +130,12 @@ std::vector<std::string> check_source_directory(const std::string& directory) {
   Faults faults;
   Control control;
   if (!faults.attempt([&] { control = read_source_control(directory); })) return faults.messages;
+  SortSources sorts(sort_directory(directory));
   for (const ObjectName& name : control.objects) {
-    const std::string path = directory + '/' + source_file_name(name);
     faults.attempt([&] {
+      const std::string path = source_path(directory, name);
       std::ifstream in = open(path);
-      compile_object(in, path, name, control);
+      compile_object(in, path, name, control, &sorts);
       in = open(path);
       if (name.type == ObjectType::kLanguage) check_language_sense(in, path);
       if (name.type == ObjectType::kTerritory) check_territory_sense(in, path);

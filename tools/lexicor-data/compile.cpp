@@ -18,6 +18,7 @@
 #include "line_text.h"
 #include "object_check.h"
 #include "sort_pack.h"
+#include "sort_sources.h"
 #include "sort_text.h"
 #include "territory_toml.h"
 
@@ -30,8 +31,10 @@ struct SourcePlace {
   const char* directory;
   const char* extension;
 };
-constexpr SourcePlace kSourcePlaces[format::kTypes] = {
-    {"languages", ".toml"}, {"territories", ".toml"}, {"codepages", ".ucm"}, {"sorts", ".txt"}};
+constexpr SourcePlace kSourcePlaces[format::kTypes] = {{"languages", ".toml"},
+                                                       {"territories", ".toml"},
+                                                       {"codepages", ".ucm"},
+                                                       {kSortDirectory, ".txt"}};  // or .rules
 
 bool same_mappings(const CodepageSource& a, const CodepageSource& b) {
   if (a.mappings.size() != b.mappings.size()) return false;
@@ -65,6 +68,16 @@ ObjectFile pack_source(const CodepageSource& source, const ObjectName& name, con
     throw std::logic_error(file_name + ": the packed tables do not say what the source says");
   }
   return std::move(packed.object);
+}
+
+/// A sort in rules or in weights, as the file's name says.
+SortSource read_sort_source(std::istream& in, const std::string& file_name, SortSources* sorts,
+                            CompiledObject& result) {
+  if (sorts == nullptr || std::filesystem::path(file_name).extension() != kRulesExtension)
+    return read_sort(in, file_name);
+  std::ostringstream text;
+  text << in.rdbuf();
+  return sorts->build({file_name, text.str()}, result.sort_notes);
 }
 
 ByteVector to_bytes(const std::string& text) {
@@ -126,6 +139,19 @@ void remove_unlisted(const std::string& out, const Control& control, std::ostrea
   }
 }
 
+/// The root and the rules of sorts go along: users' rules build on them.
+void add_rules(const std::string& source, const Control& control,
+               std::vector<std::pair<std::string, ByteVector>>& files) {
+  const std::string directory = std::string(kSortDirectory) + '/';
+  if (!std::filesystem::exists(source + '/' + directory + kRootFile)) return;
+  files.emplace_back(directory + kRootFile, plain_lines(source + '/' + directory + kRootFile));
+  for (const ObjectName& name : control.objects) {
+    const std::string file = directory + name.name + kRulesExtension;
+    if (name.type == ObjectType::kSort && std::filesystem::exists(source + '/' + file))
+      files.emplace_back(file, plain_lines(source + '/' + file));
+  }
+}
+
 }  // namespace
 
 std::string object_file_name(const ObjectName& name) {
@@ -140,8 +166,21 @@ std::string source_file_name(const ObjectName& name) {
   return std::string(place.directory) + '/' + name.name + place.extension;
 }
 
+std::string sort_directory(const std::string& directory) {
+  return directory + '/' + kSortDirectory;
+}
+
+std::string source_path(const std::string& directory, const ObjectName& name) {
+  const std::string path = directory + '/' + source_file_name(name);
+  if (name.type != ObjectType::kSort) return path;
+  const std::string rules = sort_directory(directory) + '/' + name.name + kRulesExtension;
+  const bool has_rules = std::filesystem::exists(rules), has_table = std::filesystem::exists(path);
+  if (has_rules && has_table) throw SourceError(path, 0, 0, "the sort has rules as well, in " + rules);
+  return has_table ? path : rules;
+}
+
 CompiledObject compile_object(std::istream& in, const std::string& file_name, const ObjectName& name,
-                              const Control& control) {
+                              const Control& control, SortSources* sorts) {
   CompiledObject result;
   ObjectFile object;
   switch (name.type) {
@@ -155,7 +194,7 @@ CompiledObject compile_object(std::istream& in, const std::string& file_name, co
       object = pack_source(read_ucm(in, file_name), name, file_name, result);
       break;
     case ObjectType::kSort:
-      object.sections = {pack_sort(read_sort(in, file_name), file_name)};
+      object.sections = {pack_sort(read_sort_source(in, file_name, sorts, result), file_name)};
       break;
   }
   object.origin = origin_of(dump_object(object, name, &control, file_name));
@@ -212,10 +251,11 @@ void compile_directory(const std::string& source, const std::string& out, const 
   }
   std::vector<std::pair<std::string, ByteVector>> files;
   std::ostringstream report;
+  SortSources sorts(sort_directory(source));
   for (const ObjectName& name : control.objects) {
-    const std::string file_name = source + '/' + source_file_name(name);
+    const std::string file_name = source_path(source, name);
     std::ifstream in = open_source(file_name);
-    CompiledObject object = compile_object(in, file_name, name, control);
+    CompiledObject object = compile_object(in, file_name, name, control, &sorts);
     if (options.verbose) {
       log << object_file_name(name) << ' ' << name.name << ':';
       for (const ByteVector& section : read_object(object.bytes, file_name).sections)
@@ -234,15 +274,22 @@ void compile_directory(const std::string& source, const std::string& out, const 
         if (options.verbose) describe(log, entry);
       }
     }
+    for (const std::string& note : object.sort_notes) {
+      report << file_name.substr(source.size() + 1) << ": " << note << '\n';
+      if (options.verbose) log << file_name << ": " << note << '\n';
+    }
     files.emplace_back(object_file_name(name), std::move(object.bytes));
   }
   files.emplace_back(format::kAliasFile, plain_lines(alias_file));
+  add_rules(source, control, files);
   // The control file comes last: until then a reader does not see the new objects.
   files.emplace_back(format::kControlFile, compile_control(control, source + "/control.txt"));
 
   std::error_code error;
-  std::filesystem::create_directories(out, error);
-  for (const auto& [name, bytes] : files) write_file(out + '/' + name, bytes);
+  for (const auto& [name, bytes] : files) {
+    std::filesystem::create_directories(std::filesystem::path(out + '/' + name).parent_path(), error);
+    write_file(out + '/' + name, bytes);
+  }
   remove_unlisted(out, control, log);
   if (!options.report_file.empty()) write_file(options.report_file, to_bytes(report.str()));
 }

@@ -7,6 +7,7 @@
 
 #include "codepage_model.h"
 #include "object_file.h"
+#include "sort_sources.h"
 #include "source_model.h"
 #include "trie_builder.h"
 
@@ -17,11 +18,12 @@ struct CompiledObject {
   std::vector<LeftOut> left_out;  ///< a codepage's characters that it does not hold
   size_t retyped_chars = 0;       ///< a codepage's characters that have the type of their row, not their own
   TypeRows type_rows = TypeRows::kExact;  ///< how a codepage's type rows are packed
+  SortNotes sort_notes;                   ///< what a sort's rules say that it does not hold
 };
 
-/// Compiles the source of the object that `control` lists as `name`.
+/// Compiles the source of the object that `control` lists as `name`. `sorts` gives a sort in rules its root.
 CompiledObject compile_object(std::istream& in, const std::string& file_name, const ObjectName& name,
-                              const Control& control);
+                              const Control& control, SortSources* sorts = nullptr);
 
 /// The control file.
 ByteVector compile_control(const Control& control, const std::string& file_name);
@@ -35,6 +37,11 @@ std::string dump_object(const ObjectFile& object, const ObjectName& name, const 
 /// ("codepages/Latin1.ucm").
 std::string object_file_name(const ObjectName& name);
 std::string source_file_name(const ObjectName& name);
+
+/// The path of an object's source: a sort has rules, or a table of weights.
+std::string source_path(const std::string& directory, const ObjectName& name);
+/// Where a source directory has the sources of sorts.
+std::string sort_directory(const std::string& directory);
 
 struct CompileOptions {
   bool verbose = false;     ///< list what is left out, and the sizes of sections

@@ -6,7 +6,6 @@
 #include <exception>
 #include <filesystem>
 #include <fstream>
-#include <set>
 #include <sstream>
 #include <stdexcept>
 
@@ -16,7 +15,9 @@
 #include "language_toml.h"
 #include "locale_import.h"
 #include "locale_table.h"
+#include "root_import.h"
 #include "sort_import.h"
+#include "sort_sources.h"
 #include "territory_toml.h"
 #include "ucm.h"
 
@@ -34,9 +35,8 @@ using lexicor_data::ObjectType;
 
 constexpr char kControlHead[] =
     "# The objects of the locale directory: type, identifier, name, by type and identifier. The sources are\n"
-    "# languages/NAME.toml, territories/NAME.toml, codepages/NAME.ucm and sorts/NAME.txt. lexicor-import "
-    "writes\n"
-    "# all of them.\n";
+    "# languages/NAME.toml, territories/NAME.toml, codepages/NAME.ucm and sorts/NAME.rules. lexicor-import\n"
+    "# writes all of them.\n";
 
 /// Leaves a file alone that holds the text already.
 void write_file(const fs::path& path, const std::string& text) {
@@ -74,18 +74,6 @@ std::string import_text(const Codepage& codepage) {
   return out.str();
 }
 
-/// The 16-bit values that a codepage's source maps.
-std::set<char16_t> repertoire(const fs::path& directory, const std::string& codepage) {
-  const std::string file = (directory / "codepages" / (codepage + ".ucm")).string();
-  std::ifstream in(file, std::ios::binary);
-  std::set<char16_t> values;
-  for (const lexicor_data::Mapping& mapping : lexicor_data::read_ucm(in, file).mappings) {
-    if (mapping.precision != 3 && mapping.unicode <= 0xFFFF)
-      values.insert(static_cast<char16_t>(mapping.unicode));
-  }
-  return values;
-}
-
 void import_languages(const fs::path& directory, const Control& control) {
   fs::create_directories(directory / "languages");
   for (const Language& row : kLanguages) {
@@ -112,20 +100,23 @@ void import_territories(const fs::path& directory) {
   }
 }
 
-void import_sorts(const fs::path& directory, const std::vector<Codepage>& codepages) {
-  std::set<char16_t> written;
-  for (const Codepage& codepage : codepages) written.merge(repertoire(directory, codepage.name));
+void import_sorts(const fs::path& directory) {
   fs::create_directories(directory / "sorts");
+  const lexicor_data::SortRoot root = import_root();
+  std::ostringstream text;
+  lexicor_data::write_root(text, root);
+  write_file(directory / "sorts" / lexicor_data::kRootFile, source_comment("root") + text.str());
   for (const Sort& row : kSorts) {
     Notes notes;
-    std::ostringstream out;
+    std::string rules;
     try {
-      lexicor_data::write_sort(out, import_sort(row, written, notes));
+      rules = import_rules(row, root, notes);
     } catch (const std::exception& error) {
       throw std::runtime_error(std::string(row.name) + ": " + error.what());
     }
     for (const std::string& note : notes) std::printf("%s: %s\n", row.name, note.c_str());
-    write_file(directory / "sorts" / (std::string(row.name) + ".txt"), source_comment(row.locale) + out.str());
+    write_file(directory / "sorts" / (row.name + std::string(lexicor_data::kRulesExtension)),
+               source_comment(row.locale) + rules);
   }
 }
 
@@ -142,7 +133,7 @@ void run(const fs::path& directory) {
   const Control control = control_list(directory / "control.txt", codepages);
   import_languages(directory, control);
   import_territories(directory);
-  import_sorts(directory, codepages);
+  import_sorts(directory);
   std::ostringstream list;
   lexicor_data::write_control(list, control);
   write_file(directory / "control.txt", kControlHead + list.str());
