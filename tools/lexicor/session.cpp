@@ -78,6 +78,10 @@ std::string reason_of_defaults(const char* directory) {
 
 }  // namespace
 
+std::string session_directory() {
+  return g_directory.empty() ? found_directory() : g_directory;
+}
+
 std::string describe_code(int code) {
   static const struct {
     int code;
@@ -107,7 +111,7 @@ std::string load_problem(int type, const std::string& title, const std::string& 
   std::string text =
       title + " " + name + " cannot be loaded: " + describe_code(code) + " (code " + std::to_string(code) + ")";
   if (object == nullptr) return text;
-  const std::string directory = g_directory.empty() ? found_directory() : g_directory;
+  const std::string directory = session_directory();
   std::vector<char> file(directory.size() + 32);
   const uint16_t id = reinterpret_cast<const LXObjDisk*>(object)->id;
   LXGetDataFileName(directory.c_str(), type, id, file.data(), static_cast<int32_t>(file.size()));

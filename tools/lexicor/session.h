@@ -24,6 +24,9 @@ class Session {
   bool built_in_only_ = false;
 };
 
+/// The locale directory of the session.
+std::string session_directory();
+
 /// What a return code of the library means.
 std::string describe_code(int code);
 
