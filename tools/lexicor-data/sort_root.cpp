@@ -216,7 +216,9 @@ struct RootLine {
 void SortRoot::settle() {
   settle_uses();
   settle_syllables();
+  for (unsigned i = 0; i < kSyllableCount; ++i) decomposes_.set(kFirstSyllable + i);
   for (const auto& [composed, text] : decompositions) {
+    decomposes_.set(composed);
     compositions_[text].push_back(composed);
     compositions_from_[text[0]].push_back(composed);
   }

@@ -93,6 +93,7 @@ class SortRoot {
 
   bool is_ideograph(unsigned code) const;
   bool is_computed(unsigned code) const;  ///< or an ideograph or a syllable
+  bool decomposes(char16_t unit) const { return decomposes_[unit]; }
   std::u16string decomposition(char16_t unit) const;
   std::u16string decomposed(const std::u16string& text) const;
   /// Characters whose decomposition is the text.
@@ -108,6 +109,7 @@ class SortRoot {
   void settle_syllables();
 
   std::vector<std::vector<Use>> uses_;  ///< by primary weight, in order
+  std::bitset<kCharacters> decomposes_;
   std::map<std::u16string, std::vector<char16_t>> compositions_;
   std::map<char16_t, std::vector<char16_t>> compositions_from_;
   std::map<uint32_t, unsigned>

@@ -448,7 +448,7 @@ void SortTailoring::map(const SortRule& rule, const std::u16string& text, Collat
 // Elements.
 
 CollationElements SortTailoring::single(char16_t unit, bool tailored) const {
-  if (tailored) {
+  if (tailored && changed_[unit]) {
     const auto found = characters_.find(unit);
     if (found != characters_.end()) return found->second;
   }
@@ -507,6 +507,7 @@ CollationElements SortTailoring::elements(char16_t unit) const {
   const auto pinned = pinned_.find(unit);
   if (pinned != pinned_.end()) return pinned->second;
   if (changed_.none()) return root_.characters[unit];
+  if (!root_.decomposes(unit)) return single(unit, changed_[unit]);
   const std::u16string text = root_.decomposition(unit);
   const bool changed = std::any_of(text.begin(), text.end(), [&](char16_t part) { return changed_[part]; });
   return changed ? walk(text, true) : root_.characters[unit];
