@@ -160,12 +160,13 @@ SourceErrors check_source_directory(const std::string& directory, std::ostream& 
   SourceErrors errors;
   Control control;
   if (!errors.attempt([&] { control = read_source_control(directory); })) return errors;
+  SortSources sorts(sort_directory(directory));
   std::set<std::string> used;
   std::mutex used_lock;
   check_all(control, errors, [&](const ObjectName& name) {
     const std::string path = source_path(directory, name);
     std::ifstream in = open(path);
-    const CompiledObject object = compile_object(in, path, name, control);
+    const CompiledObject object = compile_object(in, path, name, control, &sorts);
     {
       const std::lock_guard<std::mutex> guard(used_lock);
       used.insert(path);

@@ -3,6 +3,7 @@
 #include "compile.h"
 
 #include <cstdio>
+#include <filesystem>
 #include <iterator>
 #include <ostream>
 #include <sstream>
@@ -15,6 +16,7 @@
 #include "line_text.h"
 #include "object_check.h"
 #include "sort_pack.h"
+#include "sort_sources.h"
 #include "sort_text.h"
 #include "territory_toml.h"
 
@@ -27,8 +29,10 @@ struct SourcePlace {
   const char* directory;
   const char* extension;
 };
-constexpr SourcePlace kSourcePlaces[format::kTypes] = {
-    {"languages", ".toml"}, {"territories", ".toml"}, {"codepages", ".ucm"}, {"sorts", ".txt"}};
+constexpr SourcePlace kSourcePlaces[format::kTypes] = {{"languages", ".toml"},
+                                                       {"territories", ".toml"},
+                                                       {"codepages", ".ucm"},
+                                                       {kSortDirectory, ".txt"}};  // or .rules
 
 bool same_mappings(const CodepageSource& a, const CodepageSource& b) {
   if (a.mappings.size() != b.mappings.size()) return false;
@@ -75,6 +79,15 @@ void write_codepage(std::ostream& out, const ObjectFile& object, const ObjectNam
   write_ucm(out, source);
 }
 
+/// A sort in rules or in weights, as the file's name says.
+SortSource read_sort_source(const std::string& text, const std::string& file_name, SortSources* sorts,
+                            CompiledObject& result) {
+  if (sorts != nullptr && std::filesystem::path(file_name).extension() == kRulesExtension)
+    return sorts->build({file_name, text}, result.sort_notes, &result.bases);
+  std::istringstream in(text);
+  return read_sort(in, file_name);
+}
+
 /// The first line of a text source, when it is a comment: it says where the facts come from.
 std::string first_comment(const std::string& text) {
   std::istringstream in(text);
@@ -101,7 +114,12 @@ std::vector<std::string> source_folders() {
 }
 
 std::string source_path(const std::string& directory, const ObjectName& name) {
-  return directory + '/' + source_file_name(name);
+  const std::string path = directory + '/' + source_file_name(name);
+  if (name.type != ObjectType::kSort) return path;
+  const std::string rules = sort_directory(directory) + '/' + name.name + kRulesExtension;
+  const bool has_rules = std::filesystem::exists(rules), has_table = std::filesystem::exists(path);
+  if (has_rules && has_table) throw SourceError(path, 0, 0, "the sort has rules as well, in " + rules);
+  return has_table ? path : rules;
 }
 
 std::string source_file_name(const ObjectName& name) {
@@ -109,8 +127,12 @@ std::string source_file_name(const ObjectName& name) {
   return std::string(place.directory) + '/' + name.name + place.extension;
 }
 
+std::string sort_directory(const std::string& directory) {
+  return directory + '/' + kSortDirectory;
+}
+
 CompiledObject compile_object(std::istream& stream, const std::string& file_name, const ObjectName& name,
-                              const Control& control) {
+                              const Control& control, SortSources* sorts) {
   const std::string text{std::istreambuf_iterator<char>(stream), std::istreambuf_iterator<char>()};
   if (stream.bad()) throw SourceError(file_name, 0, 0, "cannot be read");
   std::istringstream in(text);
@@ -127,7 +149,7 @@ CompiledObject compile_object(std::istream& stream, const std::string& file_name
       object = pack_source(read_ucm(in, file_name), name, file_name, result);
       break;
     case ObjectType::kSort:
-      object.sections = {pack_sort(read_sort(in, file_name), file_name)};
+      object.sections = {pack_sort(read_sort_source(text, file_name, sorts, result), file_name)};
       break;
   }
   if (name.type != ObjectType::kCodepage) {

@@ -7,6 +7,7 @@
 
 #include "codepage_model.h"
 #include "object_file.h"
+#include "sort_sources.h"
 #include "source_model.h"
 #include "trie_builder.h"
 
@@ -19,11 +20,13 @@ struct CompiledObject {
   std::vector<std::string> warnings;      ///< what was passed over in the source
   std::vector<std::string> bases;         ///< the files that it was made of beside its source
   TypeRows type_rows = TypeRows::kExact;  ///< how a codepage's type rows are packed
+  SortNotes sort_notes;                   ///< what a sort's rules say that it does not hold
 };
 
-/// Compiles the source of the object that `control` lists as `name`.
+/// Compiles the source of the object that `control` lists as `name`. `sorts` gives a sort in rules its root; several
+/// threads may share it.
 CompiledObject compile_object(std::istream& stream, const std::string& file_name, const ObjectName& name,
-                              const Control& control);
+                              const Control& control, SortSources* sorts = nullptr);
 
 /// The control file.
 ByteVector compile_control(const Control& control, const std::string& file_name);
@@ -38,8 +41,10 @@ std::string dump_object(const ObjectFile& object, const ObjectName& name, const 
 std::string object_file_name(const ObjectName& name);
 std::string source_file_name(const ObjectName& name);
 
-/// The path of an object's source.
+/// The path of an object's source: a sort has rules, or a table of weights.
 std::string source_path(const std::string& directory, const ObjectName& name);
+/// Where a source directory has the sources of sorts.
+std::string sort_directory(const std::string& directory);
 
 /// The folders of a source directory that hold sources of objects.
 std::vector<std::string> source_folders();

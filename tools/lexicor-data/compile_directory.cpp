@@ -17,6 +17,7 @@
 #include "line_text.h"
 #include "object_check.h"
 #include "parallel.h"
+#include "sort_sources.h"
 
 namespace lexicor_data {
 namespace {
@@ -58,6 +59,19 @@ class SourceDigests {
   std::map<std::string, std::string> digests_;
 };
 
+/// The root and the rules of sorts go along: users' rules build on them.
+void add_rules(const std::string& source, const Control& control,
+               std::vector<std::pair<std::string, ByteVector>>& files) {
+  const std::string directory = std::string(kSortDirectory) + '/';
+  if (!std::filesystem::exists(source + '/' + directory + kRootFile)) return;
+  files.emplace_back(directory + kRootFile, plain_lines(source + '/' + directory + kRootFile));
+  for (const ObjectName& name : control.objects) {
+    const std::string file = directory + name.name + kRulesExtension;
+    if (name.type == ObjectType::kSort && std::filesystem::exists(source + '/' + file))
+      files.emplace_back(file, plain_lines(source + '/' + file));
+  }
+}
+
 void describe(std::ostream& out, const LeftOut& left_out) {
   out << "  <U" << lexicor_cli::hex_text(left_out.mapping.unicode, 4) << "> "
       << lexicor_cli::hex_text(left_out.mapping.code, 2 * left_out.mapping.bytes) << " |"
@@ -87,7 +101,8 @@ class DirectoryCompiler {
  public:
   DirectoryCompiler(const std::string& source, const std::string& out, const CompileOptions& options,
                     std::ostream& log)
-      : source_(source), out_(out), options_(options), log_(log), digests_(source) {}
+      : source_(source), out_(out), options_(options), log_(log), digests_(source),
+        sorts_(sort_directory(source)) {}
 
   void run() {
     control_ = read_source_control(source_);
@@ -160,10 +175,10 @@ class DirectoryCompiler {
 
   // -- compiling ----------------------------------------------------------------------------------------------
 
-  CompiledObject compile(const ObjectName& name) const {
+  CompiledObject compile(const ObjectName& name) {
     const std::string file = source_path(source_, name);
     std::ifstream in = open_source(file);
-    return compile_object(in, file, name, control_);
+    return compile_object(in, file, name, control_, &sorts_);
   }
 
   /// Notes name files by their paths in the source directory, so that they are the same wherever it stands.
@@ -197,6 +212,8 @@ class DirectoryCompiler {
       for (const std::string& note : made.entry.notes) log_ << source_ << '/' << note << '\n';
       for (const LeftOut& entry : made.object.left_out)
         if (options_.verbose) describe(log_, entry);
+      for (const std::string& note : made.object.sort_notes)
+        if (options_.verbose) log_ << source_path(source_, made.entry.name) << ": " << note << '\n';
       for (const auto& [path, digest] : made.entry.sources) used.insert(path);
     }
     say_unused(source_, log_, [&](const std::string& file) { return used.count(file) != 0; });
@@ -212,6 +229,8 @@ class DirectoryCompiler {
   ByteVector report() const {
     std::ostringstream text;
     for (const Made& made : made_) {
+      for (const std::string& note : made.object.sort_notes)
+        text << in_source(source_path(source_, made.entry.name)) << ": " << note << '\n';
       if (made.object.left_out.empty()) continue;
       text << source_file_name(made.entry.name) << ": " << count_left_out(made.object.left_out) << '\n';
       for (const LeftOut& entry : made.object.left_out) describe(text, entry);
@@ -230,6 +249,7 @@ class DirectoryCompiler {
       files.emplace_back(made.entry.file, std::move(made.object.bytes));
     }
     files.emplace_back(format::kAliasFile, plain_lines(alias_file()));
+    add_rules(source_, control_, files);
     write_directory(out_, files, manifest, compile_control(control_, source_ + '/' + kControlSource));
     if (!options_.report_file.empty()) write_file(options_.report_file, report());
   }
@@ -240,6 +260,7 @@ class DirectoryCompiler {
   std::ostream& log_;
   Control control_;
   SourceDigests digests_;
+  SortSources sorts_;
   std::vector<Made> made_;  ///< in the order of control_
 };
 
@@ -295,9 +316,9 @@ void remove_unlisted(const std::string& out, const Control& control, std::ostrea
 void write_directory(const std::string& out, const std::vector<std::pair<std::string, ByteVector>>& files,
                      const Manifest& manifest, const ByteVector& control) {
   std::error_code error;
-  fs::create_directories(out, error);
   Manifest complete = manifest;
   for (const auto& [name, bytes] : files) {
+    fs::create_directories(fs::path(out + '/' + name).parent_path(), error);
     if (!holds_bytes(out + '/' + name, bytes)) write_file(out + '/' + name, bytes);
     const bool is_object = fs::path(name).extension() == format::kDataExtension;
     if (!is_object) complete.files[name] = digest_text(digest_of_bytes(bytes));

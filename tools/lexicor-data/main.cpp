@@ -6,6 +6,8 @@
 #include <filesystem>
 #include <fstream>
 #include <iostream>
+#include <optional>
+#include <sstream>
 #include <string>
 
 #include "check.h"
@@ -16,6 +18,10 @@
 #include "lexicor/command.h"
 #include "lexicor/descriptors.h"
 #include "lexicor/output.h"
+#include "object_check.h"
+#include "sort_explain.h"
+#include "sort_pack.h"
+#include "sort_sources.h"
 #include "subset.h"
 
 namespace {
@@ -64,6 +70,40 @@ void dump(const std::string& path, std::string control_file) {
   }
   const ObjectFile object = read_object(read_file(path), path);
   std::cout << dump_object(object, name, control_file.empty() ? nullptr : &control, path);
+}
+
+/// A sort from its object, its rules or its weights, as the file's name says.
+SortSource read_any_sort(const std::string& path, std::optional<SortSources>& sources) {
+  const fs::path extension = fs::path(path).extension();
+  const ByteVector bytes = read_file(path);
+  if (extension == lx::format::kDataExtension) {
+    const ObjectFile object = read_object(bytes, path);
+    const ObjectName name = parse_object_file_name(path);
+    if (name.type != ObjectType::kSort) throw SourceError(path, 0, 0, "is no sort");
+    check_object(object, name, path);
+    return unpack_sort(object.sections[0]);
+  }
+  const std::string text(bytes.begin(), bytes.end());
+  if (extension == kRulesExtension) {
+    if (!sources) throw SourceError(path, 0, 0, std::string("there is no ") + kRootFile + " beside it");
+    SortNotes notes;
+    return sources->build({path, text}, notes);
+  }
+  std::istringstream in(text);
+  return read_sort(in, path);
+}
+
+void explain_sort(const std::string& from, const std::string& to) {
+  // The root lies beside rules, and in a directory of its own beside objects.
+  std::optional<SortSources> sources;
+  for (const std::string& path : {to, from}) {
+    const fs::path directory = fs::absolute(path).parent_path();
+    for (const fs::path& place : {directory, directory / kSortDirectory}) {
+      if (!sources && fs::exists(place / kRootFile)) sources.emplace(place.string());
+    }
+  }
+  const SortSource before = read_any_sort(from, sources), behind = read_any_sort(to, sources);
+  explain_sorts(std::cout, before, behind, sources ? &sources->root() : nullptr);
 }
 
 int check(const std::string& directory) {
@@ -122,11 +162,20 @@ int main(int argc, char** argv) {
       "\n"
       "Example:\n"
       "  lexicor-data subset locale small --locale Swedish_Sweden German.Latin1 --codepage IBM930 sjis");
+  std::string from, to;
+  auto explain_command =
+      line.add_subcommand("explain-sort", "Show in rules where a sort differs from another one");
+  explain_command
+      .add_option("FROM", from,
+                  "a sort: so_NNNNN.nls, NAME.txt, or NAME.rules where either lies beside root.txt")
+      .required();
+  explain_command.add_option("TO", to, "the sort that the rules make of it").required();
 
   try {
     if (!line.parse(argc, argv)) return kDone;
     if (compile_command.given()) compile_directory(source, out, options, std::cerr);
     if (dump_command.given()) dump(file, control_file);
+    if (explain_command.given()) explain_sort(from, to);
     if (check_command.given()) return check(directory);
     if (subset_command.given()) make_subset(directory, out, subset, std::cout, std::cerr);
     std::cout.flush();

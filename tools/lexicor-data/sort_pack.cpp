@@ -96,7 +96,7 @@ ByteVector pack_sort(const SortSource& sort, const std::string& file_name) {
 
   const size_t bytes = layout::kFixedBytes + weights.size() + expansions.size() + contractions.size();
   if (bytes > lx::format::kMaxSectionBytes) {
-    throw SourceError(file_name, 0, 0,
+    throw SourceError(file_name, sort.size_place.line, sort.size_place.column,
                       "the payload takes " + std::to_string(bytes) + " bytes, more than 65535: weights " +
                           std::to_string(weights.size()) + ", expansions " + std::to_string(expansions.size()) +
                           ", contractions " + std::to_string(contractions.size()));

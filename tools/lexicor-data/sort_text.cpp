@@ -3,17 +3,14 @@
 #include "sort_text.h"
 
 #include <algorithm>
-#include <cctype>
 #include <istream>
 #include <ostream>
 #include <set>
 #include <tuple>
 #include <vector>
 
-#include "lexicor/hex.h"
-#include "line_text.h"
 #include "sort_check.h"
-#include "ucm.h"
+#include "sort_line.h"
 
 namespace lexicor_data {
 namespace {
@@ -32,101 +29,11 @@ constexpr LevelName kLevels[] = {
 };
 constexpr const char* kNoLevels = "none";
 
-std::string hex(unsigned value) {
-  return lexicor_cli::hex_text(value, 4);
-}
-
-bool is_surrogate(unsigned code) {
-  return code >= 0xD800 && code <= 0xDFFF;
-}
-
-/// A position in one line, without its comment. Every take skips the blanks before it.
-class Line {
- public:
-  Line(const std::string& file, std::string text, int number)
-      : file_(file), text_(std::move(text)), number_(number) {
-    text_.resize(std::min(text_.find('#'), text_.size()));
-    while (!text_.empty() && is_blank(text_.back())) text_.pop_back();
-  }
-
-  bool done() {
-    skip_blanks();
-    return at_ >= text_.size();
-  }
-  char peek() {
-    skip_blanks();
-    return at_ < text_.size() ? text_[at_] : '\0';
-  }
-  SortPlace here() {
-    skip_blanks();
-    return {number_, static_cast<int>(at_) + 1};
-  }
-
-  [[noreturn]] void fail(SortPlace where, const std::string& what) const {
-    throw SourceError(file_, where.line, where.column, what);
-  }
-  [[noreturn]] void fail_expected(const std::string& expected) {
-    std::string found = "the end of the line";
-    if (!done()) {
-      const size_t end = std::min(text_.find_first_of(" \t", at_), text_.size());
-      found = "'" + text_.substr(at_, end - at_) + "'";
-    }
-    fail(here(), "found " + found + ", expected " + expected);
-  }
-
-  bool take(const std::string& text) {
-    skip_blanks();
-    if (text_.compare(at_, text.size(), text) != 0) return false;
-    at_ += text.size();
-    return true;
-  }
-  void expect(const std::string& text) {
-    if (!take(text)) fail_expected("'" + text + "'");
-  }
-  void expect_end() {
-    if (!done()) fail_expected("the end of the line");
-  }
-  /// Letters, digits and underscores; empty when there is none.
-  std::string word() {
-    skip_blanks();
-    const size_t start = at_;
-    while (at_ < text_.size() && (std::isalnum(static_cast<unsigned char>(text_[at_])) || text_[at_] == '_'))
-      ++at_;
-    return text_.substr(start, at_ - start);
-  }
-  /// 4 to 6 hexadecimal digits, a value up to `most`.
-  unsigned number(unsigned most, const std::string& what) {
-    const SortPlace start = here();
-    unsigned value = 0;
-    int digits = 0;
-    for (; digits < 6 && at_ < text_.size() && hex_value(text_[at_]) >= 0; ++digits)
-      value = value << 4 | static_cast<unsigned>(hex_value(text_[at_++]));
-    if (digits == 0) fail_expected(what);
-    if (digits < 4) fail(start, what + " has 4 hexadecimal digits");
-    if (value > most) fail(start, what + " is above " + hex(most));
-    return value;
-  }
-
- private:
-  void skip_blanks() {
-    while (at_ < text_.size() && is_blank(text_[at_])) ++at_;
-  }
-
-  const std::string& file_;
-  std::string text_;
-  int number_;
-  size_t at_ = 0;
-};
-
-struct Range {
-  unsigned first = 0, last = 0;
-};
-
 /// A directive that says which weights go ahead of the run.
 struct Insertion {
   SortPlace place;
   uint8_t char_class = kAppendAll;
-  Range range;
+  SortLine::Range range;
   bool contraction = false;  ///< the range's ends are the two characters
 };
 
@@ -137,7 +44,7 @@ class SortReader {
   SortSource read() {
     std::string text;
     while (next_line(in_, &text, &line_)) {
-      Line line(file_, std::move(text), line_);
+      SortLine line(file_, std::move(text), line_);
       if (line.done()) continue;
       if (line.take("@"))
         read_directive(line);
@@ -154,7 +61,7 @@ class SortReader {
   }
 
  private:
-  void read_directive(Line& line) {
+  void read_directive(SortLine& line) {
     const SortPlace start{line_, line.here().column - 1};
     const std::string name = line.word();
     if (name == "defaults") {
@@ -176,18 +83,9 @@ class SortReader {
     line.expect_end();
   }
 
-  Range read_range(Line& line) {
-    Range range;
+  void read_pages(SortLine& line, SortPageKind kind) {
     const SortPlace start = line.here();
-    range.first = range.last = line.number(0xFFFF, "a code point");
-    if (line.take("..")) range.last = line.number(0xFFFF, "a code point");
-    if (range.last < range.first) line.fail(start, "the range runs backwards");
-    return range;
-  }
-
-  void read_pages(Line& line, SortPageKind kind) {
-    const SortPlace start = line.here();
-    const Range range = read_range(line);
+    const SortLine::Range range = line.range();
     if (range.first % 256 != 0 || range.last % 256 != 255)
       line.fail(start, "the range is not one of whole pages");
     SortPlace place = start;
@@ -201,7 +99,7 @@ class SortReader {
     }
     for (unsigned first = range.first; first < range.last; first += 256) {
       SortPage& page = sort_.pages[first >> 8];
-      if (named_[first >> 8]) line.fail(start, "page " + hex(first) + ": " + already(page.place));
+      if (named_[first >> 8]) line.fail(start, "page " + hex4(first) + ": " + already(page.place));
       named_[first >> 8] = true;
       page.kind = kind;
       page.base = static_cast<uint16_t>(base + (first - range.first));
@@ -209,7 +107,7 @@ class SortReader {
     }
   }
 
-  void read_insertion(Line& line, SortPlace start) {
+  void read_insertion(SortLine& line, SortPlace start) {
     Insertion insertion;
     insertion.place = line.here();
     if (!line.take(kNoLevels)) {
@@ -231,7 +129,7 @@ class SortReader {
     }
     line.expect(";");
     insertion.place = line.here();
-    insertion.range = read_range(line);
+    insertion.range = line.range();
     if (!line.done() && insertion.range.first == insertion.range.last) {
       insertion.contraction = true;
       insertion.range.last = line.number(0xFFFF, "a code point");
@@ -239,20 +137,12 @@ class SortReader {
     insertions_.push_back(insertion);
   }
 
-  char16_t read_character(Line& line) {
+  void read_element(SortLine& line) {
     const SortPlace start = line.here();
-    const unsigned code = line.number(0x10FFFF, "a code point");
-    if (code > 0xFFFF) line.fail(start, "a sort holds code points up to FFFF");
-    if (is_surrogate(code)) line.fail(start, "a surrogate is no character");
-    return static_cast<char16_t>(code);
-  }
-
-  void read_element(Line& line) {
-    const SortPlace start = line.here();
-    const char16_t first = read_character(line);
+    const char16_t first = line.character();
     char16_t second = 0;
     const bool contraction = line.peek() != ';';
-    if (contraction) second = read_character(line);
+    if (contraction) second = line.character();
     if (line.peek() != ';' && hex_value(line.peek()) >= 0)
       line.fail(line.here(), "a contraction has two characters");
     line.expect(";");
@@ -278,7 +168,7 @@ class SortReader {
   }
 
   /// [.0000.0000.0000] or [*0000.0000.0000].
-  SortSet read_set(Line& line) {
+  SortSet read_set(SortLine& line) {
     SortSet set;
     line.expect("[");
     const bool special = line.take("*");
@@ -304,7 +194,7 @@ class SortReader {
       if (listed_.count(static_cast<uint8_t>(number)) == 0) {
         throw SourceError(
             file_, line_ + 1, 1,
-            "page " + hex(number << 8) + " has no line; name it with @uncovered or another directive");
+            "page " + hex4(number << 8) + " has no line; name it with @uncovered or another directive");
       }
       page.kind = SortPageKind::kTable;
     }
@@ -333,7 +223,7 @@ class SortReader {
   }
 
   bool insert_range(const Insertion& insertion) {
-    const Range& range = insertion.range;
+    const SortLine::Range& range = insertion.range;
     bool used = false;
     auto entry = sort_.characters.lower_bound(static_cast<char16_t>(range.first));
     for (; entry != sort_.characters.end() && entry->first <= range.last; ++entry) {
@@ -345,7 +235,7 @@ class SortReader {
       if (!page.computed()) continue;
       if (range.first > number << 8 || range.last < (number << 8 | 0xFF)) {
         throw SourceError(file_, insertion.place.line, insertion.place.column,
-                          "the range holds only a part of computed page " + hex(number << 8));
+                          "the range holds only a part of computed page " + hex4(number << 8));
       }
       page.char_class = insertion.char_class;
       used = true;
@@ -376,37 +266,12 @@ std::string class_text(uint8_t char_class) {
   return text.empty() ? kNoLevels : text;
 }
 
-std::string range_text(unsigned first, unsigned last) {
-  return first == last ? hex(first) : hex(first) + ".." + hex(last);
-}
-
-/// The character as a comment, where a text file shows it well.
-std::string comment(char16_t unit) {
-  const bool invisible = unit <= 0x20 || (unit >= 0x7F && unit <= 0xA0) || unit == 0xAD || unit == 0x61C ||
-                         (unit >= 0x2000 && unit <= 0x200F) || (unit >= 0x2028 && unit <= 0x202F) ||
-                         (unit >= 0x205F && unit <= 0x206F) || unit == 0x3000 || unit == 0xFEFF ||
-                         unit >= 0xFFF0;
-  if (invisible) return "";
-  std::string text;
-  if (unit < 0x80) {
-    text += static_cast<char>(unit);
-  } else if (unit < 0x800) {
-    text += static_cast<char>(0xC0 | unit >> 6);
-    text += static_cast<char>(0x80 | (unit & 0x3F));
-  } else {
-    text += static_cast<char>(0xE0 | unit >> 12);
-    text += static_cast<char>(0x80 | (unit >> 6 & 0x3F));
-    text += static_cast<char>(0x80 | (unit & 0x3F));
-  }
-  return text;
-}
-
 std::string sets_text(const SortElement& element) {
   std::string text;
   for (size_t i = 0; i < element.count; ++i) {
     const SortSet& set = element.sets[i];
-    text += set.special != 0 ? "[*" + hex(set.special) : "[." + hex(set.primary);
-    text += "." + hex(set.secondary) + "." + hex(set.tertiary) + "]";
+    text += set.special != 0 ? "[*" + hex4(set.special) : "[." + hex4(set.primary);
+    text += "." + hex4(set.secondary) + "." + hex4(set.tertiary) + "]";
   }
   return text;
 }
@@ -446,7 +311,7 @@ void write_pages(std::ostream& out, const SortSource& sort) {
     }
     if (page.kind != SortPageKind::kTable) {
       out << kNames[static_cast<size_t>(page.kind)] << range_text(first << 8, (end << 8) - 1);
-      if (page.computed()) out << " ; " << hex(page.base);
+      if (page.computed()) out << " ; " << hex4(page.base);
       out << '\n';
     }
     first = end;
@@ -486,7 +351,7 @@ void write_insertions(std::ostream& out, const SortSource& sort) {
   }
   for (const auto& [pair, element] : sort.contractions) {
     if (element.char_class == usual) continue;
-    out << "@insert " << class_text(element.char_class) << " ; " << hex(pair.first) << ' ' << hex(pair.second)
+    out << "@insert " << class_text(element.char_class) << " ; " << hex4(pair.first) << ' ' << hex4(pair.second)
         << '\n';
   }
 }
@@ -504,7 +369,7 @@ SortSource read_sort(std::istream& in, const std::string& file_name) {
 }
 
 void write_sort(std::ostream& out, const SortSource& sort) {
-  out << "@defaults " << hex(sort.default_secondary) << ' ' << hex(sort.default_tertiary) << '\n';
+  out << "@defaults " << hex4(sort.default_secondary) << ' ' << hex4(sort.default_tertiary) << '\n';
   write_insertions(out, sort);
   write_pages(out, sort);
   std::set<unsigned> empty;
@@ -512,13 +377,13 @@ void write_sort(std::ostream& out, const SortSource& sort) {
     if (sort.pages[number].kind == SortPageKind::kTable) empty.insert(number);
   }
   for (const auto& entry : sort.characters) empty.erase(entry.first >> 8);
-  for (unsigned number : empty) out << hex(number << 8) << " ; [.0000.0000.0000]\n";
+  for (unsigned number : empty) out << hex4(number << 8) << " ; [.0000.0000.0000]\n";
   for (const Entry& entry : entries_of(sort)) {
-    out << hex(entry.first);
-    std::string shown = comment(entry.first);
+    out << hex4(entry.first);
+    std::string shown = visible_text(entry.first);
     if (entry.contraction) {
-      out << ' ' << hex(entry.second);
-      const std::string second = comment(entry.second);
+      out << ' ' << hex4(entry.second);
+      const std::string second = visible_text(entry.second);
       if (shown.empty() || second.empty())
         shown.clear();
       else

@@ -73,7 +73,7 @@ struct SortPage {
 
 struct SortSource {
   uint8_t default_secondary = 0, default_tertiary = 0;
-  SortPlace defaults_place;
+  SortPlace defaults_place, size_place;  ///< size_place: of the last rule that adds weights
   std::array<SortPage, 256> pages{};
   std::map<char16_t, SortElement> characters;  ///< of table pages; without weights: none
   std::map<std::pair<char16_t, char16_t>, SortElement> contractions;

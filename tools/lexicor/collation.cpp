@@ -24,12 +24,15 @@ int32_t length_of(std::string_view text) {
 
 }  // namespace
 
-Collation::Collation(const Session& session, const std::string& locale_name, const std::string& codepage)
-    : Collation(session, open_chosen_locale(locale_name), codepage) {}
+Collation::Collation(RulesSession& session, const std::string& locale_name, const std::string& codepage)
+    : Collation(session, open_chosen_locale(locale_name), codepage, session.sort_id()) {
+  session.discard_directory();
+}
 
-Collation::Collation(const Session& session, const LocalePtr& named, const std::string& codepage)
+Collation::Collation(const Session& session, const LocalePtr& named, const std::string& codepage,
+                     std::optional<uint16_t> sort_id)
     : codepage_(session, read_catalogue(), codepage, language_territory(named.get())) {
-  const int32_t id = number_item(named.get(), LX_ITEM_SORT_ID).value_or(0);
+  const int32_t id = sort_id ? *sort_id : number_item(named.get(), LX_ITEM_SORT_ID).value_or(0);
   int32_t code = LX_OK;
   sort_ = LXGetObjFromID(nullptr, LX_SORT, static_cast<uint16_t>(id), LX_FIND_AND_LOAD, &code);
   if (code == LX_OK && LXSetLocaleNumInfo(codepage_.locale(), LX_ITEM_SORT_ID, id) == 0)

@@ -13,15 +13,16 @@
 
 #include "codepage.h"
 #include "locale.h"
-#include "session.h"
+#include "rules.h"
 
 namespace lexicor_cli {
 
 /// Texts begin in the single-byte state. `options` are those of LXStrxfrm.
 class Collation {
  public:
-  /// `locale_name` empty: the user's locale. Throws a Failure that says what is not there.
-  Collation(const Session& session, const std::string& locale_name, const std::string& codepage = "UTF-8");
+  /// `locale_name` empty: the user's locale. The sort of rules stands instead of the locale's. Throws a Failure that
+  /// says what is not there.
+  Collation(RulesSession& session, const std::string& locale_name, const std::string& codepage = "UTF-8");
 
   const Codepage& codepage() const { return codepage_; }
   /// Binary order has no weights.
@@ -38,7 +39,8 @@ class Collation {
   void check_argument(const std::string& text) const;
 
  private:
-  Collation(const Session& session, const LocalePtr& named, const std::string& codepage);
+  Collation(const Session& session, const LocalePtr& named, const std::string& codepage,
+            std::optional<uint16_t> sort_id);
 
   /// The text that was compared last on one side, with its key: merging holds one side while the other moves
   /// on.

@@ -15,6 +15,7 @@ namespace {
 
 struct CompareOptions {
   std::string locale;  // empty: the user's
+  std::string rules;   // a file; empty: the locale's sort
   bool ignore_case = false;
   bool ignore_width = false;
   std::string text1, text2;
@@ -25,7 +26,7 @@ struct CompareOptions {
 };
 
 int compare(const CompareOptions& options, const CommonOptions& common) {
-  const Session session(common);
+  RulesSession session(common, options.rules);
   Collation collation(session, options.locale);
   collation.check_argument(options.text1);
   collation.check_argument(options.text2);
@@ -73,7 +74,7 @@ class KeyText {
 };
 
 int show_key(const CompareOptions& options, const CommonOptions& common) {
-  const Session session(common);
+  RulesSession session(common, options.rules);
   Collation collation(session, options.locale);
   collation.check_argument(options.text1);
   std::string key;
@@ -85,6 +86,7 @@ int show_key(const CompareOptions& options, const CommonOptions& common) {
 void declare_order(Arguments& command, CompareOptions& options) {
   command.add_option("--locale", options.locale, "locale whose sort is used; else the user's locale")
       .type_name("LOCALE");
+  add_rules_option(command, options.rules);
   const Arguments::Option ignore_case =
       command.add_flag("--case-insensitive", options.ignore_case, "letter case does not count");
   command

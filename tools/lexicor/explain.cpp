@@ -21,6 +21,7 @@ namespace {
 
 struct ExplainOptions {
   std::string locale;  // empty: the user's
+  std::string rules;   // a file; empty: the locale's sort
   std::string text1, text2;
 };
 
@@ -235,7 +236,7 @@ std::string write_levels(std::ostream& out, const Explained& a, const Explained&
 }
 
 int explain(const ExplainOptions& options, const CommonOptions& common) {
-  const Session session(common);
+  RulesSession session(common, options.rules);
   Collation collation(session, options.locale);
   collation.check_argument(options.text1);
   collation.check_argument(options.text2);
@@ -273,6 +274,7 @@ Run declare_explain(Arguments& command, const CommonOptions& common) {
   const auto options = std::make_shared<ExplainOptions>();
   command.add_option("--locale", options->locale, "locale whose sort is used; else the user's locale")
       .type_name("LOCALE");
+  add_rules_option(command, options->rules);
   command.add_option("A", options->text1, "a text, in UTF-8").required().type_name("");
   command.add_option("B", options->text2, "another one").required().type_name("");
   command.footer(

@@ -27,6 +27,7 @@ constexpr char kUniqueBytes[] = "bytes", kUniqueOrder[] = "order";
 
 struct SortOptions {
   std::string locale;  // empty: the user's
+  std::string rules;   // a file; empty: the locale's sort
   std::string codepage = "UTF-8";
   std::string output = "-";
   bool key = false;
@@ -258,7 +259,7 @@ void write_lines(const std::vector<Line>& lines, Output& output, Keeps keeps) {
 }
 
 int sort(const SortOptions& options, const CommonOptions& common) {
-  const Session session(common);
+  RulesSession session(common, options.rules);
   Collation collation(session, options.locale, options.codepage);
   Input input(options.files);
   Pieces pieces(input);
@@ -307,6 +308,7 @@ Run declare_sort(Arguments& command, const CommonOptions& common) {
   const auto options = std::make_shared<SortOptions>();
   command.add_option("--locale", options->locale, "locale whose sort is used; else the user's locale")
       .type_name("LOCALE");
+  add_rules_option(command, options->rules);
   command.add_option("--codepage", options->codepage, "codepage of the text; else UTF-8").type_name("CP");
   command.add_flag("--key", options->key,
                    "keep the key of every line and compare those: faster, takes more memory, same result");

@@ -7,7 +7,6 @@
 #include <filesystem>
 #include <fstream>
 #include <map>
-#include <set>
 #include <sstream>
 #include <stdexcept>
 
@@ -17,7 +16,9 @@
 #include "language_toml.h"
 #include "locale_import.h"
 #include "locale_table.h"
+#include "root_import.h"
 #include "sort_import.h"
+#include "sort_sources.h"
 #include "territory_toml.h"
 #include "ucm.h"
 
@@ -39,9 +40,8 @@ using lexicor_data::ObjectType;
 
 constexpr char kControlHead[] =
     "# The objects of the locale directory: type, identifier, name, by type and identifier. The sources are\n"
-    "# languages/NAME.toml, territories/NAME.toml, codepages/NAME.ucm and sorts/NAME.txt. lexicor-import "
-    "writes\n"
-    "# all of them.\n";
+    "# languages/NAME.toml, territories/NAME.toml, codepages/NAME.ucm and sorts/NAME.rules. lexicor-import\n"
+    "# writes all of them.\n";
 
 /// Leaves a file alone that holds the text already.
 void write_file(const fs::path& path, const std::string& text) {
@@ -93,16 +93,6 @@ std::string source_text(const Tables& tables, const Codepage& codepage) {
   return out.str();
 }
 
-/// The 16-bit values that any codepage is written from.
-std::set<char16_t> written_values(const Tables& tables) {
-  std::set<char16_t> values;
-  for (const auto& [name, table] : tables)
-    for (const lexicor_data::Mapping& mapping : table.mappings)
-      if (lexicor_data::from_unicode(mapping) && mapping.unicode <= 0xFFFF)
-        values.insert(static_cast<char16_t>(mapping.unicode));
-  return values;
-}
-
 void import_languages(const fs::path& directory, const Control& control) {
   fs::create_directories(directory / "languages");
   for (const Language& row : kLanguages) {
@@ -129,19 +119,23 @@ void import_territories(const fs::path& directory) {
   }
 }
 
-void import_sorts(const fs::path& directory, const Tables& tables) {
-  const std::set<char16_t> written = written_values(tables);
+void import_sorts(const fs::path& directory) {
   fs::create_directories(directory / "sorts");
+  const lexicor_data::SortRoot root = import_root();
+  std::ostringstream text;
+  lexicor_data::write_root(text, root);
+  write_file(directory / "sorts" / lexicor_data::kRootFile, source_comment("root") + text.str());
   for (const Sort& row : kSorts) {
     Notes notes;
-    std::ostringstream out;
+    std::string rules;
     try {
-      lexicor_data::write_sort(out, import_sort(row, written, notes));
+      rules = import_rules(row, root, notes);
     } catch (const std::exception& error) {
       throw std::runtime_error(std::string(row.name) + ": " + error.what());
     }
     for (const std::string& note : notes) std::printf("%s: %s\n", row.name, note.c_str());
-    write_file(directory / "sorts" / (std::string(row.name) + ".txt"), source_comment(row.locale) + out.str());
+    write_file(directory / "sorts" / (row.name + std::string(lexicor_data::kRulesExtension)),
+               source_comment(row.locale) + rules);
   }
 }
 
@@ -159,7 +153,7 @@ void run(const fs::path& directory) {
   const Control control = control_list(directory / "control.txt", codepages);
   import_languages(directory, control);
   import_territories(directory);
-  import_sorts(directory, tables);
+  import_sorts(directory);
   std::ostringstream list;
   lexicor_data::write_control(list, control);
   write_file(directory / "control.txt", kControlHead + list.str());

@@ -8,32 +8,16 @@ namespace lexicor_import {
 namespace {
 
 // An element of 64 bits comes as one or two of 32; the second has this mark, which no tertiary weight has.
-constexpr uint32_t kContinuation = 0xC0;
-constexpr uint32_t kCaseBits = 0xC000;
-constexpr uint32_t kTertiaryBits = 0x3F3F;
+constexpr uint32_t kContinuation = 0xC0, kTertiaryBits = 0x3F;
 
 }  // namespace
 
-Collator::Collator(const std::string& locale) {
+Collator::Collator() {
   UErrorCode error = U_ZERO_ERROR;
-  collator_.reset(ucol_open(locale.c_str(), &error));
+  collator_.reset(ucol_open("root", &error));
   require(error, "ucol_open");
-  if (error == U_USING_DEFAULT_WARNING && locale != "root")
-    throw std::runtime_error("no collator for " + locale);
-  primaries_.reset(ucol_clone(collator_.get(), &error));
-  ucol_setStrength(primaries_.get(), UCOL_PRIMARY);
-  ucol_setAttribute(primaries_.get(), UCOL_ALTERNATE_HANDLING, UCOL_NON_IGNORABLE, &error);
   variable_top_ = ucol_getVariableTop(collator_.get(), &error);
-  backwards_ = ucol_getAttribute(collator_.get(), UCOL_FRENCH_COLLATION, &error) == UCOL_ON;
-  case_first_ = ucol_getAttribute(collator_.get(), UCOL_CASE_FIRST, &error);
-  require(error, "ucol_getAttribute");
-}
-
-/// With a case first, the case counts before the form; upper case first turns the case around.
-uint32_t Collator::tertiary(uint32_t bits) const {
-  if (bits == 0 || case_first_ == UCOL_OFF) return bits & kTertiaryBits;
-  const uint32_t all = bits & (kCaseBits | kTertiaryBits);
-  return case_first_ == UCOL_UPPER_FIRST ? all ^ kCaseBits : all;
+  require(error, "ucol_getVariableTop");
 }
 
 std::vector<Ce> Collator::elements(const std::u16string& text) const {
@@ -49,29 +33,19 @@ std::vector<Ce> Collator::elements(const std::u16string& text) const {
     if ((low & kContinuation) == kContinuation && !elements.empty()) {
       elements.back().primary |= primary;
       elements.back().secondary |= secondary;
-      elements.back().tertiary |= low & 0x3F;
+      elements.back().tertiary |= low & kTertiaryBits;
     } else {
-      elements.push_back({primary << 16, secondary << 8, low << 8});
+      elements.push_back({primary << 16, secondary << 8, (low & kTertiaryBits) << 8, low >> 6});
     }
   }
   require(error, "ucol_next");
-  for (Ce& element : elements) element.tertiary = tertiary(element.tertiary);
   return elements;
 }
 
-std::vector<uint8_t> Collator::primary_key(const std::u16string& text) const {
-  std::vector<uint8_t> key(64);
-  const int32_t bytes = ucol_getSortKey(primaries_.get(), text.data(), static_cast<int32_t>(text.size()),
-                                        key.data(), static_cast<int32_t>(key.size()));
-  if (bytes <= 0 || static_cast<size_t>(bytes) > key.size()) throw std::runtime_error("a sort key is too long");
-  key.resize(static_cast<size_t>(bytes));
-  return key;
-}
-
-std::set<std::u16string> Collator::contractions(bool contexts) const {
+std::set<std::u16string> Collator::contractions() const {
   UErrorCode error = U_ZERO_ERROR;
   const IcuPtr<USet, uset_close> set(uset_openEmpty());
-  ucol_getContractionsAndExpansions(collator_.get(), set.get(), nullptr, contexts, &error);
+  ucol_getContractionsAndExpansions(collator_.get(), set.get(), nullptr, false, &error);
   require(error, "ucol_getContractionsAndExpansions");
   std::set<std::u16string> texts;
   for (int32_t item = 0; item < uset_getItemCount(set.get()); ++item) {

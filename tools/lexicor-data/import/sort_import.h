@@ -1,29 +1,17 @@
-// Sorts from ICU's collators, at tertiary strength with punctuation shifted behind the other levels.
+// Sorts from CLDR's collations: its rules, without what a sort cannot say, and our own behind them.
 //
-// ICU's collation elements are brought into the form that a sort holds: an element and the accents behind it
-// become one, with one secondary and one tertiary weight. What has no weight but those of punctuation has one
-// special weight. Primary and special weights are numbered anew, densely and in their order; secondary and
-// tertiary ones are numbered within each primary weight, the only place where they are compared.
-//
-// Pages with characters that a shipped codepage writes, and those of the scripts in the sort's row, are tables
-// with all their assigned characters. Ideographs and Hangul syllables have computed weights, in the order of
-// their code points, where the collator has its first ideograph, and behind the letters of Hangul. All other
-// pages follow behind everything, in the order of their code points; surrogates have no weights.
-//
-// What a sort cannot hold is noted:
-//   - of characters with more than two elements the first two count, the others only as a tertiary difference,
-//     as does punctuation inside a character;
-//   - contractions of more than two characters, or with more than one element, are left out.
-// The contractions of the common order are left out without a note, but for the scripts of the sort's row.
+// Left out, with a note:
+//   - settings that a sort does not have, or that it has anyway;
+//   - relations of contractions of more than two characters, of weights that depend on the character before, of
+//     ideographs, and of characters whose page has no table;
+//   - scripts in [reorder] none of whose characters has a table.
+// A difference on the fourth level becomes none.
 #pragma once
 
-#include <cstdint>
-#include <set>
 #include <string>
-#include <vector>
 
 #include "locale_import.h"
-#include "sort_text.h"
+#include "sort_root.h"
 
 namespace lexicor_import {
 
@@ -31,15 +19,44 @@ struct Sort {
   const char* name;
   uint16_t id;
   const char* locale;
-  const char* scripts;
-  const char* marks;
+  const char* rules;
 };
+
+/// What our own rules begin with when they stand instead of CLDR's.
+#define LEXICOR_INSTEAD "!"
+
+// A pair of a letter and a mark that makes a letter of the script is that letter. In the order of rules, this is the
+// last word on them.
+inline constexpr char kCyrillicPairs[] =
+    "# A letter and a mark behind it are the letter that they make.\n"
+    "[compose [\\u0400-\\u04FF]]";
+inline constexpr char kGreekPairs[] =
+    "# A letter and a mark behind it are the letter that they make.\n"
+    "[compose [\\u0370-\\u03FF]]";
+
+inline constexpr char kVietnameseTones[] =
+    "# Tones stay apart in letters, so that they count alike in a letter and behind one.\n"
+    "[separate [ÀÁÃÈÉÌÍÒÓÕÙÚÝàáãèéìíòóõùúýĨĩŨũẠ-ỹ]]";
+
+// CLDR has &AE<<ä, where ä as two characters would have two elements. Here the dots have the second one.
+inline constexpr char kGermanUmlauts[] = LEXICOR_INSTEAD
+    "# The dots of ä, ö and ü count as an e that differs by an accent, and those of other letters as an "
+    "accent.\n"
+    "[compose [\\u0308]]\n"
+    "[suppressContractions [AOUaou]]\n"
+    "&e << \\u0308";
+
+inline constexpr char kHalfWidthKana[] =
+    "# Half-width kana and their voice marks are one element.\n"
+    "&ｳﾞ=ｳﾞ &ｶﾞ=ｶﾞ &ｷﾞ=ｷﾞ &ｸﾞ=ｸﾞ &ｹﾞ=ｹﾞ &ｺﾞ=ｺﾞ &ｻﾞ=ｻﾞ &ｼﾞ=ｼﾞ &ｽﾞ=ｽﾞ &ｾﾞ=ｾﾞ &ｿﾞ=ｿﾞ\n"
+    "&ﾀﾞ=ﾀﾞ &ﾁﾞ=ﾁﾞ &ﾂﾞ=ﾂﾞ &ﾃﾞ=ﾃﾞ &ﾄﾞ=ﾄﾞ &ﾊﾞ=ﾊﾞ &ﾋﾞ=ﾋﾞ &ﾌﾞ=ﾌﾞ &ﾍﾞ=ﾍﾞ &ﾎﾞ=ﾎﾞ\n"
+    "&ﾊﾟ=ﾊﾟ &ﾋﾟ=ﾋﾟ &ﾌﾟ=ﾌﾟ &ﾍﾟ=ﾍﾟ &ﾎﾟ=ﾎﾟ &ﾜﾞ=ﾜﾞ &ｦﾞ=ｦﾞ";
 
 inline constexpr Sort kSorts[] = {
 #include "sorts.inc"
 };
 
-/// Imports one sort. `repertoire`: the characters that the shipped codepages write.
-lexicor_data::SortSource import_sort(const Sort& sort, const std::set<char16_t>& repertoire, Notes& notes);
+/// The rules of a sort. The text that becomes its source.
+std::string import_rules(const Sort& sort, const lexicor_data::SortRoot& root, Notes& notes);
 
 }  // namespace lexicor_import

@@ -1,0 +1,38 @@
+#include "sort_sources.h"
+
+#include <filesystem>
+#include <fstream>
+#include <sstream>
+
+#include "ucm.h"
+
+namespace lexicor_data {
+
+const SortRoot& SortSources::root() {
+  std::call_once(root_read_, [&] {
+    std::ifstream in(root_file(), std::ios::binary);
+    if (!in) throw SourceError(root_file(), 0, 0, "cannot be opened");
+    root_.emplace(read_root(in, root_file()));
+  });
+  return *root_;
+}
+
+RuleFile SortSources::find(const std::string& name) const {
+  const std::string file = directory_ + '/' + name + kRulesExtension;
+  std::ifstream in(file, std::ios::binary);
+  std::ostringstream text;
+  if (!in || !(text << in.rdbuf() || in.peek() == EOF)) return {};
+  return {file, text.str()};
+}
+
+SortSource SortSources::build(const RuleFile& rules, SortNotes& notes, std::vector<std::string>* used) {
+  if (used != nullptr) used->push_back(root_file());
+  const auto find_used = [&](const std::string& name) {
+    RuleFile found = find(name);
+    if (used != nullptr && !found.file_name.empty()) used->push_back(found.file_name);
+    return found;
+  };
+  return build_sort(root(), rules, find_used, notes);
+}
+
+}  // namespace lexicor_data
