@@ -264,11 +264,7 @@ TEST_F(SortOracle, LanguagesHaveTheirOrders) {
   std::string common;
   for (const auto& row : lexicor_import::kLanguages)
     if (row.sort == std::string("Default") && is_tailored(row.locale)) common += row.name + std::string(" ");
-  EXPECT_EQ(
-      common,
-      "Gujarati Kannada Malayalam Odia Assamese Nepali Sinhala Burmese Khmer ArabicPunjabi Pashto Kurdish "
-      "Uzbek Kazakh Uyghur Amharic Oromo Yoruba Igbo Wolof Lingala Afrikaans Armenian Georgian Kyrgyz Lao "
-      "Mongolian Tongan Turkmen Greenlandic ");
+  EXPECT_EQ(common, "ArabicPunjabi ");
 }
 
 TEST_F(SortOracle, OrdersWordsAsIcu) {

@@ -101,7 +101,11 @@ class DirectoryCompiler {
  public:
   DirectoryCompiler(const std::string& source, const std::string& out, const CompileOptions& options,
                     std::ostream& log)
-      : source_(source), out_(out), options_(options), log_(log), digests_(source),
+      : source_(source),
+        out_(out),
+        options_(options),
+        log_(log),
+        digests_(source),
         sorts_(sort_directory(source)) {}
 
   void run() {
@@ -159,10 +163,20 @@ class DirectoryCompiler {
     }
   }
 
+  /// Whether the object would be made of the same file. A fault is said where it is compiled.
+  bool has_its_source(const ManifestObject& entry) const {
+    try {
+      return entry.sources.count(in_source(source_path(source_, entry.name))) != 0;
+    } catch (const SourceError&) {
+      return false;
+    }
+  }
+
   /// Takes an object whose sources and whose file are what they were.
   bool take_earlier(const ManifestObject* entry, Made& made) {
     if (entry == nullptr || entry->file != object_file_name(entry->name) || entry->sources.empty())
       return false;
+    if (!has_its_source(*entry)) return false;
     for (const auto& [path, digest] : entry->sources)
       if (digests_.of(path) != digest) return false;
     const std::string file = out_ + '/' + entry->file;

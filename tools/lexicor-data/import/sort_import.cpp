@@ -67,7 +67,7 @@ std::vector<SortRule> imported_rules(const std::string& name) {
 class Filter {
  public:
   Filter(const SortRoot& root, const SortTailoring& tables, Notes& notes)
-      : root_(root), tables_(tables.tables()), notes_(notes) {}
+      : root_(root), common_(tables), tables_(tables.tables()), notes_(notes) {}
 
   std::vector<SortRule> run(const std::vector<SortRule>& rules) {
     std::vector<SortRule> kept;
@@ -143,6 +143,9 @@ class Filter {
     drop_empty_reset(kept);
     kept.push_back(rule);
     dropped_ = Strength::kNone;
+    const CollationElements elements = common_.elements(rule.text);
+    letters_ = std::count_if(elements.begin(), elements.end(),
+                             [](const CollationElement& element) { return element.primary != 0; });
   }
 
   void keep_relation(const SortRule& rule, std::vector<SortRule>& kept) {
@@ -152,17 +155,18 @@ class Filter {
       if (dropped_ == Strength::kNone || rule.strength < dropped_) dropped_ = rule.strength;
       return;
     }
-    // What follows a relation that is left out stands at its place, unless its own difference is as great.
-    if (dropped_ != Strength::kNone && rule.strength > dropped_)
-      throw std::runtime_error("'" + rule_text(rule.text) + "' follows a relation that is left out");
     kept.push_back(rule);
+    // What follows a relation that is left out stands at its place, and differs from what is before by as much.
+    if (dropped_ != Strength::kNone && rule.strength > dropped_) kept.back().strength = dropped_;
+    dropped_ = Strength::kNone;
     // A difference on the fourth level is none in a sort.
-    if (rule.strength == Strength::kQuaternary) kept.back().strength = Strength::kIdentical;
+    if (kept.back().strength == Strength::kQuaternary) kept.back().strength = Strength::kIdentical;
   }
 
   std::string reason_against(const SortRule& rule) const {
     if (!rule.before.empty()) return "depends on the character before";
     if (rule.text.size() > 2) return "contraction of more than two characters";
+    if (rule.text.size() == 2 && letters_ > 1) return "contraction with more than one element";
     for (const char16_t unit : rule.text) {
       if (root_.is_ideograph(unit)) return "ideograph";
       if (!tables_[unit >> 8] || !root_.listed[unit]) return "without a table";
@@ -171,8 +175,10 @@ class Filter {
   }
 
   const SortRoot& root_;
+  const SortTailoring& common_;
   const std::bitset<256> tables_;
   Notes& notes_;
+  std::ptrdiff_t letters_ = 0;          ///< of the last reset
   Strength dropped_ = Strength::kNone;  ///< the greatest difference of what was left out behind a reset
   std::map<std::string, std::vector<std::u16string>> left_out_;
 };
