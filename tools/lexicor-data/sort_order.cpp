@@ -3,6 +3,7 @@
 #include <algorithm>
 
 namespace lexicor_data {
+
 uint32_t WeightOrder::insert(const Gap& gap, size_t at) {
   const auto list = gaps_.try_emplace(gap).first;
   const auto weight = static_cast<uint32_t>(kFirstTailored + places_.size());

@@ -15,8 +15,8 @@ constexpr std::pair<const char*, const char*> kTogether[] = {
     {"Hira", "Kana"}, {"Hrkt", "Kana"}, {"Jpan", "Kana"}, {"Hans", "Hani"}, {"Hant", "Hani"}, {"Kore", "Hang"}};
 
 constexpr uint32_t kHighestTertiary = 0xFF;
-constexpr size_t kMostElements =
-    31;  ///< of a text that rules name, so that rules for one another do not grow for ever
+/// Of a text that rules name, so that rules for one another do not grow for ever.
+constexpr size_t kMostElements = 31;
 
 bool is_kind(const std::string& name) {
   return std::find(std::begin(kKinds), std::end(kKinds), name) != std::end(kKinds);

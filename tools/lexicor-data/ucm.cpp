@@ -205,7 +205,7 @@ class UcmReader {
       errors_.add(SourceError(file_, taken.place.line, taken.place.column,
                               "the base " + header_.base() + " has no mapping " +
                                   unicode_text(taken.mapping.unicode) + " " +
-                                  code_text(taken.mapping.code, taken.mapping.bytes) + ""));
+                                  code_text(taken.mapping.code, taken.mapping.bytes)));
     }
   }
 
