@@ -99,7 +99,7 @@ class Comparison {
   /// The values of characters; the type, the case and the width of longer ones.
   void check_characters() const {
     size_t retyped = 0;
-    for (const auto& [code, u] : model_.to_unicode) {
+    for (const auto [code, u] : model_.to_unicode) {
       ASSERT_EQ(to_unicode(l_, codepage_.text_of(code)), Units{u}) << std::hex << code;
       if (code <= 0xFF) continue;
       ASSERT_EQ(LXCpMbToUnicodeW(object_, code), u) << std::hex << code;
@@ -123,7 +123,7 @@ class Comparison {
   /// has no value, and type 0 where the rows say so. UTF-8 follows the formula, whatever the trail bytes.
   void check_other_sequences() const {
     std::bitset<256> trails;
-    for (const auto& [code, u] : model_.to_unicode)
+    for (const auto [code, u] : model_.to_unicode)
       for (uint32_t rest = code; rest > 0xFF; rest >>= 8) trails.set(rest & 0xFF);
     for (uint32_t prefix = 0; prefix < 0x10000; ++prefix) {
       const size_t count = model_.is_shift() ? model_.header.width : model_.header.leads[prefix >> 8];

@@ -49,7 +49,7 @@ TinyCodepage CodepageBuilder::build() const {
   const char out = static_cast<char>(shift_out_), in = static_cast<char>(shift_in_);
   TinyCodepage made{
       {id_, header.name, sections}, header.width, model.is_shift(), out, in, header.substitution, {}};
-  for (const auto& [code, unicode] : model_.to_unicode)
+  for (const auto [code, unicode] : model_.to_unicode)
     if (model_.from_unicode[unicode] == code) made.characters.push_back({code_text(code), code, unicode});
   return made;
 }

@@ -38,7 +38,7 @@ std::vector<std::vector<uint32_t>> ByteTree::levels() const {
 
 ByteTree make_tree(const CodepageModel& model, const ItemOf& item) {
   ByteTree tree;
-  for (const auto& [code, unicode] : model.to_unicode) {
+  for (const auto [code, unicode] : model.to_unicode) {
     if (code > 0xFF) tree.insert(code, item(code, unicode));
   }
   return tree;
@@ -71,7 +71,7 @@ ByteTree make_utf8_tree(const CodepageModel& model, const ItemOf& item) {
 
 std::bitset<256> trail_bytes(const CodepageModel& model) {
   std::bitset<256> trails;
-  for (const auto& [code, unicode] : model.to_unicode) {
+  for (const auto [code, unicode] : model.to_unicode) {
     for (uint32_t rest = code, bytes = code_bytes(code); bytes > 1; --bytes, rest >>= 8)
       trails.set(rest & 0xFF);
   }

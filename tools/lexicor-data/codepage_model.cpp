@@ -27,11 +27,6 @@ void fill_utf8(CodepageModel& model) {
   }
 }
 
-uint16_t CodepageModel::value_of(uint32_t code) const {
-  const auto found = to_unicode.find(code);
-  return found == to_unicode.end() ? kNoValue : found->second;
-}
-
 uint32_t CodepageModel::round_trip(uint16_t unicode) const {
   const uint32_t code = from_unicode[unicode];
   return code != kNoCode && value_of(code) == unicode ? code : kNoCode;
@@ -80,8 +75,9 @@ CodepageModel to_model(const CodepageSource& source, const std::string& file_nam
     }
     const auto unicode = static_cast<uint16_t>(m.unicode);
     if (m.precision != 1 && unicode != kNoValue) {
-      const auto [entry, is_new] = model.to_unicode.try_emplace(m.code, unicode);
-      if (!is_new && entry->second != unicode) fail(m, "the code has another value too");
+      uint16_t& value = model.to_unicode[m.code];
+      if (value != kNoValue && value != unicode) fail(m, "the code has another value too");
+      value = unicode;
     }
     if (m.precision != 3) {
       uint32_t& code = model.from_unicode[unicode];
@@ -103,7 +99,7 @@ CodepageSource to_source(const CodepageModel& model) {
     const uint32_t code = model.from_unicode[u];
     if (code != kNoCode) add(u, code, model.value_of(code) == u ? 0 : 1);
   }
-  for (const auto& [code, u] : model.to_unicode) {
+  for (const auto [code, u] : model.to_unicode) {
     if (model.from_unicode[u] != code) add(u, code, 3);
   }
   std::sort(source.mappings.begin(), source.mappings.end(), in_table_order);

@@ -178,7 +178,7 @@ size_t append_variable_part(ByteVector& out, const CodepageModel& model, TypeRow
 
   begin_part(cp::kPairs);
   uint16_t pair_count = 0;
-  for (const auto& [code, unicode] : model.to_unicode) {
+  for (const auto [code, unicode] : model.to_unicode) {
     if (code <= 0xFF || model.round_trip(unicode) != code) continue;
     const uint32_t full = full_width_code(model, unicode);
     if (full == 0) continue;

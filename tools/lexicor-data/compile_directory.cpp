@@ -49,12 +49,25 @@ class SourceDigests {
   /// Of a path in the directory; empty when there is no such file.
   const std::string& of(const std::string& path) {
     const auto [entry, is_new] = digests_.try_emplace(path);
-    if (is_new && fs::is_regular_file(directory_ + '/' + path))
-      entry->second = digest_text(digest_of_bytes(read_file(directory_ + '/' + path)));
+    if (is_new) entry->second = read(path);
     return entry->second;
   }
 
+  /// Reads the sources of a manifest at once; threads may ask for them together then.
+  void read_all(const Manifest& manifest) {
+    for (const ManifestObject& object : manifest.objects)
+      for (const auto& source : object.sources) digests_.try_emplace(source.first);
+    std::vector<std::pair<const std::string, std::string>*> entries;
+    for (auto& entry : digests_) entries.push_back(&entry);
+    for_each_parallel(entries.size(), [&](size_t i) { entries[i]->second = read(entries[i]->first); });
+  }
+
  private:
+  std::string read(const std::string& path) const {
+    const std::string file = directory_ + '/' + path;
+    return fs::is_regular_file(file) ? digest_text(digest_of_bytes(read_file(file))) : "";
+  }
+
   const std::string& directory_;
   std::map<std::string, std::string> digests_;
 };
@@ -129,8 +142,12 @@ class DirectoryCompiler {
   void make_objects(SourceErrors& errors) {
     std::vector<size_t> changed;
     const Manifest earlier = earlier_manifest();
+    digests_.read_all(earlier);
+    std::vector<uint8_t> taken(made_.size());
+    for_each_parallel(made_.size(),
+                      [&](size_t i) { taken[i] = take_earlier(earlier.find(control_.objects[i]), made_[i]); });
     for (size_t i = 0; i < made_.size(); ++i)
-      if (!take_earlier(earlier.find(control_.objects[i]), made_[i])) changed.push_back(i);
+      if (!taken[i]) changed.push_back(i);
     std::vector<SourceErrors> faults(made_.size());
     const ValidatorInUse validator;
     for_each_parallel(changed.size(), [&](size_t n) {

@@ -90,7 +90,9 @@ ObjectFile read_object(const ByteVector& bytes, const std::string& file_name) {
 ByteVector read_file(const std::string& path) {
   std::ifstream in(path, std::ios::binary);
   if (!in) throw SourceError(path, 0, 0, "cannot be opened");
-  ByteVector bytes{std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>()};
+  ByteVector bytes;
+  for (char block[1 << 16]; in.read(block, sizeof block), in.gcount() > 0;)
+    bytes.insert(bytes.end(), block, block + in.gcount());
   if (in.bad()) throw SourceError(path, 0, 0, "cannot be read");
   return bytes;
 }

@@ -260,7 +260,7 @@ class Builder {
       const RulePlace* const written = tailoring_.written(text);
       if (drafted.elements.size() > 1 && written != nullptr) {
         throw SourceError(written->file, written->place.line, written->place.column,
-                          "'" + rule_text(text) + "' (" + code_text(text) +
+                          "'" + rule_text(text) + "' (" + code_points_text(text) +
                               ") has two elements, a contraction of two characters has one");
       }
       if (drafted.elements.size() > 1)
@@ -437,7 +437,7 @@ class Builder {
       sort.contractions.emplace(std::make_pair(text[0], text[1]), element_of(drafted));
     for (const auto& [reason, texts] : left_out_) {
       std::string line = reason + " (" + std::to_string(texts.size()) + "):";
-      for (const Text& text : texts) line += (&text == &texts.front() ? " " : ", ") + code_text(text);
+      for (const Text& text : texts) line += (&text == &texts.front() ? " " : ", ") + code_points_text(text);
       notes_.push_back(line);
     }
     return sort;

@@ -7,6 +7,7 @@
 #include <string>
 
 #include "lexicor/hex.h"
+#include "lexicor/utf8_text.h"
 #include "line_text.h"
 #include "sort_text.h"
 #include "ucm.h"
@@ -24,11 +25,10 @@ inline std::string range_text(unsigned first, unsigned last) {
   return first == last ? hex4(first) : hex4(first) + ".." + hex4(last);
 }
 
-/// A text in UTF-8; each unit is a character.
-std::string utf8_text(const std::u16string& text);
+using lexicor_cli::utf8_text;
 
 /// The characters of a text as code points with blanks between them.
-std::string code_text(const std::u16string& text);
+std::string code_points_text(const std::u16string& text);
 
 /// A character in UTF-8, where a text file shows it well; else empty.
 std::string visible_text(char16_t unit);
@@ -131,5 +131,21 @@ class SortLine {
   int number_;
   size_t at_ = 0;
 };
+
+/// Reads a source: what follows `@` on a line goes to `directive`, any other line that says something to `entry`.
+/// `*number` is the line that is read, at last the last one.
+template <class Directive, class Entry>
+void read_sort_lines(std::istream& in, const std::string& file, int* number, Directive directive, Entry entry) {
+  std::string text;
+  while (next_line(in, &text, number)) {
+    SortLine line(file, std::move(text), *number);
+    if (line.done()) continue;
+    if (line.take("@"))
+      directive(line);
+    else
+      entry(line);
+  }
+  if (in.bad()) throw SourceError(file, *number, 0, "the file cannot be read");
+}
 
 }  // namespace lexicor_data

@@ -26,16 +26,9 @@ class RootReader {
   RootReader(std::istream& in, const std::string& file) : in_(in), file_(file) {}
 
   SortRoot read() {
-    std::string text;
-    while (next_line(in_, &text, &line_)) {
-      SortLine line(file_, std::move(text), line_);
-      if (line.done()) continue;
-      if (line.take("@"))
-        read_directive(line);
-      else
-        read_elements(line);
-    }
-    if (in_.bad()) throw SourceError(file_, line_, 0, "the file cannot be read");
+    read_sort_lines(
+        in_, file_, &line_, [&](SortLine& line) { read_directive(line); },
+        [&](SortLine& line) { read_elements(line); });
     if (root_.groups.empty()) throw SourceError(file_, line_, 0, "there is no @group");
     for (uint32_t primary = 1; primary < seen_.size(); ++primary) {
       if (!seen_[primary])
@@ -114,7 +107,7 @@ class RootReader {
         elements[0].tertiary == 0)
       elements.clear();
     const bool again = text.size() == 1 ? root_.listed[text[0]] : root_.contractions.count(text) != 0;
-    if (again) line.fail(start, code_text(text) + " stands on an earlier line already");
+    if (again) line.fail(start, code_points_text(text) + " stands on an earlier line already");
     if (text.size() > 1) {
       root_.contractions.emplace(std::move(text), std::move(elements));
       return;
@@ -375,7 +368,7 @@ void write_root(std::ostream& out, const SortRoot& root) {
       },
       out);
   for (const auto& [composed, text] : root.decompositions)
-    out << "@canonical " << hex4(composed) << " ; " << code_text(text) << '\n';
+    out << "@canonical " << hex4(composed) << " ; " << code_points_text(text) << '\n';
 
   std::vector<RootLine> lines;
   for (unsigned code = 0; code < kCharacters; ++code) {
@@ -385,7 +378,7 @@ void write_root(std::ostream& out, const SortRoot& root) {
   for (const auto& [text, elements] : root.contractions) lines.push_back({text, &elements});
   std::sort(lines.begin(), lines.end());
   for (const RootLine& line : lines) {
-    out << code_text(line.text) << " ; ";
+    out << code_points_text(line.text) << " ; ";
     for (const CollationElement& element : *line.elements)
       out << element_text(element, element.primary != 0 && element.primary <= root.last_variable);
     if (line.elements->empty()) out << "[.0000.0000.0000]";

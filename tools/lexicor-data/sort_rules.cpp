@@ -386,7 +386,7 @@ std::string rule_text(const std::u16string& text) {
     else if (is_syntax(unit))
       out += std::string("\\") + static_cast<char>(unit);
     else
-      out += utf8_text({unit});
+      out += utf8_text({&unit, 1});
   }
   return out;
 }

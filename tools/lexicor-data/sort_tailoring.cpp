@@ -46,7 +46,7 @@ void append(CollationElements& to, const CollationElements& from) {
 
 std::string named(const std::u16string& text) {
   std::string name = "'" + rule_text(text) + "' (";
-  return name + code_text(text) + ")";
+  return name + code_points_text(text) + ")";
 }
 
 }  // namespace

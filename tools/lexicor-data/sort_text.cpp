@@ -42,16 +42,9 @@ class SortReader {
   SortReader(std::istream& in, const std::string& file) : in_(in), file_(file) {}
 
   SortSource read() {
-    std::string text;
-    while (next_line(in_, &text, &line_)) {
-      SortLine line(file_, std::move(text), line_);
-      if (line.done()) continue;
-      if (line.take("@"))
-        read_directive(line);
-      else
-        read_element(line);
-    }
-    if (in_.bad()) throw SourceError(file_, line_, 0, "the file cannot be read");
+    read_sort_lines(
+        in_, file_, &line_, [&](SortLine& line) { read_directive(line); },
+        [&](SortLine& line) { read_element(line); });
     settle_pages();
     settle_insertions();
     for (auto entry = sort_.characters.begin(); entry != sort_.characters.end();)

@@ -7,6 +7,7 @@
 #include <iterator>
 
 #include "lexicor/near_names.h"
+#include "lexicor/utf8_text.h"
 #include "line_text.h"
 #include "source_error.h"
 
@@ -30,16 +31,6 @@ std::u16string to_units(const std::string& text) {
     }
   }
   return units;
-}
-
-void append_utf8(std::string& out, uint32_t value) {
-  if (value < 0x80) {
-    out += static_cast<char>(value);
-    return;
-  }
-  const int trails = value < 0x800 ? 1 : value < 0x10000 ? 2 : 3;
-  out += static_cast<char>((0xFF00 >> (trails + 1) & 0xFF) | value >> (6 * trails));
-  for (int i = trails - 1; i >= 0; --i) out += static_cast<char>(0x80 | (value >> (6 * i) & 0x3F));
 }
 
 /// Looks for what the parser has no defined behaviour on: characters outside ASCII beside texts and comments, or in a text
@@ -286,7 +277,7 @@ std::string toml_quote(const std::u16string& text) {
       std::snprintf(escape, sizeof escape, "\\u%04X", static_cast<unsigned>(value));
       out += escape;
     } else {
-      append_utf8(out, value);
+      lexicor_cli::append_utf8(out, value);
     }
   }
   return out + '"';

@@ -12,6 +12,7 @@
 
 #include "catalogue.h"
 #include "session.h"
+#include "utf8_text.h"
 
 namespace lexicor_cli {
 
@@ -171,20 +172,6 @@ LocalePtr open_user_locale() {
   return user;
 }
 
-void append_utf8(std::string& text, LXUChar unit) {
-  const unsigned value = unit;
-  if (value < 0x80) {
-    text += static_cast<char>(value);
-  } else if (value < 0x800) {
-    text += static_cast<char>(0xC0 | value >> 6);
-    text += static_cast<char>(0x80 | (value & 0x3F));
-  } else {
-    text += static_cast<char>(0xE0 | value >> 12);
-    text += static_cast<char>(0x80 | (value >> 6 & 0x3F));
-    text += static_cast<char>(0x80 | (value & 0x3F));
-  }
-}
-
 }  // namespace
 
 LocaleName::LocaleName(const std::string& text)
@@ -261,8 +248,7 @@ std::optional<std::string> text_item(LXLocale* locale, int32_t item) {
       LXGetLocaleTextInfoU(locale, item, units.data(), static_cast<int32_t>(units.size()), 0);
   if (written <= 0) return std::nullopt;
   std::string text;
-  units.resize(static_cast<size_t>(written) - 1);
-  for (const LXUChar unit : units) append_utf8(text, unit);
+  for (int32_t i = 0; i + 1 < written; ++i) append_utf8(text, units[static_cast<size_t>(i)]);
   return text;
 }
 

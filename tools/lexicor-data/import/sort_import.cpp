@@ -28,7 +28,7 @@ std::string utf8_rules(const UChar* rules, int32_t length) {
       text += utf8_text(u"\uE000");
       ++i;
     } else {
-      text += utf8_text({unit});
+      text += utf8_text({&unit, 1});
     }
   }
   return text;
@@ -77,7 +77,7 @@ class Filter {
       std::string line = "left out, " + reason + " (" + std::to_string(texts.size()) + "):";
       constexpr size_t kMost = 400;
       for (size_t i = 0; i < texts.size() && i < kMost; ++i)
-        line += (i == 0 ? " " : ", ") + code_text(texts[i]);
+        line += (i == 0 ? " " : ", ") + code_points_text(texts[i]);
       notes_.push_back(line + (texts.size() > kMost ? ", ..." : ""));
     }
     return kept;
