@@ -120,9 +120,12 @@ template <class Unit>
   return with_cursor(
       codepage_of(*locale.codepage), form, Text<Unit>{a.p, 0, a.state}, a.units, [&](const auto& in) {
         using Folded = FoldCursor<std::decay_t<decltype(in)>>;
-        return compare_keys(sort_of(*locale.sort), Folded{folding, in}, folding.most_chars(a.units),
-                            Folded{folding, like(in, b.p, b.units, b.state)}, folding.most_chars(b.units),
-                            code);
+        const Sort& sort = sort_of(*locale.sort);
+        const Folded text1{folding, in};
+        const Folded text2{folding, like(in, b.p, b.units, b.state)};
+        const int32_t result = sort.appends_primaries ? compare_primaries(sort, text1, text2) : 0;
+        if (result != 0) return result;
+        return compare_keys(sort, text1, folding.most_chars(a.units), text2, folding.most_chars(b.units), code);
       });
 }
 
@@ -172,6 +175,10 @@ template <class Unit>
 }
 
 }  // namespace
+
+bool lx::collation_is_traced() {
+  return trace_level(unit) != 0;
+}
 
 extern "C" {
 

@@ -9,6 +9,9 @@
 
 namespace lx {
 
+/// Whether a trace shows what the functions of collation do.
+bool collation_is_traced();
+
 enum class WeightLevel { kPrimary, kSecondary, kTertiary, kSpecial };
 
 /// What a weight set has on a level; 0: nothing.
@@ -97,6 +100,19 @@ int32_t compare_levels(const Source& a, const Source& b, bool primaries) {
   if (result == 0) result = compare_level<WeightLevel::kTertiary>(a, b);
   if (result == 0) result = compare_level<WeightLevel::kSpecial>(a, b);
   return result;
+}
+
+/// The first two primaries that differ, where no weight is inserted: they decide between keys as well. 0: else.
+template <class Cursor>
+int32_t compare_primaries(const Sort& sort, const Cursor& text1, const Cursor& text2) {
+  auto a = TextSource<Cursor>{sort, text1, text1}.template weights<WeightLevel::kPrimary>();
+  auto b = TextSource<Cursor>{sort, text2, text2}.template weights<WeightLevel::kPrimary>();
+  for (;;) {
+    const uint32_t x = a.next();
+    const uint32_t y = b.next();
+    if (x == 0 || y == 0) return 0;
+    if (x != y) return difference(x, y);
+  }
 }
 
 /// Compares primaries in the order of the texts until one is inserted ahead of others: then `*inserted` is set,

@@ -1,6 +1,7 @@
 // Search for a substring: exactly, or by the locale's sort where case or width does not count.
 #include <cstring>
 
+#include "collate/lxfoldedpart.h"
 #include "core/lxmemory.h"
 #include "text/lxfold.h"
 #include "text/lxsearch.h"
@@ -118,11 +119,15 @@ Place<SingleByteCursor> find_exactly(const SingleByteCursor& text, const SingleB
   return {static_cast<const uint8_t*>(found), text};
 }
 
+/// What is thought of a candidate before it is compared.
+enum class Chance { kSome, kNone, kStop };
+
 /// Candidates begin with the same character when it is folded. What that is, is kept for characters of one
-/// byte: looking for a half-width form takes long. `*code` receives the error of a comparison that failed.
-template <class Cursor>
-Place<Cursor> find_folded(LXLocale* locale, const Cursor& text, const Cursor& part, Fold fold, uint32_t options,
-                          int32_t* code) {
+/// byte: looking for a half-width form takes long. `chance(place, number, end)` is asked for those. `*code` receives
+/// the error of a comparison that failed.
+template <class Cursor, class ChanceOf>
+Place<Cursor> try_candidates(LXLocale* locale, const Cursor& text, const Cursor& part, Fold fold,
+                             uint32_t options, ChanceOf chance, int32_t* code) {
   Walk last(part);
   if (!last.next()) return {text.p, text};
   using Character = Folded<typename CharOf<typename Cursor::Unit>::Type>;
@@ -133,11 +138,15 @@ Place<Cursor> find_folded(LXLocale* locale, const Cursor& text, const Cursor& pa
     if (!ahead.next()) return {nullptr, text};
   const auto part_units = static_cast<int32_t>(last.in.p - part.p);
   enum Answer : uint8_t { kUnknown, kNo, kYes } answers[0x100] = {};
-  for (Walk at(text); ahead.next() && at.next();) {
+  size_t number = 0;
+  for (Walk at(text); ahead.next() && at.next(); ++number) {
     Answer answer = kUnknown;
     Answer& kept = at.value < 0x100 ? answers[at.value] : answer;
     if (kept == kUnknown) kept = Character(*locale, at.value, fold).same_as(wanted) ? kYes : kNo;
     if (kept == kNo) continue;
+    const Chance it_has = chance(at.start, number, ahead.in.p);
+    if (it_has == Chance::kStop) break;
+    if (it_has == Chance::kNone) continue;
     const int32_t difference = collate(locale, at, ahead.in.p, part, part_units, options);
     *code = locale->last_error;
     if (*code != LX_OK) break;
@@ -146,19 +155,77 @@ Place<Cursor> find_folded(LXLocale* locale, const Cursor& text, const Cursor& pa
   return {nullptr, text};
 }
 
+/// Tells when comparing has cost so much that preparing the part pays.
+class Patience {
+ public:
+  explicit Patience(uint32_t options)
+      : ends_(options == LX_CASE_INSENSITIVE && !collation_is_traced() && !comparison_is_traced()) {}
+
+  bool is_over(size_t compared, size_t passed) {
+    constexpr size_t kWorthIt = 1024;
+    return ends_ && (spent_ += compared) >= kWorthIt + passed;
+  }
+
+ private:
+  bool ends_;
+  size_t spent_ = 0;
+};
+
+/// Searches by `try_from(text, chance)`, and where comparing takes long with the part prepared from there on.
+template <class Cursor, class TryFrom>
+Place<Cursor> search_patiently(const LXLocale& locale, const Cursor& text, const Cursor& part, const Sort* sort,
+                               uint32_t options, TryFrom try_from) {
+  using Unit = typename Cursor::Unit;
+  Patience patience(options);
+  const Unit* stopped = nullptr;
+  const auto place = try_from(text, [&](const Unit* candidate, size_t, const Unit* end) {
+    if (!patience.is_over(room(candidate, end), room(text.p, candidate))) return Chance::kSome;
+    stopped = candidate;
+    return Chance::kStop;
+  });
+  if (stopped == nullptr) return place;
+  const Folding folding(locale, Fold::kCase);
+  Cursor rest(text);
+  rest.p = stopped;
+  FoldedPart<Cursor> prepared(sort, *locale.language, folding, rest, part);
+  return try_from(rest, [&](const Unit* candidate, size_t number, const Unit* end) {
+    return !prepared || prepared.may_stand(candidate, number, end) ? Chance::kSome : Chance::kNone;
+  });
+}
+
+template <class Cursor>
+Place<Cursor> find_folded(LXLocale* locale, const Cursor& text, const Cursor& part, Fold fold, uint32_t options,
+                          int32_t* code) {
+  const auto try_from = [&](const Cursor& in, auto chance) {
+    return try_candidates(locale, in, part, fold, options, chance, code);
+  };
+  const Sort* const sort = locale->sort != nullptr ? &sort_of(*locale->sort) : nullptr;
+  if constexpr (!Cursor::kShifts)
+    if (sort == nullptr || sort->appends_primaries)
+      return search_patiently(*locale, text, part, sort, options, try_from);
+  return try_from(text, [](auto...) { return Chance::kSome; });
+}
+
 /// In a single-byte codepage without regard to case: at every place, by LXStrcmp, as a trace shows it.
 Place<SingleByteCursor> find_folded(LXLocale* locale, const SingleByteCursor& text,
                                     const SingleByteCursor& part, Fold fold, uint32_t, int32_t* code) {
   if (fold == Fold::kWidth) return find_exactly(text, part);  // it has one width
   const auto bytes = static_cast<int32_t>(part.end - part.p);
-  for (const uint8_t* p = text.p; text.end - p >= bytes; ++p) {
-    const int32_t difference =
-        LXStrcmp(locale, chars_of(p), bytes, chars_of(part.p), bytes, LX_CASE_INSENSITIVE);
-    *code = locale->last_error;
-    if (*code != LX_OK) break;
-    if (difference == 0) return {p, text};
-  }
-  return {nullptr, text};
+  const uint8_t* const lower = lower_table(codepage_of(*locale->codepage));
+  const auto try_from = [&](const SingleByteCursor& in, auto chance) -> Place<SingleByteCursor> {
+    for (const uint8_t* p = in.p; in.end - p >= bytes; ++p) {
+      const Chance it_has = lower[*p] == lower[*part.p] ? chance(p, room(in.p, p), p + bytes) : Chance::kSome;
+      if (it_has == Chance::kStop) break;
+      if (it_has == Chance::kNone) continue;
+      const int32_t difference =
+          LXStrcmp(locale, chars_of(p), bytes, chars_of(part.p), bytes, LX_CASE_INSENSITIVE);
+      *code = locale->last_error;
+      if (*code != LX_OK) break;
+      if (difference == 0) return {p, text};
+    }
+    return {nullptr, text};
+  };
+  return search_patiently(*locale, text, part, nullptr, LX_CASE_INSENSITIVE, try_from);
 }
 
 template <class Cursor>

@@ -272,6 +272,10 @@ int32_t compare_text(LXLocale* given, const Unit* text1, int32_t length1, const 
 
 }  // namespace
 
+bool lx::comparison_is_traced() {
+  return trace_level(unit) != 0;
+}
+
 extern "C" {
 
 int32_t LXStrcmp(LXLocale* locale, const char* text1, int32_t length1, const char* text2, int32_t length2,

@@ -108,6 +108,9 @@ struct Folded {
   }
 };
 
+/// Whether a trace shows what the functions of comparison by code value do.
+bool comparison_is_traced();
+
 // Blanks.
 
 inline uint8_t blank_of(const LXLocale& locale) {

@@ -1,5 +1,6 @@
 // The string family in all forms against models that work on characters: random texts, every cut of a length
 // and every size of a buffer, in blocks of their exact sizes.
+#include "platform/recording_ras1.h"
 #include "support/case_test.h"
 #include "support/slowness.h"
 
@@ -97,6 +98,18 @@ TEST_F(Strings, PartsOfLongTextsAreFound) {
               : at == Units::npos ? nullptr
                                   : whole.units.data() + whole.start[at]);
     library.hooks().fail_at(0);
+    // Without regard to case: with a trace, that shows each of them, all candidates are compared.
+    for (Units* const in_cases : {&text, &part})
+      for (LXUChar& u : *in_cases)
+        if (u == 'a' && random() % 3 == 0) u = 'A';
+    const Encoded<K> cases(cp, text), cases_wanted(cp, part);
+    const auto find = [&](uint32_t level) {
+      RecordingTrace::set_level(level);
+      return K::str(in, cases.units.data(), cases.size(), cases_wanted.units.data(), cases_wanted.size(),
+                    LX_CASE_INSENSITIVE);
+    };
+    const auto found = find(RAS1_LEVEL_PROCESS);
+    ASSERT_EQ(find(0), found);
   });
 }
 
