@@ -22,8 +22,17 @@
  *  8. Ownership. Handles are released by the function named beside the one that creates them. Data
  *     objects belong to the library.
  *  9. Memory comes from the hooks given to LXInit. Short texts are worked on without allocating.
- * 10. Threads. Data objects are shared and read-only. A handle is used by one thread at a time. The
- *     first LXInit, and LXSetLocale, must not race with other calls.
+ * 10. Threads. What may go on at the same time in several threads:
+ *
+ *       what is shared                  by which calls
+ *       data objects                    all: they are read-only
+ *       a locale that nobody changes    all that take a locale, but for LXSetLocale...Info,
+ *                                       LXLocaleSetModifiable, LXLocaleChange... and
+ *                                       LXReleaseLocale; LXGetError then tells of any of the threads
+ *       a conversion, stream, catalog   none: one thread at a time
+ *       the default locale              as a locale; LXSetLocale must not race with other calls
+ *       the library                     LXInit and LXTerm while a use of it lasts; the first LXInit
+ *                                       and the last LXTerm must not race with other calls
  * 11. Unicode is 16-bit: characters beyond U+FFFF become U+FFFD. */
 #ifndef LX_H
 #define LX_H

@@ -148,7 +148,7 @@ Place<Cursor> try_candidates(LXLocale* locale, const Cursor& text, const Cursor&
     if (it_has == Chance::kStop) break;
     if (it_has == Chance::kNone) continue;
     const int32_t difference = collate(locale, at, ahead.in.p, part, part_units, options);
-    *code = locale->last_error;
+    *code = last_error_of(*locale);
     if (*code != LX_OK) break;
     if (difference == 0) return {at.start, at.in};
   }
@@ -219,7 +219,7 @@ Place<SingleByteCursor> find_folded(LXLocale* locale, const SingleByteCursor& te
       if (it_has == Chance::kNone) continue;
       const int32_t difference =
           LXStrcmp(locale, chars_of(p), bytes, chars_of(part.p), bytes, LX_CASE_INSENSITIVE);
-      *code = locale->last_error;
+      *code = last_error_of(*locale);
       if (*code != LX_OK) break;
       if (difference == 0) return {p, text};
     }
@@ -236,7 +236,8 @@ Place<Cursor> find_part(LXLocale* locale, const Cursor& text, const Cursor& part
   if (!Cursor::kShifts && part.end - part.p > text.end - text.p) return {nullptr, text};
   const Fold fold = fold_of(options);
   if (fold == Fold::kNone) return find_exactly(text, part);
-  return find_folded(locale, text, part, fold, options & LX_WIDTH_INSENSITIVE, code);
+  LXLocale own = *locale;  // whose last error no other thread writes
+  return find_folded(&own, text, part, fold, options & LX_WIDTH_INSENSITIVE, code);
 }
 
 template <class Unit>

@@ -30,7 +30,7 @@ class Call : private Events {
   }
   template <class T>
   T end(int32_t code, T result, int line = __builtin_LINE()) {
-    if (locale_ != nullptr) locale_->last_error = code;
+    if (locale_ != nullptr) set_last_error(*locale_, code);
     return Events::exit(result, line);
   }
 

@@ -147,7 +147,7 @@ int32_t LXTerm(void) {
 
 int32_t LXGetError(const LXLocale* locale) {
   const LXLocale* used = locale_of(const_cast<LXLocale*>(locale));
-  return used != nullptr ? used->last_error : LX_E_NOT_INITIALIZED;
+  return used != nullptr ? last_error_of(*used) : LX_E_NOT_INITIALIZED;
 }
 
 int32_t LXGetEnv(const char* name, char* buffer, int32_t size) {

@@ -76,11 +76,19 @@ struct LXLocale {
   uint16_t changed_unicode;   // which Unicode copies the caller has set
   LXUChar separators_unicode[5];
   LXUChar* texts_unicode[8];  // the texts
-  int32_t last_error;
+  int32_t last_error;         // last_error_of() and set_last_error()
   lx::ReplacedTexts* replaced;  // by changes of territory
 };
 
 namespace lx {
+
+// Threads may work in one locale together, as long as none changes it: the last error is then that of any of them.
+inline int32_t last_error_of(const LXLocale& locale) {
+  return __atomic_load_n(&locale.last_error, __ATOMIC_RELAXED);
+}
+inline void set_last_error(LXLocale& locale, int32_t code) {
+  __atomic_store_n(&locale.last_error, code, __ATOMIC_RELAXED);
+}
 
 enum LocaleFlag : uint16_t {
   kLocaleSingleByte = 0x0040,
