@@ -59,4 +59,15 @@ done < <(includes tools/lexicor)
 # The library itself: no C++ containers, exceptions, new or run-time types.
 while IFS= read -r hit; do complain "$hit: src/ uses libc only"; done < <(
   grep -rnE '^#include <(string|vector|map|memory|algorithm|array|iostream|functional|optional|thread|mutex)>' src || true)
+# Memory comes from the hooks: what takes it from the system, or lets libc take some, is the pair of default hooks, and
+# the moment in which the system's locale is another.
+allocators='(malloc|calloc|realloc|reallocarray|posix_memalign|aligned_alloc|free|strn?dup|v?asprintf|f?open(64|at)?dir|fopen(64)?|fdopen|getline|getdelim|newlocale|setlocale|qsort|_Zn[wa].*)'
+while read -r file symbol; do
+  case "$file $symbol" in
+    'lxinit.cpp malloc' | 'lxinit.cpp free' | 'lxnative.cpp setlocale' | 'qrlnls1.cpp setlocale') ;;
+    *) complain "$file uses $symbol, not the hooks" ;;
+  esac
+done < <(for object in $(find "$objects" -name '*.o'); do
+  nm -u --format=just-symbols "$object" | grep -xE "$allocators" | sed "s|^|$(basename "$object" .o) |" || true
+done)
 exit "$bad"
