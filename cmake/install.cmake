@@ -6,7 +6,7 @@ set(package_dir ${CMAKE_INSTALL_LIBDIR}/cmake/Lexicor)
 install(TARGETS lexicor EXPORT LexicorTargets
         LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR} COMPONENT library NAMELINK_COMPONENT development
         ARCHIVE DESTINATION ${CMAKE_INSTALL_LIBDIR} COMPONENT development)
-install(FILES include/lx.h include/nls1.h DESTINATION ${CMAKE_INSTALL_INCLUDEDIR} COMPONENT development)
+install(FILES include/lx.h include/nls1.h include/lexicor.hpp DESTINATION ${CMAKE_INSTALL_INCLUDEDIR} COMPONENT development)
 install(DIRECTORY include/lx DESTINATION ${CMAKE_INSTALL_INCLUDEDIR} COMPONENT development)
 install(EXPORT LexicorTargets NAMESPACE Lexicor:: DESTINATION ${package_dir} COMPONENT development)
 
