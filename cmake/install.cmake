@@ -34,6 +34,11 @@ if(LEXICOR_TOOLS)
   install(TARGETS lexicor_cli lexicor-data lexicor-gencat RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR} COMPONENT tools)
   install(DIRECTORY ${PROJECT_BINARY_DIR}/locale/ DESTINATION ${CMAKE_INSTALL_DATADIR}/lexicor/locale COMPONENT data)
 endif()
+set(LEXICOR_PYTHON_DIR lib/python3/dist-packages CACHE STRING "Where the Python module is installed; empty: nowhere")
+if(LEXICOR_PYTHON_DIR)
+  install(DIRECTORY bindings/python/lexicor DESTINATION ${LEXICOR_PYTHON_DIR} COMPONENT python
+          FILES_MATCHING PATTERN *.py PATTERN py.typed)
+endif()
 install(FILES LICENSE README.md DESTINATION ${CMAKE_INSTALL_DOCDIR} COMPONENT documentation)
 install(DIRECTORY docs DESTINATION ${CMAKE_INSTALL_DOCDIR} COMPONENT documentation FILES_MATCHING PATTERN *.md)
 

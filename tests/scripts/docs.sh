@@ -14,3 +14,7 @@ block cpp cpp >"$work/page.cpp"
 g++ $flags -std=c++17 -Wall -Wextra -Werror -I"$source_dir/include" "$work/page.cpp" -L"$build_dir/lib" -llexicor \
   -Wl,-rpath,"$build_dir/lib" -o "$work/page"
 "$work/page" "$build_dir/locale" | diff -au <(block cpp text) -
+
+# The first commands of docs/python.md, in this directory; Debian's Python has the word size of the system.
+[ -n "$flags" ] || [ "$(cd "$source_dir" && export PYTHONDONTWRITEBYTECODE=1 &&
+  eval "$(grep -A1 '^    export LEXICOR_LIBRARY' docs/python.md | sed "s|\$PWD/build/m64|$build_dir|")")" = 1.234,50 ]

@@ -61,6 +61,11 @@ prefix/bin/lexicor list codepages >list
 grep -q 'UTF-8' list
 prefix/bin/lexicor-data check prefix/share/lexicor/locale
 printf '1 text\n' | prefix/bin/lexicor-gencat installed.cat
+for python in $([ -z "$flags" ] && type -P /usr/bin/python3); do  # of the word size of the system's
+  said=$(LEXICOR_LIBRARY=$(find "$PWD/prefix" -name liblexicor.so.1) PYTHONPATH=prefix/lib/python3/dist-packages \
+    PYTHONDONTWRITEBYTECODE=1 "$python" -c 'import lexicor; print(b"\xC7\xD9\xD6\xA1".decode("lexicor-ibm273"))')
+  [ "$said" = GROß ] || fail "Python: $said"
+done
 
 # --- As a part of another project: by itself once, since it builds the library.
 [ -x "$build_dir/bin/oracle_tests" ] || exit 0
