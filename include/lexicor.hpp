@@ -214,6 +214,7 @@ class Locale {
 
   LXLocale* get() const noexcept { return handle_.get(); }
   explicit operator bool() const noexcept { return handle_ != nullptr; }
+  /// In the locale's codepage, as all its texts.
   std::string name() const { return text(LX_ITEM_LOCALE_STRING); }
 
   // Items.

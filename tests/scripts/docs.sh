@@ -18,3 +18,5 @@ g++ $flags -std=c++17 -Wall -Wextra -Werror -I"$source_dir/include" "$work/page.
 # The first commands of docs/python.md, in this directory; Debian's Python has the word size of the system.
 [ -n "$flags" ] || [ "$(cd "$source_dir" && export PYTHONDONTWRITEBYTECODE=1 &&
   eval "$(grep -A1 '^    export LEXICOR_LIBRARY' docs/python.md | sed "s|\$PWD/build/m64|$build_dir|")")" = 1.234,50 ]
+[ -n "$flags" ] || [ ! -e "$build_dir/lib/lexicor.so" ] || EXTENSION=$build_dir/lib/lexicor.so \
+  "$source_dir/tests/scripts/transcript.py" "$source_dir" "$build_dir" "$source_dir/docs/sqlite.md"

@@ -67,6 +67,11 @@ for python in $([ -z "$flags" ] && type -P /usr/bin/python3); do  # of the word 
   [ "$said" = GROß ] || fail "Python: $said"
 done
 
+if [ -z "$flags" ] && [ -e prefix/lib/sqlite3/lexicor.so ] && type sqlite3 >/dev/null 2>&1; then
+  said=$(sqlite3 :memory: ".load prefix/lib/sqlite3/lexicor" "SELECT lexicor_convert(x'C7D9D6A1', 'IBM273', 'UTF-8')")
+  [ "$said" = GROß ] || fail "SQLite: $said"
+fi
+
 # --- As a part of another project: by itself once, since it builds the library.
 [ -x "$build_dir/bin/oracle_tests" ] || exit 0
 by_cmake inside -DLEXICOR_SOURCE="$source_dir" -DBUILD_SHARED_LIBS=OFF -DLEXICOR_INSTALL=ON -DDATA="$build_dir/locale"
