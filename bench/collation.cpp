@@ -103,9 +103,9 @@ std::vector<Library> libraries_of(const Text& text) {
   libraries.push_back({kWrapped,
                        [owner](const Word& a, const Word& b) { return owner->compare(a.units, b.units); },
                        [owner](const Word& a, const Word& b) { return owner->compare(a.utf8, b.utf8); },
-                       [owner](const Word& word, char* out) {
-                         const std::string key = owner->key(word.units);
-                         return key.copy(out, kKeyBytes);
+                       [owner, key = std::string()](const Word& word, char*) mutable {
+                         owner->key(word.units, &key);
+                         return key.size();
                        },
                        nullptr, nullptr});
   UErrorCode error = U_ZERO_ERROR;

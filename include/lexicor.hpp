@@ -63,8 +63,8 @@ inline std::error_code code(int32_t value) noexcept {
 
 /// Stands for an error_code that nobody gave: errors are thrown. Never written.
 inline std::error_code& throws() noexcept {
-  static std::error_code nobody;
-  return nobody;
+  alignas(std::error_code) static unsigned char nobody[sizeof(std::error_code)];  // made without a guard
+  return *reinterpret_cast<std::error_code*>(nobody);
 }
 
 namespace detail {
@@ -197,10 +197,11 @@ class Locale {
   explicit Locale(const std::string& name, int32_t flags = 0, std::error_code& error = throws()) {
     int32_t value = LX_OK;
     handle_.reset(LXGetLocale(name.c_str(), flags, &value));
+    learn();
     detail::report(handle_ != nullptr ? LX_OK : value, error);
   }
   /// Takes a handle over.
-  explicit Locale(LXLocale* handle) noexcept : handle_(handle) {}
+  explicit Locale(LXLocale* handle) noexcept : handle_(handle) { learn(); }
   /// The user's, as LX_LANG or the operating system has it.
   static Locale user(std::error_code& error = throws()) {
     return Locale("", LX_USER_LOCALE | LX_FALLBACK, error);
@@ -234,10 +235,14 @@ class Locale {
   void set(int32_t item, std::string_view value, std::error_code& error = throws()) {
     const int32_t length = detail::length_of(value.size());
     const int32_t done = LXSetLocaleTextInfoEx(get(), item, value.data(), LX_SHIFT_SINGLE, length, 0);
-    detail::report(done != 0 ? LX_OK : last_error(), error);
+    const int32_t code = done != 0 ? LX_OK : last_error();
+    learn();
+    detail::report(code, error);
   }
   void set(int32_t item, int32_t value, std::error_code& error = throws()) {
-    detail::report(LXSetLocaleNumInfo(get(), item, value) != 0 ? LX_OK : last_error(), error);
+    const int32_t code = LXSetLocaleNumInfo(get(), item, value) != 0 ? LX_OK : last_error();
+    learn();
+    detail::report(code, error);
   }
   /// The SHA-256 of an object's data, to be stored beside keys that were made with it.
   std::array<uint8_t, LX_DIGEST_BYTES> digest(int32_t type, std::error_code& error = throws()) const {
@@ -253,8 +258,9 @@ class Locale {
                   std::error_code& error = throws()) const {
     const int32_t a_bytes = detail::length_of(a.size()), b_bytes = detail::length_of(b.size());
     if (a_bytes < 0 || b_bytes < 0) return detail::report(LX_E_SIZE, error, 0);
-    const int32_t order =
-        LXStrcollEx(get(), a.data(), LX_SHIFT_SINGLE, a_bytes, b.data(), LX_SHIFT_SINGLE, b_bytes, options);
+    const int32_t order = shift_ ? LXStrcollEx(get(), a.data(), LX_SHIFT_SINGLE, a_bytes, b.data(),
+                                               LX_SHIFT_SINGLE, b_bytes, options)
+                                 : LXStrcoll(get(), a.data(), a_bytes, b.data(), b_bytes, options);
     return detail::report(order != 0 ? LX_OK : last_error(), error, order);
   }
   int32_t compare(std::u16string_view a, std::u16string_view b, uint32_t options = 0,
@@ -266,12 +272,23 @@ class Locale {
   }
   /// Bytes that order as compare() does. In binary order keys of 16-bit Unicode do not: see LXStrxfrm.
   std::string key(std::string_view text, uint32_t options = 0, std::error_code& error = throws()) const {
-    return key_of(text.size(), error, [&](uint8_t* output, int32_t size, int32_t length) {
+    std::string result;
+    return key(text, &result, options, error), result;
+  }
+  std::string key(std::u16string_view text, uint32_t options = 0, std::error_code& error = throws()) const {
+    std::string result;
+    return key(text, &result, options, error), result;
+  }
+  /// The same into a string that keeps its memory.
+  void key(std::string_view text, std::string* result, uint32_t options = 0,
+           std::error_code& error = throws()) const {
+    key_of(text.size(), result, error, [&](uint8_t* output, int32_t size, int32_t length) {
       return LXStrxfrmEx(get(), output, size, text.data(), LX_SHIFT_SINGLE, length, options);
     });
   }
-  std::string key(std::u16string_view text, uint32_t options = 0, std::error_code& error = throws()) const {
-    return key_of(text.size(), error, [&](uint8_t* output, int32_t size, int32_t length) {
+  void key(std::u16string_view text, std::string* result, uint32_t options = 0,
+           std::error_code& error = throws()) const {
+    key_of(text.size(), result, error, [&](uint8_t* output, int32_t size, int32_t length) {
       return LXStrxfrmU(get(), output, size, detail::units(text), length, options);
     });
   }
@@ -380,6 +397,10 @@ class Locale {
  private:
   int32_t last_error() const noexcept { return LXGetError(get()); }
 
+  /// Comparison asks it often. Whoever gives get() another codepage makes the owner anew.
+  void learn() noexcept {
+    shift_ = handle_ != nullptr && LXGetLocaleNumInfo(get(), LX_ITEM_CODEPAGE_SHIFT, 0) == 1;
+  }
   /// What one Unicode value can become, its shift byte counted.
   uint64_t character_bytes() const {
     return static_cast<uint64_t>(LXGetLocaleNumInfo(get(), LX_ITEM_CODEPAGE_WIDTH, 0)) +
@@ -396,20 +417,22 @@ class Locale {
   }
 
   template <class Write>
-  std::string key_of(size_t units, std::error_code& error, Write write) const {
+  void key_of(size_t units, std::string* result, std::error_code& error, Write write) const {
     const int32_t length = detail::length_of(units);
-    if (length < 0) return detail::report(LX_E_SIZE, error, std::string());
-    char buffer[256];
-    int32_t bytes = write(reinterpret_cast<uint8_t*>(buffer), sizeof buffer, length);
-    if (bytes < 0) return detail::report(last_error(), error, std::string());
-    if (bytes <= static_cast<int32_t>(sizeof buffer))
-      return detail::report(LX_OK, error, std::string(buffer, static_cast<size_t>(bytes)));
-    std::string key(static_cast<size_t>(bytes), '\0');
-    bytes = write(reinterpret_cast<uint8_t*>(key.data()), bytes, length);
-    return detail::report(bytes < 0 ? last_error() : LX_OK, error, std::move(key));
+    if (length < 0) return detail::report(LX_E_SIZE, error);
+    uint8_t buffer[1024];  // keys of shorter texts are made in place
+    int32_t bytes = write(buffer, sizeof buffer, length);
+    if (bytes <= static_cast<int32_t>(sizeof buffer)) {
+      result->assign(reinterpret_cast<const char*>(buffer), bytes < 0 ? 0 : static_cast<size_t>(bytes));
+    } else {
+      result->resize(static_cast<size_t>(bytes));
+      bytes = write(reinterpret_cast<uint8_t*>(result->data()), bytes, length);
+    }
+    detail::report(bytes < 0 ? last_error() : LX_OK, error);
   }
 
   std::unique_ptr<LXLocale, detail::Releaser<LXLocale, int32_t, LXReleaseLocale>> handle_;
+  bool shift_ = false;
 };
 
 /// Orders texts as a locale does: `std::sort(first, last, lexicor::Less(locale))`,
