@@ -11,6 +11,7 @@ import random
 import subprocess
 import sys
 import threading
+import tomllib
 
 import pytest
 
@@ -236,6 +237,11 @@ def test_the_page():
     failed, tried = doctest.testfile(f"{SOURCE}/docs/python.md", module_relative=False,
                                      optionflags=doctest.IGNORE_EXCEPTION_DETAIL)
     assert failed == 0 and tried > 20
+
+
+def test_the_version_is_the_library_s():
+    with open(f"{SOURCE}/bindings/python/pyproject.toml", "rb") as file:
+        assert tomllib.load(file)["project"]["version"] == lexicor.version()
 
 
 def test_without_data_codecs_say_why():

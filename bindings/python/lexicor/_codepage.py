@@ -21,7 +21,6 @@ _SINGLE = 0
 _REPLACEMENT = "\ufffd"
 _PIECE = 1 << 24  # characters that are encoded at once
 _MOST = 0x7FFFFFF0  # bytes
-_SHIFTS = (b"\x0f", b"\x0e")  # by the state that they lead to
 _PREFIX = "lexicor"
 _locales = threading.local()
 
@@ -91,6 +90,9 @@ class Codepage:
         if self._stands_in(codes, back):
             there.remove(0xFFFD)
         self._wide = frozenset(map(chr, (unit for unit in there if codes[unit] > 0xFF))) if self.shift else frozenset()
+        # The bytes that lead to the states: none where no character needs one.
+        wide = next(iter(self._wide), None)
+        self._shifts: Tuple[bytes, ...] = () if wide is None else (self.close(1), self._convert(wide, _SINGLE)[0][:1])
         self._has_replacement = 0xFFFD in there
         ranges: list[list[int]] = []
         for unit in there:
@@ -212,7 +214,7 @@ class Codepage:
         return _native.text_of(buffer, count), end, state_there
 
     def _only_shift(self, data: bytes) -> bool:
-        return self.shift and data in _SHIFTS
+        return data in self._shifts
 
     def _first_lost(self, data: bytes, at: int, state: int, text: str) -> Optional[Tuple[int, int, int, int]]:
         """Which character of a text has no Unicode value, where its bytes begin and end, and its state."""
@@ -220,8 +222,8 @@ class Codepage:
         while index >= 0:
             if index > done:
                 at, state = self._moved(data, at, state, index - done, CHARACTERS)
-            while self.shift and data[at : at + 1] in _SHIFTS:
-                state, at = _SHIFTS.index(data[at : at + 1]), at + 1
+            while data[at : at + 1] in self._shifts:
+                state, at = self._shifts.index(data[at : at + 1]), at + 1
             end = self._end_of(data, at, state)
             if not (self._has_replacement and data[at:end] == self._convert(_REPLACEMENT, _SINGLE)[0]):
                 return index, at, end, state
