@@ -3,10 +3,10 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
-#include <fstream>
 #include <map>
 
 #include "lexicor.hpp"
+#include "support/catalog_builder.h"
 
 namespace lexicor {
 namespace {
@@ -159,6 +159,19 @@ TEST_F(CppTest, Streams) {
   while (const auto line = reader.line()) lines.push_back(convert(utf8_, host_, *line));
   EXPECT_EQ(lines, (std::vector<std::string>{"日本\n", "語\n", "\n", "end"}));
   EXPECT_THROW(reader.line(), std::runtime_error);
+}
+
+// Messages of any length, also those that fill what is tried first but a byte.
+TEST_F(CppTest, Messages) {
+  const lx::test::ScratchDirectory directory;
+  std::map<uint32_t, std::string> messages;
+  for (uint32_t bytes = 1; bytes <= 1100; bytes += bytes < 240 || bytes > 260 ? 83 : 1)
+    messages[bytes] = std::string(bytes, 'x');
+  directory.write("app.cat", lx::test::catalog_file({{1, messages}}));
+  const Catalog catalog(german_, directory.file("app.cat"));
+  for (const auto& [bytes, text] : messages) EXPECT_EQ(catalog.message(1, bytes), text) << bytes;
+  EXPECT_EQ(catalog.message(2, 1, "otherwise"), "otherwise");
+  EXPECT_THROW(catalog.message(2, 1), std::system_error);
 }
 
 }  // namespace
