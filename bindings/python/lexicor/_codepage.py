@@ -42,6 +42,11 @@ def _simple(name: str) -> str:
     return re.sub(r"[^0-9a-z]", "", name.lower())
 
 
+def _in_class(unit: int) -> str:
+    """A character in a class of a regular expression, where some of ASCII have a meaning."""
+    return f"\\x{unit:02x}" if unit < 0x80 else chr(unit)
+
+
 class _Decoded(NamedTuple):
     text: str
     consumed: int
@@ -86,7 +91,8 @@ class Codepage:
         lib.LXUnicodeToStringW(locale, codes, 0x10000, every.buffer_info()[0], 0x10000, 0)
         lib.LXStringToUnicodeW(back, 0x10000, locale, codes, 0x10000, 0)
         # What comes back as it was, is in the codepage. Surrogates come back from UTF-8, and are no characters.
-        there = [unit for unit, other in enumerate(back) if unit == other and not 0xD800 <= unit < 0xE000]
+        same = [unit for unit, other in enumerate(memoryview(back).cast("B").cast("H").tolist()) if unit == other]
+        there = [unit for unit in same if not 0xD800 <= unit < 0xE000]
         if self._stands_in(codes, back):
             there.remove(0xFFFD)
         self._wide = frozenset(map(chr, (unit for unit in there if codes[unit] > 0xFF))) if self.shift else frozenset()
@@ -100,7 +106,7 @@ class Codepage:
                 ranges[-1][1] = unit
             else:
                 ranges.append([unit, unit])
-        self._lacking = re.compile("[^" + "".join(f"\\u{a:04x}-\\u{b:04x}" for a, b in ranges) + "]+")
+        self._lacking = re.compile("[^" + "".join(f"{_in_class(a)}-{_in_class(b)}" for a, b in ranges) + "]+")
         self.characters = "".join(map(chr, there))
 
     @staticmethod
