@@ -7,6 +7,7 @@
 
 #include "character_values.h"
 #include "hex.h"
+#include "utf8_text.h"
 
 namespace lexicor_cli {
 
@@ -28,15 +29,7 @@ constexpr Word kText[] = {{LX_C3_NON_SPACING, "NON_SPACING"}, {LX_C3_DIACRITIC, 
 
 std::string utf8(uint32_t c) {
   std::string text;
-  const auto trail = [&](int shift) { text += static_cast<char>(0x80 | (c >> shift & 0x3F)); };
-  if (c < 0x80) return std::string(1, static_cast<char>(c));
-  if (c < 0x800) {
-    text += static_cast<char>(0xC0 | c >> 6);
-  } else {
-    text += static_cast<char>(0xE0 | c >> 12);
-    trail(6);
-  }
-  trail(0);
+  append_utf8(text, c);
   return text;
 }
 
