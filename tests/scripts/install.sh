@@ -73,7 +73,7 @@ if [ -z "$flags" ] && [ -e prefix/lib/sqlite3/lexicor.so ] && type sqlite3 >/dev
 fi
 
 # --- As a part of another project: by itself once, since it builds the library.
-[ -x "$build_dir/bin/oracle_tests" ] || exit 0
+grep -q '^LEXICOR_ORACLE:BOOL=ON' "$build_dir/CMakeCache.txt" || exit 0
 by_cmake inside -DLEXICOR_SOURCE="$source_dir" -DBUILD_SHARED_LIBS=OFF -DLEXICOR_INSTALL=ON -DDATA="$build_dir/locale"
 [ ! -e inside/_deps/lexicor-build/bin ] || fail 'tools, which nobody asked for'
 archive=inside/_deps/lexicor-build/lib/liblexicor.a
