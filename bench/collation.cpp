@@ -10,6 +10,7 @@
 #include <cstdio>
 #include <random>
 
+#include "lexicor.hpp"
 #include "rows.h"
 
 namespace bench {
@@ -98,6 +99,15 @@ std::vector<Library> libraries_of(const Text& text) {
          return LXStrstrU(locale.get(), reinterpret_cast<const LXUChar*>(all.data()), length(all.size()),
                           lx_units(word), length(word.units.size()), 0) != nullptr;
        }});
+  const auto owner = std::make_shared<const lexicor::Locale>(text.locale);
+  libraries.push_back({kWrapped,
+                       [owner](const Word& a, const Word& b) { return owner->compare(a.units, b.units); },
+                       [owner](const Word& a, const Word& b) { return owner->compare(a.utf8, b.utf8); },
+                       [owner, key = std::string()](const Word& word, char*) mutable {
+                         owner->key(word.units, &key);
+                         return key.size();
+                       },
+                       nullptr, nullptr});
   UErrorCode error = U_ZERO_ERROR;
   const std::shared_ptr<UCollator> icu(ucol_open(text.icu, &error), ucol_close);
   // The order that the shipped sorts have: punctuation counts only where all else is equal.

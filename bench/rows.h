@@ -18,10 +18,11 @@ struct Pieces {
 };
 
 struct Peer {
-  const char* name;                  // kOurs, kIcu, kIconv, kMemcpy
+  const char* name;                  // kOurs, kWrapped, kIcu, kIconv, kMemcpy
   std::function<size_t(char*)> run;  // does the work on all pieces; into a buffer, where it gives bytes
 };
 inline constexpr const char* kOurs = "lexicor";
+inline constexpr const char* kWrapped = "lexicor.hpp";
 inline constexpr const char* kIcu = "icu";
 inline constexpr const char* kIconv = "iconv";
 inline constexpr const char* kMemcpy = "memcpy";

@@ -6,8 +6,9 @@
  *
  * Conventions:
  *  1. Null locale. A null LXLocale means the default locale, set by LXSetLocale.
- *  2. Errors. Each function that takes a locale leaves a code of lx/base.h there; LXGetError reads it.
- *     A call before LXInit or after the last LXTerm is refused and touches nothing.
+ *  2. Errors. Each function that takes a locale leaves a code of lx/base.h there; LXGetError reads it,
+ *     LXGetErrorText says it in English. A call before LXInit or after the last LXTerm is refused and
+ *     touches nothing.
  *  3. Forms. No suffix: a byte string in the locale's codepage. W: packed codes (LXWChar). U: 16-bit
  *     Unicode (LXUChar). Ex: a byte string of a shift-sensitive codepage with a shift state. S: takes a
  *     shift state in place of the lead byte's length.
@@ -37,6 +38,8 @@
 #ifndef LX_H
 #define LX_H
 
+/* The version of these headers: major * 65536 + minor * 256 + patch, and as text. LXVersion gives the library's. */
+#define LX_VERSION_NUMBER 0x010000
 #define LX_VERSION "1.0.0"
 
 #include "lx/base.h"

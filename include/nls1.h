@@ -21,9 +21,12 @@ extern "C" {
 #define NLS1_THREAD 0x40000000
 #define NLS1_PROCESS ((int32_t)-0x7FFFFFFF - 1) /* bit 0x80000000 */
 
+/* What NLS1_GetLocale says when the process could not be initialised; elsewhere that is LX_E_NOT_INITIALIZED. */
+enum { NLS1_E_PROCESS = 1 };
+
 /* Creates a locale from identifiers (0: not given); the caller releases it with LXReleaseLocale. `flags` are
- * those of LXGetLocale. Null with `*rc` (may be null) 1 (the process could not be initialised),
- * LX_E_NO_CODEPAGE, LX_E_NO_LANGUAGE or LX_E_NO_TERRITORY (unknown identifier), or as for LXGetLocale. */
+ * those of LXGetLocale. Null with `*rc` (may be null) NLS1_E_PROCESS, LX_E_NO_CODEPAGE,
+ * LX_E_NO_LANGUAGE or LX_E_NO_TERRITORY (unknown identifier), or as for LXGetLocale. */
 LX_API LXLocale* NLS1_GetLocale(int32_t language_territory, int32_t codepage, int32_t flags, int32_t* rc);
 
 /* Sets the process's default locale from identifiers. With NLS1_THREAD it is the thread's locale that is asked

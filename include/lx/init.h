@@ -1,4 +1,4 @@
-/* Lexicor: initialisation, allocation hooks, environment and the last error. */
+/* Lexicor: initialisation, version, allocation hooks, environment and errors. */
 #ifndef LX_INIT_H
 #define LX_INIT_H
 
@@ -37,6 +37,16 @@ LX_API int32_t LXTerm(void);
 /* The code that the last call left in `locale` (null: the default locale); LX_E_NOT_INITIALIZED when there is
  * none. */
 LX_API int32_t LXGetError(const LXLocale* locale);
+
+/* What a return code means, in English: a null-terminated text of ASCII, never null, that begins with a small letter
+ * and has no full stop, so that it can stand in a message. It belongs to the library and stays the same. A code of
+ * which nothing is known has a text too. Needs no initialised library. */
+LX_API const char* LXGetErrorText(int32_t code);
+
+/* The version of the library that a program runs with, as LX_VERSION_NUMBER counts it: that of the headers which it
+ * was compiled with is LX_VERSION_NUMBER itself. `text`, which may be null, receives the version as text, LX_VERSION,
+ * which belongs to the library. Needs no initialised library. */
+LX_API uint32_t LXVersion(const char** text);
 
 /* The default allocation hook: malloc. `context` is not used. */
 LX_API void* LXDefAlloc(void* context, size_t bytes);

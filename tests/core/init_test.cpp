@@ -1,5 +1,8 @@
 // Initialisation: counting, return codes, hooks, and what happens after a failed or a final call.
 #include <climits>
+#include <fstream>
+#include <regex>
+#include <set>
 
 #include "core/library_fixture.h"
 #include "core/lxalias.h"
@@ -27,6 +30,26 @@ TEST_F(InitTest, CountsUsesAndEndsWithTheLast) {
   EXPECT_EQ(LXTerm(), LX_OK);
   EXPECT_EQ(hooks.live_blocks(), 0u);
   EXPECT_EQ(LXTerm(), LX_E_NOT_INITIALIZED);
+}
+
+// Every code of the headers has a name and words of its own.
+TEST_F(InitTest, SaysWhatACodeMeans) {
+  std::ifstream header(LEXICOR_DATA_DIR "/../include/lx/base.h");
+  const std::regex code("^  LX_(OK|[EW]_[A-Z_]+) = ([0-9]+)");
+  std::set<std::string> texts = {LXGetErrorText(3)};
+  EXPECT_STREQ(LXGetErrorText(INT32_MIN), LXGetErrorText(INT32_MAX));
+  std::smatch found;
+  for (std::string line; std::getline(header, line);)
+    if (std::regex_search(line, found, code)) {
+      const std::string text = LXGetErrorText(std::stoi(found[2]));
+      EXPECT_TRUE(islower(text[0]) && text.back() != '.' && texts.insert(text).second) << line << ": " << text;
+    }
+  EXPECT_EQ(texts.size(), 35u);
+  const char* version = nullptr;
+  int part[3];
+  EXPECT_EQ(LXVersion(nullptr), LXVersion(&version));
+  ASSERT_EQ(sscanf(version, "%d.%d.%d", &part[0], &part[1], &part[2]), 3);
+  EXPECT_EQ(LXVersion(nullptr), static_cast<uint32_t>(part[0] << 16 | part[1] << 8 | part[2]));
 }
 
 // Only the whole option forbids the built-in objects.

@@ -3,5 +3,5 @@
 set -euo pipefail
 [[ "$(clang-format --version 2>/dev/null)" == *'version 14.'* ]] || exit 77
 cd "$1"
-find src include tools tests fuzz bench -name '*.h' -o -name '*.c' -o -name '*.cpp' |
+find src include tools tests fuzz bench bindings -name '*.h' -o -name '*.hpp' -o -name '*.c' -o -name '*.cpp' |
   xargs -P "$(nproc)" -n 20 clang-format --dry-run -Werror

@@ -43,6 +43,7 @@ struct Subcommand {
   Declare declare;
 };
 
+Run declare_chart(Arguments& command, const CommonOptions& common);
 Run declare_compare(Arguments& command, const CommonOptions& common);
 Run declare_convert(Arguments& command, const CommonOptions& common);
 Run declare_explain(Arguments& command, const CommonOptions& common);

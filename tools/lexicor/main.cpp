@@ -27,6 +27,7 @@ constexpr Subcommand kSubcommands[] = {
     {"message", "Fetch a message of a message catalog", declare_message},
     {"info", "Show the items of a locale", declare_info},
     {"list", "List the objects of the locale directory, or the operating system's locales", declare_list},
+    {"chart", "Show a codepage, 16 by 16, and what differs from another one", declare_chart},
     {"native", "Show what an operating-system name of a locale stands for", declare_native},
 };
 

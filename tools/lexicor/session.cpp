@@ -83,25 +83,7 @@ std::string locale_directory() {
 }
 
 std::string describe_code(int code) {
-  static const struct {
-    int code;
-    const char* text;
-  } kTexts[] = {{LX_E_OPEN, "the file cannot be opened"},
-                {LX_E_NOT_INITIALIZED, "the library is not initialised"},
-                {LX_E_MEMORY, "out of memory"},
-                {LX_E_NO_CODEPAGE, "codepage not found"},
-                {LX_E_NO_LANGUAGE, "language not found"},
-                {LX_E_NO_SORT, "sort not found"},
-                {LX_E_NO_TERRITORY, "territory not found"},
-                {LX_E_NOT_FOUND, "object not found"},
-                {LX_E_FILE_NOT_FOUND, "file not found"},
-                {LX_E_FILE_ACCESS, "permission denied"},
-                {LX_E_FILE_IO, "the file is too short or cannot be read, or its name is too long"},
-                {LX_E_CORRUPT, "the file is damaged or not of this kind"}};
-  for (const auto& row : kTexts) {
-    if (row.code == code) return row.text;
-  }
-  return "error " + std::to_string(code);
+  return LXGetErrorText(code);
 }
 
 std::string load_problem(int type, const std::string& title, const std::string& name, int code) {
