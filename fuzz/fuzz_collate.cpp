@@ -51,8 +51,8 @@ void orders_alike(const F& form, const Place& at, const Block<typename F::Unit>&
                (!kBytes && options == LX_WIDTH_INSENSITIVE),
            "binary order is comparison");
     // In binary order keys of units are as the machine stores them, and folding is not that of comparison.
-    // Shift bytes are in the key but not compared.
-    if (at.sort == nullptr && (!kBytes || options != 0 || at.shift)) continue;
+    // Shift bytes, and a character that the end cuts, are in the key but not compared.
+    if (at.sort == nullptr && (!kBytes || options != 0 || at.width > 1)) continue;
     must(sign(order) == -sign(form.coll(l, b.data(), b.size(), a.data(), a.size(), options)),
          "the other way round it is the other way");
     const std::string first = key_of(form, at, a, options), second = key_of(form, at, b, options);
@@ -134,9 +134,18 @@ void key_of_elements(const std::string& key, const std::vector<Element>& element
     expected += {static_cast<char>(*w >> 8), static_cast<char>(*w)};
   expected += '\0';
   must(key.compare(0, expected.size(), expected) == 0, "a key begins with the primary weights");
-  const size_t weights = static_cast<size_t>(s_end - secondaries.data() + (t_end - tertiaries.data()));
-  const size_t special_bytes = static_cast<size_t>(x_end - specials.data()) * 2;
-  must(key.size() <= expected.size() + weights + 2 + special_bytes, "and has no more than all weights");
+  size_t at = expected.size();
+  const auto level = [&](const uint8_t* begin, const uint8_t* end) {
+    const size_t stop = std::min(key.find('\0', at), key.size());
+    const uint8_t *const written_end = begin + (stop - at), *const kept =
+                                                                reinterpret_cast<const uint8_t*>(key.data()) +
+                                                                at;
+    must(written_end <= end && std::equal(begin, written_end, kept), "then come those of the next level");
+    must(std::all_of(written_end, end, [&](uint8_t weight) { return weight == end[-1]; }),
+         "less the default at the end");
+    at = stop + 1;
+  };
+  level(secondaries.data(), s_end), level(tertiaries.data(), t_end);
 }
 
 void forms_agree(const Place& at, const Units& text) {
