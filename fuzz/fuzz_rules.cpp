@@ -2,8 +2,8 @@
 // that were read and written are read as the same rules.
 #include <sstream>
 
+#include "fuzz.h"
 #include "sort_builder.h"
-#include "support/use_codepage.h"
 #include "ucm.h"
 
 namespace {
@@ -38,9 +38,9 @@ SortRoot small_root() {
 
 }  // namespace
 
-extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
+FUZZ_TARGET(rules) {
   static const SortRoot root = small_root();
-  const std::string text(reinterpret_cast<const char*>(data), size);
+  const std::string text = in.rest();
   try {
     std::ostringstream written, again;
     write_rules(written, read_rules(text, "rules"));
@@ -51,10 +51,9 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
       return name == "own" ? RuleFile{"own", text} : RuleFile{};
     };
     const std::string sort = text_of(build_sort(root, {"rules", text}, find, notes));
-    std::istringstream in(sort);
-    lx::test::must(text_of(read_sort(in, "sort")) == sort, "a sort is read as it was written");
+    std::istringstream again_in(sort);
+    lx::test::must(text_of(read_sort(again_in, "sort")) == sort, "a sort is read as it was written");
   } catch (const SourceError& error) {
     lx::test::must(!error.file.empty(), "a fault names its file");
   }
-  return 0;
 }

@@ -3,18 +3,17 @@
 #include <sstream>
 
 #include "compile.h"
+#include "fuzz.h"
 #include "sense.h"
-#include "support/use_codepage.h"
 
-extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
+FUZZ_TARGET(toml) {
   using namespace lexicor_data;
-  if (size == 0) return 0;
-  const ObjectName name{data[0] % 2 == 0 ? ObjectType::kLanguage : ObjectType::kTerritory, 1, "Fuzz", 0};
-  const std::string text(reinterpret_cast<const char*>(data) + 1, size - 1);
+  const ObjectName name{in.byte() % 2 == 0 ? ObjectType::kLanguage : ObjectType::kTerritory, 1, "Fuzz", 0};
+  const std::string text = in.rest();
   const Control control{{{ObjectType::kTerritory, 1, "Fuzz", 0}, {ObjectType::kCodepage, 57352, "UTF-8", 0}}};
   try {
-    std::istringstream in(text), sense(text);
-    const CompiledObject object = compile_object(in, "fuzz", name, control);
+    std::istringstream source(text), sense(text);
+    const CompiledObject object = compile_object(source, "fuzz", name, control);
     std::istringstream dumped(dump_object(read_object(object.bytes, "object"), name, &control, "object"));
     lx::test::must(compile_object(dumped, "dump", name, control).bytes == object.bytes,
                    "a dump compiles to the same");
@@ -24,5 +23,4 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
       check_territory_sense(sense, "fuzz");
   } catch (const SourceError&) {
   }
-  return 0;
 }

@@ -2,16 +2,16 @@
 #include <sstream>
 
 #include "compile.h"
-#include "support/use_codepage.h"
+#include "fuzz.h"
 #include "ucm.h"
 
-extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
+FUZZ_TARGET(ucm) {
   using namespace lexicor_data;
-  const std::string text(reinterpret_cast<const char*>(data), size);
+  const std::string text = in.rest();
   const ObjectName name{ObjectType::kCodepage, 5000, "Fuzz", 0};
   try {
-    std::istringstream in(text);
-    const CodepageSource source = read_ucm(in, "fuzz/Fuzz.ucm");
+    std::istringstream source_in(text);
+    const CodepageSource source = read_ucm(source_in, "fuzz/Fuzz.ucm");
     std::stringstream plain, brief, again;
     write_ucm(plain, source);
     write_ucm_source(brief, source, nullptr);
@@ -24,5 +24,4 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
                    "a dump compiles to the same");
   } catch (const SourceError&) {
   }
-  return 0;
 }

@@ -112,15 +112,13 @@ class ExDoor : ExPlaces {
   }
 
  private:
-  static constexpr Place kPlace[] = {kPlaces...};
-
   template <class Given, size_t... kAt>
   static auto call(const Given& given, std::index_sequence<kAt...>) {
     return kDoor(argument<kAt>(given)...);
   }
   template <size_t kAt, class Given>
   static auto argument(const Given& given) {
-    constexpr Place place = kPlace[kAt];
+    constexpr Place place = place_of(kAt);
     if constexpr (place == A)
       return std::get<given_before(kAt)>(given);
     else if constexpr (place == R || place == K)
@@ -128,9 +126,13 @@ class ExDoor : ExPlaces {
     else
       return place == T ? states.text : place == S ? states.second : place == O ? states.output : 0;
   }
+  static constexpr Place place_of(size_t at) {
+    constexpr Place places[] = {kPlaces...};
+    return places[at];
+  }
   static constexpr size_t given_before(size_t at) {
     size_t count = 0;
-    for (size_t i = 0; i < at; ++i) count += kPlace[i] == A;
+    for (size_t i = 0; i < at; ++i) count += place_of(i) == A;
     return count;
   }
 };

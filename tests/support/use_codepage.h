@@ -3,18 +3,14 @@
 #pragma once
 
 #include <algorithm>
-#include <stdexcept>
 #include <string>
 #include <vector>
 
 #include "codepage/lxcodepage.h"
 #include "locale/lxlocale.h"
+#include "support/must.h"
 
 namespace lx::test {
-
-inline void must(bool holds, const char* rule) {
-  if (!holds) throw std::logic_error(rule);
-}
 
 /// Looks up every `step`th pair of bytes, where it begins a character at the very end of a block, and such codes.
 inline void look_up(LXLocale* locale, unsigned step) {
