@@ -65,6 +65,7 @@ bool create_for_writing(LXFile* file, const char* path, bool no_temporary) {
   }
   file->write_only = 1;
   file->descriptor = creat(name, kPermission);
+  if (file->descriptor == 0) close(0);  // nobody else would
   return file->descriptor != 0;
 }
 

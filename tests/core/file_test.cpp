@@ -113,7 +113,7 @@ TEST_F(FileTest, DescriptorRulesOfCreation) {
   close(0);
   LXFile* const created = open_file("zero.txt", LX_WRITE, 1);
   const int32_t write_code = rc;
-  close(0);
+  const int left_open = close(0);
   file = open_file("zero.txt", LX_READ);
   const int32_t read_descriptor = file != nullptr ? file->descriptor : -2;
   if (file != nullptr) LXCloseFile(file, 0);
@@ -121,6 +121,7 @@ TEST_F(FileTest, DescriptorRulesOfCreation) {
   close(saved);
   EXPECT_EQ(created, nullptr);
   EXPECT_EQ(write_code, LX_E_OPEN);
+  EXPECT_EQ(left_open, -1) << "the descriptor is closed";
   EXPECT_EQ(read_descriptor, 0) << "reading takes any descriptor";
 }
 

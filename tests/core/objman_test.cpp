@@ -8,8 +8,10 @@
 #include <filesystem>
 #include <thread>
 
+#include "codepage/lxcodepage.h"
 #include "core/tiny_directory.h"
 #include "support/case_rows.h"
+#include "support/forms.h"
 
 namespace lx::test {
 namespace {
@@ -239,6 +241,40 @@ TEST_F(ObjManTest, ManyThreadsLoadAnObjectOnce) {
 }
 
 // What alias files hold and how an alias is found stands in tests/cases/cli/aliases.txt.
+// What is loaded stays, whatever becomes of its file; what is loaded later comes from the file that is there then.
+TEST_F(ObjManTest, FilesThatChangeUnderARunningProgram) {
+  write_tiny_directory(directory);
+  ASSERT_EQ(init(directory.path().c_str(), LX_NO_DEFAULTS), LX_OK);
+  LXLocale* const locale = LXGetLocale("English_UnitedStates.TINY-SJIS@Default", 0, &rc);
+  ASSERT_NE(locale, nullptr);
+  const std::string before = state_of(locale);
+  for (const auto& entry : std::filesystem::directory_iterator(directory.path())) {
+    const std::string name = entry.path().filename().string();
+    ByteString content = directory.read(name);
+    if (name == "cp_09003.nls") continue;  // replaced as a whole, by a rename
+    std::fill(content.begin() + std::min<ptrdiff_t>(4, count_of(content)), content.end(), 0xFF);
+    directory.write(name, content);  // in place
+  }
+  directory.write("fresh", object_file(tiny_single().file.sections));
+  std::filesystem::rename(directory.file("fresh"), directory.file("cp_09003.nls"));
+  EXPECT_EQ(state_of(locale), before);
+  LXLocale* const again = LXGetLocale("English_UnitedStates.TINY-SJIS@Default", 0, &rc);
+  ASSERT_NE(again, nullptr);
+  EXPECT_EQ(state_of(again), before);
+  EXPECT_EQ(by_id(LX_CODEPAGE, 9004), nullptr);
+  EXPECT_EQ(rc, LX_E_FILE_IO);
+  const LXObject* const replaced = by_id(LX_CODEPAGE, 9003);
+  ASSERT_NE(replaced, nullptr);
+  EXPECT_EQ(codepage_of(*replaced).width, 1);
+  std::filesystem::rename(directory.path(), directory.path() + ".away");
+  EXPECT_EQ(by_id(LX_CODEPAGE, 9005), nullptr);
+  EXPECT_EQ(rc, LX_E_FILE_NOT_FOUND);
+  EXPECT_EQ(state_of(locale), before);
+  std::filesystem::rename(directory.path() + ".away", directory.path());
+  EXPECT_EQ(LXReleaseLocale(again), LX_OK);
+  EXPECT_EQ(LXReleaseLocale(locale), LX_OK);
+}
+
 TEST_F(ObjManTest, EachManagerHasItsOwn) {
   ScratchDirectory other;
   other.write("control.nls", control_file({{1, LX_LANGUAGE, "Other"}}));

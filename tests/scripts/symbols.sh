@@ -20,5 +20,7 @@ undefined=$(nm -D --undefined-only "$library")
 if grep -qE '__(asan|tsan|ubsan)_' <<<"$undefined"; then exit 0; fi
 needed=$(readelf -d "$library" | sed -n 's/.*NEEDED.*\[\(.*\)\]/\1/p' | grep -vE '^(libc|libm)\.so' || true)
 [ -z "$needed" ] || { echo "symbols: needs $needed" >&2; exit 1; }
+# A privileged program ignores its caller's environment.
+if grep -qw 'U getenv' <<<"$undefined"; then echo 'symbols: getenv is not secure' >&2; exit 1; fi
 runtime=$(awk '{print $2}' <<<"$undefined" | grep -E '^(_Z|__cxa_(throw|begin|end|guard|pure|alloc)|__gxx)' || true)
 [ -z "$runtime" ] || { echo "symbols: C++ runtime symbols: $runtime" >&2; exit 1; }

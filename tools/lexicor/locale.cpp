@@ -1,4 +1,4 @@
-// Each object that is named is loaded by itself first: locale creation does not tell an object's own data from
+// Each object that is named, and each that the language has for what is not, is loaded by itself first: locale creation does not tell an object's own data from
 // the built-in data that take the place of a file that cannot be used.
 #include "locale.h"
 
@@ -7,6 +7,7 @@
 #include <clocale>
 #include <cstdlib>
 #include <iostream>
+#include <map>
 #include <sstream>
 #include <vector>
 
@@ -29,42 +30,66 @@ std::string problem_of(const LocalePart& part, int code) {
   return load_problem(part.type, part.title, part.name, code);
 }
 
+/// The first object of a type that can be loaded, or the first of all, on built-in data. An object is loaded once: those
+/// that cannot be are noted with why.
+std::string first_usable(const Catalogue& catalogue, int type, std::map<std::string, int>* unusable) {
+  std::string first;
+  for (const CatalogueObject& object : catalogue.objects) {
+    if (object.type != type) continue;
+    const int code = load_part({type, "", object.name});
+    if (code == LX_OK) return object.name;
+    (*unusable)[object.name] = code;
+    if (first.empty()) first = object.name;
+  }
+  return first;
+}
+
+/// Why a part that a locale name leaves out, and that the language says then, cannot be used; an empty text when all
+/// can. The parts that are named can be used.
+std::string problem_of_defaults(const std::string& name) {
+  LocaleName parts(name);
+  constexpr int32_t kDefaults[] = {LX_ITEM_DEFAULT_TERRITORY, LX_ITEM_DEFAULT_CODEPAGE, LX_ITEM_DEFAULT_SORT};
+  const auto named = [](const LocalePart& part) { return !part.name.empty(); };
+  if (std::all_of(std::begin(parts.parts), std::end(parts.parts), named)) return {};
+  const Catalogue catalogue = read_catalogue();
+  std::map<std::string, int> unusable;
+  // What the language says is read from a locale that needs none of it.
+  const std::string other = parts.parts[LX_LANGUAGE].name + "_" +
+                            first_usable(catalogue, LX_TERRITORY, &unusable) + "." +
+                            first_usable(catalogue, LX_CODEPAGE, &unusable) + "@BINARY";
+  const LocalePtr locale(LXGetLocale(other.c_str(), 0, nullptr));
+  for (const int32_t item : kDefaults) {
+    LocalePart& part = parts.parts[LX_TERRITORY + (item - kDefaults[0])];
+    if (named(part) || locale == nullptr) continue;
+    part.name = text_item(locale.get(), item).value_or("");
+    const auto found = unusable.find(part.name);
+    const std::string problem = problem_of(part, found != unusable.end() ? found->second : load_part(part));
+    if (!problem.empty()) return problem;
+  }
+  return {};
+}
+
 /// Throws a Failure for the first part that cannot be used; `not_found` is its exit code where there is no such
 /// object.
 void check_parts(const std::string& name, ExitCode not_found) {
+  const std::string begin = "no locale '" + name + "': ";
   for (const LocalePart& part : LocaleName(name).parts) {
     const int code = load_part(part);
     if (code == LX_OK) continue;
-    const std::string text = "no locale '" + name + "': " + problem_of(part, code);
+    const std::string text = begin + problem_of(part, code);
     if (code != LX_E_NOT_FOUND) throw Failure(kDataError, text);
     throw Failure(not_found, text + " ('lexicor list " + kListNames[part.type] +
                                  "' shows those there are; a locale is named "
                                  "LANGUAGE[_TERRITORY][.CODEPAGE][@SORT])");
   }
-}
-
-/// Why a locale cannot be created whose named parts can be used: a default of its language cannot be.
-std::string problem_of_defaults(const std::string& name, int code) {
-  const Catalogue catalogue = read_catalogue();
-  LocaleName parts(name);
-  const std::string language =
-      load_part(parts.parts[LX_LANGUAGE]) == LX_OK ? parts.parts[LX_LANGUAGE].name : "";
-  const std::string sound =
-      language + "_" + catalogue.first_name(LX_TERRITORY) + "." + catalogue.first_name(LX_CODEPAGE) + "@BINARY";
-  const LocalePtr locale(LXGetLocale(sound.c_str(), 0, nullptr));
-  constexpr int32_t kDefaults[] = {LX_ITEM_DEFAULT_TERRITORY, LX_ITEM_DEFAULT_CODEPAGE, LX_ITEM_DEFAULT_SORT};
-  for (const int32_t item : kDefaults) {
-    LocalePart& part = parts.parts[LX_TERRITORY + (item - kDefaults[0])];
-    if (locale == nullptr || load_part(part) == LX_OK) part.name = text_item(locale.get(), item).value_or("");
-    const std::string problem = problem_of(part, load_part(part));
-    if (!problem.empty()) return problem;
-  }
-  return "a default of its language is not there (code " + std::to_string(code) + ")";
+  const std::string problem = problem_of_defaults(name);
+  if (!problem.empty()) throw Failure(kDataError, begin + problem);
 }
 
 LocalePtr opened(LXLocale* locale, int code, const std::string& name) {
   if (locale == nullptr)
-    throw Failure(kDataError, "no locale '" + name + "': " + problem_of_defaults(name, code));
+    throw Failure(kDataError, "no locale '" + name + "': a default of its language is not there (code " +
+                                  std::to_string(code) + ")");
   return LocalePtr(locale);
 }
 
@@ -131,7 +156,7 @@ std::string environment_locale() {
   setlocale(LC_ALL, before.c_str());
   if (!name.empty()) return name;
   for (const char* variable : {"LC_ALL", "LANG"}) {
-    const char* const value = std::getenv(variable);
+    const char* const value = secure_getenv(variable);
     if (value != nullptr && *value != '\0') return value;
   }
   return "C";
@@ -143,11 +168,11 @@ std::string first_problem(const std::string& name) {
     const std::string problem = problem_of(part, load_part(part));
     if (!problem.empty()) return problem;
   }
-  return {};
+  return problem_of_defaults(name);
 }
 
 LocalePtr open_user_locale() {
-  const char* const variable = std::getenv("LX_LANG");
+  const char* const variable = secure_getenv("LX_LANG");
   std::string name, problem;
   LXLocale* locale = nullptr;
   int32_t code = LX_OK;

@@ -51,7 +51,7 @@ class SearchReport {
   SearchReport(const MessageOptions& options, LXLocale* locale) {
     text_ << "searched:";
     add("--directory", options.directory);
-    const char* const variable = std::getenv(kSearchVariable);
+    const char* const variable = secure_getenv(kSearchVariable);
     if (variable != nullptr && std::strlen(variable) > kSearchVariableBytes)
       text_ << "\n  " << kSearchVariable << " is not used: it has " << std::strlen(variable) << " bytes, and "
             << kSearchVariableBytes << " are the most";

@@ -112,6 +112,7 @@ Output::Output(const std::string& path) : path_(path) {
   guard_temporary(temporary_);
   if (fchmod(fd_, mode_of(exists ? &status : nullptr)) != 0) {
     const int reason = errno;
+    close(fd_);
     unlink(temporary_.c_str());
     errno = reason;
     fail();

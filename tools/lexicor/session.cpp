@@ -44,7 +44,7 @@ std::string choose_directory(const std::string& named) {
     }
     return named;
   }
-  if (std::getenv(kDirectoryVariable) != nullptr) return {};
+  if (secure_getenv(kDirectoryVariable) != nullptr) return {};
   std::error_code error;
   const fs::path program = fs::read_symlink("/proc/self/exe", error);
   if (error) return {};
@@ -73,7 +73,7 @@ std::string reason_of_defaults(const char* directory) {
   int32_t code = LX_OK;
   LXObjManager* manager = LXInitObjManager(directory, 0, &code);
   if (manager != nullptr) LXTermObjManager(manager);
-  return describe_code(code);
+  return code != LX_OK ? describe_code(code) : "it could not be read a moment before";
 }
 
 }  // namespace
@@ -109,7 +109,7 @@ Session::Session(const CommonOptions& common) {
     throw Failure(kDataError, "the library cannot start: " + describe_code(code));
   built_in_only_ = code == LX_W_DEFAULTS;
   if (!built_in_only_) return;
-  const char* const variable = std::getenv(kDirectoryVariable);
+  const char* const variable = secure_getenv(kDirectoryVariable);
   std::cerr << g_program << ": no usable locale directory";
   if (argument != nullptr)
     std::cerr << " in " << directory;
