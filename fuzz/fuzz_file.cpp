@@ -98,6 +98,10 @@ void blocks(Input& in) {
 
 FUZZ_TARGET(file) {
   open_directory();
+  const char* version = nullptr;
+  must(LXVersion(&version) == LX_VERSION_NUMBER && strcmp(version, LX_VERSION) == 0,
+       "the headers' own library");
+  must(*LXGetErrorText(in.integer()) != '\0', "every code has a text");
   blocks(in);
   const std::string path = in.bytes(400);
   divide(path.c_str());

@@ -75,8 +75,8 @@ struct LXLocale {
   char* texts[8];             // items 62, 64, 68, 71, 72, 79, 80, 81, in the codepage
   uint16_t changed_unicode;   // which Unicode copies the caller has set
   LXUChar separators_unicode[5];
-  LXUChar* texts_unicode[8];  // the texts
-  int32_t last_error;         // last_error_of() and set_last_error()
+  LXUChar* texts_unicode[8];    // the texts
+  int32_t last_error;           // last_error_of() and set_last_error()
   lx::ReplacedTexts* replaced;  // by changes of territory
 };
 

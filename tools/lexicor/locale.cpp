@@ -1,5 +1,5 @@
-// Each object that is named, and each that the language has for what is not, is loaded by itself first: locale creation does not tell an object's own data from
-// the built-in data that take the place of a file that cannot be used.
+// Each object that is named, and each that the language has for what is not, is loaded by itself first: locale creation
+// does not tell an object's own data from the built-in data that take the place of a file that cannot be used.
 #include "locale.h"
 
 #include <algorithm>
