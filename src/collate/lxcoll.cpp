@@ -144,7 +144,7 @@ template <class Unit>
     options &= width ? rules.binary_width : rules.binary;
     if (text1.length >= 0) text1.length = static_cast<int32_t>(a.units);
     if (text2.length >= 0) text2.length = static_cast<int32_t>(b.units);
-    LXLocale own = *locale;  // whose last error no other thread writes
+    LXLocale own = own_record(*locale);
     const int32_t result = compare_binary(&own, form, text1, text2, options);
     *code = last_error_of(own);
     return result;

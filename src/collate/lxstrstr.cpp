@@ -236,7 +236,7 @@ Place<Cursor> find_part(LXLocale* locale, const Cursor& text, const Cursor& part
   if (!Cursor::kShifts && part.end - part.p > text.end - text.p) return {nullptr, text};
   const Fold fold = fold_of(options);
   if (fold == Fold::kNone) return find_exactly(text, part);
-  LXLocale own = *locale;  // whose last error no other thread writes
+  LXLocale own = own_record(*locale);
   return find_folded(&own, text, part, fold, options & LX_WIDTH_INSENSITIVE, code);
 }
 

@@ -6,6 +6,7 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <cstring>
 
 #include "lx.h"
 #include "platform/bss1.h"
@@ -88,6 +89,15 @@ inline int32_t last_error_of(const LXLocale& locale) {
 }
 inline void set_last_error(LXLocale& locale, int32_t code) {
   __atomic_store_n(&locale.last_error, code, __ATOMIC_RELAXED);
+}
+
+/// A copy of the record to work in, whose last error no other thread writes.
+inline LXLocale own_record(const LXLocale& locale) {
+  LXLocale own;
+  memcpy(&own, &locale, offsetof(LXLocale, last_error));
+  own.last_error = LX_OK;
+  own.replaced = locale.replaced;
+  return own;
 }
 
 enum LocaleFlag : uint16_t {
