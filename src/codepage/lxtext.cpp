@@ -4,6 +4,8 @@
 namespace lx {
 namespace {
 
+constexpr size_t kMostBytesAround = 8;  // more than a character and its shift bytes take
+
 /// Passes at most `most` characters as LX_CHARACTERS counts them, with the shift bytes on both sides; none at the
 /// end and before a character that it cuts. How many there were.
 template <class Cursor>
@@ -34,6 +36,27 @@ size_t bytes_of_chars(const Codepage& cp, const uint8_t* text, LXShiftState stat
 int32_t chars_counted(const Codepage& cp, const uint8_t* text, LXShiftState state, size_t bytes) {
   return with_cursor(cp, Form::kEx, state, text, bytes,
                      [](auto in) { return static_cast<int32_t>(pass_counted(&in, SIZE_MAX)); });
+}
+
+int32_t chars_before(const Codepage& cp, const ByteText& text, const ByteText& rest, const uint8_t* end) {
+  if (room(rest.p, end) <= kMostBytesAround) return -1;
+  return with_kind<uint8_t>(cp, Form::kEx, [&](auto kind) {
+    auto in = decltype(kind)::Cursor::over(cp, text.p, end, text.state);
+    int32_t chars = 0;
+    if constexpr (!decltype(in)::kShifts) {
+      in.end = rest.p;
+      chars = static_cast<int32_t>(pass_chars(&in, SIZE_MAX));
+    } else {
+      auto other = like(in, rest.p, room(rest.p, end), rest.state);
+      // Shift bytes side by side may be told apart in other ways from here than from there: until both agree.
+      while (in.p != other.p || in.state != other.state) {
+        const bool first = in.p <= other.p;
+        if (pass_counted(first ? &in : &other, 1) == 0) return -1;
+        chars += first ? 1 : -1;
+      }
+    }
+    return chars;
+  });
 }
 
 int32_t chars_in_bytes(const Codepage& cp, const uint8_t* text, LXShiftState state, size_t bytes) {

@@ -114,6 +114,10 @@ Text<Unit> text_of(const Unit* p, int32_t length) {
   return {p, length};
 }
 
+/// By how many characters the count of `rest`, which stands in `text`, is below that of `text`, as
+/// chars_counted() counts both; -1 when what stands before `end` does not tell.
+int32_t chars_before(const Codepage& cp, const ByteText& text, const ByteText& rest, const uint8_t* end);
+
 /// Its units, where a length counts units or, of bytes, characters. At most those up to the end of memory, so
 /// that the end of a text never wraps.
 template <class Unit>

@@ -103,64 +103,95 @@ int32_t span_of_set(LXLocale* given, Form form, const Text<Unit>& text, const Te
 
 // Tokens.
 
-/// Overwrites the character that ends a token, with the shift byte before it; one that the end of the text cuts
-/// as far as it goes. Moves to the characters that follow.
+/// Passes the character that ends a token, with the shift byte before it; one that the end of the text cuts as
+/// far as it goes.
 template <class Cursor>
-void overwrite_delimiter(Cursor* in) {
-  auto* const first = writable(in->p);
+void pass_delimiter(Cursor* in) {
   Walk at(*in);
   const bool whole = at.next();
   go_on_at(*in, at.in);
   if (!whole) in->p = in->end;
-  for (auto* p = first; p < in->p; ++p) *p = 0;
-  if constexpr (Cursor::kShifts) in->pass_last_shift();
 }
 
-/// Where the token begins, or null; `*rest` is left at the text that follows it.
+/// The first token of a text.
 template <class Cursor>
-Place<Cursor> take_token(Cursor* rest, const CharacterSet<Cursor>& set) {
-  Cursor start(*rest);
+struct Token {
+  Cursor start;
+  Cursor rest;
+  const typename Cursor::Unit *delimiter, *delimiter_end;  // the character that ends it, with its shift byte
+  bool found;
+};
+
+template <class Cursor>
+Token<Cursor> find_token(const Cursor& text, const CharacterSet<Cursor>& set) {
+  Cursor start(text);
   Span<Cursor> token = span(start, set, false);
   if (token.chars == 0 && token.behind.p < start.end) {
     go_on_at(start, span(start, set, true).behind);
-    go_on_at(*rest, start);
-    if (start.p == start.end) return {nullptr, start};
+    if (start.p == start.end) return {start, start, start.p, start.p, false};
     go_on_at(token.behind, span(start, set, false).behind);
   }
-  go_on_at(*rest, token.behind);
-  if (rest->p < rest->end) overwrite_delimiter(rest);
-  return {start.p, start};
+  Cursor rest(token.behind);
+  if (rest.p < rest.end) pass_delimiter(&rest);
+  const auto* const delimiter_end = rest.p;
+  if constexpr (Cursor::kShifts)
+    if (delimiter_end != token.behind.p) rest.pass_last_shift();
+  return {start, rest, token.behind.p, delimiter_end, true};
 }
 
-template <class Unit>
-int32_t length_of_rest(const Codepage& cp, const Text<Unit>& rest, size_t units, bool characters) {
-  if constexpr (sizeof(Unit) == 1)
-    if (characters) return chars_counted(cp, rest.p, rest.state, units);  // as the next call takes them
-  return static_cast<int32_t>(units);
+/// The length of what follows a token, as the next call takes it, of `part` of a text; -1 when the part does not
+/// tell what the whole would.
+template <class Unit, class Cursor>
+int32_t length_of_rest(const Codepage& cp, const Text<Unit>& whole, const Text<Unit>& part, bool characters,
+                       const Cursor& rest) {
+  if constexpr (sizeof(Unit) == 1) {
+    if (characters) {
+      const LXShiftState state = state_at(rest, whole.state);
+      if (part.length == whole.length) return chars_counted(cp, rest.p, state, room(rest.p, rest.end));
+      const int32_t before = chars_before(cp, whole, {rest.p, 0, state}, rest.end);
+      return before < 0 ? -1 : whole.length - before;
+    }
+  }
+  return static_cast<int32_t>(room(rest.p, rest.end));
 }
 
-/// `length` is that of the text, and receives that of the rest; so does `state`.
+/// `length` is that of the text, and receives that of the rest; so does `state`. A length in characters says how
+/// many are left without their being read: so no more is read than the token needs, in parts that grow.
 template <class Unit, class Char>
 Unit* tokenize(LXLocale* given, Form form, Unit* text, LXShiftState* state, int32_t* length,
                const Text<Unit>& set, Char** next, LXShiftState* token_state, uint32_t flags) {
+  constexpr int32_t kFirstPart = 64;
   Unit* const none = nullptr;
-  const bool usable = locale_of(given) != nullptr;
-  if (usable) *next = nullptr;
-  if (usable && text == nullptr) *length = 0;
-  const Text<Unit> whole{text, usable ? *length : 0, usable ? *state : 0};
-  return search(unit, given, form, whole, set, flags, LX_CHARACTERS, none,
-                [&](Call& call, const auto& in, const auto& characters) {
-                  if (text == nullptr) return call.exit(none);
-                  auto rest = in;
-                  const auto token = take_token(&rest, CharacterSet(characters));
-                  if (token.p != nullptr) put_state(token_state, state_at(token.in, whole.state));
-                  const Text<Unit> left{rest.p, 0, state_at(rest, whole.state)};
-                  *length = length_of_rest(codepage_of(call.codepage()), left, room(rest.p, rest.end),
-                                           (flags & LX_CHARACTERS) != 0);
-                  *state = left.state;
-                  if (rest.p < rest.end) *next = reinterpret_cast<Char*>(writable(rest.p));
-                  return call.exit(writable(token.p));
-                });
+  Call call(unit, given);
+  if (!call) return call.fail(LX_E_NOT_INITIALIZED, none);
+  *next = nullptr;
+  if (text == nullptr) *length = 0;
+  if ((flags & ~LX_CHARACTERS) != 0) return call.fail(LX_E_INVALID, none);
+  if (text == nullptr) return call.exit(none);
+  const Codepage& cp = codepage_of(call.codepage());
+  const bool characters = sizeof(Unit) == 1 && (flags & LX_CHARACTERS) != 0;
+  const size_t set_units = units_of(cp, set, characters);
+  const Text<Unit> whole{text, *length, *state};
+  Text<Unit> part = whole;
+  if (characters && whole.length > kFirstPart) part.length = kFirstPart;
+  Unit* token = none;
+  const auto take = [&](const auto& in) {
+    const auto found = find_token(in, CharacterSet(like(in, set.p, set_units, set.state)));
+    const int32_t left = length_of_rest(cp, whole, part, characters, found.rest);
+    if (left < 0) return false;
+    if (found.found) {
+      token = writable(found.start.p);
+      put_state(token_state, state_at(found.start, whole.state));
+    }
+    *length = left;
+    *state = state_at(found.rest, whole.state);
+    for (auto* p = writable(found.delimiter); p < found.delimiter_end; ++p) *p = 0;
+    if (found.rest.p < in.end) *next = reinterpret_cast<Char*>(writable(found.rest.p));
+    return true;
+  };
+  while (!with_cursor(cp, form, part, units_of(cp, part, characters), take))
+    part.length = part.length < whole.length / 2 ? part.length * 2 : whole.length;
+  return call.exit(token);
 }
 
 template <class Unit>
