@@ -7,6 +7,7 @@
 
 #include "command.h"
 #include "near_names.h"
+#include "notices.h"
 #include "output.h"
 
 namespace lexicor_cli {
@@ -121,7 +122,8 @@ bool Arguments::given() const {
 
 CommandLine::CommandLine(const char* program, const char* summary, const char* version)
     : program_(std::make_unique<CLI::App>(summary, program)) {
-  if (version != nullptr) program_->set_version_flag("--version", std::string(program) + " " + version);
+  program_->set_version_flag("--version", std::string(program) + " " + version);
+  program_->add_flag("-q,--quiet", g_quiet, "say nothing on standard error but errors");
 }
 CommandLine::~CommandLine() = default;
 
