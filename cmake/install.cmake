@@ -42,6 +42,36 @@ endif()
 if(LEXICOR_SQLITE)
   install(TARGETS lexicor_sqlite LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR}/sqlite3 COMPONENT sqlite)
 endif()
+
+find_program(LEXICOR_SCDOC scdoc)
+option(LEXICOR_MAN "Make and install the manual pages, where scdoc is there" ON)
+if(LEXICOR_MAN AND LEXICOR_SCDOC)
+  set(manuals "")
+  file(GLOB pages CONFIGURE_DEPENDS man/*.scd)
+  foreach(page ${pages})
+    cmake_path(GET page STEM LAST_ONLY name)
+    cmake_path(GET name EXTENSION LAST_ONLY section)
+    string(SUBSTRING ${section} 1 1 section)
+    add_custom_command(OUTPUT ${PROJECT_BINARY_DIR}/man/${name} DEPENDS ${page} VERBATIM
+      COMMAND ${CMAKE_COMMAND} -E make_directory ${PROJECT_BINARY_DIR}/man
+      COMMAND sh -c "exec ${LEXICOR_SCDOC} <${page} >${PROJECT_BINARY_DIR}/man/${name}")
+    list(APPEND manuals ${PROJECT_BINARY_DIR}/man/${name})
+    install(FILES ${PROJECT_BINARY_DIR}/man/${name} DESTINATION ${CMAKE_INSTALL_MANDIR}/man${section} COMPONENT tools)
+  endforeach()
+  add_custom_target(man ALL DEPENDS ${manuals})
+endif()
+
+# Section 3 and HTML, of the headers: `cmake --build DIR --target reference`, and then they are installed too.
+find_program(LEXICOR_DOXYGEN doxygen)
+if(LEXICOR_DOXYGEN)
+  configure_file(docs/Doxyfile.in Doxyfile @ONLY)
+  add_custom_target(reference VERBATIM COMMENT "Reference of the interface: reference/html, reference/man/man3"
+    COMMAND sh ${PROJECT_SOURCE_DIR}/cmake/reference.sh ${PROJECT_BINARY_DIR}/Doxyfile ${PROJECT_BINARY_DIR}/reference)
+  install(DIRECTORY ${PROJECT_BINARY_DIR}/reference/man/man3 DESTINATION ${CMAKE_INSTALL_MANDIR}
+          COMPONENT development OPTIONAL)
+  install(DIRECTORY ${PROJECT_BINARY_DIR}/reference/html DESTINATION ${CMAKE_INSTALL_DOCDIR}
+          COMPONENT development OPTIONAL)
+endif()
 install(FILES LICENSE README.md DESTINATION ${CMAKE_INSTALL_DOCDIR} COMPONENT documentation)
 install(DIRECTORY docs DESTINATION ${CMAKE_INSTALL_DOCDIR} COMPONENT documentation FILES_MATCHING PATTERN *.md)
 
