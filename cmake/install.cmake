@@ -33,6 +33,14 @@ install(FILES ${PROJECT_BINARY_DIR}/lexicor.pc DESTINATION ${CMAKE_INSTALL_LIBDI
 if(LEXICOR_TOOLS)
   install(TARGETS lexicor_cli lexicor-data lexicor-gencat RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR} COMPONENT tools)
   install(DIRECTORY ${PROJECT_BINARY_DIR}/locale/ DESTINATION ${CMAKE_INSTALL_DATADIR}/lexicor/locale COMPONENT data)
+  set(LEXICOR_ZSH_DIR ${CMAKE_INSTALL_DATADIR}/zsh/site-functions CACHE STRING "Where completion for zsh is installed")
+  install(FILES completions/_lexicor DESTINATION ${LEXICOR_ZSH_DIR} COMPONENT tools)
+  foreach(program lexicor lexicor-data lexicor-gencat)  # the other shells look for a file of the program's name
+    install(FILES completions/lexicor.bash DESTINATION ${CMAKE_INSTALL_DATADIR}/bash-completion/completions
+            RENAME ${program} COMPONENT tools)
+    install(FILES completions/lexicor.fish DESTINATION ${CMAKE_INSTALL_DATADIR}/fish/vendor_completions.d
+            RENAME ${program}.fish COMPONENT tools)
+  endforeach()
 endif()
 set(LEXICOR_PYTHON_DIR lib/python3/dist-packages CACHE STRING "Where the Python module is installed; empty: nowhere")
 if(LEXICOR_PYTHON_DIR)

@@ -178,9 +178,9 @@ int main(int argc, char** argv) {
   subset_command.add_option("DIR", directory, "a compiled directory").required();
   subset_command.add_option("OUT", out, "the smaller directory").required();
   subset_command.add_option("--locale", subset.locales, "LANGUAGE[_TERRITORY][.CODEPAGE][@SORT] ...")
-      .type_name("");
+      .type_name("LOCALE");
   subset_command.add_option("--codepage", subset.codepages, "codepages beside those of the locales ...")
-      .type_name("");
+      .type_name("CP");
   subset_command.add_flag("--json", subset.json, "print the table as JSON");
   subset_command.footer(
       "Objects keep their bytes. The defaults of each language and US-ASCII belong to what a locale needs.\n"

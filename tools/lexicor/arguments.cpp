@@ -6,6 +6,7 @@
 #include <sstream>
 
 #include "command.h"
+#include "completion.h"
 #include "near_names.h"
 #include "notices.h"
 #include "output.h"
@@ -137,6 +138,12 @@ Arguments CommandLine::add_subcommand(const char* name, const char* summary) {
 }
 
 bool CommandLine::parse(int argc, char** argv) {
+  if (argc > 1 && std::string(argv[1]) == kCompleteOption) {
+    std::string lines;
+    for (const std::string& word : completions(*program_, {argv + 2, argv + argc})) lines += word + '\n';
+    Output().write(lines);
+    return false;
+  }
   try {
     program_->parse(argc, argv);
     return true;
