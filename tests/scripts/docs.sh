@@ -34,6 +34,12 @@ block README c | sed "s|build/m64|$build_dir|" >"$work/hello.c"
 hello=$(sed -n "s|build/m64|$build_dir|g; s|hello\.c|$work/&|; s|/tmp/hello|$work/hello|g; /^cc /{s/^cc/gcc $flags/;p}" "$source_dir/README.md")
 [ "$(cd "$source_dir" && PWD= && eval "$hello")" = GROß ]
 
+# The picture and the table of the README, once.
+[ -n "$flags" ] || {
+  "$build_dir/bin/lexicor" chart IBM930 --html | "$source_dir/scripts/chart-picture" | cmp - "$source_dir/docs/chart.svg"
+  bash "$source_dir/tools/lexicor/demo.sh" "$build_dir" | sed -n '/^Locale /,/^$/{/./p}' | diff -u <(block README text) -
+}
+
 # The digest of an object by other means.
 [ "$(cd "$build_dir/locale" && eval "$(block docs/locale-directory sh)" | sed 's/-$//' | tr -d ' \n' | fold -w 64 | uniq | wc -l)" = 1 ]
 
