@@ -3,7 +3,8 @@
 # of lx/NAME.h is lx_NAME.h, and names of C++ and members have none.
 set -e
 rm -rf "$2"
-doxygen "$1"
+mkdir -p "$2"
+{ cat "$1" && echo "OUTPUT_DIRECTORY = \"$2\""; } | doxygen -
 cd "$2/man/man3"
 for page in [a-z]*.h.3; do
   case $page in lx.h.3 | nls1.h.3) ;; *) mv "$page" "lx_$page" ;; esac

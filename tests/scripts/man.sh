@@ -33,8 +33,8 @@ for page in "$source_dir"/man/*.scd; do
   name=$(basename "$page" .scd)
   scdoc <"$page" >"$work/man/man${name##*.}/$name" || fail "$page"
 done
-sh "$source_dir/cmake/reference.sh" "$build_dir/Doxyfile" "$build_dir/reference"
-cp "$build_dir"/reference/man/man3/* "$work/man/man3"
+sh "$source_dir/cmake/reference.sh" "$build_dir/Doxyfile" "$work/reference"
+mv "$work"/reference/man/man3/* "$work/man/man3"
 
 named=$(grep -ohE '\*[a-z_.0-9-]+\*\([1-9]\)' "$source_dir"/man/*.scd | tr -d '*()' | sed 's/.$/.&/')
 for name in $named $(sed 's/$/.3/' "$source_dir/cmake/exports.txt"); do
