@@ -7,7 +7,6 @@ says() { local said && said=$("${@:3}") && [ "$said" = "$2" ] || fail "$1: $said
 install() { apt-get install -y -qq --no-install-recommends "$@" >install.log 2>&1 || { cat install.log; fail "install $*"; }; }
 
 apt-get update -qq
-echo 'path-include=/usr/share/*' >/etc/dpkg/dpkg.cfg.d/with-manuals
 find / -xdev -iname '*lexicor*' ! -path '/packages/*' | sort >before
 install gcc libc6-dev gcc-multilib pkgconf sqlite3
 install ./*.deb
