@@ -66,12 +66,12 @@ if(LEXICOR_MAN AND LEXICOR_SCDOC)
     list(APPEND manuals ${PROJECT_BINARY_DIR}/man/${name})
     install(FILES ${PROJECT_BINARY_DIR}/man/${name} DESTINATION ${CMAKE_INSTALL_MANDIR}/man${section} COMPONENT tools)
   endforeach()
-  add_custom_target(man ALL DEPENDS ${manuals})
+  add_custom_target(lexicor_man ALL DEPENDS ${manuals})
 endif()
 
 # Section 3 and HTML, of the headers: `cmake --build DIR --target reference`, and then they are installed too.
 find_program(LEXICOR_DOXYGEN doxygen)
-if(LEXICOR_DOXYGEN)
+if(LEXICOR_DOXYGEN AND PROJECT_IS_TOP_LEVEL)
   configure_file(docs/Doxyfile.in Doxyfile @ONLY)
   add_custom_target(reference VERBATIM COMMENT "Reference of the interface: reference/html, reference/man/man3"
     COMMAND sh ${PROJECT_SOURCE_DIR}/cmake/reference.sh ${PROJECT_BINARY_DIR}/Doxyfile ${PROJECT_BINARY_DIR}/reference)
