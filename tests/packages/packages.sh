@@ -19,7 +19,7 @@ for package in "$first"/*.deb; do
   cmp "$package" "$work/second/${package##*/}" || fail "another build gives another ${package##*/}"
 done
 
-mirror=$(sed -n 's/^deb [^h]*\(http[^ ]*\) .*/\1/p; s/^URIs: *\([^ ]*\).*/\1/p' /etc/apt/sources.list /etc/apt/sources.list.d/* 2>/dev/null |
+mirror=$({ sed -n 's/^deb [^h]*\(http[^ ]*\) .*/\1/p; s/^URIs: *\([^ ]*\).*/\1/p' /etc/apt/sources.list /etc/apt/sources.list.d/* 2>/dev/null || true; } |
   grep -m 1 '/debian/*$')
 debootstrap --variant=minbase bookworm "$root" "$mirror" >"$work/debootstrap.log" || { tail "$work/debootstrap.log"; fail debootstrap; }
 mount -t proc proc "$root/proc"
