@@ -24,7 +24,8 @@ int main(void) {
   char line[32];
   LXStream* in = LXOpenStream(locale, from_text, &text, LX_STREAM_READ);
   LXStream* out = LXOpenStream(locale, to_output, stdout, LX_STREAM_WRITE);
-  for (int32_t bytes; (bytes = LXReadString(in, locale, line, sizeof line, LX_EOL_LF | LX_DROP_RETURNS)) > 0;) {
+  for (int32_t bytes;
+       (bytes = LXReadString(in, locale, line, sizeof line, LX_EOL_LF | LX_DROP_RETURNS | LX_TERMINATE)) > 0;) {
     LXWriteChar(out, locale, ">");
     for (const char* at = line; *at != 0; at = LXNextChar(locale, at)) LXWriteChar(out, locale, at);
   }
@@ -37,5 +38,4 @@ int main(void) {
 /* Prints:
 >größer
 >kleiner
-
 */

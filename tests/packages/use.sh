@@ -32,7 +32,7 @@ for bits in 64 32; do
   export LX_LOCALEDIR=${LX_LOCALEDIR:-/usr/share/lexicor/locale}
   export NLS1_LOCALEDIR=$LX_LOCALEDIR
   for example in /usr/share/doc/lexicor-doc/examples/c/*; do
-      # shellcheck disable=SC2046
+    # shellcheck disable=SC2046
     gcc -m$bits -std=c99 "$example" $(PKG_CONFIG_PATH=$pc pkg-config --cflags --libs lexicor) -o example
     says "$example in $bits bits" "$(sed '1,/^\/\* Prints:$/d; /^\*\/$/d' "$example")" ./example
   done

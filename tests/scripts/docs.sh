@@ -21,7 +21,7 @@ compiled() {
 # A program for each family of functions, which ends with what it prints.
 printf '$set 1\n1 Disk full\n' | "$build_dir/bin/lexicor-gencat" "$work/app.cat"
 for example in "$source_dir"/examples/c/*.c; do
-  compiled gcc -std=c99 "$example"
+  compiled gcc -std=c99 -ftrivial-auto-var-init=pattern "$example"
   (cd "$work" && ./program) | diff -u --label "$example" <(sed '1,/^\/\* Prints:$/d; /^\*\/$/d' "$example") -
 done
 
