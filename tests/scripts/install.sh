@@ -45,6 +45,7 @@ runs() { for program; do [ "$("$program")" = GROß ] || fail "$program"; done; }
 cmake --install "$build_dir" --prefix "$work/first" >/dev/null
 mv first prefix
 [ -s prefix/share/doc/lexicor/LICENSE ] && [ -s prefix/share/doc/lexicor/docs/limits.md ] || fail 'no licence, no docs'
+! type scdoc >/dev/null 2>&1 || [ -s prefix/share/man/man1/lexicor.1 ] || fail 'no manual'
 by_cmake by_package -DCMAKE_PREFIX_PATH="$work/prefix"
 
 PKG_CONFIG_PATH=$(dirname "$(find prefix -name lexicor.pc)")

@@ -1,5 +1,7 @@
 // lexicor-data: compiles the sources of a locale directory, dumps objects as sources, and checks directories.
 // Exit codes: 0 done, 1 an error in the data, 2 a wrong command line.
+#include <lx.h>
+
 #include <csignal>
 #include <cstdio>
 #include <exception>
@@ -17,7 +19,9 @@
 #include "lexicor/arguments.h"
 #include "lexicor/command.h"
 #include "lexicor/descriptors.h"
+#include "lexicor/notices.h"
 #include "lexicor/output.h"
+#include "lexicor/report.h"
 #include "object_check.h"
 #include "sort_explain.h"
 #include "sort_pack.h"
@@ -106,14 +110,32 @@ void explain_sort(const std::string& from, const std::string& to) {
   explain_sorts(std::cout, before, behind, sources ? &sources->root() : nullptr);
 }
 
-int check(const std::string& directory) {
+/// As an array; a fault without a line or a column has none.
+void write_json(const SourceErrors& faults) {
+  using lexicor_cli::Json;
+  Json list = Json::array();
+  for (const SourceError& fault : faults.list()) {
+    Json row = {{"file", fault.file}};
+    if (fault.line > 0) row["line"] = fault.line;
+    if (fault.line > 0 && fault.column > 0) row["column"] = fault.column;
+    row["what"] = fault.fault;
+    list.push_back(row);
+  }
+  std::cout << lexicor_cli::json_text(list);
+}
+
+int check(const std::string& directory, bool json) {
   const bool compiled = fs::exists(fs::path(directory) / lx::format::kControlFile);
   const bool source = fs::exists(fs::path(directory) / "control.txt");
   if (!compiled && !source) throw SourceError(directory, 0, 0, "holds neither control.nls nor control.txt");
   SourceErrors faults;
   if (compiled) faults = check_compiled_directory(directory);
-  if (source) faults.add_all(check_source_directory(directory, std::cerr));
-  for (const SourceError& fault : faults.list()) std::cerr << fault.what() << '\n';
+  if (source) faults.add_all(check_source_directory(directory, lexicor_cli::notices()));
+  if (json) {
+    write_json(faults);
+  } else {
+    for (const SourceError& fault : faults.list()) std::cerr << fault.what() << '\n';
+  }
   return faults.empty() ? kDone : kDataError;
 }
 
@@ -127,10 +149,11 @@ void say(const SourceError& errors) {
 
 int main(int argc, char** argv) {
   lexicor_cli::open_closed_descriptors();
-  lexicor_cli::CommandLine line("lexicor-data", "Compiles, dumps and checks Lexicor locale data.");
+  lexicor_cli::CommandLine line("lexicor-data", "Compiles, dumps and checks Lexicor locale data.", LX_VERSION);
   std::string source, out, file, control_file, directory;
   CompileOptions options;
   SubsetRequest subset;
+  bool json = false;
 
   auto compile_command = line.add_subcommand("compile", "Compile a source directory into a locale directory");
   compile_command.add_option("SRC", source, "the directory with control.txt").required();
@@ -149,14 +172,16 @@ int main(int argc, char** argv) {
 
   auto check_command = line.add_subcommand("check", "Check a compiled or a source directory");
   check_command.add_option("DIR", directory, "the directory").required();
+  check_command.add_flag("--json", json, "print what is wrong as JSON");
 
   auto subset_command = line.add_subcommand("subset", "Copy what some locales and codepages need");
   subset_command.add_option("DIR", directory, "a compiled directory").required();
   subset_command.add_option("OUT", out, "the smaller directory").required();
   subset_command.add_option("--locale", subset.locales, "LANGUAGE[_TERRITORY][.CODEPAGE][@SORT] ...")
-      .type_name("");
+      .type_name("LOCALE");
   subset_command.add_option("--codepage", subset.codepages, "codepages beside those of the locales ...")
-      .type_name("");
+      .type_name("CP");
+  subset_command.add_flag("--json", subset.json, "print the table as JSON");
   subset_command.footer(
       "Objects keep their bytes. The defaults of each language and US-ASCII belong to what a locale needs.\n"
       "\n"
@@ -171,13 +196,14 @@ int main(int argc, char** argv) {
       .required();
   explain_command.add_option("TO", to, "the sort that the rules make of it").required();
 
+  int status = kDone;
   try {
     if (!line.parse(argc, argv)) return kDone;
-    if (compile_command.given()) compile_directory(source, out, options, std::cerr);
+    if (compile_command.given()) compile_directory(source, out, options, lexicor_cli::notices());
     if (dump_command.given()) dump(file, control_file);
     if (explain_command.given()) explain_sort(from, to);
-    if (check_command.given()) return check(directory);
-    if (subset_command.given()) make_subset(directory, out, subset, std::cout, std::cerr);
+    if (check_command.given()) status = check(directory, json);
+    if (subset_command.given()) make_subset(directory, out, subset, std::cout, lexicor_cli::notices());
     std::cout.flush();
     if (!std::cout) throw SourceError("standard output", 0, 0, "cannot be written");
   } catch (const SourceError& error) {
@@ -192,5 +218,5 @@ int main(int argc, char** argv) {
     std::cerr << "lexicor-data: " << error.what() << '\n';
     return kDataError;
   }
-  return kDone;
+  return status;
 }

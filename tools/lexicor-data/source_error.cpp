@@ -20,7 +20,8 @@ SourceError::SourceError(std::string file_name, int line_number, int column_numb
     : std::runtime_error(located(file_name, line_number, column_number, what)),
       file(std::move(file_name)),
       line(line_number),
-      column(column_number) {}
+      column(column_number),
+      fault(what) {}
 
 std::vector<SourceError> SourceError::all() const {
   std::vector<SourceError> list{*this};

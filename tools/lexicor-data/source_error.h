@@ -14,6 +14,7 @@ struct SourceError : std::runtime_error {
   std::string file;
   int line;
   int column;
+  std::string fault;                 ///< what() without the place
   std::vector<SourceError> further;  ///< the other errors of the same step; they have no further ones
 
   /// This error and the further ones.

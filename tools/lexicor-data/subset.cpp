@@ -14,6 +14,7 @@
 #include "core/lxbytes.h"
 #include "core/lxformat.h"
 #include "lexicor/near_names.h"
+#include "lexicor/report.h"
 #include "line_text.h"
 
 namespace lexicor_data {
@@ -74,7 +75,7 @@ class Subset {
 
   void add_codepage(const std::string& name) { keep(find(ObjectType::kCodepage, name)); }
 
-  void write(const std::string& out, std::ostream& table, std::ostream& log) {
+  void write(const std::string& out, bool json, std::ostream& table, std::ostream& log) {
     std::sort(kept_.objects.begin(), kept_.objects.end(), [](const ObjectName& a, const ObjectName& b) {
       return a.type != b.type ? a.type < b.type : a.id < b.id;
     });
@@ -89,7 +90,10 @@ class Subset {
     files.emplace_back(format::kAliasFile, cut_aliases());
     write_directory(out, files, manifest, compile_control(kept_, in_directory(format::kControlFile)));
     remove_unlisted(out, kept_, log);
-    write_table(table, manifest);
+    if (json)
+      write_json(table, manifest);
+    else
+      write_table(table, manifest);
   }
 
  private:
@@ -152,10 +156,26 @@ class Subset {
           << object.name.name << '\n';
       total += object.bytes;
     }
+    out << std::setw(kBytesChars) << total << "  in " << manifest.objects.size() << " of "
+        << control_.objects.size() << " objects, which have " << all_bytes() << '\n';
+  }
+
+  void write_json(std::ostream& out, const Manifest& manifest) const {
+    lexicor_cli::Json objects = lexicor_cli::Json::array();
+    for (const ManifestObject& object : manifest.objects)
+      objects.push_back({{"type", kTypeNames[static_cast<size_t>(object.name.type)]},
+                         {"name", object.name.name},
+                         {"file", object.file},
+                         {"bytes", object.bytes}});
+    out << lexicor_cli::json_text(
+        {{"objects", objects}, {"of", {{"objects", control_.objects.size()}, {"bytes", all_bytes()}}}});
+  }
+
+  /// Of the directory that is cut.
+  uintmax_t all_bytes() const {
     uintmax_t all = 0;
     for (const ObjectName& name : control_.objects) all += fs::file_size(in_directory(object_file_name(name)));
-    out << std::setw(kBytesChars) << total << "  in " << manifest.objects.size() << " of "
-        << control_.objects.size() << " objects, which have " << all << '\n';
+    return all;
   }
 
   const std::string directory_;
@@ -176,7 +196,7 @@ void make_subset(const std::string& directory, const std::string& out, const Sub
   for (const std::string& name : request.locales) errors.attempt([&] { subset.add_locale(name); });
   for (const std::string& name : request.codepages) errors.attempt([&] { subset.add_codepage(name); });
   errors.throw_if_any();
-  subset.write(out, table, log);
+  subset.write(out, request.json, table, log);
 }
 
 }  // namespace lexicor_data

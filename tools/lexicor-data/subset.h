@@ -10,6 +10,7 @@ namespace lexicor_data {
 struct SubsetRequest {
   std::vector<std::string> locales;    ///< LANGUAGE[_TERRITORY][.CODEPAGE][@SORT]
   std::vector<std::string> codepages;  ///< names or aliases
+  bool json = false;                   ///< the table
 };
 
 /// Copies the objects that the request needs from a compiled directory, with aliases, a control file and a manifest of

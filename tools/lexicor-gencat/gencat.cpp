@@ -12,6 +12,7 @@
 #include "builder.h"
 #include "lexicor/input.h"
 #include "lexicor/locale.h"
+#include "lexicor/notices.h"
 #include "lexicor/output.h"
 #include "message_source.h"
 #include "po_source.h"
@@ -226,7 +227,7 @@ bool compile(const lexicor_cli::Session& session, const Options& options, std::o
   if (existing.has_value()) catalog.sets = std::move(existing->sets);
   const Encoding& target = encodings.of_locale(locale.name, locale.who);
 
-  Problems problems;
+  Problems problems(!lexicor_cli::g_quiet);
   CatalogBuilder builder(std::move(catalog), problems);
   for (const Source& source : sources) {
     const Recoder recoder(encoding_of(source, options, target, encodings), target);

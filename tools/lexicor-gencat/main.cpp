@@ -47,11 +47,11 @@ void declare(lexicor_cli::Arguments arguments, Asked& asked) {
                   "the file to write; all FILES are then sources, or the catalog of --dump")
       .type_name("FILE");
   arguments.add_option("--locale", options.locale, "locale whose codepage the texts of the catalog are in")
-      .type_name("NAME");
+      .type_name("LOCALE");
   arguments
       .add_option("--source-encoding,--from", options.source_encoding,
                   "codepage of the sources, or of the source that --dump writes")
-      .type_name("NAME");
+      .type_name("CP");
   arguments.add_option("--byte-order", options.byte_order, "byte order of the machine that reads the catalog")
       .one_of({"little", "big", "native"});
   arguments.add_option("-H,--header", options.header, "C header for the numbers of symbolic names")

@@ -13,7 +13,7 @@ void Problems::error(const Place& place, const std::string& text) {
 }
 
 void Problems::warning(const Place& place, const std::string& text) {
-  add(place, "warning: " + text);
+  if (warnings_) add(place, "warning: " + text);
 }
 
 void Problems::add(const Place& place, const std::string& text) {

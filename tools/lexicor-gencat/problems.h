@@ -19,6 +19,9 @@ std::string place_text(const Place& place);
 
 class Problems {
  public:
+  /// Without warnings only errors are kept.
+  explicit Problems(bool warnings = true) : warnings_(warnings) {}
+
   /// More of a file than this are counted, not listed.
   static constexpr size_t kListed = 20;
 
@@ -38,6 +41,7 @@ class Problems {
 
   void add(const Place& place, const std::string& text);
 
+  bool warnings_;
   std::vector<File> files_;
   size_t errors_ = 0;
 };

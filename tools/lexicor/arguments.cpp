@@ -6,7 +6,9 @@
 #include <sstream>
 
 #include "command.h"
+#include "completion.h"
 #include "near_names.h"
+#include "notices.h"
 #include "output.h"
 
 namespace lexicor_cli {
@@ -121,7 +123,8 @@ bool Arguments::given() const {
 
 CommandLine::CommandLine(const char* program, const char* summary, const char* version)
     : program_(std::make_unique<CLI::App>(summary, program)) {
-  if (version != nullptr) program_->set_version_flag("--version", std::string(program) + " " + version);
+  program_->set_version_flag("--version", std::string(program) + " " + version);
+  program_->add_flag("-q,--quiet", g_quiet, "say nothing on standard error but errors");
 }
 CommandLine::~CommandLine() = default;
 
@@ -135,6 +138,12 @@ Arguments CommandLine::add_subcommand(const char* name, const char* summary) {
 }
 
 bool CommandLine::parse(int argc, char** argv) {
+  if (argc > 1 && std::string(argv[1]) == kCompleteOption) {
+    std::string lines;
+    for (const std::string& word : completions(*program_, {argv + 2, argv + argc})) lines += word + '\n';
+    Output().write(lines);
+    return false;
+  }
   try {
     program_->parse(argc, argv);
     return true;

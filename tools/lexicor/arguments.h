@@ -61,8 +61,8 @@ class Arguments {
 
 class CommandLine {
  public:
-  /// With a version, --version prints it.
-  CommandLine(const char* program, const char* summary, const char* version = nullptr);
+  /// --version prints the version, and --quiet goes with every command.
+  CommandLine(const char* program, const char* summary, const char* version);
   ~CommandLine();
   CommandLine(const CommandLine&) = delete;
   CommandLine& operator=(const CommandLine&) = delete;

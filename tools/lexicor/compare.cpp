@@ -8,6 +8,7 @@
 #include "command.h"
 #include "hex.h"
 #include "output.h"
+#include "report.h"
 
 namespace lexicor_cli {
 
@@ -18,6 +19,7 @@ struct CompareOptions {
   std::string rules;   // a file; empty: the locale's sort
   bool ignore_case = false;
   bool ignore_width = false;
+  bool json = false;
   std::string text1, text2;
 
   uint32_t options() const {
@@ -31,7 +33,10 @@ int compare(const CompareOptions& options, const CommonOptions& common) {
   collation.check_argument(options.text1);
   collation.check_argument(options.text2);
   const int32_t result = collation.compare(options.text1, options.text2, options.options());
-  Output().write(options.text1 + sign_text(result) + options.text2 + "\n");
+  const char order = result == 0 ? '=' : result < 0 ? '<' : '>';
+  Output().write(options.json
+                     ? json_text({{"a", options.text1}, {"b", options.text2}, {"order", std::string(1, order)}})
+                     : options.text1 + sign_text(result) + options.text2 + "\n");
   return result == 0 ? kDone : result < 0 ? kLess : kGreater;
 }
 
@@ -79,7 +84,8 @@ int show_key(const CompareOptions& options, const CommonOptions& common) {
   collation.check_argument(options.text1);
   std::string key;
   collation.append_key(options.text1, options.options(), &key);
-  Output().write((collation.binary() ? hex_bytes(key) : KeyText(key).levels()) + "\n");
+  Output().write(options.json ? json_text({{"text", options.text1}, {"key", hex_bytes(key)}})
+                              : (collation.binary() ? hex_bytes(key) : KeyText(key).levels()) + "\n");
   return kDone;
 }
 
@@ -93,6 +99,7 @@ void declare_order(Arguments& command, CompareOptions& options) {
       .add_flag("--width-insensitive", options.ignore_width,
                 "full-width and half-width forms are equal; case counts")
       .excludes(ignore_case);
+  command.add_flag("--json", options.json, "print JSON");
 }
 
 }  // namespace
@@ -122,6 +129,7 @@ Run declare_key(Arguments& command, const CommonOptions& common) {
       "behind\n"
       "its character's position. A zero byte of the key reads as a bar. In binary order the key is the text "
       "itself.\n"
+      "JSON has the bytes of the key.\n"
       "\n"
       "Examples:\n"
       "  lexicor key --locale Czech@Czech chata\n"

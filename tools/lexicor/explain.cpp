@@ -23,6 +23,7 @@ struct ExplainOptions {
   std::string locale;  // empty: the user's
   std::string rules;   // a file; empty: the locale's sort
   std::string text1, text2;
+  bool json = false;
 };
 
 /// One level of a text: its weights in the order in which they are compared.
@@ -48,6 +49,7 @@ constexpr LevelKind kLevels[] = {{"primary", 4, LX_APPEND_PRIMARY},
                                  {"special", 4, LX_APPEND_SPECIAL}};
 constexpr size_t kLevelCount = 4;
 constexpr size_t kSecondary = 1, kTertiary = 2, kSpecial = 3;
+constexpr char kPlacement[] = "weights are";
 constexpr LevelKind kBytes = {"bytes", 2, 0};
 
 using Row = std::vector<std::string>;
@@ -98,7 +100,7 @@ class Weigher {
  public:
   Weigher(LXLocale* locale, const std::vector<Char>& chars) : locale_(locale), chars_(chars) {
     text_.levels.resize(kLevelCount);
-    text_.rows.push_back({"", "primary", "secondary", "tertiary", "special", "weights are", "character"});
+    text_.rows.push_back({"", "primary", "secondary", "tertiary", "special", kPlacement, "character"});
     std::vector<LXUChar> units;
     for (const Char& c : chars) units.push_back(c.unicode);
     const LXUChar* next = units.data();
@@ -235,6 +237,30 @@ std::string write_levels(std::ostream& out, const Explained& a, const Explained&
   return decided;
 }
 
+/// A text's elements, by the titles of their columns.
+Json json_elements(const std::vector<Row>& rows) {
+  Json elements = Json::array();
+  for (size_t r = 1; r < rows.size(); ++r) {
+    const Row& row = rows[r];
+    Json element = {{"element", row[0].substr(row[0].find_first_not_of(' '))}};
+    for (size_t i = 1; i < row.size(); ++i) element[rows[0][i] == kPlacement ? "placed" : rows[0][i]] = row[i];
+    elements.push_back(element);
+  }
+  return elements;
+}
+
+Json json_levels(const Explained& a, const Explained& b) {
+  Json levels = Json::array();
+  for (size_t i = 0; i < a.levels.size(); ++i) {
+    const LevelKind& kind = a.levels.size() == 1 ? kBytes : kLevels[i];
+    Json level = {{"level", kind.title}, {"a", Json::array()}, {"b", Json::array()}};
+    for (const uint32_t weight : a.levels[i].weights) level["a"].push_back(weight_text(kind, weight));
+    for (const uint32_t weight : b.levels[i].weights) level["b"].push_back(weight_text(kind, weight));
+    levels.push_back(level);
+  }
+  return levels;
+}
+
 int explain(const ExplainOptions& options, const CommonOptions& common) {
   RulesSession session(common, options.rules);
   Collation collation(session, options.locale);
@@ -254,13 +280,26 @@ int explain(const ExplainOptions& options, const CommonOptions& common) {
     write_table(out, explained.rows);
     return explained;
   };
-  out << "sort " << text_item(collation.codepage().locale(), LX_ITEM_SORT).value_or("") << "\n\n";
+  const std::string sort = text_item(collation.codepage().locale(), LX_ITEM_SORT).value_or("");
+  out << "sort " << sort << "\n\n";
   const Explained a = take_apart('A', options.text1);
   out << '\n';
   const Explained b = take_apart('B', options.text2);
   const std::string decided = write_levels(out, a, b);
+  const int32_t order = collation.compare(options.text1, options.text2, 0);
+  if (options.json) {
+    Output().write(json_text({{"sort", sort},
+                              {"a", {{"text", options.text1}, {"elements", json_elements(a.rows)}}},
+                              {"b", {{"text", options.text2}, {"elements", json_elements(b.rows)}}},
+                              {"levels", json_levels(a, b)},
+                              {"order", order == 0  ? "="
+                                        : order < 0 ? "<"
+                                                    : ">"},
+                              {"decided_by", decided}}));
+    return kDone;
+  }
   out << '\n'
-      << options.text1 << sign_text(collation.compare(options.text1, options.text2, 0)) << options.text2 << ": "
+      << options.text1 << sign_text(order) << options.text2 << ": "
       << (decided.empty() ? "nothing decides"
                           : "decided by the " + decided + (collation.binary() ? "" : " weights"))
       << '\n';
@@ -277,6 +316,7 @@ Run declare_explain(Arguments& command, const CommonOptions& common) {
   add_rules_option(command, options->rules);
   command.add_option("A", options->text1, "a text, in UTF-8").required().type_name("");
   command.add_option("B", options->text2, "another one").required().type_name("");
+  command.add_flag("--json", options->json, "print JSON");
   command.footer(
       "Shows the elements of each text with their weights in hexadecimal: a character, a pair that sorts as "
       "one,\n"

@@ -6,12 +6,12 @@
 #include <cctype>
 #include <clocale>
 #include <cstdlib>
-#include <iostream>
 #include <map>
 #include <sstream>
 #include <vector>
 
 #include "catalogue.h"
+#include "notices.h"
 #include "session.h"
 #include "utf8_text.h"
 
@@ -192,7 +192,7 @@ LocalePtr open_user_locale() {
   }
   LocalePtr user = opened(locale, code, name.empty() ? "English" : name);
   if (!problem.empty())
-    std::cerr << g_program << ": " << problem << "; "
+    notices() << g_program << ": " << problem << "; "
               << text_item(user.get(), LX_ITEM_LOCALE_STRING).value_or("") << " is used instead\n";
   return user;
 }

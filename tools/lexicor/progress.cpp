@@ -7,6 +7,8 @@
 #include <cstdio>
 #include <string>
 
+#include "notices.h"
+
 namespace lexicor_cli {
 
 namespace {
@@ -16,7 +18,7 @@ constexpr int kBarChars = 40;
 }  // namespace
 
 Progress::Progress(uint64_t total, bool allowed, uint64_t worth_showing)
-    : total_(total), visible_(allowed && total > worth_showing && isatty(STDERR_FILENO) != 0) {}
+    : total_(total), visible_(allowed && !g_quiet && total > worth_showing && isatty(STDERR_FILENO) != 0) {}
 
 Progress::~Progress() {
   if (visible_) std::fputs("\r\033[K", stderr);

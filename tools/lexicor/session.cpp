@@ -9,8 +9,9 @@
 #include <cstdlib>
 #include <cstring>
 #include <filesystem>
-#include <iostream>
 #include <vector>
+
+#include "notices.h"
 
 namespace lexicor_cli {
 
@@ -110,12 +111,12 @@ Session::Session(const CommonOptions& common) {
   built_in_only_ = code == LX_W_DEFAULTS;
   if (!built_in_only_) return;
   const char* const variable = secure_getenv(kDirectoryVariable);
-  std::cerr << g_program << ": no usable locale directory";
+  notices() << g_program << ": no usable locale directory";
   if (argument != nullptr)
-    std::cerr << " in " << directory;
+    notices() << " in " << directory;
   else if (variable != nullptr)
-    std::cerr << " in " << kDirectoryVariable << "=" << variable;
-  std::cerr << " (" << reason_of_defaults(argument)
+    notices() << " in " << kDirectoryVariable << "=" << variable;
+  notices() << " (" << reason_of_defaults(argument)
             << "): only the built-in objects English, UnitedStates and US-ASCII are there\n"
             << g_program << ": " << kHowToName << '\n';
 }
