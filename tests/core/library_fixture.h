@@ -19,6 +19,8 @@
 #include "support/hooks.h"
 #include "support/object_files.h"
 
+extern "C" void __gcov_dump(void) __attribute__((weak));  // there where coverage is measured
+
 namespace lx::test {
 
 /// Runs `action` with its assertions in a process of its own, which `end` ends, so that a crash, or the end that a
@@ -27,6 +29,7 @@ inline void expect_in_child(const std::string& what, void (*end)(int), const std
   SCOPED_TRACE(what);
   const auto run = [&] {
     action();
+    if (end == _exit && __gcov_dump != nullptr) __gcov_dump();
     end(::testing::Test::HasFailure() ? 3 : 0);
   };
   EXPECT_EXIT(run(), ::testing::ExitedWithCode(0), "");

@@ -152,7 +152,7 @@ TEST_F(Strings, TokensComeOutWhole) {
     // Beside short texts some that are not read to their end at once, with tokens as long as the parts.
     const bool in_parts = random() % 8 == 0;
     const Units letters = alphabet(cp), set = letters.substr(random() % letters.size(), 2),
-                text = Units(in_parts ? 60 + random() % 80 : 0, letters[0]) + any_text(letters, 9);
+                text = Units(in_parts ? random() % 140 : 0, letters[0]) + any_text(letters, in_parts ? 200 : 9);
     const Encoded<K> whole(cp, text);
     const auto delimiters = Encoded<K>(cp, set).terminated();
     for (int32_t cut = -2; cut <= (in_parts ? -2 : whole.size()); ++cut) {
