@@ -21,7 +21,7 @@ struct Alphabet {
 constexpr Alphabet kAlphabets[] = {{"German_Germany.UTF-8@Default", u"aAsS\u00DF\u1E9E\u00AD"},
                                    {"German_Germany.MS932@BINARY", u"sSa\uFF41\uFF21"},
                                    {"German_Germany.UTF-8@BINARY", u"sS\u00DF\u1E9E"},
-                                   {"Danish_Denmark.UTF-8@Danish", u"aA\u00E5\u00C5e\u0301"},
+                                   {"Danish_Denmark.UTF-8@Danish", u"aA\u00E5\u030A"},
                                    {"Turkish_Turkey.UTF-8@Turkish", u"iI\u0131\u0130h"},
                                    {"Turkish_Turkey.UTF-8@BINARY", u"iI\u0131\u0130"},
                                    {"Lithuanian_Lithuania.UTF-8@Lithuanian", u"iI\u0307\u0300j"},
@@ -38,7 +38,7 @@ class Texts {
     letters_.clear();
     for (size_t n = 2 + random_() % 3; n > 0; --n) letters_ += all_[random_() % all_.size()];
     *text = any(1 + random_() % 30);
-    while (text->size() < 1200) *text += text->substr(random_() % text->size() / 2);
+    while (text->size() < 700) *text += text->substr(random_() % text->size() / 2);
     *part = text->substr(random_() % text->size(), random_() % 150) + any(1 + random_() % 2);
     for (char16_t& u : *part) {
       if (random_() % 40 == 0) u = any(1)[0];
@@ -65,7 +65,7 @@ TEST(LongSearch, FindsWhatTheComparisonOfEachCandidateFinds) {
     const LocalePtr locale(LXGetLocale(alphabet.locale, 0, nullptr));
     ASSERT_NE(locale, nullptr);
     Texts texts(alphabet.letters);
-    for (int round = 0; round < 16 / kSlowness; ++round) {
+    for (int round = 0; round < 32 / kSlowness; ++round) {
       std::u16string text, part;
       texts.make(&text, &part);
       const auto* const t = reinterpret_cast<const LXUChar*>(text.data());
