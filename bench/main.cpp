@@ -2,6 +2,7 @@
 //
 //   lexicor_bench [--locale=DIRECTORY] [--rows=PART_OF_NAME] [Google Benchmark's own options]
 //   lexicor_bench --ratios ...   prints the table of ratios
+//   lexicor_bench --first-use    time and memory to the first results of a process
 #include <benchmark/benchmark.h>
 
 #include <algorithm>
@@ -9,6 +10,7 @@
 #include <cstdlib>
 #include <cstring>
 
+#include "first_use.h"
 #include "ratios.h"
 #include "rows.h"
 
@@ -18,6 +20,7 @@ struct Options {
   std::string locale_directory = LEXICOR_BENCH_LOCALE_DIR;
   std::string rows;
   bool ratios = false;
+  bool first_use = false;
 };
 
 /// Takes our own options out of the arguments.
@@ -28,6 +31,8 @@ Options take_options(int* argc, char** argv) {
     const std::string argument = argv[i];
     if (argument == "--ratios")
       options.ratios = true;
+    else if (argument == "--first-use")
+      options.first_use = true;
     else if (argument.rfind("--locale=", 0) == 0)
       options.locale_directory = argument.substr(strlen("--locale="));
     else if (argument.rfind("--rows=", 0) == 0)
@@ -90,6 +95,10 @@ int main(int argc, char** argv) {
   arguments.push_back(nullptr);
   benchmark::Initialize(&count, arguments.data());
   if (benchmark::ReportUnrecognizedArguments(count, arguments.data())) return EXIT_FAILURE;
+  if (options.first_use) {
+    bench::print_first_use(options.locale_directory.c_str(), stdout);
+    return EXIT_SUCCESS;
+  }
   if (LXInit(options.locale_directory.c_str(), nullptr, nullptr, nullptr, 0) != LX_OK) {
     std::fprintf(stderr, "no locale directory: %s\n", options.locale_directory.c_str());
     return EXIT_FAILURE;

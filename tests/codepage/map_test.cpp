@@ -53,13 +53,12 @@ class Map : public CaseTest {
             match = &s;
       if (match == nullptr) {
         const LXUChar u = alone(text[i], mode, cp != nullptr && cp->width == 1);
-        // The width tables of UTF-8 are those of all Unicode.
-        const bool wide = cp != nullptr && cp->file.name == "UTF8" &&
-                          (mode == LX_MAP_FULL_WIDTH || mode == LX_MAP_HALF_WIDTH);
-        bool has = cp == nullptr || wide || cp->find(u) != nullptr;
+        // The tables of UTF-8 are those of all Unicode.
+        const bool utf8 = cp != nullptr && cp->file.name == "UTF8";
+        bool has = cp == nullptr || utf8 || cp->find(u) != nullptr;
         // A character of several bytes has its other case among these.
-        if (cp != nullptr && has && (mode & 4) != 0)
-          has = (cp->find(u)->code > 0xFF) == (cp->find(text[i])->code > 0xFF);
+        const auto one_byte = [&](LXUChar c) { return utf8 ? c < 0x80 : cp->find(c)->code <= 0xFF; };
+        if (cp != nullptr && has && (mode & 4) != 0) has = one_byte(u) == one_byte(text[i]);
         pieces.push_back({has ? u : text[i], text[i], text[i]});
         continue;
       }
