@@ -128,7 +128,7 @@ TEST(Threads, ShareLocalesAndLoadObjects) {
       expected.push_back(outcome(session, i, session.locales[i % std::size(kLocales)]));
   }
   const Library library(LEXICOR_LOCALE_DIR);
-  std::atomic<int> waiting{kThreads};
+  std::atomic<int> waiting{kThreads}, working{kThreads};
   std::atomic<const Session*> shared{nullptr};
   std::atomic<size_t> wrong{0};
   const auto work = [&](int thread) {
@@ -146,8 +146,8 @@ TEST(Threads, ShareLocalesAndLoadObjects) {
       wrong += outcome(session, i, session.locales[i % std::size(kLocales)]) != expected[i];
       if (use) LXTerm();
     }
-    ++waiting;
-    while (waiting != kThreads) std::this_thread::yield();  // what is shared is released last
+    --working;
+    while (working != 0) std::this_thread::yield();  // what is shared is released last
   };
   std::vector<std::thread> threads;
   for (int i = 0; i < kThreads; ++i) threads.emplace_back(work, i);
