@@ -55,6 +55,14 @@ inline bool is_same_block(const uint16_t* from, unsigned below) {
   return _mm_movemask_epi8(_mm_cmpeq_epi8(high, _mm_setzero_si128())) == 0xFFFF;
 }
 
+/// Whether one of two bytes stands in a block.
+inline bool has_either(const uint8_t* from, uint8_t a, uint8_t b) {
+  const __m128i v = load_block(from);
+  const __m128i is_a = _mm_cmpeq_epi8(v, _mm_set1_epi8(static_cast<char>(a)));
+  const __m128i is_b = _mm_cmpeq_epi8(v, _mm_set1_epi8(static_cast<char>(b)));
+  return _mm_movemask_epi8(_mm_or_si128(is_a, is_b)) != 0;
+}
+
 inline void copy_block(uint8_t* to, const uint8_t* from) {
   store_block(to, load_block(from));
 }
@@ -159,7 +167,8 @@ class CharBlock {
       two |= size_t{byte_mask(_mm_or_si128(in(leads.two[0], bytes), in(leads.two[1], bytes)))} << i;
       if (leads.has_three) three |= size_t{byte_mask(in(leads.three, bytes))} << i;
     }
-    if (three == 0) {
+    pairs_ = three == 0;
+    if (pairs_) {
       // A byte that can begin a character continues one behind a byte that does: in a series every other one.
       constexpr size_t kOdd = SIZE_MAX / 3 * 2;
       const size_t ends = ((two << 1 | kOdd) - two) ^ kOdd;
@@ -172,6 +181,9 @@ class CharBlock {
       longer_ = (any >> (kBytes - 1)) + (three >> (kBytes - 1)) + (three >> (kBytes - 2) & 1);
     }
   }
+  /// Whether all its characters have one byte or two, and where they begin.
+  bool pairs() const { return pairs_; }
+  size_t starts() const { return ~trails_; }
   /// False where a character of three bytes is followed by what could begin another one.
   bool known() const { return known_; }
   size_t chars() const { return kBytes - ones(trails_); }
@@ -193,6 +205,7 @@ class CharBlock {
 
   size_t trails_;
   size_t longer_;
+  bool pairs_;
   bool known_ = true;
 };
 
@@ -228,6 +241,9 @@ inline bool is_same_block(const From* from, unsigned below) {
   for (size_t i = 0; i < kBlock; ++i) all |= from[i];
   return all < below;
 }
+inline bool has_either(const uint8_t* from, uint8_t a, uint8_t b) {
+  return memchr(from, a, kBlock) != nullptr || memchr(from, b, kBlock) != nullptr;
+}
 template <class To, class From>
 inline void copy_block(To* to, const From* from) {
   for (size_t i = 0; i < kBlock; ++i) to[i] = static_cast<To>(from[i]);
@@ -250,6 +266,8 @@ class CharBlock {
  public:
   static constexpr size_t kBytes = 8 * sizeof(size_t);
   CharBlock(const uint8_t*, const LeadRanges&) {}
+  bool pairs() const { return false; }
+  size_t starts() const { return 0; }
   bool known() const { return false; }
   size_t chars() const { return 0; }
   size_t bytes() const { return 0; }
@@ -270,6 +288,14 @@ template <class To, class From>
 inline size_t copy_same(To* to, const From* from, size_t n, unsigned below) {
   size_t i = copy_same_blocks(to, from, n, below);
   for (; i < n && from[i] < below; ++i) to[i] = static_cast<To>(from[i]);
+  return i;
+}
+
+/// How many of `n` bytes stand before one of two.
+inline size_t units_before_either(const uint8_t* p, size_t n, uint8_t a, uint8_t b) {
+  size_t i = 0;
+  while (n - i >= kBlock && !has_either(p + i, a, b)) i += kBlock;
+  while (i < n && p[i] != a && p[i] != b) ++i;
   return i;
 }
 

@@ -3,7 +3,7 @@
 // then.
 #pragma once
 
-#include "codepage/lxblock.h"
+#include "codepage/lxvector.h"
 #include "core/lxbytes.h"
 #include "core/lxformat.h"
 #include "core/lxobjman.h"
@@ -33,7 +33,7 @@ struct PageCodes {
 ///
 /// Towards Unicode: `unicode` for single bytes; for longer characters `rows`, one row of 256 values a trie
 /// node. A leaf's row holds Unicode values, another node's row the numbers of the next nodes, 0 for none (node
-/// 0 is the root, which is nobody's child). From Unicode: `codes16` or, where a character has more than two
+/// 0 is the root, which is nobody's child). Behind them one row has no values, and one those of single bytes. From Unicode: `codes16` or, where a character has more than two
 /// bytes, `codes32`: from page_start[u >> 8] on they hold for every low byte the bytes to store, packed;
 /// unmapped values hold the substitution byte.
 struct Codepage {
@@ -54,12 +54,14 @@ struct Codepage {
   bool single_byte;
   bool shift_sensitive;
   bool utf8;            // conversion is computed
+  bool plain_utf8;      // ... and the lengths of characters are those of UTF-8
   bool two_level_rows;  // the root's children are leaves
   bool plain_digits;    // no byte where ASCII or EBCDIC has a digit is white space
   // Bytes below this are the Unicode values of the same number, both ways, wherever they begin a character:
   // 0x100 for ISO 8859-1, 0x80 where ASCII is, else 0.
   uint16_t same_below;
   LeadRanges leads;
+  PairRows pairs;
   // By first byte: the length of the characters of several bytes that begin with it, if none of them has
   // another case; else 0.
   uint8_t caseless[256];

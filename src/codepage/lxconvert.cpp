@@ -107,6 +107,48 @@ Buffer<uint8_t> buffer_of(char* p, int32_t size, LXShiftState state = LX_SHIFT_S
   return {bytes_of(p), size, state};
 }
 
+// Short texts without shift states are converted at once, where all that they may become fits.
+
+/// Whether a text that is so long, is no text up to a null, and asks for nothing else is short.
+bool is_short(int32_t length, int32_t flags) {
+  return flags == 0 && static_cast<uint32_t>(length) - 1 < kRunSlack;
+}
+
+/// The values of a text: how many, or 0 when it holds what is read otherwise.
+size_t read_short(const Codepage& cp, const uint8_t* p, size_t bytes, LXUChar* values, RunRule rule) {
+  return with_cursor(cp, Form::kPlain, LX_SHIFT_SINGLE, p, bytes, [&](auto in) {
+    const size_t count = in.read_run(values, bytes, rule);
+    return in.p == in.end ? count : 0;
+  });
+}
+
+/// Writes them: how many bytes, or 0 when there may be no room.
+size_t write_short(const Codepage& cp, uint8_t* p, size_t size, const LXUChar* values, size_t count) {
+  return with_kind<uint8_t>(cp, Form::kPlain, [&](auto kind) -> size_t {
+    auto out = kind.sink(cp, p, p + size, LX_SHIFT_SINGLE);
+    if (count > size / out.most_units()) return 0;
+    out.put_run(values, count);
+    return room(p, out.p);
+  });
+}
+
+size_t convert_short(const Codepage&, LXUChar* to, size_t size, const Codepage& in_cp, const uint8_t* text,
+                     size_t bytes) {
+  return size < bytes ? 0 : read_short(in_cp, text, bytes, to, {});
+}
+size_t convert_short(const Codepage& out_cp, uint8_t* to, size_t size, const Codepage&, const LXUChar* text,
+                     size_t units) {
+  return write_short(out_cp, to, size, text, units);
+}
+size_t convert_short(const Codepage& out_cp, uint8_t* to, size_t size, const Codepage& in_cp,
+                     const uint8_t* text, size_t bytes) {
+  if (bytes < vectors->pivot_bytes) return 0;
+  const unsigned below = in_cp.same_below < out_cp.same_below ? in_cp.same_below : out_cp.same_below;
+  if (below != 0 && bytes <= size && vectors->copy_same(to, text, bytes, below)) return bytes;
+  LXUChar values[2 * kRunSlack];
+  return write_short(out_cp, to, size, values, read_short(in_cp, text, bytes, values, {0, kRunSlack}));
+}
+
 /// Every conversion: from text of the source's codepage to text of the target's, which keeps the error.
 template <class Out, class In>
 int32_t convert_text(LXLocale* target, Buffer<Out> to, LXLocale* source, Text<In> text, int32_t flags,
@@ -116,6 +158,15 @@ int32_t convert_text(LXLocale* target, Buffer<Out> to, LXLocale* source, Text<In
   Call call(unit, target);
   const LXLocale* const from = locale_of(source);
   if (!call || from == nullptr) return call.fail(LX_E_NOT_INITIALIZED, -1);
+  if constexpr (sizeof(In) + sizeof(Out) <= sizeof(uint8_t) + sizeof(LXUChar)) {
+    const Codepage& in_cp = codepage_of(*from->codepage);
+    const Codepage& out_cp = codepage_of(call.codepage());
+    if (is_short(text.length, flags) && to.size > 0 &&
+        (form == Form::kPlain || (!in_cp.shift_sensitive && !out_cp.shift_sensitive)))
+      if (const size_t units = convert_short(out_cp, to.p, static_cast<size_t>(to.size), in_cp, text.p,
+                                             static_cast<size_t>(text.length)))
+        return call.exit(static_cast<int32_t>(units));
+  }
   Request request(to.size, text.p, text.length, flags, kMine.flags);
   if (!request.valid) return call.fail(LX_E_INVALID, request.characters ? kMine.invalid_in_characters : -1);
   if (request.nothing) return call.exit(0);

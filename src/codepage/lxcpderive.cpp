@@ -12,6 +12,7 @@ namespace {
 namespace fmt = format::codepage;
 
 constexpr uint32_t kRow = 256;
+constexpr size_t kRowsBehind = 2;  // those of the trie: one without values, one of single bytes
 
 /// The nodes of the multibyte-to-Unicode trie that can be reached, in the order in which they are found.
 class ReachableNodes {
@@ -56,6 +57,7 @@ class ReachableNodes {
 struct Layout {
   size_t codes;
   size_t rows;
+  size_t first;
   size_t halves;
   size_t leaf;
   size_t bytes;
@@ -63,7 +65,8 @@ struct Layout {
   Layout(size_t code_rows, bool wide, size_t nodes, size_t half_slots)
       : codes(sizeof(Codepage)),
         rows(codes + code_rows * kRow * (wide ? sizeof(uint32_t) : sizeof(uint16_t))),
-        halves(rows + nodes * kRow * sizeof(uint16_t)),
+        first(rows + (nodes != 0 ? nodes + kRowsBehind : 0) * kRow * sizeof(uint16_t)),
+        halves(first + (nodes != 0 ? kRow * sizeof(uint32_t) : 0)),
         leaf(halves + half_slots * sizeof(uint16_t)),
         bytes(leaf + nodes) {}
 };
@@ -146,6 +149,32 @@ bool has_two_level_rows(const Codepage& cp, size_t nodes) {
   if (nodes == 0 || cp.leaf[0] != 0) return false;
   for (size_t i = 1; i < nodes; ++i)
     if (cp.leaf[i] == 0) return false;
+  return true;
+}
+
+/// The rows behind those of the nodes, and by first byte where to look.
+PairRows pair_rows(const Codepage& cp, size_t nodes, uint16_t* rows, uint32_t* first) {
+  uint16_t* const none = rows + nodes * kRow;
+  uint16_t* const single = none + kRow;
+  for (size_t b = 0; b < kRow; ++b) none[b] = kNoUnicode;
+  memcpy(single, cp.unicode, sizeof(cp.unicode));
+  for (uint32_t b = 0; b < kRow; ++b) {
+    const size_t node = rows[b];
+    const uint8_t length = cp.length(static_cast<uint8_t>(b));
+    if (length == 1)
+      first[b] = static_cast<uint32_t>(single - rows + b) << 8;
+    else if (length == 2 && node != 0 && cp.leaf[node] == 0)
+      return {};
+    else
+      first[b] = static_cast<uint32_t>(node != 0 ? node * kRow : nodes * kRow) << 8 | 0xFF;
+  }
+  return {first, rows, cp.leads, cp.same_below >= kAscii};
+}
+
+bool has_plain_utf8(const Codepage& cp) {
+  if (!cp.utf8 || cp.same_below < kAscii) return false;
+  for (unsigned b = 0xC2; b < 0xF0; ++b)
+    if (cp.length(static_cast<uint8_t>(b)) != (b < 0xE0 ? 2 : 3)) return false;
   return true;
 }
 
@@ -243,6 +272,10 @@ void* derive_codepage(uint16_t id, const Sections& sections) {
   cp->two_level_rows = has_two_level_rows(*cp, nodes.count());
   cp->same_below = same_below(*cp);
   if (!cp->single_byte) cp->leads = lead_ranges(*cp);
+  if (cp->leads.known && nodes.count() != 0 && cp->leaf[0] == 0)
+    cp->pairs = pair_rows(*cp, nodes.count(), reinterpret_cast<uint16_t*>(block + layout.rows),
+                          reinterpret_cast<uint32_t*>(block + layout.first));
+  cp->plain_utf8 = has_plain_utf8(*cp);
   cp->plain_digits = has_plain_digits(*cp);
   fill_caseless(cp);
   return block;

@@ -9,8 +9,8 @@
 // Value: what tells a character where text is compared: its packed code, or its 16-bit unit.
 // kOneUnit: every unit is a character. kUnicode: the units are Unicode values.
 // kShifts: the text has shift states; `state` is that of the character passed last.
-// kRuns: read_run() gives the Unicode values of many characters at once, the ones that next() would give. It
-//   stops before a block of characters below `below` (0: never), because those are copied. Where it gives none,
+// kRuns: read_run() gives the Unicode values of many characters at once, the ones that next() would give; by its
+//   rule it stops before a block of characters below a bound, because those are copied. Where it gives none,
 //   next() decides what stands there.
 //
 // A cursor is small: to look ahead, copy it, and go_on_at() the copy to take what it found.
@@ -19,6 +19,7 @@
 #include "codepage/lxblock.h"
 #include "codepage/lxcodepage.h"
 #include "codepage/lxlength.h"
+#include "codepage/lxvector.h"
 
 namespace lx {
 
@@ -41,7 +42,7 @@ struct UnitCursor {
   void decode(uint8_t byte, LXUChar* u) const { *u = cp.unicode[byte]; }
   void decode(LXWChar code, LXUChar* u) const { *u = code_to_unicode(cp, code); }
   void decode(Unit unit, LXWChar* code) const { *code = unit; }
-  size_t read_run(LXUChar* values, size_t most, unsigned below);
+  size_t read_run(LXUChar* values, size_t most, RunRule rule);
   bool pass() {
     if (p == end) return false;
     ++p;
@@ -57,7 +58,7 @@ struct UnitCursor {
 using SingleByteCursor = UnitCursor<uint8_t>;
 using CodeCursor = UnitCursor<LXWChar>;
 template <>
-size_t SingleByteCursor::read_run(LXUChar* values, size_t most, unsigned below);
+size_t SingleByteCursor::read_run(LXUChar* values, size_t most, RunRule rule);
 
 /// Multibyte text by lead-byte lengths; where UTF-8 is computed, by its formula.
 template <bool kUtf8>
@@ -77,7 +78,7 @@ struct LeadByteCursor {
     *u = length == 1 ? cp.unicode[*c] : kUtf8 ? utf8_unicode(c) : row_unicode(cp, c);
   }
   void decode(const uint8_t* c, size_t length, LXWChar* code) const { *code = pack(c, length); }
-  size_t read_run(LXUChar* values, size_t most, unsigned below);
+  size_t read_run(LXUChar* values, size_t most, RunRule rule);
   /// Of the character here, wherever the text ends.
   size_t length() const { return cp.length(*p); }
   bool pass() {
@@ -106,10 +107,18 @@ struct LeadByteCursor {
 };
 using Utf8Cursor = LeadByteCursor<true>;
 using MultiByteCursor = LeadByteCursor<false>;
+/// Reads what no vector does.
+ReadRun read_odd_utf8(const Codepage& cp, const uint8_t* p, const uint8_t* end, LXUChar* values, size_t most);
 template <>
-size_t Utf8Cursor::read_run(LXUChar* values, size_t most, unsigned below);
+inline size_t Utf8Cursor::read_run(LXUChar* values, size_t most, RunRule rule) {
+  ReadRun run{p, 0};
+  if (cp.plain_utf8) run = vectors->read_utf8(p, end, values, most, rule);
+  if (run.count == 0) run = read_odd_utf8(cp, p, end, values, most);
+  p = run.p;
+  return run.count;
+}
 template <>
-size_t MultiByteCursor::read_run(LXUChar* values, size_t most, unsigned below);
+size_t MultiByteCursor::read_run(LXUChar* values, size_t most, RunRule rule);
 
 /// One shift byte before a character is eaten, also when the end cuts the character; a second one in a row is a
 /// character. A shift byte at the very end ends the text.
@@ -130,7 +139,7 @@ struct ShiftCursor {
     *u = state == LX_SHIFT_DOUBLE ? row_unicode(cp, c) : cp.unicode[*c];
   }
   void decode(const uint8_t* c, LXWChar* code) const { *code = pack(c, cp.width_in(state)); }
-  size_t read_run(LXUChar* values, size_t most, unsigned below);
+  size_t read_run(LXUChar* values, size_t most, RunRule rule);
   /// Of the character here, wherever the text ends; a shift byte before it has been passed.
   size_t length() const { return cp.width_in(state); }
   /// Passes a shift byte, if one stands here.
@@ -167,12 +176,6 @@ struct UnicodeCursor {
   static UnicodeCursor over(const Codepage&, const Unit* p, const Unit* end, LXShiftState) { return {p, end}; }
   unsigned same_below() const { return kAnySame; }
   void decode(Unit unit, LXUChar* u) const { *u = unit; }
-  /// How many of `most` units stand before a block of units below `below`.
-  size_t run_units(size_t most, unsigned below) const {
-    size_t n = 0;
-    while (most - n >= kBlock && (n == 0 || below == 0 || !is_same_block(p + n, below))) n += kBlock;
-    return most - n < kBlock ? most : n;
-  }
   bool pass() {
     if (p == end) return false;
     ++p;

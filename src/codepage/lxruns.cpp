@@ -2,13 +2,10 @@
 // store of a byte may change any member, and steps by branches rather than by looked-up lengths, because a
 // branch is predicted and a load is waited for.
 #include "codepage/lxsink.h"
+#include "codepage/lxvector.h"
 
 namespace lx {
 namespace {
-
-bool stops_at(const uint8_t* p, unsigned below) {
-  return below != 0 && is_same_block(p, below);
-}
 
 /// The Unicode value of a two-byte character where the root's children are leaves.
 uint16_t two_byte_unicode(const uint16_t* rows, const uint8_t* p) {
@@ -16,64 +13,53 @@ uint16_t two_byte_unicode(const uint16_t* rows, const uint8_t* p) {
   return node != 0 ? rows[node << 8 | p[1]] : kNoUnicode;
 }
 
+bool is_long_same(const uint8_t* p, const uint8_t* end, unsigned below) {
+  return below != 0 && room(p, end) >= 2 * kBlock && is_same_block(p, below) &&
+         is_same_block(p + kBlock, below);
+}
+
+/// How many of `count` units stand before a block of units below `below`.
+template <class Unit>
+size_t units_before_same(const Unit* units, size_t count, unsigned below) {
+  if (below == 0) return count;
+  size_t n = 0;
+  while (count - n >= kBlock && !is_same_block(units + n, below)) n += kBlock;
+  return count - n < kBlock ? count : n;
+}
+
+/// Writes values: blocks of those that stay what they are copied, others by `put(values, count, to)`, which
+/// returns where they end.
+template <class Put>
+uint8_t* put_values(uint8_t* to, const LXUChar* values, size_t count, unsigned below, Put&& put) {
+  while (count != 0) {
+    const size_t same = below != 0 ? copy_same_blocks(to, values, count, below) : 0;
+    to += same;
+    values += same;
+    count -= same;
+    const size_t others = units_before_same(values, count, below);
+    to = put(values, others, to);
+    values += others;
+    count -= others;
+  }
+  return to;
+}
+
 }  // namespace
 
 template <>
-size_t SingleByteCursor::read_run(LXUChar* values, size_t most, unsigned below) {
-  const uint16_t* const unicode = cp.unicode;
-  const uint8_t* const start = p;
-  const size_t n = least(most, room(p, end));
-  size_t i = 0;
-  for (; n - i >= kBlock; i += kBlock) {
-    if (i != 0 && stops_at(start + i, below)) break;
-#pragma GCC unroll 16
-    for (size_t k = 0; k < kBlock; ++k) values[i + k] = unicode[start[i + k]];
-  }
-  if (n - i < kBlock)
-    for (; i < n; ++i) values[i] = unicode[start[i]];
-  p = start + i;
-  return i;
+size_t SingleByteCursor::read_run(LXUChar* values, size_t most, RunRule rule) {
+  const size_t n = units_before_same(p, least(most, room(p, end)), rule.below);
+  size_t i = cp.same_below > kAscii ? copy_same(values, p, n, cp.same_below) : 0;
+  if (i != n) vectors->look_up(cp.unicode, p + i, n - i, values + i, rule);
+  p += n;
+  return n;
 }
 
-template <>
-size_t Utf8Cursor::read_run(LXUChar* values, size_t most, unsigned below) {
-  const bool plain = cp.same_below != 0;
-  const uint8_t* q = p;
+ReadRun read_odd_utf8(const Codepage& cp, const uint8_t* q, const uint8_t* end, LXUChar* values, size_t most) {
   size_t n = 0;
   while (n < most) {
     const size_t left = room(q, end);
     if (left == 0) break;
-    if (plain && (*q & 0xF0) == 0xE0 && left >= 3) {
-      const size_t run_end = n + least(most - n, left / 3);
-      do {
-        values[n++] = static_cast<LXUChar>(q[0] << 12 | (q[1] & 0x3F) << 6 | (q[2] & 0x3F));
-        q += 3;
-      } while (n < run_end && (*q & 0xF0) == 0xE0);
-      continue;
-    }
-    // A block leaves a value behind its last one: there is one more character, whose value overwrites it.
-    if (kVectors && plain && most - n > kBlock && left >= kBlock + kMaxCharBytes) {
-      Utf8Block block(q);
-      if (block.ascii()) {
-        if (n != 0 && left >= 2 * kBlock && stops_at(q + kBlock, below)) break;
-        copy_block(values + n, q);
-        n += kBlock;
-        q += kBlock;
-        continue;
-      }
-      // Where other letters are few, the ASCII up to the next one is widened at once. The values stored behind
-      // it are overwritten: at least a block of characters follows.
-      constexpr size_t kWorthIt = 4;
-      if (block.ascii_bytes() >= kWorthIt && left >= 4 * kBlock) {
-        copy_block(values + n, q);
-        n += block.ascii_bytes();
-        q += block.ascii_bytes();
-      } else if (block.find_chars()) {
-        n += block.store_values(values + n);
-        q += block.bytes();
-        continue;
-      }
-    }
     const size_t length = cp.length(*q);
     if (length > left) break;
     if (length == 1) {
@@ -82,35 +68,33 @@ size_t Utf8Cursor::read_run(LXUChar* values, size_t most, unsigned below) {
       values[n++] = utf8_unicode(q);
       q += length;
     }
+    // Behind one that was odd the text may go on as any other.
+    if (cp.plain_utf8 && left > kBlock) break;
   }
-  p = q;
-  return n;
+  return {q, n};
 }
 
 template <>
-size_t MultiByteCursor::read_run(LXUChar* values, size_t most, unsigned below) {
-  const uint16_t* const unicode = cp.unicode;
-  const uint16_t* const rows = cp.two_level_rows ? cp.rows : nullptr;
+size_t MultiByteCursor::read_run(LXUChar* values, size_t most, RunRule rule) {
+  constexpr size_t kFewChars = 64;  // then others may follow
+  const PairRows& pairs = cp.pairs;
+  if (pairs.first != nullptr) {
+    const ReadRun run = vectors->read_pairs(pairs, p, end, values, most, rule);
+    p = run.p;
+    if (run.count != 0) return run.count;
+  }
   const uint8_t* q = p;
   size_t n = 0;
-  bool after_long = false;
   while (n < most) {
     const size_t left = room(q, end);
-    if (left == 0) break;
+    if (left == 0 || (n == kFewChars && left > kFewChars)) break;
     const size_t length = cp.length(*q);
-    if (length == 1) {
-      if (after_long && left >= kBlock && stops_at(q, below)) break;
-      after_long = false;
-      values[n++] = unicode[*q++];
-      continue;
-    }
     if (length > left) break;
-    after_long = true;
-    if (length == 2 && rows != nullptr) {
-      values[n++] = two_byte_unicode(rows, q);
-      q += 2;
+    if (length == 1) {
+      if (n >= kBlock && is_long_same(q, end, rule.below)) break;
+      values[n++] = cp.unicode[*q++];
     } else {
-      values[n++] = row_unicode(cp, q);
+      values[n++] = length == 2 && pairs.first != nullptr ? pair_value(pairs, q) : row_unicode(cp, q);
       q += length;
     }
   }
@@ -118,7 +102,7 @@ size_t MultiByteCursor::read_run(LXUChar* values, size_t most, unsigned below) {
   return n;
 }
 
-size_t ShiftCursor::read_run(LXUChar* values, size_t most, unsigned) {
+size_t ShiftCursor::read_run(LXUChar* values, size_t most, RunRule rule) {
   constexpr size_t kMostBytes = 1 + kMaxCharBytes;
   const Codepage& c = cp;
   const uint16_t* const rows = c.two_level_rows && c.width == 2 ? c.rows : nullptr;
@@ -131,9 +115,10 @@ size_t ShiftCursor::read_run(LXUChar* values, size_t most, unsigned) {
     size_t chars = least(most - n, room(q, end) / c.width_in(s));
     // The character behind a shift byte is not looked at: a second shift byte in a row is one.
     if (s != LX_SHIFT_DOUBLE) {
-      do {
-        values[n++] = c.unicode[*q++];
-      } while (--chars != 0 && *q != shift_out && *q != shift_in);
+      chars = 1 + units_before_either(q + 1, chars - 1, c.shift_out, c.shift_in);
+      vectors->look_up(c.unicode, q, chars, values + n, rule);
+      n += chars;
+      q += chars;
     } else if (rows != nullptr) {
       do {
         values[n++] = two_byte_unicode(rows, q);
@@ -168,61 +153,27 @@ Passed pass_blocks(const Codepage& cp, const uint8_t* p, const uint8_t* end, siz
 
 template <>
 void SingleByteSink::put_run(const LXUChar* values, size_t count) {
-  constexpr size_t kBatch = 8;
-  const uint32_t* const page_start = cp.page_start;
-  const uint16_t* const codes = cp.codes16;
-  const auto code = [&](unsigned u) { return static_cast<uint8_t>(codes[page_start[u >> 8] + (u & 0xFF)]); };
-  uint8_t* const q = p;
-  size_t i = cp.same_below != 0 ? copy_same_blocks(q, values, count, cp.same_below) : 0;
-  for (; count - i >= kBatch; i += kBatch) {
-    uint8_t batch[kBatch];
-#pragma GCC unroll 8
-    for (size_t k = 0; k < kBatch; ++k) batch[k] = code(values[i + k]);
-    memcpy(q + i, batch, kBatch);
-  }
-  for (; i < count; ++i) q[i] = code(values[i]);
-  p = q + count;
-}
-
-template <>
-void Utf8Sink::put_run(const LXUChar* values, size_t count) {
-  uint8_t* q = p;
-  size_t i = 0;
-  while (i < count) {
-    // A character follows the batch, so that the byte that may be behind it is written again.
-    if (count - i > kUtf8Batch && put_short_batch(values + i, &q)) {
-      i += kUtf8Batch;
-      continue;
-    }
-    const size_t batch_end = i + least(count - i, kUtf8Batch);
-    for (; i < batch_end; ++i) {
-      const size_t n = utf8_bytes(values[i]);
-      store_utf8(q, values[i], n);
-      q += n;
-    }
-  }
-  p = q;
+  const PairCodes codes{cp.page_start, cp.codes16};
+  p = put_values(p, values, count, cp.same_below,
+                 [&](const LXUChar* v, size_t n, uint8_t* q) { return vectors->write_bytes(codes, q, v, n); });
 }
 
 template <>
 void MultiByteSink::put_run(const LXUChar* values, size_t count) {
-  size_t i = 0;
-  if (cp.codes16 != nullptr) {
-    const uint32_t* const page_start = cp.page_start;
-    const uint16_t* const codes = cp.codes16;
-    uint8_t* q = p;
-    // Whether a character has one byte or two is not predictable, so there is no branch.
-    for (; i < count; ++i) {
-      const unsigned u = values[i];
-      const unsigned code = codes[page_start[u >> 8] + (u & 0xFF)];
-      const unsigned two = (0xFFu - code) >> 31;
-      q[0] = static_cast<uint8_t>(code >> 8);
-      q[two] = static_cast<uint8_t>(code);
-      q += 1 + two;
+  if (cp.codes16 == nullptr) {
+    // All bytes that a code may have are stored, where enough characters follow.
+    for (; count > kMaxCharBytes; ++values, --count) {
+      const uint32_t code = row_code(cp, *values);
+      const size_t bytes = code_bytes(code);
+      put_le32(p, __builtin_bswap32(code << 8 * (kMaxCharBytes - bytes)));
+      p += bytes;
     }
-    p = q;
+    for (; count != 0; ++values, --count) put(*values);
+    return;
   }
-  for (; i < count; ++i) put(values[i]);
+  const PairCodes codes{cp.page_start, cp.codes16};
+  p = put_values(p, values, count, cp.same_below,
+                 [&](const LXUChar* v, size_t n, uint8_t* q) { return vectors->write_pairs(codes, q, v, n); });
 }
 
 template <>

@@ -86,7 +86,9 @@ struct LeadByteSink {
 using Utf8Sink = LeadByteSink<true>;
 using MultiByteSink = LeadByteSink<false>;
 template <>
-void Utf8Sink::put_run(const LXUChar* values, size_t count);
+inline void Utf8Sink::put_run(const LXUChar* values, size_t count) {
+  p = vectors->write_utf8(p, values, count);
+}
 template <>
 void MultiByteSink::put_run(const LXUChar* values, size_t count);
 

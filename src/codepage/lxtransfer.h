@@ -6,7 +6,7 @@
 namespace lx {
 
 inline constexpr size_t kRunChars = 128;      // moved at a time through a buffer on the stack
-inline constexpr size_t kRunUnits = 48;       // of shorter texts the characters are moved one by one
+inline constexpr size_t kRunUnits = 8;        // of shorter Unicode the characters are moved one by one
 inline constexpr size_t kShiftRunUnits = 16;  // the same where shift states are kept
 
 /// Why a transfer of characters stopped.
@@ -26,34 +26,37 @@ inline unsigned same_below(const Cursor& in, const Sink& out) {
 }
 
 /// Moves the characters that fit for certain, as Unicode values: how many they were. Not inline: the loops of
-/// transfer(), which short texts take, stay small.
+/// transfer(), which the shortest texts take, stay small.
 template <class Cursor, class Sink>
-[[gnu::noinline]] size_t move_runs(Cursor& in, Sink& out, size_t count, unsigned below) {
+[[gnu::noinline]] size_t move_runs(Cursor* in_at, Sink* out_at, size_t count) {
+  Cursor in = *in_at;
+  Sink out = *out_at;
+  const unsigned below = same_below(in, out);
   size_t left = count;
-  for (;;) {
-    size_t n = 0;
-    if (below != 0) {
-      n = copy_same_blocks(out.p, in.p, least(left, room(in.p, in.end), room(out.p, out.end)), below);
-      in.p += n;
-      out.p += n;
-      left -= n;
-    }
+  for (size_t n = 1; n != 0 && in.p != in.end; left -= n) {
     if constexpr (Sink::kUnicode) {
-      n = in.read_run(out.p, least(left, room(out.p, out.end)), below);
+      n = in.read_run(out.p, least(left, room(out.p, out.end)), RunRule{});
       out.p += n;
     } else if constexpr (Cursor::kUnicode) {
       n = least(left, room(in.p, in.end), room(out.p, out.end) / out.most_units());
-      n = in.run_units(least(n, kRunChars), below);
       out.put_run(in.p, n);
       in.p += n;
     } else {
-      LXUChar values[kRunChars];
-      n = in.read_run(values, least(left, kRunChars, room(out.p, out.end) / out.most_units()), below);
+      if (below != 0) {
+        n = copy_same_blocks(out.p, in.p, least(left, room(in.p, in.end), room(out.p, out.end)), below);
+        in.p += n;
+        out.p += n;
+        left -= n;
+      }
+      LXUChar values[kRunChars + kRunSlack];
+      n = in.read_run(values, least(left, kRunChars, room(out.p, out.end) / out.most_units()),
+                      {below, kRunSlack});
       out.put_run(values, n);
     }
-    if (n == 0) return count - left;
-    left -= n;
   }
+  go_on_at(*in_at, in);
+  go_on_at(*out_at, out);
+  return count - left;
 }
 
 /// Moves characters from a cursor to a sink, at most `count` of them, as Unicode values or as packed codes.
@@ -64,16 +67,19 @@ inline Transfer<Value> transfer(Cursor& in, Sink& out, size_t count) {
   size_t left = count;
   unsigned below = 0;
   if constexpr (kRuns) {
-    below = same_below(in, out);
     constexpr bool kShift = Cursor::kShifts || Sink::kShifts;
-    if (room(in.p, in.end) >= (kShift ? kShiftRunUnits : kRunUnits)) {
+    constexpr bool kPivot = !Cursor::kUnicode && !Sink::kUnicode;
+    const size_t worth = kShift ? kShiftRunUnits : kPivot ? vectors->pivot_bytes : kRunUnits;
+    if (room(in.p, in.end) >= worth) {
       // On copies: what other functions see in memory cannot stay in registers below.
       Cursor long_in = in;
       Sink long_out = out;
-      left -= move_runs(long_in, long_out, left, below);
+      left -= move_runs(&long_in, &long_out, left);
       go_on_at(in, long_in);
       go_on_at(out, long_out);
+      if (in.p == in.end) return {Stop::kInputEnd, count - left, Value{}};
     }
+    below = same_below(in, out);
   }
   if constexpr (Cursor::kOneUnit && Sink::kOneUnit) {
     const size_t n = least(left, room(in.p, in.end), room(out.p, out.end));

@@ -130,7 +130,7 @@ TinyCodepage tiny_shift() {
 
 TinyCodepage tiny_utf8() {
   CodepageBuilder builder(fmt::kUtf8Id, "TINY-UTF8", 3);
-  builder.ascii().lead(0xC0, 0xDF, 2).lead(0xE0, 0xFF, 3);
+  builder.ascii().lead(0xC2, 0xDF, 2).lead(0xE0, 0xEF, 3);
   // The mappings serve the type trie and the tests; conversion does not look at them.
   builder.map(0xC2A0, 0xA0, 32).map(0xC380, 0xC0, 64).map(0xC480, 0x100, 64).map(0xCC80, 0x300, 16);
   builder.map(0xD9A0, 0x660, 10).map(0xE28080, 0x2000).map(0xE28090, 0x2010, 2).map(0xE282AC, 0x20AC);

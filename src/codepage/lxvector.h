@@ -1,0 +1,84 @@
+// Runs of characters by the widest vectors of the processor: the loops that pay for more than what every machine
+// has. Which ones are used is chosen once; all of them give the same.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+
+#include "codepage/lxblock.h"
+
+namespace lx {
+
+/// Characters of one and two bytes as the rows of a codepage have them.
+struct PairRows {
+  /// By first byte, in the upper bits where the row of such characters begins in `rows`, or where the value of a
+  /// single byte stands, and in the lower eight what of the byte behind it counts: all, or nothing.
+  const uint32_t* first;  // null: there are none, or other first bytes than `leads` can say
+  const uint16_t* rows;
+  LeadRanges leads;
+  bool ascii;  // ASCII is what it is
+};
+
+/// The value of the character of one byte or two at `p`; a byte is read behind it.
+inline uint16_t pair_value(const PairRows& pairs, const uint8_t* p) {
+  const uint32_t where = pairs.first[p[0]];
+  return pairs.rows[(where >> 8) + (p[1] & where)];
+}
+
+/// How a run of values is read.
+struct RunRule {
+  uint32_t below;  // not 0: ends also before ASCII that follows other characters
+  uint32_t slack;  // so many values behind the last one may be written over
+};
+inline constexpr uint32_t kRunSlack = 64;  // what is of use
+
+/// What a run has read: where it goes on, and how many values there are.
+struct ReadRun {
+  const uint8_t* p;
+  size_t count;
+};
+
+/// Where the codes of values of at most two bytes stand: of the value u at page_start[u >> 8] + (u & 0xFF).
+struct PairCodes {
+  const uint32_t* page_start;
+  const uint16_t* codes;
+};
+
+/// One choice of loops. They read nothing behind the end of a text, and write nothing behind their last unit but for
+/// a slack.
+struct Vectors {
+  const char* name;
+
+  /// From so many bytes on a text goes from one codepage to another by way of a run of values.
+  size_t pivot_bytes;
+
+  /// Reads characters of UTF-8, well-formed and of at most three bytes: as many as `most`, or fewer. None where there
+  /// is another character, one that the end cuts, or where a character at a time is as good.
+  ReadRun (*read_utf8)(const uint8_t* p, const uint8_t* end, uint16_t* values, size_t most, RunRule rule);
+
+  /// The same of characters of one and two bytes.
+  ReadRun (*read_pairs)(const PairRows& pairs, const uint8_t* p, const uint8_t* end, uint16_t* values,
+                        size_t most, RunRule rule);
+
+  /// Copies at most kRunSlack bytes if all are below `below`, 0x80 or 0x100; else none.
+  bool (*copy_same)(uint8_t* to, const uint8_t* from, size_t count, unsigned below);
+
+  /// Looks up `count` bytes in a table.
+  void (*look_up)(const uint16_t table[256], const uint8_t* p, size_t count, uint16_t* values, RunRule rule);
+
+  // Write characters where all of them fit: where they end. As UTF-8, ...
+  uint8_t* (*write_utf8)(uint8_t* p, const uint16_t* values, size_t count);
+  // ... as codes of one byte and two, ...
+  uint8_t* (*write_pairs)(const PairCodes& codes, uint8_t* p, const uint16_t* values, size_t count);
+  // ... and as codes of one byte.
+  uint8_t* (*write_bytes)(const PairCodes& codes, uint8_t* p, const uint16_t* values, size_t count);
+};
+
+/// The ones that this processor can run, the best one first: how many.
+inline constexpr size_t kMostVectors = 3;
+size_t vectors_here(const Vectors* found[kMostVectors]);
+
+/// The best one, chosen when the library is loaded.
+extern const Vectors* vectors;
+
+}  // namespace lx
