@@ -29,6 +29,19 @@ struct PageCodes {
   uint32_t code(uint16_t u) const;
 };
 
+/// The type records of characters of two bytes whose first byte begins some that have another case.
+struct PairCase {
+  const uint8_t* records;   // of the codepage
+  const uint16_t* numbers;  // of its records, by row and second byte
+  const uint8_t* row;       // by first byte; 0: none
+  uint8_t mask;             // what of a second byte counts
+
+  const uint8_t* record(size_t of_row, uint8_t second) const {
+    return records +
+           format::codepage::TypeRecord::kBytes * numbers[(of_row - 1) * (mask + 1u) + (second & mask)];
+  }
+};
+
 /// Derived data of a codepage object, one block with the arrays behind it.
 ///
 /// Towards Unicode: `unicode` for single bytes; for longer characters `rows`, one row of 256 values a trie
@@ -65,6 +78,8 @@ struct Codepage {
   // By first byte: the length of the characters of several bytes that begin with it, if none of them has
   // another case; else 0.
   uint8_t caseless[256];
+  PairCase pair_case;
+  uint8_t pair_case_rows[256];
 
   uint8_t length(uint8_t first_byte) const { return payload[format::codepage::kLengths + first_byte]; }
   bool is_shift(uint8_t byte) const { return byte == shift_out || byte == shift_in; }

@@ -59,15 +59,17 @@ struct Layout {
   size_t rows;
   size_t first;
   size_t halves;
+  size_t cases;
   size_t leaf;
   size_t bytes;
 
-  Layout(size_t code_rows, bool wide, size_t nodes, size_t half_slots)
+  Layout(size_t code_rows, bool wide, size_t nodes, size_t half_slots, size_t case_numbers)
       : codes(sizeof(Codepage)),
         rows(codes + code_rows * kRow * (wide ? sizeof(uint32_t) : sizeof(uint16_t))),
         first(rows + (nodes != 0 ? nodes + kRowsBehind : 0) * kRow * sizeof(uint16_t)),
         halves(first + (nodes != 0 ? kRow * sizeof(uint32_t) : 0)),
-        leaf(halves + half_slots * sizeof(uint16_t)),
+        cases(halves + half_slots * sizeof(uint16_t)),
+        leaf(cases + case_numbers * sizeof(uint16_t)),
         bytes(leaf + nodes) {}
 };
 
@@ -193,6 +195,16 @@ class TypeTrie {
       : nodes_(payload + le16(payload + fmt::kTypeTrie)),
         records_(payload + le16(payload + fmt::kTypeRecords)) {}
 
+  /// The node of the second byte of characters of two bytes; false where they end elsewhere, or their records
+  /// have numbers that are too large.
+  bool pair_node(uint8_t first_byte, fmt::TypeNode* node) const {
+    const fmt::TypeNode root = fmt::TypeNode::read(nodes_);
+    if (root.leaf != 0) return false;
+    *node = fmt::TypeNode::read(nodes_ + fmt::TypeNode::kBytes * root.next(first_byte));
+    return node->leaf != 0 && node->base + node->mask <= UINT16_MAX;
+  }
+  const uint8_t* records() const { return records_; }
+
   bool has_case(uint8_t first_byte) const {
     const fmt::TypeNode root = fmt::TypeNode::read(nodes_);
     return root.leaf != 0 || has_case_under(root.next(first_byte));
@@ -217,12 +229,40 @@ class TypeTrie {
   const uint8_t* records_;
 };
 
-void fill_caseless(Codepage* cp) {
-  if (cp->single_byte) return;
+/// Which first bytes begin characters that have another case; `pairs` is given rows for those of two bytes. How many
+/// numbers these take.
+size_t find_case(Codepage* cp) {
+  if (cp->single_byte) return 0;
   const TypeTrie types(cp->payload);
+  size_t rows = 0;
   for (unsigned b = 0; b < kRow; ++b) {
-    const uint8_t length = cp->length(static_cast<uint8_t>(b));
-    if (length > 1 && !types.has_case(static_cast<uint8_t>(b))) cp->caseless[b] = length;
+    const auto first = static_cast<uint8_t>(b);
+    const uint8_t length = cp->length(first);
+    if (length < 2) continue;
+    fmt::TypeNode node;
+    if (!types.has_case(first)) {
+      cp->caseless[b] = length;
+    } else if (length == 2 && rows < UINT8_MAX && types.pair_node(first, &node)) {
+      cp->pair_case_rows[b] = static_cast<uint8_t>(++rows);
+      cp->pair_case.mask |= node.mask;
+    }
+  }
+  // All bits below the highest one count, so that a row has as many numbers as the mask has values.
+  while ((cp->pair_case.mask & (cp->pair_case.mask + 1)) != 0) cp->pair_case.mask |= cp->pair_case.mask >> 1;
+  return rows * (cp->pair_case.mask + 1u);
+}
+
+void fill_pair_case(Codepage* cp, uint16_t* numbers) {
+  const TypeTrie types(cp->payload);
+  cp->pair_case.records = types.records();
+  cp->pair_case.numbers = numbers;
+  cp->pair_case.row = cp->pair_case_rows;
+  for (unsigned b = 0; b < kRow; ++b) {
+    fmt::TypeNode node;
+    if (cp->pair_case_rows[b] == 0 || !types.pair_node(static_cast<uint8_t>(b), &node)) continue;
+    for (unsigned second = 0; second <= cp->pair_case.mask; ++second)
+      numbers[(cp->pair_case_rows[b] - 1u) * (cp->pair_case.mask + 1u) + second] =
+          static_cast<uint16_t>(node.next(second));
   }
 }
 
@@ -242,7 +282,8 @@ void* derive_codepage(uint16_t id, const Sections& sections) {
     if (!scalars.utf8 && scalars.pages.maps(page)) scalars.page_start[page] = kRow * code_rows++;
   const bool wide = !scalars.utf8 && scalars.width > 2;
   const size_t half_slots = WidthTables(scalars).slots();
-  const Layout layout(code_rows, wide, nodes.count(), half_slots);
+  const size_t case_numbers = find_case(&scalars);
+  const Layout layout(code_rows, wide, nodes.count(), half_slots, case_numbers);
 
   uint8_t* block = static_cast<uint8_t*>(hook_allocate_zeroed(layout.bytes));
   if (block == nullptr) return nullptr;
@@ -277,7 +318,7 @@ void* derive_codepage(uint16_t id, const Sections& sections) {
                           reinterpret_cast<uint32_t*>(block + layout.first));
   cp->plain_utf8 = has_plain_utf8(*cp);
   cp->plain_digits = has_plain_digits(*cp);
-  fill_caseless(cp);
+  fill_pair_case(cp, reinterpret_cast<uint16_t*>(block + layout.cases));
   return block;
 }
 

@@ -3,6 +3,7 @@
 #pragma once
 
 #include "codepage/lxmaptext.h"
+#include "codepage/lxunicode.h"
 
 namespace lx {
 
@@ -91,42 +92,66 @@ template <class Text>
   text.out.p += i;
 }
 
-/// What map_run() leaves: copies whole characters of several bytes that have no case; false for none.
+/// Behind how many characters of one unit the next ones are left to map_run().
+inline constexpr size_t kFewUnits = kBlock;
+
+/// What map_run() leaves: copies whole characters of several bytes that have no case, and maps those of two bytes
+/// that have one and keep their length, with the few bytes below `below` that stand between; false for none.
 template <class Mapper>
-bool map_rest(LeadByteText& text, const Mapper&, unsigned) {
+bool map_rest(LeadByteText& text, const Mapper& mapper, unsigned below) {
+  const Codepage& cp = text.in.cp;
   const uint8_t* const p = text.in.p;
-  const uint8_t* const lengths = text.in.cp.caseless;
+  uint8_t* const to = text.out.p;
+  const uint8_t* const lengths = cp.caseless;
+  const PairCase pairs = cp.pair_case;
   const size_t n = most_units(text);
   size_t i = 0;
-  while (i < n) {
-    const size_t length = lengths[p[i]];
-    if (length == 0 || length > n - i) break;
-    i += length;
-    // Mostly the next ones are as long: then no look-up waits for the one before it.
-    while (n - i >= 4 * length && lengths[p[i]] == length && lengths[p[i + length]] == length &&
-           lengths[p[i + 2 * length]] == length && lengths[p[i + 3 * length]] == length)
-      i += 4 * length;
+  for (size_t start = n; i != start && i < n;) {
+    start = i;
+    while (i < n) {
+      const size_t length = lengths[p[i]];
+      if (length == 0 || length > n - i) break;
+      i += length;
+      // Mostly the next ones are as long: then no look-up waits for the one before it.
+      while (n - i >= 4 * length && lengths[p[i]] == length && lengths[p[i + length]] == length &&
+             lengths[p[i + 2 * length]] == length && lengths[p[i + 3 * length]] == length)
+        i += 4 * length;
+    }
+    if (i != start) memmove(to + start, p + start, i - start);
+    for (; n - i >= 2; i += 2) {
+      const unsigned row = pairs.row[p[i]];
+      if (row == 0) break;
+      const auto type = format::codepage::TypeRecord::read(pairs.record(row, p[i + 1]));
+      const uint32_t code = pack(p + i, 2) + ((type.type & mapper.mask) != 0 ? type.case_delta : 0);
+      if (code_bytes(code) != 2) break;
+      to[i] = static_cast<uint8_t>(code >> 8);
+      to[i + 1] = static_cast<uint8_t>(code);
+    }
+    if (i == start) break;
+    const size_t few = i + least(n - i, kFewUnits);
+    for (; i < few && p[i] < below; ++i) to[i] = mapper.table[p[i]];
+    if (i == few) break;
   }
-  if (i == 0) return false;
-  memmove(text.out.p, text.in.p, i);
   text.in.p += i;
   text.out.p += i;
-  return true;
+  return i != 0;
 }
 
 /// ... and maps the characters of Unicode text.
 template <class Mapper>
 bool map_rest(UnicodeText& text, const Mapper& mapper, unsigned below) {
-  auto [p, end] = text.in;
-  auto [to, to_end] = text.out;
-  for (; p != end && to != to_end && *p >= below; ++p, ++to) {
-    LXUChar mapped = *p;
-    mapper.alone({mapped}, &mapped);
-    *to = mapped;
+  const CaseTable& table = case_tables[mapper.mode.upper];
+  const LXUChar* const p = text.in.p;
+  LXUChar* const to = text.out.p;
+  const size_t n = most_units(text);
+  size_t i = 0;
+  while (i < n && (p[i] >= below || n - i < kFewUnits || !is_same_block(p + i, below))) {
+    const size_t few = i + least(n - i, kFewUnits);
+    for (; i < few; ++i) to[i] = table.other(p[i]);
   }
-  const bool any = p != text.in.p;
-  text = {{p, end}, {to, to_end}};
-  return any;
+  text.in.p += i;
+  text.out.p += i;
+  return i != 0;
 }
 
 }  // namespace lx

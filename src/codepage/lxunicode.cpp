@@ -47,6 +47,56 @@ constexpr uint32_t arabic_form_type(uint16_t u) {
   return u == 0xFBE9 || u == 0xFCE1 ? kTypeUnassigned : kArabicForm;
 }
 
+constexpr uint16_t lower_by_range(uint16_t u) {
+  if (in(u, 0x0041, 0x005A)) return moved(u, 0x20);
+  if (u < 0x00C0) return u;  // the rest of ASCII need not walk the list
+  if (in(u, 0x00C0, 0x00DE)) return u == 0x00D7 ? u : moved(u, 0x20);
+  if (in(u, 0x0100, 0x01FE)) return entry<0x0100, 0x01FE>(LX_UNICODE_Lower1, u);
+  if (in(u, 0x0200, 0x0275)) return entry<0x0200, 0x0275>(LX_UNICODE_Lower2, u);
+  if (in(u, 0x0386, 0x03EE)) return entry<0x0380, 0x03EE>(LX_UNICODE_Lower3, u);
+  if (in(u, 0x0401, 0x04F8)) return entry<0x0400, 0x04F8>(LX_UNICODE_Lower4, u);
+  if (in(u, 0x0531, 0x0556)) return moved(u, 0x30);
+  if (in(u, 0x10A0, 0x10C5)) return moved(u, 0x30);
+  if (in(u, 0x1E00, 0x1EF8)) return entry<0x1E00, 0x1EF8>(LX_UNICODE_Lower5, u);
+  if (in(u, 0x1F08, 0x1FFC)) return entry<0x1F00, 0x1FFC>(LX_UNICODE_Lower6, u);
+  if (in(u, 0x2160, 0x216F)) return moved(u, 0x10);
+  if (in(u, 0x24B6, 0x24CF)) return moved(u, 0x1A);
+  if (in(u, 0xFF21, 0xFF3A)) return moved(u, 0x20);
+  return u;
+}
+
+constexpr uint16_t upper_by_range(uint16_t u) {
+  if (in(u, 0x0061, 0x007A)) return moved(u, -0x20);
+  if (u < 0x00E0) return u;  // the rest of ASCII need not walk the list
+  if (in(u, 0x00E0, 0x00FE)) return u == 0x00F7 ? u : moved(u, -0x20);
+  if (u == 0x00FF) return 0x0178;
+  if (in(u, 0x0101, 0x01FF)) return entry<0x0100, 0x01FF>(LX_UNICODE_Upper1, u);
+  if (in(u, 0x0200, 0x0292)) return entry<0x0200, 0x0292>(LX_UNICODE_Upper2, u);
+  if (in(u, 0x03AC, 0x03F1)) return entry<0x03A0, 0x03F1>(LX_UNICODE_Upper3, u);
+  if (in(u, 0x0430, 0x04F9)) return entry<0x0430, 0x04F9>(LX_UNICODE_Upper4, u);
+  if (in(u, 0x0561, 0x0586)) return moved(u, -0x30);
+  if (in(u, 0x1E01, 0x1EF9)) return entry<0x1E00, 0x1EF9>(LX_UNICODE_Upper5, u);
+  if (in(u, 0x1F00, 0x1FF3)) return entry<0x1F00, 0x1FF3>(LX_UNICODE_Upper6, u);
+  if (in(u, 0x2170, 0x217F)) return moved(u, -0x10);
+  if (in(u, 0x24D0, 0x24E9)) return moved(u, -0x1A);
+  if (in(u, 0xFF41, 0xFF5A)) return moved(u, -0x20);
+  return u;
+}
+
+constexpr CaseTable make_case_table(bool upper) {
+  CaseTable table{};
+  unsigned pages = 1;  // the first one moves nothing
+  for (unsigned u = 0; u <= 0xFFFF; ++u) {
+    const auto value = static_cast<uint16_t>(u);
+    const auto delta = static_cast<uint16_t>((upper ? upper_by_range(value) : lower_by_range(value)) - u);
+    if (delta == 0) continue;
+    uint8_t& page = table.page[u >> 8];
+    if (page == 0) page = static_cast<uint8_t>(pages++);
+    table.delta[page][u & 0xFF] = delta;
+  }
+  return table;
+}
+
 }  // namespace
 
 uint32_t unicode_type(uint16_t u) {
@@ -74,41 +124,8 @@ uint32_t unicode_type(uint16_t u) {
   return entry<0xFD3E, 0xFFFF>(LX_UNICODE_Ctype8, u);
 }
 
-uint16_t unicode_lower(uint16_t u) {
-  if (in(u, 0x0041, 0x005A)) return moved(u, 0x20);
-  if (u < 0x00C0) return u;  // the rest of ASCII need not walk the list
-  if (in(u, 0x00C0, 0x00DE)) return u == 0x00D7 ? u : moved(u, 0x20);
-  if (in(u, 0x0100, 0x01FE)) return entry<0x0100, 0x01FE>(LX_UNICODE_Lower1, u);
-  if (in(u, 0x0200, 0x0275)) return entry<0x0200, 0x0275>(LX_UNICODE_Lower2, u);
-  if (in(u, 0x0386, 0x03EE)) return entry<0x0380, 0x03EE>(LX_UNICODE_Lower3, u);
-  if (in(u, 0x0401, 0x04F8)) return entry<0x0400, 0x04F8>(LX_UNICODE_Lower4, u);
-  if (in(u, 0x0531, 0x0556)) return moved(u, 0x30);
-  if (in(u, 0x10A0, 0x10C5)) return moved(u, 0x30);
-  if (in(u, 0x1E00, 0x1EF8)) return entry<0x1E00, 0x1EF8>(LX_UNICODE_Lower5, u);
-  if (in(u, 0x1F08, 0x1FFC)) return entry<0x1F00, 0x1FFC>(LX_UNICODE_Lower6, u);
-  if (in(u, 0x2160, 0x216F)) return moved(u, 0x10);
-  if (in(u, 0x24B6, 0x24CF)) return moved(u, 0x1A);
-  if (in(u, 0xFF21, 0xFF3A)) return moved(u, 0x20);
-  return u;
-}
-
-uint16_t unicode_upper(uint16_t u) {
-  if (in(u, 0x0061, 0x007A)) return moved(u, -0x20);
-  if (u < 0x00E0) return u;  // the rest of ASCII need not walk the list
-  if (in(u, 0x00E0, 0x00FE)) return u == 0x00F7 ? u : moved(u, -0x20);
-  if (u == 0x00FF) return 0x0178;
-  if (in(u, 0x0101, 0x01FF)) return entry<0x0100, 0x01FF>(LX_UNICODE_Upper1, u);
-  if (in(u, 0x0200, 0x0292)) return entry<0x0200, 0x0292>(LX_UNICODE_Upper2, u);
-  if (in(u, 0x03AC, 0x03F1)) return entry<0x03A0, 0x03F1>(LX_UNICODE_Upper3, u);
-  if (in(u, 0x0430, 0x04F9)) return entry<0x0430, 0x04F9>(LX_UNICODE_Upper4, u);
-  if (in(u, 0x0561, 0x0586)) return moved(u, -0x30);
-  if (in(u, 0x1E01, 0x1EF9)) return entry<0x1E00, 0x1EF9>(LX_UNICODE_Upper5, u);
-  if (in(u, 0x1F00, 0x1FF3)) return entry<0x1F00, 0x1FF3>(LX_UNICODE_Upper6, u);
-  if (in(u, 0x2170, 0x217F)) return moved(u, -0x10);
-  if (in(u, 0x24D0, 0x24E9)) return moved(u, -0x1A);
-  if (in(u, 0xFF41, 0xFF5A)) return moved(u, -0x20);
-  return u;
-}
+constexpr CaseTable kTables[] = {make_case_table(false), make_case_table(true)};
+const CaseTable* const case_tables = kTables;
 
 uint16_t unicode_half_to_full(uint16_t u) {
   if (in(u, 0x0021, 0x007E)) return moved(u, 0xFEE0);

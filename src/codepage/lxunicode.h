@@ -12,14 +12,25 @@ namespace lx {
 uint32_t unicode_type(uint16_t u);
 
 /// Simple case mappings, and full-width and half-width counterparts; a value without one maps to itself.
-uint16_t unicode_lower(uint16_t u);
-uint16_t unicode_upper(uint16_t u);
+inline uint16_t unicode_lower(uint16_t u);
+inline uint16_t unicode_upper(uint16_t u);
 uint16_t unicode_half_to_full(uint16_t u);
 uint16_t unicode_full_to_half(uint16_t u);
 
-/// Whether a value stands where none has another case: ideographs, kana, Hangul, private use.
-inline bool unicode_caseless(uint16_t u) {
-  return u >= 0x24EA && u < 0xFF21;
+/// What each value moves by in one direction, by pages of those that do.
+struct CaseTable {
+  uint8_t page[256];
+  uint16_t delta[13][256];
+
+  uint16_t other(uint16_t u) const { return static_cast<uint16_t>(u + delta[page[u >> 8]][u & 0xFF]); }
+};
+extern const CaseTable* const case_tables;  // to lower case, to upper case
+
+inline uint16_t unicode_lower(uint16_t u) {
+  return case_tables[0].other(u);
+}
+inline uint16_t unicode_upper(uint16_t u) {
+  return case_tables[1].other(u);
 }
 
 /// The ASCII digit of a decimal digit, superscript or subscript; 0 for any other value. It knows the digits

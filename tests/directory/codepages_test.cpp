@@ -207,6 +207,30 @@ void check_whole_text(const CodepageModel& model, LXLocale* l) {
   EXPECT_TRUE(to_unicode(l, from_unicode(l, units)) == units);
 }
 
+/// They are mapped in runs as each is alone.
+void check_mapped_text(const CodepageModel& model, LXLocale* l) {
+  if (!model.is_multibyte() || model.is_shift()) return;
+  for (const auto& [mode, mask] :
+       {std::pair{LX_MAP_UPPER_SIMPLE, LX_C1_LOWER}, {LX_MAP_LOWER_SIMPLE, LX_C1_UPPER}}) {
+    std::string text, expected;
+    for (uint32_t u = ' '; u < kNoValue; ++u) {
+      if (model.round_trip(static_cast<uint16_t>(u)) == kNoCode) continue;
+      const std::string bytes = encode(kPlain, l, {static_cast<LXUChar>(u)});
+      char out[8];
+      const int32_t count = bytes.size() == 1
+                                ? LXMapString(l, out, 8, bytes.data(), 1, mode)
+                                : LXCpMbCaseConv(l->codepage, bytes.data(), out, static_cast<uint32_t>(mask));
+      text += bytes;
+      expected.append(out, static_cast<size_t>(count));
+    }
+    std::string mapped(2 * text.size(), '\0');
+    const int32_t bytes = LXMapString(l, mapped.data(), static_cast<int32_t>(mapped.size()), text.data(),
+                                      static_cast<int32_t>(text.size()), mode);
+    mapped.resize(static_cast<size_t>(bytes));
+    EXPECT_TRUE(mapped == expected) << mode;
+  }
+}
+
 /// Long texts are moved in runs, short ones character by character: random bytes and units, well formed or not, must
 /// come out the same both ways.
 void check_runs(LXLocale* l, uint16_t id) {
@@ -257,6 +281,7 @@ TEST(EveryCodepage, HoldsWhatItsSourceSaysAndConverts) {
     const LocalePtr locale = locale_with(codepage.source.name);
     Comparison(codepage, compiled, locale.get()).run();
     check_whole_text(codepage.model, locale.get());
+    check_mapped_text(codepage.model, locale.get());
     check_runs(locale.get(), codepage.name.id);
   }
 }
