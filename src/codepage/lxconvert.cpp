@@ -109,9 +109,13 @@ Buffer<uint8_t> buffer_of(char* p, int32_t size, LXShiftState state = LX_SHIFT_S
 
 // Short texts without shift states are converted at once, where all that they may become fits.
 
-/// Whether a text that is so long, is no text up to a null, and asks for nothing else is short.
-bool is_short(int32_t length, int32_t flags) {
-  return flags == 0 && static_cast<uint32_t>(length) - 1 < kRunSlack;
+/// The units of a text that is short, and of which nothing else is asked for than a null behind it; else 0.
+template <class Unit>
+size_t short_units(const Text<Unit>& text, int32_t flags) {
+  if ((flags & ~LX_TERMINATE) != 0) return 0;
+  const size_t units =
+      text.length < 0 ? units_before_null(text.p, kRunSlack + 1) : static_cast<size_t>(text.length);
+  return units <= kRunSlack ? units : 0;
 }
 
 /// The values of a text: how many, or 0 when it holds what is read otherwise.
@@ -161,11 +165,16 @@ int32_t convert_text(LXLocale* target, Buffer<Out> to, LXLocale* source, Text<In
   if constexpr (sizeof(In) + sizeof(Out) <= sizeof(uint8_t) + sizeof(LXUChar)) {
     const Codepage& in_cp = codepage_of(*from->codepage);
     const Codepage& out_cp = codepage_of(call.codepage());
-    if (is_short(text.length, flags) && to.size > 0 &&
-        (form == Form::kPlain || (!in_cp.shift_sensitive && !out_cp.shift_sensitive)))
-      if (const size_t units = convert_short(out_cp, to.p, static_cast<size_t>(to.size), in_cp, text.p,
-                                             static_cast<size_t>(text.length)))
-        return call.exit(static_cast<int32_t>(units));
+    const bool shifts = form == Form::kEx && (in_cp.shift_sensitive || out_cp.shift_sensitive);
+    const size_t units = to.size > 0 && !shifts ? short_units(text, flags) : 0;
+    if (units != 0) {
+      const bool end = text.length < 0 || flags != 0;
+      const size_t size = static_cast<size_t>(to.size) - end;
+      if (const size_t written = convert_short(out_cp, to.p, size, in_cp, text.p, units)) {
+        if (end) to.p[written] = 0;
+        return call.exit(static_cast<int32_t>(written + end));
+      }
+    }
   }
   Request request(to.size, text.p, text.length, flags, kMine.flags);
   if (!request.valid) return call.fail(LX_E_INVALID, request.characters ? kMine.invalid_in_characters : -1);

@@ -205,15 +205,8 @@ inline UnicodeCursor like(const UnicodeCursor&, const LXUChar* p, size_t units, 
   return {p, p + units};
 }
 
-/// A place behind characters, and how many they are.
-struct Passed {
-  const uint8_t* p;
-  size_t chars;
-};
-
-/// Passes whole blocks of multibyte text, of at most `most` characters. Of values alone, so that the cursor
-/// stays in registers.
-Passed pass_blocks(const Codepage& cp, const uint8_t* p, const uint8_t* end, size_t most);
+/// Passes whole characters of multibyte text, at most `most`, as long as blocks of them can be passed.
+PassedRun pass_blocks(const Codepage& cp, const uint8_t* p, const uint8_t* end, size_t most);
 
 /// Passes the characters up to the next shift byte, at most `most`; of other text none.
 template <class Cursor>
@@ -235,15 +228,23 @@ size_t pass_chars(Cursor* in, size_t most) {
   if constexpr (Cursor::kOneUnit) {
     chars = least(most, room(in->p, in->end));
     in->p += chars;
-  } else {
-    if constexpr (!Cursor::kShifts) {
-      if (most >= CharBlock::kBytes && room(in->p, in->end) > CharBlock::kBytes) {
-        const Passed run = pass_blocks(in->cp, in->p, in->end, most);
-        in->p = run.p;
-        chars = run.chars;
-      }
-    }
+  } else if constexpr (Cursor::kShifts) {
     while (chars < most && in->pass()) chars += 1 + pass_in_state(in, most - chars - 1);
+  } else {
+    const Codepage& cp = in->cp;
+    const uint8_t *p = in->p, *const end = in->end;
+    // So many characters have at least the bytes of a block, also where no end is known.
+    if (most >= kPassedBytes && room(p, end) >= vectors->least_passed) {
+      const PassedRun run = pass_blocks(cp, p, end, most);
+      p = run.p;
+      chars = run.count;
+    }
+    for (; chars < most && p != end; ++chars) {
+      const size_t length = cp.length(*p);
+      if (length > room(p, end)) break;
+      p += length;
+    }
+    in->p = p;
   }
   return chars;
 }

@@ -134,19 +134,15 @@ size_t ShiftCursor::read_run(LXUChar* values, size_t most, RunRule rule) {
   return n;
 }
 
-Passed pass_blocks(const Codepage& cp, const uint8_t* p, const uint8_t* end, size_t most) {
-  const LeadRanges leads = cp.leads;
+PassedRun pass_blocks(const Codepage& cp, const uint8_t* p, const uint8_t* end, size_t most) {
   size_t chars = 0;
-  // So many characters have at least the bytes that are looked at, also where no end is known.
-  while (kVectors && leads.known && most - chars >= CharBlock::kBytes &&
-         room(p, end) >= CharBlock::kBytes + kMaxCharBytes) {
-    const CharBlock block(p, leads);
-    if (block.known()) {
-      chars += block.chars();
-      p += block.bytes();
-      continue;
-    }
-    for (size_t i = 0; i < CharBlock::kBytes / kMaxCharBytes; ++i, ++chars) p += cp.length(*p);
+  while (cp.leads.known && most - chars >= kPassedBytes && room(p, end) >= vectors->least_passed) {
+    const PassedRun run = vectors->pass(cp.leads, p, end, most - chars);
+    p = run.p;
+    chars += run.count;
+    if (run.count != 0) continue;
+    for (size_t i = 0; i < kPassedBytes / kMaxCharBytes && room(p, end) >= kMaxCharBytes; ++i, ++chars)
+      p += cp.length(*p);
   }
   return {p, chars};
 }

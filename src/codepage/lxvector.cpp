@@ -17,6 +17,17 @@ inline bool read_short(const uint8_t** p, size_t left, uint16_t* value) {
 
 namespace base {
 
+PassedRun pass(const LeadRanges& leads, const uint8_t* p, const uint8_t* end, size_t most) {
+  size_t chars = 0;
+  while (kVectors && most - chars >= CharBlock::kBytes && room(p, end) >= kBaseLeastPassed) {
+    const CharBlock block(p, leads);
+    if (!block.known()) break;
+    chars += block.chars();
+    p += block.bytes();
+  }
+  return {p, chars};
+}
+
 /// Characters of three bytes are read in a loop of their own, others by blocks.
 ReadRun read_utf8(const uint8_t* q, const uint8_t* end, uint16_t* values, size_t most, RunRule rule) {
   size_t n = 0;
@@ -166,9 +177,10 @@ uint8_t* write_bytes(const PairCodes& codes, uint8_t* p, const uint16_t* values,
 
 namespace {
 
-constexpr Vectors kBaseVectors = {kVectors ? "SSE2" : "none", kBasePivotBytes,   base::read_utf8,
-                                  base::read_pairs,           base::copy_same,   base::look_up,
-                                  base::write_utf8,           base::write_pairs, base::write_bytes};
+constexpr Vectors kBaseVectors = {
+    kVectors ? "SSE2" : "none", kBasePivotBytes, kBaseLeastPassed, base::pass,       base::read_utf8,
+    base::read_pairs,           base::copy_same, base::look_up,    base::write_utf8, base::write_pairs,
+    base::write_bytes};
 
 }  // namespace
 

@@ -38,6 +38,10 @@ struct ReadRun {
   size_t count;
 };
 
+/// What a run has passed, in the same way.
+using PassedRun = ReadRun;
+inline constexpr size_t kPassedBytes = 64;  // at most at a time
+
 /// Where the codes of values of at most two bytes stand: of the value u at page_start[u >> 8] + (u & 0xFF).
 struct PairCodes {
   const uint32_t* page_start;
@@ -51,6 +55,12 @@ struct Vectors {
 
   /// From so many bytes on a text goes from one codepage to another by way of a run of values.
   size_t pivot_bytes;
+
+  /// From so many bytes on characters are passed by blocks.
+  size_t least_passed;
+  /// Passes whole characters by their first bytes, at most `most`, which is kPassedBytes or more. It stops where
+  /// first bytes follow each other in a way that does not tell, and sooner.
+  PassedRun (*pass)(const LeadRanges& leads, const uint8_t* p, const uint8_t* end, size_t most);
 
   /// Reads characters of UTF-8, well-formed and of at most three bytes: as many as `most`, or fewer. None where there
   /// is another character, one that the end cuts, or where a character at a time is as good.

@@ -114,6 +114,58 @@ LX_TARGET inline uint64_t bytes_in(LeadRanges::Range range, __m512i block) {
   return _mm512_cmple_epu8_mask(above, _mm512_set1_epi8(static_cast<char>(range.others)));
 }
 
+/// Where characters of one and two bytes begin. A byte that can begin a character continues one behind a byte that
+/// does: in a series every other one.
+LX_TARGET inline uint64_t pair_starts(uint64_t two) {
+  constexpr uint64_t kOdd = UINT64_MAX / 3 * 2;
+  const uint64_t ends = ((two << 1 | kOdd) - two) ^ kOdd;
+  return ~(ends ^ two);
+}
+
+constexpr size_t kLeastPassed = 16;
+
+/// First bytes of a block, and which of them begin characters where `trails` of it belong to one before.
+struct Firsts {
+  uint64_t two, three, starts;
+  bool known;
+
+  LX_TARGET Firsts(const LeadRanges& leads, __m512i block, uint64_t inside, uint64_t trails) {
+    inside &= ~trails;
+    two = (bytes_in(leads.two[0], block) | bytes_in(leads.two[1], block)) & inside;
+    three = leads.has_three ? bytes_in(leads.three, block) & inside : 0;
+    trails |= (two | three) << 1 | three << 2;
+    known = three == 0 || ((two | three) & trails) == 0;
+    starts = inside & (three == 0 ? pair_starts(two) : ~trails);
+  }
+};
+
+LX_TARGET PassedRun pass(const LeadRanges& leads, const uint8_t* p, const uint8_t* end, size_t most) {
+  size_t chars = 0;
+  uint64_t trails = 0, last_starts = 0;
+  // Block by block: none waits for where a character ends in the one before, but for the bytes that it leaves.
+  while (most - chars >= kBytes && room(p, end) >= kBytes) {
+    const Firsts firsts(leads, _mm512_loadu_si512(p), ones(kBytes), trails);
+    if (!firsts.known) break;
+    last_starts = firsts.starts;
+    chars += static_cast<size_t>(__builtin_popcountll(last_starts));
+    const uint64_t two = firsts.two & last_starts;
+    trails = (two | firsts.three) >> 63 | firsts.three >> 62;
+    p += kBytes;
+  }
+  if (trails != 0) {  // the last one goes on behind the blocks
+    p -= 1 + __builtin_clzll(last_starts);
+    --chars;
+  }
+  const size_t bytes = room(p, end);
+  if (bytes == 0 || bytes >= kBytes || most - chars < kBytes) return {p, chars};
+  const uint64_t inside = ones(bytes), last = uint64_t{1} << (bytes - 1);
+  const Firsts firsts(leads, _mm512_maskz_loadu_epi8(inside, p), inside, 0);
+  if (!firsts.known) return {p, chars};
+  const uint64_t cut = firsts.starts & ((firsts.two & last) | (firsts.three & (last | last >> 1)));
+  const size_t used = cut == 0 ? bytes : static_cast<size_t>(__builtin_ctzll(cut));
+  return {p + used, chars + static_cast<size_t>(__builtin_popcountll(firsts.starts & ones(used)))};
+}
+
 LX_TARGET ReadRun read_pairs(const PairRows& pairs, const uint8_t* q, const uint8_t* end, uint16_t* values,
                              size_t most, RunRule rule) {
   const PairRows rows = pairs;  // in registers
@@ -132,11 +184,8 @@ LX_TARGET ReadRun read_pairs(const PairRows& pairs, const uint8_t* q, const uint
       continue;
     }
     if (leads.has_three && (bytes_in(leads.three, block) & inside) != 0) break;
-    // A byte that can begin a character continues one behind a byte that does: in a series every other one.
     const uint64_t two = (bytes_in(leads.two[0], block) | bytes_in(leads.two[1], block)) & inside;
-    constexpr uint64_t kOdd = UINT64_MAX / 3 * 2;
-    const uint64_t ends = ((two << 1 | kOdd) - two) ^ kOdd;
-    uint64_t starts = inside & ~(ends ^ two);
+    uint64_t starts = inside & pair_starts(two);
     // One that the block cuts waits for the next block.
     const uint64_t last = uint64_t{1} << (bytes - 1);
     const bool cut = (starts & two & last) != 0;
@@ -305,8 +354,8 @@ LX_TARGET uint8_t* write_bytes(const PairCodes& at, uint8_t* p, const uint16_t* 
 
 }  // namespace
 
-const Vectors kAvx512Vectors = {"AVX-512", 1,          read_utf8,   read_pairs, copy_same,
-                                look_up,   write_utf8, write_pairs, write_bytes};
+const Vectors kAvx512Vectors = {"AVX-512", 1,       kLeastPassed, pass,        read_utf8,  read_pairs,
+                                copy_same, look_up, write_utf8,   write_pairs, write_bytes};
 
 bool has_avx512() {
   return __builtin_cpu_supports("avx512vbmi2") && __builtin_cpu_supports("avx512vbmi") &&

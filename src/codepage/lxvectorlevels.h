@@ -10,6 +10,7 @@ namespace lx {
 
 namespace base {
 
+PassedRun pass(const LeadRanges& leads, const uint8_t* p, const uint8_t* end, size_t most);
 ReadRun read_utf8(const uint8_t* q, const uint8_t* end, uint16_t* values, size_t most, RunRule rule);
 ReadRun read_pairs(const PairRows& pairs, const uint8_t* q, const uint8_t* end, uint16_t* values, size_t most,
                    RunRule rule);
@@ -22,6 +23,7 @@ uint8_t* write_bytes(const PairCodes& codes, uint8_t* p, const uint16_t* values,
 }  // namespace base
 
 inline constexpr size_t kBasePivotBytes = 48;
+inline constexpr size_t kBaseLeastPassed = CharBlock::kBytes + kMaxCharBytes;
 
 #if defined(__SSE2__)
 

@@ -109,6 +109,26 @@ class AllVectors : public CaseTest {
     }
   }
 
+  /// The same of the characters that are counted.
+  void expect_count_as_single(const TinyCodepage& cp, const std::string& text) {
+    static Ending<char> memory(kMostBytes);
+    char* const input = memory.last(text.size());
+    std::copy(text.begin(), text.end(), input);
+    LXLocale* const l = library.locale(cp);
+    const Codepage& tables = codepage_of(*l->codepage);
+    int32_t chars = 0;
+    for (size_t at = 0; at < text.size(); ++chars) {
+      at += tables.length(bytes_of(input)[at]);
+      if (at > text.size()) break;
+    }
+    const Vectors* choices[kMostVectors];
+    for (size_t n = vectors_here(choices); n-- > 0;) {
+      vectors = choices[n];
+      ASSERT_EQ(LXNumChars(l, input, static_cast<int32_t>(text.size())), chars)
+          << vectors->name << ", " << cp.file.name << ", " << text.size() << " bytes";
+    }
+  }
+
   template <class Unit, class In>
   std::vector<Unit> single(const TinyCodepage& from, const TinyCodepage& to, const In* text, size_t units,
                            size_t size) {
@@ -138,6 +158,7 @@ TEST_F(AllVectors, WriteWhatSingleCharactersGive) {
     LXLocale *const source = library.locale(from), *const target = library.locale(to);
     const std::string text = text_of(from);
     const std::vector<uint8_t> bytes(text.begin(), text.end());
+    expect_count_as_single(from, text);
     std::vector<LXUChar> values;
     for (size_t n = text.size(); n > 0; --n) values.push_back(below(3) == 0 ? 'x' : unit_of(to));
     expect_as_single<LXUChar>(from, from, bytes, [&](LXUChar* out, int32_t size, const uint8_t* in, int32_t n) {
