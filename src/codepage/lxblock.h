@@ -275,12 +275,16 @@ class CharBlock {
 
 #endif
 
-/// Copies the blocks of units below `below` at the start of `n` units: how many units there were.
+/// Copies the blocks of units below `below` at the start of `n` units: how many units there were. What is left of less
+/// than a block is copied with units before it.
 template <class To, class From>
 inline size_t copy_same_blocks(To* to, const From* from, size_t n, unsigned below) {
   size_t i = 0;
   for (; n - i >= kBlock && is_same_block(from + i, below); i += kBlock) copy_block(to + i, from + i);
-  return i;
+  const size_t last = n - kBlock;
+  if (i == 0 || n - i >= kBlock || !is_same_block(from + last, below)) return i;
+  copy_block(to + last, from + last);
+  return n;
 }
 
 /// The same with the single units behind them. Writes nothing behind the last one.

@@ -27,8 +27,22 @@ auto at_char(const Primitive& in, const char* text, LXShiftState state, Body bod
   return body(ShiftCursor{in.cp(), p, no_end<const uint8_t>(), state});
 }
 
-constexpr auto kCode = [](const auto& at) { return LXWChar{pack(at.p, at.length())}; };
-constexpr auto kBytes = [](const auto& at) { return static_cast<int32_t>(at.length()); };
+/// By branches where they tell: a branch is predicted, what a look-up gives is waited for.
+template <class Cursor>
+size_t length_at(const Cursor& at) {
+  if constexpr (!Cursor::kShifts) {
+    const unsigned first = *at.p;
+    if (first < at.cp.same_below) return 1;
+    if (at.cp.plain_utf8 && first - 0xC2u < 0xF0 - 0xC2) return first < 0xE0 ? 2 : 3;
+  }
+  return at.length();
+}
+
+constexpr auto kCode = [](const auto& at) {
+  const size_t length = length_at(at);
+  return LXWChar{length == 1 ? *at.p : length == 2 ? pack(at.p, 2) : pack(at.p, length)};
+};
+constexpr auto kBytes = [](const auto& at) { return static_cast<int32_t>(length_at(at)); };
 
 /// Lead bytes can only be told from the front.
 char* previous_char(const Primitive& in, const char* start, const char* current) {

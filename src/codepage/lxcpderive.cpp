@@ -175,8 +175,8 @@ PairRows pair_rows(const Codepage& cp, size_t nodes, uint16_t* rows, uint32_t* f
 
 bool has_plain_utf8(const Codepage& cp) {
   if (!cp.utf8 || cp.same_below < kAscii) return false;
-  for (unsigned b = 0xC2; b < 0xF0; ++b)
-    if (cp.length(static_cast<uint8_t>(b)) != (b < 0xE0 ? 2 : 3)) return false;
+  for (unsigned b = kAscii; b < kRow; ++b)
+    if (cp.length(static_cast<uint8_t>(b)) != (b < 0xC2 || b >= 0xF0 ? 1 : b < 0xE0 ? 2 : 3)) return false;
   return true;
 }
 

@@ -173,7 +173,7 @@ template <class Cursor>
 //            <--- the same --> ^ in both an element begins here
 //
 // Up to there the texts have the same elements, and so the same weights on every level. Mostly the elements
-// that follow have primaries that differ; where a sort appends all primaries, that decides.
+// that follow have primaries that differ, or soon others have; where a sort appends all primaries, that decides.
 
 /// Takes the character at `*p` of a plain text; false at the end, and where the end cuts it. On places alone,
 /// not by a reader: which kind of bytes they are is not asked before the shortcut has failed.
@@ -201,16 +201,17 @@ inline bool take_char(const Codepage&, const LXUChar** p, const LXUChar* end, LX
   return true;
 }
 
-/// The primary of the character at `p` where it is an element by itself with one weight set; else 0.
+/// The primary of the character at `*p` where it is an element by itself with one weight set; else 0.
 template <class Unit>
-[[gnu::always_inline]] inline uint32_t primary_at(const Codepage& cp, const Sort& sort, const Unit* p,
-                                                  const Unit* end) {
+[[gnu::always_inline]] inline uint32_t take_primary(const Codepage& cp, const Sort& sort, const Unit** p,
+                                                    const Unit* end) {
   LXUChar u = 0;
-  if (!take_char(cp, &p, end, &u)) return 0;
+  if (!take_char(cp, p, end, &u)) return 0;
   const Element element = sort.element(u);
   if (element.stands_alone()) return element.primary();
   if (sort.may_end_pair(u)) return 0;
-  if (element.starts_pair() && take_char(cp, &p, end, &u) && sort.may_end_pair(u)) return 0;
+  const Unit* next = *p;
+  if (element.starts_pair() && take_char(cp, &next, end, &u) && sort.may_end_pair(u)) return 0;
   return element.sets() == 1 ? element.primary() : 0;
 }
 
@@ -242,9 +243,17 @@ template <class Unit>
   const size_t same = whole_units(cp, text1, equal_units(text1, units1, text2, units2));
   const Unit* const end1 = text1 + units1;
   const Unit* const end2 = text2 + units2;
-  const uint32_t x = primary_at(cp, sort, text1 + same, end1);
-  const uint32_t y = primary_at(cp, sort, text2 + same, end2);
-  if (x != 0 && y != 0 && x != y) return {difference(x, y), 0};
+  // Primaries, as long as characters are elements by themselves; one that stands against the end decides too.
+  const Unit *p = text1 + same, *q = text2 + same;
+  for (;;) {
+    const bool end_p = p == end1, end_q = q == end2;
+    const uint32_t x = take_primary(cp, sort, &p, end1);
+    const uint32_t y = take_primary(cp, sort, &q, end2);
+    if (x == y && x != 0) continue;
+    if (x != 0 && y != 0) return {difference(x, y), 0};
+    if ((end_p && y != 0) || (end_q && x != 0)) return {end_p ? -1 : 1, 0};
+    break;
+  }
   return {0, equal_elements(cp, sort, text1, end1, text2, end2, same)};
 }
 
