@@ -248,7 +248,9 @@ size_t find_case(Codepage* cp) {
     }
   }
   // All bits below the highest one count, so that a row has as many numbers as the mask has values.
-  while ((cp->pair_case.mask & (cp->pair_case.mask + 1)) != 0) cp->pair_case.mask |= cp->pair_case.mask >> 1;
+  unsigned mask = cp->pair_case.mask;
+  while ((mask & (mask + 1)) != 0) mask |= mask >> 1;
+  cp->pair_case.mask = static_cast<uint8_t>(mask);
   return rows * (cp->pair_case.mask + 1u);
 }
 

@@ -5,9 +5,10 @@
 
 namespace lx {
 
-inline constexpr size_t kRunChars = 128;      // moved at a time through a buffer on the stack
-inline constexpr size_t kRunUnits = 8;        // of shorter Unicode the characters are moved one by one
-inline constexpr size_t kShiftRunUnits = 16;  // the same where shift states are kept
+inline constexpr size_t kRunChars = 128;          // moved at a time through a buffer on the stack
+inline constexpr size_t kRunUnits = 8;            // of shorter Unicode the characters are moved one by one
+inline constexpr size_t kTranslatedBytes = 1024;  // from so many on a table from bytes to bytes pays
+inline constexpr size_t kShiftRunUnits = 16;      // the same where shift states are kept
 
 /// Why a transfer of characters stopped.
 enum class Stop { kInputEnd, kInputCut, kOutputFull, kCount };
@@ -33,6 +34,17 @@ template <class Cursor, class Sink>
   Sink out = *out_at;
   const unsigned below = same_below(in, out);
   size_t left = count;
+  if constexpr (std::is_same_v<Cursor, SingleByteCursor> && std::is_same_v<Sink, SingleByteSink>) {
+    const size_t n = least(left, room(in.p, in.end), room(out.p, out.end));
+    if (n >= kTranslatedBytes && below <= kAscii) {
+      uint8_t table[256];
+      for (size_t b = 0; b < sizeof(table); ++b) table[b] = out.encode(in.cp.unicode[b]);
+      vectors->translate(table, in.p, n, out.p);
+      in.p += n;
+      out.p += n;
+      left -= n;
+    }
+  }
   for (size_t n = 1; n != 0 && in.p != in.end; left -= n) {
     if constexpr (Sink::kUnicode) {
       n = in.read_run(out.p, least(left, room(out.p, out.end)), RunRule{});

@@ -101,6 +101,10 @@ ReadRun read_pairs(const PairRows& pairs, const uint8_t* q, const uint8_t* end, 
   return {q, n};
 }
 
+void translate(const uint8_t table[256], const uint8_t* p, size_t count, uint8_t* to) {
+  for (size_t i = 0; i < count; ++i) to[i] = table[p[i]];
+}
+
 uint8_t* write_utf8(uint8_t* p, const uint16_t* values, size_t count) {
   size_t i = 0;
   while (i < count) {
@@ -178,9 +182,9 @@ uint8_t* write_bytes(const PairCodes& codes, uint8_t* p, const uint16_t* values,
 namespace {
 
 constexpr Vectors kBaseVectors = {
-    kVectors ? "SSE2" : "none", kBasePivotBytes, kBaseLeastPassed, base::pass,       base::read_utf8,
-    base::read_pairs,           base::copy_same, base::look_up,    base::write_utf8, base::write_pairs,
-    base::write_bytes};
+    kVectors ? "SSE2" : "none", kBasePivotBytes,  kBaseLeastPassed, base::pass,      base::read_utf8,
+    base::read_pairs,           base::copy_same,  base::look_up,    base::translate, base::write_utf8,
+    base::write_pairs,          base::write_bytes};
 
 }  // namespace
 

@@ -76,6 +76,9 @@ struct Vectors {
   /// Looks up `count` bytes in a table.
   void (*look_up)(const uint16_t table[256], const uint8_t* p, size_t count, uint16_t* values, RunRule rule);
 
+  /// Looks up `count` bytes in a table of bytes.
+  void (*translate)(const uint8_t table[256], const uint8_t* p, size_t count, uint8_t* to);
+
   // Write characters where all of them fit: where they end. As UTF-8, ...
   uint8_t* (*write_utf8)(uint8_t* p, const uint16_t* values, size_t count);
   // ... as codes of one byte and two, ...

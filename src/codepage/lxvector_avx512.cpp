@@ -326,6 +326,19 @@ LX_TARGET uint8_t* write_pairs(const PairCodes& at, uint8_t* p, const uint16_t* 
   return p;
 }
 
+LX_TARGET void translate(const uint8_t table[256], const uint8_t* p, size_t count, uint8_t* to) {
+  const __m512i part[] = {_mm512_loadu_si512(table), _mm512_loadu_si512(table + kBytes),
+                          _mm512_loadu_si512(table + 2 * kBytes), _mm512_loadu_si512(table + 3 * kBytes)};
+  for (size_t i = 0; i < count; i += kBytes) {
+    const uint64_t inside = ones(least(count - i, kBytes));
+    const __m512i index = _mm512_maskz_loadu_epi8(inside, p + i);
+    const __m512i found =
+        _mm512_mask_mov_epi8(_mm512_permutex2var_epi8(part[0], index, part[1]), _mm512_movepi8_mask(index),
+                             _mm512_permutex2var_epi8(part[2], index, part[3]));
+    _mm512_mask_storeu_epi8(to + i, inside, found);
+  }
+}
+
 /// The first of the units that `which` has.
 LX_TARGET inline unsigned first_of(__m512i units, __mmask32 which) {
   return static_cast<uint16_t>(
@@ -354,8 +367,8 @@ LX_TARGET uint8_t* write_bytes(const PairCodes& at, uint8_t* p, const uint16_t* 
 
 }  // namespace
 
-const Vectors kAvx512Vectors = {"AVX-512", 1,       kLeastPassed, pass,        read_utf8,  read_pairs,
-                                copy_same, look_up, write_utf8,   write_pairs, write_bytes};
+const Vectors kAvx512Vectors = {"AVX-512", 1,       kLeastPassed, pass,       read_utf8,   read_pairs,
+                                copy_same, look_up, translate,    write_utf8, write_pairs, write_bytes};
 
 bool has_avx512() {
   return __builtin_cpu_supports("avx512vbmi2") && __builtin_cpu_supports("avx512vbmi") &&

@@ -16,6 +16,7 @@ ReadRun read_pairs(const PairRows& pairs, const uint8_t* q, const uint8_t* end, 
                    RunRule rule);
 bool copy_same(uint8_t* to, const uint8_t* from, size_t count, unsigned below);
 void look_up(const uint16_t table[256], const uint8_t* p, size_t count, uint16_t* values, RunRule);
+void translate(const uint8_t table[256], const uint8_t* p, size_t count, uint8_t* to);
 uint8_t* write_utf8(uint8_t* p, const uint16_t* values, size_t count);
 uint8_t* write_pairs(const PairCodes& codes, uint8_t* p, const uint16_t* values, size_t count);
 uint8_t* write_bytes(const PairCodes& codes, uint8_t* p, const uint16_t* values, size_t count);

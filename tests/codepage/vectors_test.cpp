@@ -35,7 +35,7 @@ class Ending {
 
 class AllVectors : public CaseTest {
  protected:
-  static constexpr size_t kMostUnits = 400, kMostBytes = 4 * kMostUnits;
+  static constexpr size_t kMostUnits = 1500, kMostBytes = 4 * kMostUnits;
   static constexpr char kUntouched = 0x55;
 
   ~AllVectors() override { vectors = used_; }
@@ -46,7 +46,7 @@ class AllVectors : public CaseTest {
   /// ASCII, characters of the codepage and stray bytes in pieces.
   std::string text_of(const TinyCodepage& cp) {
     std::string text;
-    const size_t size = below(4) == 0 ? below(kMostUnits) : below(100);
+    const size_t size = below(12) == 0 ? below(kMostUnits) : below(100);
     while (text.size() < size) {
       const size_t count = 1 + below(below(3) == 0 ? 70 : 5);
       std::vector<uint16_t> piece;
@@ -71,7 +71,7 @@ class AllVectors : public CaseTest {
   /// What a call writes that has room for `size` units; behind them, and behind the result, it writes nothing.
   template <class Unit, class Call>
   std::vector<Unit> written(size_t size, const Call& call) {
-    static Ending<Unit> memory(kMostBytes);
+    static Ending<Unit> memory(4 * kMostBytes);
     Unit* const out = memory.last(size);
     std::fill_n(reinterpret_cast<char*>(out), size * sizeof(Unit), kUntouched);
     const int32_t units = call(out, static_cast<int32_t>(size));

@@ -231,6 +231,19 @@ void check_mapped_text(const CodepageModel& model, LXLocale* l) {
   }
 }
 
+/// Between codepages a long text becomes what it becomes by way of Unicode.
+void check_pivot(LXLocale* from, LXLocale* to, uint16_t id) {
+  std::mt19937 random(id);
+  std::string text(2000, ' ');
+  for (char& byte : text) byte = static_cast<char>(random() % 0x100);
+  const std::string expected = encode(kPlain, to, decode(kPlain, from, text));
+  std::string converted(4 * text.size(), '\0');
+  converted.resize(
+      static_cast<size_t>(LXConvertString(to, converted.data(), static_cast<int32_t>(converted.size()), from,
+                                          text.data(), static_cast<int32_t>(text.size()), 0)));
+  EXPECT_TRUE(converted == expected);
+}
+
 /// Long texts are moved in runs, short ones character by character: random bytes and units, well formed or not, must
 /// come out the same both ways.
 void check_runs(LXLocale* l, uint16_t id) {
@@ -266,6 +279,7 @@ void check_runs(LXLocale* l, uint16_t id) {
 // characters too.
 TEST(EveryCodepage, HoldsWhatItsSourceSaysAndConverts) {
   const Library library(LEXICOR_LOCALE_DIR);
+  LocalePtr before = locale_with("Latin1");
   for (const ShippedCodepage& codepage : shipped_codepages()) {
     SCOPED_TRACE(codepage.name.name);
     const std::string path = source_path(LEXICOR_DATA_DIR, codepage.name);
@@ -278,11 +292,13 @@ TEST(EveryCodepage, HoldsWhatItsSourceSaysAndConverts) {
                 compile_object(dump, "dump", codepage.name, {}).bytes == compiled.bytes);
     check_formatting_characters(codepage.model);
 
-    const LocalePtr locale = locale_with(codepage.source.name);
+    LocalePtr locale = locale_with(codepage.source.name);
+    check_pivot(locale.get(), before.get(), codepage.name.id);
     Comparison(codepage, compiled, locale.get()).run();
     check_whole_text(codepage.model, locale.get());
     check_mapped_text(codepage.model, locale.get());
     check_runs(locale.get(), codepage.name.id);
+    before = std::move(locale);
   }
 }
 
