@@ -1,0 +1,11 @@
+// The families of rows.
+#pragma once
+
+#include "table.h"
+#include "texts.h"
+
+namespace bench {
+
+void add_conversion_rows(Table* table, Texts* texts);
+
+}  // namespace bench

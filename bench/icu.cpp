@@ -1,0 +1,87 @@
+#include "icu.h"
+
+#include <unicode/ucnv.h>
+#include <unicode/ucnv_err.h>
+#include <unicode/ustring.h>
+
+namespace bench::icu {
+namespace {
+
+constexpr int32_t kPivotUnits = 1024;  // the size that ICU itself takes in ucnv_convert
+constexpr size_t kCharRoom = 16;
+
+using Converter = std::shared_ptr<UConverter>;
+
+Converter open(const Encoding& encoding) {
+  UErrorCode error = U_ZERO_ERROR;
+  Converter converter(ucnv_open(encoding.icu, &error), ucnv_close);
+  ucnv_setToUCallBack(converter.get(), UCNV_TO_U_CALLBACK_STOP, nullptr, nullptr, nullptr, &error);
+  ucnv_setFromUCallBack(converter.get(), UCNV_FROM_U_CALLBACK_STOP, nullptr, nullptr, nullptr, &error);
+  return U_SUCCESS(error) ? converter : nullptr;
+}
+
+char16_t* units(char* bytes) {
+  return reinterpret_cast<char16_t*>(bytes);
+}
+const char16_t* units(const char* bytes) {
+  return reinterpret_cast<const char16_t*>(bytes);
+}
+
+}  // namespace
+
+bool reads_and_writes(const Encoding& encoding, const std::string& bytes, char16_t c) {
+  static std::pair<const Encoding*, Converter> last;
+  if (last.first != &encoding) last = {&encoding, open(encoding)};
+  UErrorCode error = U_ZERO_ERROR;
+  char written[kCharRoom];
+  char16_t read[kCharRoom];
+  const int32_t n = ucnv_fromUChars(last.second.get(), written, sizeof(written), &c, 1, &error);
+  const int32_t m =
+      ucnv_toUChars(last.second.get(), read, kCharRoom, bytes.data(), length(bytes.size()), &error);
+  return U_SUCCESS(error) && bytes == std::string(written, count(n)) && m == 1 && read[0] == c;
+}
+
+Work convert(const Input& input, const Encoding& from, const Encoding& to) {
+  const Converter source = open(from), target = open(to);
+  if (source == nullptr || target == nullptr) return nullptr;
+  if (is_utf16(to))
+    return for_each_piece(input, [source](const char* in, size_t bytes, char* out) {
+      UErrorCode error = U_ZERO_ERROR;
+      return 2 * count(ucnv_toUChars(source.get(), units(out), length(bytes) + 1, in, length(bytes), &error));
+    });
+  if (is_utf16(from))
+    return for_each_piece(input, [target](const char* in, size_t bytes, char* out) {
+      UErrorCode error = U_ZERO_ERROR;
+      return count(
+          ucnv_fromUChars(target.get(), out, length(2 * bytes) + 1, units(in), length(bytes / 2), &error));
+    });
+  return for_each_piece(input, [source, target](const char* in, size_t bytes, char* out) {
+    char16_t pivot[kPivotUnits];
+    char16_t *pivot_source = pivot, *pivot_target = pivot;
+    char* end = out;
+    UErrorCode error = U_ZERO_ERROR;
+    ucnv_convertEx(target.get(), source.get(), &end, out + 6 * bytes + 8, &in, in + bytes, pivot, &pivot_source,
+                   &pivot_target, pivot + kPivotUnits, true, true, &error);
+    return static_cast<size_t>(end - out);
+  });
+}
+
+Work convert_utf(const Input& input, const Encoding& from, const Encoding& to) {
+  if (is_utf8(from) && is_utf16(to))
+    return for_each_piece(input, [](const char* in, size_t bytes, char* out) {
+      UErrorCode error = U_ZERO_ERROR;
+      int32_t written = 0;
+      u_strFromUTF8(units(out), length(bytes), &written, in, length(bytes), &error);
+      return 2 * count(written);
+    });
+  if (is_utf16(from) && is_utf8(to))
+    return for_each_piece(input, [](const char* in, size_t bytes, char* out) {
+      UErrorCode error = U_ZERO_ERROR;
+      int32_t written = 0;
+      u_strToUTF8(out, length(2 * bytes), &written, units(in), length(bytes / 2), &error);
+      return count(written);
+    });
+  return nullptr;
+}
+
+}  // namespace bench::icu

@@ -1,0 +1,144 @@
+// Peers take turns, in which each does its work for some milliseconds, and the shortest turn of each counts: on a
+// shared machine the minimum is what can be compared.
+#include "table.h"
+
+#include <time.h>
+
+#include <algorithm>
+#include <cmath>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+
+namespace bench {
+namespace {
+
+double processor_ns() {
+  timespec now{};
+  clock_gettime(CLOCK_PROCESS_CPUTIME_ID, &now);
+  return static_cast<double>(now.tv_sec) * 1e9 + static_cast<double>(now.tv_nsec);
+}
+
+[[noreturn]] void stop(const Row& row, const Peer& peer, const char* what) {
+  std::fprintf(stderr, "%s: %s %s\n", row.name.c_str(), peer.name, what);
+  std::exit(1);
+}
+
+/// Every peer does the work once, and gives what the first one gives.
+void check(const Row& row) {
+  std::vector<char> expected(row.room), output(row.room);
+  const size_t size = row.peers.front().work(expected.data());
+  if (size == 0) stop(row, row.peers.front(), "gives nothing");
+  for (const Peer& peer : row.peers) {
+    if (!peer.work) continue;
+    const size_t given = peer.work(output.data());
+    if (row.same == Same::kNothing) continue;
+    const bool same = given == size && (row.same == Same::kNumber ||
+                                        std::equal(expected.data(), expected.data() + size, output.data()));
+    if (!same) stop(row, peer, "gives something else");
+  }
+}
+
+volatile size_t sink;  // keeps the results alive
+
+/// The time of a pass, in one turn of `passes`.
+double take_turn(const Work& work, char* output, size_t passes) {
+  const double start = processor_ns();
+  for (size_t i = 0; i < passes; ++i) sink = work(output);
+  return (processor_ns() - start) / static_cast<double>(passes);
+}
+
+std::vector<Measured> measure(const Row& row, const TableOptions& options) {
+  std::vector<char> output(row.room);
+  std::vector<Measured> measured;
+  std::vector<size_t> passes;
+  std::vector<const Work*> works;
+  for (const Peer& peer : row.peers) {
+    if (!peer.work) continue;
+    const double ns = take_turn(peer.work, output.data(), 1);
+    measured.push_back({peer.name, ns, peer.is_rival});
+    passes.push_back(1 + static_cast<size_t>(options.turn_milliseconds * 1e6 / ns));
+    works.push_back(&peer.work);
+  }
+  for (int turn = 0; turn < options.turns; ++turn)
+    for (size_t i = 0; i < works.size(); ++i)
+      measured[i].ns = std::min(measured[i].ns, take_turn(*works[i], output.data(), passes[i]));
+  return measured;
+}
+
+/// A figure with three digits that count.
+std::string figure(double value) {
+  char text[32];
+  const int digits = value == 0 ? 0 : std::clamp(2 - static_cast<int>(std::floor(std::log10(value))), 0, 3);
+  std::snprintf(text, sizeof(text), "%.*f", digits, value);
+  return text;
+}
+
+bool contains(const std::string& text, const std::string& part) {
+  return text.find(part) != std::string::npos;
+}
+
+}  // namespace
+
+bool Table::wants(const std::string& name) const {
+  const auto in_name = [&](const std::string& part) { return contains(name, part); };
+  return options_.rows.empty() || std::any_of(options_.rows.begin(), options_.rows.end(), in_name);
+}
+
+bool Table::wants_some(const std::string& beginning) const {
+  const auto may_be = [&](const std::string& part) {
+    return contains(beginning, part) || part.compare(0, beginning.size(), beginning) == 0 ||
+           !contains(part, "/") || part[0] == '/';
+  };
+  return options_.rows.empty() || std::any_of(options_.rows.begin(), options_.rows.end(), may_be);
+}
+
+void Table::add(const Row& row) {
+  if (!wants(row.name)) return;
+  check(row);
+  print(row.name, measure(row, options_), row.chars, row.calls);
+}
+
+void Table::print_head() {
+  if (options_.markdown)
+    std::printf(
+        "| Row | ns a character | ns a call | fastest peer takes | goal | others | "
+        "|\n|---|---|---|---|---|---|---|\n");
+  else
+    std::printf("%-44s %9s %9s  %-20s %5s\n", "row", "ns/char", "ns/call", "fastest peer takes", "goal");
+  has_head_ = true;
+}
+
+void Table::print(const std::string& name, const std::vector<Measured>& peers, size_t chars, size_t calls) {
+  if (!has_head_) print_head();
+  const double ours = peers.front().ns;
+  const Measured* fastest = nullptr;
+  for (size_t i = 1; i < peers.size(); ++i)
+    if (peers[i].is_rival && (fastest == nullptr || peers[i].ns < fastest->ns)) fastest = &peers[i];
+  std::string others;
+  for (size_t i = 1; i < peers.size(); ++i)
+    if (&peers[i] != fastest)
+      others += (others.empty() ? "" : ", ") + figure(peers[i].ns / ours) + " " + peers[i].peer;
+  const double times = fastest == nullptr ? 0 : fastest->ns / ours, goal = goal_of(name);
+  const bool is_behind = fastest != nullptr && times < 1, is_missed = fastest != nullptr && times < goal;
+  ++rows_, behind_ += is_behind, missed_ += is_missed;
+  const std::string per_char = figure(ours / static_cast<double>(chars)),
+                    per_call = figure(ours / static_cast<double>(calls));
+  const std::string peer = fastest == nullptr ? "" : figure(times) + " " + fastest->peer;
+  const std::string wanted = goal == 0 ? "" : figure(goal);
+  const char* const mark = is_behind ? "behind" : is_missed ? "below goal" : "";
+  if (options_.markdown)
+    std::printf("| %s | %s | %s | %s | %s | %s | %s |\n", name.c_str(), per_char.c_str(), per_call.c_str(),
+                peer.c_str(), wanted.c_str(), others.c_str(), mark);
+  else
+    std::printf("%-44s %9s %9s  %-20s %5s  %-10s  %s\n", name.c_str(), per_char.c_str(), per_call.c_str(),
+                peer.c_str(), wanted.c_str(), mark, others.c_str());
+  std::fflush(stdout);
+}
+
+void Table::print_sum() const {
+  std::printf("%s%d rows, %d behind a peer, %d below their goal\n", options_.markdown ? "\n" : "", rows_,
+              behind_, missed_);
+}
+
+}  // namespace bench

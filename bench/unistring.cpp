@@ -1,0 +1,25 @@
+#include <unistr.h>
+
+#include "icu.h"
+
+namespace bench::unistring {
+
+Work convert(const Input& input, const Encoding& from, const Encoding& to) {
+  if (is_utf8(from) && is_utf16(to))
+    return for_each_piece(input, [](const char* in, size_t bytes, char* out) {
+      size_t units = bytes;
+      const auto* const written =
+          u8_to_u16(reinterpret_cast<const uint8_t*>(in), bytes, reinterpret_cast<uint16_t*>(out), &units);
+      return written == nullptr ? 0 : 2 * units;
+    });
+  if (is_utf16(from) && is_utf8(to))
+    return for_each_piece(input, [](const char* in, size_t bytes, char* out) {
+      size_t room = 2 * bytes;
+      const auto* const written =
+          u16_to_u8(reinterpret_cast<const uint16_t*>(in), bytes / 2, reinterpret_cast<uint8_t*>(out), &room);
+      return written == nullptr ? 0 : room;
+    });
+  return nullptr;
+}
+
+}  // namespace bench::unistring
