@@ -1,7 +1,9 @@
 #include "codepages.h"
 
+#include <algorithm>
 #include <cstdio>
 #include <cstring>
+#include <map>
 
 #include "icu.h"
 #include "table.h"
@@ -95,6 +97,21 @@ bool Codepage::is_agreed(char16_t c) const {
     return false;
   return run_iconv(to_utf16_, bytes.data(), bytes.size(), out, kCharRoom) == sizeof(c) &&
          memcmp(out, &c, sizeof(c)) == 0;
+}
+
+std::u16string agreed_text(const std::u16string& text, const std::vector<const Codepage*>& codepages,
+                           size_t chars) {
+  std::map<char16_t, bool> known;
+  std::u16string kept;
+  for (const char16_t c : text) {
+    if (kept.size() == chars) break;
+    const auto [place, is_new] = known.try_emplace(c, false);
+    if (is_new)
+      place->second = std::all_of(codepages.begin(), codepages.end(),
+                                  [c](const Codepage* codepage) { return codepage->is_agreed(c); });
+    if (place->second) kept += c;
+  }
+  return kept;
 }
 
 size_t run_iconv(iconv_t descriptor, const char* input, size_t input_bytes, char* output, size_t room) {

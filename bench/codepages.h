@@ -3,8 +3,10 @@
 
 #include <iconv.h>
 
+#include <cstdint>
 #include <memory>
 #include <string>
+#include <vector>
 
 #include "lx.h"
 
@@ -52,6 +54,10 @@ class Codepage {
   LocalePointer locale_;
   iconv_t to_utf16_ = nullptr, from_utf16_ = nullptr;
 };
+
+/// The characters of a text that are agreed in all the codepages, up to a number of them.
+std::u16string agreed_text(const std::u16string& text, const std::vector<const Codepage*>& codepages,
+                           size_t chars = SIZE_MAX);
 
 /// Converts all of a text with a descriptor that is reset before. Gives the bytes written; 0 when it refuses a
 /// character.

@@ -1,7 +1,6 @@
 // Conversion beside ICU, iconv and libunistring. Each library is called as a program would that converts much:
 // converters stay open, and a string is one call that begins in the initial state.
 #include <map>
-#include <set>
 
 #include "codepages.h"
 #include "families.h"
@@ -102,17 +101,6 @@ Work iconv_peer(const Input& input, const Encoding& from, const Encoding& to) {
   });
 }
 
-std::u16string agreed(const std::u16string& text, const Codepage& one, const Codepage& other) {
-  std::map<char16_t, bool> known;
-  std::u16string kept;
-  for (const char16_t c : text) {
-    const auto [place, is_new] = known.try_emplace(c, false);
-    if (is_new) place->second = one.is_agreed(c) && other.is_agreed(c);
-    if (place->second) kept += c;
-  }
-  return kept;
-}
-
 /// Shift-sensitive text ends in the single-byte state, as whole texts do.
 std::u16string closed(const std::u16string& text, const Codepage& measure) {
   return measure.encoding().is_stateful ? text + u'.' : text;
@@ -159,7 +147,7 @@ class ConversionRows {
     if (from == nullptr || to == nullptr) return;
     const std::u16string& whole = texts_.find(text);
     if (whole.empty()) return;
-    const std::u16string units = agreed(whole, *from, *to);
+    const std::u16string units = agreed_text(whole, {from, to});
     const bool from_unicode =
         is_utf16(from->encoding()) || (is_utf8(from->encoding()) && !is_utf16(to->encoding()));
     const Codepage& measure = to->encoding().is_stateful || from_unicode ? *to : *from;

@@ -37,6 +37,10 @@ constexpr Goal kGoals[] = {
     {"convert/KOI8-R/MS1251/*/1MB", 6},
     {"convert/KOI8-R/MS1251/*/24B", 4},
     {"convert/EUC-KR/*", 2},
+    {"map/Russian/UTF-8/*", 3},
+    {"map/Greek/UTF-8/*", 3},
+    {"map/Japanese/MS932/*", 2},
+    {"map/Russian/UTF-16/*", 1.3},
 };
 
 }  // namespace

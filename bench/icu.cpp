@@ -1,8 +1,11 @@
 #include "icu.h"
 
+#include <unicode/ucasemap.h>
 #include <unicode/ucnv.h>
 #include <unicode/ucnv_err.h>
 #include <unicode/ustring.h>
+
+#include <vector>
 
 namespace bench::icu {
 namespace {
@@ -82,6 +85,35 @@ Work convert_utf(const Input& input, const Encoding& from, const Encoding& to) {
       return count(written);
     });
   return nullptr;
+}
+
+Work map(const Input& input, const Encoding& encoding, const char* language, bool is_upper) {
+  if (is_utf8(encoding)) {
+    UErrorCode error = U_ZERO_ERROR;
+    const std::shared_ptr<UCaseMap> cases(ucasemap_open(language, 0, &error), ucasemap_close);
+    const auto convert = is_upper ? ucasemap_utf8ToUpper : ucasemap_utf8ToLower;
+    return for_each_piece(input, [cases, convert](const char* in, size_t bytes, char* out) {
+      UErrorCode failed = U_ZERO_ERROR;
+      return count(convert(cases.get(), out, length(2 * bytes), in, length(bytes), &failed));
+    });
+  }
+  const auto convert = is_upper ? u_strToUpper : u_strToLower;
+  if (is_utf16(encoding))
+    return for_each_piece(input, [language, convert](const char* in, size_t bytes, char* out) {
+      UErrorCode error = U_ZERO_ERROR;
+      return 2 * count(convert(units(out), length(bytes), units(in), length(bytes / 2), language, &error));
+    });
+  const Converter converter = open(encoding);
+  if (converter == nullptr) return nullptr;
+  auto room = std::make_shared<std::vector<char16_t>>(4 * input->bytes.size() + 2);
+  return for_each_piece(input, [converter, room, language, convert](const char* in, size_t bytes, char* out) {
+    UErrorCode error = U_ZERO_ERROR;
+    char16_t *const read = room->data(), *const mapped = read + 2 * bytes;
+    const int32_t units_read =
+        ucnv_toUChars(converter.get(), read, length(2 * bytes), in, length(bytes), &error);
+    const int32_t units_mapped = convert(mapped, length(2 * bytes), read, units_read, language, &error);
+    return count(ucnv_fromUChars(converter.get(), out, length(2 * bytes), mapped, units_mapped, &error));
+  });
 }
 
 }  // namespace bench::icu

@@ -13,6 +13,8 @@ bool reads_and_writes(const Encoding& encoding, const std::string& bytes, char16
 Work convert(const Input& input, const Encoding& from, const Encoding& to);
 /// The functions for UTF-8 and UTF-16 alone.
 Work convert_utf(const Input& input, const Encoding& from, const Encoding& to);
+/// Upper or lower case of every piece by the rules of a language: text of a codepage goes through UTF-16.
+Work map(const Input& input, const Encoding& encoding, const char* language, bool is_upper);
 
 }  // namespace bench::icu
 
@@ -20,5 +22,7 @@ namespace bench::unistring {
 
 /// u8_to_u16 and u16_to_u8.
 Work convert(const Input& input, const Encoding& from, const Encoding& to);
+/// u8_toupper, u16_tolower and so on.
+Work map(const Input& input, const Encoding& encoding, const char* language, bool is_upper);
 
 }  // namespace bench::unistring

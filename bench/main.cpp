@@ -46,6 +46,7 @@ bool read_options(int argc, char** argv, Options* options) {
 int main(int argc, char** argv) {
   Options options;
   if (!read_options(argc, argv, &options)) return 2;
+  setenv("LOCPATH", LEXICOR_BENCH_GLIBC_DIR, 0);
   if (LXInit(options.locale_directory.c_str(), nullptr, nullptr, nullptr, 0) != LX_OK) {
     std::fprintf(stderr, "no locale directory: %s\n", options.locale_directory.c_str());
     return EXIT_FAILURE;
@@ -53,6 +54,7 @@ int main(int argc, char** argv) {
   bench::Table table(options.table);
   bench::Texts texts(options.text_directory);
   bench::add_conversion_rows(&table, &texts);
+  bench::add_mapping_rows(&table, &texts);
   table.print_sum();
   LXTerm();
   return EXIT_SUCCESS;

@@ -32,6 +32,10 @@ enum class Same {
   kNothing,  // the row has seen to it
 };
 
+/// The first peer that does not give what the first one of all gives, with `room` bytes for each output; null when all
+/// do, and the front one itself when it gives nothing.
+const Peer* differing(const std::vector<Peer>& peers, size_t room, Same same);
+
 struct Row {
   std::string name;  // family/.../size
   std::vector<Peer> peers;

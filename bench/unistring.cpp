@@ -1,3 +1,4 @@
+#include <unicase.h>
 #include <unistr.h>
 
 #include "icu.h"
@@ -19,6 +20,28 @@ Work convert(const Input& input, const Encoding& from, const Encoding& to) {
           u16_to_u8(reinterpret_cast<const uint16_t*>(in), bytes / 2, reinterpret_cast<uint8_t*>(out), &room);
       return written == nullptr ? 0 : room;
     });
+  return nullptr;
+}
+
+Work map(const Input& input, const Encoding& encoding, const char* language, bool is_upper) {
+  if (is_utf8(encoding)) {
+    const auto convert = is_upper ? u8_toupper : u8_tolower;
+    return for_each_piece(input, [language, convert](const char* in, size_t bytes, char* out) {
+      size_t room = 2 * bytes;
+      const auto* const mapped = convert(reinterpret_cast<const uint8_t*>(in), bytes, language, nullptr,
+                                         reinterpret_cast<uint8_t*>(out), &room);
+      return mapped == nullptr ? 0 : room;
+    });
+  }
+  if (is_utf16(encoding)) {
+    const auto convert = is_upper ? u16_toupper : u16_tolower;
+    return for_each_piece(input, [language, convert](const char* in, size_t bytes, char* out) {
+      size_t room = bytes;
+      const auto* const mapped = convert(reinterpret_cast<const uint16_t*>(in), bytes / 2, language, nullptr,
+                                         reinterpret_cast<uint16_t*>(out), &room);
+      return mapped == nullptr ? 0 : 2 * room;
+    });
+  }
   return nullptr;
 }
 
