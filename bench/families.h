@@ -8,5 +8,6 @@ namespace bench {
 
 void add_conversion_rows(Table* table, Texts* texts);
 void add_mapping_rows(Table* table, Texts* texts);
+void add_collation_rows(Table* table, Texts* texts);
 
 }  // namespace bench

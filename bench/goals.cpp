@@ -41,6 +41,9 @@ constexpr Goal kGoals[] = {
     {"map/Greek/UTF-8/*", 3},
     {"map/Japanese/MS932/*", 2},
     {"map/Russian/UTF-16/*", 1.3},
+    {"collate/*/neighbours_*", 1.2},
+    {"collate/*/sort_*", 1.2},
+    {"keys/*", 2.3},
 };
 
 }  // namespace

@@ -3,6 +3,7 @@
 #include <unicode/ucasemap.h>
 #include <unicode/ucnv.h>
 #include <unicode/ucnv_err.h>
+#include <unicode/ucol.h>
 #include <unicode/ustring.h>
 
 #include <vector>
@@ -28,6 +29,14 @@ char16_t* units(char* bytes) {
 }
 const char16_t* units(const char* bytes) {
   return reinterpret_cast<const char16_t*>(bytes);
+}
+
+std::shared_ptr<UCollator> open_collator(const char* language) {
+  UErrorCode error = U_ZERO_ERROR;
+  std::shared_ptr<UCollator> collator(ucol_open(language, &error), ucol_close);
+  ucol_setAttribute(collator.get(), UCOL_ALTERNATE_HANDLING, UCOL_SHIFTED, &error);
+  ucol_setAttribute(collator.get(), UCOL_STRENGTH, UCOL_QUATERNARY, &error);
+  return collator;
 }
 
 }  // namespace
@@ -113,6 +122,42 @@ Work map(const Input& input, const Encoding& encoding, const char* language, boo
         ucnv_toUChars(converter.get(), read, length(2 * bytes), in, length(bytes), &error);
     const int32_t units_mapped = convert(mapped, length(2 * bytes), read, units_read, language, &error);
     return count(ucnv_fromUChars(converter.get(), out, length(2 * bytes), mapped, units_mapped, &error));
+  });
+}
+
+Work order_utf16(Order order, const Words& words, const char* language) {
+  return order_work(order, words, [collator = open_collator(language)](const Word& a, const Word& b) {
+    return static_cast<int>(ucol_strcoll(collator.get(), a.units.data(), length(a.units.size()), b.units.data(),
+                                         length(b.units.size())));
+  });
+}
+
+Work order_utf8(Order order, const Words& words, const char* language) {
+  return order_work(order, words, [collator = open_collator(language)](const Word& a, const Word& b) {
+    UErrorCode error = U_ZERO_ERROR;
+    return static_cast<int>(ucol_strcollUTF8(collator.get(), a.utf8.data(), length(a.utf8.size()),
+                                             b.utf8.data(), length(b.utf8.size()), &error));
+  });
+}
+
+Work keys(const Words& words, const char* language) {
+  return key_work(words, [collator = open_collator(language)](const Word& word, char* out) {
+    return count(ucol_getSortKey(collator.get(), word.units.data(), length(word.units.size()),
+                                 reinterpret_cast<uint8_t*>(out), kKeyBytes));
+  });
+}
+
+Work order_caseless(const Words& words) {
+  return order_work(Order::kNeighbours, words, [](const Word& a, const Word& b) {
+    UErrorCode error = U_ZERO_ERROR;
+    return static_cast<int>(u_strCaseCompare(a.units.data(), length(a.units.size()), b.units.data(),
+                                             length(b.units.size()), U_FOLD_CASE_DEFAULT, &error));
+  });
+}
+
+Work find(const std::shared_ptr<const std::u16string>& text) {
+  return find_work(text, [](const std::u16string& all, const std::u16string& part) {
+    return u_strFindFirst(all.data(), length(all.size()), part.data(), length(part.size())) != nullptr;
   });
 }
 

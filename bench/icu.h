@@ -3,6 +3,7 @@
 
 #include "codepages.h"
 #include "table.h"
+#include "words.h"
 
 namespace bench::icu {
 
@@ -15,6 +16,14 @@ Work convert(const Input& input, const Encoding& from, const Encoding& to);
 Work convert_utf(const Input& input, const Encoding& from, const Encoding& to);
 /// Upper or lower case of every piece by the rules of a language: text of a codepage goes through UTF-16.
 Work map(const Input& input, const Encoding& encoding, const char* language, bool is_upper);
+
+/// Comparison and keys by a language's order, with punctuation on the fourth level as the shipped sorts have it.
+Work order_utf16(Order order, const Words& words, const char* language);
+Work order_utf8(Order order, const Words& words, const char* language);
+Work keys(const Words& words, const char* language);
+/// Neighbours compared by code value without regard to case.
+Work order_caseless(const Words& words);
+Work find(const std::shared_ptr<const std::u16string>& text);
 
 }  // namespace bench::icu
 

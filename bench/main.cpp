@@ -55,6 +55,7 @@ int main(int argc, char** argv) {
   bench::Texts texts(options.text_directory);
   bench::add_conversion_rows(&table, &texts);
   bench::add_mapping_rows(&table, &texts);
+  bench::add_collation_rows(&table, &texts);
   table.print_sum();
   LXTerm();
   return EXIT_SUCCESS;

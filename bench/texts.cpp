@@ -73,6 +73,11 @@ std::u16string sparse(const std::u16string& ascii, const std::u16string& languag
   return text;
 }
 
+bool has_punctuation(const std::u16string& word) {
+  return std::any_of(word.begin(), word.end(),
+                     [](char16_t c) { return c < 0x80 && (c < u'A' || c > u'z' || (c > u'Z' && c < u'a')); });
+}
+
 bool take_prefix(std::string* label, const char* prefix) {
   if (label->compare(0, strlen(prefix), prefix) != 0) return false;
   label->erase(0, strlen(prefix));
@@ -95,6 +100,9 @@ const std::u16string& Texts::find(const std::string& label) {
 
 std::vector<std::u16string> Texts::words(const std::string& language) {
   std::vector<std::u16string> words = lines_of(to_utf16(read("words", language)));
+  words.erase(std::remove_if(words.begin(), words.end(), has_punctuation), words.end());
+  std::sort(words.begin(), words.end());
+  words.erase(std::unique(words.begin(), words.end()), words.end());
   std::mt19937 random(1);
   std::shuffle(words.begin(), words.end(), random);
   return words;
