@@ -6,7 +6,6 @@
 #include <map>
 
 #include "icu.h"
-#include "table.h"
 #include "texts.h"
 
 namespace bench {
@@ -112,6 +111,17 @@ std::u16string agreed_text(const std::u16string& text, const std::vector<const C
     if (place->second) kept += c;
   }
   return kept;
+}
+
+Input cut_pieces(const std::u16string& text, size_t chars, size_t pieces, const Codepage& codepage) {
+  auto cut = std::make_shared<Pieces>();
+  for (size_t at = 0; at < text.size() && cut->ends.size() < pieces; at += chars) {
+    const std::u16string piece = text.substr(at, chars);
+    cut->bytes += codepage.encode(piece);
+    cut->ends.push_back(cut->bytes.size());
+    cut->chars += piece.size();
+  }
+  return cut;
 }
 
 size_t run_iconv(iconv_t descriptor, const char* input, size_t input_bytes, char* output, size_t room) {

@@ -9,6 +9,7 @@
 #include <vector>
 
 #include "lx.h"
+#include "table.h"
 
 namespace bench {
 
@@ -58,6 +59,9 @@ class Codepage {
 /// The characters of a text that are agreed in all the codepages, up to a number of them.
 std::u16string agreed_text(const std::u16string& text, const std::vector<const Codepage*>& codepages,
                            size_t chars = SIZE_MAX);
+
+/// The beginning of a text in pieces of `chars` characters, at most `pieces` of them.
+Input cut_pieces(const std::u16string& text, size_t chars, size_t pieces, const Codepage& codepage);
 
 /// Converts all of a text with a descriptor that is reset before. Gives the bytes written; 0 when it refuses a
 /// character.

@@ -22,13 +22,14 @@ struct Subject {
   const char* locale;
   const char* icu;
   const char* system;
+  bool folds_alike;  // the order of upper-case letters, which counts without case, is that of lower-case ones
 };
 constexpr Subject kSubjects[] = {
-    {"English", "English.UTF-8@Default", "en", "en_US.UTF-8"},
-    {"German", "German.UTF-8@Default", "de", "de_DE.UTF-8"},
-    {"Czech", "Czech.UTF-8", "cs", "cs_CZ.UTF-8"},
-    {"Swedish", "Swedish.UTF-8@Swedish", "sv", "sv_SE.UTF-8"},
-    {"Russian", "Russian.UTF-8@Default", "root", "ru_RU.UTF-8"},
+    {"English", "English.UTF-8@Default", "en", "en_US.UTF-8", true},
+    {"German", "German.UTF-8@Default", "de", "de_DE.UTF-8", false},
+    {"Czech", "Czech.UTF-8", "cs", "cs_CZ.UTF-8", true},
+    {"Swedish", "Swedish.UTF-8@Swedish", "sv", "sv_SE.UTF-8", true},
+    {"Russian", "Russian.UTF-8@Default", "root", "ru_RU.UTF-8", false},
 };
 
 const LXUChar* lx_units(const std::u16string& text) {
@@ -74,7 +75,7 @@ class SubjectRows {
     add_order("neighbours", Order::kNeighbours, neighbours);
     add_order("sort", Order::kSort, words_);
     add_keys(random);
-    add_caseless(neighbours);
+    if (subject_.folds_alike) add_caseless(neighbours);
     add_find(random);
   }
 
@@ -155,9 +156,7 @@ class SubjectRows {
             Same::kNothing);
   }
 
-  /// German is left out: with special mappings the sign of the result is that of other units.
   void add_caseless(const Words& words) {
-    if (strcmp(subject_.language, "German") == 0) return;
     add_row("compare", "caseless_utf16", words,
             {{kOurs, order_work(Order::kNeighbours, words,
                                 [locale = locale_](const Word& a, const Word& b) {

@@ -37,6 +37,9 @@ constexpr Goal kGoals[] = {
     {"convert/KOI8-R/MS1251/*/1MB", 6},
     {"convert/KOI8-R/MS1251/*/24B", 4},
     {"convert/EUC-KR/*", 2},
+    {"count/UTF-8/*", 20},
+    {"count/*", 8},
+    {"walk/UTF-8/*", 0.8},
     {"map/Russian/UTF-8/*", 3},
     {"map/Greek/UTF-8/*", 3},
     {"map/Japanese/MS932/*", 2},
@@ -44,6 +47,14 @@ constexpr Goal kGoals[] = {
     {"collate/*/neighbours_*", 1.2},
     {"collate/*/sort_*", 1.2},
     {"keys/*", 2.3},
+    {"write/*/integer", 2.5},
+    {"write/*/double", 5},
+    {"write/*/currency", 3.5},
+    {"write/*/time_names", 1.8},
+    {"write/*/time_*", 2.2},
+    {"read/*/integer", 2},
+    {"read/*/time_names", 3},
+    {"read/*/time_*", 1.5},
 };
 
 }  // namespace

@@ -1,12 +1,19 @@
+// The macro U8_NEXT converts as this would warn of.
+#pragma GCC diagnostic ignored "-Wconversion"
 #include "icu.h"
 
 #include <unicode/ucasemap.h>
 #include <unicode/ucnv.h>
 #include <unicode/ucnv_err.h>
 #include <unicode/ucol.h>
+#include <unicode/udat.h>
+#include <unicode/unum.h>
 #include <unicode/ustring.h>
+#include <unicode/utf8.h>
 
 #include <vector>
+
+#include "keep.h"
 
 namespace bench::icu {
 namespace {
@@ -125,6 +132,50 @@ Work map(const Input& input, const Encoding& encoding, const char* language, boo
   });
 }
 
+Work count_chars(const Input& input, const Encoding& encoding) {
+  if (is_utf8(encoding))
+    return sum_of_pieces(input, [](const char* text, size_t bytes) {
+      size_t chars = 0;
+      for (size_t i = 0; i < bytes; ++chars) U8_FWD_1(text, i, bytes);
+      return chars;
+    });
+  const Converter converter = open(encoding);
+  if (converter == nullptr) return nullptr;
+  auto room = std::make_shared<std::vector<char16_t>>(input->bytes.size());
+  return sum_of_pieces(input, [converter, room](const char* text, size_t bytes) {
+    UErrorCode error = U_ZERO_ERROR;
+    return count(
+        ucnv_toUChars(converter.get(), room->data(), length(room->size()), text, length(bytes), &error));
+  });
+}
+
+Work walk(const Input& input, const Encoding& encoding) {
+  if (is_utf8(encoding))
+    return sum_of_pieces(input, [](const char* text, size_t bytes) {
+      size_t chars = 0;
+      UChar32 codes = 0;
+      for (size_t i = 0; i < bytes; ++chars) {
+        UChar32 c = 0;
+        U8_NEXT(text, i, bytes, c);
+        codes += c;
+      }
+      keep(codes);
+      return chars;
+    });
+  const Converter converter = open(encoding);
+  if (converter == nullptr) return nullptr;
+  return sum_of_pieces(input, [converter](const char* text, size_t bytes) {
+    UErrorCode error = U_ZERO_ERROR;
+    size_t chars = 0;
+    UChar32 codes = 0;
+    ucnv_resetToUnicode(converter.get());
+    for (const char* const end = text + bytes; text < end; ++chars)
+      codes += ucnv_getNextUChar(converter.get(), &text, end, &error);
+    keep(codes);
+    return chars;
+  });
+}
+
 Work order_utf16(Order order, const Words& words, const char* language) {
   return order_work(order, words, [collator = open_collator(language)](const Word& a, const Word& b) {
     return static_cast<int>(ucol_strcoll(collator.get(), a.units.data(), length(a.units.size()), b.units.data(),
@@ -159,6 +210,75 @@ Work find(const std::shared_ptr<const std::u16string>& text) {
   return find_work(text, [](const std::u16string& all, const std::u16string& part) {
     return u_strFindFirst(all.data(), length(all.size()), part.data(), length(part.size())) != nullptr;
   });
+}
+
+namespace {
+
+using Numbers = std::shared_ptr<UNumberFormat>;
+using Times = std::shared_ptr<UDateFormat>;
+
+Numbers open_numbers(const char* territory, UNumberFormatStyle style, int32_t fraction_digits) {
+  UErrorCode error = U_ZERO_ERROR;
+  Numbers numbers(unum_open(style, nullptr, 0, territory, nullptr, &error), unum_close);
+  unum_setAttribute(numbers.get(), UNUM_FRACTION_DIGITS, fraction_digits);
+  return numbers;
+}
+
+Times open_times(const char* territory, const char16_t* pattern) {
+  UErrorCode error = U_ZERO_ERROR;
+  return {udat_open(UDAT_PATTERN, UDAT_PATTERN, territory, u"GMT", -1, pattern, -1, &error), udat_close};
+}
+
+Writer<double> write_doubles(const Numbers& numbers) {
+  return [numbers](double value, char16_t* out, int32_t room) {
+    UErrorCode error = U_ZERO_ERROR;
+    return unum_formatDouble(numbers.get(), value, out, room, nullptr, &error);
+  };
+}
+
+}  // namespace
+
+Writer<int32_t> integer_writer(const char* territory) {
+  return [numbers = open_numbers(territory, UNUM_DECIMAL, 0)](int32_t value, char16_t* out, int32_t room) {
+    UErrorCode error = U_ZERO_ERROR;
+    return unum_format(numbers.get(), value, out, room, nullptr, &error);
+  };
+}
+
+Writer<double> double_writer(const char* territory) {
+  return write_doubles(open_numbers(territory, UNUM_DECIMAL, 2));
+}
+
+Writer<double> currency_writer(const char* territory) {
+  return write_doubles(open_numbers(territory, UNUM_CURRENCY, 2));
+}
+
+Writer<double> time_writer(const char* territory, const char16_t* pattern) {
+  return [times = open_times(territory, pattern)](double value, char16_t* out, int32_t room) {
+    UErrorCode error = U_ZERO_ERROR;
+    return udat_format(times.get(), value, out, room, nullptr, &error);
+  };
+}
+
+Reader<int32_t> integer_reader(const char* territory) {
+  return [numbers = open_numbers(territory, UNUM_DECIMAL, 0)](const std::u16string& text) {
+    UErrorCode error = U_ZERO_ERROR;
+    return unum_parse(numbers.get(), text.data(), length(text.size()), nullptr, &error);
+  };
+}
+
+Reader<double> double_reader(const char* territory) {
+  return [numbers = open_numbers(territory, UNUM_DECIMAL, 2)](const std::u16string& text) {
+    UErrorCode error = U_ZERO_ERROR;
+    return unum_parseDouble(numbers.get(), text.data(), length(text.size()), nullptr, &error);
+  };
+}
+
+Reader<double> time_reader(const char* territory, const char16_t* pattern) {
+  return [times = open_times(territory, pattern)](const std::u16string& text) {
+    UErrorCode error = U_ZERO_ERROR;
+    return udat_parse(times.get(), text.data(), length(text.size()), nullptr, &error);
+  };
 }
 
 }  // namespace bench::icu

@@ -54,8 +54,10 @@ int main(int argc, char** argv) {
   bench::Table table(options.table);
   bench::Texts texts(options.text_directory);
   bench::add_conversion_rows(&table, &texts);
+  bench::add_walking_rows(&table, &texts);
   bench::add_mapping_rows(&table, &texts);
   bench::add_collation_rows(&table, &texts);
+  bench::add_formatting_rows(&table);
   table.print_sum();
   LXTerm();
   return EXIT_SUCCESS;

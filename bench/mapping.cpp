@@ -36,21 +36,8 @@ constexpr Subject kSubjects[] = {
     {"German", "UTF-16", "German", "de", nullptr},
     {"ASCII", "UTF-16", "English", "en", "en_US.UTF-8"},
     {"Russian", "MS1251", "Russian", "ru", "ru_RU.CP1251"},
-    {"Japanese", "MS932", "Japanese", "ja", "ja_JP.SJIS"},
+    {"Japanese", "MS932", "Japanese", "ja", "ja_JP.WINDOWS-31J"},
 };
-
-/// The long text in one piece, or its beginning cut into short strings.
-Input pieces_of(const std::u16string& text, bool is_short, const Codepage& codepage) {
-  auto pieces = std::make_shared<Pieces>();
-  const size_t step = is_short ? kShortChars : text.size();
-  for (size_t at = 0; at < text.size() && pieces->ends.size() < kShortStrings; at += step) {
-    const std::u16string piece = text.substr(at, step);
-    pieces->bytes += codepage.encode(piece);
-    pieces->ends.push_back(pieces->bytes.size());
-    pieces->chars += piece.size();
-  }
-  return pieces;
-}
 
 Work ours(const Input& input, const Encoding& encoding, const LocalePointer& locale, uint32_t mode) {
   if (is_utf16(encoding))
@@ -89,13 +76,6 @@ Work glibc_peer(const Input& input, const Encoding& encoding, const char* locale
   });
 }
 
-Input one_piece(const std::string& bytes) {
-  auto pieces = std::make_shared<Pieces>();
-  pieces->bytes = bytes;
-  pieces->ends = {bytes.size()};
-  return pieces;
-}
-
 class SubjectRows {
  public:
   /// `codepage` and `locale` are there.
@@ -105,7 +85,8 @@ class SubjectRows {
   void add(const std::string& stem, const std::u16string& whole, Table* table) const {
     const std::u16string text = mapped_alike(agreed_text(whole, {&codepage_}, kLongUnits));
     for (const bool is_short : {false, true}) {
-      const Input input = pieces_of(text, is_short, codepage_);
+      const Input input = is_short ? cut_pieces(text, kShortChars, kShortStrings, codepage_)
+                                   : cut_pieces(text, text.size(), 1, codepage_);
       table->add(
           {stem + (is_short ? "/24" : "/1MB"), peers(input), input->chars, input->ends.size(), room(input)});
     }
@@ -130,7 +111,7 @@ class SubjectRows {
     for (const char16_t c : text) {
       const auto [place, is_new] = known.try_emplace(c, false);
       if (is_new) {
-        const Input input = one_piece(codepage_.encode({u'a', c}));
+        const Input input = cut_pieces({u'a', c}, 2, 1, codepage_);
         place->second = differing(peers(input), room(input), Same::kBytes) == nullptr;
       }
       if (place->second) kept += c;

@@ -10,7 +10,7 @@ namespace bench {
 
 using SystemLocale = std::shared_ptr<std::remove_pointer_t<locale_t>>;
 
-/// Null, with a line on standard error, when the system does not have it.
+/// Opened once. Null, with a line on standard error, when the system does not have it.
 SystemLocale open_system_locale(const char* name);
 
 }  // namespace bench

@@ -122,7 +122,7 @@ void Table::print(const std::string& name, const std::vector<Measured>& peers, s
   const std::string per_char = figure(ours / static_cast<double>(chars)),
                     per_call = figure(ours / static_cast<double>(calls));
   const std::string peer = fastest == nullptr ? "" : figure(times) + " " + fastest->peer;
-  const std::string wanted = goal == 0 ? "" : figure(goal);
+  const std::string wanted = goal == 0 || fastest == nullptr ? "" : figure(goal);
   const char* const mark = is_behind ? "behind" : is_missed ? "below goal" : "";
   if (options_.markdown)
     std::printf("| %s | %s | %s | %s | %s | %s | %s |\n", name.c_str(), per_char.c_str(), per_call.c_str(),

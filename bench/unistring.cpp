@@ -2,6 +2,7 @@
 #include <unistr.h>
 
 #include "icu.h"
+#include "keep.h"
 
 namespace bench::unistring {
 
@@ -43,6 +44,28 @@ Work map(const Input& input, const Encoding& encoding, const char* language, boo
     });
   }
   return nullptr;
+}
+
+Work count_chars(const Input& input, const Encoding& encoding) {
+  if (!is_utf8(encoding)) return nullptr;
+  return sum_of_pieces(input, [](const char* text, size_t bytes) {
+    return u8_mbsnlen(reinterpret_cast<const uint8_t*>(text), bytes);
+  });
+}
+
+Work walk(const Input& input, const Encoding& encoding) {
+  if (!is_utf8(encoding)) return nullptr;
+  return sum_of_pieces(input, [](const char* text, size_t bytes) {
+    size_t chars = 0;
+    ucs4_t codes = 0;
+    for (size_t i = 0; i < bytes; ++chars) {
+      ucs4_t c = 0;
+      i += static_cast<size_t>(u8_mbtouc(&c, reinterpret_cast<const uint8_t*>(text) + i, bytes - i));
+      codes += c;
+    }
+    keep(codes);
+    return chars;
+  });
 }
 
 }  // namespace bench::unistring
