@@ -11,6 +11,7 @@ struct Goal {
   double times;
 };
 constexpr Goal kGoals[] = {
+    {"first-use/*", 3},
     {"convert/UTF-8/UTF-16/*/24B", 1.3},
     {"convert/UTF-16/UTF-8/*/24B", 1.3},
     {"convert/UTF-8/UTF-16/*", 1.6},
@@ -37,8 +38,8 @@ constexpr Goal kGoals[] = {
     {"convert/KOI8-R/MS1251/*/1MB", 6},
     {"convert/KOI8-R/MS1251/*/24B", 4},
     {"convert/EUC-KR/*", 2},
-    {"count/UTF-8/*", 20},
-    {"count/*", 8},
+    {"count/UTF-8/*/long", 20},
+    {"count/*/long", 8},
     {"walk/UTF-8/*", 0.8},
     {"map/Russian/UTF-8/*", 3},
     {"map/Greek/UTF-8/*", 3},
@@ -47,6 +48,8 @@ constexpr Goal kGoals[] = {
     {"collate/*/neighbours_*", 1.2},
     {"collate/*/sort_*", 1.2},
     {"keys/*", 2.3},
+    {"message/loaded/Latin1", 2.5},
+    {"message/loaded/UTF-8", 1.5},
     {"write/*/integer", 2.5},
     {"write/*/double", 5},
     {"write/*/currency", 3.5},

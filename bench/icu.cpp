@@ -8,6 +8,7 @@
 #include <unicode/ucol.h>
 #include <unicode/udat.h>
 #include <unicode/unum.h>
+#include <unicode/ures.h>
 #include <unicode/ustring.h>
 #include <unicode/utf8.h>
 
@@ -210,6 +211,46 @@ Work find(const std::shared_ptr<const std::u16string>& text) {
   return find_work(text, [](const std::u16string& all, const std::u16string& part) {
     return u_strFindFirst(all.data(), length(all.size()), part.data(), length(part.size())) != nullptr;
   });
+}
+
+Work messages(const std::string& directory, const Encoding* encoding, const std::vector<int>& numbers) {
+  UErrorCode error = U_ZERO_ERROR;
+  const std::shared_ptr<UResourceBundle> bundle(ures_openDirect(directory.c_str(), "root", &error), ures_close);
+  const std::shared_ptr<UResourceBundle> texts(ures_getByKey(bundle.get(), "messages", nullptr, &error),
+                                               ures_close);
+  const Converter converter = open(*encoding);
+  if (U_FAILURE(error)) return nullptr;
+  if (is_utf8(*encoding))
+    return message_work(numbers, [bundle, texts](int number, char* out) {
+      UErrorCode failed = U_ZERO_ERROR;
+      int32_t room = kMessageRoom;
+      ures_getUTF8StringByIndex(texts.get(), number - 1, out, &room, true, &failed);
+    });
+  if (is_utf16(*encoding))
+    return message_work(numbers, [bundle, texts](int number, char* out) {
+      UErrorCode failed = U_ZERO_ERROR;
+      int32_t count = 0;
+      const char16_t* const text = ures_getStringByIndex(texts.get(), number - 1, &count, &failed);
+      u_memcpy(units(out), text, count + 1);
+    });
+  return message_work(numbers, [bundle, texts, converter](int number, char* out) {
+    UErrorCode failed = U_ZERO_ERROR;
+    int32_t count = 0;
+    const char16_t* const text = ures_getStringByIndex(texts.get(), number - 1, &count, &failed);
+    ucnv_fromUChars(converter.get(), out, kMessageRoom, text, count, &failed);
+  });
+}
+
+std::function<bool()> first_use(const char* word, const char* other, double amount) {
+  return [word, other, amount] {
+    UErrorCode error = U_ZERO_ERROR;
+    char16_t out[64];
+    ucnv_toUChars(ucnv_open("UTF-8", &error), out, 64, word, -1, &error);
+    const UCollationResult order = ucol_strcollUTF8(ucol_open("de", &error), word, -1, other, -1, &error);
+    unum_formatDouble(unum_open(UNUM_CURRENCY, nullptr, 0, "de_DE", nullptr, &error), amount, out, 64, nullptr,
+                      &error);
+    return U_SUCCESS(error) && order != UCOL_EQUAL;
+  };
 }
 
 namespace {

@@ -4,6 +4,7 @@
 #include <functional>
 
 #include "codepages.h"
+#include "message_work.h"
 #include "table.h"
 #include "words.h"
 
@@ -30,6 +31,12 @@ Work keys(const Words& words, const char* language);
 /// Neighbours compared by code value without regard to case.
 Work order_caseless(const Words& words);
 Work find(const std::shared_ptr<const std::u16string>& text);
+
+/// Messages of the resource bundle in a directory, by their index, in an encoding.
+Work messages(const std::string& directory, const Encoding* encoding, const std::vector<int>& numbers);
+
+/// Opens a converter, a collator and a format for German, and uses each once; false when that fails.
+std::function<bool()> first_use(const char* word, const char* other, double amount);
 
 /// What writes a number or a moment as UTF-16 to a buffer of `room` units, and gives the units. `territory` is a locale
 /// as "de_DE". In a build without ICU they are empty, as are the readers.

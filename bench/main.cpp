@@ -1,7 +1,6 @@
 // lexicor_bench: the library beside its peers on real texts, in one table.
 //
 //   lexicor_bench [--rows=PART_OF_NAME]... [--markdown] [--turns=N] [--locale=DIRECTORY] [--texts=DIRECTORY]
-//   lexicor_bench --first-use    time and memory to the first results of a process
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
@@ -47,16 +46,18 @@ int main(int argc, char** argv) {
   Options options;
   if (!read_options(argc, argv, &options)) return 2;
   setenv("LOCPATH", LEXICOR_BENCH_GLIBC_DIR, 0);
+  bench::Table table(options.table);
+  bench::add_first_use_rows(&table, options.locale_directory);
   if (LXInit(options.locale_directory.c_str(), nullptr, nullptr, nullptr, 0) != LX_OK) {
     std::fprintf(stderr, "no locale directory: %s\n", options.locale_directory.c_str());
     return EXIT_FAILURE;
   }
-  bench::Table table(options.table);
   bench::Texts texts(options.text_directory);
   bench::add_conversion_rows(&table, &texts);
   bench::add_walking_rows(&table, &texts);
   bench::add_mapping_rows(&table, &texts);
   bench::add_collation_rows(&table, &texts);
+  bench::add_message_rows(&table, &texts);
   bench::add_formatting_rows(&table);
   table.print_sum();
   LXTerm();

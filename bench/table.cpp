@@ -106,7 +106,8 @@ void Table::print_head() {
   has_head_ = true;
 }
 
-void Table::print(const std::string& name, const std::vector<Measured>& peers, size_t chars, size_t calls) {
+void Table::print(const std::string& name, const std::vector<Measured>& peers, size_t chars, size_t calls,
+                  const std::string& note) {
   if (!has_head_) print_head();
   const double ours = peers.front().ns;
   const Measured* fastest = nullptr;
@@ -116,6 +117,7 @@ void Table::print(const std::string& name, const std::vector<Measured>& peers, s
   for (size_t i = 1; i < peers.size(); ++i)
     if (&peers[i] != fastest)
       others += (others.empty() ? "" : ", ") + figure(peers[i].ns / ours) + " " + peers[i].peer;
+  if (!note.empty()) others += (others.empty() ? "" : "; ") + note;
   const double times = fastest == nullptr ? 0 : fastest->ns / ours, goal = goal_of(name);
   const bool is_behind = fastest != nullptr && times < 1, is_missed = fastest != nullptr && times < goal;
   ++rows_, behind_ += is_behind, missed_ += is_missed;

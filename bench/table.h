@@ -70,7 +70,9 @@ class Table {
   /// Ends the program when a peer does not give what the first one gives.
   void add(const Row& row);
   /// Prints a row that was measured elsewhere, the first of `peers` ours, as `chars` characters in `calls` calls.
-  void print(const std::string& name, const std::vector<Measured>& peers, size_t chars, size_t calls);
+  /// `note` stands behind the peers.
+  void print(const std::string& name, const std::vector<Measured>& peers, size_t chars, size_t calls,
+             const std::string& note = "");
   /// The last line: how many rows are behind a peer, and how many miss their goal.
   void print_sum() const;
 

@@ -122,13 +122,13 @@ std::u16string Texts::make(const std::string& label) {
 }
 
 std::string Texts::read(const std::string& kind, const std::string& language) {
-  const std::string path = directory_ + "/" + kind + "." + code_of(language);
-  std::ifstream file(path, std::ios::binary);
+  const std::string file_path = path(kind + "." + code_of(language));
+  std::ifstream file(file_path, std::ios::binary);
   std::string bytes{std::istreambuf_iterator<char>(file), {}};
   if (bytes.empty())
     std::fprintf(stderr,
                  "%s: not there; its rows are left out. scripts/bench makes it, and names the package\n",
-                 path.c_str());
+                 file_path.c_str());
   return bytes;
 }
 

@@ -13,6 +13,9 @@ class Texts {
  public:
   explicit Texts(std::string directory) : directory_(std::move(directory)) {}
 
+  /// The path of a file of the directory.
+  std::string path(const std::string& name) const { return directory_ + "/" + name; }
+
   /// A long text by its label; empty, with a line on standard error, when its file is not there.
   ///   Russian           names and phrases, in random order
   ///   Russian-prose     the text of a guide
