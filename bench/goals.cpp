@@ -12,6 +12,10 @@ struct Goal {
 };
 constexpr Goal kGoals[] = {
     {"first-use/*", 3},
+    {"process/convert/*", 1.5},
+    {"process/sort/binary", 1},
+    {"process/lines", 0.7},
+    {"process/start", 0.8},
     {"convert/UTF-8/UTF-16/*/24B", 1.3},
     {"convert/UTF-16/UTF-8/*/24B", 1.3},
     {"convert/UTF-8/UTF-16/*", 1.6},
