@@ -15,6 +15,7 @@ void add_mapping_rows(Table* table, Texts* texts);
 void add_collation_rows(Table* table, Texts* texts);
 void add_message_rows(Table* table, Texts* texts);
 void add_formatting_rows(Table* table);
+void add_growth_rows(Table* table);
 void add_process_rows(Table* table, Texts* texts);
 
 }  // namespace bench

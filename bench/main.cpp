@@ -59,6 +59,7 @@ int main(int argc, char** argv) {
   bench::add_collation_rows(&table, &texts);
   bench::add_message_rows(&table, &texts);
   bench::add_formatting_rows(&table);
+  bench::add_growth_rows(&table);
   bench::add_process_rows(&table, &texts);
   table.print_sum();
   LXTerm();

@@ -13,6 +13,8 @@
 namespace bench {
 namespace {
 
+constexpr double kSteep = 1.5;  // below it the caches are seen: a byte of a long text takes longer
+
 double processor_ns() {
   timespec now{};
   clock_gettime(CLOCK_PROCESS_CPUTIME_ID, &now);
@@ -108,7 +110,6 @@ void Table::print_head() {
 
 void Table::print(const std::string& name, const std::vector<Measured>& peers, size_t chars, size_t calls,
                   const std::string& note) {
-  if (!has_head_) print_head();
   const double ours = peers.front().ns;
   const Measured* fastest = nullptr;
   for (size_t i = 1; i < peers.size(); ++i)
@@ -120,19 +121,39 @@ void Table::print(const std::string& name, const std::vector<Measured>& peers, s
   if (!note.empty()) others += (others.empty() ? "" : "; ") + note;
   const double times = fastest == nullptr ? 0 : fastest->ns / ours, goal = goal_of(name);
   const bool is_behind = fastest != nullptr && times < 1, is_missed = fastest != nullptr && times < goal;
-  ++rows_, behind_ += is_behind, missed_ += is_missed;
-  const std::string per_char = figure(ours / static_cast<double>(chars)),
-                    per_call = figure(ours / static_cast<double>(calls));
+  behind_ += is_behind, missed_ += is_missed;
   const std::string peer = fastest == nullptr ? "" : figure(times) + " " + fastest->peer;
   const std::string wanted = goal == 0 || fastest == nullptr ? "" : figure(goal);
-  const char* const mark = is_behind ? "behind" : is_missed ? "below goal" : "";
-  if (options_.markdown)
-    std::printf("| %s | %s | %s | %s | %s | %s | %s |\n", name.c_str(), per_char.c_str(), per_call.c_str(),
-                peer.c_str(), wanted.c_str(), others.c_str(), mark);
-  else
-    std::printf("%-44s %9s %9s  %-20s %5s  %-10s  %s\n", name.c_str(), per_char.c_str(), per_call.c_str(),
-                peer.c_str(), wanted.c_str(), mark, others.c_str());
+  print_cells(name, ours, chars, calls, peer, wanted,
+              is_behind   ? "behind"
+              : is_missed ? "below goal"
+                          : "",
+              others);
+}
+
+void Table::print_cells(const std::string& name, double ns, size_t chars, size_t calls, const std::string& peer,
+                        const std::string& goal, const std::string& mark, const std::string& others) {
+  if (!has_head_) print_head();
+  ++rows_;
+  const std::string per_char = figure(ns / static_cast<double>(chars)),
+                    per_call = figure(ns / static_cast<double>(calls));
+  std::printf(
+      options_.markdown ? "| %s | %s | %s | %s | %s | %s | %s |\n" : "%-44s %9s %9s  %-20s %5s  %-10s  %s\n",
+      name.c_str(), per_char.c_str(), per_call.c_str(), peer.c_str(), goal.c_str(), mark.c_str(),
+      others.c_str());
   std::fflush(stdout);
+}
+
+double Table::least_ns(const Work& work) const {
+  return measure({"", {{kOurs, work}}, 0, 0, 0}, options_).front().ns;
+}
+
+void Table::print_growth(const std::string& name, double ns, size_t chars, double exponent) {
+  const bool is_steep = exponent > kSteep;
+  steep_ += is_steep;
+  char note[64];
+  std::snprintf(note, sizeof(note), "to the power of %.2f", exponent);
+  print_cells(name, ns, chars, 1, "", "", is_steep ? "steep" : "", note);
 }
 
 void Table::print_sum() const {

@@ -73,15 +73,21 @@ class Table {
   /// `note` stands behind the peers.
   void print(const std::string& name, const std::vector<Measured>& peers, size_t chars, size_t calls,
              const std::string& note = "");
-  /// The last line: how many rows are behind a peer, and how many miss their goal.
+  /// The time of a pass of one peer alone.
+  double least_ns(const Work& work) const;
+  /// Prints a row of a call whose time grows with its text of `chars` characters to this power.
+  void print_growth(const std::string& name, double ns, size_t chars, double exponent);
+  /// The last line: how many rows are behind a peer, miss their goal, or grow faster than their text.
   void print_sum() const;
 
  private:
   void print_head();
+  void print_cells(const std::string& name, double ns, size_t chars, size_t calls, const std::string& peer,
+                   const std::string& goal, const std::string& mark, const std::string& others);
 
   TableOptions options_;
   bool has_head_ = false;
-  int rows_ = 0, behind_ = 0, missed_ = 0;
+  int rows_ = 0, behind_ = 0, missed_ = 0, steep_ = 0;
 };
 
 /// How many times our time the fastest peer is to take, at least; 0 where a row has no goal.
