@@ -1,5 +1,6 @@
 // Conversion beside ICU, iconv and libunistring. Each library is called as a program would that converts much:
 // converters stay open, and a string is one call that begins in the initial state.
+#include <algorithm>
 #include <map>
 
 #include "codepages.h"
@@ -110,7 +111,7 @@ std::u16string closed(const std::u16string& text, const Codepage& measure) {
 Input long_piece(const Codepage& measure, const Codepage& from, const std::u16string& text) {
   auto pieces = std::make_shared<Pieces>();
   const size_t bytes = measure.encode(text).size();
-  pieces->chars = bytes <= kLongBytes ? text.size() : text.size() * kLongBytes / bytes;
+  pieces->chars = std::min<size_t>(text.size(), uint64_t{text.size()} * kLongBytes / bytes);
   pieces->bytes = from.encode(closed(text.substr(0, pieces->chars), measure));
   pieces->ends = {pieces->bytes.size()};
   return pieces;

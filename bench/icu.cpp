@@ -49,6 +49,10 @@ std::shared_ptr<UCollator> open_collator(const char* language) {
 
 }  // namespace
 
+std::string versions() {
+  return ", ICU " U_ICU_VERSION ", libunistring " + unistring::version();
+}
+
 bool reads_and_writes(const Encoding& encoding, const std::string& bytes, char16_t c) {
   static std::pair<const Encoding*, Converter> last;
   if (last.first != &encoding) last = {&encoding, open(encoding)};

@@ -10,6 +10,9 @@
 
 namespace bench::icu {
 
+/// The versions of ICU and libunistring, each behind a comma; empty without them.
+std::string versions();
+
 /// Whether ICU writes a character as these bytes, and reads them as this character; true without ICU.
 bool reads_and_writes(const Encoding& encoding, const std::string& bytes, char16_t c);
 
@@ -57,6 +60,8 @@ Reader<double> time_reader(const char* territory, const char16_t* pattern);
 }  // namespace bench::icu
 
 namespace bench::unistring {
+
+std::string version();
 
 /// u8_to_u16 and u16_to_u8.
 Work convert(const Input& input, const Encoding& from, const Encoding& to);

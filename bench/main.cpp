@@ -1,11 +1,16 @@
 // lexicor_bench: the library beside its peers on real texts, in one table.
 //
 //   lexicor_bench [--rows=PART_OF_NAME]... [--markdown] [--turns=N] [--locale=DIRECTORY] [--texts=DIRECTORY]
+#include <gnu/libc-version.h>
+
+#include <algorithm>
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <fstream>
 
 #include "families.h"
+#include "icu.h"
 #include "lx.h"
 
 namespace {
@@ -22,6 +27,16 @@ bool takes(const char* argument, const char* option, std::string* value) {
   if (strncmp(argument, option, bytes) != 0) return false;
   *value = argument + bytes;
   return true;
+}
+
+/// What the figures depend on, in a line.
+void print_machine() {
+  std::ifstream file("/proc/cpuinfo");
+  std::string line, processor = "unknown processor";
+  while (std::getline(file, line))
+    if (line.compare(0, 10, "model name") == 0) processor = line.substr(line.find(':') + 2);
+  std::printf("%s, GCC %s, glibc %s%s, %d-bit.\n\n", processor.c_str(), __VERSION__, gnu_get_libc_version(),
+              bench::icu::versions().c_str(), static_cast<int>(8 * sizeof(void*)));
 }
 
 bool read_options(int argc, char** argv, Options* options) {
@@ -46,6 +61,7 @@ int main(int argc, char** argv) {
   Options options;
   if (!read_options(argc, argv, &options)) return 2;
   setenv("LOCPATH", LEXICOR_BENCH_GLIBC_DIR, 0);
+  if (options.table.markdown) print_machine();
   bench::Table table(options.table);
   bench::add_first_use_rows(&table, options.locale_directory);
   if (LXInit(options.locale_directory.c_str(), nullptr, nullptr, nullptr, 0) != LX_OK) {

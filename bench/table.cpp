@@ -157,8 +157,8 @@ void Table::print_growth(const std::string& name, double ns, size_t chars, doubl
 }
 
 void Table::print_sum() const {
-  std::printf("%s%d rows, %d behind a peer, %d below their goal\n", options_.markdown ? "\n" : "", rows_,
-              behind_, missed_);
+  std::printf("%s%d rows, %d behind a peer, %d below their goal, %d steep\n", options_.markdown ? "\n" : "",
+              rows_, behind_, missed_, steep_);
 }
 
 }  // namespace bench

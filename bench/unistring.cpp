@@ -1,10 +1,15 @@
 #include <unicase.h>
 #include <unistr.h>
+#include <unistring/version.h>
 
 #include "icu.h"
 #include "keep.h"
 
 namespace bench::unistring {
+
+std::string version() {
+  return std::to_string(_libunistring_version >> 16) + "." + std::to_string(_libunistring_version >> 8 & 0xFF);
+}
 
 Work convert(const Input& input, const Encoding& from, const Encoding& to) {
   if (is_utf8(from) && is_utf16(to))
