@@ -101,8 +101,8 @@ void Table::add(const Row& row) {
 void Table::print_head() {
   if (options_.markdown)
     std::printf(
-        "| Row | ns a character | ns a call | fastest peer takes | goal | others | "
-        "|\n|---|---|---|---|---|---|---|\n");
+        "| Row | ns a character | ns a call | fastest peer takes | goal | | others |\n"
+        "|---|---|---|---|---|---|---|\n");
   else
     std::printf("%-44s %9s %9s  %-20s %5s\n", "row", "ns/char", "ns/call", "fastest peer takes", "goal");
   has_head_ = true;
