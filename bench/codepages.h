@@ -30,8 +30,8 @@ using LocalePointer = std::shared_ptr<LXLocale>;
 /// A locale of this name, or null with a line on standard error.
 LocalePointer open_locale(const std::string& name);
 
-/// An encoding with what the libraries need to turn text into it: the locale (not for UTF-16) and, to see on which
-/// characters they agree, descriptors.
+/// An encoding with what the libraries need to turn text into it: the locale (not for UTF-16) and, to see on
+/// which characters they agree, descriptors.
 class Codepage {
  public:
   /// Null, with a line on standard error, when the library or iconv does not have it.

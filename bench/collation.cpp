@@ -1,5 +1,6 @@
-// Collation beside ICU and glibc on the words of dictionaries: compared in random pairs and with their neighbours in
-// sorted order, sorted, and made into keys. Comparison by code value without case, and search, stand beside them.
+// Collation beside ICU and glibc on the words of dictionaries: compared in random pairs and with their
+// neighbours in sorted order, sorted, and made into keys. Comparison by code value without case, and search,
+// stand beside them.
 #include <string.h>
 
 #include <cstdio>

@@ -1,5 +1,5 @@
-// Time and memory from a fresh process to the first conversion, comparison and amount. Each turn is a process of its
-// own: forked, so that the program is loaded and nothing of a library has been used.
+// Time and memory from a fresh process to the first conversion, comparison and amount. Each turn is a process
+// of its own: forked, so that the program is loaded and nothing of a library has been used.
 #include <locale.h>
 #include <monetary.h>
 #include <sys/wait.h>

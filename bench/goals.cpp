@@ -1,4 +1,5 @@
-// How many times our time the fastest peer of a row is to take. The first pattern that fits a row's name counts.
+// How many times our time the fastest peer of a row is to take. The first pattern that fits a row's name
+// counts.
 #include <fnmatch.h>
 
 #include "table.h"

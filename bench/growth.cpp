@@ -1,10 +1,9 @@
-// How the time of a call grows with its text, on texts that ask most of it. A row gives the time at the largest size
-// and the exponent of the growth between the last two sizes: 1 is a time in proportion to the text.
+// How the time of a call grows with its text, on texts that ask most of it. A row gives the time at the largest
+// size and the exponent of the growth between the last two sizes: 1 is a time in proportion to the text.
 #include <algorithm>
 #include <cmath>
 #include <cstdio>
 #include <cstring>
-#include <limits>
 #include <map>
 
 #include "codepages.h"
@@ -87,7 +86,8 @@ Make find_units(const char* name, char16_t letter, char16_t last, uint32_t optio
   };
 }
 
-/// Two texts that differ in case, or in width, at their beginning and otherwise at their end, compared in the form for bytes.
+/// Two texts that differ in case, or in width, at their beginning and otherwise at their end, compared in the
+/// form for bytes.
 using Compare = int32_t (*)(LXLocale*, const char*, int32_t, const char*, int32_t, uint32_t);
 Make compared(Compare compare, const char* name, const std::string& unit, const std::string& end,
               const std::string& other_end, uint32_t options) {
@@ -266,7 +266,8 @@ size_t walk_weights(const char* name, const std::string& text) {
   return sets;
 }
 
-/// A call on text that changes its shift state at each character; `output` has eight bytes for each of its bytes.
+/// A call on text that changes its shift state at each character; `output` has eight bytes for each of its
+/// bytes.
 using ShiftedCall = int32_t (*)(const std::string& text, std::string* output);
 Make shifted(ShiftedCall call) {
   return [=](size_t size) -> Work {

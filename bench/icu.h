@@ -27,7 +27,8 @@ Work map(const Input& input, const Encoding& encoding, const char* language, boo
 Work count_chars(const Input& input, const Encoding& encoding);
 /// Their code points too: with U8_NEXT, or ucnv_getNextUChar.
 Work walk(const Input& input, const Encoding& encoding);
-/// Comparison and keys by a language's order, with punctuation on the fourth level as the shipped sorts have it.
+/// Comparison and keys by a language's order, with punctuation on the fourth level as the shipped sorts have
+/// it.
 Work order_utf16(Order order, const Words& words, const char* language);
 Work order_utf8(Order order, const Words& words, const char* language);
 Work keys(const Words& words, const char* language);
@@ -41,8 +42,8 @@ Work messages(const std::string& directory, const Encoding* encoding, const std:
 /// Opens a converter, a collator and a format for German, and uses each once; false when that fails.
 std::function<bool()> first_use(const char* word, const char* other, double amount);
 
-/// What writes a number or a moment as UTF-16 to a buffer of `room` units, and gives the units. `territory` is a locale
-/// as "de_DE". In a build without ICU they are empty, as are the readers.
+/// What writes a number or a moment as UTF-16 to a buffer of `room` units, and gives the units. `territory` is
+/// a locale as "de_DE". In a build without ICU they are empty, as are the readers.
 template <class Value>
 using Writer = std::function<int32_t(Value value, char16_t* output, int32_t room)>;
 Writer<int32_t> integer_writer(const char* territory);

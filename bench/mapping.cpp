@@ -1,5 +1,5 @@
-// Upper and lower case beside ICU, libunistring and glibc's towupper and towlower, with the special mappings of the
-// text's language.
+// Upper and lower case beside ICU, libunistring and glibc's towupper and towlower, with the special mappings of
+// the text's language.
 #include <locale.h>
 #include <wchar.h>
 #include <wctype.h>
@@ -104,7 +104,8 @@ class SubjectRows {
              subject_.system == nullptr ? nullptr : glibc_peer(input, encoding, subject_.system, is_upper_)}};
   }
 
-  /// The characters that all libraries map alike behind a letter: the form of some depends on what stands there.
+  /// The characters that all libraries map alike behind a letter: the form of some depends on what stands
+  /// there.
   std::u16string mapped_alike(const std::u16string& text) const {
     std::map<char16_t, bool> known;
     std::u16string kept;

@@ -1,5 +1,5 @@
-// The command line beside the programs that do the same. A program's time is the processor time that the system took
-// down for it; the time that passed stands in the note.
+// The command line beside the programs that do the same. A program's time is the processor time that the system
+// took down for it; the time that passed stands in the note.
 #include <fcntl.h>
 #include <spawn.h>
 #include <sys/resource.h>

@@ -1,5 +1,5 @@
-// Peers take turns, in which each does its work for some milliseconds, and the shortest turn of each counts: on a
-// shared machine the minimum is what can be compared.
+// Peers take turns, in which each does its work for some milliseconds, and the shortest turn of each counts: on
+// a shared machine the minimum is what can be compared.
 #include "table.h"
 
 #include <time.h>
@@ -67,7 +67,8 @@ const Peer* differing(const std::vector<Peer>& peers, size_t room, Same same) {
   const size_t size = peers.front().work(expected.data());
   if (size == 0) return &peers.front();
   for (const Peer& peer : peers) {
-    if (!peer.work) continue;
+    if (!peer.work || !peer.is_rival) continue;
+    std::fill(output.begin(), output.end(), '\0');
     const size_t given = peer.work(output.data());
     if (same == Same::kNothing) continue;
     if (given != size) return &peer;
@@ -124,11 +125,8 @@ void Table::print(const std::string& name, const std::vector<Measured>& peers, s
   behind_ += is_behind, missed_ += is_missed;
   const std::string peer = fastest == nullptr ? "" : figure(times) + " " + fastest->peer;
   const std::string wanted = goal == 0 || fastest == nullptr ? "" : figure(goal);
-  print_cells(name, ours, chars, calls, peer, wanted,
-              is_behind   ? "behind"
-              : is_missed ? "below goal"
-                          : "",
-              others);
+  const char* const shortfall = is_missed ? "below goal" : "";
+  print_cells(name, ours, chars, calls, peer, wanted, is_behind ? "behind" : shortfall, others);
 }
 
 void Table::print_cells(const std::string& name, double ns, size_t chars, size_t calls, const std::string& peer,

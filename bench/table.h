@@ -14,9 +14,9 @@ namespace bench {
 using Work = std::function<size_t(char* output)>;
 
 struct Peer {
-  const char* name;  // kOurs first
-  Work work;         // empty: this one cannot
-  bool is_rival = true;
+  const char* name;      // kOurs first
+  Work work;             // empty: this one cannot
+  bool is_rival = true;  // must give the same, and can be ahead
 };
 inline constexpr const char* kOurs = "lexicor";
 inline constexpr const char* kWrapped = "lexicor.hpp";
@@ -32,8 +32,8 @@ enum class Same {
   kNothing,  // the row has seen to it
 };
 
-/// The first peer that does not give what the first one of all gives, with `room` bytes for each output; null when all
-/// do, and the front one itself when it gives nothing.
+/// The first rival that does not give what the first one of all gives, with `room` bytes for each output; null
+/// when all do, and the front one itself when it gives nothing.
 const Peer* differing(const std::vector<Peer>& peers, size_t room, Same same);
 
 struct Row {
@@ -69,8 +69,8 @@ class Table {
   bool wants_some(const std::string& beginning) const;
   /// Ends the program when a peer does not give what the first one gives.
   void add(const Row& row);
-  /// Prints a row that was measured elsewhere, the first of `peers` ours, as `chars` characters in `calls` calls.
-  /// `note` stands behind the peers.
+  /// Prints a row that was measured elsewhere, the first of `peers` ours, as `chars` characters in `calls`
+  /// calls. `note` stands behind the peers.
   void print(const std::string& name, const std::vector<Measured>& peers, size_t chars, size_t calls,
              const std::string& note = "");
   /// The time of a pass of one peer alone.
@@ -101,8 +101,8 @@ struct Pieces {
 };
 using Input = std::shared_ptr<const Pieces>;
 
-/// The work of calling `step(input, bytes, output)`, which gives the bytes written, for every piece; each writes
-/// behind the one before it.
+/// The work of calling `step(input, bytes, output)`, which gives the bytes written, for every piece; each
+/// writes behind the one before it.
 template <class Step>
 Work for_each_piece(const Input& input, Step step) {
   return [input, step](char* output) {

@@ -23,8 +23,8 @@ class Texts {
   ///   sparse-Japanese   ASCII with one character of the language in 200
   const std::u16string& find(const std::string& label);
 
-  /// The words of a language in random order, each once and those of letters alone: libraries part on punctuation.
-  /// Empty as above.
+  /// The words of a language in random order, each once and those of letters alone: libraries part on
+  /// punctuation. Empty as above.
   std::vector<std::u16string> words(const std::string& language);
 
  private:
