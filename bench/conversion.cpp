@@ -111,7 +111,8 @@ std::u16string closed(const std::u16string& text, const Codepage& measure) {
 Input long_piece(const Codepage& measure, const Codepage& from, const std::u16string& text) {
   auto pieces = std::make_shared<Pieces>();
   const size_t bytes = measure.encode(text).size();
-  pieces->chars = std::min<size_t>(text.size(), uint64_t{text.size()} * kLongBytes / bytes);
+  pieces->chars =
+      static_cast<size_t>(std::min<uint64_t>(text.size(), uint64_t{text.size()} * kLongBytes / bytes));
   pieces->bytes = from.encode(closed(text.substr(0, pieces->chars), measure));
   pieces->ends = {pieces->bytes.size()};
   return pieces;
