@@ -290,6 +290,20 @@ int32_t shifted_truncation(const std::string& text, std::string* output) {
   return LXTruncateStringEx(locale(kShift), output->data(), LX_SHIFT_SINGLE, length(text.size()),
                             LX_DROP_FULL_BLANKS);
 }
+int32_t shifted_mapping(const std::string& text, std::string* output) {
+  return LXMapStringEx(locale(kShift), output->data(), length(output->size()), text.data(), length(text.size()),
+                       LX_MAP_LOWER);
+}
+int32_t shifted_count(const std::string& text, std::string*) {
+  return LXNumCharsEx(locale(kShift), text.data(), LX_SHIFT_SINGLE, length(text.size()));
+}
+/// With a small letter in place of the first one.
+int32_t shifted_comparison(const std::string& text, std::string* output) {
+  memcpy(output->data(), text.data(), text.size());
+  output->front() = '\x81';
+  return LXStrcollEx(locale(kShift), text.data(), LX_SHIFT_SINGLE, length(text.size()), output->data(),
+                     LX_SHIFT_SINGLE, length(text.size()), 0);
+}
 Make shifted_tokens() {
   return [=](size_t size) -> Work {
     return [text = repeat(kEbcdicA + kShifted, size)](char*) {
@@ -330,6 +344,12 @@ std::vector<Case> make_cases() {
                           return count(LXStrcpy(locale(kUtf8), copy.data(), length(copy.size()), t.data(),
                                                 length(t.size()), 0));
                         })},
+      {"LXStrcpy/characters", read(kUmlaut,
+                                   [](const std::string& t) {
+                                     std::string copy(t.size(), '\0');
+                                     return count(LXStrcpy(locale(kUtf8), copy.data(), length(copy.size() / 2),
+                                                           t.data(), length(t.size() / 2), LX_CHARACTERS));
+                                   })},
       {"LXStrcat/to a long string", read(kUmlaut,
                                          [](const std::string& t) {
                                            std::string all = t + '\0' + "    ";
@@ -368,6 +388,8 @@ std::vector<Case> make_cases() {
       {"LXStrtok/empty ones", tokens(kUtf8, ",", ",", 0)},
       {"LXTruncateString/blanks",
        read("  ", [](const std::string& t) { return truncated(kUtf8, t, LX_DROP_BLANKS); })},
+      {"LXTruncateString/characters",
+       read(kUmlaut, [](const std::string& t) { return truncated(kUtf8, t, LX_CHARACTERS | LX_DROP_BLANKS); })},
       {"LXTruncateString/wide blanks",
        read("\x81\x40", [](const std::string& t) { return truncated(kDoubleByte, t, LX_DROP_FULL_BLANKS); })},
       {"LXStrcmp/caseless", compared(LXStrcmp, kUtf8, kUmlaut + "A", "a", "b", LX_CASE_INSENSITIVE)},
@@ -396,6 +418,9 @@ std::vector<Case> make_cases() {
       {"LXStrtokEx/shifted", shifted_tokens()},
       {"LXStrxfrmEx/shifted", shifted(shifted_key)},
       {"LXConvertStringEx/shifted", shifted(shifted_conversion)},
+      {"LXMapStringEx/shifted", shifted(shifted_mapping)},
+      {"LXStrcollEx/shifted", shifted(shifted_comparison)},
+      {"LXNumCharsEx/shifted", shifted(shifted_count)},
       {"LXTruncateStringEx/shifted", shifted(shifted_truncation)},
       {"LXMapString/upper", mapped(kUtf8, kUmlaut, LX_MAP_UPPER)},
       {"LXMapString/upper, special", mapped(kUtf8, kSharp, LX_MAP_UPPER)},

@@ -91,7 +91,8 @@ bool Table::wants_some(const std::string& beginning) const {
 }
 
 void Table::add(const Row& row) {
-  if (!wants(row.name)) return;
+  const auto is_other = [](const Peer& peer) { return peer.name != kOurs && peer.is_rival && peer.work; };
+  if (!wants(row.name) || std::none_of(row.peers.begin(), row.peers.end(), is_other)) return;
   if (const Peer* const peer = differing(row.peers, row.room, row.same)) {
     std::fprintf(stderr, "%s: %s gives something else\n", row.name.c_str(), peer->name);
     std::exit(1);
@@ -150,7 +151,7 @@ void Table::print_growth(const std::string& name, double ns, size_t chars, doubl
   const bool is_steep = exponent > kSteep;
   steep_ += is_steep;
   char note[64];
-  std::snprintf(note, sizeof(note), "to the power of %.2f", exponent);
+  std::snprintf(note, sizeof(note), "%zu characters to the power of %.2f", chars, exponent);
   print_cells(name, ns, chars, 1, "", "", is_steep ? "steep" : "", note);
 }
 

@@ -67,7 +67,7 @@ class Table {
   bool wants(const std::string& name) const;
   /// Whether a row can be whose name begins with this.
   bool wants_some(const std::string& beginning) const;
-  /// Ends the program when a peer does not give what the first one gives.
+  /// Passes over a row without a rival. Ends the program when a rival does not give what the first one gives.
   void add(const Row& row);
   /// Prints a row that was measured elsewhere, the first of `peers` ours, as `chars` characters in `calls`
   /// calls. `note` stands behind the peers.
