@@ -21,23 +21,23 @@ namespace {
 constexpr size_t kValues = 500;
 constexpr int32_t kRoomUnits = 128;  // for one text
 
-enum class Encoding { kCodepage, kUtf8, kUtf16 };
+enum class Form { kCodepage, kUtf8, kUtf16 };
 
 struct Text {
   const char* label;
   const char* locale;
-  Encoding encoding;  // kCodepage or kUtf16: the form that is called
+  Form form;  // kCodepage or kUtf16: the form that is called
   const char* icu;
   const char* glibc;  // null: no peer
   char decimal;
   const char16_t* icu_date_time;  // what %c makes
 };
 constexpr Text kTexts[] = {
-    {"English/Latin1", "English_UnitedStates.Latin1", Encoding::kCodepage, "en_US", "en_US.UTF-8", '.',
+    {"English/Latin1", "English_UnitedStates.Latin1", Form::kCodepage, "en_US", "en_US.UTF-8", '.',
      u"M/d/yy h:mm:ss a"},
-    {"German/UTF-8", "German_Germany.UTF-8", Encoding::kCodepage, "de_DE", "de_DE.UTF-8", ',',
+    {"German/UTF-8", "German_Germany.UTF-8", Form::kCodepage, "de_DE", "de_DE.UTF-8", ',',
      u"dd.MM.yy HH:mm:ss"},
-    {"German/UTF-16", "German_Germany.UTF-8", Encoding::kUtf16, "de_DE", nullptr, ',', u"dd.MM.yy HH:mm:ss"},
+    {"German/UTF-16", "German_Germany.UTF-8", Form::kUtf16, "de_DE", nullptr, ',', u"dd.MM.yy HH:mm:ss"},
 };
 
 /// A format of times as each library writes it.
@@ -145,12 +145,12 @@ class RowMaker {
   /// A peer that writes value `i` with `call(i, output)`, which gives the bytes. `same`: its texts are those of
   /// the first peer.
   template <class Call>
-  void writer(const char* name, locale_t system, Encoding encoding, bool same, Call call) {
+  void writer(const char* name, locale_t system, Form form, bool same, Call call) {
     const locale_t before = uselocale(system);
     std::vector<std::u16string> texts;
     for (size_t i = 0; i < kValues; ++i) {
       alignas(char16_t) char out[sizeof(char16_t) * kRoomUnits];
-      texts.push_back(decoded(std::string(out, call(i, out)), encoding));
+      texts.push_back(decoded(std::string(out, call(i, out)), form));
       if (same && !texts_.empty() && texts[i] != texts_[i]) stop(name, i);
     }
     uselocale(before);
@@ -188,11 +188,11 @@ class RowMaker {
   }
 
   /// ICU writes spaces that do not break.
-  std::u16string decoded(const std::string& bytes, Encoding encoding) const {
+  std::u16string decoded(const std::string& bytes, Form form) const {
     std::u16string text(bytes.size(), u'\0');
-    if (encoding == Encoding::kUtf8)
+    if (form == Form::kUtf8)
       text = to_utf16(bytes);
-    else if (encoding == Encoding::kUtf16)
+    else if (form == Form::kUtf16)
       text.assign(reinterpret_cast<const char16_t*>(bytes.data()), bytes.size() / 2);
     else
       text.resize(count(LXStringToUnicode(lx_units(reinterpret_cast<char*>(text.data())), length(text.size()),
@@ -250,23 +250,23 @@ class TextRows {
   /// Our writer in the form of the text.
   template <class Bytes, class Units>
   void ours(Bytes bytes, Units units) {
-    if (text_.encoding == Encoding::kUtf16)
-      make_.writer(kOurs, nullptr, Encoding::kUtf16, true, [owner = owner_, units](size_t i, char* out) {
+    if (text_.form == Form::kUtf16)
+      make_.writer(kOurs, nullptr, Form::kUtf16, true, [owner = owner_, units](size_t i, char* out) {
         return 2 * count(units(owner.get(), i, lx_units(out)));
       });
     else
-      make_.writer(kOurs, nullptr, Encoding::kCodepage, true,
+      make_.writer(kOurs, nullptr, Form::kCodepage, true,
                    [owner = owner_, bytes](size_t i, char* out) { return count(bytes(owner.get(), i, out)); });
   }
   /// `exact`: the texts are ours.
   template <class Call>
   void glibc(bool exact, Call call) {
-    if (system_ != nullptr) make_.writer(kGlibc, system_.get(), Encoding::kUtf8, exact, call);
+    if (system_ != nullptr) make_.writer(kGlibc, system_.get(), Form::kUtf8, exact, call);
   }
   template <class Value>
   void icu_peer(const icu::Writer<Value>& writer, const std::vector<Value>& values) {
     if (!writer) return;
-    make_.writer(kIcu, nullptr, Encoding::kUtf16, true, [writer, &values](size_t i, char* out) {
+    make_.writer(kIcu, nullptr, Form::kUtf16, true, [writer, &values](size_t i, char* out) {
       return 2 * count(writer(values[i], reinterpret_cast<char16_t*>(out), kRoomUnits));
     });
   }
@@ -314,7 +314,7 @@ class TextRows {
                const std::vector<double>& icu_expected, Bytes bytes, Units units, System system,
                const Icu& icu_reader) {
     make_.set_input(in->utf16);
-    if (text_.encoding == Encoding::kUtf16)
+    if (text_.form == Form::kUtf16)
       make_.reader(kOurs, nullptr, expected,
                    [owner = owner_, in, units](size_t i) { return units(owner.get(), in->utf16[i]); });
     else
