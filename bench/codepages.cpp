@@ -1,140 +1,135 @@
-// Opening the converters, and the characters on which all libraries agree.
 #include "codepages.h"
 
-#include <unicode/ucnv_err.h>
-
+#include <algorithm>
 #include <cstdio>
 #include <cstring>
+#include <map>
+
+#include "icu.h"
+#include "texts.h"
 
 namespace bench {
 namespace {
 
+constexpr size_t kCharRoom = 16;
 const iconv_t kNoDescriptor = reinterpret_cast<iconv_t>(-1);
 
-/// The object's name in the locale directory; empty when it has none.
-std::string object_name(const CodepageName& name) {
-  int32_t rc = LX_OK;
-  const LXObject* object = name.object != nullptr
-                               ? LXGetObjFromName(nullptr, LX_CODEPAGE, name.object,
-                                                  static_cast<int32_t>(strlen(name.object)), LX_FIND_ONLY, &rc)
-                               : LXGetObjFromID(nullptr, LX_CODEPAGE, name.id, LX_FIND_ONLY, &rc);
-  const auto* disk = reinterpret_cast<const LXObjDisk*>(object);
-  return disk != nullptr && disk->type == LX_CODEPAGE ? disk->name : "";
-}
-
-UConverter* open_icu(const char* name) {
-  UErrorCode error = U_ZERO_ERROR;
-  UConverter* icu = ucnv_open(name, &error);
-  if (U_FAILURE(error)) return nullptr;
-  ucnv_setToUCallBack(icu, UCNV_TO_U_CALLBACK_STOP, nullptr, nullptr, nullptr, &error);
-  ucnv_setFromUCallBack(icu, UCNV_FROM_U_CALLBACK_STOP, nullptr, nullptr, nullptr, &error);
-  return icu;
-}
-
-constexpr size_t kCharRoom = 16;
-
-std::string icu_bytes(UConverter* icu, char16_t c) {
-  char bytes[kCharRoom];
-  UErrorCode error = U_ZERO_ERROR;
-  const int32_t n = ucnv_fromUChars(icu, bytes, sizeof(bytes), &c, 1, &error);
-  return U_FAILURE(error) ? std::string() : std::string(bytes, static_cast<size_t>(n));
-}
-
-bool icu_reads(UConverter* icu, const std::string& bytes, char16_t c) {
-  char16_t units[kCharRoom];
-  UErrorCode error = U_ZERO_ERROR;
-  const int32_t n =
-      ucnv_toUChars(icu, units, kCharRoom, bytes.data(), static_cast<int32_t>(bytes.size()), &error);
-  return U_SUCCESS(error) && n == 1 && units[0] == c;
-}
-
-bool iconv_gives(iconv_t descriptor, const void* input, size_t input_bytes, const void* expected,
-                 size_t expected_bytes) {
-  char bytes[kCharRoom];
-  char* end = bytes;
-  size_t room = sizeof(bytes);
-  if (!run_iconv(descriptor, static_cast<const char*>(input), input_bytes, &end, &room)) return false;
-  return sizeof(bytes) - room == expected_bytes && memcmp(bytes, expected, expected_bytes) == 0;
-}
+constexpr Encoding kEncodings[] = {
+    {"UTF-16", "UTF-16LE", "UTF-16LE", false},
+    {"UTF-8", "UTF-8", "UTF-8", false},
+    {"Latin1", "ISO-8859-1", "ISO-8859-1", false},
+    {"IBM1141", "ibm-1141", "IBM1141", false},
+    {"MS1251", "ibm-5347_P100-1998", "CP1251", false},
+    {"KOI8-R", "KOI8-R", "KOI8-R", false},
+    {"MS1253", "ibm-5349_P100-1998", "CP1253", false},
+    {"MS874", "windows-874-2000", "CP874", false},
+    {"MS932", "ibm-943_P15A-2003", "CP932", false},
+    {"JapanEUC", "ibm-33722_P12A_P12A-2009_U2", "EUC-JP-MS", false},
+    {"MS936", "windows-936-2000", "CP936", false},
+    {"MS949", "windows-949-2000", "CP949", false},
+    {"EUC-KR", "ibm-970_P110_P110-2006_U2", "EUC-KR", false},
+    {"MS950", "windows-950-2000", "CP950", false},
+    {"IBM930", "ibm-930", "IBM930", true},
+    {"IBM939", "ibm-939", "IBM939", true},
+};
 
 }  // namespace
 
-const std::vector<CodepageName>& codepage_names() {
-  static const std::vector<CodepageName> kNames = {
-      {"Latin1", 819, "Latin1", "ISO-8859-1", "ISO-8859-1", false, {Language::kGerman}},
-      {"MS1251", 1251, "MS1251", "ibm-5347_P100-1998", "CP1251", false, {Language::kRussian}},
-      {"MS932", 932, "MS932", "ibm-943_P15A-2003", "CP932", false, {Language::kJapanese}},
-      {"MS936", 936, "MS936", "windows-936-2000", "CP936", false, {Language::kChinese}},
-      {"930", 930, nullptr, "ibm-930", "IBM930", true, {Language::kJapanese}},
-      {"939", 939, nullptr, "ibm-939", "IBM939", true, {Language::kJapanese}},
-      {"UTF-8",
-       57352,
-       "UTF-8",
-       "UTF-8",
-       "UTF-8",
-       false,
-       {Language::kGerman, Language::kRussian, Language::kJapanese, Language::kChinese}},
-  };
-  return kNames;
-}
-
-std::unique_ptr<Codepage> Codepage::open(const CodepageName& name) {
-  std::unique_ptr<Codepage> codepage(new Codepage(name));
-  if (codepage->open_all()) return codepage;
-  std::fprintf(stderr, "%s: not in the locale directory, ICU or iconv; its rows are left out\n", name.label);
+const Encoding* find_encoding(const char* label) {
+  for (const Encoding& encoding : kEncodings)
+    if (strcmp(encoding.label, label) == 0) return &encoding;
   return nullptr;
 }
 
-bool Codepage::open_all() {
-  const std::string object = object_name(name_);
-  if (!object.empty()) locale_ = LXGetLocale(("English." + object).c_str(), 0, nullptr);
-  icu_ = open_icu(name_.icu);
-  to_utf16_ = iconv_open("UTF-16LE", name_.iconv);
-  from_utf16_ = iconv_open(name_.iconv, "UTF-16LE");
-  to_utf8_ = iconv_open("UTF-8", name_.iconv);
-  from_utf8_ = iconv_open(name_.iconv, "UTF-8");
-  return locale_ != nullptr && icu_ != nullptr && to_utf16_ != kNoDescriptor && from_utf16_ != kNoDescriptor &&
-         to_utf8_ != kNoDescriptor && from_utf8_ != kNoDescriptor;
+bool is_utf16(const Encoding& encoding) {
+  return strcmp(encoding.label, "UTF-16") == 0;
+}
+bool is_utf8(const Encoding& encoding) {
+  return strcmp(encoding.label, "UTF-8") == 0;
+}
+
+LocalePointer open_locale(const std::string& name) {
+  int32_t rc = LX_OK;
+  LocalePointer locale(LXGetLocale(name.c_str(), 0, &rc), LXReleaseLocale);
+  if (locale == nullptr) std::fprintf(stderr, "no locale %s (%d); its rows are left out\n", name.c_str(), rc);
+  return locale;
+}
+
+std::shared_ptr<const Codepage> Codepage::open(const Encoding& encoding) {
+  const std::shared_ptr<Codepage> codepage(new Codepage(encoding));
+  if (is_utf16(encoding)) return codepage;
+  codepage->locale_ = open_locale(std::string("English.") + encoding.label);
+  codepage->to_utf16_ = iconv_open("UTF-16LE", encoding.iconv);
+  codepage->from_utf16_ = iconv_open(encoding.iconv, "UTF-16LE");
+  if (codepage->locale_ != nullptr && codepage->to_utf16_ != kNoDescriptor &&
+      codepage->from_utf16_ != kNoDescriptor)
+    return codepage;
+  std::fprintf(stderr, "%s: not in the locale directory or iconv; its rows are left out\n", encoding.label);
+  return nullptr;
 }
 
 Codepage::~Codepage() {
-  LXReleaseLocale(locale_);
-  ucnv_close(icu_);
-  for (iconv_t descriptor : {to_utf16_, from_utf16_, to_utf8_, from_utf8_})
-    if (descriptor != kNoDescriptor) iconv_close(descriptor);
-}
-
-bool Codepage::is_utf8() const {
-  return strcmp(name_.label, "UTF-8") == 0;
+  for (iconv_t descriptor : {to_utf16_, from_utf16_})
+    if (descriptor != nullptr && descriptor != kNoDescriptor) iconv_close(descriptor);
 }
 
 std::string Codepage::encode(const std::u16string& text) const {
+  if (is_utf16(encoding_)) return utf16_bytes(text);
   std::string bytes(4 * text.size() + 2, '\0');
-  const int32_t size = static_cast<int32_t>(bytes.size());
   const auto* units = reinterpret_cast<const LXUChar*>(text.data());
-  const int32_t n = LXUnicodeToStringEx(locale_, bytes.data(), LX_SHIFT_SINGLE, size, units,
-                                        static_cast<int32_t>(text.size()), LX_TERMINATE);
+  const int32_t n = LXUnicodeToStringEx(locale_.get(), bytes.data(), LX_SHIFT_SINGLE, length(bytes.size()),
+                                        units, length(text.size()), LX_TERMINATE);
   bytes.resize(n > 0 ? static_cast<size_t>(n) - 1 : 0);
   return bytes;
 }
 
-size_t Codepage::agreed_bytes(char16_t c) const {
+bool Codepage::is_agreed(char16_t c) const {
+  if (is_utf16(encoding_)) return true;
   const std::string bytes = encode(std::u16string(1, c));
   LXUChar back[2] = {};
-  const int32_t units = LXStringToUnicodeEx(back, 2, locale_, bytes.data(), LX_SHIFT_SINGLE,
-                                            static_cast<int32_t>(bytes.size()), 0);
-  if (units != 1 || back[0] != c || icu_bytes(icu_, c) != bytes || !icu_reads(icu_, bytes, c)) return 0;
-  if (!iconv_gives(from_utf16_, &c, sizeof(c), bytes.data(), bytes.size())) return 0;
-  if (!iconv_gives(to_utf16_, bytes.data(), bytes.size(), &c, sizeof(c))) return 0;
-  const bool shifted = name_.stateful && bytes.size() > 1;
-  return bytes.size() - (shifted ? 2 : 0);
+  const int32_t units =
+      LXStringToUnicodeEx(back, 2, locale_.get(), bytes.data(), LX_SHIFT_SINGLE, length(bytes.size()), 0);
+  if (units != 1 || back[0] != c || !icu::reads_and_writes(encoding_, bytes, c)) return false;
+  char out[kCharRoom];
+  if (run_iconv(from_utf16_, reinterpret_cast<const char*>(&c), sizeof(c), out, kCharRoom) != bytes.size() ||
+      memcmp(out, bytes.data(), bytes.size()) != 0)
+    return false;
+  return run_iconv(to_utf16_, bytes.data(), bytes.size(), out, kCharRoom) == sizeof(c) &&
+         memcmp(out, &c, sizeof(c)) == 0;
 }
 
-bool run_iconv(iconv_t descriptor, const char* input, size_t input_bytes, char** output, size_t* room) {
-  char* in = const_cast<char*>(input);
+std::u16string agreed_text(const std::u16string& text, const std::vector<const Codepage*>& codepages,
+                           size_t chars) {
+  std::map<char16_t, bool> known;
+  std::u16string kept;
+  for (const char16_t c : text) {
+    if (kept.size() == chars) break;
+    const auto [place, is_new] = known.try_emplace(c, false);
+    if (is_new)
+      place->second = std::all_of(codepages.begin(), codepages.end(),
+                                  [c](const Codepage* codepage) { return codepage->is_agreed(c); });
+    if (place->second) kept += c;
+  }
+  return kept;
+}
+
+Input cut_pieces(const std::u16string& text, size_t chars, size_t pieces, const Codepage& codepage) {
+  auto cut = std::make_shared<Pieces>();
+  for (size_t at = 0; at < text.size() && cut->ends.size() < pieces; at += chars) {
+    const std::u16string piece = text.substr(at, chars);
+    cut->bytes += codepage.encode(piece);
+    cut->ends.push_back(cut->bytes.size());
+    cut->chars += piece.size();
+  }
+  return cut;
+}
+
+size_t run_iconv(iconv_t descriptor, const char* input, size_t input_bytes, char* output, size_t room) {
+  char *in = const_cast<char*>(input), *end = output;
   iconv(descriptor, nullptr, nullptr, nullptr, nullptr);
-  return iconv(descriptor, &in, &input_bytes, output, room) == 0 &&
-         iconv(descriptor, nullptr, nullptr, output, room) == 0;
+  const bool done = iconv(descriptor, &in, &input_bytes, &end, &room) == 0 &&
+                    iconv(descriptor, nullptr, nullptr, &end, &room) == 0;
+  return done ? static_cast<size_t>(end - output) : 0;
 }
 
 }  // namespace bench

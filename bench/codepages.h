@@ -1,65 +1,70 @@
-// The codepages that are measured, each with its converters of all three libraries, opened once.
+// The encodings between which texts are converted, as each library calls them.
 #pragma once
 
 #include <iconv.h>
-#include <unicode/ucnv.h>
 
+#include <cstdint>
 #include <memory>
 #include <string>
 #include <vector>
 
 #include "lx.h"
-#include "texts.h"
+#include "table.h"
 
 namespace bench {
 
-struct CodepageName {
-  const char* label;
-  uint16_t id;
-  const char* object;  // null: found by the identifier
+struct Encoding {
+  const char* label;  // the library's own name
   const char* icu;
   const char* iconv;
-  bool stateful;
-  std::vector<Language> languages;
+  bool is_stateful;
 };
 
-/// The names, in the order of the rows.
-const std::vector<CodepageName>& codepage_names();
+/// Null when there is none of this label.
+const Encoding* find_encoding(const char* label);
+/// UTF-16 is no codepage of a locale.
+bool is_utf16(const Encoding& encoding);
+bool is_utf8(const Encoding& encoding);
 
+using LocalePointer = std::shared_ptr<LXLocale>;
+/// A locale of this name, or null with a line on standard error.
+LocalePointer open_locale(const std::string& name);
+
+/// An encoding with what the libraries need to turn text into it: the locale (not for UTF-16) and, to see on
+/// which characters they agree, descriptors.
 class Codepage {
  public:
-  /// Null, with a line on standard error, when one of the libraries does not have the codepage.
-  static std::unique_ptr<Codepage> open(const CodepageName& name);
+  /// Null, with a line on standard error, when the library or iconv does not have it.
+  static std::shared_ptr<const Codepage> open(const Encoding& encoding);
   ~Codepage();
   Codepage(const Codepage&) = delete;
   Codepage& operator=(const Codepage&) = delete;
 
-  const CodepageName& name() const { return name_; }
-  bool is_utf8() const;
-  LXLocale* locale() const { return locale_; }
-  UConverter* icu() const { return icu_; }
-  iconv_t to_utf16() const { return to_utf16_; }
-  iconv_t from_utf16() const { return from_utf16_; }
-  iconv_t to_utf8() const { return to_utf8_; }
-  iconv_t from_utf8() const { return from_utf8_; }
+  const Encoding& encoding() const { return encoding_; }
+  LXLocale* locale() const { return locale_.get(); }
 
-  /// A whole text in this codepage. It starts and ends in the single-byte state.
+  /// A whole text in this encoding. It starts and ends in the single-byte state.
   std::string encode(const std::u16string& text) const;
-
-  /// The bytes of a character, without shift bytes; 0 when the libraries do not agree on it both ways.
-  size_t agreed_bytes(char16_t c) const;
+  /// Whether all libraries write and read a character alike.
+  bool is_agreed(char16_t c) const;
 
  private:
-  explicit Codepage(const CodepageName& name) : name_(name) {}
-  bool open_all();
+  explicit Codepage(const Encoding& encoding) : encoding_(encoding) {}
 
-  const CodepageName& name_;
-  LXLocale* locale_ = nullptr;
-  UConverter* icu_ = nullptr;
-  iconv_t to_utf16_, from_utf16_, to_utf8_, from_utf8_;
+  const Encoding& encoding_;
+  LocalePointer locale_;
+  iconv_t to_utf16_ = nullptr, from_utf16_ = nullptr;
 };
 
-/// Converts all of a text with a descriptor that is reset before; false when it refuses a character.
-bool run_iconv(iconv_t descriptor, const char* input, size_t input_bytes, char** output, size_t* room);
+/// The characters of a text that are agreed in all the codepages, up to a number of them.
+std::u16string agreed_text(const std::u16string& text, const std::vector<const Codepage*>& codepages,
+                           size_t chars = SIZE_MAX);
+
+/// The beginning of a text in pieces of `chars` characters, at most `pieces` of them.
+Input cut_pieces(const std::u16string& text, size_t chars, size_t pieces, const Codepage& codepage);
+
+/// Converts all of a text with a descriptor that is reset before. Gives the bytes written; 0 when it refuses a
+/// character.
+size_t run_iconv(iconv_t descriptor, const char* input, size_t input_bytes, char* output, size_t room);
 
 }  // namespace bench

@@ -1,55 +1,44 @@
-// Each turn is a process of its own: forked, so that the program is loaded and nothing of a library has been used.
-#include "first_use.h"
-
+// Time and memory from a fresh process to the first conversion, comparison and amount. Each turn is a process
+// of its own: forked, so that the program is loaded and nothing of a library has been used.
 #include <locale.h>
-#include <lx.h>
 #include <monetary.h>
 #include <sys/wait.h>
-#include <unicode/ucnv.h>
-#include <unicode/ucol.h>
-#include <unicode/unum.h>
 #include <unistd.h>
+#include <wchar.h>
 
-#include <algorithm>
 #include <chrono>
+#include <cstdio>
 #include <cstdlib>
 #include <cstring>
-#include <functional>
-#include <string>
-#include <vector>
+#include <limits>
+
+#include "families.h"
+#include "icu.h"
+#include "lx.h"
 
 namespace bench {
 namespace {
 
 constexpr int kTurns = 60;
-constexpr char kWord[] =
-    "Gr\xC3\xB6\xC3\x9F"
-    "e";
+constexpr char kWord[] = "Gr\xC3\xB6\xC3\x9F\x65";
 constexpr char kOther[] = "Gro\xC3\x9F";
 constexpr double kAmount = 1234567.89;
 
 /// Whether all of it could be done.
-using Work = std::function<bool()>;
+using FirstUse = std::function<bool()>;
 
-bool use_lexicor(const char* directory, const char* name) {
-  if (LXInit(directory, nullptr, nullptr, nullptr, 0) != LX_OK) return false;
-  LXLocale* const locale = LXGetLocale(name, 0, nullptr);
-  if (locale == nullptr) return false;
-  LXUChar units[16];
-  char text[64];
-  return LXStringToUnicode(units, 16, locale, kWord, -1, 0) > 0 &&
-         LXStrcoll(locale, kWord, -1, kOther, -1, 0) != 0 &&
-         LXCurrencyToString(locale, kAmount, text, sizeof text, 0) > 0;
-}
-
-bool use_icu() {
-  UErrorCode error = U_ZERO_ERROR;
-  char16_t units[64];
-  ucnv_toUChars(ucnv_open("UTF-8", &error), units, 64, kWord, -1, &error);
-  const UCollationResult order = ucol_strcollUTF8(ucol_open("de", &error), kWord, -1, kOther, -1, &error);
-  unum_formatDouble(unum_open(UNUM_CURRENCY, nullptr, 0, "de_DE", nullptr, &error), kAmount, units, 64, nullptr,
-                    &error);
-  return U_SUCCESS(error) && order != UCOL_EQUAL;
+/// The library is not initialised yet in the process that forks.
+FirstUse use_lexicor(const std::string& directory, const std::string& name) {
+  return [directory, name] {
+    if (LXInit(directory.c_str(), nullptr, nullptr, nullptr, 0) != LX_OK) return false;
+    LXLocale* const locale = LXGetLocale(name.c_str(), 0, nullptr);
+    if (locale == nullptr) return false;
+    LXUChar units[16];
+    char text[64];
+    return LXStringToUnicode(units, 16, locale, kWord, -1, 0) > 0 &&
+           LXStrcoll(locale, kWord, -1, kOther, -1, 0) != 0 &&
+           LXCurrencyToString(locale, kAmount, text, sizeof text, 0) > 0;
+  };
 }
 
 bool use_glibc() {
@@ -72,26 +61,26 @@ long private_kilobytes() {
 }
 
 struct Turn {
-  double microseconds;
+  double ns;
   long kilobytes;
   bool done;
 };
 
-Turn take_turn(const Work& work) {
+Turn take_turn(const FirstUse& use) {
   const long before = private_kilobytes();
   const auto start = std::chrono::steady_clock::now();
-  const bool done = work();
-  const std::chrono::duration<double, std::micro> time = std::chrono::steady_clock::now() - start;
+  const bool done = use();
+  const std::chrono::duration<double, std::nano> time = std::chrono::steady_clock::now() - start;
   return {time.count(), private_kilobytes() - before, done};
 }
 
-Turn in_a_process(const Work& work) {
+Turn in_a_process(const FirstUse& use) {
   Turn turn{};
   int ends[2];
   if (pipe(ends) != 0) return turn;
   const pid_t child = fork();
   if (child == 0) {
-    turn = take_turn(work);
+    turn = take_turn(use);
     _exit(write(ends[1], &turn, sizeof turn) == sizeof turn ? 0 : 1);
   }
   close(ends[1]);
@@ -101,29 +90,40 @@ Turn in_a_process(const Work& work) {
   return turn;
 }
 
+struct Competitor {
+  const char* name;
+  FirstUse use;
+  Turn least = {std::numeric_limits<double>::max(), 0, false};
+};
+
+void add_row(Table* table, const std::string& name, std::vector<Competitor> competitors) {
+  for (int i = 0; i < kTurns; ++i)
+    for (Competitor& competitor : competitors) {
+      const Turn turn = competitor.use ? in_a_process(competitor.use) : Turn{};
+      if (turn.done && turn.ns < competitor.least.ns) competitor.least = turn;
+    }
+  std::vector<Measured> measured;
+  std::string memory;
+  for (const Competitor& competitor : competitors) {
+    if (!competitor.least.done) continue;
+    measured.push_back({competitor.name, competitor.least.ns, true});
+    memory += (memory.empty() ? "" : ", ") + std::string(competitor.name) + " " +
+              std::to_string(competitor.least.kilobytes) + " kB";
+  }
+  if (competitors.front().least.done) table->print(name, measured, 1, 1, memory);
+}
+
 }  // namespace
 
-void print_first_use(const char* locale_directory, std::FILE* out) {
-  const auto lexicor = [=](const char* name) { return [=] { return use_lexicor(locale_directory, name); }; };
-  struct Peer {
-    const char* name;
-    Work work;
-    std::vector<Turn> turns;
-  } peers[] = {{"lexicor, UTF-8", lexicor("German_Germany.UTF-8@Default"), {}},
-               {"lexicor, Latin1", lexicor("German_Germany.Latin1@Default"), {}},
-               {"ICU", use_icu, {}},
-               {"glibc", use_glibc, {}}};
-  for (int i = 0; i < kTurns; ++i)
-    for (Peer& peer : peers) peer.turns.push_back(in_a_process(peer.work));
-  for (Peer& peer : peers) {
-    std::sort(peer.turns.begin(), peer.turns.end(),
-              [](const Turn& a, const Turn& b) { return a.microseconds < b.microseconds; });
-    const Turn &least = peer.turns.front(), &median = peer.turns[kTurns / 2];
-    if (least.done)
-      std::fprintf(out, "%-16s %6.0f %6.0f us %6ld kB\n", peer.name, least.microseconds, median.microseconds,
-                   median.kilobytes);
-    else
-      std::fprintf(out, "%-16s cannot: its locale is not there\n", peer.name);
+void add_first_use_rows(Table* table, const std::string& locale_directory) {
+  for (const char* const codepage : {"UTF-8", "Latin1"}) {
+    const std::string name = std::string("first-use/") + codepage;
+    const std::string locale = std::string("German_Germany.") + codepage + "@Default";
+    if (table->wants(name))
+      add_row(table, name,
+              {{kOurs, use_lexicor(locale_directory, locale)},
+               {kIcu, icu::first_use(kWord, kOther, kAmount)},
+               {kGlibc, use_glibc}});
   }
 }
 

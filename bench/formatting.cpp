@@ -1,11 +1,7 @@
 // Numbers, amounts and times written and read, beside ICU and glibc: some hundred values of all sizes, one call
 // each. ICU works on UTF-16 in every row, and its formats stay open; glibc works in a locale of the language.
-#include <locale.h>
 #include <monetary.h>
 #include <time.h>
-#include <unicode/udat.h>
-#include <unicode/unum.h>
-#include <unicode/ustring.h>
 
 #include <algorithm>
 #include <cmath>
@@ -14,7 +10,10 @@
 #include <cstring>
 #include <random>
 
-#include "rows.h"
+#include "codepages.h"
+#include "families.h"
+#include "icu.h"
+#include "system.h"
 
 namespace bench {
 namespace {
@@ -22,26 +21,23 @@ namespace {
 constexpr size_t kValues = 500;
 constexpr int32_t kRoomUnits = 128;  // for one text
 
-enum class Encoding { kCodepage, kUtf8, kUtf16 };
+enum class Form { kCodepage, kUtf8, kUtf16 };
 
 struct Text {
   const char* label;
   const char* locale;
-  Encoding encoding;  // kCodepage or kUtf16: the form that is called
-  const char* icu;    // null: no peer
+  Form form;  // kCodepage or kUtf16: the form that is called
+  const char* icu;
   const char* glibc;  // null: no peer
-  const char* glibc_fallback;
   char decimal;
   const char16_t* icu_date_time;  // what %c makes
 };
 constexpr Text kTexts[] = {
-    {"English/Latin1", "English_UnitedStates.Latin1", Encoding::kCodepage, "en_US", "en_US.UTF-8", "C", '.',
+    {"English/Latin1", "English_UnitedStates.Latin1", Form::kCodepage, "en_US", "en_US.UTF-8", '.',
      u"M/d/yy h:mm:ss a"},
-    {"German/UTF-8", "German_Germany.UTF-8", Encoding::kCodepage, "de_DE", "de_DE.UTF-8", nullptr, ',',
+    {"German/UTF-8", "German_Germany.UTF-8", Form::kCodepage, "de_DE", "de_DE.UTF-8", ',',
      u"dd.MM.yy HH:mm:ss"},
-    {"German/UTF-16", "German_Germany.UTF-8", Encoding::kUtf16, "de_DE", nullptr, nullptr, ',',
-     u"dd.MM.yy HH:mm:ss"},
-    {"German/IBM1141", "German_Germany.IBM1141", Encoding::kCodepage, nullptr, nullptr, nullptr, ',', nullptr},
+    {"German/UTF-16", "German_Germany.UTF-8", Form::kUtf16, "de_DE", nullptr, ',', u"dd.MM.yy HH:mm:ss"},
 };
 
 /// A format of times as each library writes it.
@@ -67,7 +63,7 @@ struct Values {
   std::vector<double> precise;  // with 17 digits
   std::vector<LXTime> times;
   std::vector<tm> system_times;
-  std::vector<UDate> dates;
+  std::vector<double> dates;  // milliseconds since 1970
 };
 
 Values make_values() {
@@ -86,7 +82,7 @@ Values make_values() {
     values.system_times.push_back(system);
     values.times.push_back({system.tm_sec, system.tm_min, system.tm_hour, system.tm_mday, system.tm_mon,
                             system.tm_year, system.tm_wday, system.tm_yday});
-    values.dates.push_back(static_cast<UDate>(seconds) * 1000);
+    values.dates.push_back(static_cast<double>(seconds) * 1000);
   }
   return values;
 }
@@ -98,29 +94,12 @@ std::string printed(const char* format, double value, char decimal) {
   return text;
 }
 
-std::u16string from_utf8(const std::string& bytes) {
-  std::u16string units(bytes.size(), u'\0');
-  int32_t count = 0;
-  UErrorCode error = U_ZERO_ERROR;
-  u_strFromUTF8(units.data(), static_cast<int32_t>(units.size()), &count, bytes.data(),
-                static_cast<int32_t>(bytes.size()), &error);
-  units.resize(static_cast<size_t>(count));
-  return units;
-}
-
 const LXUChar* lx_units(const std::u16string& text) {
   return reinterpret_cast<const LXUChar*>(text.data());
 }
 LXUChar* lx_units(char* text) {
   return reinterpret_cast<LXUChar*>(text);
 }
-int32_t length(size_t n) {
-  return static_cast<int32_t>(n);
-}
-size_t count_of(int32_t n) {
-  return static_cast<size_t>(n);
-}
-
 /// What is read, for each library.
 struct Inputs {
   std::vector<std::string> codepage, utf8;
@@ -128,10 +107,10 @@ struct Inputs {
 
   void add(LXLocale* locale, const std::string& text) {
     utf8.push_back(text);
-    utf16.push_back(from_utf8(text));
+    utf16.push_back(to_utf16(text));
     std::string bytes(4 * text.size(), '\0');
-    bytes.resize(count_of(LXUnicodeToString(locale, bytes.data(), length(bytes.size()), lx_units(utf16.back()),
-                                            length(utf16.back().size()), 0)));
+    bytes.resize(count(LXUnicodeToString(locale, bytes.data(), length(bytes.size()), lx_units(utf16.back()),
+                                         length(utf16.back().size()), 0)));
     codepage.push_back(bytes);
   }
 };
@@ -153,11 +132,11 @@ double key_of(const tm& t) {
 
 class RowMaker {
  public:
-  RowMaker(std::vector<Row>* rows, const std::string& filter) : rows_(rows), filter_(filter) {}
+  explicit RowMaker(Table* table) : table_(*table) {}
 
   bool start(std::string name, LXLocale* locale) {
-    if (name.find(filter_) == std::string::npos) return false;
-    row_ = {std::move(name), nullptr, {}, kRoomUnits * sizeof(LXUChar)};
+    if (!table_.wants(name)) return false;
+    row_ = {std::move(name), {}, 0, kValues, kRoomUnits * sizeof(LXUChar), Same::kNothing};
     locale_ = locale;
     texts_.clear();
     return true;
@@ -166,12 +145,12 @@ class RowMaker {
   /// A peer that writes value `i` with `call(i, output)`, which gives the bytes. `same`: its texts are those of
   /// the first peer.
   template <class Call>
-  void writer(const char* name, locale_t system, Encoding encoding, bool same, Call call) {
+  void writer(const char* name, locale_t system, Form form, bool same, Call call) {
     const locale_t before = uselocale(system);
     std::vector<std::u16string> texts;
     for (size_t i = 0; i < kValues; ++i) {
       alignas(char16_t) char out[sizeof(char16_t) * kRoomUnits];
-      texts.push_back(decoded(std::string(out, call(i, out)), encoding));
+      texts.push_back(decoded(std::string(out, call(i, out)), form));
       if (same && !texts_.empty() && texts[i] != texts_[i]) stop(name, i);
     }
     uselocale(before);
@@ -190,17 +169,11 @@ class RowMaker {
   }
 
   void set_input(const std::vector<std::u16string>& texts) {
-    auto pieces = std::make_shared<Pieces>();
-    for (const std::u16string& text : texts) {
-      pieces->chars += text.size();
-      pieces->ends.push_back(pieces->chars);
-    }
-    pieces->bytes.resize(pieces->chars);
-    row_.input = pieces;
+    for (const std::u16string& text : texts) row_.chars += text.size();
     texts_ = texts;
   }
 
-  void finish() { rows_->push_back(std::move(row_)); }
+  void finish() { table_.add(row_); }
 
  private:
   template <class Call>
@@ -215,16 +188,15 @@ class RowMaker {
   }
 
   /// ICU writes spaces that do not break.
-  std::u16string decoded(const std::string& bytes, Encoding encoding) const {
+  std::u16string decoded(const std::string& bytes, Form form) const {
     std::u16string text(bytes.size(), u'\0');
-    if (encoding == Encoding::kUtf8)
-      text = from_utf8(bytes);
-    else if (encoding == Encoding::kUtf16)
+    if (form == Form::kUtf8)
+      text = to_utf16(bytes);
+    else if (form == Form::kUtf16)
       text.assign(reinterpret_cast<const char16_t*>(bytes.data()), bytes.size() / 2);
     else
-      text.resize(
-          count_of(LXStringToUnicode(lx_units(reinterpret_cast<char*>(text.data())), length(text.size()),
-                                     locale_, bytes.data(), length(bytes.size()), 0)));
+      text.resize(count(LXStringToUnicode(lx_units(reinterpret_cast<char*>(text.data())), length(text.size()),
+                                          locale_, bytes.data(), length(bytes.size()), 0)));
     for (char16_t& c : text)
       if (c == u'\u00A0' || c == u'\u202F') c = u' ';
     return text;
@@ -235,55 +207,34 @@ class RowMaker {
     std::exit(1);
   }
 
-  std::vector<Row>* rows_;
-  const std::string& filter_;
+  Table& table_;
   LXLocale* locale_ = nullptr;
   std::vector<std::u16string> texts_;
   Row row_{};
 };
-
-using IcuNumbers = std::shared_ptr<UNumberFormat>;
-using IcuTimes = std::shared_ptr<UDateFormat>;
-
-IcuNumbers icu_numbers(const Text& text, UNumberFormatStyle style, int32_t fraction_digits) {
-  UErrorCode error = U_ZERO_ERROR;
-  const IcuNumbers icu(unum_open(style, nullptr, 0, text.icu, nullptr, &error), unum_close);
-  unum_setAttribute(icu.get(), UNUM_FRACTION_DIGITS, fraction_digits);
-  return icu;
-}
-
-IcuTimes icu_times(const Text& text, const Pattern& pattern) {
-  UErrorCode error = U_ZERO_ERROR;
-  return {udat_open(UDAT_PATTERN, UDAT_PATTERN, text.icu, u"GMT", -1,
-                    pattern.icu != nullptr ? pattern.icu : text.icu_date_time, -1, &error),
-          udat_close};
-}
 
 /// The rows of one text.
 class TextRows {
  public:
   TextRows(RowMaker* make, const Text& text, const std::shared_ptr<LXLocale>& locale, const Values& values)
       : make_(*make), text_(text), owner_(locale), locale_(locale.get()), values_(values) {
-    if (text.glibc == nullptr) return;
-    system_ = newlocale(LC_ALL_MASK, text.glibc, nullptr);
-    own_system_ = system_ != nullptr;
-    if (!own_system_ && text.glibc_fallback != nullptr)
-      system_ = newlocale(LC_ALL_MASK, text.glibc_fallback, nullptr);
+    if (text.glibc != nullptr) system_ = open_system_locale(text.glibc);
   }
 
   void add() {
     write_numbers(
         "integer", values_.integers, LXLongToString, LXLongToStringU,
-        [](char* out, int32_t value) { return std::snprintf(out, kRoomUnits, "%'d", value); }, UNUM_DECIMAL, 0);
+        [](char* out, int32_t value) { return std::snprintf(out, kRoomUnits, "%'d", value); },
+        icu::integer_writer);
     write_numbers(
         "double", values_.amounts, LXDoubleToString, LXDoubleToStringU,
-        [](char* out, double value) { return std::snprintf(out, kRoomUnits, "%'.2f", value); }, UNUM_DECIMAL,
-        2);
+        [](char* out, double value) { return std::snprintf(out, kRoomUnits, "%'.2f", value); },
+        icu::double_writer);
     // Not negative: the territories write the others in different ways.
     write_numbers(
         "currency", values_.positive_amounts, LXCurrencyToString, LXCurrencyToStringU,
         [](char* out, double value) { return static_cast<int32_t>(strfmon(out, kRoomUnits, "%n", value)); },
-        UNUM_CURRENCY, 2);
+        icu::currency_writer);
     for (const Pattern& pattern : kWritten) write_times(pattern);
     read_integers();
     read_doubles("double", "%.2f", values_.amounts);
@@ -299,48 +250,39 @@ class TextRows {
   /// Our writer in the form of the text.
   template <class Bytes, class Units>
   void ours(Bytes bytes, Units units) {
-    if (text_.encoding == Encoding::kUtf16)
-      make_.writer(kOurs, nullptr, Encoding::kUtf16, true, [owner = owner_, units](size_t i, char* out) {
-        return 2 * count_of(units(owner.get(), i, lx_units(out)));
+    if (text_.form == Form::kUtf16)
+      make_.writer(kOurs, nullptr, Form::kUtf16, true, [owner = owner_, units](size_t i, char* out) {
+        return 2 * count(units(owner.get(), i, lx_units(out)));
       });
     else
-      make_.writer(kOurs, nullptr, Encoding::kCodepage, true, [owner = owner_, bytes](size_t i, char* out) {
-        return count_of(bytes(owner.get(), i, out));
-      });
+      make_.writer(kOurs, nullptr, Form::kCodepage, true,
+                   [owner = owner_, bytes](size_t i, char* out) { return count(bytes(owner.get(), i, out)); });
   }
-  /// `exact`: the texts are ours, if it is the language's own locale.
+  /// `exact`: the texts are ours.
   template <class Call>
   void glibc(bool exact, Call call) {
-    if (system_ != nullptr) make_.writer(kGlibc, system_, Encoding::kUtf8, exact && own_system_, call);
+    if (system_ != nullptr) make_.writer(kGlibc, system_.get(), Form::kUtf8, exact, call);
   }
-  template <class Call>
-  void icu(Call call) {
-    make_.writer(kIcu, nullptr, Encoding::kUtf16, true, [call](size_t i, char* out) {
-      UErrorCode error = U_ZERO_ERROR;
-      return 2 * count_of(call(i, reinterpret_cast<char16_t*>(out), &error));
+  template <class Value>
+  void icu_peer(const icu::Writer<Value>& writer, const std::vector<Value>& values) {
+    if (!writer) return;
+    make_.writer(kIcu, nullptr, Form::kUtf16, true, [writer, &values](size_t i, char* out) {
+      return 2 * count(writer(values[i], reinterpret_cast<char16_t*>(out), kRoomUnits));
     });
   }
 
   /// `system(output, value)` is glibc's.
   template <class Value, class Bytes, class Units, class System>
   void write_numbers(const char* label, const std::vector<Value>& values, Bytes bytes, Units units,
-                     System system, UNumberFormatStyle style, int32_t fraction_digits) {
+                     System system, icu::Writer<Value> (*icu_writer)(const char*)) {
     if (!start("write", label)) return;
     ours([&values, bytes](LXLocale* locale, size_t i,
                           char* out) { return bytes(locale, values[i], out, kRoomUnits, 0); },
          [&values, units](LXLocale* locale, size_t i, LXUChar* out) {
            return units(locale, values[i], out, kRoomUnits, 0);
          });
-    glibc(true, [&values, system](size_t i, char* out) { return count_of(system(out, values[i])); });
-    if (text_.icu != nullptr) {
-      icu([&values, format = icu_numbers(text_, style, fraction_digits)](size_t i, char16_t* out,
-                                                                         UErrorCode* error) {
-        if constexpr (std::is_integral_v<Value>)
-          return unum_format(format.get(), values[i], out, kRoomUnits, nullptr, error);
-        else
-          return unum_formatDouble(format.get(), values[i], out, kRoomUnits, nullptr, error);
-      });
-    }
+    glibc(true, [&values, system](size_t i, char* out) { return count(system(out, values[i])); });
+    icu_peer(icu_writer(text_.icu), values);
     make_.finish();
   }
 
@@ -360,12 +302,8 @@ class TextRows {
     glibc(exact, [format = pattern.glibc, &values = values_.system_times](size_t i, char* out) {
       return strftime(out, kRoomUnits, format, &values[i]);
     });
-    if (text_.icu != nullptr) {
-      icu([times = icu_times(text_, pattern), &values = values_.dates](size_t i, char16_t* out,
-                                                                       UErrorCode* error) {
-        return udat_format(times.get(), values[i], out, kRoomUnits, nullptr, error);
-      });
-    }
+    icu_peer(icu::time_writer(text_.icu, pattern.icu != nullptr ? pattern.icu : text_.icu_date_time),
+             values_.dates);
     make_.finish();
   }
 
@@ -373,21 +311,21 @@ class TextRows {
   /// left out where the text has no such peer.
   template <class Bytes, class Units, class System, class Icu>
   void readers(const std::shared_ptr<const Inputs>& in, const std::vector<double>& expected,
-               const std::vector<double>& icu_expected, Bytes bytes, Units units, System system, Icu icu) {
+               const std::vector<double>& icu_expected, Bytes bytes, Units units, System system,
+               const Icu& icu_reader) {
     make_.set_input(in->utf16);
-    if (text_.encoding == Encoding::kUtf16)
+    if (text_.form == Form::kUtf16)
       make_.reader(kOurs, nullptr, expected,
                    [owner = owner_, in, units](size_t i) { return units(owner.get(), in->utf16[i]); });
     else
       make_.reader(kOurs, nullptr, expected,
                    [owner = owner_, in, bytes](size_t i) { return bytes(owner.get(), in->codepage[i]); });
     if (system_ != nullptr)
-      make_.reader(kGlibc, system_, expected, [in, system](size_t i) { return system(in->utf8[i].c_str()); });
-    if (text_.icu != nullptr)
-      make_.reader(kIcu, nullptr, icu_expected, [in, icu](size_t i) {
-        UErrorCode error = U_ZERO_ERROR;
-        return icu(in->utf16[i], &error);
-      });
+      make_.reader(kGlibc, system_.get(), expected,
+                   [in, system](size_t i) { return system(in->utf8[i].c_str()); });
+    if (icu_reader)
+      make_.reader(kIcu, nullptr, icu_expected,
+                   [in, icu_reader](size_t i) { return static_cast<double>(icu_reader(in->utf16[i])); });
     make_.finish();
   }
 
@@ -405,8 +343,7 @@ class TextRows {
           return LXStringToLongU(locale, lx_units(text), length(text.size()), nullptr, 10, 0);
         },
         [](const char* text) { return static_cast<double>(std::strtol(text, nullptr, 10)); },
-        [format = icu_numbers(text_, UNUM_DECIMAL, 0)](const std::u16string& text, UErrorCode* error)
-            -> double { return unum_parse(format.get(), text.data(), length(text.size()), nullptr, error); });
+        icu::integer_reader(text_.icu));
   }
 
   void read_doubles(const char* label, const char* printf_format, const std::vector<double>& values) {
@@ -421,10 +358,7 @@ class TextRows {
         [](LXLocale* locale, const std::u16string& text) {
           return LXStringToDoubleU(locale, lx_units(text), length(text.size()), nullptr, 0);
         },
-        [](const char* text) { return std::strtod(text, nullptr); },
-        [format = icu_numbers(text_, UNUM_DECIMAL, 2)](const std::u16string& text, UErrorCode* error) {
-          return unum_parseDouble(format.get(), text.data(), length(text.size()), nullptr, error);
-        });
+        [](const char* text) { return std::strtod(text, nullptr); }, icu::double_reader(text_.icu));
   }
 
   void read_times(const Pattern& pattern) {
@@ -433,9 +367,9 @@ class TextRows {
     std::vector<double> expected, icu_expected;
     for (size_t i = 0; i < kValues; ++i) {
       LXUChar text[kRoomUnits];
-      const std::u16string format = from_utf8(pattern.ours);
-      const size_t units = count_of(LXTimeToStringU(locale_, &values_.times[i], text, kRoomUnits,
-                                                    lx_units(format), length(format.size()), 0));
+      const std::u16string format = to_utf16(pattern.ours);
+      const size_t units = count(LXTimeToStringU(locale_, &values_.times[i], text, kRoomUnits, lx_units(format),
+                                                 length(format.size()), 0));
       in->add(locale_, to_utf8(std::u16string(text, text + units)));
       LXTime time = values_.times[i];
       if (!pattern.to_the_second) time.hours = time.minutes = time.seconds = 0;
@@ -464,9 +398,7 @@ class TextRows {
           strptime(text, format, &time);
           return key_of(time);
         },
-        [times = icu_times(text_, pattern)](const std::u16string& text, UErrorCode* error) {
-          return udat_parse(times.get(), text.data(), length(text.size()), nullptr, error);
-        });
+        icu::time_reader(text_.icu, pattern.icu));
   }
 
   RowMaker& make_;
@@ -474,22 +406,20 @@ class TextRows {
   std::shared_ptr<LXLocale> owner_;
   LXLocale* locale_;
   const Values& values_;
-  locale_t system_ = nullptr;
-  bool own_system_ = false;
+  SystemLocale system_;
 };
 
 }  // namespace
 
-void add_formatting_rows(std::vector<Row>* rows, const std::string& filter) {
+void add_formatting_rows(Table* table) {
   static const Values values = make_values();  // the rows refer to them
-  RowMaker make(rows, filter);
+  RowMaker make(table);
   for (const Text& text : kTexts) {
-    const std::shared_ptr<LXLocale> locale(LXGetLocale(text.locale, 0, nullptr), LXReleaseLocale);
-    if (locale == nullptr) {
-      std::fprintf(stderr, "no locale %s\n", text.locale);
+    if (!table->wants_some(std::string("write/") + text.label + "/") &&
+        !table->wants_some(std::string("read/") + text.label + "/"))
       continue;
-    }
-    TextRows(&make, text, locale, values).add();
+    const LocalePointer locale = open_locale(text.locale);
+    if (locale != nullptr) TextRows(&make, text, locale, values).add();
   }
 }
 

@@ -1,116 +1,146 @@
-// Case mapping of 16-bit Unicode and of UTF-8, beside ICU. Both use the language's special mappings.
-#include <unicode/ucasemap.h>
-#include <unicode/ustring.h>
+// Upper and lower case beside ICU, libunistring and glibc's towupper and towlower, with the special mappings of
+// the text's language.
+#include <locale.h>
+#include <wchar.h>
+#include <wctype.h>
 
-#include <cstdio>
-#include <cstdlib>
-#include <cstring>
+#include <map>
 
-#include "rows.h"
+#include "codepages.h"
+#include "families.h"
+#include "icu.h"
+#include "system.h"
 
 namespace bench {
 namespace {
 
-constexpr size_t kLongBytes = 1000000;
+constexpr size_t kLongUnits = 500000;
 constexpr size_t kShortChars = 24;
 constexpr size_t kShortStrings = 500;
 
-struct Text {
-  const char* label;
-  Language language;
-  Mixture mixture;
-  const char* locale;
-  const char* icu;
+struct Subject {
+  const char* text;
+  const char* encoding;
+  const char* language;  // the library's name
+  const char* code;      // the one of ICU and libunistring
+  const char* system;    // glibc's locale, where its mapping of single characters gives the same; or null
 };
-constexpr Text kTexts[] = {
-    {"ASCII", Language::kGerman, Mixture::kAscii, "English.UTF-8", "en"},
-    {"German", Language::kGerman, Mixture::kNative, "German.UTF-8", "de"},
-    {"Russian", Language::kRussian, Mixture::kNative, "Russian.UTF-8", "ru"},
-    {"Japanese", Language::kJapanese, Mixture::kNative, "Japanese.UTF-8", "ja"},
+constexpr Subject kSubjects[] = {
+    {"ASCII", "UTF-8", "English", "en", "en_US.UTF-8"},
+    {"German", "UTF-8", "German", "de", nullptr},
+    {"French", "UTF-8", "French", "fr", "fr_FR.UTF-8"},
+    {"Russian", "UTF-8", "Russian", "ru", "ru_RU.UTF-8"},
+    {"Greek", "UTF-8", "Greek", "en", "en_US.UTF-8"},
+    {"Japanese", "UTF-8", "Japanese", "ja", "ja_JP.UTF-8"},
+    {"Russian", "UTF-16", "Russian", "ru", "ru_RU.UTF-8"},
+    {"German", "UTF-16", "German", "de", nullptr},
+    {"ASCII", "UTF-16", "English", "en", "en_US.UTF-8"},
+    {"Russian", "MS1251", "Russian", "ru", "ru_RU.CP1251"},
+    {"Japanese", "MS932", "Japanese", "ja", "ja_JP.WINDOWS-31J"},
 };
 
-/// The text in one piece, or cut into short strings.
-std::shared_ptr<const Pieces> pieces_of(const std::u16string& text, bool short_strings, bool utf8) {
-  auto pieces = std::make_shared<Pieces>();
-  const size_t step = short_strings ? kShortChars : text.size();
-  for (size_t at = 0; at < text.size() && pieces->ends.size() < kShortStrings; at += step) {
-    const std::u16string piece = text.substr(at, step);
-    pieces->bytes +=
-        utf8 ? to_utf8(piece)
-             : std::string(reinterpret_cast<const char*>(piece.data()), piece.size() * sizeof(char16_t));
-    pieces->ends.push_back(pieces->bytes.size());
-    pieces->chars += piece.size();
-  }
-  return pieces;
+Work ours(const Input& input, const Encoding& encoding, const LocalePointer& locale, uint32_t mode) {
+  if (is_utf16(encoding))
+    return for_each_piece(input, [locale, mode](const char* in, size_t bytes, char* out) {
+      return 2 * count(LXMapStringU(locale.get(), reinterpret_cast<LXUChar*>(out), length(bytes),
+                                    reinterpret_cast<const LXUChar*>(in), length(bytes / 2), mode));
+    });
+  return for_each_piece(input, [locale, mode](const char* in, size_t bytes, char* out) {
+    return count(LXMapString(locale.get(), out, length(2 * bytes), in, length(bytes), mode));
+  });
 }
 
-/// Calls `map(input, bytes, output)`, which returns the bytes written, for every piece.
-template <class Map>
-Peer peer(const char* name, const std::shared_ptr<const Pieces>& pieces, Map map) {
-  return {name, [pieces, map](char* output) {
-            char* out = output;
-            size_t start = 0;
-            for (const size_t end : pieces->ends) {
-              out += map(pieces->bytes.data() + start, end - start, out);
-              start = end;
-            }
-            return static_cast<size_t>(out - output);
-          }};
+/// glibc maps wide characters: 16-bit units are mapped one by one, bytes are converted there and back.
+Work glibc_peer(const Input& input, const Encoding& encoding, const char* locale_name, bool is_upper) {
+  const SystemLocale system = open_system_locale(locale_name);
+  if (system == nullptr) return nullptr;
+  wint_t (*const map)(wint_t, locale_t) = is_upper ? towupper_l : towlower_l;
+  if (is_utf16(encoding))
+    return for_each_piece(input, [system, map](const char* in, size_t bytes, char* out) {
+      const auto* const units = reinterpret_cast<const char16_t*>(in);
+      auto* const mapped = reinterpret_cast<char16_t*>(out);
+      for (size_t i = 0; i < bytes / 2; ++i) mapped[i] = static_cast<char16_t>(map(units[i], system.get()));
+      return bytes;
+    });
+  auto wide = std::make_shared<std::vector<wchar_t>>(input->bytes.size());
+  return for_each_piece(input, [system, map, wide](const char* in, size_t bytes, char* out) {
+    const locale_t before = uselocale(system.get());
+    std::mbstate_t state{};
+    const size_t chars = mbsnrtowcs(wide->data(), &in, bytes, wide->size(), &state);
+    for (size_t i = 0; i < chars; ++i)
+      (*wide)[i] = static_cast<wchar_t>(map(static_cast<wint_t>((*wide)[i]), system.get()));
+    const wchar_t* from = wide->data();
+    const size_t written = wcsnrtombs(out, &from, chars, 2 * bytes, &state);
+    uselocale(before);
+    return written;
+  });
 }
 
-void add_row(std::vector<Row>* rows, Row row) {
-  std::vector<char> ours(8 * row.input->bytes.size()), theirs(ours.size());
-  const size_t bytes = row.peers[0].run(ours.data());
-  if (row.peers[1].run(theirs.data()) != bytes || memcmp(ours.data(), theirs.data(), bytes) != 0) {
-    std::fprintf(stderr, "%s: ICU maps to another text\n", row.name.c_str());
-    std::exit(1);
+class SubjectRows {
+ public:
+  /// `codepage` and `locale` are there.
+  SubjectRows(const Subject& subject, const Codepage& codepage, LocalePointer locale, bool is_upper)
+      : subject_(subject), codepage_(codepage), locale_(std::move(locale)), is_upper_(is_upper) {}
+
+  void add(const std::string& stem, const std::u16string& whole, Table* table) const {
+    const std::u16string text = mapped_alike(agreed_text(whole, {&codepage_}, kLongUnits));
+    for (const bool is_short : {false, true}) {
+      const Input input = is_short ? cut_pieces(text, kShortChars, kShortStrings, codepage_)
+                                   : cut_pieces(text, text.size(), 1, codepage_);
+      table->add(
+          {stem + (is_short ? "/24" : "/1MB"), peers(input), input->chars, input->ends.size(), room(input)});
+    }
   }
-  row.output_room = ours.size();
-  rows->push_back(std::move(row));
-}
+
+ private:
+  static size_t room(const Input& input) { return 3 * input->bytes.size() + 64; }
+
+  std::vector<Peer> peers(const Input& input) const {
+    const Encoding& encoding = codepage_.encoding();
+    return {{kOurs, ours(input, encoding, locale_, is_upper_ ? LX_MAP_UPPER : LX_MAP_LOWER)},
+            {kIcu, icu::map(input, encoding, subject_.code, is_upper_)},
+            {kUnistring, unistring::map(input, encoding, subject_.code, is_upper_)},
+            {kGlibc,
+             subject_.system == nullptr ? nullptr : glibc_peer(input, encoding, subject_.system, is_upper_)}};
+  }
+
+  /// The characters that all libraries map alike behind a letter: the form of some depends on what stands
+  /// there.
+  std::u16string mapped_alike(const std::u16string& text) const {
+    std::map<char16_t, bool> known;
+    std::u16string kept;
+    for (const char16_t c : text) {
+      const auto [place, is_new] = known.try_emplace(c, false);
+      if (is_new) {
+        const Input input = cut_pieces({u'a', c}, 2, 1, codepage_);
+        place->second = differing(peers(input), room(input), Same::kBytes) == nullptr;
+      }
+      if (place->second) kept += c;
+    }
+    return kept;
+  }
+
+  const Subject& subject_;
+  const Codepage& codepage_;
+  LocalePointer locale_;
+  bool is_upper_;
+};
 
 }  // namespace
 
-void add_mapping_rows(std::vector<Row>* rows, const std::string& filter) {
-  for (const Text& text : kTexts) {
-    const std::u16string units = make_text(text.language, text.mixture, utf8_bytes, kLongBytes);
-    for (const bool short_strings : {false, true}) {
-      for (const bool utf8 : {false, true}) {
-        const std::string name = std::string("map/") + text.label + (utf8 ? "/upper_utf8" : "/upper_utf16") +
-                                 (short_strings ? "/24" : "/1MB");
-        if (name.find(filter) == std::string::npos) continue;
-        const std::shared_ptr<LXLocale> locale(LXGetLocale(text.locale, 0, nullptr), LXReleaseLocale);
-        if (locale == nullptr) continue;
-        Row row{name, pieces_of(units, short_strings, utf8), {}, 0};
-        if (utf8) {
-          UErrorCode error = U_ZERO_ERROR;
-          const std::shared_ptr<UCaseMap> map(ucasemap_open(text.icu, 0, &error), ucasemap_close);
-          row.peers.push_back(peer(kOurs, row.input, [locale](const char* in, size_t bytes, char* out) {
-            return static_cast<size_t>(LXMapString(locale.get(), out, static_cast<int32_t>(2 * bytes), in,
-                                                   static_cast<int32_t>(bytes), LX_MAP_UPPER));
-          }));
-          row.peers.push_back(peer(kIcu, row.input, [map](const char* in, size_t bytes, char* out) {
-            UErrorCode failed = U_ZERO_ERROR;
-            return static_cast<size_t>(ucasemap_utf8ToUpper(map.get(), out, static_cast<int32_t>(2 * bytes), in,
-                                                            static_cast<int32_t>(bytes), &failed));
-          }));
-        } else {
-          row.peers.push_back(peer(kOurs, row.input, [locale](const char* in, size_t bytes, char* out) {
-            return 2 * static_cast<size_t>(LXMapStringU(locale.get(), reinterpret_cast<LXUChar*>(out),
-                                                        static_cast<int32_t>(bytes),
-                                                        reinterpret_cast<const LXUChar*>(in),
-                                                        static_cast<int32_t>(bytes / 2), LX_MAP_UPPER));
-          }));
-          row.peers.push_back(peer(kIcu, row.input, [icu = text.icu](const char* in, size_t bytes, char* out) {
-            UErrorCode failed = U_ZERO_ERROR;
-            return 2 * static_cast<size_t>(u_strToUpper(reinterpret_cast<char16_t*>(out),
-                                                        static_cast<int32_t>(bytes),
-                                                        reinterpret_cast<const char16_t*>(in),
-                                                        static_cast<int32_t>(bytes / 2), icu, &failed));
-          }));
-        }
-        add_row(rows, std::move(row));
-      }
+void add_mapping_rows(Table* table, Texts* texts) {
+  for (const Subject& subject : kSubjects) {
+    for (const bool is_upper : {true, false}) {
+      const std::string stem =
+          std::string("map/") + subject.text + "/" + subject.encoding + (is_upper ? "/upper" : "/lower");
+      if (!table->wants(stem + "/1MB") && !table->wants(stem + "/24")) continue;
+      const Encoding& encoding = *find_encoding(subject.encoding);
+      const auto codepage = Codepage::open(encoding);
+      const LocalePointer locale =
+          open_locale(std::string(subject.language) + "." + (is_utf16(encoding) ? "UTF-8" : encoding.label));
+      const std::u16string& text = texts->find(subject.text);
+      if (codepage != nullptr && locale != nullptr && !text.empty())
+        SubjectRows(subject, *codepage, locale, is_upper).add(stem, text, table);
     }
   }
 }

@@ -1,154 +1,173 @@
-// Letters stand in a language's list about as often as they occur in it; ideographs are drawn from a list with
-// the front preferred, as common characters are few and rare ones many.
+// Phrases are drawn again and again in another order, so that a long text does not repeat itself as its file is
+// short.
 #include "texts.h"
 
-#include <unicode/ustring.h>
-
-#include <cstdint>
+#include <algorithm>
+#include <cstdio>
+#include <cstring>
+#include <fstream>
+#include <iterator>
+#include <random>
 
 namespace bench {
 namespace {
 
-constexpr const char16_t* kEnglishLetters =
-    u"eeeeeeeeeeeetttttttttaaaaaaaaooooooooiiiiiiinnnnnnnsssssshhhhhhrrrrrrddddlllluuucccmmmwwffggyyppbbvk";
-constexpr const char16_t* kGermanLetters =
-    u"eeeeeeeeeeeeeeeeennnnnnnnnniiiiiiiisssssssrrrrrrraaaaaattttttdddddhhhhhuuuulllcccgggmmoobbwwffkkzpväüöß";
-constexpr const char16_t* kRussianLetters =
-    u"ооооооооооееееееееааааааааииииииинннннннттттттссссссррррррввввлллккккмммдддпппууяяыыььггззббччйххжшюцщэф";
-constexpr const char16_t* kHiragana =
-    u"のにたいをはとるがしてでなあれさかもうらりこすきくっだよまそつえわけちどみせおめじ";
-constexpr const char16_t* kKatakana = u"ンスルトリアクイラシタロムレコドフバグサメプテカニ";
+constexpr size_t kTextUnits = 1100000;  // enough for a million bytes in any codepage
+constexpr size_t kSparseUnits = 200;
 
-struct Recipe {
-  const char16_t* letters;
-  char16_t first_ideograph, last_ideograph;  // 0: written with letters
-  bool spaces;                               // between words of the language
-  const char16_t* stops;
+struct Language {
+  const char* label;
+  const char* code;  // in the names of files
+};
+constexpr Language kLanguages[] = {
+    {"English", "en"}, {"German", "de"},   {"French", "fr"},     {"Czech", "cs"},
+    {"Swedish", "sv"}, {"Russian", "ru"},  {"Greek", "el"},      {"Thai", "th"},
+    {"Korean", "ko"},  {"Japanese", "ja"}, {"Chinese", "zh_CN"}, {"Taiwan", "zh_TW"},
 };
 
-const Recipe& recipe_of(Language language) {
-  static constexpr Recipe kRecipes[] = {
-      {kGermanLetters, 0, 0, true, u",.;:"},
-      {kRussianLetters, 0, 0, true, u",.;:"},
-      {kHiragana, 0x4E00, 0x9F00, false, u"、。"},
-      {u"", 0x4E00, 0x9F00, false, u"，。"},
-  };
-  return kRecipes[static_cast<size_t>(language)];
+const char* code_of(const std::string& language) {
+  for (const Language& known : kLanguages)
+    if (language == known.label) return known.code;
+  return "";
 }
 
-class Generator {
- public:
-  Generator(const Recipe& recipe, Mixture mixture, const CharBytes& char_bytes)
-      : mixture_(mixture), char_bytes_(char_bytes), spaces_(recipe.spaces) {
-    english_ = usable(kEnglishLetters);
-    letters_ = usable(recipe.letters);
-    katakana_ = recipe.letters == kHiragana ? usable(kKatakana) : u"";
-    stops_ = usable(recipe.stops);
-    digits_ = usable(u"0123456789");
-    // Every 7th: a vocabulary of common size that is spread over the block as real ones are.
-    for (char16_t c = recipe.first_ideograph; c < recipe.last_ideograph; c = static_cast<char16_t>(c + 7))
-      if (char_bytes_(c) != 0) ideographs_.push_back(c);
-  }
+std::vector<std::u16string> lines_of(const std::u16string& text) {
+  std::vector<std::u16string> lines;
+  size_t start = 0;
+  for (size_t end; (end = text.find(u'\n', start)) != std::u16string::npos; start = end + 1)
+    if (end > start) lines.push_back(text.substr(start, end - start));
+  return lines;
+}
 
-  std::u16string make(size_t bytes) {
-    while (bytes_ < bytes) {
-      switch (mixture_) {
-        case Mixture::kNative:
-          native_phrase();
-          break;
-        case Mixture::kAscii:
-          ascii_phrase();
-          break;
-        case Mixture::kSparse:
-          ascii_phrase();
-          if (below(33) == 0) add(ideographs_.empty() ? letters_.back() : pick_common(ideographs_));
-          break;
-      }
-    }
-    add(u'.');
-    return text_;
+std::u16string drawn_phrases(std::vector<std::u16string> phrases) {
+  std::mt19937 random(1);
+  std::u16string text;
+  while (text.size() < kTextUnits) {
+    std::shuffle(phrases.begin(), phrases.end(), random);
+    for (const std::u16string& phrase : phrases) text += phrase + u", ";
   }
+  return text;
+}
 
- private:
-  uint32_t below(uint32_t limit) {
-    state_ ^= state_ << 13;
-    state_ ^= state_ >> 7;
-    state_ ^= state_ << 17;
-    return static_cast<uint32_t>((state_ >> 32) * limit >> 32);
-  }
-  char16_t pick(const std::u16string& from) { return from[below(static_cast<uint32_t>(from.size()))]; }
-  char16_t pick_common(const std::u16string& from) {
-    const uint32_t size = static_cast<uint32_t>(from.size());
-    return from[below(below(size) + 1)];
-  }
-  std::u16string usable(const char16_t* list) const {
-    std::u16string kept;
-    for (; *list != 0; ++list)
-      if (char_bytes_(*list) != 0) kept.push_back(*list);
-    return kept;
-  }
-  void add(char16_t c) {
-    text_.push_back(c);
-    bytes_ += char_bytes_(c);
-  }
-  void add_some(const std::u16string& from, uint32_t least, uint32_t spread) {
-    for (uint32_t n = least + below(spread); n > 0; --n) add(pick(from));
-  }
+std::u16string repeated(const std::u16string& text) {
+  std::u16string all;
+  while (all.size() < kTextUnits) all += text;
+  return all;
+}
 
-  void ascii_phrase() {
-    if (below(10) == 0)
-      add_some(digits_, 1, 5);
-    else
-      add_some(english_, 1, 9);
-    if (below(10) == 0) add(u',');
-    add(u' ');
-  }
-  void native_phrase() {
-    const uint32_t kind = below(20);
-    if (kind == 0) {
-      add_some(digits_, 1, 5);
-    } else if (kind == 1) {
-      add_some(english_, 3, 7);
-    } else if (ideographs_.empty()) {
-      add_some(letters_, 2, 10);
-    } else {
-      native_cjk_words();
-    }
-    if (below(8) == 0) add(pick(stops_));
-    if (spaces_ || kind <= 1) add(u' ');
-  }
-  void native_cjk_words() {
-    for (uint32_t n = 1 + below(3); n > 0; --n) add(pick_common(ideographs_));
-    if (!letters_.empty()) add_some(letters_, 1, 4);
-    if (!katakana_.empty() && below(6) == 0) add_some(katakana_, 3, 4);
-  }
+std::u16string only_ascii(const std::u16string& text) {
+  std::u16string kept;
+  for (const char16_t c : text)
+    if (c < 0x80) kept += c;
+  return kept;
+}
 
-  Mixture mixture_;
-  const CharBytes& char_bytes_;
-  bool spaces_;
-  std::u16string english_, letters_, katakana_, stops_, digits_, ideographs_, text_;
-  size_t bytes_ = 0;
-  uint64_t state_ = 0x9E3779B97F4A7C15;
-};
+std::u16string sparse(const std::u16string& ascii, const std::u16string& language) {
+  std::u16string text;
+  size_t next = 0;
+  for (size_t at = 0; at < ascii.size(); at += kSparseUnits) {
+    text.append(ascii, at, kSparseUnits);
+    while (language[next] < 0x80) ++next;
+    text += language[next++];
+  }
+  return text;
+}
+
+bool has_punctuation(const std::u16string& word) {
+  return std::any_of(word.begin(), word.end(),
+                     [](char16_t c) { return c < 0x80 && (c < u'A' || c > u'z' || (c > u'Z' && c < u'a')); });
+}
+
+bool take_prefix(std::string* label, const char* prefix) {
+  if (label->compare(0, strlen(prefix), prefix) != 0) return false;
+  label->erase(0, strlen(prefix));
+  return true;
+}
+
+bool take_suffix(std::string* label, const char* suffix) {
+  const size_t bytes = strlen(suffix);
+  if (label->size() < bytes || label->compare(label->size() - bytes, bytes, suffix) != 0) return false;
+  label->erase(label->size() - bytes);
+  return true;
+}
 
 }  // namespace
 
-std::u16string make_text(Language language, Mixture mixture, const CharBytes& char_bytes, size_t bytes) {
-  return Generator(recipe_of(language), mixture, char_bytes).make(bytes);
+const std::u16string& Texts::find(const std::string& label) {
+  const auto place = known_.find(label);
+  return place != known_.end() ? place->second : known_.emplace(label, make(label)).first->second;
 }
 
-size_t utf8_bytes(char16_t c) {
-  return c < 0x80 ? 1 : c < 0x800 ? 2 : 3;
+std::vector<std::u16string> Texts::words(const std::string& language) {
+  std::vector<std::u16string> words = lines_of(to_utf16(read("words", language)));
+  words.erase(std::remove_if(words.begin(), words.end(), has_punctuation), words.end());
+  std::sort(words.begin(), words.end());
+  words.erase(std::unique(words.begin(), words.end()), words.end());
+  std::mt19937 random(1);
+  std::shuffle(words.begin(), words.end(), random);
+  return words;
+}
+
+std::u16string Texts::make(const std::string& label) {
+  std::string language = label;
+  if (label == "ASCII") return only_ascii(find("English-prose"));
+  if (take_prefix(&language, "sparse-")) {
+    const std::u16string &ascii = find("ASCII"), &other = find(language);
+    return ascii.empty() || other.empty() ? std::u16string() : sparse(ascii, other);
+  }
+  const bool is_prose = take_suffix(&language, "-prose");
+  const std::u16string text = to_utf16(read(is_prose ? "prose" : "phrases", language));
+  if (text.empty()) return text;
+  return is_prose ? repeated(text) : drawn_phrases(lines_of(text));
+}
+
+std::string Texts::read(const std::string& kind, const std::string& language) {
+  const std::string file_path = path(kind + "." + code_of(language));
+  std::ifstream file(file_path, std::ios::binary);
+  std::string bytes{std::istreambuf_iterator<char>(file), {}};
+  if (bytes.empty())
+    std::fprintf(stderr,
+                 "%s: not there; its rows are left out. scripts/bench makes it, and names the package\n",
+                 file_path.c_str());
+  return bytes;
+}
+
+std::u16string to_utf16(const std::string& utf8) {
+  std::u16string text;
+  for (size_t i = 0; i < utf8.size();) {
+    const auto byte = [&](size_t at) { return static_cast<unsigned>(static_cast<unsigned char>(utf8[at])); };
+    const unsigned lead = byte(i);
+    const size_t bytes = lead < 0x80 ? 1 : lead < 0xE0 ? 2 : lead < 0xF0 ? 3 : 4;
+    if (i + bytes > utf8.size()) break;
+    if (bytes == 1) text += static_cast<char16_t>(lead);
+    if (bytes == 2) text += static_cast<char16_t>((lead & 0x1F) << 6 | (byte(i + 1) & 0x3F));
+    if (bytes == 3)
+      text += static_cast<char16_t>((lead & 0x0F) << 12 | (byte(i + 1) & 0x3F) << 6 | (byte(i + 2) & 0x3F));
+    i += bytes;
+  }
+  return text;
 }
 
 std::string to_utf8(const std::u16string& text) {
-  std::string bytes(3 * text.size(), '\0');
-  int32_t count = 0;
-  UErrorCode error = U_ZERO_ERROR;
-  u_strToUTF8(bytes.data(), static_cast<int32_t>(bytes.size()), &count, text.data(),
-              static_cast<int32_t>(text.size()), &error);
-  bytes.resize(static_cast<size_t>(count));
+  std::string bytes;
+  const auto trail = [&](unsigned c) { bytes += static_cast<char>(0x80 | (c & 0x3F)); };
+  for (const char16_t c : text) {
+    if (c < 0x80) {
+      bytes += static_cast<char>(c);
+    } else if (c < 0x800) {
+      bytes += static_cast<char>(0xC0 | c >> 6);
+      trail(c);
+    } else {
+      bytes += static_cast<char>(0xE0 | c >> 12);
+      trail(c >> 6);
+      trail(c);
+    }
+  }
   return bytes;
+}
+
+std::string utf16_bytes(const std::u16string& text) {
+  return std::string(reinterpret_cast<const char*>(text.data()), text.size() * sizeof(char16_t));
 }
 
 }  // namespace bench

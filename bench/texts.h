@@ -1,29 +1,44 @@
-// The texts that are converted. They are made of words, numbers and punctuation by a fixed generator, so that
-// every run and every machine measures the same text.
+// The texts that are measured: names and phrases, prose and words of real languages, from the files that
+// scripts/bench makes.
 #pragma once
 
-#include <cstddef>
-#include <functional>
+#include <map>
 #include <string>
+#include <vector>
 
 namespace bench {
 
-enum class Language { kGerman, kRussian, kJapanese, kChinese };
+/// The texts of one directory. Characters beyond U+FFFF are left out.
+class Texts {
+ public:
+  explicit Texts(std::string directory) : directory_(std::move(directory)) {}
 
-enum class Mixture {
-  kNative,  // words of the language, with ASCII words and numbers between them
-  kAscii,   // English letters only
-  kSparse,  // ASCII with one character of the language in about 200
+  /// The path of a file of the directory.
+  std::string path(const std::string& name) const { return directory_ + "/" + name; }
+
+  /// A long text by its label; empty, with a line on standard error, when its file is not there.
+  ///   Russian           names and phrases, in random order
+  ///   Russian-prose     the text of a guide
+  ///   ASCII             English prose, its ASCII characters
+  ///   sparse-Japanese   ASCII with one character of the language in 200
+  const std::u16string& find(const std::string& label);
+
+  /// The words of a language in random order, each once and those of letters alone: libraries part on
+  /// punctuation. Empty as above.
+  std::vector<std::u16string> words(const std::string& language);
+
+ private:
+  std::u16string make(const std::string& label);
+  std::string read(const std::string& kind, const std::string& language);
+
+  std::string directory_;
+  std::map<std::string, std::u16string> known_;
 };
 
-/// The bytes of a character in the codepage of a text; 0 for one that must not occur in it.
-using CharBytes = std::function<size_t(char16_t)>;
-
-/// A text of at least `bytes` bytes that ends with a full stop.
-std::u16string make_text(Language language, Mixture mixture, const CharBytes& char_bytes, size_t bytes);
-
-/// UTF-8 of 16-bit values: the bytes of one, and a text.
-size_t utf8_bytes(char16_t c);
+/// Conversions of the texts themselves.
+std::u16string to_utf16(const std::string& utf8);
 std::string to_utf8(const std::u16string& text);
+/// The bytes of 16-bit values as they stand in memory.
+std::string utf16_bytes(const std::u16string& text);
 
 }  // namespace bench
