@@ -94,10 +94,19 @@ void Codepage::learn_shift_bytes() {
   LXPutCharEx(locale_, out, LX_SHIFT_SINGLE, 0x4141);
   LXPutCharEx(locale_, in, LX_SHIFT_DOUBLE, 0x41);
   shift_sensitive_ = in[1] != 0;
-  if (!shift_sensitive_) return;
+  if (!shift_sensitive_) return learn_char_bytes();
   shift_out_ = out[0];
   shift_in_ = in[0];
   double_bytes_ = LXByteLengthEx(locale_, "\x41", LX_SHIFT_DOUBLE);
+}
+
+void Codepage::learn_char_bytes() {
+  single_byte_ = true;
+  for (unsigned byte = 0; byte < char_bytes_.size(); ++byte) {
+    const char text = static_cast<char>(byte);
+    char_bytes_[byte] = static_cast<uint8_t>(LXByteLength(locale_, &text));
+    single_byte_ &= char_bytes_[byte] == 1;
+  }
 }
 
 size_t Codepage::call_bytes(const char* text, size_t bytes) const {
@@ -106,11 +115,6 @@ size_t Codepage::call_bytes(const char* text, size_t bytes) const {
     if (is_shift(text[i - 1]) && is_shift(text[i])) return i;
   }
   return bytes;
-}
-
-int32_t Codepage::char_bytes(const char* text, LXShiftState state) const {
-  if (shift_sensitive_) return state == LX_SHIFT_DOUBLE ? double_bytes_ : 1;
-  return LXByteLength(locale_, text);
 }
 
 size_t Codepage::whole_bytes(const char* text, size_t bytes, LXShiftState state,

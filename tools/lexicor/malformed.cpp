@@ -71,18 +71,11 @@ size_t short_utf8_bytes(const char* text, size_t bytes) {
 }  // namespace
 
 MalformedFinder::MalformedFinder(const Codepage& codepage, bool long_utf8_ends)
-    : codepage_(codepage), long_utf8_ends_(long_utf8_ends) {
-  if (codepage.shift_sensitive()) return;
-  single_byte_ = true;
-  for (int byte = 0; byte < 256; ++byte) {
-    const char text = static_cast<char>(byte);
-    if (codepage.char_bytes(&text, LX_SHIFT_SINGLE) > 1) single_byte_ = false;
-  }
-}
+    : codepage_(codepage), long_utf8_ends_(long_utf8_ends) {}
 
 Stretch MalformedFinder::next(const char* text, size_t bytes, LXShiftState state, bool last) const {
   if (codepage_.utf8()) return next_utf8(text, bytes, last);
-  if (single_byte_) return {bytes, 0, Stretch::End::kText};
+  if (codepage_.single_byte()) return {bytes, 0, Stretch::End::kText};
   // What stands behind malformed bytes is looked at again, so the windows begin small.
   size_t good = 0, window = kFirstWindowBytes;
   for (bool whole_call = false; !whole_call; window = std::min(2 * window, kLastWindowBytes)) {

@@ -52,7 +52,7 @@ Recoder::Recoder(const Codepage& source, const Codepage& target, const Input& in
   replacement_ = LXCpUnicodeToCharW(source.object(), kReplacement);
   has_replacement_ = !Substitution(source).stands_for(kReplacement, replacement_);
   repertoire_.watch(kReplacement);
-  if (!malformed_.single_byte()) return;
+  if (!source_.single_byte()) return;
   const std::vector<LXUChar> values = single_byte_values(source);
   for (LXWChar byte = 0; byte < values.size(); ++byte) {
     if (LXCpUnicodeToCharW(source.object(), values[byte]) != byte) repertoire_.watch(values[byte]);
@@ -122,7 +122,7 @@ size_t Recoder::convert_some(const char* text, size_t bytes, bool last) {
 size_t Recoder::convert_clean(const char* text, size_t bytes) {
   decode(text, bytes);
   if (unit_count_ == 0 || !repertoire_.has_all(units_.data(), unit_count_)) return 0;
-  const size_t own = malformed_.single_byte() ? bytes : own_bytes(text, bytes);
+  const size_t own = source_.single_byte() ? bytes : own_bytes(text, bytes);
   if (own == 0) return 0;
   if (losses_.places_wanted()) place_.pass(text, own, state_);
   offset_ += own;
