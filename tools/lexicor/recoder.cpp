@@ -87,22 +87,30 @@ void Recoder::finish() {
 }
 
 void Recoder::feed(const char* data, size_t bytes, bool last) {
-  text_.append(data, bytes);
+  if (text_.empty()) {
+    const size_t done = convert(data, bytes, last);
+    text_.assign(data + done, bytes - done);
+  } else {
+    text_.append(data, bytes);
+    text_.erase(0, convert(text_.data(), text_.size(), last));
+  }
+  flush();
+}
+
+/// Converts a text but for a cut character at its end, which waits for more; returns the bytes that it took.
+size_t Recoder::convert(const char* text, size_t bytes, bool last) {
   size_t at = 0;
-  while (at < text_.size()) {
-    const char* const text = text_.data() + at;
-    if (source_.is_shift(*text)) {
-      state_ = source_.state_after(*text);
+  while (at < bytes) {
+    if (source_.is_shift(text[at])) {
+      state_ = source_.state_after(text[at++]);
       ++offset_;
-      ++at;
       continue;
     }
-    const size_t done = convert_some(text, text_.size() - at, last);
+    const size_t done = convert_some(text + at, bytes - at, last);
     if (done == 0) break;
     at += done;
   }
-  text_.erase(0, at);
-  flush();
+  return at;
 }
 
 /// Converts the beginning of a text; 0 when it is a cut character, which waits for more.

@@ -37,6 +37,7 @@ class Recoder {
 
   void begin_file(const char** data, size_t* bytes);
   void feed(const char* data, size_t bytes, bool last);
+  size_t convert(const char* text, size_t bytes, bool last);
   size_t convert_some(const char* text, size_t bytes, bool last);
   size_t convert_clean(const char* text, size_t bytes);
   size_t own_bytes(const char* text, size_t bytes);
@@ -66,7 +67,7 @@ class Recoder {
   LXWChar replacement_ = 0;
   bool has_replacement_ = false;  // the source has a character for U+FFFD, with the code replacement_
 
-  std::string text_;  // not yet converted: of a cut character, then of this call
+  std::string text_;  // not yet converted: of a cut character
   uint64_t offset_ = 0;
   LXShiftState state_ = LX_SHIFT_SINGLE;
   size_t window_bytes_;  // of the next part that is tried as a whole

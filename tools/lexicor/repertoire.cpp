@@ -2,7 +2,6 @@
 #include "repertoire.h"
 
 #include <cstdint>
-#include <cstring>
 
 #include "hex.h"
 
@@ -27,34 +26,35 @@ Repertoire::Repertoire(const Codepage& codepage)
     const LXWChar code = LXCpUnicodeToCharW(codepage.object(), unit);
     lost_[unicode] = substitution_.stands_for(unit, code) || value_of(code) != unit;
   }
-  watched_ = lost_;
+  for (uint32_t unicode = 0; unicode < kValues; ++unicode) {
+    if (lost_[unicode]) watched_[unicode / kWordBits] |= uint64_t{1} << unicode % kWordBits;
+  }
   learn_ascii();
 }
 
 void Repertoire::watch(LXUChar unicode) {
-  watched_.set(unicode);
+  watched_[unicode / kWordBits] |= uint64_t{1} << unicode % kWordBits;
   learn_ascii();
 }
 
 void Repertoire::learn_ascii() {
-  has_ascii_ = (watched_ << (kValues - kAscii)).none();
+  has_ascii_ = (watched_[0] | watched_[1]) == 0;
 }
 
 bool Repertoire::has_all(const LXUChar* units, size_t count) const {
-  constexpr uint64_t kBeyondAscii = 0xFF80FF80FF80FF80u;
-  constexpr size_t kTogether = 4;
+  constexpr size_t kTogether = 16;
+  const auto any_watched = [&](size_t begin, size_t end) {
+    uint64_t watched = 0;
+    for (size_t i = begin; i < end; ++i) watched |= watched_[units[i] / kWordBits] >> units[i] % kWordBits;
+    return (watched & 1) != 0;
+  };
   size_t i = 0;
   for (; count - i >= kTogether; i += kTogether) {
-    uint64_t together;
-    std::memcpy(&together, units + i, sizeof together);
-    if ((together & kBeyondAscii) == 0 && has_ascii_) continue;
-    if (watched_[units[i]] || watched_[units[i + 1]] || watched_[units[i + 2]] || watched_[units[i + 3]])
-      return false;
+    unsigned all_bits = 0;
+    for (size_t k = i; k < i + kTogether; ++k) all_bits |= units[k];
+    if ((all_bits >= kAscii || !has_ascii_) && any_watched(i, i + kTogether)) return false;
   }
-  for (; i < count; ++i) {
-    if (watched_[units[i]]) return false;
-  }
-  return true;
+  return !any_watched(i, count);
 }
 
 LXUChar Repertoire::back(LXUChar unicode) const {

@@ -3,7 +3,9 @@
 
 #include <lx.h>
 
+#include <array>
 #include <bitset>
+#include <cstdint>
 #include <string>
 #include <vector>
 
@@ -27,7 +29,8 @@ class Repertoire {
   void watch(LXUChar unicode);
 
  private:
-  static constexpr uint32_t kValues = 0x10000, kAscii = 0x80;
+  static constexpr uint32_t kValues = 0x10000, kAscii = 0x80, kWordBits = 64;
+  static_assert(kAscii == 2 * kWordBits);
 
   /// What a value is when it is written and read back; U+FFFD when the codepage lacks it.
   LXUChar back(LXUChar unicode) const;
@@ -38,7 +41,7 @@ class Repertoire {
   const Substitution substitution_;
   const std::vector<LXUChar> single_;
   std::bitset<kValues> lost_;
-  std::bitset<kValues> watched_;  // and those that are lost
+  std::array<uint64_t, kValues / kWordBits> watched_{};  // and those that are lost, a bit each
   bool has_ascii_;
 };
 
