@@ -7,6 +7,7 @@
 #include <cstdint>
 #include <cstring>
 
+#include "byte_vector.h"
 #include "character_values.h"
 #include "hex.h"
 
@@ -43,21 +44,14 @@ size_t utf8_beginning(const char* text, size_t bytes, const Utf8Lead& lead) {
   return count;
 }
 
-using ByteVector = uint8_t __attribute__((vector_size(16)));
-
-ByteVector load(const uint8_t* bytes) {
-  ByteVector vector;
-  std::memcpy(&vector, bytes, sizeof vector);
-  return vector;
-}
-
 /// Whether a block goes on with characters of up to three bytes. What it begins with depends on the two bytes in front of
 /// it; its last character may be cut. Every byte is looked at with those before it, in the same way.
 constexpr size_t kBlock = 64;
 bool short_utf8_goes_on(const uint8_t* block) {
   ByteVector wrong{};
   for (size_t i = 0; i < kBlock; i += sizeof wrong) {
-    const ByteVector byte = load(block + i), before = load(block + i - 1), second_before = load(block + i - 2);
+    const ByteVector byte = load_bytes(block + i), before = load_bytes(block + i - 1),
+                     second_before = load_bytes(block + i - 2);
     const auto trails = (byte & 0xC0) == 0x80;
     const auto follows = (before >= 0xC0) | (second_before >= 0xE0);
     // Below A0 it could be shorter, and from A0 on behind ED it is a surrogate.
@@ -65,10 +59,7 @@ bool short_utf8_goes_on(const uint8_t* block) {
     const auto no_lead = (byte >= 0xF0) | ((byte & 0xFE) == 0xC0);
     wrong |= reinterpret_cast<ByteVector>((trails ^ follows) | out_of_range | no_lead);
   }
-  uint64_t words[2];
-  static_assert(sizeof words == sizeof wrong);
-  std::memcpy(words, &wrong, sizeof words);
-  return (words[0] | words[1]) == 0;
+  return !any(wrong);
 }
 
 /// Well-formed characters of up to three bytes at the start of a text; the last bytes are left over.
