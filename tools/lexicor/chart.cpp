@@ -150,10 +150,9 @@ std::string as_html(const std::vector<ChartPage>& pages, const Codepage& codepag
 
 int chart(const ChartOptions& options, const CommonOptions& common) {
   const Session session(common);
-  const Catalogue catalogue = read_catalogue();
-  const Codepage codepage(session, catalogue, options.codepage);
+  const Codepage codepage(session, options.codepage);
   std::unique_ptr<Codepage> other;
-  if (!options.other.empty()) other = std::make_unique<Codepage>(session, catalogue, options.other);
+  if (!options.other.empty()) other = std::make_unique<Codepage>(session, options.other);
   const std::vector<ChartPage> pages = chart_pages(codepage, other.get());
   Output output(options.output);
   output.write(options.html ? as_html(pages, codepage, other.get())

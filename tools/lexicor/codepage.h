@@ -7,7 +7,6 @@
 #include <cstdint>
 #include <string>
 
-#include "catalogue.h"
 #include "session.h"
 
 namespace lexicor_cli {
@@ -17,8 +16,7 @@ class Codepage {
   /// `name` is an object name, a decimal identifier or an alias, in any letter case. Throws a Failure that
   /// names the nearest codepages when there is none, or that says why its file could not be loaded. Its locale
   /// has the given language and territory ("German_Austria"); empty: any will do.
-  Codepage(const Session& session, const Catalogue& catalogue, const std::string& name,
-           const std::string& language_territory = "");
+  Codepage(const Session& session, const std::string& name, const std::string& language_territory = "");
   ~Codepage();
   Codepage(const Codepage&) = delete;
   Codepage& operator=(const Codepage&) = delete;

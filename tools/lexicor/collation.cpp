@@ -31,7 +31,7 @@ Collation::Collation(RulesSession& session, const std::string& locale_name, cons
 
 Collation::Collation(const Session& session, const LocalePtr& named, const std::string& codepage,
                      std::optional<uint16_t> sort_id)
-    : codepage_(session, read_catalogue(), codepage, language_territory(named.get())) {
+    : codepage_(session, codepage, language_territory(named.get())) {
   const int32_t id = sort_id ? *sort_id : number_item(named.get(), LX_ITEM_SORT_ID).value_or(0);
   int32_t code = LX_OK;
   sort_ = LXGetObjFromID(nullptr, LX_SORT, static_cast<uint16_t>(id), LX_FIND_AND_LOAD, &code);

@@ -4,7 +4,6 @@
 #include <memory>
 
 #include "arguments.h"
-#include "catalogue.h"
 #include "codepage.h"
 #include "command.h"
 #include "input.h"
@@ -26,9 +25,8 @@ struct ConvertOptions {
 
 int convert(const ConvertOptions& options, const CommonOptions& common) {
   const Session session(common);
-  const Catalogue catalogue = read_catalogue();
-  const Codepage source(session, catalogue, options.from);
-  const Codepage target(session, catalogue, options.to);
+  const Codepage source(session, options.from);
+  const Codepage target(session, options.to);
   Input input(options.files);
   Pieces pieces(input);
   Output output(options.output);

@@ -6,7 +6,6 @@
 #include <memory>
 
 #include "arguments.h"
-#include "catalogue.h"
 #include "codepage.h"
 #include "command.h"
 #include "input.h"
@@ -46,7 +45,7 @@ void report(const LineEndRewriter& rewriter) {
 
 int rewrite_lines(const LinesOptions& options, const CommonOptions& common) {
   const Session session(common);
-  const Codepage codepage(session, read_catalogue(), options.from);
+  const Codepage codepage(session, options.from);
   uint32_t find = options.find.empty() ? LX_EOL_ALL : 0;
   for (const std::string& name : options.find) find |= kLineEnds.at(name);
   Input input(options.files);

@@ -46,8 +46,7 @@ Recoder::Recoder(const Codepage& source, const Codepage& target, const Input& in
       copies_(source.utf8() && target.utf8()),
       window_bytes_(Pieces::kBytes),
       place_(source),
-      units_(1),
-      out_(Pieces::kBytes) {
+      units_(1) {
   if (source.utf8()) return;
   replacement_ = LXCpUnicodeToCharW(source.object(), kReplacement);
   has_replacement_ = !Substitution(source).stands_for(kReplacement, replacement_);
@@ -287,8 +286,10 @@ void Recoder::emit() {
   if (target_.shift_sensitive() && unit_count_ != 0) target_state_ = state_behind(target_);
 }
 
-/// Room for so many bytes of output.
+/// Room for so many bytes of output. It grows with the text.
 char* Recoder::room(size_t bytes) {
+  if (out_.size() < Pieces::kBytes && out_.size() - out_used_ < bytes)
+    out_.resize(std::max(out_used_ + bytes, 2 * out_.size()));
   if (out_.size() - out_used_ < bytes) flush();
   if (out_.size() < bytes) out_.resize(bytes);
   return out_.data() + out_used_;

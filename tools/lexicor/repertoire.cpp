@@ -17,44 +17,60 @@ constexpr bool is_surrogate(uint32_t unicode) {
 
 Repertoire::Repertoire(const Codepage& codepage)
     : codepage_(codepage), substitution_(codepage), single_(single_byte_values(codepage)) {
-  for (uint32_t unicode = 0; unicode < kValues; ++unicode) {
-    const auto unit = static_cast<LXUChar>(unicode);
-    if (codepage.utf8()) {
-      lost_[unicode] = is_surrogate(unicode);
-      continue;
+  watched_.fill(~uint64_t{0});
+}
+
+bool Repertoire::is_lost(LXUChar unicode) const {
+  if (codepage_.utf8()) return is_surrogate(unicode);
+  const LXWChar code = LXCpUnicodeToCharW(codepage_.object(), unicode);
+  return substitution_.stands_for(unicode, code) || value_of(code) != unicode;
+}
+
+void Repertoire::learn_page(uint32_t page) const {
+  if (!learned_[page]) learn_values(page);
+}
+
+void Repertoire::learn_values(uint32_t page) const {
+  learned_.set(page);
+  for (uint32_t word = page * kPage / kWordBits; word < (page + 1) * kPage / kWordBits; ++word) {
+    watched_[word] = 0;
+    for (uint32_t bit = 0; bit < kWordBits; ++bit) {
+      const uint32_t unicode = word * kWordBits + bit;
+      lost_[unicode] = is_lost(static_cast<LXUChar>(unicode));
+      if (lost_[unicode] || asked_[unicode]) watched_[word] |= uint64_t{1} << bit;
     }
-    const LXWChar code = LXCpUnicodeToCharW(codepage.object(), unit);
-    lost_[unicode] = substitution_.stands_for(unit, code) || value_of(code) != unit;
   }
-  for (uint32_t unicode = 0; unicode < kValues; ++unicode) {
-    if (lost_[unicode]) watched_[unicode / kWordBits] |= uint64_t{1} << unicode % kWordBits;
-  }
-  learn_ascii();
+}
+
+void Repertoire::learn_pages(const LXUChar* units, size_t count) const {
+  for (size_t i = 0; i < count; ++i) learn_page(units[i] / kPage);
 }
 
 void Repertoire::watch(LXUChar unicode) {
+  asked_.set(unicode);
   watched_[unicode / kWordBits] |= uint64_t{1} << unicode % kWordBits;
-  learn_ascii();
-}
-
-void Repertoire::learn_ascii() {
-  has_ascii_ = (watched_[0] | watched_[1]) == 0;
 }
 
 bool Repertoire::has_all(const LXUChar* units, size_t count) const {
   constexpr size_t kTogether = 16;
-  const auto any_watched = [&](size_t begin, size_t end) {
+  const auto any_watched = [&](const LXUChar* some, size_t some_count) {
     uint64_t watched = 0;
-    for (size_t i = begin; i < end; ++i) watched |= watched_[units[i] / kWordBits] >> units[i] % kWordBits;
+    for (size_t i = 0; i < some_count; ++i) watched |= watched_[some[i] / kWordBits] >> some[i] % kWordBits;
     return (watched & 1) != 0;
+  };
+  const auto lacks = [&](const LXUChar* some, size_t some_count) {
+    if (!any_watched(some, some_count)) return false;
+    learn_pages(some, some_count);
+    return any_watched(some, some_count);
   };
   size_t i = 0;
   for (; count - i >= kTogether; i += kTogether) {
     unsigned all_bits = 0;
     for (size_t k = i; k < i + kTogether; ++k) all_bits |= units[k];
-    if ((all_bits >= kAscii || !has_ascii_) && any_watched(i, i + kTogether)) return false;
+    const bool ascii = all_bits < kAscii && (watched_[0] | watched_[1]) == 0;
+    if (!ascii && lacks(units + i, kTogether)) return false;
   }
-  return !any_watched(i, count);
+  return !lacks(units + i, count - i);
 }
 
 LXUChar Repertoire::back(LXUChar unicode) const {

@@ -19,7 +19,10 @@ class Repertoire {
  public:
   explicit Repertoire(const Codepage& codepage);
 
-  bool has(LXUChar unicode) const { return !lost_[unicode]; }
+  bool has(LXUChar unicode) const {
+    learn_page(unicode / kPage);
+    return !lost_[unicode];
+  }
   bool has_all(const LXUChar* units, size_t count) const;
   /// How a value that the codepage has not is lost.
   LossKind kind_of_loss(LXUChar unicode) const;
@@ -29,20 +32,26 @@ class Repertoire {
   void watch(LXUChar unicode);
 
  private:
-  static constexpr uint32_t kValues = 0x10000, kAscii = 0x80, kWordBits = 64;
+  static constexpr uint32_t kValues = 0x10000, kPage = 0x100, kAscii = 0x80, kWordBits = 64;
   static_assert(kAscii == 2 * kWordBits);
 
   /// What a value is when it is written and read back; U+FFFD when the codepage lacks it.
   LXUChar back(LXUChar unicode) const;
-  void learn_ascii();
+  void learn_page(uint32_t page) const;
+  void learn_values(uint32_t page) const;
+  void learn_pages(const LXUChar* units, size_t count) const;
+  bool is_lost(LXUChar unicode) const;
   LXUChar value_of(LXWChar code) const;
 
   const Codepage& codepage_;
   const Substitution substitution_;
   const std::vector<LXUChar> single_;
-  std::bitset<kValues> lost_;
-  std::array<uint64_t, kValues / kWordBits> watched_{};  // and those that are lost, a bit each
-  bool has_ascii_;
+  // Pages of values are looked at when the first of them is met.
+  mutable std::bitset<kValues / kPage> learned_;
+  mutable std::bitset<kValues> lost_;
+  // A bit for each value that has_all() does not pass over: of pages that are not learned, of lost and watched values.
+  mutable std::array<uint64_t, kValues / kWordBits> watched_;
+  std::bitset<kValues> asked_;  // that are watched on request
 };
 
 /// That a codepage lacks a character.
