@@ -56,10 +56,12 @@ bool is_wide_encoding(const std::string& text) {
   if (session.built_in_only())
     throw Failure(kDataError, "codepage '" + text + "' is not there without a locale directory");
   if (is_wide_encoding(text))
-    throw Failure(kUsageError,
-                  "codepage '" + text +
-                      "' is not supported: its characters are no bytes but units of 16 or 32 bits; "
-                      "'lexicor translate' takes UTF-16 in this machine's byte order");
+    throw Failure(
+        kUsageError,
+        "codepage '" + text +
+            "' is not supported: its characters are no bytes but units of 16 or 32 bits; "
+            "'lexicor convert' takes UTF-16 and UTF-32, 'lexicor translate' UTF-16 in this machine's byte "
+            "order");
   const std::string near = did_you_mean(nearest_codepages(read_catalogue(), text, 3));
   throw Failure(kUsageError, "unknown codepage '" + text + "'" +
                                  (near.empty() ? "; 'lexicor list codepages' shows those there are" : near));

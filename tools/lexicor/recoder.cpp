@@ -34,13 +34,14 @@ std::string code_bytes(LXWChar code) {
 
 }  // namespace
 
-Recoder::Recoder(const Codepage& source, const Codepage& target, const Input& input, Output* output,
-                 Losses& losses)
+Recoder::Recoder(const Codepage& source, const Codepage& target, const Input& input, Sink* output,
+                 Losses& losses, const RecoderRules& rules)
     : source_(source),
       target_(target),
       input_(input),
       output_(output),
       losses_(losses),
+      rules_(rules),
       malformed_(source, !target.utf8()),
       repertoire_(target),
       copies_(source.utf8() && target.utf8()),
@@ -69,8 +70,9 @@ void Recoder::begin_file(const char** data, size_t* bytes) {
   for (; !text_.empty() && *bytes > 0; --*bytes) feed((*data)++, 1, false);
   if (!text_.empty()) return;
   place_.restart();
-  if (!at_char || output_ == nullptr || !source_.utf8() || repertoire_.has(kSignatureValue) ||
-      *bytes < kSignatureBytes || std::memcmp(*data, kSignature, kSignatureBytes) != 0)
+  if (!at_char || output_ == nullptr || !source_.utf8() || rules_.unit_bytes != 0 ||
+      (repertoire_.has(kSignatureValue) && !rules_.drops_marks) || *bytes < kSignatureBytes ||
+      std::memcmp(*data, kSignature, kSignatureBytes) != 0)
     return;
   *data += kSignatureBytes;
   *bytes -= kSignatureBytes;
@@ -83,6 +85,26 @@ void Recoder::finish() {
     const char shift_in = target_.shift_byte(LX_SHIFT_SINGLE);
     write(&shift_in, 1);
   }
+}
+
+void Recoder::end_record() {
+  finish();
+  target_state_ = state_ = LX_SHIFT_SINGLE;
+  place_.restart();
+  ++record_;
+}
+
+void Recoder::take_malformed(uint32_t input_bytes, const std::string& what) {
+  if (losses_.places_wanted())
+    losses_.record(LossKind::kMalformed, where(offset_), what);
+  else
+    losses_.count(LossKind::kMalformed, 1);
+  place_.pass_malformed();
+  offset_ += input_bytes;
+  units_[0] = kReplacement;
+  unit_count_ = 1;
+  emit();
+  flush();
 }
 
 void Recoder::feed(const char* data, size_t bytes, bool last) {
@@ -188,14 +210,29 @@ void Recoder::lose(const char* text, const Stretch& stretch, const char* end) {
   else
     losses_.count(kind, 1);
   place_.pass_malformed();
-  offset_ += stretch.end_bytes;
+  offset_ += input_bytes(text, stretch.end_bytes);
   units_[0] = kReplacement;
   unit_count_ = 1;
   emit();
 }
 
-std::string Recoder::where(uint64_t offset) const {
-  return losses_.places_wanted() ? input_.locate(offset, place_.line(), place_.column()) : "";
+InputPlace Recoder::where(uint64_t offset) const {
+  if (!losses_.places_wanted()) return {};
+  InputPlace place = input_.place(offset);
+  place.line = rules_.records ? record_ : place_.line();
+  place.column = place_.column();
+  if (rules_.records) place.line_name = "record";
+  return place;
+}
+
+/// The bytes that well-formed text had in the input.
+uint64_t Recoder::input_bytes(const char* text, size_t bytes) const {
+  if (rules_.unit_bytes == 0) return bytes;
+  const char* const end = text + bytes;
+  const auto chars = std::count_if(text, end, [](char c) { return !is_utf8_trail(c); });
+  // Beyond U+FFFF two units of 16 bits.
+  const auto pairs = rules_.unit_bytes == 2 ? std::count_if(text, end, is_long_utf8_lead) : 0;
+  return static_cast<uint64_t>(chars + pairs) * rules_.unit_bytes;
 }
 
 void Recoder::decode(const char* text, size_t bytes) {
@@ -207,6 +244,7 @@ void Recoder::decode(const char* text, size_t bytes) {
 
 /// Records the losses of the decoded text with their places.
 void Recoder::find_losses(const char* text, size_t bytes) {
+  const char* const begin = text;
   const char* const end = text + bytes;
   const char* passed = text;  // by the place
   LXShiftState state = state_, passed_state = state_;
@@ -223,7 +261,7 @@ void Recoder::find_losses(const char* text, size_t bytes) {
         passed = text;
         passed_state = state;
       }
-      losses_.record(kind, where(offset_ + bytes - static_cast<uint64_t>(end - text)), what);
+      losses_.record(kind, where(offset_ + input_bytes(begin, static_cast<size_t>(text - begin))), what);
     }
     text += c.bytes;
   }
@@ -262,7 +300,7 @@ bool Recoder::find_loss(const Char& c, LossKind* kind, std::string* what) const 
 
 /// Goes past well-formed text.
 void Recoder::pass(const char* text, size_t bytes) {
-  offset_ += bytes;
+  offset_ += input_bytes(text, bytes);
   if (source_.shift_sensitive()) source_.whole_bytes(text, bytes, state_, &state_);
 }
 

@@ -96,7 +96,7 @@ std::vector<char> read_units(const Side& target, const Input& input, Pieces& pie
     LXUChar unit;
     std::memcpy(&unit, text.data() + at, sizeof unit);
     if (!repertoire.has(unit))
-      losses->record(repertoire.kind_of_loss(unit), input.locate(at), repertoire.describe_loss(unit));
+      losses->record(repertoire.kind_of_loss(unit), input.place(at), repertoire.describe_loss(unit));
   }
   return text;
 }
