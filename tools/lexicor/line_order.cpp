@@ -37,10 +37,12 @@ int32_t LineOrder::compare(std::string_view key1, std::string_view key2) const {
 int32_t LineOrder::compare_texts(std::string_view text1, std::string_view text2) const {
   std::string room1, room2;
   for (const SortField& field : fields_) {
-    const int32_t result =
-        collation_.compare(whole_ ? text1 : finder_.find(text1, field, &room1),
-                           whole_ ? text2 : finder_.find(text2, field, &room2), options_of(field));
-    if (result != 0) return (result < 0) == field.reverse ? 1 : -1;
+    const std::string_view part1 = whole_ ? text1 : finder_.find(text1, field, &room1);
+    const std::string_view part2 = whole_ ? text2 : finder_.find(text2, field, &room2);
+    // Where the comparison contradicts itself, it is not the same from both sides.
+    const int32_t result = field.reverse ? collation_.compare(part2, part1, options_of(field))
+                                         : collation_.compare(part1, part2, options_of(field));
+    if (result != 0) return result;
   }
   return 0;
 }

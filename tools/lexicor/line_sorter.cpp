@@ -31,7 +31,10 @@ void merge_sort(Rows<KeyEntry>* entries, Before before) {
       KeyEntry* const begin = entries->begin() + at;
       KeyEntry* const middle = begin + std::min(run, count - at);
       KeyEntry* const end = begin + std::min(2 * run, count - at);
-      std::merge(begin, middle, middle, end, &merged[at], before);
+      if (middle == end || !before(*middle, middle[-1]))
+        std::copy(begin, end, &merged[at]);
+      else
+        std::merge(begin, middle, middle, end, &merged[at], before);
     }
     std::copy(merged.begin(), merged.end(), entries->begin());
   }

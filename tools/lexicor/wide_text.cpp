@@ -1,7 +1,8 @@
-// Units are made of bytes, so that the byte order of the machine does not count.
+// Runs of units that are characters go in loops; what is a pair, or no character, is looked at by itself.
 #include "wide_text.h"
 
 #include <cctype>
+#include <cstring>
 
 #include "hex.h"
 #include "near_names.h"
@@ -18,6 +19,83 @@ constexpr bool is_high_half(uint32_t unit) {
 }
 constexpr bool is_low_half(uint32_t unit) {
   return unit >= 0xDC00 && unit < 0xE000;
+}
+constexpr bool is_half(uint32_t unit) {
+  return unit >= 0xD800 && unit < 0xE000;
+}
+
+constexpr uint16_t swapped(uint16_t unit) {
+  return __builtin_bswap16(unit);
+}
+constexpr uint32_t swapped(uint32_t unit) {
+  return __builtin_bswap32(unit);
+}
+constexpr bool is_swapped(bool little) {
+  return little != (__BYTE_ORDER__ == __ORDER_LITTLE_ENDIAN__);
+}
+
+/// Stores a code point as UTF-8; returns past it.
+char* put_utf8(char* out, uint32_t value) {
+  const auto trail = [&](int shift) { return static_cast<char>(0x80 | (value >> shift & 0x3F)); };
+  if (value < 0x80) {
+    *out++ = static_cast<char>(value);
+  } else if (value < 0x800) {
+    *out++ = static_cast<char>(0xC0 | value >> 6);
+    *out++ = trail(0);
+  } else if (value < 0x10000) {
+    *out++ = static_cast<char>(0xE0 | value >> 12);
+    *out++ = trail(6);
+    *out++ = trail(0);
+  } else {
+    *out++ = static_cast<char>(0xF0 | value >> 18);
+    *out++ = trail(12);
+    *out++ = trail(6);
+    *out++ = trail(0);
+  }
+  return out;
+}
+
+/// Stores the code points of units up to the first one that is none alone as UTF-8; returns the bytes that were read.
+template <class Unit>
+size_t put_plain(const char* p, size_t bytes, bool swap, char** out) {
+  size_t at = 0;
+  for (; bytes - at >= sizeof(Unit); at += sizeof(Unit)) {
+    Unit unit;
+    std::memcpy(&unit, p + at, sizeof unit);
+    if (swap) unit = swapped(unit);
+    if (is_half(unit) || unit > kLastCodePoint) break;
+    *out = put_utf8(*out, unit);
+  }
+  return at;
+}
+
+/// Stores the units of whole characters in UTF-8; returns past them.
+template <class Unit>
+char* put_units(const char* p, const char* end, bool swap, char* out) {
+  const auto put = [&](uint32_t value) {
+    auto unit = static_cast<Unit>(value);
+    if (swap) unit = swapped(unit);
+    std::memcpy(out, &unit, sizeof unit);
+    out += sizeof unit;
+  };
+  const auto bits = [&](int i) { return static_cast<uint32_t>(p[i] & 0x3F); };
+  while (p < end) {
+    const auto lead = static_cast<uint8_t>(*p);
+    const size_t length = lead < 0x80 ? 1 : lead < 0xE0 ? 2 : lead < 0xF0 ? 3 : 4;
+    if (length > static_cast<size_t>(end - p)) break;
+    const uint32_t value = length == 1   ? lead
+                           : length == 2 ? (lead & 0x1Fu) << 6 | bits(1)
+                           : length == 3 ? (lead & 0x0Fu) << 12 | bits(1) << 6 | bits(2)
+                                         : (lead & 0x07u) << 18 | bits(1) << 12 | bits(2) << 6 | bits(3);
+    p += length;
+    if (sizeof(Unit) == 2 && value >= 0x10000) {
+      put(0xD800 + ((value - 0x10000) >> 10));
+      put(0xDC00 + (value & 0x3FF));
+    } else {
+      put(value);
+    }
+  }
+  return out;
 }
 
 }  // namespace
@@ -62,12 +140,25 @@ void WideReader::take(const char* data, size_t bytes) {
   cut_.append(data, bytes);
   size_t at = begins_ ? take_mark(cut_.data(), cut_.size()) : 0;
   while (!begins_) {
+    at += take_plain(cut_.data() + at, cut_.size() - at);
     const size_t taken = take_char(cut_.data() + at, cut_.size() - at);
     if (taken == 0) break;
     at += taken;
   }
   cut_.erase(0, at);
   flush();
+}
+
+/// Takes characters that are one unit each.
+size_t WideReader::take_plain(const char* p, size_t bytes) {
+  constexpr size_t kMostBytes = 4;
+  const size_t before = text_.size();
+  text_.resize(before + bytes / encoding_.unit_bytes * kMostBytes);
+  char* out = text_.data() + before;
+  const size_t taken = encoding_.unit_bytes == 2 ? put_plain<uint16_t>(p, bytes, is_swapped(little_), &out)
+                                                 : put_plain<uint32_t>(p, bytes, is_swapped(little_), &out);
+  text_.resize(static_cast<size_t>(out - text_.data()));
+  return taken;
 }
 
 void WideReader::finish() {
@@ -131,30 +222,12 @@ void WideReader::flush() {
   text_.clear();
 }
 
-void WideWriter::put(uint32_t unit) {
-  for (uint32_t i = 0; i < unit_bytes_; ++i)
-    out_ += static_cast<char>(unit >> 8 * (little_ ? i : unit_bytes_ - 1 - i));
-}
-
 void WideWriter::write(const char* data, size_t bytes) {
-  const char* const end = data + bytes;
-  while (data != end) {
-    const auto lead = static_cast<uint8_t>(*data++);
-    uint32_t value = lead < 0x80   ? lead
-                     : lead < 0xE0 ? lead & 0x1Fu
-                     : lead < 0xF0 ? lead & 0x0Fu
-                                   : lead & 0x07u;
-    while (lead >= 0x80 && data != end && (*data & 0xC0) == 0x80)
-      value = value << 6 | (static_cast<uint8_t>(*data++) & 0x3Fu);
-    if (unit_bytes_ == 2 && value >= 0x10000) {
-      put(0xD800 + ((value - 0x10000) >> 10));
-      put(0xDC00 + (value & 0x3FF));
-    } else {
-      put(value);
-    }
-  }
-  output_.write(out_);
-  out_.clear();
+  if (out_.size() < bytes * unit_bytes_) out_.resize(bytes * unit_bytes_);
+  char* const end = unit_bytes_ == 2
+                        ? put_units<uint16_t>(data, data + bytes, is_swapped(little_), out_.data())
+                        : put_units<uint32_t>(data, data + bytes, is_swapped(little_), out_.data());
+  output_.write(out_.data(), static_cast<size_t>(end - out_.data()));
 }
 
 }  // namespace lexicor_cli

@@ -4,6 +4,7 @@
 #include <cstdint>
 #include <optional>
 #include <string>
+#include <vector>
 
 #include "input.h"
 #include "output.h"
@@ -38,6 +39,7 @@ class WideReader {
  private:
   uint32_t unit_at(const char* p) const;
   size_t take_mark(const char* data, size_t bytes);
+  size_t take_plain(const char* p, size_t bytes);
   size_t take_char(const char* p, size_t bytes);
   void refuse(const char* p, uint32_t bytes, const char* reason);
   void flush();
@@ -65,12 +67,10 @@ class WideWriter : public Sink {
   void write(const char* data, size_t bytes) override;
 
  private:
-  void put(uint32_t unit);
-
   const uint32_t unit_bytes_;
   const bool little_;
   Sink& output_;
-  std::string out_;
+  std::vector<char> out_;  // room
 };
 
 }  // namespace lexicor_cli
