@@ -19,14 +19,6 @@ char byte_of(const Codepage& codepage, LXUChar unicode) {
   return static_cast<char>(LXCpUnicodeToCharW(codepage.object(), unicode));
 }
 
-bool ascii_is_single(const Codepage& codepage) {
-  if (codepage.shift_sensitive()) return false;
-  for (char c = 0x7F; c >= 0; --c) {
-    if (codepage.char_bytes(&c, LX_SHIFT_SINGLE) != 1) return false;
-  }
-  return true;
-}
-
 }  // namespace
 
 LineReader::LineReader(const Codepage& codepage, Input& input, bool null_ended, size_t block_bytes)
@@ -36,8 +28,7 @@ LineReader::LineReader(const Codepage& codepage, Input& input, bool null_ended, 
       block_bytes_(std::min(kFirstBlock, block_bytes)),
       end_(byte_of(codepage, null_ended ? 0 : '\n')),
       carriage_return_(byte_of(codepage, '\r')),
-      null_ended_(null_ended),
-      ascii_(ascii_is_single(codepage)) {}
+      null_ended_(null_ended) {}
 
 bool LineReader::read(Arena* texts, Rows<Line>* lines) {
   // A line that is longer than a block makes the blocks grow, so that its text is not moved too often.
@@ -128,22 +119,24 @@ size_t LineReader::whole_bytes(std::string_view text, LXShiftState* state) const
     }
     return codepage_.whole_bytes(text.data(), text.size(), LX_SHIFT_SINGLE, state);
   }
+  if (ends_whole(text)) return text.size();
   size_t at = 0;
   while (at < text.size()) {
-    constexpr uint64_t kBeyondAscii = 0x8080808080808080u;
-    uint64_t word;
-    if (ascii_ && text.size() - at >= sizeof word) {
-      std::memcpy(&word, text.data() + at, sizeof word);
-      if ((word & kBeyondAscii) == 0) {
-        at += sizeof word;
-        continue;
-      }
-    }
     const auto bytes = static_cast<size_t>(codepage_.char_bytes(&text[at], LX_SHIFT_SINGLE));
-    if (bytes > text.size() - at) return at;
+    if (bytes > text.size() - at) break;
     at += bytes;
   }
   return at;
+}
+
+/// Whether none of the last bytes begins a character that goes beyond the end, wherever characters begin.
+bool LineReader::ends_whole(std::string_view text) const {
+  constexpr size_t kMostBytes = 4;  // of a character
+  for (size_t back = 1; back < kMostBytes && back <= text.size(); ++back) {
+    const char* const at = text.data() + text.size() - back;
+    if (codepage_.char_bytes(at, LX_SHIFT_SINGLE) > static_cast<int32_t>(back)) return false;
+  }
+  return true;
 }
 
 std::string without_idle_shifts(const Codepage& codepage, std::string_view text) {

@@ -41,6 +41,7 @@ class LineReader {
   void add_line(const char* begin, const char* end, uint64_t offset, Rows<Line>* lines);
   void add_last(char* text, Rows<Line>* lines);
   LXShiftState check_whole(std::string_view text, uint64_t offset, bool ended) const;
+  bool ends_whole(std::string_view text) const;
   size_t whole_bytes(std::string_view text, LXShiftState* state) const;
 
   const Codepage& codepage_;
@@ -50,7 +51,6 @@ class LineReader {
   const char end_;
   const char carriage_return_;
   const bool null_ended_;
-  const bool ascii_;     // bytes below 0x80 are characters
   std::string begun_;    // a line whose end has not been read
   bool two_ = false;     // the line before ended with two characters
   uint64_t offset_ = 0;  // of what is read next
