@@ -54,7 +54,7 @@ uint64_t usual_sort_memory() {
   const auto page = static_cast<uint64_t>(sysconf(_SC_PAGESIZE));
   const uint64_t memory = std::min(pages * page, group_memory());
   // Of an address space of 32 bits no more than a part is free in one piece.
-  constexpr uint64_t kMost = sizeof(void*) == 4 ? 1024 * kMebibyte : std::numeric_limits<uint64_t>::max();
+  constexpr uint64_t kMost = sizeof(void*) == 4 ? 512 * kMebibyte : std::numeric_limits<uint64_t>::max();
   return std::clamp(memory / 2, 16 * kMebibyte, kMost);
 }
 
