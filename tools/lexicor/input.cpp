@@ -12,7 +12,8 @@
 
 namespace lexicor_cli {
 
-Input::Input(std::vector<std::string> names) : names_(std::move(names)) {
+Input::Input(std::vector<std::string> names, bool one_of_several)
+    : names_(std::move(names)), names_files_(one_of_several || names_.size() > 1) {
   if (names_.empty()) names_.push_back("-");
 }
 
@@ -80,7 +81,7 @@ Input::Start Input::start_before(uint64_t offset) const {
 
 InputPlace Input::place(uint64_t offset) const {
   const Start start = start_before(offset);
-  return {names_.size() == 1 ? "" : title(start.file), offset - start.offset};
+  return {names_files_ ? title(start.file) : "", offset - start.offset};
 }
 
 std::string InputPlace::text() const {

@@ -22,8 +22,9 @@ struct InputPlace {
 
 class Input {
  public:
-  /// No names, or "-", is standard input.
-  explicit Input(std::vector<std::string> names);
+  /// No names, or "-", is standard input. Places name their file where there are several, or where `one_of_several`
+  /// says that there are others beside this input.
+  explicit Input(std::vector<std::string> names, bool one_of_several = false);
   ~Input();
   Input(const Input&) = delete;
   Input& operator=(const Input&) = delete;
@@ -59,6 +60,7 @@ class Input {
   std::string title(size_t file) const;
 
   std::vector<std::string> names_;
+  const bool names_files_;
   size_t next_file_ = 0;
   int fd_ = -1;
   uint64_t offset_ = 0;

@@ -136,8 +136,8 @@ void merge_files(const SortJob& job) {
   std::vector<std::unique_ptr<InputLines>> inputs;
   std::vector<OrderedLines*> sources;
   for (const std::string& file : files) {
-    inputs.push_back(
-        std::make_unique<InputLines>(job.collation.codepage(), file, job.options.null_ended, Pieces::kBytes));
+    inputs.push_back(std::make_unique<InputLines>(job.collation.codepage(), file, files.size() > 1,
+                                                  job.options.null_ended, Pieces::kBytes));
     sources.push_back(inputs.back().get());
   }
   LineMerge merge(job.order, sources);
@@ -155,7 +155,7 @@ int check_order(const SortJob& job) {
   if (options.files.size() > 1)
     throw Failure(kUsageError, "-c looks at one file, not at " + std::to_string(options.files.size()));
   const std::string file = options.files.empty() ? "-" : options.files[0];
-  InputLines lines(job.collation.codepage(), file, options.null_ended, Pieces::kBytes);
+  InputLines lines(job.collation.codepage(), file, false, options.null_ended, Pieces::kBytes);
   KeyMaker maker(job.order);
   Arena keys;
   std::string last;

@@ -25,8 +25,8 @@ class Parser {
     if (take('.')) field.first_char = number() - 1;
     field.skips_first_blanks = letters(&field, &lettered);
     if (take(',')) {
-      field.end_field = number();
-      if (take('.')) field.end_char = number_or_zero();
+      field.last_field = number();
+      if (take('.')) field.last_chars = number_or_zero();
       field.skips_end_blanks = letters(&field, &lettered);
     }
     if (at_ != end_) fail();
@@ -164,13 +164,13 @@ std::string_view FieldFinder::find(std::string_view text, const SortField& field
   skip_fields(&begin, field.first_field);
   if (field.skips_first_blanks) skip_blanks(&begin);
   skip_chars(&begin, field.first_char);
-  if (field.end_field == 0) {
+  if (field.last_field == 0) {
     end.at = text_end;
   } else {
-    skip_fields(&end, field.end_field - 1);
-    if (field.end_char == 0) skip_field(&end);
-    if (field.end_char != 0 && field.skips_end_blanks) skip_blanks(&end);
-    skip_chars(&end, field.end_char);
+    skip_fields(&end, field.last_field - 1);
+    if (field.last_chars == 0) skip_field(&end);
+    if (field.last_chars != 0 && field.skips_end_blanks) skip_blanks(&end);
+    skip_chars(&end, field.last_chars);
   }
   if (begin.at >= end.at) return {};
   const std::string_view part(begin.at, static_cast<size_t>(end.at - begin.at));

@@ -11,10 +11,11 @@
 
 namespace lexicor_cli {
 
-/// One part. Fields and characters count from 0.
+/// One part, from a character on, both counted from 0, to the end of a field or of some characters of it.
 struct SortField {
   size_t first_field = 0, first_char = 0;
-  size_t end_field = 0, end_char = 0;  // behind the part; end_field 0 and end_char 0: the end of the line
+  size_t last_field = 0;  // counted from 1; 0: all of them
+  size_t last_chars = 0;  // of the last field; 0: all of them
   bool skips_first_blanks = false, skips_end_blanks = false;
   bool ignore_case = false, reverse = false;
 };

@@ -72,11 +72,11 @@ class SortedRun : public OrderedLines {
 /// The lines of an input that is in order.
 class InputLines : public OrderedLines {
  public:
-  InputLines(const Codepage& codepage, const std::string& name, bool null_ended, size_t buffer_bytes)
-      : input_({name}), reader_(codepage, input_, null_ended, buffer_bytes) {}
+  InputLines(const Codepage& codepage, const std::string& name, bool one_of_several, bool null_ended,
+             size_t buffer_bytes)
+      : input_({name}, one_of_several), reader_(codepage, input_, null_ended, buffer_bytes) {}
 
   const Line* next() override;
-  Input& input() { return input_; }
 
  private:
   Input input_;

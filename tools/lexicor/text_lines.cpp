@@ -6,6 +6,8 @@
 #include <cstring>
 #include <limits>
 
+#include "place.h"
+
 namespace lexicor_cli {
 
 namespace {
@@ -38,14 +40,16 @@ bool LineReader::read(Arena* texts, Rows<Line>* lines) {
   char* const text = block + begun_.size() + kMostEndBytes;
   const size_t got = input_.read(text, room);
   const char* at = text;
+  const bool begins_file = input_.begins_file(offset_);
   if (!begun_.empty()) {
-    if (got == 0 || input_.begins_file(offset_)) {
+    if (got == 0 || begins_file) {
       add_last(block, lines);
     } else {
       std::memcpy(text - begun_.size(), begun_.data(), begun_.size());
       at = text - begun_.size();
     }
   }
+  if (begins_file) file_lines_ = 0;
   const char* const end = text + got;
   while (const char* const line_end = find_end(at, end)) {
     // A line that has begun before has its place there.
@@ -86,6 +90,7 @@ void LineReader::add_line(const char* begin, const char* end, uint64_t offset, R
   const uint32_t end_bytes = two_ ? 2 : 1;
   if (!codepage_.single_byte()) check_whole({begin, bytes - end_bytes}, offset, true);
   lines->push_back({begin, static_cast<uint32_t>(bytes), end_bytes});
+  ++file_lines_;
 }
 
 /// Adds a last line without an end: it gets that of the line before it. Its text is made at `text`.
@@ -105,8 +110,13 @@ LXShiftState LineReader::check_whole(std::string_view text, uint64_t offset, boo
   LXShiftState state = LX_SHIFT_SINGLE;
   const size_t whole = whole_bytes(text, &state);
   if (whole == text.size()) return state;
-  if (!ended) throw input_.cut_at(offset + whole);
-  throw Failure(kDataError, "a line ends inside the character that begins at " + input_.locate(offset + whole));
+  Place place(codepage_);
+  place.pass(text.data(), whole, LX_SHIFT_SINGLE);
+  InputPlace where = input_.place(offset + whole);
+  where.line = file_lines_ + 1;
+  where.column = place.column();
+  throw Failure(kDataError, (ended ? "a line ends" : "the input ends") +
+                                std::string(" inside the character that begins at ") + where.text());
 }
 
 size_t LineReader::whole_bytes(std::string_view text, LXShiftState* state) const {

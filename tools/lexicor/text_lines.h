@@ -51,9 +51,10 @@ class LineReader {
   const char end_;
   const char carriage_return_;
   const bool null_ended_;
-  std::string begun_;    // a line whose end has not been read
-  bool two_ = false;     // the line before ended with two characters
-  uint64_t offset_ = 0;  // of what is read next
+  std::string begun_;        // a line whose end has not been read
+  bool two_ = false;         // the line before ended with two characters
+  uint64_t file_lines_ = 0;  // of the file that is read
+  uint64_t offset_ = 0;      // of what is read next
 };
 
 /// A text without the shift bytes that change nothing: the library takes the second of two for a character.
