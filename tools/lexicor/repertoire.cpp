@@ -2,6 +2,9 @@
 #include "repertoire.h"
 
 #include <cstdint>
+#include <cstdlib>
+#include <cstring>
+#include <new>
 
 #include "hex.h"
 
@@ -15,9 +18,16 @@ constexpr bool is_surrogate(uint32_t unicode) {
 
 }  // namespace
 
+void Repertoire::Freer::operator()(uint8_t* values) const {
+  std::free(values);
+}
+
 Repertoire::Repertoire(const Codepage& codepage)
-    : codepage_(codepage), substitution_(codepage), single_(single_byte_values(codepage)) {
-  watched_.fill(~uint64_t{0});
+    : codepage_(codepage),
+      substitution_(codepage),
+      single_(single_byte_values(codepage)),
+      clear_(static_cast<uint8_t*>(std::calloc(kValues, 1))) {
+  if (clear_ == nullptr) throw std::bad_alloc();
 }
 
 bool Repertoire::is_lost(LXUChar unicode) const {
@@ -32,43 +42,40 @@ void Repertoire::learn_page(uint32_t page) const {
 
 void Repertoire::learn_values(uint32_t page) const {
   learned_.set(page);
-  for (uint32_t word = page * kPage / kWordBits; word < (page + 1) * kPage / kWordBits; ++word) {
-    watched_[word] = 0;
-    for (uint32_t bit = 0; bit < kWordBits; ++bit) {
-      const uint32_t unicode = word * kWordBits + bit;
-      lost_[unicode] = is_lost(static_cast<LXUChar>(unicode));
-      if (lost_[unicode] || asked_[unicode]) watched_[word] |= uint64_t{1} << bit;
-    }
+  for (uint32_t unicode = page * kPage; unicode < (page + 1) * kPage; ++unicode) {
+    lost_[unicode] = is_lost(static_cast<LXUChar>(unicode));
+    clear_[unicode] = !lost_[unicode] && !asked_[unicode];
   }
-}
-
-void Repertoire::learn_pages(const LXUChar* units, size_t count) const {
-  for (size_t i = 0; i < count; ++i) learn_page(units[i] / kPage);
 }
 
 void Repertoire::watch(LXUChar unicode) {
   asked_.set(unicode);
-  watched_[unicode / kWordBits] |= uint64_t{1} << unicode % kWordBits;
+  clear_[unicode] = 0;
 }
 
 bool Repertoire::has_all(const LXUChar* units, size_t count) const {
   constexpr size_t kTogether = 16;
-  const auto any_watched = [&](const LXUChar* some, size_t some_count) {
-    uint64_t watched = 0;
-    for (size_t i = 0; i < some_count; ++i) watched |= watched_[some[i] / kWordBits] >> some[i] % kWordBits;
-    return (watched & 1) != 0;
+  const auto all_clear = [&](const LXUChar* some, size_t some_count) {
+    uint8_t clear = 1;
+    for (size_t i = 0; i < some_count; ++i) clear &= clear_[some[i]];
+    return clear != 0;
   };
   const auto lacks = [&](const LXUChar* some, size_t some_count) {
-    if (!any_watched(some, some_count)) return false;
-    learn_pages(some, some_count);
-    return any_watched(some, some_count);
+    if (all_clear(some, some_count)) return false;
+    for (size_t i = 0; i < some_count; ++i) learn_page(some[i] / kPage);
+    return !all_clear(some, some_count);
   };
+  const auto is_ascii = [](const LXUChar* some) {
+    unsigned all_bits = 0;
+    for (size_t i = 0; i < kTogether; ++i) all_bits |= some[i];
+    return all_bits < kAscii;
+  };
+  learn_page(0);
+  const bool ascii_is_clear = std::memchr(clear_.get(), 0, kAscii) == nullptr;
   size_t i = 0;
   for (; count - i >= kTogether; i += kTogether) {
-    unsigned all_bits = 0;
-    for (size_t k = i; k < i + kTogether; ++k) all_bits |= units[k];
-    const bool ascii = all_bits < kAscii && (watched_[0] | watched_[1]) == 0;
-    if (!ascii && lacks(units + i, kTogether)) return false;
+    if (ascii_is_clear && units[i] < kAscii && is_ascii(units + i)) continue;
+    if (lacks(units + i, kTogether)) return false;
   }
   return !lacks(units + i, count - i);
 }

@@ -3,9 +3,9 @@
 
 #include <lx.h>
 
-#include <array>
 #include <bitset>
 #include <cstdint>
+#include <memory>
 #include <string>
 #include <vector>
 
@@ -32,14 +32,16 @@ class Repertoire {
   void watch(LXUChar unicode);
 
  private:
-  static constexpr uint32_t kValues = 0x10000, kPage = 0x100, kAscii = 0x80, kWordBits = 64;
-  static_assert(kAscii == 2 * kWordBits);
+  static constexpr uint32_t kValues = 0x10000, kPage = 0x100, kAscii = 0x80;
+
+  struct Freer {
+    void operator()(uint8_t* values) const;
+  };
 
   /// What a value is when it is written and read back; U+FFFD when the codepage lacks it.
   LXUChar back(LXUChar unicode) const;
   void learn_page(uint32_t page) const;
   void learn_values(uint32_t page) const;
-  void learn_pages(const LXUChar* units, size_t count) const;
   bool is_lost(LXUChar unicode) const;
   LXUChar value_of(LXWChar code) const;
 
@@ -49,9 +51,10 @@ class Repertoire {
   // Pages of values are looked at when the first of them is met.
   mutable std::bitset<kValues / kPage> learned_;
   mutable std::bitset<kValues> lost_;
-  // A bit for each value that has_all() does not pass over: of pages that are not learned, of lost and watched values.
-  mutable std::array<uint64_t, kValues / kWordBits> watched_;
   std::bitset<kValues> asked_;  // that are watched on request
+  // 1 for values that has_all() passes over: of learned pages those that are neither lost nor watched. Pages of memory
+  // that no value of a text is in are not touched.
+  const std::unique_ptr<uint8_t[], Freer> clear_;
 };
 
 /// That a codepage lacks a character.
