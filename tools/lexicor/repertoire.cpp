@@ -1,8 +1,10 @@
-// Every value is written and read back once; texts are then looked up in a bit set.
+// Values are written and read back page by page, when a text has the first one of a page; texts are then looked up in a
+// table.
 #include "repertoire.h"
 
+#include <sys/mman.h>
+
 #include <cstdint>
-#include <cstdlib>
 #include <cstring>
 #include <new>
 
@@ -16,19 +18,23 @@ constexpr bool is_surrogate(uint32_t unicode) {
   return unicode >= 0xD800 && unicode <= 0xDFFF;
 }
 
+uint8_t* mapped_zeros(size_t bytes) {
+  void* const zeros = mmap(nullptr, bytes, PROT_READ | PROT_WRITE, MAP_PRIVATE | MAP_ANONYMOUS, -1, 0);
+  if (zeros == MAP_FAILED) throw std::bad_alloc();
+  return static_cast<uint8_t*>(zeros);
+}
+
 }  // namespace
 
-void Repertoire::Freer::operator()(uint8_t* values) const {
-  std::free(values);
+void Repertoire::Unmapper::operator()(uint8_t* values) const {
+  munmap(values, kValues);
 }
 
 Repertoire::Repertoire(const Codepage& codepage)
     : codepage_(codepage),
       substitution_(codepage),
       single_(single_byte_values(codepage)),
-      clear_(static_cast<uint8_t*>(std::calloc(kValues, 1))) {
-  if (clear_ == nullptr) throw std::bad_alloc();
-}
+      clear_(mapped_zeros(kValues)) {}
 
 bool Repertoire::is_lost(LXUChar unicode) const {
   if (codepage_.utf8()) return is_surrogate(unicode);

@@ -34,7 +34,7 @@ class Repertoire {
  private:
   static constexpr uint32_t kValues = 0x10000, kPage = 0x100, kAscii = 0x80;
 
-  struct Freer {
+  struct Unmapper {
     void operator()(uint8_t* values) const;
   };
 
@@ -54,7 +54,7 @@ class Repertoire {
   std::bitset<kValues> asked_;  // that are watched on request
   // 1 for values that has_all() passes over: of learned pages those that are neither lost nor watched. Pages of memory
   // that no value of a text is in are not touched.
-  const std::unique_ptr<uint8_t[], Freer> clear_;
+  const std::unique_ptr<uint8_t[], Unmapper> clear_;
 };
 
 /// That a codepage lacks a character.

@@ -156,20 +156,24 @@ int check_order(const SortJob& job) {
     throw Failure(kUsageError, "-c looks at one file, not at " + std::to_string(options.files.size()));
   const std::string file = options.files.empty() ? "-" : options.files[0];
   InputLines lines(job.collation.codepage(), file, false, options.null_ended, Pieces::kBytes);
+  const Unique unique = options.uniqueness();
   KeyMaker maker(job.order);
   Arena keys;
-  std::string last;
+  std::string last_key, last_line;
   uint64_t number = 0;
   for (const Line* line; (line = lines.next()) != nullptr; keys.clear()) {
     const std::string_view key = maker.make(*line, &keys);
-    const int32_t result = ++number == 1 ? -1 : job.order.compare(last, key);
-    if (result > 0 || (result == 0 && !options.unique.empty())) {
+    const int32_t result = ++number == 1 ? -1 : job.order.compare(last_key, key);
+    const bool again =
+        result == 0 && (unique == Unique::kOrder || (unique == Unique::kBytes && line->whole() == last_line));
+    if (result > 0 || again) {
       if (options.check_quietly) return kDataError;
       throw Failure(kDataError, (file == "-" ? "" : file + ", ") + "line " + std::to_string(number) +
-                                    (result > 0 ? " is before line " : " is equal to line ") +
+                                    (again ? " is equal to line " : " is before line ") +
                                     std::to_string(number - 1) + " in the order");
     }
-    last = key;
+    last_key = key;
+    last_line = line->whole();
   }
   return kDone;
 }
