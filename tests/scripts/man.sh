@@ -8,7 +8,7 @@ trap 'rm -rf "$work"' EXIT
 fail() { echo "man: $*" >&2; exit 1; }
 
 # The options in the first column of a help; its commands, which stand behind them.
-options_of() { sed -n '/^Options:/,/^$/s/^ *\(-[^ ]*\).*/\1/p' | sed 's/{.*//; s/:.*//' | tr ',' '\n' | sort -u; }
+options_of() { sed -n '/^Options:/,/^$/s/^ *\(-[^ ]*\).*/\1/p' | sed 's/{[^}]*}//g; s/:.*//' | tr ',' '\n' | sort -u; }
 commands_of() { sed -n '/^Subcommands:/,/^$/s/^  \([a-z-]*\) .*/\1/p'; }
 # The options that a section of a page marks as such.
 marked() { grep -oE '\*-[^*]+\*' | tr -d '*' | sed 's/=.*//' | sort -u; }

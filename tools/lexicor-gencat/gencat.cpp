@@ -49,13 +49,12 @@ bool is_po_name(const std::string& name) {
 /// Codepages by name, each opened once.
 class Encodings {
  public:
-  explicit Encodings(const lexicor_cli::Session& session)
-      : session_(session), catalogue_(lexicor_cli::read_catalogue()) {}
+  explicit Encodings(const lexicor_cli::Session& session) : session_(session) {}
 
   /// Throws a Failure when there is no such codepage. `who` is the file that names it; empty: the command line.
   const Encoding& get(const std::string& name, const std::string& who) {
     std::unique_ptr<Opened>& opened = opened_[name];
-    if (opened == nullptr) blaming(who, [&] { opened = std::make_unique<Opened>(session_, catalogue_, name); });
+    if (opened == nullptr) blaming(who, [&] { opened = std::make_unique<Opened>(session_, name); });
     return opened->encoding;
   }
 
@@ -81,15 +80,13 @@ class Encodings {
   }
 
   struct Opened {
-    Opened(const lexicor_cli::Session& session, const lexicor_cli::Catalogue& catalogue,
-           const std::string& name)
-        : codepage(session, catalogue, name), encoding(codepage) {}
+    Opened(const lexicor_cli::Session& session, const std::string& name)
+        : codepage(session, name), encoding(codepage) {}
     lexicor_cli::Codepage codepage;
     Encoding encoding;
   };
 
   const lexicor_cli::Session& session_;
-  lexicor_cli::Catalogue catalogue_;
   std::map<std::string, std::unique_ptr<Opened>> opened_;
 };
 

@@ -79,6 +79,10 @@ const Option& Option::divided_by(char delimiter) const {
   option_->delimiter(delimiter)->allow_extra_args(false);
   return *this;
 }
+const Option& Option::one_at_a_time() const {
+  option_->allow_extra_args(false);
+  return *this;
+}
 const Option& Option::needs(const Option& other) const {
   option_->needs(other.option_);
   return *this;

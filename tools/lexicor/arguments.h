@@ -30,6 +30,8 @@ class Arguments {
     const Option& at_least(int32_t least) const;
     /// Several values in one argument.
     const Option& divided_by(char delimiter) const;
+    /// One value each time that it is given.
+    const Option& one_at_a_time() const;
     const Option& needs(const Option& other) const;
     const Option& excludes(const Option& other) const;
 

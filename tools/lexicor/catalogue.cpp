@@ -37,18 +37,26 @@ std::vector<std::string> Catalogue::aliases_of(const std::string& codepage) cons
   return found;
 }
 
-std::string Catalogue::first_name(int type) const {
-  for (const CatalogueObject& object : objects) {
-    if (object.type == type) return object.name;
-  }
-  return {};
-}
-
 Catalogue read_catalogue() {
   Catalogue catalogue;
   LXEnumLocales(add_object, &catalogue);
   LXEnumAliases(nullptr, add_alias, &catalogue);
   return catalogue;
+}
+
+std::string first_name(int type) {
+  struct Search {
+    int type;
+    std::string found;
+  } search{type, ""};
+  LXEnumLocales(
+      [](void* user, int32_t object_type, const char* name) {
+        Search& wanted = *static_cast<Search*>(user);
+        if (object_type == wanted.type) wanted.found = name;
+        return static_cast<int32_t>(wanted.found.empty());
+      },
+      &search);
+  return search.found;
 }
 
 bool same_name(const std::string& a, const std::string& b) {

@@ -24,12 +24,12 @@ struct Catalogue {
   std::vector<CatalogueAlias> aliases;
 
   std::vector<std::string> aliases_of(const std::string& codepage) const;
-  /// The name of the first object of a type, or an empty string.
-  std::string first_name(int type) const;
 };
 
 /// Reads the catalogue of the library in use.
 Catalogue read_catalogue();
+/// The name of its first object of a type, or an empty string.
+std::string first_name(int type);
 
 /// ASCII case-blind equality, as the library compares names.
 bool same_name(const std::string& a, const std::string& b);

@@ -32,15 +32,6 @@ bool Substitution::stands_for(LXUChar unicode, LXWChar code) const {
   return code == 0 || (known_ && code == byte_);
 }
 
-bool is_long_utf8_lead(char c) {
-  const auto byte = static_cast<unsigned char>(c);
-  return byte >= 0xF0 && byte <= 0xF4;
-}
-
-bool is_utf8_trail(char c) {
-  return (static_cast<unsigned char>(c) & 0xC0) == 0x80;
-}
-
 uint32_t long_utf8_code_point(const char* text, const char* end) {
   if (static_cast<size_t>(end - text) < kLongUtf8Bytes || !is_long_utf8_lead(*text)) return 0;
   uint32_t code_point = static_cast<unsigned char>(*text) & 0x07u;

@@ -34,8 +34,13 @@ class Substitution {
 // value, messages as the one character that its writer meant.
 inline constexpr size_t kLongUtf8Bytes = 4;
 
-bool is_long_utf8_lead(char c);
-bool is_utf8_trail(char c);
+inline bool is_long_utf8_lead(char c) {
+  const auto byte = static_cast<unsigned char>(c);
+  return byte >= 0xF0 && byte <= 0xF4;
+}
+inline bool is_utf8_trail(char c) {
+  return (static_cast<unsigned char>(c) & 0xC0) == 0x80;
+}
 /// The code point of the four-byte UTF-8 character at `text`, or 0.
 uint32_t long_utf8_code_point(const char* text, const char* end);
 

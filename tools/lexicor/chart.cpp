@@ -12,6 +12,8 @@
 #include "command.h"
 #include "hex.h"
 #include "output.h"
+#include "report.h"
+#include "utf8_text.h"
 
 namespace lexicor_cli {
 
@@ -19,7 +21,7 @@ namespace {
 
 struct ChartOptions {
   std::string codepage, other, lead, output = "-";
-  bool html = false, types = false;
+  bool html = false, types = false, json = false;
 };
 
 constexpr int kRow = 16;
@@ -148,16 +150,56 @@ std::string as_html(const std::vector<ChartPage>& pages, const Codepage& codepag
   return out.str();
 }
 
+// JSON.
+
+Json json_of(const ChartCell& cell, const Codepage* other) {
+  constexpr const char* kKinds[] = {"none", "character", "lead", "shift"};
+  Json json = {{"code", hex_text(cell.code, cell.code > 0xFF ? 4 : 2)},
+               {"kind", kKinds[static_cast<size_t>(cell.kind)]}};
+  if (cell.kind == ChartCell::Kind::kCharacter) {
+    std::istringstream words(cell.description());
+    std::string word;
+    words >> word;
+    json["character"] = word;
+    json["text"] = utf8_text(std::u16string(1, static_cast<char16_t>(cell.unicode)));
+    json["types"] = Json::array();
+    while (words >> word) json["types"].push_back(word);
+  }
+  if (other != nullptr) json["differs"] = cell.differs;
+  if (cell.differs) json["other"] = cell.other.substr(0, cell.other.find(' '));
+  return json;
+}
+
+/// The page that is asked for, else all; codes without a character only where that differs.
+std::string as_json(const std::vector<ChartPage>& pages, const ChartOptions& options, const Codepage& codepage,
+                    const Codepage* other) {
+  Json json = {{"codepage", codepage.name()}, {"id", codepage.id()}};
+  if (other != nullptr) json["other"] = other->name();
+  json["pages"] = Json::array();
+  const ChartPage* const only = options.lead.empty() ? nullptr : &page_of(pages, options.lead, codepage.name());
+  for (const ChartPage& page : pages) {
+    if (only != nullptr && only != &page) continue;
+    Json row = {{"lead", page.lead == 0 ? "" : hex_text(page.lead, page.lead > 0xFF ? 4 : 2)}};
+    if (other != nullptr) row["differences"] = page.differences;
+    row["codes"] = Json::array();
+    for (const ChartCell& cell : page.cells) {
+      if (cell.kind != ChartCell::Kind::kNone || cell.differs) row["codes"].push_back(json_of(cell, other));
+    }
+    json["pages"].push_back(row);
+  }
+  return json_text(json);
+}
+
 int chart(const ChartOptions& options, const CommonOptions& common) {
   const Session session(common);
-  const Catalogue catalogue = read_catalogue();
-  const Codepage codepage(session, catalogue, options.codepage);
+  const Codepage codepage(session, options.codepage);
   std::unique_ptr<Codepage> other;
-  if (!options.other.empty()) other = std::make_unique<Codepage>(session, catalogue, options.other);
+  if (!options.other.empty()) other = std::make_unique<Codepage>(session, options.other);
   const std::vector<ChartPage> pages = chart_pages(codepage, other.get());
   Output output(options.output);
-  output.write(options.html ? as_html(pages, codepage, other.get())
-                            : as_text(pages, options, codepage, other.get()));
+  output.write(options.html   ? as_html(pages, codepage, other.get())
+               : options.json ? as_json(pages, options, codepage, other.get())
+                              : as_text(pages, options, codepage, other.get()));
   output.commit();
   return kDone;
 }
@@ -175,7 +217,12 @@ Run declare_chart(Arguments& command, const CommonOptions& common) {
           .type_name("HEX");
   const Arguments::Option types =
       command.add_flag("--types", options->types, "letters for the types in place of the characters");
-  command.add_flag("--html", options->html, "all pages, as one page of HTML").excludes(lead).excludes(types);
+  const Arguments::Option html = command.add_flag("--html", options->html, "all pages, as one page of HTML")
+                                     .excludes(lead)
+                                     .excludes(types);
+  command.add_flag("--json", options->json, "the codes as JSON: of all pages, or of one")
+      .excludes(types)
+      .excludes(html);
   command.add_option("-o,--output", options->output, "output file, replaced when it is complete")
       .type_name("OUT");
   command.footer(

@@ -3,21 +3,24 @@
 
 #include <lx.h>
 
+#include <array>
 #include <cstdint>
 #include <string>
 
-#include "catalogue.h"
 #include "session.h"
 
 namespace lexicor_cli {
+
+struct Catalogue;
 
 class Codepage {
  public:
   /// `name` is an object name, a decimal identifier or an alias, in any letter case. Throws a Failure that
   /// names the nearest codepages when there is none, or that says why its file could not be loaded. Its locale
   /// has the given language and territory ("German_Austria"); empty: any will do.
-  Codepage(const Session& session, const Catalogue& catalogue, const std::string& name,
-           const std::string& language_territory = "");
+  Codepage(const Session& session, const std::string& name, const std::string& language_territory = "");
+  /// The same, for callers that have read the catalogue.
+  Codepage(const Session& session, const Catalogue&, const std::string& name) : Codepage(session, name) {}
   ~Codepage();
   Codepage(const Codepage&) = delete;
   Codepage& operator=(const Codepage&) = delete;
@@ -41,12 +44,18 @@ class Codepage {
   /// between them.
   size_t call_bytes(const char* text, size_t bytes) const;
   /// Bytes of the character at `text`, which is no shift byte.
-  int32_t char_bytes(const char* text, LXShiftState state) const;
+  int32_t char_bytes(const char* text, LXShiftState state) const {
+    if (shift_sensitive_) return state == LX_SHIFT_DOUBLE ? double_bytes_ : 1;
+    return char_bytes_[static_cast<uint8_t>(*text)];
+  }
+  /// Whether every byte is a character.
+  bool single_byte() const { return single_byte_; }
   /// The whole characters in the first `bytes` bytes of a text; `*end_state` is the state behind them.
   size_t whole_bytes(const char* text, size_t bytes, LXShiftState state, LXShiftState* end_state) const;
 
  private:
   void learn_shift_bytes();
+  void learn_char_bytes();
 
   std::string name_;
   unsigned id_ = 0;
@@ -55,7 +64,9 @@ class Codepage {
   bool shift_sensitive_ = false;
   char shift_out_ = 0;
   char shift_in_ = 0;
-  int32_t double_bytes_ = 1;  // of a character in the double-byte state
+  int32_t double_bytes_ = 1;               // of a character in the double-byte state
+  std::array<uint8_t, 256> char_bytes_{};  // by the first byte, where there are no shift states
+  bool single_byte_ = false;
 };
 
 }  // namespace lexicor_cli

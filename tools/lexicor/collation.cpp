@@ -31,7 +31,7 @@ Collation::Collation(RulesSession& session, const std::string& locale_name, cons
 
 Collation::Collation(const Session& session, const LocalePtr& named, const std::string& codepage,
                      std::optional<uint16_t> sort_id)
-    : codepage_(session, read_catalogue(), codepage, language_territory(named.get())) {
+    : codepage_(session, codepage, language_territory(named.get())) {
   const int32_t id = sort_id ? *sort_id : number_item(named.get(), LX_ITEM_SORT_ID).value_or(0);
   int32_t code = LX_OK;
   sort_ = LXGetObjFromID(nullptr, LX_SORT, static_cast<uint16_t>(id), LX_FIND_AND_LOAD, &code);
@@ -59,16 +59,25 @@ const std::string& Collation::key_of(std::string_view text, uint32_t options, Si
   return side.key;
 }
 
-void Collation::append_key(std::string_view text, uint32_t options, std::string* keys) {
-  if (binary() && text.empty()) return;
-  LXLocale* const locale = codepage_.locale();
+void Collation::append_key(std::string_view text, uint32_t options, std::string* keys) const {
+  const size_t before = keys->size();
+  keys->resize(before + key_room(text));
+  keys->resize(before + write_key(text, options, keys->data() + before));
+}
+
+size_t Collation::key_room(std::string_view text) {
+  return text.size() * kKeyBytesPerByte + kKeySeparators;
+}
+
+size_t Collation::write_key(std::string_view text, uint32_t options, char* room) const {
+  if (binary() && text.empty()) return 0;
+  if (text.empty()) text = "";
   const int32_t length = length_of(text);
-  const size_t most = text.size() * kKeyBytesPerByte + kKeySeparators;
-  if (room_.size() < most) room_.resize(most);
-  const int32_t bytes = LXStrxfrmEx(locale, reinterpret_cast<uint8_t*>(room_.data()),
-                                    static_cast<int32_t>(most), text.data(), LX_SHIFT_SINGLE, length, options);
-  if (bytes < 0) throw_failed(locale);
-  keys->append(room_.data(), static_cast<size_t>(bytes));
+  const int32_t bytes =
+      LXStrxfrmEx(codepage_.locale(), reinterpret_cast<uint8_t*>(room), static_cast<int32_t>(key_room(text)),
+                  text.data(), LX_SHIFT_SINGLE, length, options);
+  if (bytes < 0) throw_failed(codepage_.locale());
+  return static_cast<size_t>(bytes);
 }
 
 void Collation::check_argument(const std::string& text) const {

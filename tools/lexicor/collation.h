@@ -34,7 +34,11 @@ class Collation {
   /// Below 0, 0 or above 0.
   int32_t compare(std::string_view text1, std::string_view text2, uint32_t options);
   /// Appends the key of a text to `keys`.
-  void append_key(std::string_view text, uint32_t options, std::string* keys);
+  void append_key(std::string_view text, uint32_t options, std::string* keys) const;
+  /// The room that the key of a text may need, in bytes.
+  static size_t key_room(std::string_view text);
+  /// Writes the key of a text into such room; returns its bytes. Several threads may do so.
+  size_t write_key(std::string_view text, uint32_t options, char* room) const;
   /// Throws a Failure when a text of the command line ends inside a character.
   void check_argument(const std::string& text) const;
 
@@ -53,7 +57,6 @@ class Collation {
 
   Codepage codepage_;
   const LXObject* sort_ = nullptr;
-  std::string room_;  // for a key
   Side sides_[2];
 };
 

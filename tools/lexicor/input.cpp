@@ -12,7 +12,8 @@
 
 namespace lexicor_cli {
 
-Input::Input(std::vector<std::string> names) : names_(std::move(names)) {
+Input::Input(std::vector<std::string> names, bool one_of_several)
+    : names_(std::move(names)), names_files_(one_of_several || names_.size() > 1) {
   if (names_.empty()) names_.push_back("-");
 }
 
@@ -78,19 +79,17 @@ Input::Start Input::start_before(uint64_t offset) const {
   return start;
 }
 
-std::string Input::locate(uint64_t offset) const {
+InputPlace Input::place(uint64_t offset) const {
   const Start start = start_before(offset);
-  return file_prefix(start) + "byte " + std::to_string(offset - start.offset);
+  return {names_files_ ? title(start.file) : "", offset - start.offset};
 }
 
-std::string Input::locate(uint64_t offset, uint64_t line, uint64_t column) const {
-  const Start start = start_before(offset);
-  return file_prefix(start) + "line " + std::to_string(line) + ", column " + std::to_string(column) +
-         " (byte " + std::to_string(offset - start.offset) + ")";
-}
-
-std::string Input::file_prefix(const Start& start) const {
-  return names_.size() == 1 ? "" : title(start.file) + ", ";
+std::string InputPlace::text() const {
+  const std::string in_file = file.empty() ? "" : file + ", ";
+  const std::string at_byte = "byte " + std::to_string(byte);
+  if (line == 0) return in_file + at_byte;
+  return in_file + line_name + " " + std::to_string(line) + ", column " + std::to_string(column) + " (" +
+         at_byte + ")";
 }
 
 Failure Input::cut_at(uint64_t offset) const {

@@ -32,14 +32,16 @@ std::string problem_of(const LocalePart& part, int code) {
 
 /// The first object of a type that can be loaded, or the first of all, on built-in data. An object is loaded once: those
 /// that cannot be are noted with why.
-std::string first_usable(const Catalogue& catalogue, int type, std::map<std::string, int>* unusable) {
-  std::string first;
-  for (const CatalogueObject& object : catalogue.objects) {
-    if (object.type != type) continue;
+std::string first_usable(int type, std::map<std::string, int>* unusable) {
+  const std::string first = first_name(type);
+  const int first_code = load_part({type, "", first});
+  if (first_code == LX_OK) return first;
+  (*unusable)[first] = first_code;
+  for (const CatalogueObject& object : read_catalogue().objects) {
+    if (object.type != type || object.name == first) continue;
     const int code = load_part({type, "", object.name});
     if (code == LX_OK) return object.name;
     (*unusable)[object.name] = code;
-    if (first.empty()) first = object.name;
   }
   return first;
 }
@@ -51,12 +53,10 @@ std::string problem_of_defaults(const std::string& name) {
   constexpr int32_t kDefaults[] = {LX_ITEM_DEFAULT_TERRITORY, LX_ITEM_DEFAULT_CODEPAGE, LX_ITEM_DEFAULT_SORT};
   const auto named = [](const LocalePart& part) { return !part.name.empty(); };
   if (std::all_of(std::begin(parts.parts), std::end(parts.parts), named)) return {};
-  const Catalogue catalogue = read_catalogue();
   std::map<std::string, int> unusable;
   // What the language says is read from a locale that needs none of it.
-  const std::string other = parts.parts[LX_LANGUAGE].name + "_" +
-                            first_usable(catalogue, LX_TERRITORY, &unusable) + "." +
-                            first_usable(catalogue, LX_CODEPAGE, &unusable) + "@BINARY";
+  const std::string other = parts.parts[LX_LANGUAGE].name + "_" + first_usable(LX_TERRITORY, &unusable) + "." +
+                            first_usable(LX_CODEPAGE, &unusable) + "@BINARY";
   const LocalePtr locale(LXGetLocale(other.c_str(), 0, nullptr));
   for (const int32_t item : kDefaults) {
     LocalePart& part = parts.parts[LX_TERRITORY + (item - kDefaults[0])];

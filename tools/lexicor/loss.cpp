@@ -5,13 +5,13 @@
 
 namespace lexicor_cli {
 
-void Losses::record(LossKind kind, const std::string& where, const std::string& what) {
+void Losses::record(LossKind kind, const InputPlace& where, const std::string& what) {
   if (ignored()) return;
   count(kind, 1);
-  if (first_.size() < kReported) first_.push_back(where + ": " + what);
+  if (first_.size() < kReported) first_.push_back({kind, where, what});
   if (on_loss_ == OnLoss::kStop)
-    throw Failure(kDataError,
-                  "stopped at the first loss from " + source_ + " to " + target_ + "\n  " + first_[0]);
+    throw FirstLoss(kDataError,
+                    "stopped at the first loss from " + source_ + " to " + target_ + "\n  " + first_[0].text());
 }
 
 void Losses::throw_any() const {
@@ -32,7 +32,7 @@ std::string Losses::report() const {
   const uint64_t all = total();
   std::string text = std::to_string(all) + (all == 1 ? " character" : " characters") + " lost from " + source_ +
                      " to " + target_ + ": " + kinds;
-  for (const std::string& loss : first_) text += "\n  " + loss;
+  for (const Loss& loss : first_) text += "\n  " + loss.text();
   if (all > first_.size()) text += "\n  and " + std::to_string(all - first_.size()) + " more";
   return text;
 }

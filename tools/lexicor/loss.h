@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "command.h"
+#include "input.h"
 
 namespace lexicor_cli {
 
@@ -20,6 +21,21 @@ enum class LossKind {
 
 enum class OnLoss { kReport, kStop, kIgnore };
 
+/// A loss with its place.
+struct Loss {
+  LossKind kind;
+  InputPlace where;
+  std::string what;
+
+  std::string text() const { return where.text() + ": " + what; }
+};
+
+/// Thrown at the first loss where that ends the work.
+class FirstLoss : public Failure {
+ public:
+  using Failure::Failure;
+};
+
 class Losses {
  public:
   /// The names are those of the codepages.
@@ -30,15 +46,17 @@ class Losses {
   /// Whether the places of losses are still wanted: of the first ones only.
   bool places_wanted() const { return !ignored() && first_.size() < kReported; }
 
-  /// Records a loss: where it is, as Input says it, and what. Throws a Failure when the first loss ends the
-  /// work.
-  void record(LossKind kind, const std::string& where, const std::string& what);
+  /// Records a loss: where it is, and what. Throws a FirstLoss when that ends the work.
+  void record(LossKind kind, const InputPlace& where, const std::string& what);
   /// Records losses whose places are not wanted.
   void count(LossKind kind, uint64_t count) {
     if (!ignored()) counts_[static_cast<size_t>(kind)] += count;
   }
 
   uint64_t total() const;
+  uint64_t of_kind(LossKind kind) const { return counts_[static_cast<size_t>(kind)]; }
+  /// The first ones.
+  const std::vector<Loss>& first() const { return first_; }
   /// Throws the report when there is anything to report.
   void throw_any() const;
   /// The message: the losses of each kind, and the first ones with their places.
@@ -51,7 +69,7 @@ class Losses {
   const std::string source_, target_;
   const OnLoss on_loss_;
   std::array<uint64_t, kKinds> counts_{};
-  std::vector<std::string> first_;
+  std::vector<Loss> first_;
 };
 
 }  // namespace lexicor_cli

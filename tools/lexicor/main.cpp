@@ -2,6 +2,9 @@
 // Exit codes: 0 done, 1 an error in the data or the files, 2 a wrong command line, and of `compare` 3 and 4.
 #include <lx.h>
 
+#include <algorithm>
+#include <iterator>
+#include <string>
 #include <utility>
 #include <vector>
 
@@ -58,7 +61,12 @@ int run(int argc, char** argv) {
       .type_name("DIR");
   line.arguments().footer(kFooter);
   std::vector<std::pair<Arguments, Run>> runs;
+  const std::string named = argc > 1 ? argv[1] : "";
+  const bool known = std::any_of(std::begin(kSubcommands), std::end(kSubcommands),
+                                 [&](const Subcommand& subcommand) { return subcommand.name == named; });
   for (const Subcommand& subcommand : kSubcommands) {
+    // The options of the others would take longer to declare than a short text to convert.
+    if (known && subcommand.name != named) continue;
     Arguments arguments = line.add_subcommand(subcommand.name, subcommand.summary);
     runs.emplace_back(arguments, subcommand.declare(arguments, common));
   }

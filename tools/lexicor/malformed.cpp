@@ -7,6 +7,7 @@
 #include <cstdint>
 #include <cstring>
 
+#include "byte_vector.h"
 #include "character_values.h"
 #include "hex.h"
 
@@ -43,14 +44,40 @@ size_t utf8_beginning(const char* text, size_t bytes, const Utf8Lead& lead) {
   return count;
 }
 
+/// Whether a block goes on with characters of up to three bytes. What it begins with depends on the two bytes in front of
+/// it; its last character may be cut. Every byte is looked at with those before it, in the same way.
+constexpr size_t kBlock = 64;
+bool short_utf8_goes_on(const uint8_t* block) {
+  ByteVector wrong{};
+  for (size_t i = 0; i < kBlock; i += sizeof wrong) {
+    const ByteVector byte = load_bytes(block + i), before = load_bytes(block + i - 1),
+                     second_before = load_bytes(block + i - 2);
+    const auto trails = (byte & 0xC0) == 0x80;
+    const auto follows = (before >= 0xC0) | (second_before >= 0xE0);
+    // Below A0 it could be shorter, and from A0 on behind ED it is a surrogate.
+    const auto out_of_range = ((before == 0xE0) & (byte < 0xA0)) | ((before == 0xED) & (byte >= 0xA0));
+    const auto no_lead = (byte >= 0xF0) | ((byte & 0xFE) == 0xC0);
+    wrong |= reinterpret_cast<ByteVector>((trails ^ follows) | out_of_range | no_lead);
+  }
+  return !any(wrong);
+}
+
 /// Well-formed characters of up to three bytes at the start of a text; the last bytes are left over.
 size_t short_utf8_bytes(const char* text, size_t bytes) {
   const auto* const start = reinterpret_cast<const uint8_t*>(text);
   const uint8_t* const end = start + bytes;
   const uint8_t* p = start;
+  const uint8_t* next_block = start + 2;  // where blocks are tried again
   const auto trail = [](uint8_t byte) { return (byte & 0xC0) == 0x80; };
   uint64_t word;
   while (static_cast<size_t>(end - p) >= sizeof word) {
+    if (p >= next_block && static_cast<size_t>(end - p) >= kBlock) {
+      const uint8_t* const from = p;
+      while (static_cast<size_t>(end - p) >= kBlock && short_utf8_goes_on(p)) p += kBlock;
+      if (p != from) p -= p[-1] >= 0xC0 ? 1 : p[-2] >= 0xE0 ? 2 : 0;
+      next_block = p + kBlock;
+      continue;
+    }
     if (*p < 0x80) {
       std::memcpy(&word, p, sizeof word);
       p += (word & 0x8080808080808080u) == 0 ? sizeof word : 1;
@@ -71,18 +98,11 @@ size_t short_utf8_bytes(const char* text, size_t bytes) {
 }  // namespace
 
 MalformedFinder::MalformedFinder(const Codepage& codepage, bool long_utf8_ends)
-    : codepage_(codepage), long_utf8_ends_(long_utf8_ends) {
-  if (codepage.shift_sensitive()) return;
-  single_byte_ = true;
-  for (int byte = 0; byte < 256; ++byte) {
-    const char text = static_cast<char>(byte);
-    if (codepage.char_bytes(&text, LX_SHIFT_SINGLE) > 1) single_byte_ = false;
-  }
-}
+    : codepage_(codepage), long_utf8_ends_(long_utf8_ends) {}
 
 Stretch MalformedFinder::next(const char* text, size_t bytes, LXShiftState state, bool last) const {
   if (codepage_.utf8()) return next_utf8(text, bytes, last);
-  if (single_byte_) return {bytes, 0, Stretch::End::kText};
+  if (codepage_.single_byte()) return {bytes, 0, Stretch::End::kText};
   // What stands behind malformed bytes is looked at again, so the windows begin small.
   size_t good = 0, window = kFirstWindowBytes;
   for (bool whole_call = false; !whole_call; window = std::min(2 * window, kLastWindowBytes)) {

@@ -31,7 +31,6 @@ class MalformedFinder {
   /// stretch.
   explicit MalformedFinder(const Codepage& codepage, bool long_utf8_ends = false);
 
-  bool single_byte() const { return single_byte_; }
   /// Looks at a text that begins in `state` at a character. `last`: no more text follows, so that a character
   /// that is cut is malformed. Of a shift-sensitive codepage as much is looked at as the library takes at once.
   Stretch next(const char* text, size_t bytes, LXShiftState state, bool last) const;
@@ -48,7 +47,6 @@ class MalformedFinder {
 
   const Codepage& codepage_;
   const bool long_utf8_ends_;
-  bool single_byte_ = false;
   // The bytes that some double-byte character begins and ends with. Learned when the first bytes are met that
   // have no value.
   mutable bool learned_ = false;

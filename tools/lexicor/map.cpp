@@ -276,7 +276,7 @@ int map(const MapOptions& options, const CommonOptions& common) {
   const Session session(common);
   const LocalePtr named = open_chosen_locale(options.locale);
   const std::string language = text_item(named.get(), LX_ITEM_LANGUAGE).value_or("");
-  const Codepage codepage(session, read_catalogue(), options.codepage, language_territory(named.get()));
+  const Codepage codepage(session, options.codepage, language_territory(named.get()));
   Input input(options.files);
   Pieces pieces(input);
   Output output(options.output);

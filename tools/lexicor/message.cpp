@@ -126,10 +126,9 @@ std::string fetch(const MessageOptions& options, LXLocale* locale,
 
 int message(const MessageOptions& options, const CommonOptions& common) {
   const Session session(common);
-  const Catalogue catalogue = read_catalogue();
   const std::string language = language_territory(open_chosen_locale(options.locale).get());
-  const Codepage utf8(session, catalogue, "UTF-8", language);
-  const Codepage caller(session, catalogue, options.codepage, language);
+  const Codepage utf8(session, "UTF-8", language);
+  const Codepage caller(session, options.codepage, language);
   // Abbreviations become part of a path in the codepage of the locale that opens the catalog. Paths are ASCII.
   if (number_item(caller.locale(), LX_ITEM_CODEPAGE_ASCII) != 1) {
     Output().write(recoded(fetch(options, utf8.locale(), options.default_text) + "\n", utf8, caller));

@@ -34,25 +34,25 @@ std::string code_bytes(LXWChar code) {
 
 }  // namespace
 
-Recoder::Recoder(const Codepage& source, const Codepage& target, const Input& input, Output* output,
-                 Losses& losses)
+Recoder::Recoder(const Codepage& source, const Codepage& target, const Input& input, Sink* output,
+                 Losses& losses, const RecoderRules& rules)
     : source_(source),
       target_(target),
       input_(input),
       output_(output),
       losses_(losses),
+      rules_(rules),
       malformed_(source, !target.utf8()),
       repertoire_(target),
       copies_(source.utf8() && target.utf8()),
       window_bytes_(Pieces::kBytes),
       place_(source),
-      units_(1),
-      out_(Pieces::kBytes) {
+      units_(1) {
   if (source.utf8()) return;
   replacement_ = LXCpUnicodeToCharW(source.object(), kReplacement);
   has_replacement_ = !Substitution(source).stands_for(kReplacement, replacement_);
   repertoire_.watch(kReplacement);
-  if (!malformed_.single_byte()) return;
+  if (!source_.single_byte()) return;
   const std::vector<LXUChar> values = single_byte_values(source);
   for (LXWChar byte = 0; byte < values.size(); ++byte) {
     if (LXCpUnicodeToCharW(source.object(), values[byte]) != byte) repertoire_.watch(values[byte]);
@@ -70,8 +70,9 @@ void Recoder::begin_file(const char** data, size_t* bytes) {
   for (; !text_.empty() && *bytes > 0; --*bytes) feed((*data)++, 1, false);
   if (!text_.empty()) return;
   place_.restart();
-  if (!at_char || output_ == nullptr || !source_.utf8() || repertoire_.has(kSignatureValue) ||
-      *bytes < kSignatureBytes || std::memcmp(*data, kSignature, kSignatureBytes) != 0)
+  if (!at_char || output_ == nullptr || !source_.utf8() || rules_.unit_bytes != 0 ||
+      (repertoire_.has(kSignatureValue) && !rules_.drops_marks) || *bytes < kSignatureBytes ||
+      std::memcmp(*data, kSignature, kSignatureBytes) != 0)
     return;
   *data += kSignatureBytes;
   *bytes -= kSignatureBytes;
@@ -86,23 +87,51 @@ void Recoder::finish() {
   }
 }
 
+void Recoder::end_record() {
+  finish();
+  target_state_ = state_ = LX_SHIFT_SINGLE;
+  place_.restart();
+  ++record_;
+}
+
+void Recoder::take_malformed(uint32_t input_bytes, const std::string& what) {
+  if (losses_.places_wanted())
+    losses_.record(LossKind::kMalformed, where(offset_), what);
+  else
+    losses_.count(LossKind::kMalformed, 1);
+  place_.pass_malformed();
+  offset_ += input_bytes;
+  units_[0] = kReplacement;
+  unit_count_ = 1;
+  emit();
+  flush();
+}
+
 void Recoder::feed(const char* data, size_t bytes, bool last) {
-  text_.append(data, bytes);
+  if (text_.empty()) {
+    const size_t done = convert(data, bytes, last);
+    text_.assign(data + done, bytes - done);
+  } else {
+    text_.append(data, bytes);
+    text_.erase(0, convert(text_.data(), text_.size(), last));
+  }
+  flush();
+}
+
+/// Converts a text but for a cut character at its end, which waits for more; returns the bytes that it took.
+size_t Recoder::convert(const char* text, size_t bytes, bool last) {
   size_t at = 0;
-  while (at < text_.size()) {
-    const char* const text = text_.data() + at;
-    if (source_.is_shift(*text)) {
-      state_ = source_.state_after(*text);
+  while (at < bytes) {
+    if (source_.is_shift(text[at])) {
+      state_ = source_.state_after(text[at++]);
       ++offset_;
-      ++at;
       continue;
     }
-    const size_t done = convert_some(text, text_.size() - at, last);
+    const size_t done = convert_some(text + at, bytes - at, last);
     if (done == 0) break;
     at += done;
   }
-  text_.erase(0, at);
-  flush();
+  return at;
 }
 
 /// Converts the beginning of a text; 0 when it is a cut character, which waits for more.
@@ -122,7 +151,7 @@ size_t Recoder::convert_some(const char* text, size_t bytes, bool last) {
 size_t Recoder::convert_clean(const char* text, size_t bytes) {
   decode(text, bytes);
   if (unit_count_ == 0 || !repertoire_.has_all(units_.data(), unit_count_)) return 0;
-  const size_t own = malformed_.single_byte() ? bytes : own_bytes(text, bytes);
+  const size_t own = source_.single_byte() ? bytes : own_bytes(text, bytes);
   if (own == 0) return 0;
   if (losses_.places_wanted()) place_.pass(text, own, state_);
   offset_ += own;
@@ -181,14 +210,29 @@ void Recoder::lose(const char* text, const Stretch& stretch, const char* end) {
   else
     losses_.count(kind, 1);
   place_.pass_malformed();
-  offset_ += stretch.end_bytes;
+  offset_ += input_bytes(text, stretch.end_bytes);
   units_[0] = kReplacement;
   unit_count_ = 1;
   emit();
 }
 
-std::string Recoder::where(uint64_t offset) const {
-  return losses_.places_wanted() ? input_.locate(offset, place_.line(), place_.column()) : "";
+InputPlace Recoder::where(uint64_t offset) const {
+  if (!losses_.places_wanted()) return {};
+  InputPlace place = input_.place(offset);
+  place.line = rules_.records ? record_ : place_.line();
+  place.column = place_.column();
+  if (rules_.records) place.line_name = "record";
+  return place;
+}
+
+/// The bytes that well-formed text had in the input.
+uint64_t Recoder::input_bytes(const char* text, size_t bytes) const {
+  if (rules_.unit_bytes == 0) return bytes;
+  const char* const end = text + bytes;
+  const auto chars = std::count_if(text, end, [](char c) { return !is_utf8_trail(c); });
+  // Beyond U+FFFF two units of 16 bits.
+  const auto pairs = rules_.unit_bytes == 2 ? std::count_if(text, end, is_long_utf8_lead) : 0;
+  return static_cast<uint64_t>(chars + pairs) * rules_.unit_bytes;
 }
 
 void Recoder::decode(const char* text, size_t bytes) {
@@ -200,6 +244,7 @@ void Recoder::decode(const char* text, size_t bytes) {
 
 /// Records the losses of the decoded text with their places.
 void Recoder::find_losses(const char* text, size_t bytes) {
+  const char* const begin = text;
   const char* const end = text + bytes;
   const char* passed = text;  // by the place
   LXShiftState state = state_, passed_state = state_;
@@ -216,7 +261,7 @@ void Recoder::find_losses(const char* text, size_t bytes) {
         passed = text;
         passed_state = state;
       }
-      losses_.record(kind, where(offset_ + bytes - static_cast<uint64_t>(end - text)), what);
+      losses_.record(kind, where(offset_ + input_bytes(begin, static_cast<size_t>(text - begin))), what);
     }
     text += c.bytes;
   }
@@ -255,7 +300,7 @@ bool Recoder::find_loss(const Char& c, LossKind* kind, std::string* what) const 
 
 /// Goes past well-formed text.
 void Recoder::pass(const char* text, size_t bytes) {
-  offset_ += bytes;
+  offset_ += input_bytes(text, bytes);
   if (source_.shift_sensitive()) source_.whole_bytes(text, bytes, state_, &state_);
 }
 
@@ -279,8 +324,10 @@ void Recoder::emit() {
   if (target_.shift_sensitive() && unit_count_ != 0) target_state_ = state_behind(target_);
 }
 
-/// Room for so many bytes of output.
+/// Room for so many bytes of output. It grows with the text.
 char* Recoder::room(size_t bytes) {
+  if (out_.size() < Pieces::kBytes && out_.size() - out_used_ < bytes)
+    out_.resize(std::max(out_used_ + bytes, 2 * out_.size()));
   if (out_.size() - out_used_ < bytes) flush();
   if (out_.size() < bytes) out_.resize(bytes);
   return out_.data() + out_used_;

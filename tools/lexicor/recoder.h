@@ -16,15 +16,33 @@
 
 namespace lexicor_cli {
 
+/// What a text is, beside its codepages.
+struct RecoderRules {
+  bool drops_marks =
+      false;  // the signature of UTF-8 that a file begins with; else where the target lacks U+FEFF
+  /// The text was units of so many bytes, and comes as UTF-8; 0: it is as it was.
+  uint32_t unit_bytes = 0;
+  bool records = false;  // places are those of records, which end_record() counts
+};
+
 class Recoder {
  public:
   /// Without an output it finds the losses only, and a signature is text.
-  Recoder(const Codepage& source, const Codepage& target, const Input& input, Output* output, Losses& losses);
+  Recoder(const Codepage& source, const Codepage& target, const Input& input, Sink* output, Losses& losses,
+          const RecoderRules& rules = {});
 
   /// Converts the next bytes of the input, of one file. A file may begin with the signature of UTF-8.
   void take(const char* data, size_t bytes);
-  /// Ends the text.
+  /// Converts bytes of the input that make no character, which `what` says.
+  void take_malformed(uint32_t input_bytes, const std::string& what);
+  /// Begins a file of a text that was units: places are counted anew.
+  void begin_units() { place_.restart(); }
+  /// Goes past bytes of the input that are no text.
+  void skip(uint32_t input_bytes) { offset_ += input_bytes; }
+  /// Ends the text, in the single-byte state.
   void finish();
+  /// Ends a record as a text.
+  void end_record();
 
  private:
   /// A character of a text with its code and its Unicode value.
@@ -37,6 +55,7 @@ class Recoder {
 
   void begin_file(const char** data, size_t* bytes);
   void feed(const char* data, size_t bytes, bool last);
+  size_t convert(const char* text, size_t bytes, bool last);
   size_t convert_some(const char* text, size_t bytes, bool last);
   size_t convert_clean(const char* text, size_t bytes);
   size_t own_bytes(const char* text, size_t bytes);
@@ -53,21 +72,24 @@ class Recoder {
   char* room(size_t bytes);
   void flush();
   void write(const char* text, size_t bytes);
-  std::string where(uint64_t offset) const;
+  InputPlace where(uint64_t offset) const;
+  uint64_t input_bytes(const char* text, size_t bytes) const;
 
   const Codepage& source_;
   const Codepage& target_;
   const Input& input_;
-  Output* const output_;
+  Sink* const output_;
   Losses& losses_;
+  const RecoderRules rules_;
   const MalformedFinder malformed_;
   Repertoire repertoire_;  // of the target
   const bool copies_;      // UTF-8 to UTF-8
   LXWChar replacement_ = 0;
   bool has_replacement_ = false;  // the source has a character for U+FFFD, with the code replacement_
 
-  std::string text_;  // not yet converted: of a cut character, then of this call
-  uint64_t offset_ = 0;
+  std::string text_;     // not yet converted: of a cut character
+  uint64_t offset_ = 0;  // in the input
+  uint64_t record_ = 1;
   LXShiftState state_ = LX_SHIFT_SINGLE;
   size_t window_bytes_;  // of the next part that is tried as a whole
   Place place_;

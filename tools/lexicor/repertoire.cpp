@@ -1,8 +1,12 @@
-// Every value is written and read back once; texts are then looked up in a bit set.
+// Values are written and read back page by page, when a text has the first one of a page; texts are then looked up in a
+// table.
 #include "repertoire.h"
+
+#include <sys/mman.h>
 
 #include <cstdint>
 #include <cstring>
+#include <new>
 
 #include "hex.h"
 
@@ -14,47 +18,72 @@ constexpr bool is_surrogate(uint32_t unicode) {
   return unicode >= 0xD800 && unicode <= 0xDFFF;
 }
 
+uint8_t* mapped_zeros(size_t bytes) {
+  void* const zeros = mmap(nullptr, bytes, PROT_READ | PROT_WRITE, MAP_PRIVATE | MAP_ANONYMOUS, -1, 0);
+  if (zeros == MAP_FAILED) throw std::bad_alloc();
+  return static_cast<uint8_t*>(zeros);
+}
+
 }  // namespace
 
+void Repertoire::Unmapper::operator()(uint8_t* values) const {
+  munmap(values, kValues);
+}
+
 Repertoire::Repertoire(const Codepage& codepage)
-    : codepage_(codepage), substitution_(codepage), single_(single_byte_values(codepage)) {
-  for (uint32_t unicode = 0; unicode < kValues; ++unicode) {
-    const auto unit = static_cast<LXUChar>(unicode);
-    if (codepage.utf8()) {
-      lost_[unicode] = is_surrogate(unicode);
-      continue;
-    }
-    const LXWChar code = LXCpUnicodeToCharW(codepage.object(), unit);
-    lost_[unicode] = substitution_.stands_for(unit, code) || value_of(code) != unit;
+    : codepage_(codepage),
+      substitution_(codepage),
+      single_(single_byte_values(codepage)),
+      clear_(mapped_zeros(kValues)) {}
+
+bool Repertoire::is_lost(LXUChar unicode) const {
+  if (codepage_.utf8()) return is_surrogate(unicode);
+  const LXWChar code = LXCpUnicodeToCharW(codepage_.object(), unicode);
+  return substitution_.stands_for(unicode, code) || value_of(code) != unicode;
+}
+
+void Repertoire::learn_page(uint32_t page) const {
+  if (!learned_[page]) learn_values(page);
+}
+
+void Repertoire::learn_values(uint32_t page) const {
+  learned_.set(page);
+  for (uint32_t unicode = page * kPage; unicode < (page + 1) * kPage; ++unicode) {
+    lost_[unicode] = is_lost(static_cast<LXUChar>(unicode));
+    clear_[unicode] = !lost_[unicode] && !asked_[unicode];
   }
-  watched_ = lost_;
-  learn_ascii();
 }
 
 void Repertoire::watch(LXUChar unicode) {
-  watched_.set(unicode);
-  learn_ascii();
-}
-
-void Repertoire::learn_ascii() {
-  has_ascii_ = (watched_ << (kValues - kAscii)).none();
+  asked_.set(unicode);
+  clear_[unicode] = 0;
 }
 
 bool Repertoire::has_all(const LXUChar* units, size_t count) const {
-  constexpr uint64_t kBeyondAscii = 0xFF80FF80FF80FF80u;
-  constexpr size_t kTogether = 4;
+  constexpr size_t kTogether = 16;
+  const auto all_clear = [&](const LXUChar* some, size_t some_count) {
+    uint8_t clear = 1;
+    for (size_t i = 0; i < some_count; ++i) clear &= clear_[some[i]];
+    return clear != 0;
+  };
+  const auto lacks = [&](const LXUChar* some, size_t some_count) {
+    if (all_clear(some, some_count)) return false;
+    for (size_t i = 0; i < some_count; ++i) learn_page(some[i] / kPage);
+    return !all_clear(some, some_count);
+  };
+  const auto is_ascii = [](const LXUChar* some) {
+    unsigned all_bits = 0;
+    for (size_t i = 0; i < kTogether; ++i) all_bits |= some[i];
+    return all_bits < kAscii;
+  };
+  learn_page(0);
+  const bool ascii_is_clear = std::memchr(clear_.get(), 0, kAscii) == nullptr;
   size_t i = 0;
   for (; count - i >= kTogether; i += kTogether) {
-    uint64_t together;
-    std::memcpy(&together, units + i, sizeof together);
-    if ((together & kBeyondAscii) == 0 && has_ascii_) continue;
-    if (watched_[units[i]] || watched_[units[i + 1]] || watched_[units[i + 2]] || watched_[units[i + 3]])
-      return false;
+    if (ascii_is_clear && units[i] < kAscii && is_ascii(units + i)) continue;
+    if (lacks(units + i, kTogether)) return false;
   }
-  for (; i < count; ++i) {
-    if (watched_[units[i]]) return false;
-  }
-  return true;
+  return !lacks(units + i, count - i);
 }
 
 LXUChar Repertoire::back(LXUChar unicode) const {

@@ -1,23 +1,23 @@
-// lexicor sort: sorts the lines of a text by a locale's sort. The text is held in memory; lines are views of
-// it.
+// lexicor sort: sorts the lines of a text by a locale's sort, merges sorted ones, or tells whether they are sorted.
 #include <lx.h>
 
-#include <algorithm>
-#include <cstring>
-#include <deque>
-#include <functional>
+#include <charconv>
+#include <iostream>
+#include <limits>
 #include <memory>
-#include <string_view>
-#include <unordered_set>
 #include <vector>
 
 #include "arguments.h"
 #include "collation.h"
 #include "command.h"
 #include "input.h"
+#include "line_order.h"
+#include "line_sorter.h"
+#include "line_writer.h"
 #include "output.h"
 #include "pieces.h"
 #include "progress.h"
+#include "sort_runs.h"
 
 namespace lexicor_cli {
 
@@ -30,275 +30,161 @@ struct SortOptions {
   std::string rules;   // a file; empty: the locale's sort
   std::string codepage = "UTF-8";
   std::string output = "-";
-  bool key = false;
-  bool ignore_case = false;
-  bool reverse = false;
+  std::vector<std::string> keys;
+  std::string separator;  // empty: blanks
+  bool ignore_case = false, ignore_blanks = false, reverse = false;
   std::string unique;  // kUniqueBytes or kUniqueOrder; empty: every line is written
+  bool null_ended = false, stable = false;
+  bool check = false, check_quietly = false, merge = false;
+  std::string buffer_size;  // empty: a part of the memory
+  std::string temporary_directory;
   std::vector<std::string> files;
 
-  uint32_t options() const { return ignore_case ? LX_CASE_INSENSITIVE : 0; }
+  SortFieldDefaults defaults() const { return {ignore_blanks, ignore_case, reverse}; }
+  Unique uniqueness() const {
+    return unique == kUniqueBytes ? Unique::kBytes : unique == kUniqueOrder ? Unique::kOrder : Unique::kNone;
+  }
+  std::vector<SortField> fields() const {
+    std::vector<SortField> fields;
+    for (const std::string& key : keys) fields.push_back(parse_sort_field(key, defaults()));
+    return fields;
+  }
 };
 
-/// The beginning of a key. Most lines differ in it, so that few whole keys are looked at.
-class KeyHead {
+/// The bytes of a size: a number of kibibytes, or with b, K, M, G or T.
+uint64_t memory_of(const std::string& size) {
+  if (size.empty()) return usual_sort_memory();
+  uint64_t value = 0;
+  const char* const end = size.data() + size.size();
+  const auto read = std::from_chars(size.data(), end, value);
+  const std::string unit(read.ptr, end);
+  const std::string units = "bKMGT";
+  const size_t power = unit.empty() ? 1 : unit.size() == 1 ? units.find(unit) : std::string::npos;
+  if (read.ec != std::errc() || power == std::string::npos ||
+      value > std::numeric_limits<uint64_t>::max() >> 10 * power)
+    throw Failure(kUsageError,
+                  "--buffer-size takes a number of KiB, or a number with b, K, M, G or T, not '" + size + "'");
+  return value << 10 * power;
+}
+
+/// The bar while lines are read, which is the first half of it, and written.
+class SortBar {
  public:
-  KeyHead() = default;
-  /// What is beyond the end counts as zeros.
-  explicit KeyHead(std::string_view key) {
-    for (size_t i = 0; i < std::min(key.size(), sizeof words_); ++i)
-      words_[i / kWordBytes] |= uint64_t{static_cast<uint8_t>(key[i])} << 8 * (kWordBytes - 1 - i % kWordBytes);
-  }
+  explicit SortBar(uint64_t text_bytes) : progress_(text_bytes, true, kWorthShowing) {}
 
-  /// Below 0, 0 or above 0.
-  int compare(const KeyHead& other) const {
-    for (size_t i = 0; i < kWords; ++i) {
-      if (words_[i] != other.words_[i]) return words_[i] < other.words_[i] ? -1 : 1;
-    }
-    return 0;
-  }
-
- private:
-  static constexpr size_t kWords = 4, kWordBytes = sizeof(uint64_t);
-
-  uint64_t words_[kWords] = {};
-};
-
-struct Line {
-  std::string_view whole;  // with its end, as it is written
-  std::string_view order;  // what is compared: the text without its end, or its key
-  KeyHead head;            // in binary order all the same
-};
-
-/// The lines of a text, of which every file ends its last one.
-class Lines {
- public:
-  Lines(const Codepage& codepage, const Input& input, const std::string& text)
-      : codepage_(codepage),
-        input_(input),
-        text_(text),
-        feed_(static_cast<char>(LXCpUnicodeToCharW(codepage.object(), '\n'))),
-        carriage_return_(static_cast<char>(LXCpUnicodeToCharW(codepage.object(), '\r'))),
-        end_(1, feed_) {
-    const std::vector<uint64_t> starts = input.starts();
-    for (size_t i = 0; i < starts.size(); ++i) {
-      const auto end = static_cast<size_t>(i + 1 < starts.size() ? starts[i + 1] : text.size());
-      for (auto at = static_cast<size_t>(starts[i]); at < end;) at = take(at, end);
-    }
-  }
-
-  std::vector<Line>& lines() { return lines_; }
-
- private:
-  /// Takes the line that begins at `begin`, in a file that ends at `file_end`; returns where the next one
-  /// begins.
-  size_t take(size_t begin, size_t file_end) {
-    const size_t feed = find_feed(begin, file_end);
-    const bool ended = feed < file_end;
-    const size_t next = ended ? feed + 1 : file_end;
-    const bool two = ended && feed > begin && text_[feed - 1] == carriage_return_;
-    const size_t end = two ? feed - 1 : ended ? feed : file_end;
-    Line line{view(begin, next), view(begin, end), {}};
-    if (codepage_.call_bytes(line.order.data(), line.order.size()) != line.order.size())
-      line.order = keep(joined(line.order));
-    LXShiftState state;
-    const size_t whole = codepage_.whole_bytes(line.order.data(), line.order.size(), LX_SHIFT_SINGLE, &state);
-    if (whole != line.order.size()) throw_cut(end - (line.order.size() - whole), ended);
-    if (ended) {
-      end_ = std::string(view(end, next));
-    } else {
-      std::string closed(line.whole);
-      if (state == LX_SHIFT_DOUBLE) closed += codepage_.shift_byte(LX_SHIFT_SINGLE);
-      line.whole = keep(closed + end_);
-    }
-    lines_.push_back(line);
-    return next;
-  }
-
-  /// The line feed, which in a shift-sensitive codepage stands in the single-byte state, or `end`. No other
-  /// codepage has characters with a line feed in them.
-  size_t find_feed(size_t at, size_t end) const {
-    if (!codepage_.shift_sensitive()) {
-      const void* const found = std::memchr(text_.data() + at, feed_, end - at);
-      return found == nullptr ? end : static_cast<size_t>(static_cast<const char*>(found) - text_.data());
-    }
-    for (LXShiftState state = LX_SHIFT_SINGLE; at < end;) {
-      if (codepage_.is_shift(text_[at])) {
-        state = codepage_.state_after(text_[at++]);
-      } else if (state == LX_SHIFT_SINGLE && text_[at] == feed_) {
-        return at;
-      } else {
-        at += static_cast<size_t>(codepage_.char_bytes(&text_[at], state));
-      }
-    }
-    return end;
-  }
-
-  /// A text without the shift bytes that change nothing: the library takes the second of two for a character.
-  std::string joined(std::string_view text) const {
-    std::string result;
-    LXShiftState state = LX_SHIFT_SINGLE, written = LX_SHIFT_SINGLE;
-    for (size_t at = 0; at < text.size();) {
-      if (codepage_.is_shift(text[at])) {
-        state = codepage_.state_after(text[at++]);
-        continue;
-      }
-      if (state != written) result += codepage_.shift_byte(state);
-      written = state;
-      const auto bytes = static_cast<size_t>(codepage_.char_bytes(&text[at], state));
-      result += text.substr(at, bytes);
-      at += bytes;
-    }
-    return result;
-  }
-
-  [[noreturn]] void throw_cut(size_t offset, bool ended) const {
-    if (!ended) throw input_.cut_at(offset);
-    throw Failure(kDataError, "a line ends inside the character that begins at " + input_.locate(offset));
-  }
-
-  std::string_view view(size_t begin, size_t end) const {
-    return std::string_view(text_).substr(begin, end - begin);
-  }
-  std::string_view keep(const std::string& text) { return kept_.emplace_back(text); }
-
-  const Codepage& codepage_;
-  const Input& input_;
-  const std::string& text_;
-  const char feed_;
-  const char carriage_return_;
-  std::string end_;               // of the line before; a last line without an end gets it
-  std::deque<std::string> kept_;  // what is not in the text as it stands
-  std::vector<Line> lines_;
-};
-
-/// The bar while lines are sorted: each pass over them is the same part of it.
-class PassBar {
- public:
-  PassBar(uint64_t text_bytes, uint64_t steps)
-      : text_bytes_(text_bytes), steps_(steps), progress_(text_bytes, true, kWorthShowing) {}
-
-  void advance(uint64_t steps) {
-    done_ += steps;
-    const auto shown = static_cast<uint64_t>(static_cast<double>(text_bytes_) * static_cast<double>(done_) /
-                                             static_cast<double>(steps_));
-    progress_.advance(shown - shown_);
-    shown_ = shown;
+  void advance(uint64_t bytes) {
+    done_ += bytes;
+    progress_.advance(done_ / 2 - shown_);
+    shown_ = done_ / 2;
   }
 
  private:
   // Sorting takes longer than reading.
   static constexpr uint64_t kWorthShowing = 1024 * 1024;
 
-  uint64_t text_bytes_;
-  uint64_t steps_;
-  uint64_t done_ = 0;
-  uint64_t shown_ = 0;
+  uint64_t done_ = 0, shown_ = 0;
   Progress progress_;
 };
 
-/// Passes of a merge over runs that double their length.
-uint64_t count_passes(size_t lines) {
-  uint64_t passes = 0;
-  for (size_t run = 1; run < lines; run *= 2) ++passes;
-  return passes;
+/// What a command line asks for, made ready.
+struct SortJob {
+  SortJob(const SortOptions& given, const CommonOptions& common)
+      : options(given),
+        fields(given.fields()),
+        memory(memory_of(given.buffer_size)),
+        session(common, given.rules),
+        collation(session, given.locale, given.codepage),
+        finder(collation.codepage(), given.separator),
+        order(collation, finder, given.defaults(), fields) {}
+
+  const SortOptions& options;
+  const std::vector<SortField> fields;
+  const uint64_t memory;
+  RulesSession session;
+  Collation collation;
+  const FieldFinder finder;
+  const LineOrder order;
+};
+
+void sort_lines(const SortJob& job) {
+  Input input(job.options.files);
+  LineSorter sorter(job.order, job.memory, job.options.temporary_directory);
+  LineReader reader(job.collation.codepage(), input, job.options.null_ended, sorter.block_bytes());
+  bool more = sorter.take(reader);
+  // Once something is read: a missing input leaves no trace.
+  Output output(job.options.output);
+  LineWriter writer(output, job.order, job.options.uniqueness());
+  auto bar = std::make_unique<SortBar>(input.total_bytes());
+  bar->advance(reader.offset());
+  while (more) {
+    const uint64_t before = reader.offset();
+    more = sorter.take(reader);
+    bar->advance(reader.offset() - before);
+  }
+  if (output.is_terminal()) bar.reset();
+  sorter.write(writer, [&](uint64_t bytes) {
+    if (bar) bar->advance(bytes);
+  });
+  bar.reset();
+  writer.flush();
+  output.commit();
 }
 
-/// Sorts so that lines of which none is before the other keep their places. Merging ends also with an order
-/// that contradicts itself, as a faulty sort object can give.
-template <class Before>
-void merge_sort(std::vector<Line>* lines, Before before, PassBar* bar) {
-  const size_t count = lines->size();
-  std::vector<Line> merged(count);
-  for (size_t run = 1; run < count; run *= 2) {
-    for (size_t at = 0; at < count; at += 2 * run) {
-      Line* const begin = lines->data() + at;
-      Line* const middle = begin + std::min(run, count - at);
-      Line* const end = begin + std::min(2 * run, count - at);
-      if (middle == end || !before(*middle, middle[-1]))
-        std::copy(begin, end, &merged[at]);
-      else
-        std::merge(begin, middle, middle, end, &merged[at], before);
-      bar->advance(static_cast<uint64_t>(end - begin));
+void merge_files(const SortJob& job) {
+  std::vector<std::string> files = job.options.files;
+  if (files.empty()) files.push_back("-");
+  std::vector<std::unique_ptr<InputLines>> inputs;
+  std::vector<OrderedLines*> sources;
+  for (const std::string& file : files) {
+    inputs.push_back(std::make_unique<InputLines>(job.collation.codepage(), file, files.size() > 1,
+                                                  job.options.null_ended, Pieces::kBytes));
+    sources.push_back(inputs.back().get());
+  }
+  LineMerge merge(job.order, sources);
+  Output output(job.options.output);
+  LineWriter writer(output, job.order, job.options.uniqueness());
+  merge.each([&](const Line& line, const KeyEntry& entry) { writer.write(line, entry.view()); });
+  writer.flush();
+  output.commit();
+}
+
+/// Throws a Failure for the first line that is before the one in front of it, or that is no other one where lines are
+/// to be unique.
+int check_order(const SortJob& job) {
+  const SortOptions& options = job.options;
+  if (options.files.size() > 1)
+    throw Failure(kUsageError, "-c looks at one file, not at " + std::to_string(options.files.size()));
+  const std::string file = options.files.empty() ? "-" : options.files[0];
+  InputLines lines(job.collation.codepage(), file, false, options.null_ended, Pieces::kBytes);
+  const Unique unique = options.uniqueness();
+  KeyMaker maker(job.order);
+  Arena keys;
+  std::string last_key, last_line;
+  uint64_t number = 0;
+  for (const Line* line; (line = lines.next()) != nullptr; keys.clear()) {
+    const std::string_view key = maker.make(*line, &keys);
+    const int32_t result = ++number == 1 ? -1 : job.order.compare(last_key, key);
+    const bool again =
+        result == 0 && (unique == Unique::kOrder || (unique == Unique::kBytes && line->whole() == last_line));
+    if (result > 0 || again) {
+      if (options.check_quietly) return kDataError;
+      throw Failure(kDataError, (file == "-" ? "" : file + ", ") + "line " + std::to_string(number) +
+                                    (again ? " is equal to line " : " is before line ") +
+                                    std::to_string(number - 1) + " in the order");
     }
-    lines->swap(merged);
+    last_key = key;
+    last_line = line->whole();
   }
-}
-
-/// Gives each line the head of its key. With `keys`, which keeps the keys, the key takes the place of the text.
-void make_keys(Collation& collation, uint32_t options, std::vector<Line>* lines, std::string* keys,
-               const std::function<void()>& made_one) {
-  std::vector<size_t> ends;
-  std::string key;
-  for (Line& line : *lines) {
-    key.clear();
-    collation.append_key(line.order, options, &key);
-    line.head = KeyHead(key);
-    if (keys != nullptr) {
-      *keys += key;
-      ends.push_back(keys->size());
-    }
-    made_one();
-  }
-  size_t begin = 0;
-  for (size_t i = 0; i < ends.size(); begin = ends[i++])
-    (*lines)[i].order = std::string_view(*keys).substr(begin, ends[i] - begin);
-}
-
-/// Writes the lines that `keeps` tells of.
-template <class Keeps>
-void write_lines(const std::vector<Line>& lines, Output& output, Keeps keeps) {
-  std::string buffer;
-  for (const Line& line : lines) {
-    if (!keeps(line)) continue;
-    buffer += line.whole;
-    if (buffer.size() < Pieces::kBytes) continue;
-    output.write(buffer);
-    buffer.clear();
-  }
-  output.write(buffer);
+  return kDone;
 }
 
 int sort(const SortOptions& options, const CommonOptions& common) {
-  RulesSession session(common, options.rules);
-  Collation collation(session, options.locale, options.codepage);
-  Input input(options.files);
-  Pieces pieces(input);
-  Output output(options.output);
-  std::string text;
-  text.reserve(static_cast<size_t>(input.total_bytes()));
-  pieces.each(true, [&](const char* data, size_t bytes) { text.append(data, bytes); });
-  Lines split(collation.codepage(), input, text);
-  std::vector<Line>& lines = split.lines();
-  std::string keys;
-  const bool by_key = collation.by_key(options.options());
-  const bool keeps_keys = by_key && options.key;
-  const auto compare = [&](const Line& a, const Line& b) {
-    if (const int result = a.head.compare(b.head)) return result;
-    return keeps_keys ? a.order.compare(b.order) : collation.compare(a.order, b.order, options.options());
-  };
-  const uint64_t passes = count_passes(lines.size());
-  {
-    PassBar bar(text.size(), lines.size() * (by_key ? 2 * passes : passes));
-    if (by_key) {
-      make_keys(collation, options.options(), &lines, keeps_keys ? &keys : nullptr,
-                [&] { bar.advance(passes); });
-    }
-    if (options.reverse)
-      merge_sort(
-          &lines, [&](const Line& a, const Line& b) { return compare(b, a) < 0; }, &bar);
-    else
-      merge_sort(
-          &lines, [&](const Line& a, const Line& b) { return compare(a, b) < 0; }, &bar);
-  }
-  std::unordered_set<std::string_view> written;
-  const Line* last = nullptr;
-  write_lines(lines, output, [&](const Line& line) {
-    if (options.unique == kUniqueBytes) return written.insert(line.whole).second;
-    const bool keeps = options.unique.empty() || last == nullptr || compare(*last, line) != 0;
-    if (keeps) last = &line;
-    return keeps;
-  });
-  output.commit();
+  const SortJob job(options, common);
+  if (options.check || options.check_quietly) return check_order(job);
+  if (options.merge)
+    merge_files(job);
+  else
+    sort_lines(job);
   return kDone;
 }
 
@@ -310,14 +196,42 @@ Run declare_sort(Arguments& command, const CommonOptions& common) {
       .type_name("LOCALE");
   add_rules_option(command, options->rules);
   command.add_option("--codepage", options->codepage, "codepage of the text; else UTF-8").type_name("CP");
-  command.add_flag("--key", options->key,
-                   "keep the key of every line and compare those: faster, takes more memory, same result");
-  command.add_flag("--case-insensitive", options->ignore_case, "letter case does not count");
-  command.add_flag("--reverse", options->reverse, "last ones first; equal lines still keep their order");
-  command.add_flag(
-      "--unique", options->unique, {kUniqueBytes, kUniqueOrder},
-      "of lines that are the same bytes, or with =order of those that the order calls equal, write "
-      "the first only");
+  command
+      .add_option(
+          "-k,--key", options->keys,
+          "order by what stands from a character of a field to a character of a field; several: one after the "
+          "other")
+      .type_name("FIELD[.CHAR][bfr][,FIELD[.CHAR][bfr]]")
+      .one_at_a_time();
+  command
+      .add_option("-t,--field-separator", options->separator,
+                  "the character between two fields; else a field begins with the blanks in front of it")
+      .type_name("CHAR");
+  command.add_flag("-f,--ignore-case,--case-insensitive", options->ignore_case, "letter case does not count");
+  command.add_flag("-b,--ignore-leading-blanks", options->ignore_blanks,
+                   "blanks in front of a line or a field do not count");
+  command.add_flag("-r,--reverse", options->reverse, "last ones first; equal lines still keep their order");
+  command.add_flag("-s,--stable", options->stable, "equal lines keep their order, which they always do");
+  command.add_flag("-u{order},--unique", options->unique, {kUniqueBytes, kUniqueOrder},
+                   "of lines that are the same bytes, or with =order or -u of those that the order calls "
+                   "equal, write the first "
+                   "only");
+  command.add_flag("-z,--zero-terminated", options->null_ended, "lines end with a null character");
+  const Arguments::Option check =
+      command.add_flag("-c,--check", options->check, "tell whether the lines are sorted, and which one is not");
+  const Arguments::Option quiet = command.add_flag("-C", options->check_quietly,
+                                                   "tell by the exit code alone whether the lines are sorted");
+  command.add_flag("-m,--merge", options->merge, "merge files that are sorted").excludes(check).excludes(quiet);
+  command
+      .add_option("-S,--buffer-size", options->buffer_size,
+                  "memory for lines, in KiB or with b, K, M or G; else half of the machine's. What is more is "
+                  "sorted in "
+                  "temporary files")
+      .type_name("SIZE");
+  command
+      .add_option("-T,--temporary-directory", options->temporary_directory,
+                  "directory for temporary files; else TMPDIR, else /tmp")
+      .type_name("DIR");
   command.add_option("-o,--output", options->output, "output file, replaced when it is complete")
       .type_name("OUT");
   command.add_option("FILE", options->files, "input files; - is standard input").type_name("");
@@ -326,10 +240,14 @@ Run declare_sort(Arguments& command, const CommonOptions& common) {
       "order\n"
       "calls equal stay as they were one behind the other. A last line without an end gets that of the line "
       "before it.\n"
-      "--unique alone counts line ends as bytes of the line.\n"
+      "--unique alone counts line ends as bytes of the line. Fields and characters count from 1; b, f and r "
+      "behind "
+      "a\n"
+      "place in -k are -b, -f and -r for that key.\n"
       "\n"
       "Examples:\n"
       "  lexicor sort --locale Swedish names.txt\n"
+      "  lexicor sort --locale German -t ';' -k 2,2 -k 1,1r people.csv\n"
       "  lexicor sort --locale Japanese@Japanese --codepage MS932 --unique -o words.txt words.txt");
   return [options, &common] { return sort(*options, common); };
 }

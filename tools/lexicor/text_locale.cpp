@@ -42,7 +42,7 @@ Failure marked(ExitCode code, const std::string& message, std::string text, size
 }  // namespace
 
 TextLocale::TextLocale(const Session& session, const std::string& name)
-    : utf8_(session, read_catalogue(), "UTF-8", language_territory(open_chosen_locale(name).get())) {}
+    : utf8_(session, "UTF-8", language_territory(open_chosen_locale(name).get())) {}
 
 Units TextLocale::units(const std::string& text) const {
   const Stretch stretch = MalformedFinder(utf8_, true).next(text.data(), text.size(), LX_SHIFT_SINGLE, true);

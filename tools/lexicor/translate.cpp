@@ -40,9 +40,9 @@ struct TranslateOptions {
 /// The source or the target: a codepage, or 16-bit Unicode.
 class Side {
  public:
-  Side(const Session& session, const Catalogue& catalogue, const std::string& name)
+  Side(const Session& session, const std::string& name)
       : utf16_(name == std::to_string(NLS1_UTF16) || same_name(name, kUtf16Name)),
-        codepage_(session, catalogue, utf16_ ? "UTF-8" : name) {}
+        codepage_(session, utf16_ ? "UTF-8" : name) {}
 
   bool utf16() const { return utf16_; }
   std::string name() const { return utf16_ ? kUtf16Name : codepage_.name(); }
@@ -96,7 +96,7 @@ std::vector<char> read_units(const Side& target, const Input& input, Pieces& pie
     LXUChar unit;
     std::memcpy(&unit, text.data() + at, sizeof unit);
     if (!repertoire.has(unit))
-      losses->record(repertoire.kind_of_loss(unit), input.locate(at), repertoire.describe_loss(unit));
+      losses->record(repertoire.kind_of_loss(unit), input.place(at), repertoire.describe_loss(unit));
   }
   return text;
 }
@@ -109,9 +109,8 @@ size_t needed_bytes(size_t text_bytes) {
 
 int translate(const TranslateOptions& options, const CommonOptions& common) {
   const Session session(common);
-  const Catalogue catalogue = read_catalogue();
-  const Side source(session, catalogue, options.from);
-  const Side target(session, catalogue, options.to);
+  const Side source(session, options.from);
+  const Side target(session, options.to);
   Input input(options.files);
   Pieces pieces(input);
   Output output(options.output);

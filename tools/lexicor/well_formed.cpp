@@ -25,7 +25,10 @@ void WellFormed::look(bool last) {
     at += stretch.good_bytes;
     if (stretch.end != Stretch::End::kText) {
       const char* const bad = text + stretch.good_bytes;
-      const std::string where = input_.locate(offset_, place_.line(), place_.column()) + ": ";
+      InputPlace place = input_.place(offset_);
+      place.line = place_.line();
+      place.column = place_.column();
+      const std::string where = place.text() + ": ";
       if (stretch.end == Stretch::End::kLongUtf8)
         throw Failure(kDataError, where + code_point_name(long_utf8_code_point(bad, end)) +
                                       " is beyond U+FFFF, which only 'lexicor convert' takes");
