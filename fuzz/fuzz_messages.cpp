@@ -4,7 +4,6 @@
 #include "builder.h"
 #include "catalog_file.h"
 #include "fuzz.h"
-#include "lexicor/catalogue.h"
 #include "lexicor/codepage.h"
 #include "lexicor/session.h"
 #include "message_source.h"
@@ -20,7 +19,7 @@ using namespace lexicor_gencat;
 /// Codepages as sources and catalogs are in them.
 struct Opened {
   Opened(const lexicor_cli::Session& session, const std::string& name)
-      : codepage(session, lexicor_cli::read_catalogue(), name), encoding(codepage) {}
+      : codepage(session, name), encoding(codepage) {}
   lexicor_cli::Codepage codepage;
   Encoding encoding;
 };

@@ -11,16 +11,12 @@
 
 namespace lexicor_cli {
 
-struct Catalogue;
-
 class Codepage {
  public:
   /// `name` is an object name, a decimal identifier or an alias, in any letter case. Throws a Failure that
   /// names the nearest codepages when there is none, or that says why its file could not be loaded. Its locale
   /// has the given language and territory ("German_Austria"); empty: any will do.
   Codepage(const Session& session, const std::string& name, const std::string& language_territory = "");
-  /// The same, for callers that have read the catalogue.
-  Codepage(const Session& session, const Catalogue&, const std::string& name) : Codepage(session, name) {}
   ~Codepage();
   Codepage(const Codepage&) = delete;
   Codepage& operator=(const Codepage&) = delete;
