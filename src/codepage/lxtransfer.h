@@ -74,8 +74,9 @@ template <class Cursor, class Sink>
 /// Moves characters from a cursor to a sink, at most `count` of them, as Unicode values or as packed codes.
 template <class Value, class Cursor, class Sink>
 inline Transfer<Value> transfer(Cursor& in, Sink& out, size_t count) {
-  // Units that stay what they are need no runs of equal ones.
-  constexpr bool kRuns = Cursor::kRuns && Sink::kRuns && !(Cursor::kUnicode && Sink::kUnicode);
+  // Units that stay what they are need no runs of equal ones; and runs are of Unicode values, which some codes lack.
+  constexpr bool kRuns =
+      Cursor::kRuns && Sink::kRuns && !(Cursor::kUnicode && Sink::kUnicode) && std::is_same_v<Value, LXUChar>;
   size_t left = count;
   unsigned below = 0;
   if constexpr (kRuns) {
