@@ -79,8 +79,12 @@ struct LeadByteCursor {
   }
   void decode(const uint8_t* c, size_t length, LXWChar* code) const { *code = pack(c, length); }
   size_t read_run(LXUChar* values, size_t most, RunRule rule);
-  /// Of the character here, wherever the text ends.
-  size_t length() const { return cp.length(*p); }
+  /// Of the character here, wherever the text ends. Computed where that is sooner done than looked up.
+  size_t length() const {
+    if constexpr (kUtf8)
+      if (cp.plain_utf8) return 1u + (*p - 0xC2u < 0xF0 - 0xC2) + (*p - 0xE0u < 0xF0 - 0xE0);
+    return cp.length(*p);
+  }
   bool pass() {
     size_t units;
     return pass(&units);
@@ -93,7 +97,7 @@ struct LeadByteCursor {
     return true;
   }
   template <class V>
-  bool next(V* value) {
+  [[gnu::always_inline]] bool next(V* value) {
     if (p == end) return false;
     if (*p < cp.same_below) {  // apart: the next character does not wait for the length of this one
       *value = *p++;

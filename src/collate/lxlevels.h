@@ -24,6 +24,12 @@ struct Level {
     *end++ = static_cast<Weight>(weight);
     if (append) run = end;
   }
+  /// The same where nothing is inserted; without a branch, as a weight that is 0 is written over.
+  void append(uint32_t weight) {
+    *end = static_cast<Weight>(weight);
+    end += weight != 0;
+    run = end;
+  }
   void close_run() {
     for (Weight *low = run, *high = end; high - low > 1;) {
       const Weight kept = *low;
@@ -67,9 +73,16 @@ struct Levels {
         tertiaries(secondaries.begin + most_chars * kByteLevelBytes + 1),
         specials(space + specials_at(most_chars)) {
     WeightSets<Cursor> sets(sort, text);
-    while (!sets.at_end()) {
-      const Element set = sets.next();
-      place(set, sets.position());
+    if (sort.appends_all) {
+      while (!sets.at_end()) {
+        const Element set = sets.next();
+        append(set, sets.position());
+      }
+    } else {
+      while (!sets.at_end()) {
+        const Element set = sets.next();
+        place(set, sets.position());
+      }
     }
     chars = sets.consumed();
     primaries.close_run();
@@ -79,6 +92,12 @@ struct Levels {
   }
 
  private:
+  void append(const Element& set, uint16_t position) {
+    primaries.append(set.primary());
+    secondaries.append(set.secondary());
+    tertiaries.append(set.tertiary());
+    specials.append(set.placed_special(position));
+  }
   void place(const Element& set, uint16_t position) {
     primaries.add(set.primary(), set.appends(LX_APPEND_PRIMARY));
     secondaries.add(set.secondary(), set.appends(LX_APPEND_SECONDARY));
