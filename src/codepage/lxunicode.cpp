@@ -83,16 +83,19 @@ constexpr uint16_t upper_by_range(uint16_t u) {
   return u;
 }
 
+/// The pages that the ranges of case lie in.
+constexpr uint8_t kCasePages[] = {0x00, 0x01, 0x02, 0x03, 0x04, 0x05, 0x10, 0x1E, 0x1F, 0x21, 0x24, 0xFF};
+
 constexpr CaseTable make_case_table(bool upper) {
+  static_assert(sizeof(kCasePages) + 1 == sizeof(CaseTable::delta) / sizeof(CaseTable::delta[0]));
   CaseTable table{};
-  unsigned pages = 1;  // the first one moves nothing
-  for (unsigned u = 0; u <= 0xFFFF; ++u) {
-    const auto value = static_cast<uint16_t>(u);
-    const auto delta = static_cast<uint16_t>((upper ? upper_by_range(value) : lower_by_range(value)) - u);
-    if (delta == 0) continue;
-    uint8_t& page = table.page[u >> 8];
-    if (page == 0) page = static_cast<uint8_t>(pages++);
-    table.delta[page][u & 0xFF] = delta;
+  unsigned row = 0;  // the first one moves nothing
+  for (const uint8_t page : kCasePages) {
+    table.page[page] = static_cast<uint8_t>(++row);
+    for (unsigned low = 0; low <= 0xFF; ++low) {
+      const auto u = static_cast<uint16_t>(unsigned{page} << 8 | low);
+      table.delta[row][low] = static_cast<uint16_t>((upper ? upper_by_range(u) : lower_by_range(u)) - u);
+    }
   }
   return table;
 }

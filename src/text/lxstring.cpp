@@ -166,7 +166,7 @@ Unit* tokenize(LXLocale* given, Form form, Unit* text, LXShiftState* state, int3
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, none);
   *next = nullptr;
   if (text == nullptr) *length = 0;
-  if ((flags & ~LX_CHARACTERS) != 0) return call.fail(LX_E_INVALID, none);
+  if ((flags & ~uint32_t{LX_CHARACTERS}) != 0) return call.fail(LX_E_INVALID, none);
   if (text == nullptr) return call.exit(none);
   const Codepage& cp = codepage_of(call.codepage());
   const bool characters = sizeof(Unit) == 1 && (flags & LX_CHARACTERS) != 0;
