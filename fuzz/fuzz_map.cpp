@@ -62,8 +62,7 @@ void call_any(Input& in, const F& form, LXLocale* l, uint32_t mode) {
   const auto text = in.text(form, l, 120);
   const Block<Unit> given(text + Unit{0});
   int32_t length = in.flag() ? -1 : count_of(text);
-  if (sizeof(Unit) == 1 && chars && length > 0)
-    length = LXNumCharsEx(l, reinterpret_cast<const char*>(given.data()), 0, length);
+  if (sizeof(Unit) == 1 && chars && length > 0) length = length_in_chars(l, given.data(), 0, length);
   const uint32_t size = in.below(200);
   const Block<Unit> out(size * (sizeof(Unit) == 1 && chars ? 6 : 1));
   const int32_t limit = static_cast<int32_t>(size);

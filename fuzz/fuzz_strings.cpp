@@ -1,5 +1,7 @@
 // The string family: in all four forms it finds, spans, copies and divides as a model of 16-bit units does, where the
 // codepage has the characters; of any units nothing beyond their blocks is touched.
+#include <cstring>
+
 #include "fuzz.h"
 
 namespace lx::fuzz::strings {
@@ -18,7 +20,7 @@ struct Argument {
     if (kind == 0) text.resize(in.below(static_cast<uint32_t>(text.size()) + 1));
     length = kind == 1 ? -1 : count_of(text);
     const bool chars = (flags & LX_CHARACTERS) != 0 && sizeof(Unit) == 1;
-    if (chars && kind != 1) length = LXNumCharsEx(l, reinterpret_cast<const char*>(text.data()), state, length);
+    if (chars && kind != 1) length = length_in_chars(l, text.data(), state, length);
     if (chars || kind == 1) text.push_back(0);  // a shift byte is looked for behind the last character
     block = Block<Unit>(text);
   }
@@ -60,7 +62,10 @@ void call_all(Input& in, const F& form, const Place& at) {
   if constexpr (sizeof(Unit) == 1) {
     const Block<Unit> cut(Text<Unit>(other.data(), static_cast<size_t>(other.block.size())) + '\0');
     const int32_t rest = form.truncate(
-        l, cut.data(), chars ? std::min(size, LXNumCharsEx(l, cut.data(), states.text, -1)) : size,
+        l, cut.data(),
+        chars ? std::min(size,
+                         length_in_chars(l, cut.data(), states.text, static_cast<int32_t>(strlen(cut.data()))))
+              : size,
         flags | (in.flag() ? LX_DROP_FULL_BLANKS : 0));
     // The null is no character in a double-byte state left open, nor behind half a character.
     must(rest >= (chars ? 0 : 1) && rest <= cut.size(), "a string is cut");
