@@ -233,8 +233,9 @@ inline std::string shown(const Units& text) {
 
 /// A text of a locale.
 inline Units item(LXLocale* l, int32_t number) {
+  constexpr size_t kMostUnits = 5000;
   return made<LXUChar>(
-      [&](LXUChar* to, int32_t size) { return LXGetLocaleTextInfoU(l, number, to, size, 0) - 1; });
+      [&](LXUChar* to, int32_t size) { return LXGetLocaleTextInfoU(l, number, to, size, 0) - 1; }, kMostUnits);
 }
 
 /// All that a caller can see of a locale.
