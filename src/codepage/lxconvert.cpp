@@ -175,7 +175,7 @@ int32_t convert_text(LXLocale* target, Buffer<Out> to, LXLocale* source, Text<In
     const Codepage& in_cp = codepage_of(*from->codepage);
     const Codepage& out_cp = codepage_of(call.codepage());
     const bool shifts = form == Form::kEx && (in_cp.shift_sensitive || out_cp.shift_sensitive);
-    const size_t units = to.size > 0 && !shifts ? short_units(text, flags) : 0;
+    const size_t units = kManyRegisters && to.size > 0 && !shifts ? short_units(text, flags) : 0;
     if (units != 0) {
       const bool end = text.length < 0 || flags != 0;
       const size_t size = static_cast<size_t>(to.size) - end;

@@ -87,11 +87,17 @@ size_t MultiByteCursor::read_run(LXUChar* values, size_t most, RunRule rule) {
   size_t n = 0;
   while (n < most) {
     const size_t left = room(q, end);
-    if (left == 0 || (n == kFewChars && left > kFewChars)) break;
+    if (left == 0 || (n >= kFewChars && left > kFewChars)) break;
+    if (*q < cp.same_below) {
+      if (n >= kBlock && is_long_same(q, end, rule.below)) break;
+      const size_t same = copy_same(values + n, q, least(most - n, left), cp.same_below);
+      n += same;
+      q += same;
+      continue;
+    }
     const size_t length = cp.length(*q);
     if (length > left) break;
     if (length == 1) {
-      if (n >= kBlock && is_long_same(q, end, rule.below)) break;
       values[n++] = cp.unicode[*q++];
     } else {
       values[n++] = length == 2 && pairs.first != nullptr ? pair_value(pairs, q) : row_unicode(cp, q);

@@ -5,8 +5,11 @@
 
 namespace lx {
 
-inline constexpr size_t kRunChars = 128;          // moved at a time through a buffer on the stack
-inline constexpr size_t kRunUnits = 8;            // of shorter Unicode the characters are moved one by one
+inline constexpr size_t kRunChars = 128;  // moved at a time through a buffer on the stack
+// With few registers more calls cost more than they save.
+inline constexpr bool kManyRegisters = sizeof(size_t) == 8;
+inline constexpr size_t kRunUnits =
+    kManyRegisters ? 8 : 48;                      // of shorter Unicode characters are moved one by one
 inline constexpr size_t kTranslatedBytes = 1024;  // from so many on a table from bytes to bytes pays
 inline constexpr size_t kShiftRunUnits = 16;      // the same where shift states are kept
 

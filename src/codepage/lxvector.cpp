@@ -44,8 +44,7 @@ ReadRun read_utf8(const uint8_t* q, const uint8_t* end, uint16_t* values, size_t
     // A block leaves a value behind its last one: there is one more character, whose value overwrites it.
     if (!kVectors || most - n <= kBlock || left < kBlock + kMaxCharBytes) {
       const size_t few = least(most - n, left);
-      size_t ascii = 0;
-      for (; ascii < few && q[ascii] < kAscii; ++ascii) values[n + ascii] = q[ascii];
+      const size_t ascii = lx::copy_same(values + n, q, few, kAscii);
       n += ascii;
       q += ascii;
       if (ascii != 0) continue;
@@ -194,7 +193,9 @@ size_t vectors_here(const Vectors* found[kMostVectors]) {
   size_t count = 0;
 #if defined(__SSE2__)
   __builtin_cpu_init();
+#if defined(__x86_64__)
   if (has_avx512()) found[count++] = &kAvx512Vectors;
+#endif
   if (has_sse4()) found[count++] = &kSse4Vectors;
 #endif
   found[count++] = &kBaseVectors;

@@ -1,7 +1,8 @@
-// Blocks of 64 bytes and masks, with which a short text is one block too.
+// Blocks of 64 bytes and masks, with which a short text is one block too. For 64 bits: with eight vectors and masks in
+// two parts it is slower than what it replaces.
 #include "codepage/lxvectorlevels.h"
 
-#if defined(__SSE2__)
+#if defined(__x86_64__)
 #include <immintrin.h>
 #if !defined(__clang__)
 #pragma GCC diagnostic ignored "-Wmaybe-uninitialized"  // the header's own undefined vectors
@@ -17,11 +18,7 @@ constexpr size_t kUnits = kBytes / 2;  // ... of units
 using Marks = Utf8Marks<uint64_t>;
 
 LX_TARGET inline uint64_t ones(size_t count) {
-#if defined(__x86_64__)
   return _bzhi_u64(~uint64_t{0}, static_cast<unsigned>(count));
-#else
-  return count == 0 ? 0 : ~uint64_t{0} >> (kBytes - count);
-#endif
 }
 
 /// The values of characters of which the first, second and third bytes are given. A missing one does not count.
@@ -40,12 +37,7 @@ LX_TARGET inline __m512i values_of(__m256i first, __m256i second, __m256i third)
 
 /// The place of the bit behind the lowest `count` ones.
 LX_TARGET inline unsigned place_of(uint64_t bits, size_t count) {
-#if defined(__x86_64__)
   return static_cast<unsigned>(__builtin_ctzll(_pdep_u64(uint64_t{1} << count, bits)));
-#else
-  for (; count != 0; --count) bits &= bits - 1;
-  return static_cast<unsigned>(__builtin_ctzll(bits));
-#endif
 }
 
 /// Stores the first `count` units of a vector. Where more can be stored they are: what is stored in parts cannot
