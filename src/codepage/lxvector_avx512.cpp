@@ -21,6 +21,12 @@ LX_TARGET inline uint64_t ones(size_t count) {
   return _bzhi_u64(~uint64_t{0}, static_cast<unsigned>(count));
 }
 
+/// Stores the bytes of a block as units.
+LX_TARGET inline void widen_block(uint16_t* to, __m512i block) {
+  _mm512_storeu_si512(to, _mm512_cvtepu8_epi16(_mm512_castsi512_si256(block)));
+  _mm512_storeu_si512(to + kUnits, _mm512_cvtepu8_epi16(_mm512_extracti64x4_epi64(block, 1)));
+}
+
 /// The values of characters of which the first, second and third bytes are given. A missing one does not count.
 LX_TARGET inline __m512i values_of(__m256i first, __m256i second, __m256i third) {
   const __m512i low_six = _mm512_set1_epi16(0x3F);
@@ -59,8 +65,7 @@ LX_TARGET ReadRun read_utf8(const uint8_t* q, const uint8_t* end, uint16_t* valu
     const uint64_t high = _mm512_movepi8_mask(block);
     if (high == 0 && bytes == kBytes && most - n >= kBytes) {
       if (rule.below != 0 && n != 0) break;
-      _mm512_storeu_si512(values + n, _mm512_cvtepu8_epi16(_mm512_castsi512_si256(block)));
-      _mm512_storeu_si512(values + n + kUnits, _mm512_cvtepu8_epi16(_mm512_extracti64x4_epi64(block, 1)));
+      widen_block(values + n, block);
       q += kBytes;
       n += kBytes;
       continue;
@@ -169,8 +174,7 @@ LX_TARGET ReadRun read_pairs(const PairRows& pairs, const uint8_t* q, const uint
     const __m512i block = _mm512_maskz_loadu_epi8(inside, q);
     if (pairs.ascii && bytes == kBytes && _mm512_movepi8_mask(block) == 0 && most - n >= kBytes) {
       if (rule.below != 0 && n != 0) break;
-      _mm512_storeu_si512(values + n, _mm512_cvtepu8_epi16(_mm512_castsi512_si256(block)));
-      _mm512_storeu_si512(values + n + kUnits, _mm512_cvtepu8_epi16(_mm512_extracti64x4_epi64(block, 1)));
+      widen_block(values + n, block);
       q += kBytes;
       n += kBytes;
       continue;
