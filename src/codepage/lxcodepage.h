@@ -46,9 +46,9 @@ struct PairCase {
 ///
 /// Towards Unicode: `unicode` for single bytes; for longer characters `rows`, one row of 256 values a trie
 /// node. A leaf's row holds Unicode values, another node's row the numbers of the next nodes, 0 for none (node
-/// 0 is the root, which is nobody's child). Behind them one row has no values, and one those of single bytes. From Unicode: `codes16` or, where a character has more than two
-/// bytes, `codes32`: from page_start[u >> 8] on they hold for every low byte the bytes to store, packed;
-/// unmapped values hold the substitution byte.
+/// 0 is the root, which is nobody's child). Behind them one row has no values, and one has those of single bytes. From
+/// Unicode: `codes16` or, where a character has more than two bytes, `codes32`: from page_start[u >> 8] on they hold for
+/// every low byte the bytes to store, packed; unmapped values hold the substitution byte.
 struct Codepage {
   const uint8_t* payload;
   PageCodes pages;

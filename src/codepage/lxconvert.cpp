@@ -151,11 +151,8 @@ size_t convert_short(const Codepage& out_cp, uint8_t* to, size_t size, const Cod
   if (below != 0 && bytes <= size && vectors->copy_same(to, text, bytes, below)) return bytes;
   if (in_cp.single_byte && out_cp.single_byte) {
     if (bytes > size) return 0;
-    const PairCodes codes{out_cp.page_start, out_cp.codes16};
-    for (size_t i = 0; i < bytes; ++i) {
-      const unsigned u = in_cp.unicode[text[i]];
-      to[i] = static_cast<uint8_t>(codes.codes[codes.page_start[u >> 8] + (u & 0xFF)]);
-    }
+    const SingleByteSink out{out_cp, to, to + bytes};
+    for (size_t i = 0; i < bytes; ++i) to[i] = out.encode(in_cp.unicode[text[i]]);
     return bytes;
   }
   LXUChar values[2 * kRunSlack];

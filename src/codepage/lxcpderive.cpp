@@ -53,6 +53,8 @@ class ReachableNodes {
   size_t count_ = 0;
 };
 
+constexpr size_t kReadBehind = sizeof(uint16_t);  // codes of 16 bits are also loaded in pairs
+
 /// Where the arrays stand in the block: behind the record, 32-bit codes first.
 struct Layout {
   size_t codes;
@@ -70,7 +72,7 @@ struct Layout {
         halves(first + (nodes != 0 ? kRow * sizeof(uint32_t) : 0)),
         cases(halves + half_slots * sizeof(uint16_t)),
         leaf(cases + case_numbers * sizeof(uint16_t)),
-        bytes(leaf + nodes) {}
+        bytes(leaf + nodes + kReadBehind) {}
 };
 
 void fill_scalars(Codepage* cp, uint16_t id, const Sections& sections) {
@@ -229,8 +231,8 @@ class TypeTrie {
   const uint8_t* records_;
 };
 
-/// Which first bytes begin characters that have another case; `pairs` is given rows for those of two bytes. How many
-/// numbers these take.
+/// Finds which first bytes begin characters that have another case, and gives rows of PairCase to those of two bytes: how
+/// many numbers the rows take.
 size_t find_case(Codepage* cp) {
   if (cp->single_byte) return 0;
   const TypeTrie types(cp->payload);

@@ -62,7 +62,7 @@ struct UnicodeMapper {
   LXUChar value(uint16_t u) const { return u; }
   bool alone(UnicodeChar c, LXUChar* mapped) const {
     if constexpr (kKind == Kind::kCase) {
-      *mapped = case_tables[mode.upper].other(c.u);
+      *mapped = kCaseTables[mode.upper].other(c.u);
     } else if constexpr (kKind == Kind::kFullWidth) {
       *mapped = unicode_half_to_full(c.u);
     } else if constexpr (kKind == Kind::kHalfWidth) {

@@ -140,7 +140,7 @@ bool map_rest(LeadByteText& text, const Mapper& mapper, unsigned below) {
 /// ... and maps the characters of Unicode text.
 template <class Mapper>
 bool map_rest(UnicodeText& text, const Mapper& mapper, unsigned below) {
-  const CaseTable& table = case_tables[mapper.mode.upper];
+  const CaseTable& table = kCaseTables[mapper.mode.upper];
   const LXUChar* const p = text.in.p;
   LXUChar* const to = text.out.p;
   const size_t n = most_units(text);

@@ -127,8 +127,7 @@ uint32_t unicode_type(uint16_t u) {
   return entry<0xFD3E, 0xFFFF>(LX_UNICODE_Ctype8, u);
 }
 
-constexpr CaseTable kTables[] = {make_case_table(false), make_case_table(true)};
-const CaseTable* const case_tables = kTables;
+constexpr CaseTable kCaseTables[2] = {make_case_table(false), make_case_table(true)};
 
 uint16_t unicode_half_to_full(uint16_t u) {
   if (in(u, 0x0021, 0x007E)) return moved(u, 0xFEE0);

@@ -11,26 +11,24 @@ namespace lx {
 /// The character-type word: bits 0-9 classification, 10-21 bidirectional category, 22-31 text properties.
 uint32_t unicode_type(uint16_t u);
 
-/// Simple case mappings, and full-width and half-width counterparts; a value without one maps to itself.
-inline uint16_t unicode_lower(uint16_t u);
-inline uint16_t unicode_upper(uint16_t u);
+/// Full-width and half-width counterparts; a value without one maps to itself.
 uint16_t unicode_half_to_full(uint16_t u);
 uint16_t unicode_full_to_half(uint16_t u);
 
-/// What each value moves by in one direction, by pages of those that do.
+/// The simple case mapping of one direction: what each value moves by, by pages of those that do.
 struct CaseTable {
   uint8_t page[256];
   uint16_t delta[13][256];
 
   uint16_t other(uint16_t u) const { return static_cast<uint16_t>(u + delta[page[u >> 8]][u & 0xFF]); }
 };
-extern const CaseTable* const case_tables;  // to lower case, to upper case
+extern const CaseTable kCaseTables[2];  // to lower case, to upper case
 
 inline uint16_t unicode_lower(uint16_t u) {
-  return case_tables[0].other(u);
+  return kCaseTables[0].other(u);
 }
 inline uint16_t unicode_upper(uint16_t u) {
-  return case_tables[1].other(u);
+  return kCaseTables[1].other(u);
 }
 
 /// The ASCII digit of a decimal digit, superscript or subscript; 0 for any other value. It knows the digits
