@@ -80,17 +80,13 @@ class Texts {
   };
 
   static bool counts_characters(uint32_t flags) { return kBytes && (flags & LX_CHARACTERS) != 0; }
-  /// The fewest that a function counts: with shift states, from either on, and without; and where shift bytes
-  /// follow one another.
+  /// The fewest that a function counts: with shift states, from either on, and without.
   int32_t characters_of(const Text<Unit>& text) const {
     const auto units = static_cast<int32_t>(text.size());
     if constexpr (kBytes) {
       int32_t fewest = codepage_ != nullptr ? LXNumChars(l_, text.data(), units) : 0;
-      for (const LXShiftState state : {LX_SHIFT_SINGLE, LX_SHIFT_DOUBLE}) {
-        if (fewest == 0) break;
-        fewest = std::min({fewest, LXNumCharsEx(l_, text.data(), state, units),
-                           LXCpStrByteToCharLen(codepage_, text.data(), state, units)});
-      }
+      for (const LXShiftState state : {LX_SHIFT_SINGLE, LX_SHIFT_DOUBLE})
+        if (fewest > 0) fewest = std::min(fewest, lx::test::length_in_chars(l_, text.data(), state, units));
       return fewest;
     } else {
       return units;

@@ -23,8 +23,8 @@ using lexicor_cli::kUsageError;
 constexpr char kFooter[] =
     "Examples:\n"
     "  lexicor-gencat app.cat app.msg\n"
-    "  lexicor-gencat --locale Japanese_Japan.IBM930 --source-encoding UTF-8 app.cat app.msg\n"
-    "  lexicor-gencat --locale German_Germany.MS1252 --byte-order big app.cat de.po\n"
+    "  lexicor-gencat --locale Japanese_Japan.IBM930 --source-encoding UTF-8 host.cat app.msg\n"
+    "  lexicor-gencat --locale German_Germany.MS1252 --byte-order big de.cat de.po\n"
     "  lexicor-gencat --dump app.cat";
 
 struct Asked {

@@ -170,8 +170,7 @@ Run declare_message(Arguments& command, const CommonOptions& common) {
       "Examples:\n"
       "  lexicor message ./app.cat 1 3\n"
       "  lexicor message ./app.cat 1 3 --codepage IBM930 > message.host\n"
-      "  lexicor message app 1 3 --locale German_Germany --directory '/usr/share/app/%L/%N.cat' --default "
-      "Hello");
+      "  lexicor message app 1 3 --locale German_Germany --directory 'cats/%L/%N.cat' --default Hello");
   return [options, &common] { return message(*options, common); };
 }
 
