@@ -89,7 +89,7 @@ void call_plain(Input& in, const Place& to, const Place& from, const std::string
       in.one_of({0, int32_t{LX_TERMINATE}, int32_t{LX_CHARACTERS}, LX_TERMINATE | LX_CHARACTERS, 1});
   const bool chars = (flags & LX_CHARACTERS) != 0, terminated = in.flag();
   const Block<char> given(terminated || chars ? text + '\0' : text);
-  const int32_t whole_chars = length_in_chars(from.locale, text.data(), 0, count_of(text));
+  const int32_t whole_chars = length_in_chars(from.codepage, text.data(), 0, count_of(text));
   const int32_t length = terminated ? -1 : chars ? whole_chars : count_of(text);
   const size_t size = in.below(64), room = chars ? size * kMostCharBytes + 2 : size;
   const int32_t limit = static_cast<int32_t>(size);

@@ -56,13 +56,14 @@ void forms_agree(const Place& at, const Units& text, uint32_t mode) {
 
 /// With a count of characters, null-terminated, in any room.
 template <class F>
-void call_any(Input& in, const F& form, LXLocale* l, uint32_t mode) {
+void call_any(Input& in, const F& form, const Place& at, uint32_t mode) {
+  LXLocale* const l = at.locale;
   using Unit = typename F::Unit;
   const bool chars = in.flag();
   const auto text = in.text(form, l, 120);
   const Block<Unit> given(text + Unit{0});
   int32_t length = in.flag() ? -1 : count_of(text);
-  if (sizeof(Unit) == 1 && chars && length > 0) length = length_in_chars(l, given.data(), 0, length);
+  if (sizeof(Unit) == 1 && chars && length > 0) length = length_in_chars(at.codepage, given.data(), 0, length);
   const uint32_t size = in.below(200);
   const Block<Unit> out(size * (sizeof(Unit) == 1 && chars ? 6 : 1));
   const int32_t limit = static_cast<int32_t>(size);
@@ -75,7 +76,7 @@ void call_any(Input& in, const F& form, LXLocale* l, uint32_t mode) {
 FUZZ_TARGET(map) {
   const Place& at = place(in);
   const uint32_t mode = in.one_of(kModes);
-  if (in.flag()) return in_all_forms([&](const auto& form) { call_any(in, form, at.locale, mode); });
+  if (in.flag()) return in_all_forms([&](const auto& form) { call_any(in, form, at, mode); });
   const Units text = in.units(60);
   value_by_value(at, text, mode);
   if (mode != LX_MAP_DIGITS) forms_agree(at, text, mode);

@@ -14,13 +14,13 @@ template <class F>
 struct Argument {
   using Unit = typename F::Unit;
 
-  Argument(Input& in, const F& form, LXLocale* l, uint32_t flags, LXShiftState state) {
-    Text<Unit> text = in.text(form, l, 40);
+  Argument(Input& in, const F& form, const Place& at, uint32_t flags, LXShiftState state) {
+    Text<Unit> text = in.text(form, at.locale, 40);
     const uint32_t kind = in.below(3);
     if (kind == 0) text.resize(in.below(static_cast<uint32_t>(text.size()) + 1));
     length = kind == 1 ? -1 : count_of(text);
     const bool chars = (flags & LX_CHARACTERS) != 0 && sizeof(Unit) == 1;
-    if (chars && kind != 1) length = length_in_chars(l, text.data(), state, length);
+    if (chars && kind != 1) length = length_in_chars(at.codepage, text.data(), state, length);
     if (chars || kind == 1) text.push_back(0);  // a shift byte is looked for behind the last character
     block = Block<Unit>(text);
   }
@@ -38,7 +38,7 @@ void call_all(Input& in, const F& form, const Place& at) {
   const uint32_t options = flags | in.one_of({0u, LX_CASE_INSENSITIVE, LX_WIDTH_INSENSITIVE, LX_IGNORE_BLANKS});
   states = {};
   if (at.shift && std::is_same_v<F, Ex>) states.text = in.below(2), states.second = in.below(2);
-  const Argument<F> text(in, form, l, flags, states.text), other(in, form, l, flags, states.second);
+  const Argument<F> text(in, form, at, flags, states.text), other(in, form, at, flags, states.second);
   const LXShiftState text_state = states.text;
   const auto size = static_cast<int32_t>(in.below(50));
   const bool chars = (flags & LX_CHARACTERS) != 0 && sizeof(Unit) == 1;
@@ -61,12 +61,12 @@ void call_all(Input& in, const F& form, const Place& at) {
   must(used <= size, "a join fits");
   if constexpr (sizeof(Unit) == 1) {
     const Block<Unit> cut(Text<Unit>(other.data(), static_cast<size_t>(other.block.size())) + '\0');
-    const int32_t rest = form.truncate(
-        l, cut.data(),
-        chars ? std::min(size,
-                         length_in_chars(l, cut.data(), states.text, static_cast<int32_t>(strlen(cut.data()))))
-              : size,
-        flags | (in.flag() ? LX_DROP_FULL_BLANKS : 0));
+    const int32_t rest =
+        form.truncate(l, cut.data(),
+                      chars ? std::min(size, length_in_chars(at.codepage, cut.data(), states.text,
+                                                             static_cast<int32_t>(strlen(cut.data()))))
+                            : size,
+                      flags | (in.flag() ? LX_DROP_FULL_BLANKS : 0));
     // The null is no character in a double-byte state left open, nor behind half a character.
     must(rest >= (chars ? 0 : 1) && rest <= cut.size(), "a string is cut");
   }

@@ -86,7 +86,8 @@ class Texts {
     if constexpr (kBytes) {
       int32_t fewest = codepage_ != nullptr ? LXNumChars(l_, text.data(), units) : 0;
       for (const LXShiftState state : {LX_SHIFT_SINGLE, LX_SHIFT_DOUBLE})
-        if (fewest > 0) fewest = std::min(fewest, lx::test::length_in_chars(l_, text.data(), state, units));
+        if (fewest > 0)
+          fewest = std::min(fewest, lx::test::length_in_chars(codepage_, text.data(), state, units));
       return fewest;
     } else {
       return units;

@@ -201,15 +201,12 @@ int32_t count_of(const Container& text) {
 
 /// The characters of a text as a length in characters counts them: a shift byte on either side belongs to one, so that
 /// of two side by side not the same are counted as by LXNumCharsEx.
-inline int32_t length_in_chars(LXLocale* l, const void* text, LXShiftState state, int32_t bytes) {
+inline int32_t length_in_chars(const LXObject* codepage, const void* text, LXShiftState state, int32_t bytes) {
   constexpr size_t kBehind = 16;
   const std::string padded =
       std::string(static_cast<const char*>(text), static_cast<size_t>(bytes)) + std::string(kBehind, 'x');
-  for (int32_t chars = 0;; ++chars) {
-    LXShiftState end = state;
-    if (LXMoveStringPointerEx(l, padded.data(), state, chars + 1, &end, LX_CHARACTERS) > padded.data() + bytes)
-      return chars;
-  }
+  for (int32_t chars = 0;; ++chars)
+    if (LXCpStrCharToByteLen(codepage, padded.data(), state, chars + 1) > bytes) return chars;
 }
 inline Units units(const std::string& ascii) {
   return Units(ascii.begin(), ascii.end());
