@@ -17,7 +17,7 @@ inline bool hook_free(void* block) {
   return block == nullptr || globals.release(globals.area->context, block) != 0;
 }
 
-/// Owns one block. Where a failing free hook must be reported, use free_now() and its result.
+/// Owns one block. Where a failing free hook must be reported, detach the block and free it.
 template <class T>
 class HookPtr {
  public:
@@ -36,14 +36,12 @@ class HookPtr {
     block_ = nullptr;
     return block;
   }
-  bool free_now() { return hook_free(detach()); }
 
  private:
   T* block_;
 };
 
-/// Work space of one call: 256 bytes on the stack, a block from the hook beyond that. Where a failing free hook
-/// must be reported, use free_now() and its result.
+/// Work space of one call: 256 bytes on the stack, a block from the hook beyond that.
 class WorkBuffer {
  public:
   explicit WorkBuffer(size_t bytes)
@@ -55,7 +53,6 @@ class WorkBuffer {
   T* as() const {
     return static_cast<T*>(data_);
   }
-  bool free_now() { return block_.free_now(); }
 
  private:
   alignas(8) unsigned char local_[256];

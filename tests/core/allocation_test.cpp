@@ -153,7 +153,8 @@ TEST_F(AllocationTest, EveryAllocationFails) {
   const std::string long_text(400, 'a'), longer = long_text + "  ";
   const Units long_units = widened<LXUChar>(long_text + 'a'), capitals = Units(401, 'A'),
               catalog16 = widened<LXUChar>(catalog), missing16(400, 'd'),
-              everything16 = widened<LXUChar>(kEverything), currency{0x3041, 0x3042, 0x3043, 'A'};
+              everything16 = widened<LXUChar>(kEverything + std::string(40, '-')),
+              currency{0x3041, 0x3042, 0x3043, 'A'};
   const Text<LXWChar> everything32 = widened<LXWChar>(kEverything), long_codes(400, 'a');
   char grouping[] = "\3\3";
   lconv conventions = SystemLocale::nothing();
@@ -198,7 +199,7 @@ TEST_F(AllocationTest, EveryAllocationFails) {
       {"LXGetLocaleW", kLoads,
        makes([&](int32_t* code) { return LXGetLocaleW(everything32.c_str(), 0, code); })},
       {"LXGetLocaleU", kLoads,
-       makes([&](int32_t* code) { return LXGetLocaleU(everything16.c_str(), 0, code); })},
+       makes([&](int32_t* code) { return LXGetLocaleU(everything16.c_str(), LX_FALLBACK, code); })},
       {"LXSetLocale", kLoads, [&](LXLocale*) { return LXSetLocale(kEverything, 0); }},
       {"LXConvertNativeLocale", kLoads | kCopes,
        makes([](int32_t* code) { return LXConvertNativeLocale("de_DE", LX_FALLBACK, code); })},

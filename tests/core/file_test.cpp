@@ -33,6 +33,16 @@ class FileTest : public LibraryTest {
   int32_t rc = -1;
 };
 
+TEST_F(FileTest, AnExistingFileWhoseNameIsTooLongToKeepIsNotReplaced) {
+  directory.write_text("fourteen-bytes", "old");
+  std::string name = "fourteen-bytes";
+  while (directory.file(name).size() + 1 < 256) name.insert(0, "./");
+  if (directory.file(name).size() < 256) name.insert(0, "/");
+  EXPECT_EQ(open_file(name, LX_WRITE), nullptr);
+  EXPECT_EQ(rc, LX_E_OPEN);
+  EXPECT_EQ(text_of("fourteen-bytes"), "old");
+}
+
 // Parts that are too long are empty, and the temporary file and what it replaces are named from the parts that
 // remain.
 TEST_F(FileTest, AnExistingFileIsReplacedOnClose) {

@@ -19,7 +19,9 @@
 #include "support/hooks.h"
 #include "support/object_files.h"
 
-extern "C" void __gcov_dump(void) __attribute__((weak));  // there where coverage is measured
+// Which write what was reached, where that is measured.
+extern "C" void __gcov_dump(void) __attribute__((weak));
+extern "C" int __llvm_profile_write_file(void) __attribute__((weak));
 
 namespace lx::test {
 
@@ -30,6 +32,7 @@ inline void expect_in_child(const std::string& what, void (*end)(int), const std
   const auto run = [&] {
     action();
     if (end == _exit && __gcov_dump != nullptr) __gcov_dump();
+    if (end == _exit && __llvm_profile_write_file != nullptr) __llvm_profile_write_file();
     end(::testing::Test::HasFailure() ? 3 : 0);
   };
   EXPECT_EXIT(run(), ::testing::ExitedWithCode(0), "");

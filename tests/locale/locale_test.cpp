@@ -101,6 +101,13 @@ TEST_F(LocaleTest, Names) {
   const LXWChar name[] = {'F' + 0x100, 'r', 'e', 'n', 'c', 'h', 0};
   const LXWChar marks[] = {'F', 'r', 'e', 'n', 'c', 'h', '_' + 0x10000, 'x', 0};
   for (const LXWChar* wide : {name, marks}) EXPECT_EQ(LXSetLocaleW(wide, 0), LX_E_NO_LANGUAGE);
+  // No name is an empty one, and a code need not be asked for.
+  for (LXLocale* locale : {LXGetLocale(nullptr, 0, nullptr), LXGetLocaleW(nullptr, 0, nullptr),
+                           LXGetLocaleU(nullptr, 0, nullptr)}) {
+    EXPECT_EQ(describe(locale), "1 840 367 - C0");
+    EXPECT_EQ(LXReleaseLocale(locale), 0);
+  }
+  EXPECT_EQ(LXGetLocaleW(name, 0, nullptr), nullptr);
 }
 
 // The 16-bit name goes through the common codepage; where there is none, the name is empty.

@@ -47,7 +47,8 @@ class NativeTest : public LibraryTest {
     LibraryTest::SetUp();
     // Latin1 and US-ASCII under the names that the table knows; German is English here.
     TinyCodepage latin = tiny_single();
-    directory.write_locale({{367, "US-ASCII", ascii_codepage()}, {819, "Latin1", latin.file.sections}});
+    directory.write_locale(
+        {{367, "US-ASCII", ascii_codepage()}, {819, "Latin1", latin.file.sections}, tiny_shift().file});
     ASSERT_EQ(init(), LX_OK);
     for (const char* name : {"LC_ALL", "LANG"}) unsetenv(name);
     german = SystemLocale::nothing();
@@ -159,6 +160,14 @@ TEST_F(NativeTest, ConventionsOfTheSystem) {
     EXPECT_EQ(LXReleaseLocale(locale), 0);
     EXPECT_EQ(system.current, "C");
   }
+}
+
+TEST_F(NativeTest, GroupingInEbcdic) {
+  system.known["de_DE"] = german;
+  LXLocale* locale = LXGetLocale("English.TINY-SHIFT", 0, nullptr);
+  LXMapNativeInfo("de_DE", locale);
+  EXPECT_EQ(item(locale, 62), "\xF3\x5E\xF3\x5E\xF0");
+  EXPECT_EQ(LXReleaseLocale(locale), 0);
 }
 
 TEST_F(NativeTest, UserLocaleAndConvertedNamesHaveTheConventions) {

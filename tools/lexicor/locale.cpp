@@ -55,8 +55,9 @@ std::string problem_of_defaults(const std::string& name) {
   if (std::all_of(std::begin(parts.parts), std::end(parts.parts), named)) return {};
   std::map<std::string, int> unusable;
   // What the language says is read from a locale that needs none of it.
-  const std::string other = parts.parts[LX_LANGUAGE].name + "_" + first_usable(LX_TERRITORY, &unusable) + "." +
-                            first_usable(LX_CODEPAGE, &unusable) + "@BINARY";
+  const std::string territory = first_usable(LX_TERRITORY, &unusable);
+  const std::string codepage = first_usable(LX_CODEPAGE, &unusable);
+  const std::string other = parts.parts[LX_LANGUAGE].name + "_" + territory + "." + codepage + "@BINARY";
   const LocalePtr locale(LXGetLocale(other.c_str(), 0, nullptr));
   for (const int32_t item : kDefaults) {
     LocalePart& part = parts.parts[LX_TERRITORY + (item - kDefaults[0])];
