@@ -39,6 +39,7 @@ by_cmake() {
     cmake --build "$1" >said || { cat said >&2 && fail "$1 cannot be built"; }
   runs "$1/in_c" "$1/in_cpp"
 }
+nothing_in() { [ -z "$(find "$1" -type f -o -name '*lexicor*')" ] || fail "left behind: $(find "$1" -type f -o -name '*lexicor*')"; }
 runs() { for program; do [ "$("$program")" = GROß ] || fail "$program"; done; }
 
 # --- Installed, and moved.
@@ -73,6 +74,10 @@ if [ -z "$flags" ] && [ -e prefix/lib/sqlite3/lexicor.so ] && type sqlite3 >/dev
   [ "$said" = GROß ] || fail "SQLite: $said"
 fi
 
+cmake --install "$build_dir" --prefix "$work/second" >/dev/null
+cmake --build "$build_dir" --target uninstall >/dev/null
+nothing_in second
+
 # --- As a part of another project. Building the library anew takes a while: `./check trust` does.
 [ -n "${LEXICOR_TRUST:-}" ] || exit 0
 by_cmake inside -DLEXICOR_SOURCE="$source_dir" -DBUILD_SHARED_LIBS=OFF -DLEXICOR_INSTALL=ON -DDATA="$build_dir/locale"
@@ -89,5 +94,4 @@ PKG_CONFIG_PATH=$(dirname "$(find static -name lexicor.pc)")
 gcc program/main.c -DLOCALE_DIR="\"$build_dir/locale\"" $(package --static --cflags --libs) -o by_static_pc
 runs ./by_static_pc
 (cd inside && cmake -P "$source_dir/cmake/uninstall.cmake")
-left=$(find static -type f -o -name '*lexicor*')
-[ -z "$left" ] || fail "left behind: $left"
+nothing_in static
