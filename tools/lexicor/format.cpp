@@ -12,6 +12,7 @@
 #include "locale.h"
 #include "moment.h"
 #include "output.h"
+#include "report.h"
 #include "session.h"
 #include "text_locale.h"
 
@@ -29,6 +30,7 @@ struct ValueOptions {
   std::string locale;  // empty: the user's
   std::string format;  // empty: kDefaultFormat
   bool international = false;
+  bool json = false;
   std::string text;
 };
 
@@ -235,6 +237,13 @@ using Works = std::map<std::string, Work>;
 const Works kFormats = {{"number", format_number}, {"money", format_money}, {"time", format_time}};
 const Works kParses = {{"number", parse_number}, {"money", parse_money}, {"time", parse_time}};
 
+/// A time is a text in JSON too.
+std::string json_value(const ValueOptions& options, const std::string& value) {
+  const bool number = options.kind != "time" && Json::accept(value);
+  return json_text(
+      {{"kind", options.kind}, {"text", options.text}, {"value", number ? Json::parse(value) : Json(value)}});
+}
+
 Run declare_values(Arguments& command, const CommonOptions& common, const Works& works, const char* text_name,
                    const char* text_help, const std::shared_ptr<ValueOptions>& options) {
   command.add_option("KIND", options->kind, "number, money or time")
@@ -253,7 +262,8 @@ Run declare_values(Arguments& command, const CommonOptions& common, const Works&
       throw Failure(kUsageError, "--international is for money");
     const Session session(common);
     const TextLocale locale(session, options->locale);
-    Output().write(works.at(options->kind)(locale, *options) + "\n");
+    const std::string value = works.at(options->kind)(locale, *options);
+    Output().write(options->json ? json_value(*options, value) : value + "\n");
     return static_cast<int>(kDone);
   };
 }
@@ -279,6 +289,7 @@ Run declare_format(Arguments& command, const CommonOptions& common) {
 
 Run declare_parse(Arguments& command, const CommonOptions& common) {
   const auto options = std::make_shared<ValueOptions>();
+  command.add_flag("--json", options->json, "print JSON");
   command.footer(
       "Prints a number like -1234.56, or what the text gives of a time like 2026-11-21T14:05:09. A year of "
       "two\n"

@@ -12,6 +12,7 @@
 #include "line_ends.h"
 #include "output.h"
 #include "pieces.h"
+#include "report.h"
 #include "session.h"
 #include "well_formed.h"
 
@@ -25,19 +26,25 @@ const std::map<std::string, uint32_t> kLineEnds = {
 struct LinesOptions {
   std::string from, eol, output = "-";
   std::vector<std::string> find;  // empty: all kinds
-  bool report = false;
+  bool report = false, json = false;
   std::vector<std::string> files;
 };
 
-/// "lexicor: 3 line ends (2 crlf, 1 lf), 2 rewritten".
-void report(const LineEndRewriter& rewriter) {
+/// "lexicor: 3 line ends (2 crlf, 1 lf), 2 rewritten", or the same as JSON.
+void report(const LineEndRewriter& rewriter, bool json) {
   uint64_t all = 0;
   std::string kinds;
+  Json counts;
   for (const auto& [name, kind] : kLineEnds) {
     const uint64_t found = rewriter.found(kind);
+    counts[name] = found;
     if (found == 0) continue;
     all += found;
     kinds += (kinds.empty() ? " (" : ", ") + std::to_string(found) + " " + name;
+  }
+  if (json) {
+    std::cerr << json_text({{"line_ends", all}, {"kinds", counts}, {"rewritten", rewriter.rewritten()}});
+    return;
   }
   std::cerr << "lexicor: " << all << (all == 1 ? " line end" : " line ends") << kinds
             << (kinds.empty() ? "" : ")") << ", " << rewriter.rewritten() << " rewritten\n";
@@ -60,7 +67,7 @@ int rewrite_lines(const LinesOptions& options, const CommonOptions& common) {
   check.finish();
   rewriter.finish();
   output.commit();
-  if (options.report) report(rewriter);
+  if (options.report || options.json) report(rewriter, options.json);
   return kDone;
 }
 
@@ -83,6 +90,7 @@ Run declare_lines(Arguments& command, const CommonOptions& common) {
       .divided_by(',')
       .one_of(keys_of(kLineEnds));
   command.add_flag("--report", options->report, "say on standard error how many line ends there were");
+  command.add_flag("--json", options->json, "say it as JSON");
   command.add_option("-o,--output", options->output, "output file, replaced when it is complete")
       .type_name("OUT");
   command.add_option("FILE", options->files, "input files, taken as one text; - is standard input")
