@@ -55,12 +55,12 @@ inline bool is_same_block(const uint16_t* from, unsigned below) {
   return _mm_movemask_epi8(_mm_cmpeq_epi8(high, _mm_setzero_si128())) == 0xFFFF;
 }
 
-/// Whether one of two bytes stands in a block.
-inline bool has_either(const uint8_t* from, uint8_t a, uint8_t b) {
+/// Where one of two bytes stands in a block, one bit a byte.
+inline unsigned places_of_either(const uint8_t* from, uint8_t a, uint8_t b) {
   const __m128i v = load_block(from);
   const __m128i is_a = _mm_cmpeq_epi8(v, _mm_set1_epi8(static_cast<char>(a)));
   const __m128i is_b = _mm_cmpeq_epi8(v, _mm_set1_epi8(static_cast<char>(b)));
-  return _mm_movemask_epi8(_mm_or_si128(is_a, is_b)) != 0;
+  return static_cast<unsigned>(_mm_movemask_epi8(_mm_or_si128(is_a, is_b)));
 }
 
 inline void copy_block(uint8_t* to, const uint8_t* from) {
@@ -241,8 +241,10 @@ inline bool is_same_block(const From* from, unsigned below) {
   for (size_t i = 0; i < kBlock; ++i) all |= from[i];
   return all < below;
 }
-inline bool has_either(const uint8_t* from, uint8_t a, uint8_t b) {
-  return memchr(from, a, kBlock) != nullptr || memchr(from, b, kBlock) != nullptr;
+inline unsigned places_of_either(const uint8_t* from, uint8_t a, uint8_t b) {
+  unsigned places = 0;
+  for (size_t i = 0; i < kBlock; ++i) places |= unsigned{from[i] == a || from[i] == b} << i;
+  return places;
 }
 template <class To, class From>
 inline void copy_block(To* to, const From* from) {
@@ -298,7 +300,7 @@ inline size_t copy_same(To* to, const From* from, size_t n, unsigned below) {
 /// How many of `n` bytes stand before one of two.
 inline size_t units_before_either(const uint8_t* p, size_t n, uint8_t a, uint8_t b) {
   size_t i = 0;
-  while (n - i >= kBlock && !has_either(p + i, a, b)) i += kBlock;
+  while (n - i >= kBlock && places_of_either(p + i, a, b) == 0) i += kBlock;
   while (i < n && p[i] != a && p[i] != b) ++i;
   return i;
 }

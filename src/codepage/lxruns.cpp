@@ -10,7 +10,8 @@ namespace {
 /// The Unicode value of a two-byte character where the root's children are leaves.
 uint16_t two_byte_unicode(const uint16_t* rows, const uint8_t* p) {
   const size_t node = rows[p[0]];
-  return node != 0 ? rows[node << 8 | p[1]] : kNoUnicode;
+  const uint16_t value = rows[node << 8 | p[1]];
+  return node != 0 ? value : kNoUnicode;
 }
 
 bool is_long_same(const uint8_t* p, const uint8_t* end, unsigned below) {
@@ -108,14 +109,53 @@ size_t MultiByteCursor::read_run(LXUChar* values, size_t most, RunRule rule) {
   return n;
 }
 
+constexpr size_t kManyShiftChars = 32;  // of fewer, one run after the other is as good
+
+/// Reads blocks of characters up to a shift byte each, where the rows have two levels. A shift byte is looked for in
+/// all of a block at once, and its characters are read whether they stand before it or not: what comes is not guessed.
+size_t read_shift_blocks(ShiftCursor* in, LXUChar* values, size_t most, RunRule rule) {
+  constexpr size_t kChars = kBlock / 2;
+  constexpr unsigned kPairs = 0x5555;
+  const Codepage& c = in->cp;
+  const uint16_t* const rows = c.rows;
+  const uint8_t *q = in->p, *const end = in->end;
+  LXShiftState s = in->state;
+  size_t n = 0;
+  while (most - n >= kChars && room(q, end) > kBlock) {
+    take_shift(c, &q, &s);
+    // The character behind a shift byte is not looked at: a second shift byte in a row is one.
+    const unsigned shifts = places_of_either(q, c.shift_out, c.shift_in) & ~1u;
+    size_t chars;
+    if (s == LX_SHIFT_DOUBLE) {
+      chars = static_cast<size_t>(__builtin_ctz((shifts & kPairs) | 1u << kBlock)) / 2;
+      for (size_t i = 0; i < kChars; ++i) values[n + i] = two_byte_unicode(rows, q + 2 * i);
+      q += 2 * chars;
+    } else if (shifts != 0) {
+      chars = static_cast<size_t>(__builtin_ctz(shifts | 1u << kChars));
+      for (size_t i = 0; i < kChars; ++i) values[n + i] = c.unicode[q[i]];
+      q += chars;
+    } else {
+      chars = least(most - n, room(q, end));
+      chars = 1 + units_before_either(q + 1, chars - 1, c.shift_out, c.shift_in);
+      vectors->look_up(c.unicode, q, chars, values + n, rule);
+      q += chars;
+    }
+    n += chars;
+  }
+  in->p = q;
+  in->state = s;
+  return n;
+}
+
 size_t ShiftCursor::read_run(LXUChar* values, size_t most, RunRule rule) {
   constexpr size_t kMostBytes = 1 + kMaxCharBytes;
   const Codepage& c = cp;
   const uint16_t* const rows = c.two_level_rows && c.width == 2 ? c.rows : nullptr;
   const unsigned shift_out = c.shift_out, shift_in = c.shift_in;
+  size_t n =
+      rows != nullptr && room(p, end) >= 2 * kManyShiftChars ? read_shift_blocks(this, values, most, rule) : 0;
   const uint8_t* q = p;
   LXShiftState s = state;
-  size_t n = 0;
   while (n < most && room(q, end) >= kMostBytes) {
     take_shift(c, &q, &s);
     size_t chars = least(most - n, room(q, end) / c.width_in(s));
@@ -178,10 +218,48 @@ void MultiByteSink::put_run(const LXUChar* values, size_t count) {
                  [&](const LXUChar* v, size_t n, uint8_t* q) { return vectors->write_pairs(codes, q, v, n); });
 }
 
+/// Writes blocks of characters: a shift byte and two bytes are stored for every one, and those that it does not have are
+/// written over by the next one, of which there is one behind the last block. How many were written.
+size_t put_shift_blocks(ShiftSink* out, const LXUChar* values, size_t count) {
+  constexpr size_t kChars = kBlock / 2;
+  const uint32_t* const page_start = out->cp.page_start;
+  const uint16_t* const codes = out->cp.codes16;
+  const uint8_t shift_bytes[] = {out->cp.shift_in, out->cp.shift_out};
+  unsigned two = out->state == LX_SHIFT_DOUBLE;
+  uint8_t* q = out->p;
+  size_t n = 0;
+  for (; count - n > kChars; n += kChars) {
+    uint16_t block[kChars];
+    unsigned twos = 0;
+    for (size_t i = 0; i < kChars; ++i) {
+      block[i] = codes[page_start[values[n + i] >> 8] + (values[n + i] & 0xFFu)];
+      twos += block[i] > 0xFF;
+    }
+    if (twos == 0 && two == 0) {
+      for (size_t i = 0; i < kChars; ++i) *q++ = static_cast<uint8_t>(block[i]);
+    } else if (twos == kChars && two != 0) {
+      for (size_t i = 0; i < kChars; ++i, q += 2) put_le16(q, __builtin_bswap16(block[i]));
+    } else {
+      for (const unsigned code : block) {
+        const unsigned before = two;
+        two = code > 0xFF;
+        *q = shift_bytes[two];
+        q += two ^ before;
+        put_le16(q, static_cast<uint16_t>(code << 8 * two | code >> 8));
+        q += 1 + two;
+      }
+    }
+  }
+  out->p = q;
+  out->state = two != 0 ? LX_SHIFT_DOUBLE : LX_SHIFT_SINGLE;
+  return n;
+}
+
 template <>
 void ShiftSink::put_run(const LXUChar* values, size_t count) {
   size_t i = 0;
   if (cp.codes16 != nullptr) {
+    if (count >= kManyShiftChars) i = put_shift_blocks(this, values, count);
     const uint32_t* const page_start = cp.page_start;
     const uint16_t* const codes = cp.codes16;
     uint8_t* q = p;
