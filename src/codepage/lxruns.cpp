@@ -113,15 +113,17 @@ constexpr size_t kManyShiftChars = 32;  // of fewer, one run after the other is 
 
 /// Reads blocks of characters up to a shift byte each, where the rows have two levels. A shift byte is looked for in
 /// all of a block at once, and its characters are read whether they stand before it or not: what comes is not guessed.
+/// Values that do not count are written over by those of the characters that follow.
 size_t read_shift_blocks(ShiftCursor* in, LXUChar* values, size_t most, RunRule rule) {
   constexpr size_t kChars = kBlock / 2;
+  constexpr size_t kBytesBehind = kChars * 3;  // of so many characters, with shift bytes
   constexpr unsigned kPairs = 0x5555;
   const Codepage& c = in->cp;
   const uint16_t* const rows = c.rows;
   const uint8_t *q = in->p, *const end = in->end;
   LXShiftState s = in->state;
   size_t n = 0;
-  while (most - n >= kChars && room(q, end) > kBlock) {
+  while (most - n >= kChars && room(q, end) > kBlock + kBytesBehind) {
     take_shift(c, &q, &s);
     // The character behind a shift byte is not looked at: a second shift byte in a row is one.
     const unsigned shifts = places_of_either(q, c.shift_out, c.shift_in) & ~1u;
