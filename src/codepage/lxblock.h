@@ -209,6 +209,30 @@ class CharBlock {
   bool known_ = true;
 };
 
+/// Which of kBytes bytes of UTF-8 begin characters of two bytes and three, one bit a byte, and how many bytes the
+/// characters have that begin there; false where a byte is not what its place says.
+template <size_t kBytes>
+inline bool find_long_utf8(const uint8_t* p, size_t* begins, size_t* bytes) {
+  size_t high = 0, first = 0, lead = 0, three = 0, four = 0;
+  for (size_t i = 0; i < kBytes; i += kBlock) {
+    const __m128i v = load_block(p + i);
+    const auto above = [&](int byte) {  // in signed order 0x80 to 0xFF stand below ASCII
+      return size_t{byte_mask(_mm_cmpgt_epi8(v, _mm_set1_epi8(static_cast<char>(byte))))} << i;
+    };
+    high |= size_t{byte_mask(v)} << i;
+    first |= above(0xBF);
+    lead |= above(0xC1);
+    three |= above(0xDF);
+    four |= above(0xEF);
+  }
+  *begins = first & high;
+  three &= high;
+  constexpr size_t kLast = kBytes - 1;
+  const size_t trails = (*begins << 1 | three << 2) & SIZE_MAX >> (8 * sizeof(size_t) - kBytes);
+  *bytes = kBytes + (*begins >> kLast) + (three >> kLast) + (three >> (kLast - 1) & 1);
+  return (*begins | trails) == high && (*begins & trails) == 0 && lead == first && (four & high) == 0;
+}
+
 /// Writes a batch of characters when all of them have one or two bytes, and maybe one byte behind the last one.
 inline bool put_short_batch(const uint16_t* values, uint8_t** p) {
   const __m128i v = load_block(values);
@@ -261,6 +285,10 @@ class Utf8Block {
   size_t store_values(uint16_t*) { return 0; }
   size_t bytes() const { return 0; }
 };
+template <size_t kBytes>
+inline bool find_long_utf8(const uint8_t*, size_t*, size_t*) {
+  return false;
+}
 inline bool put_short_batch(const uint16_t*, uint8_t**) {
   return false;
 }

@@ -29,16 +29,20 @@ struct PageCodes {
   uint32_t code(uint16_t u) const;
 };
 
-/// The type records of characters of two bytes whose first byte begins some that have another case.
+/// The case of characters of two bytes whose first byte begins some that have another one.
 struct PairCase {
-  const uint8_t* records;   // of the codepage
-  const uint16_t* numbers;  // of its records, by row and second byte
-  const uint8_t* row;       // by first byte; 0: none
-  uint8_t mask;             // what of a second byte counts
+  static constexpr int16_t kFar = INT16_MIN;
+  const int16_t* deltas;  // from the code to the other case, by row and second byte; kFar where that is farther
+  const uint8_t* row;     // by first byte; 0: none
+  uint8_t bits;           // how many of a second byte count
 
-  const uint8_t* record(size_t of_row, uint8_t second) const {
-    return records +
-           format::codepage::TypeRecord::kBytes * numbers[(of_row - 1) * (mask + 1u) + (second & mask)];
+  /// Stores a character in its other case, which is itself where it has none; false, and anything is stored, where that
+  /// has not two bytes.
+  [[gnu::always_inline]] bool map(size_t of_row, const uint8_t* p, uint8_t* to) const {
+    const int32_t delta = deltas[((of_row - 1) << bits) + (p[1] & ((1u << bits) - 1))];
+    const uint32_t code = (unsigned{p[0]} << 8 | p[1]) + static_cast<uint32_t>(delta);
+    put_le16(to, __builtin_bswap16(static_cast<uint16_t>(code)));
+    return delta != kFar && code - 0x100 < 0xFF00;
   }
 };
 
@@ -69,6 +73,7 @@ struct Codepage {
   bool utf8;            // conversion is computed
   bool plain_utf8;      // ... and the lengths of characters are those of UTF-8
   bool two_level_rows;  // the root's children are leaves
+  bool plain_case;      // single bytes have the case of ASCII, and others none
   bool plain_digits;    // no byte where ASCII or EBCDIC has a digit is white space
   // Bytes below this are the Unicode values of the same number, both ways, wherever they begin a character:
   // 0x100 for ISO 8859-1, 0x80 where ASCII is, else 0.
@@ -78,7 +83,7 @@ struct Codepage {
   // By first byte: the length of the characters of several bytes that begin with it, if none of them has
   // another case; else 0.
   uint8_t caseless[256];
-  PairCase pair_case;
+  PairCase pair_case[2];  // lower, upper
   uint8_t pair_case_rows[256];
 
   uint8_t length(uint8_t first_byte) const { return payload[format::codepage::kLengths + first_byte]; }

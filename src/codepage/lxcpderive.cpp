@@ -182,6 +182,14 @@ bool has_plain_utf8(const Codepage& cp) {
   return true;
 }
 
+bool has_plain_case(const Codepage& cp) {
+  for (unsigned b = 0; b < kRow; ++b) {
+    const unsigned upper = b - 'a' < 26 ? b ^ 0x20 : b, lower = b - 'A' < 26 ? b ^ 0x20 : b;
+    if (cp.payload[fmt::kUpper + b] != upper || cp.payload[fmt::kLower + b] != lower) return false;
+  }
+  return true;
+}
+
 bool has_plain_digits(const Codepage& cp) {
   for (int i = 0; i < 10; ++i)
     if (((cp.type(static_cast<uint8_t>(0x30 + i)) | cp.type(static_cast<uint8_t>(0xF0 + i))) & LX_C1_SPACE) !=
@@ -197,15 +205,16 @@ class TypeTrie {
       : nodes_(payload + le16(payload + fmt::kTypeTrie)),
         records_(payload + le16(payload + fmt::kTypeRecords)) {}
 
-  /// The node of the second byte of characters of two bytes; false where they end elsewhere, or their records
-  /// have numbers that are too large.
+  /// The node of the second byte of characters of two bytes; false where they end elsewhere.
   bool pair_node(uint8_t first_byte, fmt::TypeNode* node) const {
     const fmt::TypeNode root = fmt::TypeNode::read(nodes_);
     if (root.leaf != 0) return false;
     *node = fmt::TypeNode::read(nodes_ + fmt::TypeNode::kBytes * root.next(first_byte));
-    return node->leaf != 0 && node->base + node->mask <= UINT16_MAX;
+    return node->leaf != 0;
   }
-  const uint8_t* records() const { return records_; }
+  fmt::TypeRecord record(const fmt::TypeNode& leaf, unsigned byte) const {
+    return fmt::TypeRecord::read(records_ + fmt::TypeRecord::kBytes * leaf.next(byte));
+  }
 
   bool has_case(uint8_t first_byte) const {
     const fmt::TypeNode root = fmt::TypeNode::read(nodes_);
@@ -232,11 +241,12 @@ class TypeTrie {
 };
 
 /// Finds which first bytes begin characters that have another case, and gives rows of PairCase to those of two bytes: how
-/// many numbers the rows take.
+/// many deltas the rows take.
 size_t find_case(Codepage* cp) {
   if (cp->single_byte) return 0;
   const TypeTrie types(cp->payload);
   size_t rows = 0;
+  unsigned mask = 0;
   for (unsigned b = 0; b < kRow; ++b) {
     const auto first = static_cast<uint8_t>(b);
     const uint8_t length = cp->length(first);
@@ -246,27 +256,32 @@ size_t find_case(Codepage* cp) {
       cp->caseless[b] = length;
     } else if (length == 2 && rows < UINT8_MAX && types.pair_node(first, &node)) {
       cp->pair_case_rows[b] = static_cast<uint8_t>(++rows);
-      cp->pair_case.mask |= node.mask;
+      mask |= node.mask;
     }
   }
-  // All bits below the highest one count, so that a row has as many numbers as the mask has values.
-  unsigned mask = cp->pair_case.mask;
-  while ((mask & (mask + 1)) != 0) mask |= mask >> 1;
-  cp->pair_case.mask = static_cast<uint8_t>(mask);
-  return rows * (cp->pair_case.mask + 1u);
+  // All bits below the highest one that counts, so that a row has as many deltas as these have values.
+  uint8_t bits = 0;
+  while (mask >> bits != 0) ++bits;
+  for (PairCase& pairs : cp->pair_case) pairs.bits = bits;
+  return 2 * rows << bits;
 }
 
-void fill_pair_case(Codepage* cp, uint16_t* numbers) {
+/// The lower case first. The codepage has its place already.
+void fill_pair_case(Codepage* cp, int16_t* deltas) {
   const TypeTrie types(cp->payload);
-  cp->pair_case.records = types.records();
-  cp->pair_case.numbers = numbers;
-  cp->pair_case.row = cp->pair_case_rows;
-  for (unsigned b = 0; b < kRow; ++b) {
-    fmt::TypeNode node;
-    if (cp->pair_case_rows[b] == 0 || !types.pair_node(static_cast<uint8_t>(b), &node)) continue;
-    for (unsigned second = 0; second <= cp->pair_case.mask; ++second)
-      numbers[(cp->pair_case_rows[b] - 1u) * (cp->pair_case.mask + 1u) + second] =
-          static_cast<uint16_t>(node.next(second));
+  for (PairCase& pairs : cp->pair_case) {
+    pairs.deltas = deltas;
+    pairs.row = cp->pair_case_rows;
+    const uint32_t mask = &pairs == cp->pair_case ? LX_C1_UPPER : LX_C1_LOWER;
+    for (unsigned first = 0; first < kRow; ++first) {
+      fmt::TypeNode node;
+      if (cp->pair_case_rows[first] == 0 || !types.pair_node(static_cast<uint8_t>(first), &node)) continue;
+      for (unsigned second = 0; second >> pairs.bits == 0; ++second) {
+        const fmt::TypeRecord type = types.record(node, second);
+        const auto delta = static_cast<int32_t>((type.type & mask) != 0 ? type.case_delta : 0);
+        *deltas++ = delta > INT16_MIN && delta <= INT16_MAX ? static_cast<int16_t>(delta) : PairCase::kFar;
+      }
+    }
   }
 }
 
@@ -321,8 +336,9 @@ void* derive_codepage(uint16_t id, const Sections& sections) {
     cp->pairs = pair_rows(*cp, nodes.count(), reinterpret_cast<uint16_t*>(block + layout.rows),
                           reinterpret_cast<uint32_t*>(block + layout.first));
   cp->plain_utf8 = has_plain_utf8(*cp);
+  cp->plain_case = has_plain_case(*cp);
   cp->plain_digits = has_plain_digits(*cp);
-  fill_pair_case(cp, reinterpret_cast<uint16_t*>(block + layout.cases));
+  fill_pair_case(cp, reinterpret_cast<int16_t*>(block + layout.cases));
   return block;
 }
 

@@ -134,8 +134,10 @@ void map_all(Text& text, const Mapper& mapper, const SpecialFilter& filter, cons
   const bool special = filter.any();
   for (;;) {
     if constexpr (Text::kRuns && Mapper::kCase) {
+      if constexpr (std::is_same_v<Text, LeadByteText>)
+        if (runs.utf8 && most_units(text) >= kLongUtf8) map_utf8(text, runs, filter);
       if (text.in.p != text.in.end && *text.in.p < runs.below) map_run(text, runs, filter);
-      if (!special && map_rest(text, mapper, runs.below)) continue;
+      if (map_rest(text, runs, filter)) continue;
     }
     typename Text::Char c;
     if (!text.take(&c)) break;

@@ -50,19 +50,19 @@ struct Runs {
   const uint8_t* table;
   unsigned below;  // units under this are characters, and the table has their case
   bool blocks;     // ... under 0x80 the case of ASCII, and none of these is special
+  bool utf8;       // ... and the others are those of UTF-8
   bool upper;
 };
 
 inline Runs runs_of(const UnicodeText&, const SpecialFilter& filter, bool upper) {
-  return {kAsciiCase[upper].to, kAscii, !filter.any_ascii(), upper};
+  return {kAsciiCase[upper].to, kAscii, !filter.any_ascii(), false, upper};
 }
 inline Runs runs_of(const LeadByteText& text, const SpecialFilter& filter, bool upper) {
   const uint8_t* table = text.in.cp.payload + (upper ? format::codepage::kUpper : format::codepage::kLower);
-  if (text.in.cp.single_byte) return {table, 0x100, false, upper};
-  if (text.in.cp.same_below < kAscii) return {table, 0, false, upper};
-  const bool blocks =
-      !filter.any_ascii() && most_units(text) >= kLongText && memcmp(table, kAsciiCase[upper].to, kAscii) == 0;
-  return {table, kAscii, blocks, upper};
+  if (text.in.cp.single_byte) return {table, 0x100, false, false, upper};
+  if (text.in.cp.same_below < kAscii) return {table, 0, false, false, upper};
+  const bool blocks = text.in.cp.plain_case && !filter.any_ascii() && most_units(text) >= kLongText;
+  return {table, kAscii, blocks, blocks && text.in.cp.plain_utf8, upper};
 }
 
 inline uint16_t unicode_of(const UnicodeText&, uint16_t u) {
@@ -92,23 +92,72 @@ template <class Text>
   text.out.p += i;
 }
 
+/// A character of several bytes of UTF-8 in its other case, in the same place; false where that has another length.
+/// `pairs` are the codepage's.
+[[gnu::always_inline]] inline bool map_long_utf8(const Codepage& cp, const PairCase& pairs, const uint8_t* p,
+                                                 uint32_t mask, uint8_t* to) {
+  if (const unsigned row = pairs.row[*p]) return pairs.map(row, p, to);
+  if (cp.caseless[*p] != 0) return true;
+  const auto type = format::codepage::TypeRecord::read(type_record(cp, p));
+  if ((type.type & mask) == 0) return true;
+  const size_t length = cp.length(*p);
+  const uint32_t code = pack(p, length) + type.case_delta;
+  store_code(to, code, length);
+  return code_bytes(code) == length;
+}
+
+constexpr size_t kUtf8Block = 8 * sizeof(size_t);
+constexpr size_t kLongUtf8 = kUtf8Block + 2;  // of characters that begin in a block, at most
+
+/// Maps blocks of UTF-8: all of a block is taken over, ASCII in its other case, and then characters of several bytes are
+/// mapped in their places. Ends before one that map_long_utf8() leaves.
+inline void map_utf8(LeadByteText& text, const Runs& runs, const SpecialFilter& filter) {
+  const Codepage& cp = text.in.cp;
+  const PairCase pairs = cp.pair_case[runs.upper];
+  const uint32_t mask = runs.upper ? LX_C1_LOWER : LX_C1_UPPER;
+  const bool special = filter.any();
+  const uint8_t* p = text.in.p;
+  uint8_t* to = text.out.p;
+  const uint8_t* const end = p + most_units(text);
+  size_t begins = 0, bytes;
+  for (; begins == 0 && room(p, end) >= kLongUtf8 && find_long_utf8<kUtf8Block>(p, &begins, &bytes);
+       p += bytes, to += bytes) {
+    uint8_t given[kLongUtf8], before[kLongUtf8];
+    memcpy(given, p, kLongUtf8);
+    memcpy(before, to, kLongUtf8);
+    for (size_t i = 0; i < kUtf8Block; i += kBlock) case_block(to + i, given + i, runs.upper);
+    for (size_t i = kUtf8Block; i < bytes; ++i) to[i] = given[i];
+    for (; begins != 0; begins &= begins - 1) {
+      const auto at = static_cast<size_t>(__builtin_ctzll(begins));
+      const bool maybe = special && filter.may_begin(utf8_unicode(given + at));
+      if (!maybe && map_long_utf8(cp, pairs, given + at, mask, to + at)) continue;
+      memcpy(to + at, before + at, bytes - at);  // nothing is written behind the last character
+      bytes = at;
+      break;
+    }
+  }
+  text.in.p = p;
+  text.out.p = to;
+}
+
 /// Behind how many characters of one unit the next ones are left to map_run().
 inline constexpr size_t kFewUnits = kBlock;
 
 /// What map_run() leaves: copies whole characters of several bytes that have no case, and maps those of two bytes
-/// that have one and keep their length, with the few bytes below `below` that stand between; false for none.
-template <class Mapper>
-bool map_rest(LeadByteText& text, const Mapper& mapper, unsigned below) {
+/// that have one and keep their length, with the few bytes below runs.below that stand between; false for none.
+inline bool map_rest(LeadByteText& text, const Runs& runs, const SpecialFilter& filter) {
+  const bool special = filter.any();
+  if (special && !text.in.cp.plain_utf8) return false;
   const Codepage& cp = text.in.cp;
   const uint8_t* const p = text.in.p;
   uint8_t* const to = text.out.p;
   const uint8_t* const lengths = cp.caseless;
-  const PairCase pairs = cp.pair_case;
+  const PairCase pairs = cp.pair_case[runs.upper];
   const size_t n = most_units(text);
   size_t i = 0;
   for (size_t start = n; i != start && i < n;) {
     start = i;
-    while (i < n) {
+    while (!special && i < n) {
       const size_t length = lengths[p[i]];
       if (length == 0 || length > n - i) break;
       i += length;
@@ -120,16 +169,14 @@ bool map_rest(LeadByteText& text, const Mapper& mapper, unsigned below) {
     if (i != start) memmove(to + start, p + start, i - start);
     for (; n - i >= 2; i += 2) {
       const unsigned row = pairs.row[p[i]];
-      if (row == 0) break;
-      const auto type = format::codepage::TypeRecord::read(pairs.record(row, p[i + 1]));
-      const uint32_t code = pack(p + i, 2) + ((type.type & mapper.mask) != 0 ? type.case_delta : 0);
-      if (code_bytes(code) != 2) break;
-      to[i] = static_cast<uint8_t>(code >> 8);
-      to[i + 1] = static_cast<uint8_t>(code);
+      if (row == 0 || (special && filter.may_begin(utf8_unicode(p + i)))) break;
+      uint8_t mapped[2];
+      if (!pairs.map(row, p + i, mapped)) break;
+      memcpy(to + i, mapped, sizeof(mapped));
     }
     if (i == start) break;
     const size_t few = i + least(n - i, kFewUnits);
-    for (; i < few && p[i] < below; ++i) to[i] = mapper.table[p[i]];
+    for (; i < few && p[i] < runs.below && !(special && filter.may_begin(p[i])); ++i) to[i] = runs.table[p[i]];
     if (i == few) break;
   }
   text.in.p += i;
@@ -138,14 +185,14 @@ bool map_rest(LeadByteText& text, const Mapper& mapper, unsigned below) {
 }
 
 /// ... and maps the characters of Unicode text.
-template <class Mapper>
-bool map_rest(UnicodeText& text, const Mapper& mapper, unsigned below) {
-  const CaseTable& table = kCaseTables[mapper.mode.upper];
+inline bool map_rest(UnicodeText& text, const Runs& runs, const SpecialFilter& filter) {
+  if (filter.any()) return false;
+  const CaseTable& table = kCaseTables[runs.upper];
   const LXUChar* const p = text.in.p;
   LXUChar* const to = text.out.p;
   const size_t n = most_units(text);
   size_t i = 0;
-  while (i < n && (p[i] >= below || n - i < kFewUnits || !is_same_block(p + i, below))) {
+  while (i < n && (p[i] >= runs.below || n - i < kFewUnits || !is_same_block(p + i, runs.below))) {
     const size_t few = i + least(n - i, kFewUnits);
     for (; i < few; ++i) to[i] = table.other(p[i]);
   }
