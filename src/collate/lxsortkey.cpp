@@ -13,6 +13,7 @@ namespace {
 RAS1_Unit unit = RAS1_UNIT("lxsortkey");
 
 constexpr int32_t kEmptyKeyBytes = 3;
+constexpr size_t kShortText = 64;  // of so many characters weights are kept apart
 
 /// The caller's buffer. It is used from a multiple of the alignment unit on: less than the whole size may be
 /// usable, and only that counts when the key is fitted in.
@@ -44,9 +45,86 @@ int32_t key_of_nothing(const Output& output) {
   return kEmptyKeyBytes;
 }
 
+/// Ends a key that is in place, where the output may have been its work area.
+int32_t finish_key(const Output& output, size_t bytes, size_t chars) {
+  if (bytes <= output.usable && output.is_work_area(chars))
+    memset(output.start + bytes, 0, output.size - bytes);
+  return static_cast<int32_t>(bytes);
+}
+
+/// A short level of which every weight is appended, or every one inserted ahead of the others. What is 0 is no weight.
+struct ShortLevel {
+  uint8_t weights[kShortText];
+  size_t count = 0;
+
+  void add(uint32_t weight) {
+    weights[count] = static_cast<uint8_t>(weight);
+    count += weight != 0;
+  }
+  /// Turns it round where weights were inserted, and drops those at the end that each character has.
+  void finish(bool appends, uint8_t common) {
+    for (size_t low = 0, high = count; !appends && low + 1 < high; ++low) {
+      const uint8_t kept = weights[low];
+      weights[low] = weights[--high];
+      weights[high] = kept;
+    }
+    while (count != 0 && weights[count - 1] == common) --count;
+  }
+  uint8_t* write(uint8_t* output) const {
+    memcpy(output, weights, count);
+    output[count] = 0;
+    return output + count + 1;
+  }
+};
+
+/// Whether a character has one weight set with a primary and begins no pair with the one behind it.
+template <class Cursor>
+bool has_own_primary(const Sort& sort, const Element& element, Cursor behind) {
+  if (element.sets() != 1 || element.primary() == 0) return false;
+  LXUChar second = 0;
+  return !element.starts_pair() || !behind.next(&second) || !sort.may_end_pair(second);
+}
+
+/// The key of a short text of characters with a primary of their own and no special weight: its bytes, or 0 for another
+/// text.
+template <class Cursor>
+int32_t make_short_key(const Sort& sort, const Cursor& text, const Output& output) {
+  constexpr unsigned kOrder = LX_APPEND_PRIMARY | LX_APPEND_SECONDARY | LX_APPEND_TERTIARY;
+  uint8_t primaries[2 * kShortText + 1];
+  ShortLevel secondaries, tertiaries;
+  unsigned appends = kOrder, some_append = 0, special = 0;
+  size_t chars = 0;
+  Cursor in(text);
+  for (LXUChar u = 0; in.next(&u); ++chars) {
+    const Element element = sort.element(u);
+    if (!element.stands_alone() && !has_own_primary(sort, element, in)) return 0;
+    put_le16(primaries + 2 * chars, __builtin_bswap16(static_cast<uint16_t>(element.primary())));
+    secondaries.add(element.secondary());
+    tertiaries.add(element.tertiary());
+    special |= element.special();
+    appends &= element.char_class();
+    some_append |= element.char_class() & kOrder;
+  }
+  // All characters have to be alike in what they append.
+  const bool alike = appends == some_append && (appends & LX_APPEND_PRIMARY) != 0;
+  if (chars == 0 || in.p != in.end || special != 0 || !alike) return 0;
+  primaries[2 * chars] = 0;
+  secondaries.finish((appends & LX_APPEND_SECONDARY) != 0, sort.default_secondary);
+  tertiaries.finish((appends & LX_APPEND_TERTIARY) != 0, sort.default_tertiary);
+  const size_t bytes = 2 * chars + secondaries.count + tertiaries.count + Levels::kSeparators;
+  if (bytes <= output.usable) {
+    memcpy(output.start, primaries, 2 * chars + 1);
+    tertiaries.write(secondaries.write(output.start + 2 * chars + 1));
+  }
+  return finish_key(output, bytes, chars);
+}
+
 /// Makes the key of a text of at most `most_chars` characters: its bytes, or -1 without memory.
 template <class Cursor>
 int32_t make_key(const Sort& sort, const Cursor& text, size_t most_chars, const Output& output) {
+  if constexpr (Cursor::kRuns)
+    if (most_chars <= kShortText)
+      if (const int32_t bytes = make_short_key(sort, text, output)) return bytes;
   if (most_chars > Levels::kMostChars) return -1;
   const bool in_place = output.is_work_area(most_chars);
   const WorkBuffer space(in_place ? 0 : Levels::bytes_for(most_chars));
@@ -54,11 +132,8 @@ int32_t make_key(const Sort& sort, const Cursor& text, size_t most_chars, const 
   const Key key(sort, text, most_chars, in_place ? output.aligned : space.as<uint8_t>());
   if (key.chars() == 0) return key_of_nothing(output);
   const size_t bytes = key.bytes();
-  if (bytes <= output.usable) {
-    key.write(output.start);
-    if (output.is_work_area(key.chars())) memset(output.start + bytes, 0, output.size - bytes);
-  }
-  return static_cast<int32_t>(bytes);
+  if (bytes <= output.usable) key.write(output.start);
+  return finish_key(output, bytes, key.chars());
 }
 
 int32_t empty_key(uint8_t* output, int32_t size) {
