@@ -151,17 +151,29 @@ class TimeFormatter {
     return LX_OK;
   }
 
+  /// Two digits, where there is room.
+  void put_pair(uint32_t number, Sink* out) const {
+    out->p[0] = static_cast<Unit>(symbols_.zero + number / 10);
+    out->p[1] = static_cast<Unit>(symbols_.zero + number % 10);
+    out->p += 2;
+  }
+
   /// The last `most_digits` digits; `bare`: without leading zeros. A number that fills the output is 40, also
   /// when all of it is there.
   int32_t write_number(uint32_t number, uint32_t most_digits, bool bare, Sink* out) const {
     uint32_t count = most_digits;
+    // In place where there is room; copying single units that have just been stored would stall.
+    const bool fits = !Cursor::kShifts && units_left(*out) > kMostDigits;
+    if (fits && !bare && number < 10000 && most_digits % 2 == 0) {  // as most are
+      if (most_digits == 4) put_pair(number / 100, out);
+      put_pair(number % 100, out);
+      return LX_OK;
+    }
     if (bare) {
       count = 1;
       for (uint32_t rest = number / 10; rest != 0 && count < most_digits; rest /= 10) ++count;
     }
-    // In place where there is room; copying single units that have just been stored would stall.
     Unit cut[kMostDigits];
-    const bool fits = !Cursor::kShifts && units_left(*out) > kMostDigits;
     Unit* const digits = fits ? out->p : cut;
     for (uint32_t i = count; i-- > 0; number /= 10) digits[i] = static_cast<Unit>(symbols_.zero + number % 10);
     if (fits) {
