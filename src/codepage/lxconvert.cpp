@@ -107,7 +107,7 @@ Buffer<uint8_t> buffer_of(char* p, int32_t size, LXShiftState state = LX_SHIFT_S
   return {bytes_of(p), size, state};
 }
 
-// Short texts without shift states are converted at once, where all that they may become fits.
+// Short texts are converted at once, where all that they may become fits.
 
 /// The units of a text that is short, and of which nothing else is asked for than a null behind it; else 0.
 template <class Unit>
@@ -119,32 +119,47 @@ size_t short_units(const Text<Unit>& text, int32_t flags) {
 }
 
 /// The values of a text: how many, or 0 when it holds what is read otherwise.
+template <Form kForm>
 size_t read_short(const Codepage& cp, const uint8_t* p, size_t bytes, LXUChar* values, RunRule rule) {
-  return with_cursor(cp, Form::kPlain, LX_SHIFT_SINGLE, p, bytes, [&](auto in) {
-    const size_t count = in.read_run(values, bytes, rule);
+  return with_cursor(cp, kForm, LX_SHIFT_SINGLE, p, bytes, [&](auto in) {
+    size_t count = in.read_run(values, bytes, rule);
+    if constexpr (decltype(in)::kShifts)
+      for (LXUChar u = 0; in.next(&u);) values[count++] = u;
     return in.p == in.end ? count : 0;
   });
 }
 
-/// Writes them: how many bytes, or 0 when there may be no room.
-size_t write_short(const Codepage& cp, uint8_t* p, size_t size, const LXUChar* values, size_t count) {
-  return with_kind<uint8_t>(cp, Form::kPlain, [&](auto kind) -> size_t {
+/// Writes them, and returns to the single-byte state where the text is to be closed: how many bytes, or 0 when there may
+/// be no room.
+template <Form kForm>
+size_t write_short(const Codepage& cp, uint8_t* p, size_t size, bool closed, const LXUChar* values,
+                   size_t count) {
+  return with_kind<uint8_t>(cp, kForm, [&](auto kind) -> size_t {
     auto out = kind.sink(cp, p, p + size, LX_SHIFT_SINGLE);
-    if (count > size / out.most_units()) return 0;
+    constexpr bool kShifts = decltype(out)::kShifts;
+    if (count > (size - kShifts) / out.most_units()) return 0;
     out.put_run(values, count);
+    if constexpr (kShifts)
+      if (closed && out.state == LX_SHIFT_DOUBLE) {
+        if (out.p[-1] == cp.shift_out) return 0;  // close_state() has its way with it
+        *out.p++ = out.take_shift_byte();
+      }
     return room(p, out.p);
   });
 }
 
-size_t convert_short(const Codepage&, LXUChar* to, size_t size, const Codepage& in_cp, const uint8_t* text,
-                     size_t bytes) {
-  return size < bytes ? 0 : read_short(in_cp, text, bytes, to, {});
+template <Form kForm>
+size_t convert_short(const Codepage&, LXUChar* to, size_t size, bool, const Codepage& in_cp,
+                     const uint8_t* text, size_t bytes) {
+  return size < bytes ? 0 : read_short<kForm>(in_cp, text, bytes, to, {});
 }
-size_t convert_short(const Codepage& out_cp, uint8_t* to, size_t size, const Codepage&, const LXUChar* text,
-                     size_t units) {
-  return write_short(out_cp, to, size, text, units);
+template <Form kForm>
+size_t convert_short(const Codepage& out_cp, uint8_t* to, size_t size, bool closed, const Codepage&,
+                     const LXUChar* text, size_t units) {
+  return write_short<kForm>(out_cp, to, size, closed, text, units);
 }
-size_t convert_short(const Codepage& out_cp, uint8_t* to, size_t size, const Codepage& in_cp,
+template <Form kForm>
+size_t convert_short(const Codepage& out_cp, uint8_t* to, size_t size, bool closed, const Codepage& in_cp,
                      const uint8_t* text, size_t bytes) {
   if (bytes < vectors->pivot_bytes) return 0;
   const unsigned below = in_cp.same_below < out_cp.same_below ? in_cp.same_below : out_cp.same_below;
@@ -156,7 +171,31 @@ size_t convert_short(const Codepage& out_cp, uint8_t* to, size_t size, const Cod
     return bytes;
   }
   LXUChar values[2 * kRunSlack];
-  return write_short(out_cp, to, size, values, read_short(in_cp, text, bytes, values, {0, kRunSlack}));
+  return write_short<kForm>(out_cp, to, size, closed, values,
+                            read_short<kForm>(in_cp, text, bytes, values, {0, kRunSlack}));
+}
+
+/// A text that is converted at once, and ended: the units written, or 0 where it is not.
+template <Form kForm, class Out, class In>
+[[gnu::always_inline]] inline size_t convert_at_once(const Codepage& out_cp, const Buffer<Out>& to,
+                                                     const Codepage& in_cp, const Text<In>& text,
+                                                     int32_t flags) {
+  const size_t units = to.size > 0 ? short_units(text, flags) : 0;
+  if (units == 0) return 0;
+  const bool end = text.length < 0 || flags != 0;
+  const size_t size = static_cast<size_t>(to.size) - end;
+  const size_t written = convert_short<kForm>(out_cp, to.p, size, end, in_cp, text.p, units);
+  if (written == 0) return 0;
+  if (end) to.p[written] = 0;
+  return written + end;
+}
+
+/// The same with shift states. Not inline: texts without them go on as if it were not there.
+template <class Out, class In>
+[[gnu::noinline]] size_t convert_shifts_at_once(const Codepage& out_cp, const Buffer<Out>& to,
+                                                const Codepage& in_cp, const Text<In>& text, int32_t flags) {
+  if (text.state != LX_SHIFT_SINGLE || to.state != LX_SHIFT_SINGLE || to.size < 2) return 0;
+  return convert_at_once<Form::kEx>(out_cp, to, in_cp, text, flags);
 }
 
 /// Every conversion: from text of the source's codepage to text of the target's, which keeps the error.
@@ -172,15 +211,12 @@ int32_t convert_text(LXLocale* target, Buffer<Out> to, LXLocale* source, Text<In
     const Codepage& in_cp = codepage_of(*from->codepage);
     const Codepage& out_cp = codepage_of(call.codepage());
     const bool shifts = form == Form::kEx && (in_cp.shift_sensitive || out_cp.shift_sensitive);
-    const size_t units = kManyRegisters && to.size > 0 && !shifts ? short_units(text, flags) : 0;
-    if (units != 0) {
-      const bool end = text.length < 0 || flags != 0;
-      const size_t size = static_cast<size_t>(to.size) - end;
-      if (const size_t written = convert_short(out_cp, to.p, size, in_cp, text.p, units)) {
-        if (end) to.p[written] = 0;
-        return call.exit(static_cast<int32_t>(written + end));
-      }
-    }
+    if (kManyRegisters && !shifts)
+      if (const size_t written = convert_at_once<Form::kPlain>(out_cp, to, in_cp, text, flags))
+        return call.exit(static_cast<int32_t>(written));
+    if (kManyRegisters && shifts)
+      if (const size_t written = convert_shifts_at_once(out_cp, to, in_cp, text, flags))
+        return call.exit(static_cast<int32_t>(written));
   }
   Request request(to.size, text.p, text.length, flags, kMine.flags);
   if (!request.valid) return call.fail(LX_E_INVALID, request.characters ? kMine.invalid_in_characters : -1);
