@@ -63,6 +63,13 @@ inline unsigned places_of_either(const uint8_t* from, uint8_t a, uint8_t b) {
   return static_cast<unsigned>(_mm_movemask_epi8(_mm_or_si128(is_a, is_b)));
 }
 
+/// Where one value stands in half a block with another one behind it, two bits a unit.
+inline unsigned places_of_pair(const uint16_t* from, uint16_t first, uint16_t second) {
+  const __m128i is_first = _mm_cmpeq_epi16(load_block(from), _mm_set1_epi16(static_cast<short>(first)));
+  const __m128i is_second = _mm_cmpeq_epi16(load_block(from + 1), _mm_set1_epi16(static_cast<short>(second)));
+  return static_cast<unsigned>(_mm_movemask_epi8(_mm_and_si128(is_first, is_second)));
+}
+
 inline void copy_block(uint8_t* to, const uint8_t* from) {
   store_block(to, load_block(from));
 }
@@ -270,6 +277,12 @@ inline unsigned places_of_either(const uint8_t* from, uint8_t a, uint8_t b) {
   for (size_t i = 0; i < kBlock; ++i) places |= unsigned{from[i] == a || from[i] == b} << i;
   return places;
 }
+inline unsigned places_of_pair(const uint16_t* from, uint16_t first, uint16_t second) {
+  unsigned places = 0;
+  for (size_t i = 0; i < kBlock / 2; ++i)
+    places |= unsigned{from[i] == first && from[i + 1] == second} << 2 * i;
+  return places;
+}
 template <class To, class From>
 inline void copy_block(To* to, const From* from) {
   for (size_t i = 0; i < kBlock; ++i) to[i] = static_cast<To>(from[i]);
@@ -330,6 +343,17 @@ inline size_t units_before_either(const uint8_t* p, size_t n, uint8_t a, uint8_t
   size_t i = 0;
   while (n - i >= kBlock && places_of_either(p + i, a, b) == 0) i += kBlock;
   while (i < n && p[i] != a && p[i] != b) ++i;
+  return i;
+}
+
+/// How many of `n` units stand before a value with another one behind it, or before the last one.
+inline size_t units_before_pair(const uint16_t* p, size_t n, uint16_t first, uint16_t second) {
+  constexpr size_t kHalf = kBlock / 2;
+  size_t i = 0;
+  for (; n - i > kHalf; i += kHalf)
+    if (const unsigned places = places_of_pair(p + i, first, second))
+      return i + static_cast<size_t>(__builtin_ctz(places)) / 2;
+  while (n - i > 1 && (p[i] != first || p[i + 1] != second)) ++i;
   return i;
 }
 

@@ -96,6 +96,16 @@ bool begins_with(const Cursor& text, const Cursor& part, size_t* compared) {
   return true;
 }
 
+/// Goes on before the next place where a part may begin that begins with `first`, or stays where that is not seen
+/// sooner than by characters.
+template <class Cursor>
+void skip_others(Walk<Cursor>*, const Walk<Cursor>&) {}
+void skip_others(Walk<UnicodeCursor>* at, const Walk<UnicodeCursor>& first) {
+  const LXUChar* const second = first.in.p;
+  if (second != first.in.end)
+    at->in.p += units_before_pair(at->in.p, room(at->in.p, at->in.end), first.value, *second);
+}
+
 template <class Cursor>
 Place<Cursor> find_exactly(const Cursor& text, const Cursor& part) {
   constexpr size_t kWorthIt = 1024;
@@ -103,7 +113,7 @@ Place<Cursor> find_exactly(const Cursor& text, const Cursor& part) {
   if (!first.next()) return {text.p, text};
   size_t compared = 0;
   bool has_memory = true;
-  for (Walk at(text); at.next();) {
+  for (Walk at(text); skip_others(&at, first), at.next();) {
     if (!at.same_as(first)) continue;
     if (begins_with(at.in, first.in, &compared)) return {at.start, at.in};
     // Where much agrees in vain, preparing the part pays.
