@@ -49,12 +49,12 @@ bool use_glibc() {
          strfmon(text, sizeof text, "%n", kAmount) > 0;
 }
 
-/// Memory that is this process's own, in kilobytes.
-long private_kilobytes() {
+/// Memory that is in no file, in kilobytes. What is private and what shared is a guess of newer systems.
+long own_kilobytes() {
   long kilobytes = 0;
   if (std::FILE* const file = std::fopen("/proc/self/smaps_rollup", "r")) {
     for (char line[128]; std::fgets(line, sizeof line, file) != nullptr;)
-      if (std::sscanf(line, "Private_Dirty: %ld", &kilobytes) == 1) break;
+      if (std::sscanf(line, "Anonymous: %ld", &kilobytes) == 1) break;
     std::fclose(file);
   }
   return kilobytes;
@@ -67,11 +67,11 @@ struct Turn {
 };
 
 Turn take_turn(const FirstUse& use) {
-  const long before = private_kilobytes();
+  const long before = own_kilobytes();
   const auto start = std::chrono::steady_clock::now();
   const bool done = use();
   const std::chrono::duration<double, std::nano> time = std::chrono::steady_clock::now() - start;
-  return {time.count(), private_kilobytes() - before, done};
+  return {time.count(), own_kilobytes() - before, done};
 }
 
 Turn in_a_process(const FirstUse& use) {
