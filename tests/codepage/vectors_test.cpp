@@ -57,6 +57,9 @@ class AllVectors : public CaseTest {
       if (below(100) == 0) text += static_cast<char>(below(256));
     }
     text.resize(size);
+    if (below(4) == 0)
+      for (char& byte : text)
+        if (below(8) == 0) byte = static_cast<char>(0x0E + below(2));  // shift bytes side by side
     if (below(3) == 0)
       for (size_t i = 0; i < size; ++i)
         if (below(40) == 0) text[i] = static_cast<char>(0xC0 + below(0x40));
