@@ -107,7 +107,7 @@ int32_t make_short_key(const Sort& sort, const Cursor& text, const Output& outpu
   }
   // All characters have to be alike in what they append.
   const bool alike = appends == some_append && (appends & LX_APPEND_PRIMARY) != 0;
-  if (chars == 0 || in.p != in.end || special != 0 || !alike) return 0;
+  if (chars == 0 || special != 0 || !alike) return 0;
   primaries[2 * chars] = 0;
   secondaries.finish((appends & LX_APPEND_SECONDARY) != 0, sort.default_secondary);
   tertiaries.finish((appends & LX_APPEND_TERTIARY) != 0, sort.default_tertiary);
