@@ -52,30 +52,17 @@ int32_t finish_key(const Output& output, size_t bytes, size_t chars) {
   return static_cast<int32_t>(bytes);
 }
 
-/// A short level of which every weight is appended, or every one inserted ahead of the others. What is 0 is no weight.
-struct ShortLevel {
-  uint8_t weights[kShortText];
-  size_t count = 0;
+/// Drops the weights at the end of a level that each character has.
+void trim_level(Level<uint8_t>* level, uint8_t common) {
+  while (level->end != level->begin && level->end[-1] == common) --level->end;
+}
 
-  void add(uint32_t weight) {
-    weights[count] = static_cast<uint8_t>(weight);
-    count += weight != 0;
-  }
-  /// Turns it round where weights were inserted, and drops those at the end that each character has.
-  void finish(bool appends, uint8_t common) {
-    for (size_t low = 0, high = count; !appends && low + 1 < high; ++low) {
-      const uint8_t kept = weights[low];
-      weights[low] = weights[--high];
-      weights[high] = kept;
-    }
-    while (count != 0 && weights[count - 1] == common) --count;
-  }
-  uint8_t* write(uint8_t* output) const {
-    memcpy(output, weights, count);
-    output[count] = 0;
-    return output + count + 1;
-  }
-};
+uint8_t* write_level(uint8_t* output, const Level<uint8_t>& level) {
+  memmove(output, level.begin, level.count());
+  output += level.count();
+  *output++ = 0;
+  return output;
+}
 
 /// Whether a character has one weight set with a primary and begins no pair with the one behind it.
 template <class Cursor>
@@ -91,7 +78,8 @@ template <class Cursor>
 int32_t make_short_key(const Sort& sort, const Cursor& text, const Output& output) {
   constexpr unsigned kOrder = LX_APPEND_PRIMARY | LX_APPEND_SECONDARY | LX_APPEND_TERTIARY;
   uint8_t primaries[2 * kShortText + 1];
-  ShortLevel secondaries, tertiaries;
+  uint8_t second[kShortText + 1], third[kShortText + 1];
+  Level<uint8_t> secondaries(second), tertiaries(third);
   unsigned appends = kOrder, some_append = 0, special = 0;
   size_t chars = 0;
   Cursor in(text);
@@ -99,8 +87,8 @@ int32_t make_short_key(const Sort& sort, const Cursor& text, const Output& outpu
     const Element element = sort.element(u);
     if (!element.stands_alone() && !has_own_primary(sort, element, in)) return 0;
     put_le16(primaries + 2 * chars, __builtin_bswap16(static_cast<uint16_t>(element.primary())));
-    secondaries.add(element.secondary());
-    tertiaries.add(element.tertiary());
+    secondaries.append(element.secondary());
+    tertiaries.append(element.tertiary());
     special |= element.special();
     appends &= element.char_class();
     some_append |= element.char_class() & kOrder;
@@ -109,12 +97,17 @@ int32_t make_short_key(const Sort& sort, const Cursor& text, const Output& outpu
   const bool alike = appends == some_append && (appends & LX_APPEND_PRIMARY) != 0;
   if (chars == 0 || special != 0 || !alike) return 0;
   primaries[2 * chars] = 0;
-  secondaries.finish((appends & LX_APPEND_SECONDARY) != 0, sort.default_secondary);
-  tertiaries.finish((appends & LX_APPEND_TERTIARY) != 0, sort.default_tertiary);
-  const size_t bytes = 2 * chars + secondaries.count + tertiaries.count + Levels::kSeparators;
+  const auto finish = [&](Level<uint8_t>* level, unsigned bit, uint8_t common) {
+    if ((appends & bit) == 0) level->run = level->begin;  // all of them were inserted
+    level->close_run();
+    trim_level(level, common);
+  };
+  finish(&secondaries, LX_APPEND_SECONDARY, sort.default_secondary);
+  finish(&tertiaries, LX_APPEND_TERTIARY, sort.default_tertiary);
+  const size_t bytes = 2 * chars + secondaries.count() + tertiaries.count() + Levels::kSeparators;
   if (bytes <= output.usable) {
     memcpy(output.start, primaries, 2 * chars + 1);
-    tertiaries.write(secondaries.write(output.start + 2 * chars + 1));
+    write_level(write_level(output.start + 2 * chars + 1, secondaries), tertiaries);
   }
   return finish_key(output, bytes, chars);
 }
@@ -214,11 +207,8 @@ int32_t transform(LXLocale* given, Form form, uint8_t* output, int32_t size, con
 namespace lx {
 
 void Key::trim(const Sort& sort) {
-  const auto drop = [](Level<uint8_t>* level, uint8_t weight) {
-    while (level->end != level->begin && level->end[-1] == weight) --level->end;
-  };
-  drop(&levels_.secondaries, sort.default_secondary);
-  drop(&levels_.tertiaries, sort.default_tertiary);
+  trim_level(&levels_.secondaries, sort.default_secondary);
+  trim_level(&levels_.tertiaries, sort.default_tertiary);
   positions_ = levels_.primaries.count() + levels_.secondaries.count() + levels_.tertiaries.count() != 0;
 }
 
@@ -235,13 +225,7 @@ void Key::write(uint8_t* output) const {
   };
   for (const uint16_t* p = levels_.primaries.begin; p != levels_.primaries.end; ++p) put(*p);
   *output++ = 0;
-  const auto put_level = [&](const Level<uint8_t>& level) {
-    memmove(output, level.begin, level.count());
-    output += level.count();
-    *output++ = 0;
-  };
-  put_level(levels_.secondaries);
-  put_level(levels_.tertiaries);
+  output = write_level(write_level(output, levels_.secondaries), levels_.tertiaries);
   for (const uint32_t* p = levels_.specials.begin; p != levels_.specials.end; ++p) {
     const uint32_t placed = *p;  // what is written may reach over it
     if (positions_) put(static_cast<uint16_t>(placed >> 16));
