@@ -181,22 +181,23 @@ bool LXMcLoadSet(const LXCatalog& catalog, uint32_t offset, SetRecord* record) {
          holds(catalog.file_bytes, record->texts, record->text_bytes);
 }
 
-int32_t MCGetSet(LXCatalog* catalog, uint32_t number, SetRecord* record) {
+int32_t MCGetSet(LXCatalog* catalog, uint32_t number, SetRecord* room, const SetRecord** record) {
   if (catalog->sets != nullptr) {
     const SetRecord* sets = catalog->sets;
     const uint32_t at = find_number([&](uint32_t i) { return sets[i].number; }, catalog->set_count, number);
     if (at == catalog->set_count) return LX_E_MESSAGE;
-    *record = sets[at];
+    *record = &sets[at];
     return LX_OK;
   }
   if (catalog->locale == nullptr) {
     if (const int32_t code = read_header(catalog)) return code;
   }
+  *record = room;
   uint32_t offset = catalog->first_set;
   for (uint32_t i = 0; i < catalog->set_count; ++i) {
-    if (!read_set(*catalog, offset, record)) return LX_E_CATALOG;
-    if (record->number == number) return LX_OK;
-    offset = record->next;
+    if (!read_set(*catalog, offset, room)) return LX_E_CATALOG;
+    if (room->number == number) return LX_OK;
+    offset = room->next;
     if (offset == 0) return LX_E_MESSAGE;
   }
   return LX_E_MESSAGE;

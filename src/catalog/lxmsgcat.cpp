@@ -142,10 +142,11 @@ int32_t get_message(LXCatalog* catalog, uint32_t set, uint32_t number, Unit* out
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, LX_E_NOT_INITIALIZED);
   output[0] = 0;
   if (size <= 0) return call.exit(LX_OK);
-  SetRecord record;
+  SetRecord room;
+  const SetRecord* record = nullptr;
   MessageText message;
-  int32_t code = MCGetSet(catalog, set, &record);
-  if (code == LX_OK) code = MCGetMsg(*catalog, record, number, &message);
+  int32_t code = MCGetSet(catalog, set, &room, &record);
+  if (code == LX_OK) code = MCGetMsg(*catalog, *record, number, &message);
   if (code == LX_OK)
     code = write_message(call.locale(), catalog->locale, message, output, size);
   else if (code == LX_E_MESSAGE && default_text != nullptr)

@@ -51,7 +51,7 @@ LXCatalog* LXMcLoadCat(LXFile* file, LXLocale* opener, uint32_t flags, int32_t* 
 /// the file.
 bool LXMcLoadSet(const LXCatalog& catalog, uint32_t offset, lx::SetRecord* record);
 
-/// Finds a set, finds a message of a set: 0, 71, or 72 when there is none.
-int32_t MCGetSet(LXCatalog* catalog, uint32_t number, lx::SetRecord* record);
+/// Finds a set, which is read to `room` or is loaded; finds a message of a set: 0, 71, or 72 when there is none.
+int32_t MCGetSet(LXCatalog* catalog, uint32_t number, lx::SetRecord* room, const lx::SetRecord** record);
 int32_t MCGetMsg(const LXCatalog& catalog, const lx::SetRecord& record, uint32_t number,
                  lx::MessageText* message);
