@@ -59,13 +59,19 @@ struct StreamCalls {
     if (found == calls.end()) throw CaseError("no call of a stream: " + name);
     return found->second();
   }
-  /// A string: its text, and with LX_CHARACTERS how many they are; or a code.
+  void answer(int64_t got, const std::string& expected) {
+    const size_t slash = expected.find('/');
+    EXPECT_EQ(got, number(expected.substr(0, slash)));
+    EXPECT_EQ(LXGetError(r.l), slash != std::string::npos ? number(expected.substr(slash + 1)) : int64_t{LX_OK});
+  }
+
+  /// A string: its text, and with LX_CHARACTERS how many they are; or an answer.
   void line(decltype(LXReadString)* read, int32_t size, uint32_t flags) {
     const bool characters = (flags & LX_CHARACTERS) != 0;
     std::string block(static_cast<size_t>(size) * (characters ? 4 : 1), '#');
     block.shrink_to_fit();
     const int32_t n = read(stream, r.l, block.data(), size, flags);
-    if (n < 0) return r.number(n);
+    if (n < 0) return answer(n, r.expected().word());
     r.text({block.begin(), characters ? std::find(block.begin(), block.end(), '#') : block.begin() + n});
     if (characters) r.number(n);
   }
@@ -88,13 +94,9 @@ struct StreamCalls {
         line(name == "line" ? LXReadString : LXReadStringEx, arguments.at(0),
              static_cast<uint32_t>(arguments.at(1)));
     } else {
-      const std::string answer = r.expected().word();
-      const size_t slash = answer.find('/');
-      for (int64_t n = star != 0 ? number(word.name.substr(0, star - 1)) : 1; n > 0; --n) {
-        EXPECT_EQ(call(name, word), number(answer.substr(0, slash))) << word.name;
-        EXPECT_EQ(LXGetError(r.l),
-                  slash != std::string::npos ? number(answer.substr(slash + 1)) : int64_t{LX_OK});
-      }
+      const std::string expected = r.expected().word();
+      for (int64_t n = star != 0 ? number(word.name.substr(0, star - 1)) : 1; n > 0; --n)
+        answer(call(name, word), expected);
     }
   }
 };
