@@ -202,11 +202,15 @@ int32_t count_of(const Container& text) {
 /// The characters of a text as a length in characters counts them: a shift byte on either side belongs to one, so that
 /// of two side by side not the same are counted as by LXNumCharsEx.
 inline int32_t length_in_chars(const LXObject* codepage, const void* text, LXShiftState state, int32_t bytes) {
-  constexpr size_t kBehind = 16;
-  const std::string padded =
-      std::string(static_cast<const char*>(text), static_cast<size_t>(bytes)) + std::string(kBehind, 'x');
-  for (int32_t chars = 0;; ++chars)
-    if (LXCpStrCharToByteLen(codepage, padded.data(), state, chars + 1) > bytes) return chars;
+  constexpr size_t kMost = 8;  // bytes that a character and its shift bytes have
+  std::string padded((static_cast<size_t>(bytes) + 1) * kMost, 'x');
+  std::copy_n(static_cast<const char*>(text), bytes, padded.begin());
+  int32_t chars = 0;
+  for (int32_t above = bytes + 1; above - chars > 1;) {
+    const int32_t middle = chars + (above - chars) / 2;
+    (LXCpStrCharToByteLen(codepage, padded.data(), state, middle) > bytes ? above : chars) = middle;
+  }
+  return chars;
 }
 inline Units units(const std::string& ascii) {
   return Units(ascii.begin(), ascii.end());
