@@ -125,12 +125,10 @@ int32_t write_char(const Codepage& cp, LXStream& s, const StreamChar& c) {
 
 /// What a write stream still owes its callback at the end.
 int32_t finish(const Codepage& cp, LXStream& s) {
-  int32_t code = flush(s);
+  if (flush(s) != LX_OK) return LX_E_STREAM_FLUSH;
   uint8_t shift_in = cp.shift_in;
-  if (code == LX_OK && cp.shift_sensitive && s.shift_state == LX_SHIFT_DOUBLE &&
-      offer(s, &shift_in, 1).taken != 1)
-    code = LX_E_STREAM_FLUSH;
-  return code == LX_OK ? LX_OK : LX_E_STREAM_FLUSH;
+  const bool open = cp.shift_sensitive && s.shift_state == LX_SHIFT_DOUBLE;
+  return open && offer(s, &shift_in, 1).taken != 1 ? LX_E_STREAM_FLUSH : LX_OK;
 }
 
 // Characters as the four forms give them.
