@@ -62,7 +62,8 @@ struct StreamCalls {
   void answer(int64_t got, const std::string& expected) {
     const size_t slash = expected.find('/');
     EXPECT_EQ(got, number(expected.substr(0, slash)));
-    EXPECT_EQ(LXGetError(r.l), slash != std::string::npos ? number(expected.substr(slash + 1)) : int64_t{LX_OK});
+    EXPECT_EQ(LXGetError(r.l),
+              slash != std::string::npos ? number(expected.substr(slash + 1)) : int64_t{LX_OK});
   }
 
   /// A string: its text, and with LX_CHARACTERS how many they are; or an answer.
