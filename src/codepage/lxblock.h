@@ -28,7 +28,8 @@ struct LeadRanges {
   Range two[2];
   Range three;
   bool has_three;
-  bool known;  // else the first bytes are otherwise
+  bool above_ascii;  // none of them is ASCII
+  bool known;        // else the first bytes are otherwise
 };
 
 #if defined(__SSE2__)
@@ -161,59 +162,33 @@ class Utf8Block {
   unsigned ours_ = 0;   // before the first longer character
 };
 
-/// A block of multibyte text at the start of a character, where every byte is one bit. No character waits for
-/// the length of the one before.
-class CharBlock {
- public:
+/// A block of multibyte text, where every byte is one bit: those that can begin characters of two bytes and of three.
+struct CharBlock {
   static constexpr size_t kBytes = 8 * sizeof(size_t);
 
-  CharBlock(const uint8_t* p, const LeadRanges& leads) {
-    size_t two = 0, three = 0;
-    for (size_t i = 0; i < kBytes; i += kBlock) {
-      const __m128i bytes = load_block(p + i);
-      two |= size_t{byte_mask(_mm_or_si128(in(leads.two[0], bytes), in(leads.two[1], bytes)))} << i;
-      if (leads.has_three) three |= size_t{byte_mask(in(leads.three, bytes))} << i;
-    }
-    pairs_ = three == 0;
-    if (pairs_) {
-      // A byte that can begin a character continues one behind a byte that does: in a series every other one.
-      constexpr size_t kOdd = SIZE_MAX / 3 * 2;
-      const size_t ends = ((two << 1 | kOdd) - two) ^ kOdd;
-      trails_ = ends ^ two;
-      longer_ = (ends & two) >> (kBytes - 1);
-    } else {
-      const size_t any = two | three;
-      trails_ = any << 1 | three << 2;
-      known_ = (any & trails_) == 0;
-      longer_ = (any >> (kBytes - 1)) + (three >> (kBytes - 1)) + (three >> (kBytes - 2) & 1);
-    }
+  CharBlock(const uint8_t* p, const LeadRanges& leads) : two(in(leads.two[0], p)) {
+    if (leads.two[1].first != leads.two[0].first) two |= in(leads.two[1], p);
+    if (leads.has_three) three = in(leads.three, p);
   }
-  /// Whether all its characters have one byte or two, and where they begin.
-  bool pairs() const { return pairs_; }
-  size_t starts() const { return ~trails_; }
-  /// False where a character of three bytes is followed by what could begin another one.
-  bool known() const { return known_; }
-  size_t chars() const { return kBytes - ones(trails_); }
-  /// The bytes of the characters that begin in the block.
-  size_t bytes() const { return kBytes + longer_; }
+  static bool is_ascii(const uint8_t* p) {
+    __m128i any = load_block(p);
+    for (size_t i = kBlock; i < kBytes; i += kBlock) any = _mm_or_si128(any, load_block(p + i));
+    return byte_mask(any) == 0;
+  }
+
+  size_t two = 0, three = 0;
 
  private:
-  static __m128i in(LeadRanges::Range range, __m128i bytes) {
-    const __m128i above = _mm_sub_epi8(bytes, _mm_set1_epi8(static_cast<char>(range.first)));
-    return _mm_cmpeq_epi8(_mm_min_epu8(above, _mm_set1_epi8(static_cast<char>(range.others))), above);
+  static size_t in(LeadRanges::Range range, const uint8_t* p) {
+    const __m128i first = _mm_set1_epi8(static_cast<char>(range.first));
+    const __m128i others = _mm_set1_epi8(static_cast<char>(range.others));
+    size_t found = 0;
+    for (size_t i = 0; i < kBytes; i += kBlock) {
+      const __m128i above = _mm_sub_epi8(load_block(p + i), first);
+      found |= size_t{byte_mask(_mm_cmpeq_epi8(_mm_min_epu8(above, others), above))} << i;
+    }
+    return found;
   }
-  static size_t ones(size_t bits) {
-    constexpr size_t kAll = SIZE_MAX;
-    bits -= bits >> 1 & kAll / 3;
-    bits = (bits & kAll / 5) + (bits >> 2 & kAll / 5);
-    bits = (bits + (bits >> 4)) & kAll / 17;
-    return bits * (kAll / 255) >> (kBytes - 8);
-  }
-
-  size_t trails_;
-  size_t longer_;
-  bool pairs_;
-  bool known_ = true;
 };
 
 /// Which of kBytes bytes of UTF-8 begin characters of two bytes and three, one bit a byte, and how many bytes the
@@ -305,15 +280,11 @@ inline bool find_long_utf8(const uint8_t*, size_t*, size_t*) {
 inline bool put_short_batch(const uint16_t*, uint8_t**) {
   return false;
 }
-class CharBlock {
- public:
+struct CharBlock {
   static constexpr size_t kBytes = 8 * sizeof(size_t);
   CharBlock(const uint8_t*, const LeadRanges&) {}
-  bool pairs() const { return false; }
-  size_t starts() const { return 0; }
-  bool known() const { return false; }
-  size_t chars() const { return 0; }
-  size_t bytes() const { return 0; }
+  static bool is_ascii(const uint8_t*) { return false; }
+  size_t two = 0, three = 0;
 };
 
 #endif

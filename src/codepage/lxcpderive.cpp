@@ -145,6 +145,8 @@ LeadRanges lead_ranges(const Codepage& cp) {
   }
   if (twos == 1) leads.two[1] = leads.two[0];
   leads.has_three = threes != 0;
+  leads.above_ascii = leads.two[0].first >= kAscii && leads.two[1].first >= kAscii &&
+                      (threes == 0 || leads.three.first >= kAscii);
   leads.known = twos != 0;
   return leads;
 }

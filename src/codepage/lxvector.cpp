@@ -13,17 +13,37 @@ inline bool read_short(const uint8_t** p, size_t left, uint16_t* value) {
   return true;
 }
 
+size_t ones(size_t bits) {
+  constexpr size_t kAll = SIZE_MAX;
+  bits -= bits >> 1 & kAll / 3;
+  bits = (bits & kAll / 5) + (bits >> 2 & kAll / 5);
+  bits = (bits + (bits >> 4)) & kAll / 17;
+  return bits * (kAll / 255) >> (CharBlock::kBytes - 8);
+}
+
 }  // namespace
 
 namespace base {
 
 PassedRun pass(const LeadRanges& leads, const uint8_t* p, const uint8_t* end, size_t most) {
-  size_t chars = 0;
-  while (kVectors && most - chars >= CharBlock::kBytes && room(p, end) >= kBaseLeastPassed) {
+  constexpr size_t kBytes = CharBlock::kBytes;
+  size_t chars = 0, trails = 0, last_starts = 0;
+  const uint8_t* const stop = p + least(most, room(p, end));  // so many bytes are not more characters
+  for (; kVectors && room(p, stop) >= kBytes; p += kBytes) {
+    if (leads.above_ascii && trails == 0 && CharBlock::is_ascii(p)) {
+      chars += kBytes;
+      continue;
+    }
     const CharBlock block(p, leads);
-    if (!block.known()) break;
-    chars += block.chars();
-    p += block.bytes();
+    const CharStarts<size_t> chars_of(block.two, block.three, leads.has_three, SIZE_MAX, trails);
+    if (!chars_of.known) break;
+    last_starts = chars_of.starts;
+    chars += ones(last_starts);
+    trails = chars_of.trails();
+  }
+  if (trails != 0) {  // the last one goes on behind the blocks
+    p -= 1 + static_cast<size_t>(__builtin_clzl(last_starts));
+    --chars;
   }
   return {p, chars};
 }
@@ -92,10 +112,11 @@ ReadRun read_pairs(const PairRows& pairs, const uint8_t* q, const uint8_t* end, 
       continue;
     }
     const CharBlock block(q, leads);
-    if (!block.pairs()) break;
-    for (size_t starts = block.starts(); starts != 0; starts &= starts - 1)
+    const CharStarts<size_t> chars(block.two, block.three, leads.has_three, SIZE_MAX, 0);
+    if (chars.three != 0) break;
+    for (size_t starts = chars.starts; starts != 0; starts &= starts - 1)
       values[n++] = pair_value(rows, q + __builtin_ctzl(starts));
-    q += block.bytes();
+    q += CharBlock::kBytes + chars.trails();
   }
   return {q, n};
 }

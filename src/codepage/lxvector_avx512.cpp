@@ -111,43 +111,33 @@ LX_TARGET inline uint64_t bytes_in(LeadRanges::Range range, __m512i block) {
   return _mm512_cmple_epu8_mask(above, _mm512_set1_epi8(static_cast<char>(range.others)));
 }
 
-/// Where characters of one and two bytes begin. A byte that can begin a character continues one behind a byte that
-/// does: in a series every other one.
-LX_TARGET inline uint64_t pair_starts(uint64_t two) {
-  constexpr uint64_t kOdd = UINT64_MAX / 3 * 2;
-  const uint64_t ends = ((two << 1 | kOdd) - two) ^ kOdd;
-  return ~(ends ^ two);
+/// Where characters begin in those bytes of a block that are `inside`.
+LX_TARGET inline CharStarts<uint64_t> chars_in(const LeadRanges& leads, __m512i block, uint64_t inside,
+                                               uint64_t trails) {
+  uint64_t two = bytes_in(leads.two[0], block);
+  if (leads.two[0].first != leads.two[1].first) two |= bytes_in(leads.two[1], block);
+  const uint64_t three = leads.has_three ? bytes_in(leads.three, block) : 0;
+  return {two, three, leads.has_three, inside, trails};
 }
 
 constexpr size_t kLeastPassed = 16;
 
-/// First bytes of a block, and which of them begin characters where `trails` of it belong to one before.
-struct Firsts {
-  uint64_t two, three, starts;
-  bool known;
-
-  LX_TARGET Firsts(const LeadRanges& leads, __m512i block, uint64_t inside, uint64_t trails) {
-    inside &= ~trails;
-    two = (bytes_in(leads.two[0], block) | bytes_in(leads.two[1], block)) & inside;
-    three = leads.has_three ? bytes_in(leads.three, block) & inside : 0;
-    trails |= (two | three) << 1 | three << 2;
-    known = three == 0 || ((two | three) & trails) == 0;
-    starts = inside & (three == 0 ? pair_starts(two) : ~trails);
-  }
-};
-
 LX_TARGET PassedRun pass(const LeadRanges& leads, const uint8_t* p, const uint8_t* end, size_t most) {
   size_t chars = 0;
   uint64_t trails = 0, last_starts = 0;
-  // Block by block: none waits for where a character ends in the one before, but for the bytes that it leaves.
-  while (most - chars >= kBytes && room(p, end) >= kBytes) {
-    const Firsts firsts(leads, _mm512_loadu_si512(p), ones(kBytes), trails);
-    if (!firsts.known) break;
-    last_starts = firsts.starts;
+  const uint64_t leads_below = leads.above_ascii ? 0 : 1;
+  const uint8_t* const stop = p + least(most, room(p, end));  // so many bytes are not more characters
+  for (; room(p, stop) >= kBytes; p += kBytes) {
+    const __m512i block = _mm512_loadu_si512(p);
+    if ((_mm512_movepi8_mask(block) | trails | leads_below) == 0) {  // one test, which is foreseen
+      chars += kBytes;
+      continue;
+    }
+    const auto found = chars_in(leads, block, ones(kBytes), trails);
+    if (!found.known) break;
+    last_starts = found.starts;
     chars += static_cast<size_t>(__builtin_popcountll(last_starts));
-    const uint64_t two = firsts.two & last_starts;
-    trails = (two | firsts.three) >> 63 | firsts.three >> 62;
-    p += kBytes;
+    trails = found.trails();
   }
   if (trails != 0) {  // the last one goes on behind the blocks
     p -= 1 + __builtin_clzll(last_starts);
@@ -156,11 +146,11 @@ LX_TARGET PassedRun pass(const LeadRanges& leads, const uint8_t* p, const uint8_
   const size_t bytes = room(p, end);
   if (bytes == 0 || bytes >= kBytes || most - chars < kBytes) return {p, chars};
   const uint64_t inside = ones(bytes), last = uint64_t{1} << (bytes - 1);
-  const Firsts firsts(leads, _mm512_maskz_loadu_epi8(inside, p), inside, 0);
-  if (!firsts.known) return {p, chars};
-  const uint64_t cut = firsts.starts & ((firsts.two & last) | (firsts.three & (last | last >> 1)));
+  const auto found = chars_in(leads, _mm512_maskz_loadu_epi8(inside, p), inside, 0);
+  if (!found.known) return {p, chars};
+  const uint64_t cut = (found.two & last) | (found.three & (last | last >> 1));
   const size_t used = cut == 0 ? bytes : static_cast<size_t>(__builtin_ctzll(cut));
-  return {p + used, chars + static_cast<size_t>(__builtin_popcountll(firsts.starts & ones(used)))};
+  return {p + used, chars + static_cast<size_t>(__builtin_popcountll(found.starts & ones(used)))};
 }
 
 LX_TARGET ReadRun read_pairs(const PairRows& pairs, const uint8_t* q, const uint8_t* end, uint16_t* values,
@@ -179,12 +169,12 @@ LX_TARGET ReadRun read_pairs(const PairRows& pairs, const uint8_t* q, const uint
       n += kBytes;
       continue;
     }
-    if (leads.has_three && (bytes_in(leads.three, block) & inside) != 0) break;
-    const uint64_t two = (bytes_in(leads.two[0], block) | bytes_in(leads.two[1], block)) & inside;
-    uint64_t starts = inside & pair_starts(two);
+    const auto found = chars_in(leads, block, inside, 0);
+    if (found.three != 0) break;
+    uint64_t starts = found.starts;
     // One that the block cuts waits for the next block.
     const uint64_t last = uint64_t{1} << (bytes - 1);
-    const bool cut = (starts & two & last) != 0;
+    const bool cut = (found.two & last) != 0;
     if (cut) starts &= ~last;
     size_t used = bytes - cut;
     auto chars = static_cast<size_t>(__builtin_popcountll(starts));

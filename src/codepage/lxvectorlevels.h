@@ -24,7 +24,42 @@ uint8_t* write_bytes(const PairCodes& codes, uint8_t* p, const uint16_t* values,
 }  // namespace base
 
 inline constexpr size_t kBasePivotBytes = 48;
-inline constexpr size_t kBaseLeastPassed = CharBlock::kBytes + kMaxCharBytes;
+inline constexpr size_t kBaseLeastPassed = CharBlock::kBytes;
+
+/// Which bytes of a block of multibyte text begin characters, one bit a byte. No character waits for the length of the
+/// one before.
+template <class Mask>
+struct CharStarts {
+  Mask two, three;  // ... of so many bytes
+  Mask starts;      // ... of any
+  bool known;       // false where one of three bytes is followed by what could begin another one
+
+  /// Of the bytes `inside`, those of a range can begin characters of two bytes or of three; `trails` belong to the
+  /// character before the block.
+  CharStarts(Mask can_two, Mask can_three, bool has_three, Mask inside, Mask trails)
+      : two(can_two & inside), three(can_three & inside) {
+    if (has_three) {
+      // Where no byte that can begin a character continues one, what the block leaves does not wait for `trails`.
+      const Mask any = two | three, behind = trails | any << 1 | three << 2;
+      starts = inside & ~behind;
+      known = (any & behind) == 0;
+      if (__builtin_expect(known, 1)) return;
+    }
+    inside &= ~trails;
+    two &= inside;
+    three &= inside;
+    known = three == 0;
+    // A byte that can begin a character continues one behind a byte that does: in a series every other one.
+    constexpr Mask kOdd = static_cast<Mask>(~Mask{0}) / 3 * 2;
+    const Mask ends = ((two << 1 | kOdd) - two) ^ kOdd;
+    starts = inside & ~(ends ^ two);
+    two &= starts;
+  }
+  /// The first bytes of the next block that belong to the last character of this one.
+  Mask trails() const { return (two | three) >> (kBits - 1) | three >> (kBits - 2); }
+
+  static constexpr unsigned kBits = 8 * sizeof(Mask);
+};
 
 #if defined(__SSE2__)
 
