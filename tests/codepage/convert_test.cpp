@@ -157,6 +157,7 @@ TEST(ConvertOneWay, ReadingDiffersFromWriting) {
   EXPECT_EQ(decode(kPlain, library.locale(yen), bytes), as_yen);
   const Units cut = run + units("\\") + run + Units(1, 0xFFFD) + run;
   EXPECT_EQ(decode(kPlain, library.locale(low_lead), bytes), cut);
+  EXPECT_EQ(LXNumChars(library.locale(low_lead), std::string(70, '~').c_str(), -1), 35);
   const LXWChar codes[] = {0x82A0, 'a', 0x8340};
   char out[8] = {};
   EXPECT_EQ(LXWideToMb(library.locale(one_way), out, 5, codes, 3, 0), 5);

@@ -177,5 +177,13 @@ TEST_F(AllVectors, WriteWhatSingleCharactersGive) {
   }
 }
 
+/// Blocks of ASCII are passed whole: not where a character of the block before takes a byte of them.
+TEST_F(AllVectors, CountWhatABlockCuts) {
+  for (const TinyCodepage& cp : case_codepages())
+    for (unsigned byte = 0x80; byte < 0x100; ++byte)
+      for (const size_t at : {62u, 63u})
+        expect_count_as_single(cp, std::string(at, 'a') + static_cast<char>(byte) + std::string(140, 'a'));
+}
+
 }  // namespace
 }  // namespace lx::test
