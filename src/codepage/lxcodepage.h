@@ -35,6 +35,7 @@ struct PairCase {
   const int16_t* deltas;  // from the code to the other case, by row and second byte; kFar where that is farther
   const uint8_t* row;     // by first byte; 0: none
   uint8_t bits;           // how many of a second byte count
+  const PairCaseRow* bytes;  // of UTF-8 the same as bytes; null: of others
 
   /// Stores a character in its other case, which is itself where it has none; false, and anything is stored, where that
   /// has not two bytes.

@@ -62,16 +62,18 @@ struct Layout {
   size_t first;
   size_t halves;
   size_t cases;
+  size_t case_bytes;
   size_t leaf;
   size_t bytes;
 
-  Layout(size_t code_rows, bool wide, size_t nodes, size_t half_slots, size_t case_numbers)
+  Layout(size_t code_rows, bool wide, size_t nodes, size_t half_slots, size_t case_numbers, bool utf8)
       : codes(sizeof(Codepage)),
         rows(codes + code_rows * kRow * (wide ? sizeof(uint32_t) : sizeof(uint16_t))),
         first(rows + (nodes != 0 ? nodes + kRowsBehind : 0) * kRow * sizeof(uint16_t)),
         halves(first + (nodes != 0 ? kRow * sizeof(uint32_t) : 0)),
         cases(halves + half_slots * sizeof(uint16_t)),
-        leaf(cases + case_numbers * sizeof(uint16_t)),
+        case_bytes(cases + case_numbers * sizeof(uint16_t)),
+        leaf(case_bytes + (utf8 ? 2 * case_numbers : 0)),
         bytes(leaf + nodes + kReadBehind) {}
 };
 
@@ -268,12 +270,14 @@ size_t find_case(Codepage* cp) {
   return 2 * rows << bits;
 }
 
-/// The lower case first. The codepage has its place already.
-void fill_pair_case(Codepage* cp, int16_t* deltas) {
+/// The lower case first. The codepage has its place already; rows of bytes are filled for UTF-8.
+void fill_pair_case(Codepage* cp, int16_t* deltas, PairCaseRow* row) {
   const TypeTrie types(cp->payload);
   for (PairCase& pairs : cp->pair_case) {
     pairs.deltas = deltas;
     pairs.row = cp->pair_case_rows;
+    const bool as_bytes = cp->utf8 && size_t{1} << pairs.bits == sizeof(row->first);
+    if (as_bytes) pairs.bytes = row;
     const uint32_t mask = &pairs == cp->pair_case ? LX_C1_UPPER : LX_C1_LOWER;
     for (unsigned first = 0; first < kRow; ++first) {
       fmt::TypeNode node;
@@ -282,7 +286,12 @@ void fill_pair_case(Codepage* cp, int16_t* deltas) {
         const fmt::TypeRecord type = types.record(node, second);
         const auto delta = static_cast<int32_t>((type.type & mask) != 0 ? type.case_delta : 0);
         *deltas++ = delta > INT16_MIN && delta <= INT16_MAX ? static_cast<int16_t>(delta) : PairCase::kFar;
+        if (!as_bytes) continue;
+        const uint32_t code = (first << 8 | 0x80 | second) + static_cast<uint32_t>(delta);
+        row->first[second] = code - 0x100 < 0xFF00 ? static_cast<uint8_t>(code >> 8) : 0;
+        row->second[second] = static_cast<uint8_t>(code);
       }
+      if (as_bytes) ++row;
     }
   }
 }
@@ -304,7 +313,7 @@ void* derive_codepage(uint16_t id, const Sections& sections) {
   const bool wide = !scalars.utf8 && scalars.width > 2;
   const size_t half_slots = WidthTables(scalars).slots();
   const size_t case_numbers = find_case(&scalars);
-  const Layout layout(code_rows, wide, nodes.count(), half_slots, case_numbers);
+  const Layout layout(code_rows, wide, nodes.count(), half_slots, case_numbers, scalars.utf8);
 
   uint8_t* block = static_cast<uint8_t*>(hook_allocate_zeroed(layout.bytes));
   if (block == nullptr) return nullptr;
@@ -340,7 +349,8 @@ void* derive_codepage(uint16_t id, const Sections& sections) {
   cp->plain_utf8 = has_plain_utf8(*cp);
   cp->plain_case = has_plain_case(*cp);
   cp->plain_digits = has_plain_digits(*cp);
-  fill_pair_case(cp, reinterpret_cast<int16_t*>(block + layout.cases));
+  fill_pair_case(cp, reinterpret_cast<int16_t*>(block + layout.cases),
+                 reinterpret_cast<PairCaseRow*>(block + layout.case_bytes));
   return block;
 }
 

@@ -16,8 +16,11 @@ class SpecialFilter {
   SpecialFilter(const LXObject& language, bool used, bool upper)
       : specials_(used ? specials_of(language, upper) : Specials{nullptr, 0}) {
     for (size_t i = 0; i < specials_.count; ++i) {
-      const unsigned slot = slot_of(specials_.entry(i).first);
+      const uint16_t first = specials_.entry(i).first;
+      if (firsts_ != 0 && first_[firsts_ - 1] == first) continue;  // those of one character stand together
+      const unsigned slot = slot_of(first);
       bits_[slot / 32] |= 1u << slot % 32;
+      if (few()) first_[firsts_++] = first;
     }
   }
   bool any() const { return specials_.count != 0; }
@@ -27,11 +30,18 @@ class SpecialFilter {
     return (bits_[slot / 32] >> slot % 32 & 1) != 0;
   }
   const Specials& specials() const { return specials_; }
+  /// The characters that begin one, where they are few.
+  bool few() const { return firsts_ < kFew; }
+  const uint16_t* first() const { return first_; }
+  size_t firsts() const { return firsts_; }
 
  private:
   static unsigned slot_of(uint16_t u) { return (u & 0xFFu) | (u > 0xFF ? 0x100u : 0); }
   Specials specials_;
+  static constexpr size_t kFew = 4;
   uint32_t bits_[16] = {};
+  uint16_t first_[kFew];
+  size_t firsts_ = 0;  // kFew: there may be more
 };
 
 // Runs of characters of one unit whose case one table tells.
@@ -62,7 +72,8 @@ inline Runs runs_of(const LeadByteText& text, const SpecialFilter& filter, bool 
   if (text.in.cp.single_byte) return {table, 0x100, false, false, upper};
   if (text.in.cp.same_below < kAscii) return {table, 0, false, false, upper};
   const bool blocks = text.in.cp.plain_case && !filter.any_ascii() && most_units(text) >= kLongText;
-  return {table, kAscii, blocks, blocks && text.in.cp.plain_utf8, upper};
+  const bool utf8 = text.in.cp.plain_utf8 && text.in.cp.pair_case[upper].bytes != nullptr && filter.few();
+  return {table, kAscii, blocks, blocks && utf8, upper};
 }
 
 inline uint16_t unicode_of(const UnicodeText&, uint16_t u) {
@@ -106,35 +117,32 @@ template <class Text>
   return code_bytes(code) == length;
 }
 
-constexpr size_t kUtf8Block = 8 * sizeof(size_t);
-constexpr size_t kLongUtf8 = kUtf8Block + 2;  // of characters that begin in a block, at most
-
-/// Maps blocks of UTF-8: all of a block is taken over, ASCII in its other case, and then characters of several bytes are
-/// mapped in their places. Ends before one that map_long_utf8() leaves.
+/// Maps characters of UTF-8 by blocks. Ends before one that map_long_utf8() leaves.
 inline void map_utf8(LeadByteText& text, const Runs& runs, const SpecialFilter& filter) {
   const Codepage& cp = text.in.cp;
   const PairCase pairs = cp.pair_case[runs.upper];
+  const Utf8Case how{pairs.bytes, pairs.row, cp.caseless, filter.first(), filter.firsts(), runs.upper};
   const uint32_t mask = runs.upper ? LX_C1_LOWER : LX_C1_UPPER;
-  const bool special = filter.any();
   const uint8_t* p = text.in.p;
   uint8_t* to = text.out.p;
   const uint8_t* const end = p + most_units(text);
-  size_t begins = 0, bytes;
-  for (; begins == 0 && room(p, end) >= kLongUtf8 && find_long_utf8<kUtf8Block>(p, &begins, &bytes);
+  MappedBlock block;
+  for (size_t bytes; (bytes = vectors->map_utf8(how, p, room(p, end), to, &block)) != 0;
        p += bytes, to += bytes) {
-    uint8_t given[kLongUtf8], before[kLongUtf8];
-    memcpy(given, p, kLongUtf8);
-    memcpy(before, to, kLongUtf8);
-    for (size_t i = 0; i < kUtf8Block; i += kBlock) case_block(to + i, given + i, runs.upper);
-    for (size_t i = kUtf8Block; i < bytes; ++i) to[i] = given[i];
-    for (; begins != 0; begins &= begins - 1) {
-      const auto at = static_cast<size_t>(__builtin_ctzll(begins));
-      const bool maybe = special && filter.may_begin(utf8_unicode(given + at));
-      if (!maybe && map_long_utf8(cp, pairs, given + at, mask, to + at)) continue;
-      memcpy(to + at, before + at, bytes - at);  // nothing is written behind the last character
+    uint64_t left = block.left;
+    if (left == 0) continue;
+    for (; left != 0; left &= left - 1) {
+      const auto at = static_cast<size_t>(__builtin_ctzll(left));
+      const bool maybe = filter.any() && filter.may_begin(utf8_unicode(p + at));
+      if (!maybe && map_long_utf8(cp, pairs, p + at, mask, block.bytes + at)) continue;
       bytes = at;
       break;
     }
+    memcpy(to, block.bytes, bytes);
+    if (left == 0) continue;
+    p += bytes;
+    to += bytes;
+    break;
   }
   text.in.p = p;
   text.out.p = to;

@@ -48,6 +48,30 @@ struct PairCodes {
   const uint16_t* codes;
 };
 
+/// The other case of characters of two bytes of UTF-8 that have the same first byte, by the six bits of the second byte
+/// that count.
+struct PairCaseRow {
+  uint8_t first[64];  // 0 where it has not two bytes
+  uint8_t second[64];
+};
+
+/// How characters of UTF-8 are mapped to their other case.
+struct Utf8Case {
+  const PairCaseRow* rows;
+  const uint8_t* row;       // by first byte of two, from 1 on; 0: ...
+  const uint8_t* caseless;  // ... where this is 0 too some of its characters may have another case, else none
+  const uint16_t* special;  // characters of two bytes that are left
+  size_t specials;
+  bool upper;
+};
+inline constexpr size_t kMappedBytes = 64 + 2;  // of characters that begin in a block, at most
+
+/// Characters of which some are left to be mapped otherwise.
+struct MappedBlock {
+  uint64_t left;  // where these begin, one bit a byte; 0: none, and `bytes` are not filled
+  uint8_t bytes[kMappedBytes];
+};
+
 /// One choice of loops. They read nothing behind the end of a text, and write nothing behind their last unit but for
 /// a slack.
 struct Vectors {
@@ -78,6 +102,13 @@ struct Vectors {
 
   /// Looks up `count` bytes in a table of bytes.
   void (*translate)(const uint8_t table[256], const uint8_t* p, size_t count, uint8_t* to);
+
+  /// From so many bytes on characters of UTF-8 are mapped by blocks.
+  size_t least_mapped;
+  /// Maps characters of UTF-8 at the start of `count` bytes, well-formed and of at most three bytes, which keep their
+  /// length: how many bytes they have. When some are left to others, nothing is written but to `block`, where these stand
+  /// as they are; else to `to`, which may be `p`.
+  size_t (*map_utf8)(const Utf8Case& how, const uint8_t* p, size_t count, uint8_t* to, MappedBlock* block);
 
   // Write characters where all of them fit: where they end. As UTF-8, ...
   uint8_t* (*write_utf8)(uint8_t* p, const uint16_t* values, size_t count);

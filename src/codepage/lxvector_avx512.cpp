@@ -55,6 +55,17 @@ LX_TARGET inline void store_units(uint16_t* to, __m512i units, size_t count, boo
     _mm512_mask_storeu_epi16(to, static_cast<__mmask32>(ones(count)), units);
 }
 
+LX_TARGET inline Marks marks_of(__m512i block, uint64_t high, uint64_t inside) {
+  Marks marks;
+  marks.trails = _mm512_cmplt_epi8_mask(block, _mm512_set1_epi8(static_cast<char>(0xC0)));
+  marks.leads = inside & ~marks.trails;
+  marks.three = _mm512_cmpge_epu8_mask(block, _mm512_set1_epi8(static_cast<char>(0xE0)));
+  marks.others =
+      _mm512_cmpge_epu8_mask(block, _mm512_set1_epi8(static_cast<char>(0xF0))) |
+      _mm512_mask_cmplt_epu8_mask(high & marks.leads, block, _mm512_set1_epi8(static_cast<char>(0xC2)));
+  return marks;
+}
+
 LX_TARGET ReadRun read_utf8(const uint8_t* q, const uint8_t* end, uint16_t* values, size_t most, RunRule rule) {
   const bool all = rule.slack >= kBytes;
   size_t n = 0;
@@ -70,13 +81,8 @@ LX_TARGET ReadRun read_utf8(const uint8_t* q, const uint8_t* end, uint16_t* valu
       n += kBytes;
       continue;
     }
-    Marks marks;
-    marks.trails = _mm512_cmplt_epi8_mask(block, _mm512_set1_epi8(static_cast<char>(0xC0)));
-    marks.leads = inside & ~marks.trails;
-    marks.three = _mm512_cmpge_epu8_mask(block, _mm512_set1_epi8(static_cast<char>(0xE0)));
+    const Marks marks = marks_of(block, high, inside);
     const uint64_t longer = high & marks.leads;
-    marks.others = _mm512_cmpge_epu8_mask(block, _mm512_set1_epi8(static_cast<char>(0xF0))) |
-                   _mm512_mask_cmplt_epu8_mask(longer, block, _mm512_set1_epi8(static_cast<char>(0xC2)));
     unsigned used = marks.usable(longer, static_cast<unsigned>(bytes));
     uint64_t leads = marks.leads & ones(used);
     auto chars = static_cast<size_t>(__builtin_popcountll(leads));
@@ -331,6 +337,62 @@ LX_TARGET inline unsigned first_of(__m512i units, __mmask32 which) {
       _mm_cvtsi128_si32(_mm512_castsi512_si128(_mm512_maskz_compress_epi16(which, units))));
 }
 
+constexpr size_t kLeastMapped = 8;
+
+/// Where a character of two bytes stands.
+LX_TARGET inline uint64_t places_of_pair(unsigned u, __m512i block, __m512i next) {
+  return _mm512_cmpeq_epi8_mask(block, _mm512_set1_epi8(static_cast<char>(0xC0 | u >> 6))) &
+         _mm512_cmpeq_epi8_mask(next, _mm512_set1_epi8(static_cast<char>(0x80 | (u & 0x3F))));
+}
+
+LX_TARGET size_t map_utf8(const Utf8Case& how, const uint8_t* p, size_t count, uint8_t* to,
+                          MappedBlock* mapped) {
+  auto used = static_cast<unsigned>(least(count, kBytes));
+  const uint64_t inside = ones(used);
+  const __m512i block = _mm512_maskz_loadu_epi8(inside, p);
+  const __m512i above = _mm512_sub_epi8(block, _mm512_set1_epi8(how.upper ? 'a' : 'A'));
+  const __mmask64 letters = _mm512_cmplt_epu8_mask(above, _mm512_set1_epi8(26));
+  __m512i result = _mm512_xor_si512(block, _mm512_maskz_set1_epi8(letters, 0x20));
+  const uint64_t high = _mm512_movepi8_mask(block);
+  uint64_t left = 0;
+  if (high != 0) {
+    const Marks marks = marks_of(block, high, inside);
+    const uint64_t longer = high & marks.leads;
+    used = marks.usable(longer, used);
+    const __m512i next = _mm512_maskz_loadu_epi8(inside >> 1, p + 1);
+    const __m512i caseless = _mm512_permutex2var_epi8(_mm512_loadu_si512(how.caseless + 0x80), block,
+                                                      _mm512_loadu_si512(how.caseless + 0xC0));
+    const uint64_t cased = longer & ones(used) & _mm512_testn_epi8_mask(caseless, caseless);
+    left = marks.three;
+    for (size_t i = 0; i < how.specials; ++i) left |= places_of_pair(how.special[i], block, next);
+    left &= cased;
+    // First byte by first byte: a text has few.
+    for (uint64_t pairs = cased & ~left; pairs != 0;) {
+      const uint8_t first = p[__builtin_ctzll(pairs)];
+      uint64_t here = _mm512_mask_cmpeq_epi8_mask(pairs, block, _mm512_set1_epi8(static_cast<char>(first)));
+      pairs &= ~here;
+      if (how.row[first] != 0) {
+        const PairCaseRow& row = how.rows[how.row[first] - 1];
+        const __m512i firsts = _mm512_permutexvar_epi8(next, _mm512_loadu_si512(row.first));
+        const __m512i seconds = _mm512_permutexvar_epi8(block, _mm512_loadu_si512(row.second));
+        const uint64_t far = _mm512_mask_testn_epi8_mask(here, firsts, firsts);
+        here &= ~far;
+        left |= far;
+        result = _mm512_mask_mov_epi8(result, here, firsts);
+        result = _mm512_mask_mov_epi8(result, here << 1, seconds);
+      } else {
+        left |= here;
+      }
+    }
+  }
+  mapped->left = left;
+  if (left == 0)
+    _mm512_mask_storeu_epi8(to, ones(used), result);
+  else
+    _mm512_storeu_si512(mapped->bytes, result);
+  return used;
+}
+
 LX_TARGET uint8_t* write_bytes(const PairCodes& at, uint8_t* p, const uint16_t* values, size_t count) {
   for (size_t i = 0; i < count; i += kUnits) {
     const auto inside = static_cast<__mmask32>(ones(least(count - i, kUnits)));
@@ -353,8 +415,9 @@ LX_TARGET uint8_t* write_bytes(const PairCodes& at, uint8_t* p, const uint16_t* 
 
 }  // namespace
 
-const Vectors kAvx512Vectors = {"AVX-512", 1,       kLeastPassed, pass,       read_utf8,   read_pairs,
-                                copy_same, look_up, translate,    write_utf8, write_pairs, write_bytes};
+const Vectors kAvx512Vectors = {"AVX-512",  1,          kLeastPassed, pass,       read_utf8,
+                                read_pairs, copy_same,  look_up,      translate,  kLeastMapped,
+                                map_utf8,   write_utf8, write_pairs,  write_bytes};
 
 bool has_avx512() {
   return __builtin_cpu_supports("avx512vbmi2") && __builtin_cpu_supports("avx512vbmi") &&
