@@ -135,7 +135,7 @@ void map_all(Text& text, const Mapper& mapper, const SpecialFilter& filter, cons
   for (;;) {
     if constexpr (Text::kRuns && Mapper::kCase) {
       if constexpr (std::is_same_v<Text, LeadByteText>)
-        if (runs.utf8 && most_units(text) >= vectors->least_mapped) map_utf8(text, runs, filter);
+        if (most_units(text) >= runs.utf8_from) map_utf8(text, runs, filter);
       if (text.in.p != text.in.end && *text.in.p < runs.below) map_run(text, runs, filter);
       if (map_rest(text, runs, filter)) continue;
     }

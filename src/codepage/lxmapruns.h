@@ -8,6 +8,8 @@
 namespace lx {
 
 inline constexpr size_t kLongText = 2 * kBlock;  // units from which on preparing a faster way pays
+inline constexpr size_t kUtf8Block = 8 * sizeof(size_t);
+inline constexpr size_t kLongUtf8 = kUtf8Block + 2;  // of characters that begin in a block, at most
 
 /// The special mappings that a call uses, and which characters may begin one: below U+0100 exactly, above by
 /// their low byte.
@@ -15,12 +17,16 @@ class SpecialFilter {
  public:
   SpecialFilter(const LXObject& language, bool used, bool upper)
       : specials_(used ? specials_of(language, upper) : Specials{nullptr, 0}) {
+    uint16_t last = 0;
     for (size_t i = 0; i < specials_.count; ++i) {
       const uint16_t first = specials_.entry(i).first;
-      if (firsts_ != 0 && first_[firsts_ - 1] == first) continue;  // those of one character stand together
+      if (i != 0 && first == last) continue;  // those of one character stand together
+      last = first;
       const unsigned slot = slot_of(first);
       bits_[slot / 32] |= 1u << slot % 32;
-      if (few()) first_[firsts_++] = first;
+      if (first < 0x80 || first > 0x7FF || first == pair_) continue;
+      one_pair_ = pair_ == 0;
+      pair_ = first;
     }
   }
   bool any() const { return specials_.count != 0; }
@@ -30,18 +36,16 @@ class SpecialFilter {
     return (bits_[slot / 32] >> slot % 32 & 1) != 0;
   }
   const Specials& specials() const { return specials_; }
-  /// The characters that begin one, where they are few.
-  bool few() const { return firsts_ < kFew; }
-  const uint16_t* first() const { return first_; }
-  size_t firsts() const { return firsts_; }
+  /// The one that begins some of those that are two bytes in UTF-8, 0 for none; only where there is just one.
+  uint16_t pair() const { return pair_; }
+  bool one_pair() const { return one_pair_; }
 
  private:
   static unsigned slot_of(uint16_t u) { return (u & 0xFFu) | (u > 0xFF ? 0x100u : 0); }
   Specials specials_;
-  static constexpr size_t kFew = 4;
   uint32_t bits_[16] = {};
-  uint16_t first_[kFew];
-  size_t firsts_ = 0;  // kFew: there may be more
+  uint16_t pair_ = 0;
+  bool one_pair_ = true;
 };
 
 // Runs of characters of one unit whose case one table tells.
@@ -60,20 +64,21 @@ struct Runs {
   const uint8_t* table;
   unsigned below;  // units under this are characters, and the table has their case
   bool blocks;     // ... under 0x80 the case of ASCII, and none of these is special
-  bool utf8;       // ... and the others are those of UTF-8
   bool upper;
+  size_t utf8_from;  // so many units of UTF-8 are mapped by map_utf8()
 };
 
 inline Runs runs_of(const UnicodeText&, const SpecialFilter& filter, bool upper) {
-  return {kAsciiCase[upper].to, kAscii, !filter.any_ascii(), false, upper};
+  return {kAsciiCase[upper].to, kAscii, !filter.any_ascii(), upper, SIZE_MAX};
 }
 inline Runs runs_of(const LeadByteText& text, const SpecialFilter& filter, bool upper) {
   const uint8_t* table = text.in.cp.payload + (upper ? format::codepage::kUpper : format::codepage::kLower);
-  if (text.in.cp.single_byte) return {table, 0x100, false, false, upper};
-  if (text.in.cp.same_below < kAscii) return {table, 0, false, false, upper};
+  if (text.in.cp.single_byte) return {table, 0x100, false, upper, SIZE_MAX};
+  if (text.in.cp.same_below < kAscii) return {table, 0, false, upper, SIZE_MAX};
   const bool blocks = text.in.cp.plain_case && !filter.any_ascii() && most_units(text) >= kLongText;
-  const bool utf8 = text.in.cp.plain_utf8 && text.in.cp.pair_case[upper].bytes != nullptr && filter.few();
-  return {table, kAscii, blocks, blocks && utf8, upper};
+  const bool utf8 = text.in.cp.plain_utf8 && text.in.cp.pair_case[upper].bytes != nullptr && filter.one_pair();
+  return {table, kAscii, blocks, upper,
+          blocks && utf8 ? vectors->map_utf8 != nullptr ? kBlock : kLongUtf8 : SIZE_MAX};
 }
 
 inline uint16_t unicode_of(const UnicodeText&, uint16_t u) {
@@ -117,32 +122,45 @@ template <class Text>
   return code_bytes(code) == length;
 }
 
-/// Maps characters of UTF-8 by blocks. Ends before one that map_long_utf8() leaves.
+/// What Vectors::map_utf8 does, with all characters of several bytes left.
+inline size_t map_utf8_block(const uint8_t* p, size_t count, bool upper, uint8_t* to, MappedBlock* block) {
+  size_t begins, bytes;
+  if (count < kLongUtf8 || !find_long_utf8<kUtf8Block>(p, &begins, &bytes)) return 0;
+  memcpy(block->given, p, kLongUtf8);
+  memcpy(block->before, to, kLongUtf8);
+  for (size_t i = 0; i < kUtf8Block; i += kBlock) case_block(to + i, block->given + i, upper);
+  for (size_t i = kUtf8Block; i < bytes; ++i) to[i] = block->given[i];
+  block->left = begins;
+  return bytes;
+}
+
+/// Maps characters of UTF-8 by blocks, and in their places those that these leave. Ends before one that map_long_utf8()
+/// leaves too.
 inline void map_utf8(LeadByteText& text, const Runs& runs, const SpecialFilter& filter) {
   const Codepage& cp = text.in.cp;
   const PairCase pairs = cp.pair_case[runs.upper];
-  const Utf8Case how{pairs.bytes, pairs.row, cp.caseless, filter.first(), filter.firsts(), runs.upper};
+  const Utf8Case how{pairs.bytes, pairs.row, cp.caseless, filter.pair(), runs.upper};
+  const auto map_block = vectors->map_utf8;
   const uint32_t mask = runs.upper ? LX_C1_LOWER : LX_C1_UPPER;
+  const bool special = filter.any();
   const uint8_t* p = text.in.p;
   uint8_t* to = text.out.p;
   const uint8_t* const end = p + most_units(text);
   MappedBlock block;
-  for (size_t bytes; (bytes = vectors->map_utf8(how, p, room(p, end), to, &block)) != 0;
-       p += bytes, to += bytes) {
-    uint64_t left = block.left;
-    if (left == 0) continue;
-    for (; left != 0; left &= left - 1) {
-      const auto at = static_cast<size_t>(__builtin_ctzll(left));
-      const bool maybe = filter.any() && filter.may_begin(utf8_unicode(p + at));
-      if (!maybe && map_long_utf8(cp, pairs, p + at, mask, block.bytes + at)) continue;
+  for (block.left = 0; block.left == 0;) {
+    size_t bytes = map_block != nullptr ? map_block(how, p, room(p, end), to, &block)
+                                        : map_utf8_block(p, room(p, end), runs.upper, to, &block);
+    if (bytes == 0) break;
+    for (; block.left != 0; block.left &= block.left - 1) {
+      const auto at = static_cast<size_t>(__builtin_ctzll(block.left));
+      const bool maybe = special && filter.may_begin(utf8_unicode(block.given + at));
+      if (!maybe && map_long_utf8(cp, pairs, block.given + at, mask, to + at)) continue;
+      memcpy(to + at, block.before + at, bytes - at);  // nothing is written behind the last character
       bytes = at;
       break;
     }
-    memcpy(to, block.bytes, bytes);
-    if (left == 0) continue;
     p += bytes;
     to += bytes;
-    break;
   }
   text.in.p = p;
   text.out.p = to;

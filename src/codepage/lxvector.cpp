@@ -125,17 +125,6 @@ void translate(const uint8_t table[256], const uint8_t* p, size_t count, uint8_t
   for (size_t i = 0; i < count; ++i) to[i] = table[p[i]];
 }
 
-size_t map_utf8(const Utf8Case& how, const uint8_t* p, size_t count, uint8_t* to, MappedBlock* block) {
-  constexpr size_t kBytes = CharBlock::kBytes;
-  size_t begins, bytes;
-  if (count < kBaseLeastMapped || !find_long_utf8<kBytes>(p, &begins, &bytes)) return 0;
-  block->left = begins;
-  uint8_t* const mapped = begins == 0 ? to : block->bytes;
-  for (size_t i = 0; i < kBytes; i += kBlock) case_block(mapped + i, p + i, how.upper);
-  for (size_t i = kBytes; i < bytes; ++i) mapped[i] = p[i];
-  return bytes;
-}
-
 uint8_t* write_utf8(uint8_t* p, const uint16_t* values, size_t count) {
   size_t i = 0;
   while (i < count) {
@@ -221,8 +210,8 @@ constexpr Vectors kBaseVectors = {kVectors ? "SSE2" : "none",
                                   base::copy_same,
                                   base::look_up,
                                   base::translate,
-                                  kBaseLeastMapped,
-                                  base::map_utf8,
+
+                                  nullptr,
                                   base::write_utf8,
                                   base::write_pairs,
                                   base::write_bytes};

@@ -60,16 +60,17 @@ struct Utf8Case {
   const PairCaseRow* rows;
   const uint8_t* row;       // by first byte of two, from 1 on; 0: ...
   const uint8_t* caseless;  // ... where this is 0 too some of its characters may have another case, else none
-  const uint16_t* special;  // characters of two bytes that are left
-  size_t specials;
+  uint16_t special;         // a character of two bytes that is left; 0: none
   bool upper;
 };
-inline constexpr size_t kMappedBytes = 64 + 2;  // of characters that begin in a block, at most
+inline constexpr size_t kMappedBytes = 64 + 2;  // of a block, and more that belong to its last character
 
-/// Characters of which some are left to be mapped otherwise.
+/// Which characters of those that were mapped are left to be mapped otherwise.
 struct MappedBlock {
-  uint64_t left;  // where these begin, one bit a byte; 0: none, and `bytes` are not filled
-  uint8_t bytes[kMappedBytes];
+  uint64_t left;  // where they begin, one bit a byte
+  // Filled when there are any: what stands in the text, and what stood where the mapped ones are now.
+  uint8_t given[kMappedBytes];
+  uint8_t before[kMappedBytes];
 };
 
 /// One choice of loops. They read nothing behind the end of a text, and write nothing behind their last unit but for
@@ -103,11 +104,9 @@ struct Vectors {
   /// Looks up `count` bytes in a table of bytes.
   void (*translate)(const uint8_t table[256], const uint8_t* p, size_t count, uint8_t* to);
 
-  /// From so many bytes on characters of UTF-8 are mapped by blocks.
-  size_t least_mapped;
   /// Maps characters of UTF-8 at the start of `count` bytes, well-formed and of at most three bytes, which keep their
-  /// length: how many bytes they have. When some are left to others, nothing is written but to `block`, where these stand
-  /// as they are; else to `to`, which may be `p`.
+  /// length: how many bytes they have. Those of two bytes that are left may be anything in `to`, longer ones are as they
+  /// were. `to` may be `p`. Null where vectors do not tell the case of other characters than ASCII.
   size_t (*map_utf8)(const Utf8Case& how, const uint8_t* p, size_t count, uint8_t* to, MappedBlock* block);
 
   // Write characters where all of them fit: where they end. As UTF-8, ...

@@ -337,8 +337,6 @@ LX_TARGET inline unsigned first_of(__m512i units, __mmask32 which) {
       _mm_cvtsi128_si32(_mm512_castsi512_si128(_mm512_maskz_compress_epi16(which, units))));
 }
 
-constexpr size_t kLeastMapped = 8;
-
 /// Where a character of two bytes stands.
 LX_TARGET inline uint64_t places_of_pair(unsigned u, __m512i block, __m512i next) {
   return _mm512_cmpeq_epi8_mask(block, _mm512_set1_epi8(static_cast<char>(0xC0 | u >> 6))) &
@@ -364,20 +362,19 @@ LX_TARGET size_t map_utf8(const Utf8Case& how, const uint8_t* p, size_t count, u
                                                       _mm512_loadu_si512(how.caseless + 0xC0));
     const uint64_t cased = longer & ones(used) & _mm512_testn_epi8_mask(caseless, caseless);
     left = marks.three;
-    for (size_t i = 0; i < how.specials; ++i) left |= places_of_pair(how.special[i], block, next);
+    if (how.special != 0) left |= places_of_pair(how.special, block, next);
     left &= cased;
     // First byte by first byte: a text has few.
-    for (uint64_t pairs = cased & ~left; pairs != 0;) {
+    for (uint64_t pairs = cased & ~marks.three; pairs != 0;) {
       const uint8_t first = p[__builtin_ctzll(pairs)];
-      uint64_t here = _mm512_mask_cmpeq_epi8_mask(pairs, block, _mm512_set1_epi8(static_cast<char>(first)));
+      const uint64_t here =
+          _mm512_mask_cmpeq_epi8_mask(pairs, block, _mm512_set1_epi8(static_cast<char>(first)));
       pairs &= ~here;
       if (how.row[first] != 0) {
         const PairCaseRow& row = how.rows[how.row[first] - 1];
         const __m512i firsts = _mm512_permutexvar_epi8(next, _mm512_loadu_si512(row.first));
         const __m512i seconds = _mm512_permutexvar_epi8(block, _mm512_loadu_si512(row.second));
-        const uint64_t far = _mm512_mask_testn_epi8_mask(here, firsts, firsts);
-        here &= ~far;
-        left |= far;
+        left |= _mm512_mask_testn_epi8_mask(here, firsts, firsts);
         result = _mm512_mask_mov_epi8(result, here, firsts);
         result = _mm512_mask_mov_epi8(result, here << 1, seconds);
       } else {
@@ -386,10 +383,11 @@ LX_TARGET size_t map_utf8(const Utf8Case& how, const uint8_t* p, size_t count, u
     }
   }
   mapped->left = left;
-  if (left == 0)
-    _mm512_mask_storeu_epi8(to, ones(used), result);
-  else
-    _mm512_storeu_si512(mapped->bytes, result);
+  if (left != 0) {
+    _mm512_storeu_si512(mapped->given, block);
+    _mm512_storeu_si512(mapped->before, _mm512_maskz_loadu_epi8(ones(used), to));
+  }
+  _mm512_mask_storeu_epi8(to, ones(used), result);
   return used;
 }
 
@@ -415,9 +413,9 @@ LX_TARGET uint8_t* write_bytes(const PairCodes& at, uint8_t* p, const uint16_t* 
 
 }  // namespace
 
-const Vectors kAvx512Vectors = {"AVX-512",  1,          kLeastPassed, pass,       read_utf8,
-                                read_pairs, copy_same,  look_up,      translate,  kLeastMapped,
-                                map_utf8,   write_utf8, write_pairs,  write_bytes};
+const Vectors kAvx512Vectors = {"AVX-512",  1,           kLeastPassed, pass,      read_utf8,
+                                read_pairs, copy_same,   look_up,      translate, map_utf8,
+                                write_utf8, write_pairs, write_bytes};
 
 bool has_avx512() {
   return __builtin_cpu_supports("avx512vbmi2") && __builtin_cpu_supports("avx512vbmi") &&

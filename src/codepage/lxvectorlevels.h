@@ -17,7 +17,6 @@ ReadRun read_pairs(const PairRows& pairs, const uint8_t* q, const uint8_t* end, 
 bool copy_same(uint8_t* to, const uint8_t* from, size_t count, unsigned below);
 void look_up(const uint16_t table[256], const uint8_t* p, size_t count, uint16_t* values, RunRule);
 void translate(const uint8_t table[256], const uint8_t* p, size_t count, uint8_t* to);
-size_t map_utf8(const Utf8Case& how, const uint8_t* p, size_t count, uint8_t* to, MappedBlock* block);
 uint8_t* write_utf8(uint8_t* p, const uint16_t* values, size_t count);
 uint8_t* write_pairs(const PairCodes& codes, uint8_t* p, const uint16_t* values, size_t count);
 uint8_t* write_bytes(const PairCodes& codes, uint8_t* p, const uint16_t* values, size_t count);
@@ -26,7 +25,6 @@ uint8_t* write_bytes(const PairCodes& codes, uint8_t* p, const uint16_t* values,
 
 inline constexpr size_t kBasePivotBytes = 48;
 inline constexpr size_t kBaseLeastPassed = CharBlock::kBytes;
-inline constexpr size_t kBaseLeastMapped = 8 * sizeof(size_t) + 2;
 
 /// Which bytes of a block of multibyte text begin characters, one bit a byte. No character waits for the length of the
 /// one before.
