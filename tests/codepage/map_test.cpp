@@ -120,6 +120,15 @@ TEST_F(Map, EveryFormFollowsTheModel) {
   }
 }
 
+/// A block of UTF-8 knows one special mapping of a character of two bytes: here are two.
+TEST_F(Map, SpecialMappingsInLongText) {
+  LXLocale* const in = library.locale(case_codepage("UTF8"), "Kana");
+  const std::string run(40, 'B'), text = run + "\u00C4" + run + "\u00D6" + run;
+  char out[200] = {};
+  LXMapString(in, out, 200, text.c_str(), -1, LX_MAP_LOWER);
+  EXPECT_EQ(out, std::string(40, 'b') + 'q' + std::string(40, 'b') + 'w' + std::string(40, 'b'));
+}
+
 /// Every output is the longest valid text that fits and returns to the state of the input.
 TEST_F(Map, ShiftStatesStayValid) {
   const TinyCodepage& cp = case_codepage("SHIFT");
