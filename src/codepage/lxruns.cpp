@@ -204,20 +204,11 @@ void SingleByteSink::put_run(const LXUChar* values, size_t count) {
 
 template <>
 void MultiByteSink::put_run(const LXUChar* values, size_t count) {
-  if (cp.codes16 == nullptr) {
-    // All bytes that a code may have are stored, where enough characters follow.
-    for (; count > kMaxCharBytes; ++values, --count) {
-      const uint32_t code = row_code(cp, *values);
-      const size_t bytes = code_bytes(code);
-      put_le32(p, __builtin_bswap32(code << 8 * (kMaxCharBytes - bytes)));
-      p += bytes;
-    }
-    for (; count != 0; ++values, --count) put(*values);
-    return;
-  }
   const PairCodes codes{cp.page_start, cp.codes16};
-  p = put_values(p, values, count, cp.same_below,
-                 [&](const LXUChar* v, size_t n, uint8_t* q) { return vectors->write_pairs(codes, q, v, n); });
+  const WideCodes wide{cp.page_start, cp.codes32};
+  p = put_values(p, values, count, cp.same_below, [&](const LXUChar* v, size_t n, uint8_t* q) {
+    return wide.codes != nullptr ? vectors->write_wide(wide, q, v, n) : vectors->write_pairs(codes, q, v, n);
+  });
 }
 
 /// Writes blocks of characters: a shift byte and two bytes are stored for every one, and those that it does not have are

@@ -180,6 +180,21 @@ uint8_t* write_pairs(const PairCodes& codes, uint8_t* p, const uint16_t* values,
   return p;
 }
 
+uint8_t* write_wide(const WideCodes& codes, uint8_t* p, const uint16_t* values, size_t count) {
+  const WideCodes at = codes;
+  for (; count != 0; ++values, --count) {
+    const uint32_t code = at.codes[at.page_start[*values >> 8] + (*values & 0xFFu)];
+    const size_t bytes = code_bytes(code);
+    // All bytes that a code may have are stored, where enough characters follow.
+    if (count > kMaxCharBytes)
+      put_le32(p, __builtin_bswap32(code << 8 * (kMaxCharBytes - bytes)));
+    else
+      store_code(p, code, bytes);
+    p += bytes;
+  }
+  return p;
+}
+
 uint8_t* write_bytes(const PairCodes& codes, uint8_t* p, const uint16_t* values, size_t count) {
   constexpr size_t kBatch = 8;
   const PairCodes at = codes;
@@ -214,6 +229,7 @@ constexpr Vectors kBaseVectors = {kVectors ? "SSE2" : "none",
                                   nullptr,
                                   base::write_utf8,
                                   base::write_pairs,
+                                  base::write_wide,
                                   base::write_bytes};
 
 }  // namespace

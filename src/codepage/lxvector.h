@@ -48,6 +48,12 @@ struct PairCodes {
   const uint16_t* codes;
 };
 
+/// The same of codes of up to four bytes.
+struct WideCodes {
+  const uint32_t* page_start;
+  const uint32_t* codes;
+};
+
 /// The other case of characters of two bytes of UTF-8 that have the same first byte, by the six bits of the second byte
 /// that count.
 struct PairCaseRow {
@@ -113,6 +119,8 @@ struct Vectors {
   uint8_t* (*write_utf8)(uint8_t* p, const uint16_t* values, size_t count);
   // ... as codes of one byte and two, ...
   uint8_t* (*write_pairs)(const PairCodes& codes, uint8_t* p, const uint16_t* values, size_t count);
+  // ... as codes of up to four, ...
+  uint8_t* (*write_wide)(const WideCodes& codes, uint8_t* p, const uint16_t* values, size_t count);
   // ... and as codes of one byte.
   uint8_t* (*write_bytes)(const PairCodes& codes, uint8_t* p, const uint16_t* values, size_t count);
 };

@@ -289,19 +289,26 @@ LX_TARGET void look_up(const uint16_t table[256], const uint8_t* p, size_t count
   }
 }
 
-/// The codes of 16 values.
-LX_TARGET inline __m512i codes_of(const PairCodes& at, __mmask16 which, const uint16_t* values) {
+// So many characters and more are looked up side by side.
+constexpr size_t kManyPairs = 12;
+constexpr size_t kManyWide = 8;
+
+/// Where the codes of 16 values stand.
+LX_TARGET inline __m512i places_of_codes(const uint32_t* page_start, __mmask16 which, const uint16_t* values) {
   const __m512i u = _mm512_cvtepu16_epi32(_mm256_maskz_loadu_epi16(which, values));
   const __m512i start =
-      _mm512_mask_i32gather_epi32(_mm512_setzero_si512(), which, _mm512_srli_epi32(u, 8), at.page_start, 4);
-  const __m512i place = _mm512_add_epi32(start, _mm512_and_si512(u, _mm512_set1_epi32(0xFF)));
+      _mm512_mask_i32gather_epi32(_mm512_setzero_si512(), which, _mm512_srli_epi32(u, 8), page_start, 4);
+  return _mm512_add_epi32(start, _mm512_and_si512(u, _mm512_set1_epi32(0xFF)));
+}
+
+LX_TARGET inline __m512i codes_of(const PairCodes& at, __mmask16 which, const uint16_t* values) {
+  const __m512i place = places_of_codes(at.page_start, which, values);
   const __m512i codes = _mm512_mask_i32gather_epi32(_mm512_setzero_si512(), which, place, at.codes, 2);
   return _mm512_and_si512(codes, _mm512_set1_epi32(0xFFFF));  // the upper half is of another value
 }
 
 LX_TARGET uint8_t* write_pairs(const PairCodes& at, uint8_t* p, const uint16_t* values, size_t count) {
-  constexpr size_t kWorthIt = 32;
-  if (count < kWorthIt) return base::write_pairs(at, p, values, count);
+  if (count < kManyPairs) return base::write_pairs(at, p, values, count);
   for (size_t i = 0; i < count; i += 16) {
     const auto inside = static_cast<__mmask16>(ones(least(count - i, 16)));
     const __m512i codes = codes_of(at, inside, values + i);
@@ -313,6 +320,34 @@ LX_TARGET uint8_t* write_pairs(const PairCodes& at, uint8_t* p, const uint16_t* 
     const __mmask32 which = _mm256_movepi8_mask(kept) & _mm256_movepi8_mask(_mm256_movm_epi16(inside));
     const auto written = static_cast<size_t>(__builtin_popcount(which));
     _mm256_mask_storeu_epi8(p, static_cast<__mmask32>(ones(written)), _mm256_maskz_compress_epi8(which, bytes));
+    p += written;
+  }
+  return p;
+}
+
+/// Of each of 16 codes that `which` has, one of its four bytes.
+LX_TARGET inline uint64_t byte_of_each(__mmask16 which, unsigned at) {
+  return _pdep_u64(which, UINT64_MAX / 15 << at);
+}
+
+LX_TARGET uint8_t* write_wide(const WideCodes& at, uint8_t* p, const uint16_t* values, size_t count) {
+  if (count < kManyWide) return base::write_wide(at, p, values, count);
+  const __m512i first_byte_first = _mm512_set4_epi32(0x0C0D0E0F, 0x08090A0B, 0x04050607, 0x00010203);
+  for (size_t i = 0; i < count; i += 16) {
+    const auto inside = static_cast<__mmask16>(ones(least(count - i, 16)));
+    const __m512i places = places_of_codes(at.page_start, inside, values + i);
+    __m512i codes = _mm512_mask_i32gather_epi32(_mm512_setzero_si512(), inside, places, at.codes, 4);
+    const __mmask16 two = _mm512_cmpgt_epu32_mask(codes, _mm512_set1_epi32(0xFF));
+    const __mmask16 three = _mm512_cmpgt_epu32_mask(codes, _mm512_set1_epi32(0xFFFF));
+    const __mmask16 four = _mm512_cmpgt_epu32_mask(codes, _mm512_set1_epi32(0xFFFFFF));
+    codes = _mm512_mask_slli_epi32(codes, static_cast<__mmask16>(~two), codes, 8);
+    codes = _mm512_mask_slli_epi32(codes, static_cast<__mmask16>(~three), codes, 8);
+    codes = _mm512_mask_slli_epi32(codes, static_cast<__mmask16>(~four), codes, 8);
+    const uint64_t which =
+        byte_of_each(inside, 0) | byte_of_each(two, 1) | byte_of_each(three, 2) | byte_of_each(four, 3);
+    const auto written = static_cast<size_t>(__builtin_popcountll(which));
+    _mm512_mask_storeu_epi8(p, ones(written),
+                            _mm512_maskz_compress_epi8(which, _mm512_shuffle_epi8(codes, first_byte_first)));
     p += written;
   }
   return p;
@@ -413,9 +448,9 @@ LX_TARGET uint8_t* write_bytes(const PairCodes& at, uint8_t* p, const uint16_t* 
 
 }  // namespace
 
-const Vectors kAvx512Vectors = {"AVX-512",  1,           kLeastPassed, pass,      read_utf8,
-                                read_pairs, copy_same,   look_up,      translate, map_utf8,
-                                write_utf8, write_pairs, write_bytes};
+const Vectors kAvx512Vectors = {"AVX-512",  1,           kLeastPassed, pass,       read_utf8,
+                                read_pairs, copy_same,   look_up,      translate,  map_utf8,
+                                write_utf8, write_pairs, write_wide,   write_bytes};
 
 bool has_avx512() {
   return __builtin_cpu_supports("avx512vbmi2") && __builtin_cpu_supports("avx512vbmi") &&

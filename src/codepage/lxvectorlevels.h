@@ -19,6 +19,7 @@ void look_up(const uint16_t table[256], const uint8_t* p, size_t count, uint16_t
 void translate(const uint8_t table[256], const uint8_t* p, size_t count, uint8_t* to);
 uint8_t* write_utf8(uint8_t* p, const uint16_t* values, size_t count);
 uint8_t* write_pairs(const PairCodes& codes, uint8_t* p, const uint16_t* values, size_t count);
+uint8_t* write_wide(const WideCodes& codes, uint8_t* p, const uint16_t* values, size_t count);
 uint8_t* write_bytes(const PairCodes& codes, uint8_t* p, const uint16_t* values, size_t count);
 
 }  // namespace base
