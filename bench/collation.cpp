@@ -16,7 +16,6 @@ namespace bench {
 namespace {
 
 constexpr size_t kWords = 50000;
-constexpr size_t kComparedWords = 2000;  // they stay in the second-level cache
 
 struct Subject {
   const char* language;
@@ -54,7 +53,7 @@ Words words_of(const std::vector<std::u16string>& all) {
 
 Words part_of(const std::vector<Word>& words, size_t start) {
   const auto first = words.begin() + static_cast<std::ptrdiff_t>(std::min(start, words.size()));
-  const size_t n = std::min<size_t>(kComparedWords, static_cast<size_t>(words.end() - first));
+  const size_t n = std::min<size_t>(kManyPieces, static_cast<size_t>(words.end() - first));
   return std::make_shared<std::vector<Word>>(first, first + static_cast<std::ptrdiff_t>(n));
 }
 

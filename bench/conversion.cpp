@@ -12,7 +12,6 @@ namespace {
 
 constexpr size_t kLongBytes = 1000000;
 constexpr size_t kShortBytes = 24;
-constexpr size_t kShortStrings = 500;  // they stay in the first-level cache
 
 /// Conversions to and from these: UTF-16 each, and UTF-8 where it is not the codepage itself.
 struct Subject {
@@ -122,7 +121,7 @@ Input long_piece(const Codepage& measure, const Codepage& from, const std::u16st
 Input short_pieces(const Codepage& measure, const Codepage& from, const std::u16string& text) {
   auto pieces = std::make_shared<Pieces>();
   size_t start = 0;
-  while (pieces->ends.size() < kShortStrings && start < text.size()) {
+  while (pieces->ends.size() < kManyPieces && start < text.size()) {
     size_t chars = 1;
     const auto fits = [&](size_t n) {
       return measure.encode(closed(text.substr(start, n), measure)).size() <= kShortBytes;

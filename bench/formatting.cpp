@@ -18,7 +18,6 @@
 namespace bench {
 namespace {
 
-constexpr size_t kValues = 500;
 constexpr int32_t kRoomUnits = 128;  // for one text
 
 enum class Form { kCodepage, kUtf8, kUtf16 };
@@ -69,7 +68,7 @@ struct Values {
 Values make_values() {
   std::mt19937 random(1);
   Values values;
-  for (size_t i = 0; i < kValues; ++i) {
+  for (size_t i = 0; i < kManyPieces; ++i) {
     const int digits = static_cast<int>(random() % 9) + 1;
     const auto integer = static_cast<int32_t>(random() % static_cast<uint32_t>(std::pow(10, digits)));
     values.integers.push_back(random() % 4 == 0 ? -integer : integer);
@@ -136,7 +135,7 @@ class RowMaker {
 
   bool start(std::string name, LXLocale* locale) {
     if (!table_.wants(name)) return false;
-    row_ = {std::move(name), {}, 0, kValues, kRoomUnits * sizeof(LXUChar), Same::kNothing};
+    row_ = {std::move(name), {}, 0, kManyPieces, kRoomUnits * sizeof(LXUChar), Same::kNothing};
     locale_ = locale;
     texts_.clear();
     return true;
@@ -148,7 +147,7 @@ class RowMaker {
   void writer(const char* name, locale_t system, Form form, bool same, Call call) {
     const locale_t before = uselocale(system);
     std::vector<std::u16string> texts;
-    for (size_t i = 0; i < kValues; ++i) {
+    for (size_t i = 0; i < kManyPieces; ++i) {
       alignas(char16_t) char out[sizeof(char16_t) * kRoomUnits];
       texts.push_back(decoded(std::string(out, call(i, out)), form));
       if (same && !texts_.empty() && texts[i] != texts_[i]) stop(name, i);
@@ -162,7 +161,7 @@ class RowMaker {
   template <class Call>
   void reader(const char* name, locale_t system, const std::vector<double>& expected, Call call) {
     const locale_t before = uselocale(system);
-    for (size_t i = 0; i < kValues; ++i)
+    for (size_t i = 0; i < kManyPieces; ++i)
       if (!(std::fabs(call(i) - expected[i]) <= std::fabs(expected[i]) * 1e-14)) stop(name, i);
     uselocale(before);
     add(name, system, [call](size_t i, char*) { return static_cast<size_t>(static_cast<int64_t>(call(i))); });
@@ -181,7 +180,7 @@ class RowMaker {
     row_.peers.push_back({name, [system, call](char* out) {
                             const locale_t before = uselocale(system);
                             size_t sum = 0;
-                            for (size_t i = 0; i < kValues; ++i) sum += call(i, out);
+                            for (size_t i = 0; i < kManyPieces; ++i) sum += call(i, out);
                             uselocale(before);
                             return sum;
                           }});
@@ -365,7 +364,7 @@ class TextRows {
     if (!start("read", pattern.label)) return;
     const auto in = std::make_shared<Inputs>();
     std::vector<double> expected, icu_expected;
-    for (size_t i = 0; i < kValues; ++i) {
+    for (size_t i = 0; i < kManyPieces; ++i) {
       LXUChar text[kRoomUnits];
       const std::u16string format = to_utf16(pattern.ours);
       const size_t units = count(LXTimeToStringU(locale_, &values_.times[i], text, kRoomUnits, lx_units(format),

@@ -16,7 +16,6 @@ namespace {
 
 constexpr size_t kLongUnits = 500000;
 constexpr size_t kShortChars = 24;
-constexpr size_t kShortStrings = 500;
 
 struct Subject {
   const char* text;
@@ -85,7 +84,7 @@ class SubjectRows {
   void add(const std::string& stem, const std::u16string& whole, Table* table) const {
     const std::u16string text = mapped_alike(agreed_text(whole, {&codepage_}, kLongUnits));
     for (const bool is_short : {false, true}) {
-      const Input input = is_short ? cut_pieces(text, kShortChars, kShortStrings, codepage_)
+      const Input input = is_short ? cut_pieces(text, kShortChars, kManyPieces, codepage_)
                                    : cut_pieces(text, text.size(), 1, codepage_);
       table->add(
           {stem + (is_short ? "/24" : "/1MB"), peers(input), input->chars, input->ends.size(), room(input)});

@@ -12,7 +12,6 @@ namespace {
 
 constexpr size_t kLongUnits = 300000;
 constexpr size_t kShortChars = 8;
-constexpr size_t kShortStrings = 500;
 
 struct Subject {
   const char* encoding;
@@ -94,7 +93,7 @@ void add_subject(Table* table, Texts* texts, const Subject& subject) {
   if (codepage == nullptr || locale == nullptr || texts->find(subject.text).empty()) return;
   const std::u16string text = agreed_text(texts->find(subject.text), {codepage.get()}, kLongUnits);
   for (const bool is_short : {false, true}) {
-    const Input input = is_short ? cut_pieces(text, kShortChars, kShortStrings, *codepage)
+    const Input input = is_short ? cut_pieces(text, kShortChars, kManyPieces, *codepage)
                                  : cut_pieces(text, text.size(), 1, *codepage);
     const std::string name = stem + (is_short ? "/8" : "/long");
     table->add({"count/" + name,
