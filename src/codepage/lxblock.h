@@ -15,8 +15,9 @@
 namespace lx {
 
 inline constexpr unsigned kAscii = 0x80;
-inline constexpr size_t kBlock = 16;              // units looked at or moved at a time
-inline constexpr size_t kUtf8Batch = kBlock / 2;  // characters written at a time
+inline constexpr size_t kBlock = 16;  // units looked at or moved at a time
+inline constexpr size_t kHalfBlock = kBlock / 2;
+inline constexpr size_t kUtf8Batch = kHalfBlock;  // characters written at a time
 
 /// The bytes that begin characters of several bytes, in ranges: two for characters of two bytes, which may be
 /// the same, and one for those of three.
@@ -81,6 +82,22 @@ inline void copy_block(uint16_t* to, const uint8_t* from) {
 }
 inline void copy_block(uint8_t* to, const uint16_t* from) {
   store_block(to, _mm_packus_epi16(load_block(from), load_block(from + kBlock / 2)));
+}
+
+/// Stores the units of half a block at any address, as bytes or as they are: how many are below `below` and not 0 before
+/// the first one that is not.
+inline size_t copy_text_block(uint8_t* to, const uint8_t* units, unsigned below) {
+  const __m128i v = load_block(units), zero = _mm_setzero_si128();
+  _mm_storel_epi64(reinterpret_cast<__m128i*>(to), _mm_packus_epi16(v, v));
+  const __m128i same = _mm_cmpeq_epi16(_mm_and_si128(v, _mm_set1_epi16(static_cast<short>(-below))), zero);
+  const __m128i copied = _mm_andnot_si128(_mm_cmpeq_epi16(v, zero), same);
+  return static_cast<size_t>(__builtin_ctz(~static_cast<unsigned>(_mm_movemask_epi8(copied)))) / 2;
+}
+inline size_t copy_text_block(uint16_t* to, const uint8_t* units, unsigned) {
+  const __m128i v = load_block(units);
+  store_block(to, v);
+  const auto ends = static_cast<unsigned>(_mm_movemask_epi8(_mm_cmpeq_epi16(v, _mm_setzero_si128())));
+  return static_cast<size_t>(__builtin_ctz(ends | 1u << kBlock)) / 2;
 }
 
 inline unsigned byte_mask(__m128i v) {
@@ -279,6 +296,9 @@ inline bool find_long_utf8(const uint8_t*, size_t*, size_t*) {
 }
 inline bool put_short_batch(const uint16_t*, uint8_t**) {
   return false;
+}
+inline size_t copy_text_block(void*, const uint8_t*, unsigned) {
+  return 0;
 }
 struct CharBlock {
   static constexpr size_t kBytes = 8 * sizeof(size_t);

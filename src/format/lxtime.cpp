@@ -135,7 +135,7 @@ class TimeFormatter {
     int32_t code = LX_OK;
     if (!Cursor::kShifts && units_left(word) >= kItemUnits) {
       word.end = word.p + kItemUnits;
-      write_time_unicode(time_name(locale_, item), &word);
+      write_time_name(locale_, item, &word);
     } else {
       code = write_item_cut(item, &word);
     }

@@ -55,10 +55,19 @@ typename Kind::Cursor given_text(const Codepage& cp, const Text<Unit>& text, boo
 /// Names and nested formats are used as far as they fit before a null.
 inline constexpr size_t kItemUnits = 31;
 
-/// Writes a null-terminated 16-bit text, as far as it fits.
+/// Writes a null-terminated 16-bit text, as far as it fits. Up to `end` there is more than it.
 template <class Sink>
-inline void write_time_unicode(const uint8_t* text, Sink* out) {
+inline void write_time_unicode(const uint8_t* text, const uint8_t* end, Sink* out) {
   Sink copy = *out;  // in registers
+  if constexpr (sizeof(typename Sink::Unit) <= 2 && !Sink::kShifts) {
+    const unsigned below = copy.same_below();
+    size_t units = kVectors && below != 0 ? kHalfBlock : 0;
+    while (units == kHalfBlock && room(text, end) >= kBlock && units_left(copy) >= kHalfBlock) {
+      units = copy_text_block(copy.p, text, below);
+      copy.p += units;
+      text += 2 * units;
+    }
+  }
   LXUChar u = le16(text);
   if constexpr (sizeof(typename Sink::Unit) == 1 && !Sink::kShifts) {
     const unsigned below = copy.same_below();
@@ -69,9 +78,12 @@ inline void write_time_unicode(const uint8_t* text, Sink* out) {
   go_on_at(*out, copy);
 }
 
-/// The text of a name, all of which are the language's.
-inline const uint8_t* time_name(const LXLocale& locale, int32_t item) {
-  return payload_text(*locale.language, format::language::kFirstDay + static_cast<size_t>(item - LX_ITEM_DAY));
+/// Writes a name, all of which are the language's.
+template <class Sink>
+inline void write_time_name(const LXLocale& locale, int32_t item, Sink* out) {
+  const LXObject& language = *locale.language;
+  const size_t word = format::language::kFirstDay + static_cast<size_t>(item - LX_ITEM_DAY);
+  write_time_unicode(payload_text(language, word), payload_of(language) + language.section_bytes[0], out);
 }
 
 /// Writes an item of the locale, as far as it fits.
@@ -81,7 +93,7 @@ void write_time_item(const LXLocale& locale, int32_t item, bool current, Sink* o
   const auto get = Text::Cursor::kUnicode ? LXLocaleGetTextItemU : LXLocaleGetTextItem;
   const auto* text = static_cast<const uint8_t*>(get(&locale, item, current, &kind));
   if (kind == TextKind::kUnicode) {
-    write_time_unicode(text, out);
+    write_time_unicode(text, text, out);
   } else if constexpr (!Text::Cursor::kUnicode) {
     const Codepage& cp = codepage_of(*locale.codepage);
     const size_t bytes = strlen(reinterpret_cast<const char*>(text));
