@@ -229,6 +229,7 @@ constexpr Vectors kBaseVectors = {kVectors ? "SSE2" : "none",
                                   nullptr,
                                   base::write_utf8,
                                   base::write_pairs,
+                                  nullptr,
                                   base::write_wide,
                                   base::write_bytes};
 

@@ -48,6 +48,13 @@ struct PairCodes {
   const uint16_t* codes;
 };
 
+/// The same with the bytes that lead to the single-byte state and to the double-byte one.
+struct ShiftCodes {
+  PairCodes codes;
+  uint8_t shift_in;
+  uint8_t shift_out;
+};
+
 /// The same of codes of up to four bytes.
 struct WideCodes {
   const uint32_t* page_start;
@@ -119,6 +126,9 @@ struct Vectors {
   uint8_t* (*write_utf8)(uint8_t* p, const uint16_t* values, size_t count);
   // ... as codes of one byte and two, ...
   uint8_t* (*write_pairs)(const PairCodes& codes, uint8_t* p, const uint16_t* values, size_t count);
+  // ... with the shift bytes that are due, where `two` is whether the character before them is one of two bytes (null:
+  // there is no such loop), ...
+  uint8_t* (*write_shift)(const ShiftCodes& codes, bool* two, uint8_t* p, const uint16_t* values, size_t count);
   // ... as codes of up to four, ...
   uint8_t* (*write_wide)(const WideCodes& codes, uint8_t* p, const uint16_t* values, size_t count);
   // ... and as codes of one byte.

@@ -353,6 +353,33 @@ LX_TARGET uint8_t* write_wide(const WideCodes& at, uint8_t* p, const uint16_t* v
   return p;
 }
 
+LX_TARGET uint8_t* write_shift(const ShiftCodes& at, bool* two_before, uint8_t* p, const uint16_t* values,
+                               size_t count) {
+  const __m512i shift_in = _mm512_set1_epi32(at.shift_in), shift_out = _mm512_set1_epi32(at.shift_out);
+  unsigned before = *two_before;
+  for (size_t i = 0; i < count; i += 16) {
+    const size_t chars = least(count - i, 16);
+    const auto inside = static_cast<__mmask16>(ones(chars));
+    const __m512i codes = codes_of(at.codes, inside, values + i);
+    const __mmask16 two = _mm512_cmpgt_epu32_mask(codes, _mm512_set1_epi32(0xFF));
+    const auto shifted = static_cast<__mmask16>((two ^ (unsigned{two} << 1 | before)) & inside);
+    before = unsigned{two} >> (chars - 1) & 1;
+    // A shift byte, and the one or two bytes of the code.
+    const __m512i low = _mm512_mask_slli_epi32(_mm512_slli_epi32(codes, 8), two,
+                                               _mm512_and_si512(codes, _mm512_set1_epi32(0xFF)), 16);
+    const __m512i high = _mm512_maskz_and_epi32(two, codes, _mm512_set1_epi32(0xFF00));
+    const __m512i shift = _mm512_mask_mov_epi32(shift_in, two, shift_out);
+    const uint64_t which = byte_of_each(shifted, 0) | byte_of_each(inside, 1) | byte_of_each(two, 2);
+    const auto written = static_cast<size_t>(__builtin_popcountll(which));
+    _mm512_mask_storeu_epi8(
+        p, ones(written),
+        _mm512_maskz_compress_epi8(which, _mm512_or_si512(shift, _mm512_or_si512(high, low))));
+    p += written;
+  }
+  *two_before = before != 0;
+  return p;
+}
+
 LX_TARGET void translate(const uint8_t table[256], const uint8_t* p, size_t count, uint8_t* to) {
   const __m512i part[] = {_mm512_loadu_si512(table), _mm512_loadu_si512(table + kBytes),
                           _mm512_loadu_si512(table + 2 * kBytes), _mm512_loadu_si512(table + 3 * kBytes)};
@@ -450,7 +477,7 @@ LX_TARGET uint8_t* write_bytes(const PairCodes& at, uint8_t* p, const uint16_t* 
 
 const Vectors kAvx512Vectors = {"AVX-512",  1,           kLeastPassed, pass,       read_utf8,
                                 read_pairs, copy_same,   look_up,      translate,  map_utf8,
-                                write_utf8, write_pairs, write_wide,   write_bytes};
+                                write_utf8, write_pairs, write_shift,  write_wide, write_bytes};
 
 bool has_avx512() {
   return __builtin_cpu_supports("avx512vbmi2") && __builtin_cpu_supports("avx512vbmi") &&
