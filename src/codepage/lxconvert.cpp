@@ -118,6 +118,11 @@ size_t short_units(const Text<Unit>& text, int32_t flags) {
   return units <= kRunSlack ? units : 0;
 }
 
+/// Whether there are characters of several bytes that are not UTF-8.
+bool has_pairs(const Codepage& cp) {
+  return !cp.single_byte && !cp.utf8;
+}
+
 /// The values of a text: how many, or 0 when it holds what is read otherwise.
 template <Form kForm>
 size_t read_short(const Codepage& cp, const uint8_t* p, size_t bytes, LXUChar* values, RunRule rule) {
@@ -161,7 +166,9 @@ size_t convert_short(const Codepage& out_cp, uint8_t* to, size_t size, bool clos
 template <Form kForm>
 size_t convert_short(const Codepage& out_cp, uint8_t* to, size_t size, bool closed, const Codepage& in_cp,
                      const uint8_t* text, size_t bytes) {
-  if (bytes < vectors->pivot_bytes) return 0;
+  const bool pairs =
+      (has_pairs(in_cp) || has_pairs(out_cp)) && !in_cp.shift_sensitive && !out_cp.shift_sensitive;
+  if (bytes < (pairs ? vectors->pair_pivot_bytes : vectors->pivot_bytes)) return 0;
   const unsigned below = in_cp.same_below < out_cp.same_below ? in_cp.same_below : out_cp.same_below;
   if (below != 0 && bytes <= size && vectors->copy_same(to, text, bytes, below)) return bytes;
   if (in_cp.single_byte && out_cp.single_byte) {

@@ -85,7 +85,12 @@ inline Transfer<Value> transfer(Cursor& in, Sink& out, size_t count) {
   if constexpr (kRuns) {
     constexpr bool kShift = Cursor::kShifts || Sink::kShifts;
     constexpr bool kPivot = !Cursor::kUnicode && !Sink::kUnicode;
-    const size_t worth = kShift ? kShiftRunUnits : kPivot ? vectors->pivot_bytes : kRunUnits;
+    constexpr bool kPairs =
+        kPivot && (std::is_same_v<Cursor, MultiByteCursor> || std::is_same_v<Sink, MultiByteSink>);
+    const size_t worth = kShift   ? kShiftRunUnits
+                         : kPairs ? vectors->pair_pivot_bytes
+                         : kPivot ? vectors->pivot_bytes
+                                  : kRunUnits;
     if (room(in.p, in.end) >= worth) {
       // On copies: what other functions see in memory cannot stay in registers below.
       Cursor long_in = in;

@@ -218,6 +218,7 @@ namespace {
 
 constexpr Vectors kBaseVectors = {kVectors ? "SSE2" : "none",
                                   kBasePivotBytes,
+                                  kBasePairPivotBytes,
                                   kBaseLeastPassed,
                                   base::pass,
                                   base::read_utf8,

@@ -93,6 +93,8 @@ struct Vectors {
 
   /// From so many bytes on a text goes from one codepage to another by way of a run of values.
   size_t pivot_bytes;
+  /// ... where one of them has characters of several bytes that are not UTF-8, and none has shift states.
+  size_t pair_pivot_bytes;
 
   /// From so many bytes on characters are passed by blocks.
   size_t least_passed;

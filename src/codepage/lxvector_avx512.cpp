@@ -475,9 +475,9 @@ LX_TARGET uint8_t* write_bytes(const PairCodes& at, uint8_t* p, const uint16_t* 
 
 }  // namespace
 
-const Vectors kAvx512Vectors = {"AVX-512",  1,           kLeastPassed, pass,       read_utf8,
-                                read_pairs, copy_same,   look_up,      translate,  map_utf8,
-                                write_utf8, write_pairs, write_shift,  write_wide, write_bytes};
+const Vectors kAvx512Vectors = {"AVX-512",   1,           1,          kLeastPassed, pass,     read_utf8,
+                                read_pairs,  copy_same,   look_up,    translate,    map_utf8, write_utf8,
+                                write_pairs, write_shift, write_wide, write_bytes};
 
 bool has_avx512() {
   return __builtin_cpu_supports("avx512vbmi2") && __builtin_cpu_supports("avx512vbmi") &&

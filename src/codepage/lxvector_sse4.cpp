@@ -177,10 +177,11 @@ LX_TARGET uint8_t* write_utf8(uint8_t* p, const uint16_t* values, size_t count) 
 
 }  // namespace
 
-const Vectors kSse4Vectors = {"SSE4",          kBasePivotBytes,  kBaseLeastPassed, base::pass,
-                              read_utf8,       base::read_pairs, base::copy_same,  base::look_up,
-                              base::translate, nullptr,          write_utf8,       base::write_pairs,
-                              nullptr,         base::write_wide, base::write_bytes};
+const Vectors kSse4Vectors = {
+    "SSE4",           kBasePivotBytes,  kBasePairPivotBytes, kBaseLeastPassed, base::pass,
+    read_utf8,        base::read_pairs, base::copy_same,     base::look_up,    base::translate,
+    nullptr,          write_utf8,       base::write_pairs,   nullptr,          base::write_wide,
+    base::write_bytes};
 
 bool has_sse4() {
   return __builtin_cpu_supports("sse4.1") && __builtin_cpu_supports("ssse3") &&
