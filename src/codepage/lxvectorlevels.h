@@ -24,7 +24,8 @@ uint8_t* write_bytes(const PairCodes& codes, uint8_t* p, const uint16_t* values,
 
 }  // namespace base
 
-inline constexpr size_t kBasePivotBytes = sizeof(size_t) == 8 ? 16 : 48;  // calls cost more where registers are few
+inline constexpr size_t kBasePivotBytes =
+    sizeof(size_t) == 8 ? 16 : 48;  // calls cost more where registers are few
 inline constexpr size_t kBasePairPivotBytes = 48;
 inline constexpr size_t kBaseLeastPassed = CharBlock::kBytes;
 
