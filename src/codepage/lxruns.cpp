@@ -255,16 +255,10 @@ void ShiftSink::put_run(const LXUChar* values, size_t count) {
     const uint32_t* const page_start = cp.page_start;
     const uint16_t* const codes = cp.codes16;
     if (vectors->write_shift != nullptr) {
-      // Of ASCII one look-up after the other is as good. A short text is guessed.
-      unsigned some = count == 0 ? 0u : unsigned{values[0]} | values[count / 2] | values[count - 1];
-      if (count >= kManyShiftChars)
-        for (size_t k = 0; k < count; ++k) some |= values[k];
-      if (some >= kAscii) {
-        bool two = state == LX_SHIFT_DOUBLE;
-        p = vectors->write_shift({{page_start, codes}, cp.shift_in, cp.shift_out}, &two, p, values, count);
-        state = two ? LX_SHIFT_DOUBLE : LX_SHIFT_SINGLE;
-        return;
-      }
+      bool two = state == LX_SHIFT_DOUBLE;
+      p = vectors->write_shift({{page_start, codes}, cp.shift_in, cp.shift_out}, &two, p, values, count);
+      state = two ? LX_SHIFT_DOUBLE : LX_SHIFT_SINGLE;
+      return;
     } else if (count >= kManyShiftChars) {
       i = put_shift_blocks(this, values, count);
     }

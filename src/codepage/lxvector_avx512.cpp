@@ -353,14 +353,34 @@ LX_TARGET uint8_t* write_wide(const WideCodes& at, uint8_t* p, const uint16_t* v
   return p;
 }
 
+/// The codes of ASCII, which are looked up without gathering them.
+struct AsciiCodes {
+  __m512i part[4];
+
+  LX_TARGET explicit AsciiCodes(const PairCodes& at) {
+    for (size_t i = 0; i < 4; ++i) part[i] = _mm512_loadu_si512(at.codes + at.page_start[0] + i * kUnits);
+  }
+  LX_TARGET __m256i at(__m256i values) const {
+    const __m512i index = _mm512_castsi256_si512(values);
+    const __m512i low = _mm512_permutex2var_epi16(part[0], index, part[1]);
+    const __m512i high = _mm512_permutex2var_epi16(part[2], index, part[3]);
+    const __mmask32 is_high = _mm512_test_epi16_mask(index, _mm512_set1_epi16(0x40));
+    return _mm512_castsi512_si256(_mm512_mask_mov_epi16(low, is_high, high));
+  }
+};
+
 LX_TARGET uint8_t* write_shift(const ShiftCodes& at, bool* two_before, uint8_t* p, const uint16_t* values,
                                size_t count) {
   const __m512i shift_in = _mm512_set1_epi32(at.shift_in), shift_out = _mm512_set1_epi32(at.shift_out);
+  const AsciiCodes ascii(at.codes);
   unsigned before = *two_before;
   for (size_t i = 0; i < count; i += 16) {
     const size_t chars = least(count - i, 16);
     const auto inside = static_cast<__mmask16>(ones(chars));
-    const __m512i codes = codes_of(at.codes, inside, values + i);
+    const __m256i v = _mm256_maskz_loadu_epi16(inside, values + i);
+    const bool is_ascii = _mm256_test_epi16_mask(v, _mm256_set1_epi16(static_cast<short>(-int{kAscii}))) == 0;
+    const __m512i codes =
+        is_ascii ? _mm512_cvtepu16_epi32(ascii.at(v)) : codes_of(at.codes, inside, values + i);
     const __mmask16 two = _mm512_cmpgt_epu32_mask(codes, _mm512_set1_epi32(0xFF));
     const auto shifted = static_cast<__mmask16>((two ^ (unsigned{two} << 1 | before)) & inside);
     before = unsigned{two} >> (chars - 1) & 1;
