@@ -96,9 +96,12 @@ void call_any(Input& in, const F& form, const Place& at, const LXTime& t) {
   const bool chars = kBytes && (flags & LX_CHARACTERS) != 0;
   states = {};
   const Text<Unit> format = in.text(form, l, 30), text = in.text(form, l, 40);
-  const Block<Unit> by(chars ? format + Unit{0} : format), given(chars ? text + Unit{0} : text);
+  const Block<Unit> by(format), given(text);
   const auto length = [&](const Block<Unit>& block) {
-    return chars ? length_in_chars(at.codepage, block.data(), 0, block.size() - 1) : block.size();
+    // Counted without a shift byte behind the last character, so that nothing is read behind it.
+    if constexpr (kBytes)
+      if (chars) return form.count(l, block.data(), block.size());
+    return block.size();
   };
   const auto size = static_cast<int32_t>(in.below(80));
   const Block<Unit> out(static_cast<size_t>(size) * (chars ? 6 : 1));

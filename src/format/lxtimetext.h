@@ -46,10 +46,15 @@ bool copy_char(const typename Text::Cursor& in, const typename Text::Unit* befor
   }
 }
 
-/// The cursor of a text that a caller gave, whose length counts units or, of bytes, characters.
+/// The cursor of a text that a caller gave, whose length counts units or, of bytes, characters as LXNumCharsEx counts
+/// them. Nothing behind the last character is looked at.
 template <class Kind, class Unit = typename Kind::Unit>
 typename Kind::Cursor given_text(const Codepage& cp, const Text<Unit>& text, bool characters) {
-  return Kind::cursor(cp, text.p, units_of(cp, text, characters), text.state);
+  if (text.length < 0 || !characters)
+    return Kind::cursor(cp, text.p, text_units(text.p, text.length), text.state);
+  auto in = Kind::Cursor::over(cp, text.p, no_end<const Unit>(), text.state);
+  pass_chars(&in, static_cast<size_t>(text.length));
+  return Kind::cursor(cp, text.p, room(text.p, in.p), text.state);
 }
 
 /// Names and nested formats are used as far as they fit before a null.
