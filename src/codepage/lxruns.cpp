@@ -259,9 +259,8 @@ void ShiftSink::put_run(const LXUChar* values, size_t count) {
       p = vectors->write_shift({{page_start, codes}, cp.shift_in, cp.shift_out}, &two, p, values, count);
       state = two ? LX_SHIFT_DOUBLE : LX_SHIFT_SINGLE;
       return;
-    } else if (count >= kManyShiftChars) {
-      i = put_shift_blocks(this, values, count);
     }
+    if (count >= kManyShiftChars) i = put_shift_blocks(this, values, count);
     uint8_t* q = p;
     const auto code_at = [=](size_t at) {
       return unsigned{codes[page_start[values[at] >> 8] + (values[at] & 0xFFu)]};

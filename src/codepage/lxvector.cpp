@@ -226,7 +226,6 @@ constexpr Vectors kBaseVectors = {kVectors ? "SSE2" : "none",
                                   base::copy_same,
                                   base::look_up,
                                   base::translate,
-
                                   nullptr,
                                   base::write_utf8,
                                   base::write_pairs,
