@@ -149,6 +149,7 @@ class TimeParser {
   bool read_word(const TimeDirective& directive, Cursor* text, int32_t* index) {
     Cursor longest = *text;
     for (int32_t i = 0; i < directive.items; ++i) {
+      if (begins_otherwise(directive.first_item + i, *text)) continue;
       const TimeItem<Text> item(locale_, directive.first_item + i, current_);
       Cursor at = *text;
       if (!passes(item, &at) || at.p <= longest.p) continue;
@@ -158,6 +159,13 @@ class TimeParser {
     const bool found = longest.p != text->p;
     go_on_at(*text, longest);
     return found;
+  }
+
+  /// Whether the text begins with another character than a name for certain.
+  bool begins_otherwise(int32_t item, const Cursor& text) const {
+    if constexpr (Cursor::kShifts || sizeof(Unit) > sizeof(LXUChar)) return false;
+    const LXUChar first = le16(time_name(locale_, item));
+    return first < text.same_below() && text.p != text.end && *text.p != first;
   }
 
   /// Whether the text has an item's characters; `at` moves over them.

@@ -83,12 +83,14 @@ inline void write_time_unicode(const uint8_t* text, const uint8_t* end, Sink* ou
   go_on_at(*out, copy);
 }
 
-/// Writes a name, all of which are the language's.
+/// The text of a name, all of which are the language's.
+inline const uint8_t* time_name(const LXLocale& locale, int32_t item) {
+  return payload_text(*locale.language, format::language::kFirstDay + static_cast<size_t>(item - LX_ITEM_DAY));
+}
 template <class Sink>
 inline void write_time_name(const LXLocale& locale, int32_t item, Sink* out) {
   const LXObject& language = *locale.language;
-  const size_t word = format::language::kFirstDay + static_cast<size_t>(item - LX_ITEM_DAY);
-  write_time_unicode(payload_text(language, word), payload_of(language) + language.section_bytes[0], out);
+  write_time_unicode(time_name(locale, item), payload_of(language) + language.section_bytes[0], out);
 }
 
 /// Writes an item of the locale, as far as it fits.
