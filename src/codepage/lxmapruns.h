@@ -24,6 +24,7 @@ class SpecialFilter {
       last = first;
       const unsigned slot = slot_of(first);
       bits_[slot / 32] |= 1u << slot % 32;
+      any_three_ |= first > 0x7FF;
       if (first < 0x80 || first > 0x7FF || first == pair_) continue;
       one_pair_ = pair_ == 0;
       pair_ = first;
@@ -39,6 +40,7 @@ class SpecialFilter {
   /// The one that begins some of those that are two bytes in UTF-8, 0 for none; only where there is just one.
   uint16_t pair() const { return pair_; }
   bool one_pair() const { return one_pair_; }
+  bool any_three() const { return any_three_; }
 
  private:
   static unsigned slot_of(uint16_t u) { return (u & 0xFFu) | (u > 0xFF ? 0x100u : 0); }
@@ -46,6 +48,7 @@ class SpecialFilter {
   uint32_t bits_[16] = {};
   uint16_t pair_ = 0;
   bool one_pair_ = true;
+  bool any_three_ = false;
 };
 
 // Runs of characters of one unit whose case one table tells.
@@ -139,7 +142,7 @@ inline size_t map_utf8_block(const uint8_t* p, size_t count, bool upper, uint8_t
 inline void map_utf8(LeadByteText& text, const Runs& runs, const SpecialFilter& filter) {
   const Codepage& cp = text.in.cp;
   const PairCase pairs = cp.pair_case[runs.upper];
-  const Utf8Case how{pairs.bytes, pairs.row, cp.caseless, filter.pair(), runs.upper};
+  const Utf8Case how{pairs.bytes, pairs.row, cp.caseless, filter.pair(), filter.any_three(), runs.upper};
   const auto map_block = vectors->map_utf8;
   const uint32_t mask = runs.upper ? LX_C1_LOWER : LX_C1_UPPER;
   const bool special = filter.any();

@@ -74,6 +74,7 @@ struct Utf8Case {
   const uint8_t* row;       // by first byte of two, from 1 on; 0: ...
   const uint8_t* caseless;  // ... where this is 0 too some of its characters may have another case, else none
   uint16_t special;         // a character of two bytes that is left; 0: none
+  bool special_three;       // all those of three bytes are left
   bool upper;
 };
 inline constexpr size_t kMappedBytes = 64 + 2;  // of a block, and more that belong to its last character

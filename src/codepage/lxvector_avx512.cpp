@@ -381,7 +381,7 @@ LX_TARGET uint8_t* write_shift(const ShiftCodes& at, bool* two_before, uint8_t* 
     const bool is_ascii = _mm256_test_epi16_mask(v, _mm256_set1_epi16(static_cast<short>(-int{kAscii}))) == 0;
     const __m512i codes =
         is_ascii ? _mm512_cvtepu16_epi32(ascii.at(v)) : codes_of(at.codes, inside, values + i);
-    const __mmask16 two = _mm512_cmpgt_epu32_mask(codes, _mm512_set1_epi32(0xFF));
+    const __mmask16 two = _mm512_mask_cmpgt_epu32_mask(inside, codes, _mm512_set1_epi32(0xFF));
     const auto shifted = static_cast<__mmask16>((two ^ (unsigned{two} << 1 | before)) & inside);
     before = unsigned{two} >> (chars - 1) & 1;
     // A shift byte, and the one or two bytes of the code.
@@ -443,9 +443,9 @@ LX_TARGET size_t map_utf8(const Utf8Case& how, const uint8_t* p, size_t count, u
     const __m512i caseless = _mm512_permutex2var_epi8(_mm512_loadu_si512(how.caseless + 0x80), block,
                                                       _mm512_loadu_si512(how.caseless + 0xC0));
     const uint64_t cased = longer & ones(used) & _mm512_testn_epi8_mask(caseless, caseless);
-    left = marks.three;
+    left = marks.three & (how.special_three ? ~uint64_t{0} : cased);
     if (how.special != 0) left |= places_of_pair(how.special, block, next);
-    left &= cased;
+    left &= longer & ones(used);
     // First byte by first byte: a text has few.
     for (uint64_t pairs = cased & ~marks.three; pairs != 0;) {
       const uint8_t first = p[__builtin_ctzll(pairs)];
