@@ -70,7 +70,8 @@ struct LeadByteSink {
   bool put(LXWChar code) { return store(without_zero_bytes(code)); }
   bool put_bytes(const uint8_t* bytes, size_t count) {
     if (count > room(p, end)) return false;
-    for (size_t i = 0; i < count; ++i) *p++ = bytes[i];
+    *p++ = *bytes;
+    for (size_t i = 1; i < count; ++i) *p++ = bytes[i];
     return true;
   }
 

@@ -44,7 +44,14 @@ size_t put_units(Sink& out, const typename Sink::Unit* units, size_t count) {
 /// False when the number did not fit.
 template <class Sink, class Unit>
 bool put_number(Sink& out, const NumberText<Unit>& number) {
-  if (put_units(out, number.begin(), number.units()) < number.units()) return false;
+  if (!Sink::kShifts && number.units() <= room(out.p, out.end)) {
+    number.store(out.p);
+    out.p += number.units();
+  } else {
+    Unit units[NumberText<Unit>::kMostUnits];
+    number.store(units);
+    if (put_units(out, units, number.units()) < number.units()) return false;
+  }
   if (number.zeros() == 0) return true;
   constexpr size_t kRun = 16;
   Unit zeros[kRun];
@@ -64,7 +71,8 @@ struct Written {
 
 /// Writes the text that `write(out)` makes into `room` units; it is false for a text that does not fit.
 template <Form kForm, class Write>
-Written write_text(const Codepage& cp, FormUnit<kForm>* p, size_t room, LXShiftState state, Write write) {
+Written write_text(const Codepage& cp, FormUnit<kForm>* p, size_t room, LXShiftState state,
+                   const Write& write) {
   return with_kind<FormUnit<kForm>, ClosedShiftSink>(cp, kForm, [&](auto kind) {
     auto out = kind.sink(cp, p, end_of(p, room), state);
     const bool all = write(out);
@@ -84,6 +92,10 @@ template <Form kForm>
 int32_t write_number(Call& call, const Output<kForm>& to, const NumberText<FormUnit<kForm>>& number) {
   const Codepage& cp = codepage_of(call.codepage());
   const size_t most = static_cast<size_t>(to.size) - to.nulls();
+  if ((kForm != Form::kEx || !cp.shift_sensitive) && number.zeros() == 0 && number.units() <= most) {
+    number.store(to.buffer);
+    return finish(call, to, number.units(), number.units(), true);
+  }
   const bool shifts = kForm == Form::kEx && cp.shift_sensitive && to.state == LX_SHIFT_DOUBLE;
   const size_t shift_bytes = shifts && to.by_chars() && most != 0 ? 1 : 0;  // a Shift-In, which does not count
   const Written written = write_text<kForm>(cp, to.buffer, most + shift_bytes, to.state,
@@ -106,10 +118,10 @@ template <Form kForm>
 int32_t long_to_text(LXLocale* given, int32_t value, const Output<kForm>& to) {
   return with_output(given, to, LX_UNSIGNED, [&](Call& call, const LXLocale& locale) {
     const bool negative = value < 0 && (to.flags & LX_UNSIGNED) == 0;
-    DecimalDigits digits;
-    integer_digits(negative ? 0u - static_cast<uint32_t>(value) : static_cast<uint32_t>(value), &digits);
+    Decimal decimal;
+    decimal.set(negative ? 0u - static_cast<uint32_t>(value) : static_cast<uint32_t>(value));
     NumberText<FormUnit<kForm>> number(fixed_chars<kForm>(locale));
-    number.put_integer(digits, separator_of<kForm>(locale, to.current(), kThousands),
+    number.put_integer(&decimal, separator_of<kForm>(locale, to.current(), kThousands),
                        GroupSizes<kForm>(locale, to.current(), kGrouping));
     if (negative) number.put_minus();
     return write_number(call, to, number);
@@ -131,11 +143,11 @@ constexpr DoubleItems kInternationalItems{kMonetaryDecimal, kMonetaryThousands, 
 template <Form kForm>
 void put_magnitude(NumberText<FormUnit<kForm>>* number, double value, const LXLocale& locale, bool current,
                    const DoubleItems& items) {
-  DecimalDigits digits;
-  double_digits(value < 0 ? -value : value == 0 ? 0.0 : value, &digits);
-  if (digits.fraction == nullptr) {
+  Decimal decimal;
+  to_decimal(value < 0 ? -value : value == 0 ? 0.0 : value, &decimal);
+  if (!decimal.is_word && decimal.fraction == nullptr) {
     const Codepage& cp = codepage_of(*locale.codepage);
-    number->put_word(digits, [&](char c) {
+    number->put_word(decimal, [&](char c) {
       const LXUChar u = static_cast<LXUChar>(c);
       return static_cast<FormUnit<kForm>>(kForm == Form::kUnicode ? u : unicode_to_code(cp, u));
     });
@@ -144,9 +156,9 @@ void put_magnitude(NumberText<FormUnit<kForm>>* number, double value, const LXLo
   const uint16_t fraction_digits =
       current ? locale.numbers[items.fraction_digits]
               : payload_word(*locale.territory, territory::kNumbers + items.fraction_digits);
-  number->put_integer(digits, separator_of<kForm>(locale, current, items.thousands),
+  number->put_integer(&decimal, separator_of<kForm>(locale, current, items.thousands),
                       GroupSizes<kForm>(locale, current, items.grouping));
-  number->put_fraction(digits.fraction, separator_of<kForm>(locale, current, items.decimal), fraction_digits);
+  number->put_fraction(&decimal, separator_of<kForm>(locale, current, items.decimal), fraction_digits);
 }
 
 template <Form kForm>
@@ -196,6 +208,22 @@ bool put_all(Sink& out, Cursor in) {
   return true;
 }
 
+/// Writes the characters of a text of the codepage; where all of them fit, bytes as they are.
+template <class Sink, class Cursor>
+[[gnu::always_inline]] inline bool put_text(Sink& out, Cursor in) {
+  if constexpr (sizeof(typename Sink::Unit) == 1 && !Sink::kShifts) {
+    Cursor whole = in;
+    pass_all(&whole);
+    const size_t bytes = room(in.p, whole.p);
+    if (bytes <= room(out.p, out.end)) {
+      for (size_t i = 0; i < bytes; ++i) out.p[i] = in.p[i];
+      out.p += bytes;
+      return true;
+    }
+  }
+  return put_all<LXWChar>(out, in);
+}
+
 /// Writes the text of an item.
 template <Form kForm, class Sink>
 bool put_item(Sink& out, const LXLocale& locale, int32_t item, bool current) {
@@ -207,8 +235,7 @@ bool put_item(Sink& out, const LXLocale& locale, int32_t item, bool current) {
     const auto* text = static_cast<const uint8_t*>(LXLocaleGetTextItem(&locale, item, current, &kind));
     if (kind == TextKind::kUnicode) return put_all<LXUChar>(out, PayloadCursor{text, nullptr});
     return with_cursor(codepage_of(*locale.codepage), kTextForm<kForm>, LX_SHIFT_SINGLE, text,
-                       strlen(reinterpret_cast<const char*>(text)),
-                       [&](auto in) { return put_all<LXWChar>(out, in); });
+                       strlen(reinterpret_cast<const char*>(text)), [&](auto in) { return put_text(out, in); });
   }
 }
 

@@ -109,6 +109,12 @@ class GroupSizes {
       unicode_ = reinterpret_cast<const uint8_t*>(locale.texts_unicode[index]);
   }
 
+  /// Whether every group has three digits, in the way that most locales say it: a size that is repeated.
+  bool all_threes() const {
+    return unit_at(0) == chars_.zero + 3u && unit_at(1) == chars_.group_separator &&
+           unit_at(2) == chars_.zero && unit_at(3) == 0;
+  }
+
   /// The size of the next group; 0: all digits that are left stand together.
   size_t next() {
     if (repeats_) return last_;

@@ -220,6 +220,33 @@ double read_double(Cursor& in, Classes& classes, const FixedChars& chars) {
   return parts.result();
 }
 
+/// Reads a text that is nothing but decimal digits, so few that none is too many, with perhaps a minus before them:
+/// the units, or 0 when it is anything else.
+template <Form kForm>
+size_t read_plain_long(const LXLocale& locale, const Text<FormUnit<kForm>>& text, int32_t* value) {
+  constexpr size_t kMost = 9;
+  const Codepage& cp = codepage_of(*locale.codepage);
+  const FixedChars& chars = fixed_chars<kForm>(locale);
+  const auto digit_of = [&](uint32_t c) { return c - chars.zero; };
+  if (kForm != Form::kUnicode && (!cp.plain_digits || (cp.type(chars.minus) & LX_C1_SPACE) != 0)) return 0;
+  if (kForm == Form::kEx && text.state != LX_SHIFT_SINGLE) return 0;
+  if (digit_of(separator_of<kForm>(locale, true, kThousands)) <= 9) return 0;
+  const size_t units =
+      text.length < 0 ? units_before_null(text.p, kMost + 2) : static_cast<size_t>(text.length);
+  if (units - 1 > kMost) return 0;
+  const size_t sign = text.p[0] == chars.minus;
+  if (units - sign - 1 >= kMost) return 0;
+  uint32_t sum = 0, above = 0;
+  for (size_t i = sign; i < units; ++i) {
+    const uint32_t digit = digit_of(text.p[i]);
+    above |= digit > 9;
+    sum = sum * 10 + digit;
+  }
+  if (above != 0) return 0;
+  *value = static_cast<int32_t>(sign != 0 ? 0u - sum : sum);
+  return units;
+}
+
 /// The place of a reader as the caller's pointer.
 template <class Unit, class Text>
 void put_place(const Text** to, const Unit* place) {
@@ -235,6 +262,13 @@ int32_t text_to_long(LXLocale* given, const Input<kForm>& from, const Text** end
   constexpr uint32_t kAllowed =
       LX_TERRITORY_VALUES | LX_NATIONAL_DIGITS | LX_MONETARY | LX_UNSIGNED | LX_CHARACTERS;
   if ((from.flags & ~kAllowed) != 0) return call.fail(LX_E_INVALID, 0);
+  if (from.flags == 0 && base == 10) {
+    int32_t value = 0;
+    if (const size_t units = read_plain_long<kForm>(*call.locale(), from.text, &value)) {
+      put_place(end, from.text.p + units);
+      return call.exit(value);
+    }
+  }
   const auto classes = classifier_of<kForm>(*call.locale(), from.flags, false);
   return call.exit(read(codepage_of(call.codepage()), from, [&](auto in) {
     const bool is_unsigned = (from.flags & LX_UNSIGNED) != 0;

@@ -26,6 +26,17 @@ uint32_t number_of(int32_t value, int32_t added) {
   return static_cast<uint32_t>(sum < 0 ? -sum : sum);
 }
 
+struct DigitPairs {
+  uint8_t digits[100][2];
+  constexpr DigitPairs() : digits() {
+    for (unsigned i = 0; i < 100; ++i) {
+      digits[i][0] = static_cast<uint8_t>(i / 10);
+      digits[i][1] = static_cast<uint8_t>(i % 10);
+    }
+  }
+};
+constexpr DigitPairs kPairs;
+
 template <class Text>
 class TimeFormatter {
   using Unit = typename Text::Unit;
@@ -50,6 +61,7 @@ class TimeFormatter {
     Cursor format(text);  // copies, as is what other functions move: these stay in registers
     Sink to = *out;
     Value value{};
+    const TimeSymbols& symbols = symbols_;
     int32_t code = LX_OK;
     while (code == LX_OK && format.p != format.end) {
       const Unit* const before = format.p;
@@ -57,13 +69,13 @@ class TimeFormatter {
         if (format.p != format.end) code = LX_E_FORMAT;
         break;
       }
-      if (!is_percent(format, value, symbols_)) {
+      if (!is_percent(format, value, symbols)) {
         if (!copy_char<Text>(format, before, value, &to)) code = LX_E_SIZE;
       } else if (units_left(to) == 0) {
         code = LX_E_SIZE;
       } else {
         bool flag = false;
-        const TimeDirective& directive = take_directive(&format, symbols_, &flag, &value);
+        const TimeDirective& directive = take_directive(&format, symbols, &flag, &value);
         if (directive.field.member != nullptr) {
           code = write_field(directive, flag, &to);
         } else if (directive.action == TimeAction::kPercent) {
@@ -151,10 +163,10 @@ class TimeFormatter {
     return LX_OK;
   }
 
-  /// Two digits, where there is room.
-  void put_pair(uint32_t number, Sink* out) const {
-    out->p[0] = static_cast<Unit>(symbols_.zero + number / 10);
-    out->p[1] = static_cast<Unit>(symbols_.zero + number % 10);
+  /// The two digits of a number below 100, where there is room.
+  static void put_pair(uint32_t number, uint8_t zero, Sink* out) {
+    out->p[0] = static_cast<Unit>(zero + kPairs.digits[number][0]);
+    out->p[1] = static_cast<Unit>(zero + kPairs.digits[number][1]);
     out->p += 2;
   }
 
@@ -165,8 +177,10 @@ class TimeFormatter {
     // In place where there is room; copying single units that have just been stored would stall.
     const bool fits = !Cursor::kShifts && units_left(*out) > kMostDigits;
     if (fits && !bare && number < 10000 && most_digits % 2 == 0) {  // as most are
-      if (most_digits == 4) put_pair(number / 100, out);
-      put_pair(number % 100, out);
+      const uint32_t hundreds = number < 100 ? 0 : number / 100;
+      const uint8_t zero = symbols_.zero;
+      if (most_digits == 4) put_pair(hundreds, zero, out);
+      put_pair(number - 100 * hundreds, zero, out);
       return LX_OK;
     }
     if (bare) {

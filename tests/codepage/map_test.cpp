@@ -3,6 +3,7 @@
 #include "codepage/lxunicode.h"
 #include "core/lxrecords.h"
 #include "support/case_test.h"
+#include "support/chosen_vectors.h"
 #include "support/conversion.h"
 #include "support/slowness.h"
 
@@ -111,6 +112,7 @@ TEST_F(Map, EveryFormFollowsTheModel) {
     if (cp.shift || cp.file.name == "ODD") continue;
     for (int n = 0; n < 320 / kSlowness && !HasFatalFailure(); ++n) {
       const uint32_t mode = kMappings[n % 8];
+      const ChosenVectors vectors(static_cast<size_t>(n / 8));
       const Units text = random_text(&cp);
       follow_model(kPlain, cp, text, mode);
       follow_model(kEx, cp, text, mode);
@@ -126,11 +128,13 @@ TEST_F(Map, SpecialMappingsInLongText) {
   const std::string run(40, 'B'), other(40, 'b');
   const std::pair<const char*, std::string> cases[] = {{"Kana", run + "\u00C4" + run + "\u00D6" + run},
                                                        {"Long", run + "\u05D0" + run + "\u3042" + run}};
-  for (const auto& [language, text] : cases) {
-    char out[200] = {};
-    LXMapString(library.locale(case_codepage("UTF8"), language), out, 200, text.c_str(), -1, LX_MAP_LOWER);
-    EXPECT_EQ(out, other + 'q' + other + 'w' + other) << language;
-  }
+  for (const auto& [language, text] : cases)
+    for (size_t n = 0; n < kMostVectors; ++n) {
+      const ChosenVectors vectors(n);
+      char out[200] = {};
+      LXMapString(library.locale(case_codepage("UTF8"), language), out, 200, text.c_str(), -1, LX_MAP_LOWER);
+      EXPECT_EQ(out, other + 'q' + other + 'w' + other) << language;
+    }
 }
 
 /// Every output is the longest valid text that fits and returns to the state of the input.

@@ -116,6 +116,12 @@ TEST_F(NumberTest, DigitsAreThoseOfThePrintfConversion) {
   }
 }
 
+TEST_F(NumberTest, TwoDigitsInTheDoubleByteStateAreACharacter) {
+  LXLocale* const shift = library.locale(case_codepage("SHIFT"));
+  EXPECT_EQ(LXStringToLongEx(shift, "\xF1\xF2", LX_SHIFT_SINGLE, 2, nullptr, 10, 0), 12);
+  EXPECT_EQ(LXStringToLongEx(shift, "\xF1\xF2", LX_SHIFT_DOUBLE, 2, nullptr, 10, 0), 0);
+}
+
 TEST_F(NumberTest, NullPointersMatchNothing) {
   EXPECT_EQ(LXStrGetDigit(ascii, "+", 1, nullptr, nullptr, nullptr, nullptr, nullptr, 1, 0), -1);
   int32_t remaining = 5;
