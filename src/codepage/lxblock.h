@@ -84,20 +84,24 @@ inline void copy_block(uint8_t* to, const uint16_t* from) {
   store_block(to, _mm_packus_epi16(load_block(from), load_block(from + kBlock / 2)));
 }
 
-/// Stores the units of half a block at any address, as bytes or as they are: how many are below `below` and not 0 before
+/// Stores a block of units that stand at any address, as bytes or as they are: how many are below `below` and not 0 before
 /// the first one that is not.
 inline size_t copy_text_block(uint8_t* to, const uint8_t* units, unsigned below) {
-  const __m128i v = load_block(units), zero = _mm_setzero_si128();
-  _mm_storel_epi64(reinterpret_cast<__m128i*>(to), _mm_packus_epi16(v, v));
-  const __m128i same = _mm_cmpeq_epi16(_mm_and_si128(v, _mm_set1_epi16(static_cast<short>(-below))), zero);
-  const __m128i copied = _mm_andnot_si128(_mm_cmpeq_epi16(v, zero), same);
-  return static_cast<size_t>(__builtin_ctz(~static_cast<unsigned>(_mm_movemask_epi8(copied)))) / 2;
+  const __m128i first = load_block(units), second = load_block(units + kBlock), zero = _mm_setzero_si128();
+  store_block(to, _mm_packus_epi16(first, second));
+  const __m128i high = _mm_set1_epi16(static_cast<short>(-below));
+  const auto copied = [=](__m128i v) {
+    return _mm_andnot_si128(_mm_cmpeq_epi16(v, zero), _mm_cmpeq_epi16(_mm_and_si128(v, high), zero));
+  };
+  const __m128i all = _mm_packs_epi16(copied(first), copied(second));
+  return static_cast<size_t>(__builtin_ctz(~static_cast<unsigned>(_mm_movemask_epi8(all))));
 }
 inline size_t copy_text_block(uint16_t* to, const uint8_t* units, unsigned) {
-  const __m128i v = load_block(units);
-  store_block(to, v);
-  const auto ends = static_cast<unsigned>(_mm_movemask_epi8(_mm_cmpeq_epi16(v, _mm_setzero_si128())));
-  return static_cast<size_t>(__builtin_ctz(ends | 1u << kBlock)) / 2;
+  const __m128i first = load_block(units), second = load_block(units + kBlock), zero = _mm_setzero_si128();
+  store_block(to, first);
+  store_block(to + kHalfBlock, second);
+  const __m128i ends = _mm_packs_epi16(_mm_cmpeq_epi16(first, zero), _mm_cmpeq_epi16(second, zero));
+  return static_cast<size_t>(__builtin_ctz(static_cast<unsigned>(_mm_movemask_epi8(ends)) | 1u << kBlock));
 }
 
 inline unsigned byte_mask(__m128i v) {

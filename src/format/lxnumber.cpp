@@ -208,20 +208,20 @@ bool put_all(Sink& out, Cursor in) {
   return true;
 }
 
-/// Writes the characters of a text of the codepage; where all of them fit, bytes as they are.
-template <class Sink, class Cursor>
-[[gnu::always_inline]] inline bool put_text(Sink& out, Cursor in) {
+/// Copies the bytes of a text in the codepage of both, where all of its characters fit; false where they do not, and of
+/// other text.
+template <class Cursor, class Sink>
+[[gnu::always_inline]] inline bool copy_fitting(const Cursor& in, Sink* out) {
   if constexpr (sizeof(typename Sink::Unit) == 1 && !Sink::kShifts) {
     Cursor whole = in;
     pass_all(&whole);
     const size_t bytes = room(in.p, whole.p);
-    if (bytes <= room(out.p, out.end)) {
-      for (size_t i = 0; i < bytes; ++i) out.p[i] = in.p[i];
-      out.p += bytes;
-      return true;
-    }
+    if (bytes > room(out->p, out->end)) return false;
+    for (size_t i = 0; i < bytes; ++i) out->p[i] = in.p[i];
+    out->p += bytes;
+    return true;
   }
-  return put_all<LXWChar>(out, in);
+  return false;
 }
 
 /// Writes the text of an item.
@@ -235,7 +235,7 @@ bool put_item(Sink& out, const LXLocale& locale, int32_t item, bool current) {
     const auto* text = static_cast<const uint8_t*>(LXLocaleGetTextItem(&locale, item, current, &kind));
     if (kind == TextKind::kUnicode) return put_all<LXUChar>(out, PayloadCursor{text, nullptr});
     return with_cursor(codepage_of(*locale.codepage), kTextForm<kForm>, LX_SHIFT_SINGLE, text,
-                       strlen(reinterpret_cast<const char*>(text)), [&](auto in) { return put_text(out, in); });
+                       strlen(reinterpret_cast<const char*>(text)), [&](auto in) { return copy_fitting(in, &out) || put_all<LXWChar>(out, in); });
   }
 }
 

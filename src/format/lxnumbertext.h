@@ -99,10 +99,19 @@ inline void ShortText::put_fraction(uint32_t millionths, uint8_t zero, uint8_t s
 /// Stores the lowest `kCount` bytes as units.
 template <size_t kCount, class Unit>
 [[gnu::always_inline]] inline void store_bytes(Unit* to, uint64_t bytes) {
-  if constexpr (sizeof(Unit) == 1)
+  if constexpr (sizeof(Unit) == 1) {
     memcpy(to, &bytes, kCount);
-  else
+  } else if constexpr (sizeof(Unit) == 2 && kCount <= 4) {  // four side by side
+    uint64_t units = bytes & UINT32_MAX;
+    units = (units | units << 16) & 0x0000FFFF0000FFFF;
+    units = (units | units << 8) & 0x00FF00FF00FF00FF;
+    memcpy(to, &units, kCount * sizeof(Unit));
+  } else if constexpr (sizeof(Unit) == 2) {
+    store_bytes<4>(to, bytes);
+    store_bytes<kCount - 4>(to + 4, bytes >> 32);
+  } else {
     for (size_t i = 0; i < kCount; ++i) to[i] = static_cast<uint8_t>(bytes >> 8 * i);
+  }
 }
 template <class Unit>
 [[gnu::always_inline]] inline void store_text(Unit* to, const ShortText& text) {

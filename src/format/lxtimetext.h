@@ -66,8 +66,8 @@ inline void write_time_unicode(const uint8_t* text, const uint8_t* end, Sink* ou
   Sink copy = *out;  // in registers
   if constexpr (sizeof(typename Sink::Unit) <= 2 && !Sink::kShifts) {
     const unsigned below = copy.same_below();
-    size_t units = kVectors && below != 0 ? kHalfBlock : 0;
-    while (units == kHalfBlock && room(text, end) >= kBlock && units_left(copy) >= kHalfBlock) {
+    size_t units = kVectors && below != 0 ? kBlock : 0;
+    while (units == kBlock && room(text, end) >= 2 * kBlock && units_left(copy) >= kBlock) {
       units = copy_text_block(copy.p, text, below);
       copy.p += units;
       text += 2 * units;
@@ -105,6 +105,9 @@ void write_time_item(const LXLocale& locale, int32_t item, bool current, Sink* o
     const Codepage& cp = codepage_of(*locale.codepage);
     const size_t bytes = strlen(reinterpret_cast<const char*>(text));
     const auto fill = [&](auto in) {
+      if constexpr (!Sink::kOneUnit && !Sink::kShifts)
+        for (const unsigned below = in.same_below(); in.p != in.end && *in.p < below && out->p != out->end;)
+          *out->p++ = *in.p++;
       for (LXWChar code = 0; in.next(&code) && out->put(code);) {
       }
     };
