@@ -235,7 +235,8 @@ bool put_item(Sink& out, const LXLocale& locale, int32_t item, bool current) {
     const auto* text = static_cast<const uint8_t*>(LXLocaleGetTextItem(&locale, item, current, &kind));
     if (kind == TextKind::kUnicode) return put_all<LXUChar>(out, PayloadCursor{text, nullptr});
     return with_cursor(codepage_of(*locale.codepage), kTextForm<kForm>, LX_SHIFT_SINGLE, text,
-                       strlen(reinterpret_cast<const char*>(text)), [&](auto in) { return copy_fitting(in, &out) || put_all<LXWChar>(out, in); });
+                       strlen(reinterpret_cast<const char*>(text)),
+                       [&](auto in) { return copy_fitting(in, &out) || put_all<LXWChar>(out, in); });
   }
 }
 

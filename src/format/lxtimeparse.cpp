@@ -13,31 +13,23 @@ constexpr uint32_t kFlags = LX_TERRITORY_VALUES | LX_CHARACTERS;
 
 enum class Match { kSame, kDifferent, kCut };
 
-/// Compares the character that `format` has just read with the text and moves over it. kCut: the text ends
-/// before it does.
-template <class Text>
-Match match_char(const typename Text::Cursor& format, const typename Text::Unit* before,
-                 typename Text::Value value, typename Text::Cursor* text) {
-  using Cursor = typename Text::Cursor;
-  if constexpr (Cursor::kOneUnit) {
-    typename Text::Value other{};
-    return text->next(&other) && other == value ? Match::kSame : Match::kDifferent;
-  } else {
-    Cursor at = *text;
-    size_t count = room(before, format.p);
-    if constexpr (Cursor::kShifts) {
-      count = format.cp.width_in(format.state);
-      at.pass_shift();
-    }
-    if (count > room(at.p, at.end)) return Match::kCut;
-    if (state_at(at, LX_SHIFT_SINGLE) != state_at(format, LX_SHIFT_SINGLE)) return Match::kDifferent;
-    // A single byte apart: not worth a call.
-    if (count == 1 ? *at.p != format.p[-1] : memcmp(at.p, format.p - count, count) != 0)
-      return Match::kDifferent;
-    at.p += count;
-    go_on_at(*text, at);
-    return Match::kSame;
+/// Compares the character of several units or of a state, that `format` has just read, with the text and moves over it.
+/// kCut: the text ends before it does.
+template <class Cursor>
+Match match_char(const Cursor& format, const uint8_t* before, Cursor* text) {
+  Cursor at = *text;
+  size_t count = room(before, format.p);
+  if constexpr (Cursor::kShifts) {
+    count = format.cp.width_in(format.state);
+    at.pass_shift();
   }
+  if (count > room(at.p, at.end)) return Match::kCut;
+  if (state_at(at, LX_SHIFT_SINGLE) != state_at(format, LX_SHIFT_SINGLE)) return Match::kDifferent;
+  // A single byte apart: not worth a call.
+  if (count == 1 ? *at.p != format.p[-1] : memcmp(at.p, format.p - count, count) != 0) return Match::kDifferent;
+  at.p += count;
+  go_on_at(*text, at);
+  return Match::kSame;
 }
 
 template <class Text>
@@ -56,15 +48,24 @@ class TimeParser {
     Value value{};
     Cursor at = *text;  // a copy, as is what other functions move: this one stays in registers
     const TimeSymbols& symbols = symbols_;
+    const unsigned below = at.same_below();
     int32_t code = LX_OK;
     while (code == LX_OK && has_more(format) && has_more(at)) {
       const Unit* const before = format.p;
-      if (!format.next(&value)) break;
-      if (!is_percent(format, value, symbols)) {
-        const Match found = match_char<Text>(format, before, value, &at);
-        if (found == Match::kDifferent) code = LX_E_NOT_FOUND;
-        if (found == Match::kCut) break;
-        continue;
+      if (Cursor::kOneUnit || (!Cursor::kShifts && *before < below)) {
+        value = *format.p++;
+        if (value != symbols.percent) {
+          code = value == *at.p++ ? LX_OK : LX_E_NOT_FOUND;
+          continue;
+        }
+      } else if constexpr (!Cursor::kOneUnit) {
+        if (!format.next(&value)) break;
+        if (!is_percent(format, value, symbols)) {
+          const Match found = match_char(format, before, &at);
+          if (found == Match::kDifferent) code = LX_E_NOT_FOUND;
+          if (found == Match::kCut) break;
+          continue;
+        }
       }
       bool flag = false;
       const TimeDirective& directive = take_directive(&format, symbols, &flag, &value);
@@ -178,7 +179,7 @@ class TimeParser {
       Cursor in = item.cursor(locale_);
       Value value{};
       while (in.next(&value))
-        if (match_char<Text>(in, in.p, value, at) != Match::kSame) return false;
+        if (match_char(in, in.p, at) != Match::kSame) return false;
     }
     return true;
   }
