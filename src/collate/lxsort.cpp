@@ -60,11 +60,14 @@ void note_insertion(Sort* sort, const Element& element) {
   note_set(sort, sort->second_set(element));
 }
 
-/// The pages that are laid flat: those of the weight table, and those where a pair begins.
+/// The pages that are laid flat: those of the weight table, and those where a pair begins or ends.
 size_t flat_pages(const uint8_t* payload, bool (&flat)[kPages]) {
   for (size_t page = 0; page < kPages; ++page) flat[page] = page_at(payload, page).is_table();
   const size_t count = le16(payload + fmt::kContractionCount);
-  for (size_t i = 0; i < count; ++i) flat[contraction_at(payload, i).first >> 8] = true;
+  for (size_t i = 0; i < count; ++i) {
+    const fmt::Contraction pair = contraction_at(payload, i);
+    flat[pair.first >> 8] = flat[pair.second >> 8] = true;
+  }
   size_t pages = 0;
   for (bool is_flat : flat) pages += is_flat;
   return pages;
@@ -129,6 +132,7 @@ void fill_pairs(Sort* sort, Pair* pairs) {
     ++sort->pair_count;
     note_insertion(sort, pairs[place].element);
     flat_element(*sort, record.first).set_starts_pair();
+    flat_element(*sort, record.second).set_ends_pair();
     sort->second_bits[(record.second & 0xFF) / 32] |= 1u << record.second % 32;
   }
 }
@@ -138,8 +142,9 @@ void note_alone(Sort* sort) {
     for (size_t low = 0; sort->pages[page].elements != nullptr && low < kPageElements; ++low) {
       const auto u = static_cast<LXUChar>(page << 8 | low);
       Element& element = flat_element(*sort, u);
-      const bool in_pair = element.starts_pair() || sort->may_end_pair(u);
-      if (!in_pair && element.sets() == 1 && element.primary() != 0) element.set_stands_alone();
+      element.note_own_primary();
+      if (element.has_own_primary() && !element.starts_pair() && !element.ends_pair())
+        element.set_stands_alone();
     }
   }
 }

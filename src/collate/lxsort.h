@@ -17,6 +17,8 @@ namespace lx {
 ///         50        some pair begins with the character
 ///         51        it stands alone, in no pair, with one set and a primary
 ///         52..55    its class
+///         56        it has one set, and a primary
+///         57        some pair ends with the character
 ///
 /// Of two sets the expansion table holds both; the special weight is then the number of the record.
 class Element {
@@ -35,7 +37,8 @@ class Element {
             static_cast<uint8_t>(tertiary()), static_cast<uint16_t>(special())};
   }
   unsigned sets() const { return bits_ >> 48 & 3; }  // 0: the character is ignored
-  bool starts_pair() const { return (bits_ & kStartsPair) != 0; }
+  bool starts_pair() const { return has(kStartsPair); }
+  bool ends_pair() const { return has(kEndsPair); }
   unsigned char_class() const { return bits_ >> 52 & 0xF; }  // LX_APPEND_ bits
   bool appends(unsigned bit) const { return (char_class() & bit) != 0; }
 
@@ -45,15 +48,40 @@ class Element {
   }
 
   /// Known of characters with a table; false of others.
-  bool stands_alone() const { return (bits_ & kStandsAlone) != 0; }
+  bool stands_alone() const { return has(kStandsAlone); }
+  bool has_own_primary() const { return has(kOwnPrimary); }
 
-  void set_starts_pair() { bits_ |= kStartsPair; }
-  void set_stands_alone() { bits_ |= kStandsAlone; }
+  void set_starts_pair() { bits_ |= uint64_t{1} << kStartsPair; }
+  void set_ends_pair() { bits_ |= uint64_t{1} << kEndsPair; }
+  void note_own_primary() { bits_ |= uint64_t{sets() == 1 && primary() != 0} << kOwnPrimary; }
+  void set_stands_alone() { bits_ |= uint64_t{1} << kStandsAlone; }
 
  private:
-  static constexpr uint64_t kStartsPair = uint64_t{1} << 50;
-  static constexpr uint64_t kStandsAlone = uint64_t{1} << 51;
+  friend class ElementSummary;
+  enum : unsigned { kStartsPair = 50, kStandsAlone = 51, kClass = 52, kOwnPrimary = 56, kEndsPair = 57 };
+  bool has(unsigned bit) const { return (bits_ & uint64_t{1} << bit) != 0; }
   uint64_t bits_ = 0;
+};
+
+/// What the elements of a text have in common, told without a branch for any of them.
+class ElementSummary {
+ public:
+  void add(const Element& element) {
+    all_ &= element.bits_;
+    some_ |= element.bits_;
+    pairs_ |= before_ << (Element::kEndsPair - Element::kStartsPair) & element.bits_;
+    before_ = element.bits_;
+  }
+  /// Each has a primary of its own and no special weight, and there may be no pair.
+  bool plain() const {
+    return (all_ >> Element::kOwnPrimary & 1) != 0 && (pairs_ >> Element::kEndsPair & 1) == 0 &&
+           static_cast<uint16_t>(some_ >> 32) == 0;
+  }
+  unsigned all_append() const { return all_ >> Element::kClass & 0xF; }
+  unsigned some_append() const { return some_ >> Element::kClass & 0xF; }
+
+ private:
+  uint64_t all_ = UINT64_MAX, some_ = 0, pairs_ = 0, before_ = 0;
 };
 
 /// Two characters that sort as one element.
@@ -84,6 +112,15 @@ struct Sort {
     const Page& page = pages[u >> 8];
     if (page.elements != nullptr) return page.elements[u & 0xFF];
     return computed(page, u);
+  }
+
+  /// With all that is known of characters with a table.
+  [[gnu::always_inline]] Element noted_element(LXUChar u) const {
+    const Page& page = pages[u >> 8];
+    if (page.elements != nullptr) return page.elements[u & 0xFF];
+    Element element = computed(page, u);
+    element.note_own_primary();
+    return element;
   }
 
   static Element computed(const Page& page, LXUChar u) {

@@ -64,14 +64,6 @@ uint8_t* write_level(uint8_t* output, const Level<uint8_t>& level) {
   return output;
 }
 
-/// Whether a character has one weight set with a primary and begins no pair with the one behind it.
-template <class Cursor>
-bool has_own_primary(const Sort& sort, const Element& element, Cursor behind) {
-  if (element.sets() != 1 || element.primary() == 0) return false;
-  LXUChar second = 0;
-  return !element.starts_pair() || !behind.next(&second) || !sort.may_end_pair(second);
-}
-
 /// The key of a short text of characters with a primary of their own and no special weight: its bytes, or 0 for another
 /// text.
 template <class Cursor>
@@ -80,22 +72,20 @@ int32_t make_short_key(const Sort& sort, const Cursor& text, const Output& outpu
   uint8_t primaries[2 * kShortText + 1];
   uint8_t second[kShortText + 1], third[kShortText + 1];
   Level<uint8_t> secondaries(second), tertiaries(third);
-  unsigned appends = kOrder, some_append = 0, special = 0;
+  ElementSummary summary;
   size_t chars = 0;
   Cursor in(text);
   for (LXUChar u = 0; in.next(&u); ++chars) {
-    const Element element = sort.element(u);
-    if (!element.stands_alone() && !has_own_primary(sort, element, in)) return 0;
+    const Element element = sort.noted_element(u);
     put_le16(primaries + 2 * chars, __builtin_bswap16(static_cast<uint16_t>(element.primary())));
     secondaries.append(element.secondary());
     tertiaries.append(element.tertiary());
-    special |= element.special();
-    appends &= element.char_class();
-    some_append |= element.char_class() & kOrder;
+    summary.add(element);
   }
   // All characters have to be alike in what they append.
-  const bool alike = appends == some_append && (appends & LX_APPEND_PRIMARY) != 0;
-  if (chars == 0 || special != 0 || !alike) return 0;
+  const unsigned appends = summary.all_append() & kOrder;
+  const bool alike = appends == (summary.some_append() & kOrder) && (appends & LX_APPEND_PRIMARY) != 0;
+  if (chars == 0 || !summary.plain() || !alike) return 0;
   primaries[2 * chars] = 0;
   const auto finish = [&](Level<uint8_t>* level, unsigned bit, uint8_t common) {
     if ((appends & bit) == 0) level->run = level->begin;  // all of them were inserted
