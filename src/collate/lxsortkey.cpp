@@ -69,19 +69,24 @@ uint8_t* write_level(uint8_t* output, const Level<uint8_t>& level) {
 template <class Cursor>
 int32_t make_short_key(const Sort& sort, const Cursor& text, const Output& output) {
   constexpr unsigned kOrder = LX_APPEND_PRIMARY | LX_APPEND_SECONDARY | LX_APPEND_TERTIARY;
-  uint8_t primaries[2 * kShortText + 1];
-  uint8_t second[kShortText + 1], third[kShortText + 1];
-  Level<uint8_t> secondaries(second), tertiaries(third);
+  uint8_t primaries[2 * kShortText + 1], second[kShortText + 1], third[kShortText + 1];
+  uint8_t *primary = primaries, *secondary = second, *tertiary = third;
   ElementSummary summary;
-  size_t chars = 0;
   Cursor in(text);
-  for (LXUChar u = 0; in.next(&u); ++chars) {
+  for (LXUChar u = 0; in.next(&u); primary += 2) {
     const Element element = sort.noted_element(u);
-    put_le16(primaries + 2 * chars, __builtin_bswap16(static_cast<uint16_t>(element.primary())));
-    secondaries.append(element.secondary());
-    tertiaries.append(element.tertiary());
+    put_le16(primary, __builtin_bswap16(static_cast<uint16_t>(element.primary())));
+    // A weight that is 0 is written over.
+    *secondary = static_cast<uint8_t>(element.secondary());
+    secondary += element.secondary() != 0;
+    *tertiary = static_cast<uint8_t>(element.tertiary());
+    tertiary += element.tertiary() != 0;
     summary.add(element);
   }
+  const auto chars = room(primaries, primary) / 2;
+  Level<uint8_t> secondaries(second), tertiaries(third);
+  secondaries.run = secondaries.end = secondary;
+  tertiaries.run = tertiaries.end = tertiary;
   // All characters have to be alike in what they append.
   const unsigned appends = summary.all_append() & kOrder;
   const bool alike = appends == (summary.some_append() & kOrder) && (appends & LX_APPEND_PRIMARY) != 0;
