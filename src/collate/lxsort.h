@@ -72,11 +72,12 @@ class ElementSummary {
     pairs_ |= before_ << (Element::kEndsPair - Element::kStartsPair) & element.bits_;
     before_ = element.bits_;
   }
-  /// Each has a primary of its own and no special weight, and there may be no pair.
+  /// Each has a primary of its own and no special weight.
   bool plain() const {
-    return (all_ >> Element::kOwnPrimary & 1) != 0 && (pairs_ >> Element::kEndsPair & 1) == 0 &&
-           static_cast<uint16_t>(some_ >> 32) == 0;
+    return (all_ >> Element::kOwnPrimary & 1) != 0 && static_cast<uint16_t>(some_ >> 32) == 0;
   }
+  /// Whether one that begins some pair stands before one that ends some.
+  bool may_have_pair() const { return (pairs_ >> Element::kEndsPair & 1) != 0; }
   unsigned all_append() const { return all_ >> Element::kClass & 0xF; }
   unsigned some_append() const { return some_ >> Element::kClass & 0xF; }
 

@@ -64,17 +64,30 @@ uint8_t* write_level(uint8_t* output, const Level<uint8_t>& level) {
   return output;
 }
 
-/// The key of a short text of characters with a primary of their own and no special weight: its bytes, or 0 for another
-/// text.
+/// Takes the character behind one where the two are a pair, which has the element then.
 template <class Cursor>
+bool take_pair(const Sort& sort, LXUChar first, Cursor* in, Element* element) {
+  LXUChar second = 0;
+  Cursor behind(*in);
+  if (!element->starts_pair() || !behind.next(&second) || !sort.pair(first, second, element)) return false;
+  element->note_own_primary();
+  go_on_at(*in, behind);
+  return true;
+}
+
+/// The key of a short text of elements with a primary of their own and no special weight: its bytes, or 0 for another
+/// text. Pairs are looked for when it is known that there may be some.
+template <bool kPairs, class Cursor>
 int32_t make_short_key(const Sort& sort, const Cursor& text, const Output& output) {
   constexpr unsigned kOrder = LX_APPEND_PRIMARY | LX_APPEND_SECONDARY | LX_APPEND_TERTIARY;
   uint8_t primaries[2 * kShortText + 1], second[kShortText + 1], third[kShortText + 1];
   uint8_t *primary = primaries, *secondary = second, *tertiary = third;
   ElementSummary summary;
+  size_t pairs = 0;
   Cursor in(text);
   for (LXUChar u = 0; in.next(&u); primary += 2) {
-    const Element element = sort.noted_element(u);
+    Element element = sort.noted_element(u);
+    if constexpr (kPairs) pairs += take_pair(sort, u, &in, &element);
     put_le16(primary, __builtin_bswap16(static_cast<uint16_t>(element.primary())));
     // A weight that is 0 is written over.
     *secondary = static_cast<uint8_t>(element.secondary());
@@ -83,28 +96,28 @@ int32_t make_short_key(const Sort& sort, const Cursor& text, const Output& outpu
     tertiary += element.tertiary() != 0;
     summary.add(element);
   }
-  const auto chars = room(primaries, primary) / 2;
-  Level<uint8_t> secondaries(second), tertiaries(third);
-  secondaries.run = secondaries.end = secondary;
-  tertiaries.run = tertiaries.end = tertiary;
-  // All characters have to be alike in what they append.
+  if (!kPairs && summary.may_have_pair()) return make_short_key<true>(sort, text, output);
+  // All elements have to be alike in what they append.
   const unsigned appends = summary.all_append() & kOrder;
   const bool alike = appends == (summary.some_append() & kOrder) && (appends & LX_APPEND_PRIMARY) != 0;
-  if (chars == 0 || !summary.plain() || !alike) return 0;
-  primaries[2 * chars] = 0;
-  const auto finish = [&](Level<uint8_t>* level, unsigned bit, uint8_t common) {
-    if ((appends & bit) == 0) level->run = level->begin;  // all of them were inserted
-    level->close_run();
-    trim_level(level, common);
+  const size_t bytes_of_primaries = room(primaries, primary);
+  if (bytes_of_primaries == 0 || !summary.plain() || !alike) return 0;
+  *primary = 0;
+  const auto finish = [&](uint8_t* begin, uint8_t* end, unsigned bit, uint8_t common) {
+    Level<uint8_t> level(begin);
+    level.end = end;
+    if ((appends & bit) == 0) level.close_run();  // all of them were inserted
+    trim_level(&level, common);
+    return level;
   };
-  finish(&secondaries, LX_APPEND_SECONDARY, sort.default_secondary);
-  finish(&tertiaries, LX_APPEND_TERTIARY, sort.default_tertiary);
-  const size_t bytes = 2 * chars + secondaries.count() + tertiaries.count() + Levels::kSeparators;
+  const auto secondaries = finish(second, secondary, LX_APPEND_SECONDARY, sort.default_secondary);
+  const auto tertiaries = finish(third, tertiary, LX_APPEND_TERTIARY, sort.default_tertiary);
+  const size_t bytes = bytes_of_primaries + secondaries.count() + tertiaries.count() + Levels::kSeparators;
   if (bytes <= output.usable) {
-    memcpy(output.start, primaries, 2 * chars + 1);
-    write_level(write_level(output.start + 2 * chars + 1, secondaries), tertiaries);
+    memcpy(output.start, primaries, bytes_of_primaries + 1);
+    write_level(write_level(output.start + bytes_of_primaries + 1, secondaries), tertiaries);
   }
-  return finish_key(output, bytes, chars);
+  return finish_key(output, bytes, bytes_of_primaries / 2 + pairs);
 }
 
 /// Makes the key of a text of at most `most_chars` characters: its bytes, or -1 without memory.
@@ -112,7 +125,7 @@ template <class Cursor>
 int32_t make_key(const Sort& sort, const Cursor& text, size_t most_chars, const Output& output) {
   if constexpr (Cursor::kRuns)
     if (most_chars <= kShortText)
-      if (const int32_t bytes = make_short_key(sort, text, output)) return bytes;
+      if (const int32_t bytes = make_short_key<false>(sort, text, output)) return bytes;
   if (most_chars > Levels::kMostChars) return -1;
   const bool in_place = output.is_work_area(most_chars);
   const WorkBuffer space(in_place ? 0 : Levels::bytes_for(most_chars));
