@@ -157,9 +157,8 @@ class NumberText {
   /// No separator stands before the most significant digit, and none is written when it is 0.
   template <class Groups>
   void put_integer(Decimal* decimal, Unit separator, Groups groups) {
-    if (decimal->is_word && separator <= 0xFF && (separator == 0 || groups.all_threes())) {
+    if (decimal->is_word && separator <= 0xFF && (separator == 0 || groups.all_threes()))
       return integer_.put_integer(decimal->word, zero_, static_cast<uint8_t>(separator));
-    }
     if (decimal->is_word) decimal->make_digits();
     // Values in locals: a unit that is a byte may stand anywhere, for all the compiler knows.
     const char* const first = decimal->integer;
