@@ -67,6 +67,14 @@ int32_t valid_bytes(const char* text, size_t length) {
   return static_cast<int32_t>(strnlen(text, length));
 }
 
+/// Whether a text of 4 to 15 bytes is ASCII, each byte of which is a character.
+bool is_short_ascii(const Codepage& cp, const uint8_t* p, size_t bytes) {
+  constexpr uint64_t kHigh = 0x8080808080808080;
+  if (bytes - 4 >= 12 || !cp.leads.above_ascii) return false;
+  if (bytes < 8) return ((le32(p) | le32(p + bytes - 4)) & kHigh) == 0;
+  return ((le64(p) | le64(p + bytes - 8)) & kHigh) == 0;
+}
+
 }  // namespace
 
 namespace lx {
@@ -159,7 +167,9 @@ char* LXPrevCharEx(LXLocale* locale, const char* start, const char* current, LXS
 int32_t LXNumChars(LXLocale* locale, const char* text, int32_t bytes) {
   const Primitive in(locale);
   if (!in) return 0;
-  return with_cursor(in.cp(), Form::kPlain, LX_SHIFT_SINGLE, bytes_of(text), text_units(text, bytes),
+  const size_t units = text_units(text, bytes);
+  if (is_short_ascii(in.cp(), bytes_of(text), units)) return static_cast<int32_t>(units);
+  return with_cursor(in.cp(), Form::kPlain, LX_SHIFT_SINGLE, bytes_of(text), units,
                      [](auto at) { return static_cast<int32_t>(pass_all(&at)); });
 }
 
