@@ -84,24 +84,35 @@ inline void copy_block(uint8_t* to, const uint16_t* from) {
   store_block(to, _mm_packus_epi16(load_block(from), load_block(from + kBlock / 2)));
 }
 
-/// Stores a block of units that stand at any address, as bytes or as they are: how many are below `below` and not 0 before
-/// the first one that is not.
+/// Stores the first `count` units of a vector; the others stay as they are.
+inline void store_first(uint8_t* to, __m128i v, size_t count) {
+  const __m128i place = _mm_setr_epi8(0, 1, 2, 3, 4, 5, 6, 7, 8, 9, 10, 11, 12, 13, 14, 15);
+  const __m128i stored = _mm_cmplt_epi8(place, _mm_set1_epi8(static_cast<char>(count)));
+  store_block(to, _mm_or_si128(_mm_and_si128(stored, v), _mm_andnot_si128(stored, load_block(to))));
+}
+
+/// Stores the units of a block that stand at any address, as bytes or as they are, up to the first one that is 0 or not
+/// below `below`: how many they are. There is room for a block, of which the rest stays as it is.
 inline size_t copy_text_block(uint8_t* to, const uint8_t* units, unsigned below) {
   const __m128i first = load_block(units), second = load_block(units + kBlock), zero = _mm_setzero_si128();
-  store_block(to, _mm_packus_epi16(first, second));
   const __m128i high = _mm_set1_epi16(static_cast<short>(-below));
   const auto copied = [=](__m128i v) {
     return _mm_andnot_si128(_mm_cmpeq_epi16(v, zero), _mm_cmpeq_epi16(_mm_and_si128(v, high), zero));
   };
   const __m128i all = _mm_packs_epi16(copied(first), copied(second));
-  return static_cast<size_t>(__builtin_ctz(~static_cast<unsigned>(_mm_movemask_epi8(all))));
+  const auto count = static_cast<size_t>(__builtin_ctz(~static_cast<unsigned>(_mm_movemask_epi8(all))));
+  store_first(to, _mm_packus_epi16(first, second), count);
+  return count;
 }
 inline size_t copy_text_block(uint16_t* to, const uint8_t* units, unsigned) {
   const __m128i first = load_block(units), second = load_block(units + kBlock), zero = _mm_setzero_si128();
-  store_block(to, first);
-  store_block(to + kHalfBlock, second);
   const __m128i ends = _mm_packs_epi16(_mm_cmpeq_epi16(first, zero), _mm_cmpeq_epi16(second, zero));
-  return static_cast<size_t>(__builtin_ctz(static_cast<unsigned>(_mm_movemask_epi8(ends)) | 1u << kBlock));
+  const auto count =
+      static_cast<size_t>(__builtin_ctz(static_cast<unsigned>(_mm_movemask_epi8(ends)) | 1u << kBlock));
+  auto* const bytes = reinterpret_cast<uint8_t*>(to);
+  store_first(bytes, first, count < kHalfBlock ? 2 * count : kBlock);
+  store_first(bytes + kBlock, second, count < kHalfBlock ? 0 : 2 * count - kBlock);
+  return count;
 }
 
 inline unsigned byte_mask(__m128i v) {
