@@ -50,10 +50,10 @@ LX_API LXCatalog* LXOpenCatalogU(LXLocale* locale, const LXUChar* directory, con
 
 /* Writes message `number` of `set`, or `default_text` (may be null) where the catalog has no such message, to
  * `output` of `size` bytes, cut at a whole character and null-terminated. A default text is null-terminated and
- * in the locale's codepage. With a `size` below 1 one null is written all the same and the result is LX_OK.
- * Returns LX_OK, also for a message that was cut; LX_E_MESSAGE (no such message, no default text; the output is
- * empty), LX_E_CATALOG (the catalog cannot be read or is damaged; the output is empty) or LX_E_CATALOG_NULL
- * (null catalog; nothing is written). */
+ * in the locale's codepage; it may stand in `output`. With a `size` below 1 one null is written all the same and
+ * the result is LX_OK. Returns LX_OK, also for a message that was cut; LX_E_MESSAGE (no such message, no default
+ * text; the output is empty), LX_E_CATALOG (the catalog cannot be read or is damaged; the output is empty) or
+ * LX_E_CATALOG_NULL (null catalog; nothing is written). */
 LX_API int32_t LXGetMessage(LXCatalog* catalog, uint32_t set, uint32_t number, char* output, int32_t size,
                             const char* default_text);
 /* As LXGetMessage; `size` counts packed codes. The text goes through the locale's codepage, the default text,

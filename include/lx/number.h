@@ -101,7 +101,8 @@ LX_API int32_t LXStrGroupingSizeU(LXLocale* locale, const LXUChar* text, int32_t
 
 /* Reading. Common to the functions of this half:
  *  length       bytes, with LX_CHARACTERS characters; below 0: null-terminated. In the W forms codes, in the U
- *               forms 16-bit units, and LX_CHARACTERS is ignored. Nothing behind the text is read.
+ *               forms 16-bit units, and LX_CHARACTERS is ignored. Nothing behind the text is read, but for the
+ *               byte behind a text of so many characters of a shift-sensitive codepage.
  *  end          may be null; receives the place of the character or run of white space that ended the number,
  *               or the end of the text. With last error LX_E_INVALID or LX_E_BASE the beginning.
  *  white space  goes before everything: a thousands separator that is white space, such as U+00A0, ends the

@@ -94,14 +94,17 @@ int32_t write_message(LXLocale* locale, LXLocale* from, const MessageText& messa
   return LX_OK;
 }
 
-/// A text that does not fit is cut so that it can be ended.
+/// A text that does not fit is cut so that it can be ended; it may stand in the output.
 int32_t write_default(LXLocale* locale, const char* text, char* output, int32_t size) {
   const bool fits = strlen(text) < static_cast<size_t>(size);
-  const int32_t closing = codepage_of(*locale->codepage).shift_sensitive ? 2 : 1;
   LXShiftState state = LX_SHIFT_SINGLE;
-  const int32_t bytes =
-      LXStrcpyEx(locale, output, fits ? size : size - closing, text, LX_SHIFT_SINGLE, -1, &state, 0);
-  if (!fits) LXTerminateStringEx(locale, output + bytes, state, LX_TERMINATE);
+  const auto copy = [&](int32_t room) {
+    return LXStrcpyEx(locale, output, room, text, LX_SHIFT_SINGLE, -1, &state, 0);
+  };
+  int32_t bytes = copy(fits ? size : size - 1);
+  if (fits) return LX_OK;
+  if (state == LX_SHIFT_DOUBLE) bytes = copy(size - 2);  // a Shift-In stands before the null
+  LXTerminateStringEx(locale, output + bytes, state, LX_TERMINATE);
   return LX_OK;
 }
 
@@ -128,6 +131,7 @@ int32_t write_message(LXLocale* locale, LXLocale* from, const MessageText& messa
 template <class Unit>
 int32_t write_default(LXLocale* locale, const Unit* text, Unit* output, int32_t size) {
   const Argument<Unit> bytes(locale, text);
+  output[0] = 0;
   if (!bytes) return LX_E_CATALOG;
   from_bytes(locale, bytes.bytes(), output, size);
   return LX_OK;
@@ -140,17 +144,21 @@ int32_t get_message(LXCatalog* catalog, uint32_t set, uint32_t number, Unit* out
   Call call(unit, catalog != nullptr && initialized() ? catalog->opener : nullptr);
   if (catalog == nullptr) return call.fail(LX_E_CATALOG_NULL, LX_E_CATALOG_NULL);
   if (!call) return call.fail(LX_E_NOT_INITIALIZED, LX_E_NOT_INITIALIZED);
-  output[0] = 0;
-  if (size <= 0) return call.exit(LX_OK);
+  if (size <= 0) {
+    output[0] = 0;
+    return call.exit(LX_OK);
+  }
   SetRecord room;
   const SetRecord* record = nullptr;
   MessageText message;
   int32_t code = MCGetSet(catalog, set, &room, &record);
   if (code == LX_OK) code = MCGetMsg(*catalog, *record, number, &message);
-  if (code == LX_OK)
-    code = write_message(call.locale(), catalog->locale, message, output, size);
-  else if (code == LX_E_MESSAGE && default_text != nullptr)
+  if (code == LX_E_MESSAGE && default_text != nullptr) {
     code = write_default(call.locale(), default_text, output, size);
+  } else {
+    output[0] = 0;
+    if (code == LX_OK) code = write_message(call.locale(), catalog->locale, message, output, size);
+  }
   return call.end(code, code);
 }
 

@@ -86,7 +86,7 @@ void fill_scalars(Codepage* cp, uint16_t id, const Sections& sections) {
   cp->shift_out = payload[fmt::kShiftOut];
   cp->shift_in = payload[fmt::kShiftIn];
   cp->single_byte = cp->width == 1;
-  cp->shift_sensitive = (le16(payload + fmt::kFlags) & fmt::kFlagShift) != 0;
+  cp->shift_sensitive = cp->width > 1 && (le16(payload + fmt::kFlags) & fmt::kFlagShift) != 0;
   cp->utf8 = id == fmt::kUtf8Id;
   for (size_t b = 0; b < kRow; ++b) cp->unicode[b] = le16(payload + fmt::kUnicode + 2 * b);
 }

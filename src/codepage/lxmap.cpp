@@ -100,7 +100,7 @@ struct CodepageMapper {
       const auto type = format::codepage::TypeRecord::read(record);
       if ((type.type & mask) == 0) return false;
       *mapped = pack(c.p, c.length) + type.case_delta;
-      return true;
+      return code_bytes(*mapped) <= cp.width;
     } else if constexpr (kKind == Kind::kFullWidth) {
       *mapped = c.length == 1 ? widths.full_of_byte(*c.p) : widths.to_full(pack(c.p, c.length));
     } else if constexpr (kKind == Kind::kHalfWidth) {

@@ -122,7 +122,7 @@ template <class Text>
   const size_t length = cp.length(*p);
   const uint32_t code = pack(p, length) + type.case_delta;
   store_code(to, code, length);
-  return code_bytes(code) == length;
+  return code_bytes(code) == length && without_zero_bytes(code) == code;
 }
 
 /// What Vectors::map_utf8 does, with all characters of several bytes left.

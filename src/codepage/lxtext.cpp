@@ -95,7 +95,6 @@ Part part_that_fits(const Codepage& cp, Form form, const ByteText& text, int32_t
   if (!characters) return whole_chars(cp, form, text.p, text.state, least(given, wanted), given);
   const bool to_null = text.length < 0;
   const size_t there = to_null ? static_cast<size_t>(chars_in_bytes(cp, text.p, text.state, given)) : given;
-  if (to_null && there <= wanted) return {given, there};  // nothing behind the null is looked at
   const size_t chars = least(there, wanted);
   // Two shift bytes side by side may be counted as a character; the null still ends the text.
   const size_t most = to_null ? given : SIZE_MAX;

@@ -127,7 +127,8 @@ int32_t make_key(const Sort& sort, const Cursor& text, size_t most_chars, const 
     if (most_chars <= kShortText)
       if (const int32_t bytes = make_short_key<false>(sort, text, output)) return bytes;
   if (most_chars > Levels::kMostChars) return -1;
-  const bool in_place = output.is_work_area(most_chars);
+  LXUChar u = 0;
+  const bool in_place = output.is_work_area(most_chars) && Cursor(text).next(&u);
   const WorkBuffer space(in_place ? 0 : Levels::bytes_for(most_chars));
   if (!space) return -1;
   const Key key(sort, text, most_chars, in_place ? output.aligned : space.as<uint8_t>());

@@ -12,27 +12,28 @@ namespace {
 
 RAS1_Unit unit = RAS1_UNIT("lxstrstr");
 
-// A candidate, from its first character to `end`, and the substring are compared by LXStrcoll and its forms, as
-// a trace shows it.
+// A candidate, from its first character to behind its last one, and the substring are compared by LXStrcoll and
+// its forms, as a trace shows it. A shift byte behind the last character belongs to either.
 
 template <class Cursor>
-int32_t collate(LXLocale* locale, const Walk<Cursor>& at, const uint8_t* end, const Cursor& part,
+int32_t collate(LXLocale* locale, const Walk<Cursor>& at, const Cursor& behind, const Cursor& part,
                 int32_t part_bytes, uint32_t options) {
-  return LXStrcoll(locale, chars_of(at.start), static_cast<int32_t>(end - at.start), chars_of(part.p),
+  return LXStrcoll(locale, chars_of(at.start), static_cast<int32_t>(behind.p - at.start), chars_of(part.p),
                    part_bytes, options);
 }
-int32_t collate(LXLocale* locale, const Walk<ShiftCursor>& at, const uint8_t* end, const ShiftCursor& part,
+int32_t collate(LXLocale* locale, const Walk<ShiftCursor>& at, ShiftCursor behind, const ShiftCursor& part,
                 int32_t part_bytes, uint32_t options) {
-  return LXStrcollEx(locale, chars_of(at.start), at.in.state, static_cast<int32_t>(end - at.start),
+  behind.pass_shift();
+  return LXStrcollEx(locale, chars_of(at.start), at.in.state, static_cast<int32_t>(behind.p - at.start),
                      chars_of(part.p), part.state, part_bytes, options);
 }
-int32_t collate(LXLocale* locale, const Walk<CodeCursor>& at, const LXWChar* end, const CodeCursor& part,
+int32_t collate(LXLocale* locale, const Walk<CodeCursor>& at, const CodeCursor& behind, const CodeCursor& part,
                 int32_t part_codes, uint32_t options) {
-  return LXWcscoll(locale, at.start, static_cast<int32_t>(end - at.start), part.p, part_codes, options);
+  return LXWcscoll(locale, at.start, static_cast<int32_t>(behind.p - at.start), part.p, part_codes, options);
 }
-int32_t collate(LXLocale* locale, const Walk<UnicodeCursor>& at, const LXUChar* end, const UnicodeCursor& part,
-                int32_t part_units, uint32_t options) {
-  return LXStrcollU(locale, at.start, static_cast<int32_t>(end - at.start), part.p, part_units, options);
+int32_t collate(LXLocale* locale, const Walk<UnicodeCursor>& at, const UnicodeCursor& behind,
+                const UnicodeCursor& part, int32_t part_units, uint32_t options) {
+  return LXStrcollU(locale, at.start, static_cast<int32_t>(behind.p - at.start), part.p, part_units, options);
 }
 
 /// A part that is looked for in time that grows with the lengths of both texts, by the algorithm of Knuth, Morris
@@ -157,7 +158,7 @@ Place<Cursor> try_candidates(LXLocale* locale, const Cursor& text, const Cursor&
     const Chance it_has = chance(at.start, number, ahead.in.p);
     if (it_has == Chance::kStop) break;
     if (it_has == Chance::kNone) continue;
-    const int32_t difference = collate(locale, at, ahead.in.p, part, part_units, options);
+    const int32_t difference = collate(locale, at, ahead.in, part, part_units, options);
     *code = last_error_of(*locale);
     if (*code != LX_OK) break;
     if (difference == 0) return {at.start, at.in};

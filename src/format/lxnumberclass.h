@@ -47,11 +47,18 @@ Char<kForm> sign_char(const Codepage& cp, Value value) {
     return value;
 }
 
+/// Shift-stateful text in the plain form is read byte by byte, a sign's character of two bytes too.
+template <Form kForm>
+bool read_by_bytes(const Codepage& cp) {
+  return kForm == Form::kPlain && cp.shift_sensitive;
+}
+
 template <Form kForm>
 Sign with_first(const Codepage& cp, Sign sign) {
   sign.first = read_sign<kForm>(cp, sign, [&](auto in, auto value) {
     return in.next(&value) ? uint32_t{sign_char<kForm>(cp, value)} : 0u;
   });
+  if (sign.first > 0xFF && read_by_bytes<kForm>(cp)) sign.first >>= 8;
   return sign;
 }
 
@@ -87,7 +94,7 @@ struct Classifier {
     const uint32_t zero = digits.zero;
     Cursor at(*in);  // a copy, in registers
     Char<kForm> c{};
-    for (Cursor ahead(at); ahead.next(&c); go_on_at(at, ahead)) {
+    for (Cursor ahead(at); next(&ahead, &c); go_on_at(at, ahead)) {
       const uint32_t digit = c - zero;
       if (digit > 9 || !use(digit)) break;
     }
@@ -99,7 +106,7 @@ struct Classifier {
   int32_t take(Cursor* in) const {
     Cursor ahead(*in);
     Char<kForm> c{};
-    if (!ahead.next(&c)) return kNoClass;
+    if (!next(&ahead, &c)) return kNoClass;
     if (plain_digits && is_digit(c)) {
       go_on_at(*in, ahead);
       return static_cast<int32_t>(c - uint32_t{digits.zero});
@@ -112,10 +119,10 @@ struct Classifier {
   [[gnu::noinline]] int32_t take_any(Cursor* in) const {
     Cursor ahead(*in);
     Char<kForm> c{};
-    if (!ahead.next(&c)) return kNoClass;
+    if (!next(&ahead, &c)) return kNoClass;
     if (is_space(c)) {
       do go_on_at(*in, ahead);
-      while (ahead.next(&c) && is_space(c));
+      while (next(&ahead, &c) && is_space(c));
       return LX_CLASS_SPACE;
     }
     if (c == positive.first && c != 0 && take_sign(in, ahead, positive)) return LX_CLASS_POSITIVE;
@@ -128,6 +135,15 @@ struct Classifier {
       found = LX_CLASS_DECIMAL;
     if (found >= 0) go_on_at(*in, ahead);
     return found;
+  }
+
+  /// Takes the next character. One of two bytes whose first is null has the code of a character of one byte, and is
+  /// none of a number.
+  template <class Cursor>
+  [[gnu::always_inline]] static bool next(Cursor* in, Char<kForm>* c) {
+    if (!in->next(c)) return false;
+    if constexpr (Cursor::kShifts) return *c > 0xFF || in->length() == 1;
+    return true;
   }
 
   bool is_digit(uint32_t c) const { return c - digits.zero <= 9; }
@@ -154,10 +170,19 @@ struct Classifier {
   bool take_sign(Cursor* in, Cursor& ahead, const Sign& sign) const {
     if (sign.bytes != nullptr || sign.unicode != nullptr || sign.codes != nullptr) {
       Cursor whole(*in);
-      Char<kForm> c{};
-      const bool same = read_sign<kForm>(cp, sign, [&](auto text, auto wanted) {
-        while (text.next(&wanted))
-          if (!whole.next(&c) || c != sign_char<kForm>(cp, wanted)) return false;
+      const auto take_char = [&](uint32_t wanted) {
+        Char<kForm> c{};
+        return next(&whole, &c) && c == wanted;
+      };
+      const bool same = read_sign<kForm>(cp, sign, [&](auto text, auto value) {
+        while (text.next(&value)) {
+          uint32_t wanted = sign_char<kForm>(cp, value);
+          if (wanted > 0xFF && read_by_bytes<kForm>(cp)) {
+            if (!take_char(wanted >> 8)) return false;
+            wanted &= 0xFF;
+          }
+          if (!take_char(wanted)) return false;
+        }
         return true;
       });
       if (!same) return false;

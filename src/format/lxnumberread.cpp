@@ -23,6 +23,13 @@ auto read(const Codepage& cp, const Input<kForm>& from, Body&& body) {
   return with_cursor(cp, kForm, from.text, units, body);
 }
 
+/// Where reading ended. A shift byte that ends the text does not remain of it.
+template <class Cursor>
+auto place_behind(Cursor in) {
+  if constexpr (Cursor::kShifts) in.pass_last_shift();
+  return in.p;
+}
+
 /// What a parser has read of the value.
 class Magnitude {
  public:
@@ -231,18 +238,19 @@ size_t read_plain_long(const LXLocale& locale, const Text<FormUnit<kForm>>& text
   if (kForm != Form::kUnicode && (!cp.plain_digits || (cp.type(chars.minus) & LX_C1_SPACE) != 0)) return 0;
   if (kForm == Form::kEx && text.state != LX_SHIFT_SINGLE) return 0;
   if (digit_of(separator_of<kForm>(locale, true, kThousands)) <= 9) return 0;
-  const size_t units =
-      text.length < 0 ? units_before_null(text.p, kMost + 2) : static_cast<size_t>(text.length);
-  if (units - 1 > kMost) return 0;
+  // Digits are read and their end is looked for in one loop: how many there are is what nothing foresees.
+  const size_t most = text.length < 0 ? kMost + 1 : static_cast<size_t>(text.length);
+  if (most - 1 > kMost) return 0;
   const size_t sign = text.p[0] == chars.minus;
-  if (units - sign - 1 >= kMost) return 0;
-  uint32_t sum = 0, above = 0;
-  for (size_t i = sign; i < units; ++i) {
-    const uint32_t digit = digit_of(text.p[i]);
-    above |= digit > 9;
+  uint32_t sum = 0;
+  size_t units = sign;
+  for (; units < most; ++units) {
+    const uint32_t digit = digit_of(text.p[units]);
+    if (digit > 9) break;
     sum = sum * 10 + digit;
   }
-  if (above != 0) return 0;
+  const bool ended = text.length < 0 ? text.p[units] == 0 : units == most;
+  if (!ended || units - sign - 1 >= kMost) return 0;
   *value = static_cast<int32_t>(sign != 0 ? 0u - sum : sum);
   return units;
 }
@@ -273,7 +281,7 @@ int32_t text_to_long(LXLocale* given, const Input<kForm>& from, const Text** end
   return call.exit(read(codepage_of(call.codepage()), from, [&](auto in) {
     const bool is_unsigned = (from.flags & LX_UNSIGNED) != 0;
     const int32_t value = read_long(in, classes, static_cast<uint32_t>(base), is_unsigned);
-    put_place(end, in.p);
+    put_place(end, place_behind(in));
     return value;
   }));
 }
@@ -293,7 +301,7 @@ double text_to_double(LXLocale* given, const Input<kForm>& from, const Text** en
   auto classes = classifier_of<kForm>(*call.locale(), from.flags, true);
   read(codepage_of(call.codepage()), from, [&](auto in) {
     value = read_double(in, classes, fixed_chars<kForm>(*call.locale()));
-    put_place(end, in.p);
+    put_place(end, place_behind(in));
   });
   return exit(LX_OK);
 }

@@ -157,9 +157,11 @@ UserLocale get_user_locale(char* buffer, size_t size) {
     strncpy(buffer, name, size);
     return UserLocale::kVariable;
   }
-  const SystemLocale saved;
-  if (!saved.saved()) return UserLocale::kFailed;
-  LXMapNativeLocale(adopt_environment(), buffer, static_cast<int32_t>(size));
+  {
+    const SystemLocale saved;
+    if (!saved.saved()) return UserLocale::kFailed;
+    LXMapNativeLocale(adopt_environment(), buffer, static_cast<int32_t>(size));
+  }
   LX_TRACE(unit, RAS1_LEVEL_DETAIL, "User locale: %s", buffer);
   return UserLocale::kSystem;
 }

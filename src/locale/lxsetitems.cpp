@@ -124,14 +124,12 @@ int32_t set_string(LXLocale* locale, size_t index, const NewText& text) {
   const auto read = [&](auto body) {
     return with_cursor(cp, Form::kEx, text.state, text.bytes, text.count, body);
   };
-  size_t chars = 0;
-  const uint8_t* end = read([&](auto in) {
-    for (LXUChar u = 0; in.next(&u);) ++chars;
-    return in.p;
-  });
-  const size_t count = static_cast<size_t>(end - text.bytes);
-  const size_t shift = text.state == LX_SHIFT_DOUBLE ? 1 : 0;  // stored, so that it reads back in this state
-  const size_t units = text.units != nullptr ? text.unit_count : chars;
+  // As of a text that goes on: a Shift-Out at the end would change what is written behind it.
+  const Part whole = whole_chars(cp, Form::kEx, text.bytes, text.state, text.count, text.count + 1);
+  const size_t count = whole.units;
+  // Stored, so that the text reads back in this state.
+  const size_t shift = text.state == LX_SHIFT_DOUBLE && whole.chars != 0 ? 1 : 0;
+  const size_t units = text.units != nullptr ? text.unit_count : whole.chars;
 
   const size_t stored = strlen(locale->texts[index]);
   const size_t stored_units = units_up_to(locale->texts_unicode[index], -1);

@@ -57,9 +57,10 @@ class Map : public CaseTest {
         // The tables of UTF-8 are those of all Unicode.
         const bool utf8 = cp != nullptr && cp->file.name == "UTF8";
         bool has = cp == nullptr || utf8 || cp->find(u) != nullptr;
-        // A character of several bytes has its other case among these.
+        // A character of one byte has its other case among these, one of several between shift bytes too.
         const auto one_byte = [&](LXUChar c) { return utf8 ? c < 0x80 : cp->find(c)->code <= 0xFF; };
-        if (cp != nullptr && has && (mode & 4) != 0) has = one_byte(u) == one_byte(text[i]);
+        if (cp != nullptr && has && (mode & 4) != 0)
+          has = one_byte(text[i]) ? one_byte(u) : !cp->shift || !one_byte(u);
         pieces.push_back({has ? u : text[i], text[i], text[i]});
         continue;
       }

@@ -205,6 +205,11 @@ TEST_F(CollateTest, KeysOrderAsComparisonDoes) {
               (key_a > key_b) - (key_a < key_b))
         << a << " " << b;
   }
+  // Half a character is none, and is not given a work area either.
+  ByteString buffer(64, 0x5A), expected(3, 0);
+  expected.resize(buffer.size(), 0x5A);
+  EXPECT_EQ(LXStrxfrm(in, buffer.data(), count_of(buffer), "\xC3", 1, 0), 3);
+  EXPECT_EQ(buffer, expected);
   EXPECT_GT(equal * kSlowness, 3600);
   EXPECT_GT(different * kSlowness, 100000);
 }

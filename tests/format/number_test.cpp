@@ -116,10 +116,18 @@ TEST_F(NumberTest, DigitsAreThoseOfThePrintfConversion) {
   }
 }
 
-TEST_F(NumberTest, TwoDigitsInTheDoubleByteStateAreACharacter) {
+TEST_F(NumberTest, TwoBytesInTheDoubleByteStateAreACharacter) {
   LXLocale* const shift = library.locale(case_codepage("SHIFT"));
   EXPECT_EQ(LXStringToLongEx(shift, "\xF1\xF2", LX_SHIFT_SINGLE, 2, nullptr, 10, 0), 12);
   EXPECT_EQ(LXStringToLongEx(shift, "\xF1\xF2", LX_SHIFT_DOUBLE, 2, nullptr, 10, 0), 0);
+  EXPECT_EQ(LXStringToLongEx(shift, "\x00\xF2", LX_SHIFT_DOUBLE, 2, nullptr, 10, 0), 0);
+  // Nothing follows the Shift-In: the text ends behind it.
+  const char* const closed = "\x42\xF1\x0F";
+  const char* end = nullptr;
+  EXPECT_EQ(LXStringToLongEx(shift, closed, LX_SHIFT_DOUBLE, 3, &end, 10, LX_NATIONAL_DIGITS), 1);
+  EXPECT_EQ(end, closed + 3);
+  EXPECT_EQ(LXStringToDoubleEx(shift, closed, LX_SHIFT_DOUBLE, -1, &end, LX_NATIONAL_DIGITS), 1);
+  EXPECT_EQ(end, closed + 3);
 }
 
 TEST_F(NumberTest, NullPointersMatchNothing) {

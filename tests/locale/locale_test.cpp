@@ -228,6 +228,11 @@ TEST_F(LocaleTest, TextsThatTheCodepageHasNot) {
   EXPECT_EQ(messages(RAS1_LEVEL_INPUT, [&] { LXSetLocaleTextInfo(locale, 64, "EUR!", 3, 0); }),
             std::vector<std::string>{"type = 64, buffer size = 3, data = EUR"});
   EXPECT_EQ(LXReleaseLocale(locale), 0);
+  // Of a text that the end cuts the Shift-Out goes too: what is written behind it would be read in that state.
+  locale = LXGetLocale("English_UnitedStates.TINY-SHIFT", 0, nullptr);
+  ASSERT_EQ(LXSetLocaleTextInfoEx(locale, 64, "\xC1\x0E\x44", LX_SHIFT_SINGLE, 2, 0), 1);
+  EXPECT_EQ(LXGetLocaleTextInfo(locale, 64, bytes, 9, 0), 2);
+  EXPECT_EQ(LXReleaseLocale(locale), 0);
 }
 
 }  // namespace

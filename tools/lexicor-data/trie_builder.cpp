@@ -140,7 +140,8 @@ class TypeRecords {
       other = lx::unicode_upper(unicode);
     }
     const uint32_t other_code = other == unicode ? kNoCode : model_.round_trip(other);
-    const bool has_other = other_code != kNoCode && other_code > 0xFF;
+    // Between shift bytes a character keeps its width, and with it its state.
+    const bool has_other = other_code != kNoCode && (other_code > 0xFF || !model_.is_shift());
     return number(type, has_other ? other_code - code : 0);
   }
 
