@@ -129,6 +129,12 @@ struct Place {
   const LXObject* sort;  // null in binary order
   int32_t width;
   bool shift, ascii;
+
+  /// The units that so many characters can take: bytes, a shift byte before each of them and one behind the last.
+  template <class Unit>
+  size_t units_of_chars(size_t chars) const {
+    return sizeof(Unit) == 1 ? chars * static_cast<size_t>(width + shift) + shift : chars;
+  }
 };
 const Place& place_in(const std::string& codepage, const std::string& sort = "BINARY",
                       const std::string& language = "English_UnitedStates");

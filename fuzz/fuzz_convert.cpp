@@ -91,7 +91,8 @@ void call_plain(Input& in, const Place& to, const Place& from, const std::string
   const Block<char> given(terminated || chars ? text + '\0' : text);
   const int32_t whole_chars = length_in_chars(from.codepage, text.data(), 0, count_of(text));
   const int32_t length = terminated ? -1 : chars ? whole_chars : count_of(text);
-  const size_t size = in.below(64), room = chars ? size * kMostCharBytes + 2 : size;
+  const size_t size = in.below(64);
+  const size_t room = chars ? std::max(to.units_of_chars<char>(size), from.units_of_chars<char>(size)) : size;
   const int32_t limit = static_cast<int32_t>(size);
   const Block<char> out(room);
   const Block<LXUChar> units(size);

@@ -65,7 +65,7 @@ void call_any(Input& in, const F& form, const Place& at, uint32_t mode) {
   int32_t length = in.flag() ? -1 : count_of(text);
   if (sizeof(Unit) == 1 && chars && length > 0) length = length_in_chars(at.codepage, given.data(), 0, length);
   const uint32_t size = in.below(200);
-  const Block<Unit> out(size * (sizeof(Unit) == 1 && chars ? 6 : 1));
+  const Block<Unit> out(chars ? at.units_of_chars<Unit>(size) : size);
   const int32_t limit = static_cast<int32_t>(size);
   must(form.map(l, out.data(), limit, given.data(), length, mode | (chars ? LX_CHARACTERS : 0)) <= limit,
        "a result fits its size");

@@ -7,21 +7,20 @@
 namespace lx::fuzz::strings {
 namespace {
 
-constexpr size_t kMostCharBytes = 5;  // with a shift byte
-
-/// A text as an argument: a part of it, all of it, or up to its null.
+/// A text as an argument: a part of it, all of it, or either up to its null.
 template <class F>
 struct Argument {
   using Unit = typename F::Unit;
 
   Argument(Input& in, const F& form, const Place& at, uint32_t flags, LXShiftState state) {
     Text<Unit> text = in.text(form, at.locale, 40);
-    const uint32_t kind = in.below(3);
-    if (kind == 0) text.resize(in.below(static_cast<uint32_t>(text.size()) + 1));
-    length = kind == 1 ? -1 : count_of(text);
+    const uint32_t kind = in.below(4);
+    if (kind % 3 == 0) text.resize(in.below(static_cast<uint32_t>(text.size()) + 1));
+    const bool to_null = kind % 2 == 1;
+    length = to_null ? -1 : count_of(text);
     const bool chars = (flags & LX_CHARACTERS) != 0 && sizeof(Unit) == 1;
-    if (chars && kind != 1) length = length_in_chars(at.codepage, text.data(), state, length);
-    if (chars || kind == 1) text.push_back(0);  // a shift byte is looked for behind the last character
+    if (chars && !to_null) length = length_in_chars(at.codepage, text.data(), state, length);
+    if (chars || to_null) text.push_back(0);  // a shift byte is looked for behind the last character
     block = Block<Unit>(text);
   }
   Unit* data() const { return block.data(); }
@@ -29,6 +28,13 @@ struct Argument {
   Block<Unit> block{0};
   int32_t length = 0;
 };
+
+/// The bytes that the first characters of a text take, its null among them.
+size_t bytes_of_copy(const Place& at, std::string text, LXShiftState state, int32_t chars) {
+  const int32_t whole = length_in_chars(at.codepage, text.data(), state, count_of(text));
+  text += '\0';  // a shift byte is looked for behind the last character
+  return static_cast<size_t>(LXCpStrCharToByteLen(at.codepage, text.data(), state, std::min(chars, whole)));
+}
 
 template <class F>
 void call_all(Input& in, const F& form, const Place& at) {
@@ -42,7 +48,7 @@ void call_all(Input& in, const F& form, const Place& at) {
   const LXShiftState text_state = states.text;
   const auto size = static_cast<int32_t>(in.below(50));
   const bool chars = (flags & LX_CHARACTERS) != 0 && sizeof(Unit) == 1;
-  const size_t room = static_cast<size_t>(size) * (chars ? kMostCharBytes : 1) + chars;
+  const size_t room = chars ? at.units_of_chars<Unit>(static_cast<size_t>(size)) : static_cast<size_t>(size);
   const Unit* const found =
       form.chr(l, text.data(), text.length, static_cast<typename F::Char>(in.number(4)), flags);
   must(found == nullptr || text.block.has(found), "a character is found in the text");
@@ -53,7 +59,11 @@ void call_all(Input& in, const F& form, const Place& at) {
       form.str(l, text.data(), text.length, other.data(), other.length, options & ~LX_IGNORE_BLANKS);
   must(part == nullptr || text.block.has(part), "a part is found in the text");
   form.cmp(l, text.data(), text.length, other.data(), other.length, options);
-  const Block<Unit> copy(room);
+  size_t copied = room;
+  if constexpr (sizeof(Unit) == 1)
+    if (chars)
+      copied = bytes_of_copy(at, {text.data(), static_cast<size_t>(text.block.size())}, text_state, size);
+  const Block<Unit> copy(copied);
   must(form.cpy(l, copy.data(), size, text.data(), text.length, flags) <= size, "a copy fits");
   const Block<Unit> joined(room);
   if (room != 0) joined.data()[in.below(static_cast<uint32_t>(room))] = 0;
