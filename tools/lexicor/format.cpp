@@ -3,6 +3,7 @@
 
 #include <algorithm>
 #include <charconv>
+#include <cmath>
 #include <cstdio>
 #include <map>
 #include <memory>
@@ -23,6 +24,7 @@ namespace {
 // The digits of the largest double, each with a separator, and signs and symbols beside them.
 constexpr size_t kNumberUnits = 2048;
 constexpr char kNoNumber[] = "reading stopped: not a number as the locale writes it";
+constexpr char kTooLarge[] = "a number that a double cannot hold";
 constexpr char kNoAmount[] = "reading stopped: not an amount as the locale writes it";
 
 struct ValueOptions {
@@ -54,8 +56,8 @@ double c_double(const TextLocale& locale, const std::string& text) {
   size_t stop;
   const std::errc error = read_c_number(text, &value, &stop);
   const Units units = locale.units(text);
-  if (error == std::errc::result_out_of_range)
-    throw locale.pointing(kDataError, "a number that a double cannot hold", units, 0);
+  if (error == std::errc::result_out_of_range || !std::isfinite(value))
+    throw locale.pointing(kDataError, kTooLarge, units, 0);
   if (error != std::errc() || stop < text.size())
     throw locale.pointing(kDataError, "reading stopped: not a number like -1234.56", units, stop);
   return value;
@@ -138,6 +140,7 @@ double read_double(const TextLocale& locale, const Units& text, size_t begin, si
   for (size_t i = 0; i < read; ++i) digits |= is_digit(handle, units[i]);
   if (!digits || read < units.size())
     throw locale.pointing(kDataError, monetary ? kNoAmount : kNoNumber, text, places[read]);
+  if (!std::isfinite(value)) throw locale.pointing(kDataError, kTooLarge, text, begin);
   return value;
 }
 
@@ -157,7 +160,7 @@ class Amount {
     }
     // A sign stands outside or inside of the symbol, and only once.
     int32_t sign = parentheses ? -1 : peel_sign();
-    if (!peel(item(LX_ITEM_CURRENCY))) peel(item(LX_ITEM_INTERNATIONAL_CURRENCY));
+    peel_currency();
     const size_t inner = begin_;
     const int32_t inner_sign = peel_sign();
     if (sign == 0)
@@ -185,6 +188,13 @@ class Amount {
     return peel(item(LX_ITEM_NEGATIVE_SIGN)) ? -1 : peel(item(LX_ITEM_POSITIVE_SIGN)) ? 1 : 0;
   }
 
+  /// Takes the symbol or the international code off, the longer one first: SOS begins and ends with S.
+  void peel_currency() {
+    const Units symbol = item(LX_ITEM_CURRENCY), code = item(LX_ITEM_INTERNATIONAL_CURRENCY);
+    const bool code_first = code.size() > symbol.size();
+    if (!peel(code_first ? code : symbol)) peel(code_first ? symbol : code);
+  }
+
   /// Takes a part off the beginning or the end, and the white space behind it.
   bool peel(const Units& part) {
     if (part.empty() || part.size() > end_ - begin_) return false;
@@ -206,10 +216,12 @@ class Amount {
   size_t begin_ = 0, end_;
 };
 
-/// Without the digits that adding fraction digits one by one leaves inexact.
+/// Without the digits that adding fraction digits one by one leaves inexact; whole numbers to the last digit.
 std::string c_text(double value) {
+  constexpr double kExactWholes = 9007199254740992;  // 2 to the power of 53
   char text[32];
-  std::snprintf(text, sizeof text, "%.15g", value);
+  std::snprintf(text, sizeof text,
+                std::trunc(value) == value && std::fabs(value) <= kExactWholes ? "%.0f" : "%.15g", value);
   return text;
 }
 

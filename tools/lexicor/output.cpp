@@ -30,7 +30,7 @@ void remove_temporary(int signal) {
 void guard_temporary(const std::string& path) {
   if (path.size() >= sizeof g_temporary) return;
   std::memcpy(g_temporary, path.c_str(), path.size() + 1);
-  for (const int signal : {SIGINT, SIGTERM, SIGHUP}) {
+  for (const int signal : {SIGINT, SIGTERM, SIGHUP, SIGQUIT}) {
     if (std::signal(signal, remove_temporary) == SIG_IGN) std::signal(signal, SIG_IGN);
   }
 }

@@ -16,6 +16,7 @@ inline int run_program(const char* name, int (*run)(int, char**), int argc, char
   open_closed_descriptors();
   g_program = name;
   std::signal(SIGPIPE, SIG_IGN);
+  std::signal(SIGXFSZ, SIG_IGN);
   try {
     return run(argc, argv);
   } catch (const Failure& failure) {
