@@ -28,7 +28,8 @@ LX_API int32_t LXConvertBuffer(LXConversion* conversion, char** output, int32_t*
                                const char** input, int32_t* input_left);
 
 /* The largest number of target bytes that one source character can become: size an output buffer as input bytes
- * times this. 1 between locales of one codepage, and when the library is not initialised. */
+ * times this, and 2 more for a Shift-In and a null. 1 between locales of one codepage, where damaged text and
+ * characters beyond U+FFFF grow all the same, and when the library is not initialised. */
 LX_API int32_t LXConversionRatio(LXLocale* target, LXLocale* source);
 
 /* Whole strings. Common to the functions below:

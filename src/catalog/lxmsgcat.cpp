@@ -94,16 +94,20 @@ int32_t write_message(LXLocale* locale, LXLocale* from, const MessageText& messa
   return LX_OK;
 }
 
-/// A text that does not fit is cut so that it can be ended; it may stand in the output.
+/// As many characters of a text as can be ended; it may stand in the output.
 int32_t write_default(LXLocale* locale, const char* text, char* output, int32_t size) {
-  const bool fits = strlen(text) < static_cast<size_t>(size);
+  const Codepage& cp = codepage_of(*locale->codepage);
+  const uint8_t* const p = bytes_of(text);
+  const size_t given = strlen(text), room = static_cast<size_t>(size);
+  size_t bytes = 0;
   LXShiftState state = LX_SHIFT_SINGLE;
-  const auto copy = [&](int32_t room) {
-    return LXStrcpyEx(locale, output, room, text, LX_SHIFT_SINGLE, -1, &state, 0);
+  const auto cut = [&](size_t most) {
+    bytes = whole_chars(cp, Form::kEx, p, LX_SHIFT_SINGLE, least(given, most), given).units;
+    state = state_behind(cp, p, LX_SHIFT_SINGLE, bytes);
   };
-  int32_t bytes = copy(fits ? size : size - 1);
-  if (fits) return LX_OK;
-  if (state == LX_SHIFT_DOUBLE) bytes = copy(size - 2);  // a Shift-In stands before the null
+  cut(room - 1);
+  if (state == LX_SHIFT_DOUBLE && room - bytes < 2) cut(room - 2);  // a Shift-In stands before the null
+  memmove(output, text, bytes);
   LXTerminateStringEx(locale, output + bytes, state, LX_TERMINATE);
   return LX_OK;
 }

@@ -77,6 +77,13 @@ Part whole_chars(const Codepage& cp, Form form, const uint8_t* text, LXShiftStat
   });
 }
 
+LXShiftState state_behind(const Codepage& cp, const uint8_t* text, LXShiftState state, size_t bytes) {
+  if (!cp.shift_sensitive) return state;
+  ShiftCursor in{cp, text, text + bytes, state};
+  pass_all(&in);
+  return in.state;
+}
+
 Part copy_chars(const Codepage& cp, Form form, LXShiftState state, const uint8_t* text, size_t bytes,
                 size_t chars, uint8_t* out) {
   return with_cursor(cp, form, state, text, bytes, [&](auto in) {

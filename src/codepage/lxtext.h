@@ -93,6 +93,9 @@ struct Part {
 Part whole_chars(const Codepage& cp, Form form, const uint8_t* text, LXShiftState state, size_t bytes,
                  size_t text_bytes);
 
+/// The state behind all characters of a text and the shift byte that may end it.
+LXShiftState state_behind(const Codepage& cp, const uint8_t* text, LXShiftState state, size_t bytes);
+
 /// Copies at most `chars` whole characters of a text of `bytes` bytes, and the Shift-In that is due behind
 /// them.
 Part copy_chars(const Codepage& cp, Form form, LXShiftState state, const uint8_t* text, size_t bytes,

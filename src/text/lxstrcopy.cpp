@@ -16,14 +16,6 @@ void move_units(Unit* to, const Unit* from, size_t units) {
   if (units != 0) memmove(to, from, units * sizeof(Unit));
 }
 
-/// The state behind all characters of a text and the shift byte that may end it.
-LXShiftState state_behind(const Codepage& cp, const ByteText& text, size_t bytes) {
-  if (!cp.shift_sensitive) return text.state;
-  ShiftCursor in{cp, text.p, text.p + bytes, text.state};
-  pass_all(&in);
-  return in.state;
-}
-
 template <class Unit>
 int32_t copy(LXLocale* given, Form form, Unit* output, int32_t size, const Text<Unit>& text,
              LXShiftState* state, uint32_t flags) {
@@ -34,7 +26,7 @@ int32_t copy(LXLocale* given, Form form, Unit* output, int32_t size, const Text<
   const bool characters = (flags & LX_CHARACTERS) != 0;
   const Part taken = part_that_fits(cp, form, text, size, characters);
   if constexpr (sizeof(Unit) == 1)
-    if (state != nullptr) *state = state_behind(cp, text, taken.units);
+    if (state != nullptr) *state = state_behind(cp, text.p, text.state, taken.units);
   move_units(output, text.p, taken.units);
   return call.exit(static_cast<int32_t>(characters ? taken.chars : taken.units));
 }

@@ -164,6 +164,7 @@ TEST_F(CatalogTest, EveryCodepageFormAndSize) {
       prefixes.emplace_back(closed.begin(), closed.end());
     }
     const std::string own = prefixes.back();
+    const std::string given = own + (cp.file.name == "TINY-UTF8" ? "\xE3" : "");  // ends inside a character
     const auto codes = Encoded<Wide>(cp, units).terminated();
     directory.write("catalog", catalog_file({{1, {{1, tiny_shift_jis().encode({units.begin(), units.end()})}}}},
                                             "English_UnitedStates.TINY-SJIS"));
@@ -181,7 +182,7 @@ TEST_F(CatalogTest, EveryCodepageFormAndSize) {
               return door(catalog.get(), 1, number, out, n, default_text);
             });
           };
-          EXPECT_EQ(fetched(LXGetMessage, own.c_str()), prefixes[chars]);
+          EXPECT_EQ(fetched(LXGetMessage, given.c_str()), prefixes[chars]);
           EXPECT_EQ(fetched(LXGetMessageU, units.c_str()), units.substr(0, size - 1));
           EXPECT_EQ(fetched(LXGetMessageW, codes.data()), Text<LXWChar>(codes.data()).substr(0, size - 1));
         }
@@ -201,8 +202,8 @@ TEST_F(CatalogTest, ArgumentsAndCodes) {
   EXPECT_EQ(message(nullptr, 1, 1), "70");
   const CatalogPtr catalog = open(0);
   char both[] = "default";
-  EXPECT_EQ(LXGetMessage(catalog.get(), 1, 9, both, sizeof(both), both), LX_OK);
-  EXPECT_STREQ(both, "default");
+  EXPECT_EQ(LXGetMessage(catalog.get(), 1, 9, both, sizeof(both) - 1, both + 1), LX_OK);
+  EXPECT_STREQ(both, "efault");
   for (int32_t size : {0, 4}) {
     char text[4] = "abc";
     const int32_t code = size == 0 ? LX_OK : LX_E_MESSAGE;

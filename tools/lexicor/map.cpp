@@ -121,7 +121,7 @@ class Mapper {
   void finish() {
     look(true);
     map_whole();
-    if (waiting_) write_shift(LX_SHIFT_DOUBLE);
+    if (waiting_) settle();
   }
 
   void throw_losses() const { lost_.throw_any(); }
@@ -224,13 +224,16 @@ class Mapper {
                       static_cast<int32_t>(input.size()), mapping_.mode);
     if (written < 0)
       throw Failure(kDataError, "the mapping failed: " + describe_code(LXGetError(codepage_.locale())));
+    // Shift bytes that meet in the text itself stay.
+    if (waiting_ && written_state_ == LX_SHIFT_DOUBLE && after_shift_ && codepage_.is_shift(text_[0])) settle();
     write(mapped_.data(), static_cast<size_t>(written));
+    after_shift_ = codepage_.is_shift(text_[bytes - 1]);
     text_.erase(0, bytes);
     state_ = state;
   }
 
-  /// Writes a mapped piece, which begins in the single-byte state, behind what is written. A Shift-Out at its
-  /// end waits for the next piece, which may begin with a Shift-In.
+  /// Writes a mapped piece, which begins in the single-byte state, behind what is written. A shift byte at its
+  /// end waits for the next piece, which may begin with the other one.
   void write(const char* text, size_t bytes) {
     if (bytes == 0) return;
     LXShiftState end;
@@ -243,13 +246,24 @@ class Mapper {
     } else if (written_state_ == LX_SHIFT_DOUBLE) {
       write_shift(LX_SHIFT_SINGLE);
     }
-    waiting_ = bytes > 0 && end == LX_SHIFT_DOUBLE && codepage_.is_shift(text[bytes - 1]);
+    waiting_ = bytes > 0 && codepage_.is_shift(text[bytes - 1]);
     if (waiting_) {
       --bytes;
-      end = LX_SHIFT_SINGLE;
+      end = other_state(end);
     }
     output_.write(text, bytes);
     written_state_ = end;
+  }
+
+  static LXShiftState other_state(LXShiftState state) {
+    return state == LX_SHIFT_DOUBLE ? LX_SHIFT_SINGLE : LX_SHIFT_DOUBLE;
+  }
+
+  /// Writes the shift byte that waits.
+  void settle() {
+    written_state_ = other_state(written_state_);
+    write_shift(written_state_);
+    waiting_ = false;
   }
 
   void write_shift(LXShiftState state) {
@@ -267,7 +281,8 @@ class Mapper {
   LXShiftState unseen_state_ = LX_SHIFT_SINGLE;   // at its beginning
   std::string text_;                              // well-formed and not yet mapped
   LXShiftState state_ = LX_SHIFT_SINGLE;          // at its beginning
-  bool waiting_ = false;                          // a Shift-Out
+  bool after_shift_ = false;                      // behind a shift byte of the text
+  bool waiting_ = false;                          // a shift byte
   LXShiftState written_state_ = LX_SHIFT_SINGLE;  // at the end of the output
   std::vector<char> mapped_;
 };

@@ -18,6 +18,7 @@
 #include "recoder.h"
 #include "repertoire.h"
 #include "session.h"
+#include "text_lines.h"
 #include "well_formed.h"
 
 namespace lexicor_cli {
@@ -101,6 +102,19 @@ std::vector<char> read_units(const Side& target, const Input& input, Pieces& pie
   return text;
 }
 
+/// How many bytes of a text became the first `joined` bytes of it without idle shift bytes.
+size_t bytes_before(const Codepage& codepage, std::string_view text, size_t joined) {
+  size_t least = 0, most = text.size();
+  while (least < most) {
+    const size_t middle = least + (most - least) / 2;
+    if (without_idle_shifts(codepage, text.substr(0, middle)).size() < joined)
+      least = middle + 1;
+    else
+      most = middle;
+  }
+  return least;
+}
+
 /// The size that the output needs at most, up to what the library takes.
 size_t needed_bytes(size_t text_bytes) {
   return static_cast<size_t>(
@@ -116,8 +130,13 @@ int translate(const TranslateOptions& options, const CommonOptions& common) {
   Output output(options.output);
   Losses losses(source.name(), target.name(), options.lossy ? OnLoss::kIgnore : OnLoss::kReport);
   const bool show = !output.is_terminal();
-  const std::vector<char> text = source.utf16() ? read_units(target, input, pieces, show, &losses)
-                                                : read_text(source, target, input, pieces, show, &losses);
+  const std::vector<char> given = source.utf16() ? read_units(target, input, pieces, show, &losses)
+                                                 : read_text(source, target, input, pieces, show, &losses);
+  std::string_view text(given.data(), given.size());
+  const bool idle = source.codepage().shift_sensitive() &&
+                    source.codepage().call_bytes(text.data(), text.size()) < text.size();
+  const std::string joined = idle ? without_idle_shifts(source.codepage(), text) : "";
+  if (idle) text = joined;
   const size_t needed = needed_bytes(text.size());
   const size_t size = options.size > 0 ? static_cast<size_t>(options.size) : needed;
   const std::unique_ptr<char[]> buffer(new char[size]);  // not filled: what is not used takes no memory
@@ -129,7 +148,8 @@ int translate(const TranslateOptions& options, const CommonOptions& common) {
                            (options.pad ? NLS1_PAD : 0) | (options.trim ? NLS1_DROP_BLANKS : 0), &code);
   if (code != LX_OK && code != LX_E_SIZE)
     throw Failure(kDataError, "the translation failed: " + describe_code(static_cast<int>(code)));
-  const auto rest = static_cast<size_t>(consumed);
+  size_t rest = static_cast<size_t>(consumed);
+  if (idle) rest = bytes_before(source.codepage(), {given.data(), given.size()}, rest);
   if (code == LX_E_SIZE && options.size == 0 && needed < kMostTranslated) throw input.cut_at(rest);
   if (written > 0) output.write(buffer.get(), static_cast<size_t>(written));
   output.commit();
