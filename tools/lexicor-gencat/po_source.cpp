@@ -90,7 +90,9 @@ class PoReader : SourceParser {
   void read_comment() {
     // An obsolete entry, "#~", is a comment like any other; flags belong to the entry that follows.
     if (field_ == Field::kText) finish_entry();
-    if (at_ + 1 >= line_.size() || line_[at_ + 1].syntax != ',') return;
+    if (at_ + 1 >= line_.size()) return;
+    if (line_[at_ + 1].syntax == '~') entry_.fuzzy = false;  // the flag before it was of the obsolete entry
+    if (line_[at_ + 1].syntax != ',') return;
     std::string flags;
     for (const Character& c : line_) flags += c.syntax < 0x7F ? static_cast<char>(c.syntax) : '?';
     if (flags.find("fuzzy") != std::string::npos) entry_.fuzzy = true;

@@ -79,7 +79,7 @@ void SortedRun::add(const Line& line) {
 
 void SortedRun::flush() {
   file_.write(buffer_.data(), buffer_.size());
-  buffer_ = {};
+  std::vector<char>().swap(buffer_);  // an assignment would keep its memory
 }
 
 const Line* SortedRun::next() {
