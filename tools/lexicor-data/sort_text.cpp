@@ -93,6 +93,8 @@ class SortReader {
     for (unsigned first = range.first; first < range.last; first += 256) {
       SortPage& page = sort_.pages[first >> 8];
       if (named_[first >> 8]) line.fail(start, "page " + hex4(first) + ": " + already(page.place));
+      if (listed_.count(static_cast<uint8_t>(first >> 8)) != 0)
+        line.fail(start, "page " + hex4(first) + ": characters of it stand before");
       named_[first >> 8] = true;
       page.kind = kind;
       page.base = static_cast<uint16_t>(base + (first - range.first));

@@ -145,6 +145,7 @@ class PoReader : SourceParser {
     if (form != entry_.texts.size() || form >= kPluralForms)
       error(begin, "expected msgstr[" + std::to_string(entry_.texts.size()) + "], of at most " +
                        std::to_string(kPluralForms) + " forms");
+    finish_text();
     entry_.texts.emplace_back();
     field_ = Field::kText;
     return true;
@@ -164,7 +165,11 @@ class PoReader : SourceParser {
     ++at_;
     skip(is_blank);
     if (at_ < line_.size()) error(at_, "expected nothing behind the closing quote");
-    if (field_ == Field::kText) entry_.texts.back() += text_.finish();
+  }
+
+  /// Ends a text, which stands in as many pairs of quotes as its author likes.
+  void finish_text() {
+    if (!entry_.texts.empty()) entry_.texts.back() += text_.finish();
   }
 
   bool is_wanted() const { return field_ == Field::kText && !entry_.fuzzy && !is_header(); }
@@ -203,6 +208,7 @@ class PoReader : SourceParser {
 
   void finish_entry() {
     const bool header = is_header();
+    finish_text();
     const Entry entry = std::move(entry_);
     entry_ = {};
     field_ = Field::kNone;
