@@ -75,9 +75,9 @@ enum LXItem {
 LX_API int32_t LXGetLocaleNumInfo(LXLocale* locale, int32_t item, int32_t flags);
 
 /* Sets a number item of this locale alone. A new LX_ITEM_TERRITORY_ID recomputes the values that the caller has
- * not set, a new LX_ITEM_CODEPAGE_ID converts all of them. Returns 1, or 0 with last error LX_E_ITEM (not a number item, or one that
- * cannot be set), LX_E_NOT_FOUND (value refused, no such object), LX_E_SEPARATOR (a separator has no single
- * byte in the new codepage) or LX_E_MEMORY; the locale is then as it was. */
+ * not set, a new LX_ITEM_CODEPAGE_ID converts all of them. Returns 1, or 0 with last error LX_E_ITEM (not a number
+ * item, or one that cannot be set), LX_E_NOT_FOUND (value refused, no such object), LX_E_SEPARATOR (a separator has
+ * no single byte in the new codepage) or LX_E_MEMORY; the locale is then as it was. */
 LX_API int32_t LXSetLocaleNumInfo(LXLocale* locale, int32_t item, int32_t value);
 
 /* Copies a text item into `buffer` of `size` bytes in the locale's codepage, cut at a whole character and
