@@ -7,8 +7,10 @@
  * Conventions:
  *  1. Null locale. A null LXLocale means the default locale, set by LXSetLocale.
  *  2. Errors. Each function that takes a locale leaves a code of lx/base.h there; LXGetError reads it,
- *     LXGetErrorText says it in English. A call before LXInit or after the last LXTerm is refused and
- *     touches nothing.
+ *     LXGetErrorText says it in English. Before LXInit and after the last LXTerm a call that needs a
+ *     locale, data or memory is refused and writes no result; where there is a shift state to hand on,
+ *     it is that given. What needs none of them works all the same: reading files, listing the
+ *     operating system's names, computing from the arguments alone.
  *  3. Forms. No suffix: a byte string in the locale's codepage. W: packed codes (LXWChar). U: 16-bit
  *     Unicode (LXUChar). Ex: a byte string of a shift-sensitive codepage with a shift state. S: takes a
  *     shift state in place of the lead byte's length.

@@ -31,8 +31,8 @@ LX_API LXLocale* NLS1_GetLocale(int32_t language_territory, int32_t codepage, in
 
 /* Sets the process's default locale from identifiers. With NLS1_THREAD it is the thread's locale that is asked
  * for, and the result is LX_E_INVALID: the flag is passed on to LXGetLocale, which does not know it. Use
- * NLS1_SetLocaleFromNative to set a thread's locale. Returns LX_OK, LX_E_NOT_INITIALIZED, or as for
- * NLS1_GetLocale. */
+ * NLS1_SetLocaleFromNative to set a thread's locale. Other flags are ignored. Returns LX_OK,
+ * LX_E_NOT_INITIALIZED, or as for NLS1_GetLocale. */
 LX_API int32_t NLS1_SetLocale(int32_t language_territory, int32_t codepage, int32_t flags);
 
 /* Sets the thread's locale (NLS1_THREAD) and the process's default (NLS1_PROCESS) from an operating-system

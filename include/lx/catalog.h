@@ -35,8 +35,9 @@ enum { LX_CATALOG_PATH_BYTES = 4096 };
  * at when messages are fetched.
  *
  * Both texts are null-terminated. Returns the catalog, to be closed with LXCloseCatalog, or null with last
- * error LX_E_INVALID (no name, other flags), LX_E_MEMORY or LX_E_CATALOG (not found, too large, and with
- * LX_CATALOG_LOAD damaged). */
+ * error LX_E_INVALID (no name, other flags), LX_E_CATALOG (not found, too large, with LX_CATALOG_LOAD damaged,
+ * or no memory to look for it or to make the locale of its texts), LX_E_MEMORY (none to keep it) or
+ * LX_E_NOT_INITIALIZED. */
 LX_API LXCatalog* LXOpenCatalog(LXLocale* locale, const char* directory, const char* name, uint32_t flags);
 /* As LXOpenCatalog; the texts are null-terminated packed codes. Null with last error LX_E_CATALOG too when they
  * cannot be turned into bytes of the locale. */
@@ -52,12 +53,12 @@ LX_API LXCatalog* LXOpenCatalogU(LXLocale* locale, const LXUChar* directory, con
  * `output` of `size` bytes, cut at a whole character and null-terminated. A default text is null-terminated and
  * in the locale's codepage; it may stand in `output`. With a `size` below 1 one null is written all the same and
  * the result is LX_OK. Returns LX_OK, also for a message that was cut; LX_E_MESSAGE (no such message, no default
- * text; the output is empty), LX_E_CATALOG (the catalog cannot be read or is damaged; the output is empty) or
- * LX_E_CATALOG_NULL (null catalog; nothing is written). */
+ * text; the output is empty), LX_E_CATALOG (the catalog cannot be read or is damaged, or memory is exhausted;
+ * the output is empty), or LX_E_CATALOG_NULL (null catalog) or LX_E_NOT_INITIALIZED with nothing written. */
 LX_API int32_t LXGetMessage(LXCatalog* catalog, uint32_t set, uint32_t number, char* output, int32_t size,
                             const char* default_text);
 /* As LXGetMessage; `size` counts packed codes. The text goes through the locale's codepage, the default text,
- * of packed codes, too. LX_E_CATALOG also when memory is exhausted. */
+ * of packed codes, too. */
 LX_API int32_t LXGetMessageW(LXCatalog* catalog, uint32_t set, uint32_t number, LXWChar* output, int32_t size,
                              const LXWChar* default_text);
 /* As LXGetMessageW; 16-bit Unicode, `size` counts units. */

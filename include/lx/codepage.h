@@ -149,7 +149,7 @@ LX_API uint32_t LXGetCharTypeU(LXLocale* locale, LXUChar unicode, uint32_t selec
 LX_API uint32_t LXGetCharTypeEx(LXLocale* locale, const char* text, LXShiftState state, uint32_t selector);
 
 /* The functions below take a codepage object that is loaded. When the library is not initialised they touch
- * nothing and return null, 0, or 0xFFFD as a Unicode value. */
+ * nothing and return null, 0, or 0xFFFD as a Unicode value; LXWToMb needs neither. */
 
 /* The type record of the multibyte character at `text`: 8 bytes, little-endian: type word, case delta. It
  * belongs to the codepage. Null in a codepage without multibyte characters. */

@@ -124,7 +124,8 @@ LX_API int32_t LXSetLocaleTextInfoEx(LXLocale* locale, int32_t item, const char*
 
 /* What the set functions do to the values of a locale; the objects must be loaded. Fills every value that the
  * caller has not set from the territory. Returns, and leaves as the last error, LX_OK, or LX_E_MEMORY with the
- * locale as it was. The Unicode texts that are replaced stay readable until the locale is released. */
+ * locale as it was; LX_E_NOT_INITIALIZED, as the two below, when there is no locale. The Unicode texts that are
+ * replaced stay readable until the locale is released. */
 LX_API int32_t LXLocaleSetModifiable(LXLocale* locale);
 /* Moves a locale to another territory. Returns, and leaves as the last error, LX_OK, or LX_E_NOT_FOUND (no
  * loaded territory) or LX_E_MEMORY with the locale as it was. The Unicode texts that are replaced stay readable

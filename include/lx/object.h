@@ -56,7 +56,7 @@ LX_API int32_t LXEnumAliases(LXObjManager* manager, LXAliasCallback callback, vo
  * LX_E_NOT_INITIALIZED. */
 LX_API LXObjManager* LXInitObjManager(const char* directory, uint32_t options, int32_t* rc);
 /* Destroys a manager and unloads its objects. Returns LX_OK, LX_E_FREE or 1 when a free hook failed, or
- * LX_E_INVALID (null, or the library is not initialised). */
+ * LX_E_INVALID (null, which is not the library's own here, or the library is not initialised). */
 LX_API int32_t LXTermObjManager(LXObjManager* manager);
 
 /* Writes the name of the control file of `directory` with its null to `buffer` of `size` bytes. Returns
@@ -64,7 +64,7 @@ LX_API int32_t LXTermObjManager(LXObjManager* manager);
 LX_API char* LXGetControlFileName(const char* directory, char* buffer, int32_t size);
 
 /* As LXGetControlFileName for an object's data file, which needs the directory's bytes plus 14. Null also for a
- * type that is none, and when the library is not initialised. */
+ * type that is none, and when the library is not initialised. That it does not fit is said on standard error. */
 LX_API char* LXGetDataFileName(const char* directory, int32_t type, uint16_t id, char* buffer, int32_t size);
 
 /* Writes a place to look for the locale directory, with its null, to `buffer` of `size` bytes. Selector 0: the

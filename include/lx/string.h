@@ -126,8 +126,8 @@ LX_API LXUChar* LXStrstrU(LXLocale* locale, const LXUChar* text, int32_t length,
 /* Takes the next token from a text: returns its start and ends it with nulls in place of the one character that
  * delimits it, of the characters of `set`. `*next` and `*length` receive the rest, to be passed back in; the
  * last token leaves null and 0, and is not ended where no delimiter stands. Null when nothing but delimiters is
- * left, or `text` is null, or for invalid flags; a text of length 0 is an empty token. Nothing is kept between
- * calls. */
+ * left, or `text` is null, or for invalid flags; a text of length 0 is an empty token, such as a rest that is
+ * half a character has with LX_CHARACTERS. Nothing is kept between calls. */
 LX_API char* LXStrtok(LXLocale* locale, char* text, int32_t* length, const char* set, int32_t set_length,
                       char** next, uint32_t flags);
 /* As LXStrtok; `*state` is that of the text, and receives that of the rest; `token_state` receives that of the

@@ -36,8 +36,9 @@ typedef struct LXTime {
  *  %j  day of the year as it is stored, from 000         up to 3 digits, up to 366
  *  %m  month from 1, 2 digits                            up to 2 digits, up to 12; 0 is month -1
  *  %M  minute, 2 digits                                  up to 2 digits, up to 59
- *  %p  morning marker below 12 hours, else afternoon     one of the two; in the end an hour below 12 gets
- *                                                        12 more when the last one was the afternoon's
+ *  %p  morning marker below 12 hours, else afternoon     one of the two; at the end of the format that it
+ *                                                        stands in (of %c or %X: that one) an hour below 12
+ *                                                        gets 12 more when the last was the afternoon's
  *  %S  second, 2 digits                                  up to 2 digits, up to 59
  *  %U  week of the year from Sunday on, 2 digits         -
  *  %w  weekday, 1 digit                                  1 digit, up to 6

@@ -1,6 +1,7 @@
 // Reading strings and lines from a stream. Characters are read one by one; what ends a string and cannot be
 // stored goes back into the stream.
-#include <cstring>
+#include <algorithm>
+#include <iterator>
 
 #include "codepage/lxtext.h"
 #include "core/lxcall.h"
@@ -61,7 +62,7 @@ class Line {
       if (code != LX_OK) return code;
       const uint32_t kind = in_.one_unit() ? ends_.kind_of(in_.value) : 0;
       if (is_return() && (drop_returns_ || ends_.any(LX_EOL_CRLF))) {
-        if (!Sink(out_).put(in_.value)) return put_back(in_.held);
+        if (!fits(in_.value)) return put_back(in_.held);
         const Step step = read_behind_return(in_.held, kind);
         if (step.ended) return step.code;
         continue;
@@ -92,10 +93,17 @@ class Line {
     ++chars_;
     return true;
   }
+  /// Whether there is room: they are written to a place aside.
+  template <class... Values>
+  bool fits(Values... values) const {
+    typename Sink::Unit aside[8];  // two line ends, or a character with its shift bytes
+    Sink probe(out_);
+    probe.p = aside;
+    probe.end = aside + std::min(room(out_.p, out_.end), std::size(aside));
+    return (probe.put(values) && ...);
+  }
   bool pair_fits() const {
-    Sink ahead(out_);
-    return drop_returns_ ||
-           (most_chars_ - chars_ > 1 && ahead.put(ends_.carriage_return) && ahead.put(ends_.line_feed));
+    return drop_returns_ || (most_chars_ - chars_ > 1 && fits(ends_.carriage_return, ends_.line_feed));
   }
   int32_t put_back(const StreamChar& c) {
     in_.put_back(c);

@@ -72,6 +72,8 @@ struct StreamCalls {
     std::string block(static_cast<size_t>(size) * (characters ? 4 : 1), '#');
     block.shrink_to_fit();
     const int32_t n = read(stream, r.l, block.data(), size, flags);
+    const size_t behind = block.find_last_not_of('#') + 1;
+    EXPECT_TRUE(characters || behind == static_cast<size_t>(std::max(n, 0)));
     if (n < 0) return answer(n, r.expected().word());
     r.text({block.begin(), characters ? std::find(block.begin(), block.end(), '#') : block.begin() + n});
     if (characters) r.number(n);
