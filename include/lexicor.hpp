@@ -10,6 +10,7 @@
 #ifndef LEXICOR_HPP
 #define LEXICOR_HPP
 
+#include <algorithm>
 #include <array>
 #include <cstdint>
 #include <cstring>
@@ -130,6 +131,20 @@ std::string written_whole(Write write) {
   }
 }
 
+/// An operating system's name with its codeset in small letters and digits alone, as the library's table has them.
+inline std::string with_plain_codeset(const std::string& name) {
+  std::string plain;
+  bool codeset = false;
+  for (const char c : name) {
+    codeset = c != '@' && (codeset || c == '.');
+    if (codeset && c >= 'A' && c <= 'Z')
+      plain += static_cast<char>(c + ('a' - 'A'));
+    else if (!codeset || c == '.' || (c >= 'a' && c <= 'z') || (c >= '0' && c <= '9'))
+      plain += c;
+  }
+  return plain;
+}
+
 template <class Handle, class Result, Result (*Release)(Handle*)>
 struct Releaser {
   void operator()(Handle* handle) const noexcept { Release(handle); }
@@ -143,7 +158,7 @@ struct Releaser {
 class Library {
  public:
   /// Null: the directory of LX_LOCALEDIR. Without a usable one the built-in objects are in force, which built_in()
-  /// says; with LX_NO_DEFAULTS that is an error.
+  /// says; with LX_NO_DEFAULTS that is an error. While there is another use, the directory and the options are its.
   explicit Library(const char* directory = nullptr, uint32_t options = 0, std::error_code& error = throws()) {
     const int32_t value = LXInit(directory, nullptr, nullptr, nullptr, options);
     built_in_ = value == LX_W_DEFAULTS;
@@ -206,10 +221,11 @@ class Locale {
   static Locale user(std::error_code& error = throws()) {
     return Locale("", LX_USER_LOCALE | LX_FALLBACK, error);
   }
-  /// By the operating system's name: "de_DE.UTF-8".
+  /// By the operating system's name, its codeset in any spelling: "de_DE.UTF-8", "de_DE.utf8".
   static Locale native(const std::string& name, std::error_code& error = throws()) {
     int32_t value = LX_OK;
     Locale made(LXConvertNativeLocale(name.c_str(), 0, &value));
+    if (!made) made = Locale(LXConvertNativeLocale(detail::with_plain_codeset(name).c_str(), 0, &value));
     return detail::report(made ? LX_OK : value, error, std::move(made));
   }
 
@@ -234,7 +250,11 @@ class Locale {
   }
   void set(int32_t item, std::string_view value, std::error_code& error = throws()) {
     const int32_t length = detail::length_of(value.size());
-    const int32_t done = LXSetLocaleTextInfoEx(get(), item, value.data(), LX_SHIFT_SINGLE, length, 0);
+    if (length < 0) return detail::report(LX_E_SIZE, error);
+    // A length of 0 would change nothing.
+    const int32_t done = length != 0
+                             ? LXSetLocaleTextInfoEx(get(), item, value.data(), LX_SHIFT_SINGLE, length, 0)
+                             : LXSetLocaleTextInfoEx(get(), item, "", LX_SHIFT_SINGLE, -1, 0);
     const int32_t code = done != 0 ? LX_OK : last_error();
     learn();
     detail::report(code, error);
@@ -358,9 +378,11 @@ class Locale {
   }
   std::string format(const LXTime& time, std::string_view format, uint32_t flags = 0,
                      std::error_code& error = throws()) const {
+    const int32_t length = detail::length_of(format.size());
+    if (length < 0) return detail::report(LX_E_SIZE, error, std::string());
     return written(error, [&](char* buffer, int32_t size) {
       return LXTimeToStringEx(get(), &time, buffer, LX_SHIFT_SINGLE, size, format.data(), LX_SHIFT_SINGLE,
-                              detail::length_of(format.size()), flags);
+                              length, flags);
     });
   }
   std::string format(const std::tm& time, std::string_view format_text, uint32_t flags = 0,
@@ -369,6 +391,8 @@ class Locale {
                          time.tm_wday, time.tm_yday},
                   format_text, flags, error);
   }
+
+  // Of a text of 2 GB or more the first 2 GB are read.
 
   Parsed<int32_t> parse_integer(std::string_view text, int32_t base = 10, uint32_t flags = 0,
                                 std::error_code& error = throws()) const {
@@ -436,17 +460,23 @@ class Locale {
 };
 
 /// Orders texts as a locale does: `std::sort(first, last, lexicor::Less(locale))`,
-/// `std::map<std::string, T, lexicor::Less> map(lexicor::Less(locale))`. The locale must outlive it.
+/// `std::map<std::string, T, lexicor::Less> map(lexicor::Less(locale))`. The locale must outlive it. With
+/// LX_WIDTH_INSENSITIVE it makes the keys of both texts each time.
 class Less {
  public:
   using is_transparent = void;
   explicit Less(const Locale& locale, uint32_t options = 0) noexcept : locale_(&locale), options_(options) {}
-  bool operator()(std::string_view a, std::string_view b) const { return locale_->compare(a, b, options_) < 0; }
-  bool operator()(std::u16string_view a, std::u16string_view b) const {
+  bool operator()(std::string_view a, std::string_view b) const { return less(a, b); }
+  bool operator()(std::u16string_view a, std::u16string_view b) const { return less(a, b); }
+
+ private:
+  /// Comparison without regard to width is no order where texts differ in length, of keys it is.
+  template <class View>
+  bool less(View a, View b) const {
+    if ((options_ & LX_WIDTH_INSENSITIVE) != 0) return locale_->key(a, options_) < locale_->key(b, options_);
     return locale_->compare(a, b, options_) < 0;
   }
 
- private:
   const Locale* locale_;
   uint32_t options_;
 };
@@ -480,21 +510,25 @@ inline std::string convert(const Locale& target, const Locale& source, std::stri
   return detail::report(LXGetError(target.get()), error, std::move(result));
 }
 
-/// A text that comes in pieces, cut anywhere. Both locales must outlive it.
+/// A text that comes in pieces, cut anywhere, and behind finish() another one. Both locales must outlive it. Without a
+/// handle (a constructor that failed, or moved from) all is LX_E_INVALID.
 class Conversion {
  public:
   Conversion(const Locale& target, const Locale& source, std::error_code& error = throws())
       : handle_(LXOpenConversion(target.get(), source.get())),
+        source_(source.get()),
         target_(target.get()),
         ratio_(LXConversionRatio(target.get(), source.get())) {
     detail::report(handle_ != nullptr ? LX_OK : LXGetError(target_), error);
   }
   LXConversion* get() const noexcept { return handle_.get(); }
+  explicit operator bool() const noexcept { return handle_ != nullptr; }
 
   /// Converts one more piece and puts the result behind `output`. The first bytes of a cut character are kept.
   void convert(std::string_view piece, std::string& output, std::error_code& error = throws()) {
     constexpr size_t kPiece = 1 << 20;
-    int32_t value = LX_OK;
+    if (!handle_) return detail::report(LX_E_INVALID, error);
+    int32_t value = cut_ ? LX_E_INPUT_CUT : LX_OK;
     while (!piece.empty() && (value == LX_OK || value == LX_E_INPUT_CUT)) {
       const std::string_view some = piece.substr(0, kPiece);
       piece.remove_prefix(some.size());
@@ -514,17 +548,21 @@ class Conversion {
 
   /// Ends the text: puts a Shift-In that is due behind `output`. LX_E_INPUT_CUT when a character was not completed.
   void finish(std::string& output, std::error_code& error = throws()) {
+    if (!handle_) return detail::report(LX_E_INVALID, error);
     char shift[2];
     const int32_t bytes = LXTerminateStringEx(target_, shift, state_, 0);
     output.append(shift, bytes > 0 ? static_cast<size_t>(bytes) : 0);
     state_ = LX_SHIFT_SINGLE;
-    detail::report(cut_ ? LX_E_INPUT_CUT : LX_OK, error);
+    const bool cut = std::exchange(cut_, false);
+    handle_.reset(LXOpenConversion(target_, source_));  // the next text begins in its own states
+    const int32_t value = handle_ != nullptr ? LX_OK : LXGetError(target_);
+    detail::report(cut ? LX_E_INPUT_CUT : value, error);
   }
 
  private:
   static constexpr size_t kPending = 16;
   std::unique_ptr<LXConversion, detail::Releaser<LXConversion, int32_t, LXCloseConversion>> handle_;
-  LXLocale* target_;
+  LXLocale *source_, *target_;
   int32_t ratio_;
   LXShiftState state_ = LX_SHIFT_SINGLE;
   bool cut_ = false;
@@ -533,7 +571,8 @@ class Conversion {
 // ---------------------------------------------------------------------------------------------- Streams
 
 /// Characters that come from, or go to, a callable: it moves up to so many bytes, 0 at the end, and may throw, which
-/// the function that called it throws on. The locale must outlive it.
+/// the function that called it throws on. The locale must outlive it. Closed, moved from or not opened, all but close()
+/// is LX_E_INVALID.
 class Stream {
  public:
   using Transfer = std::function<size_t(char* buffer, size_t bytes)>;
@@ -559,11 +598,14 @@ class Stream {
     return *this;
   }
   LXStream* get() const noexcept { return handle_; }
+  explicit operator bool() const noexcept { return handle_ != nullptr; }
 
   /// The next line with its end, or what is left of the text; nothing at its end. A line of more than `most` bytes
-  /// comes in pieces. `ends` are LX_EOL_... and LX_DROP_RETURNS.
+  /// comes in pieces; `most` is 8 at least, so that a character fits. `ends` are LX_EOL_... and LX_DROP_RETURNS.
   std::optional<std::string> line(uint32_t ends = LX_EOL_LF, int32_t most = 4096,
                                   std::error_code& error = throws()) {
+    if (handle_ == nullptr) return detail::report(LX_E_INVALID, error, std::nullopt);
+    most = std::max(most, 8);
     std::string text(static_cast<size_t>(most), '\0');
     const int32_t bytes = LXReadStringEx(get(), locale_, text.data(), most, ends);
     text.resize(bytes > 0 ? static_cast<size_t>(bytes) : 0);
@@ -574,6 +616,7 @@ class Stream {
 
   /// Writes a text; a character that its end cuts is left out.
   void write(std::string_view text, std::error_code& error = throws()) {
+    if (handle_ == nullptr) return detail::report(LX_E_INVALID, error);
     std::vector<LXWChar> codes(text.size());
     const int32_t length = detail::length_of(text.size());
     const int32_t count =
@@ -585,6 +628,7 @@ class Stream {
   }
 
   void flush(std::error_code& error = throws()) {
+    if (handle_ == nullptr) return detail::report(LX_E_INVALID, error);
     check(error, LXFlushStream(get(), locale_) != 0 ? LX_OK : LXGetError(locale_));
   }
   /// Ends a text that is written, in the single-byte state.

@@ -54,6 +54,9 @@ TEST_F(CppTest, Owns) {
   first.set(LX_ITEM_CURRENCY, "DM");
   first.set(LX_ITEM_CURRENCY_DIGITS, 0);
   EXPECT_EQ(first.text(LX_ITEM_CURRENCY) + std::to_string(first.number(LX_ITEM_CURRENCY_DIGITS)), "DM0");
+  first.set(LX_ITEM_CURRENCY, "");
+  EXPECT_EQ(first.text(LX_ITEM_CURRENCY), "");
+  EXPECT_EQ(Locale::native("de_DE.UTF-8").name(), Locale::native("de_DE.utf8").name());
   EXPECT_NE(first.digest(LX_CODEPAGE), german_.digest(LX_CODEPAGE));
   EXPECT_EQ(first.digest(LX_SORT), german_.digest(LX_SORT));
 }
@@ -109,6 +112,8 @@ TEST_F(CppTest, OrdersInTheStandardLibrary) {
   map[u"äpfel"] = 2;
   EXPECT_EQ(map.size(), 1u);
   EXPECT_NE(map.find(std::u16string_view(u"ÄPFEL")), map.end());
+  const Less narrow(utf8_, LX_WIDTH_INSENSITIVE);
+  EXPECT_TRUE(narrow("ab", "abc") && !narrow("abc", "ab") && !narrow("ｱ", "ア") && !narrow("ア", "ｱ"));
 }
 
 // A text in pieces of every length becomes what it is as a whole, there and back, in all shift states.
@@ -128,10 +133,15 @@ TEST_F(CppTest, ConvertsPieces) {
   std::error_code error;
   std::string output;
   Conversion cut(host_, utf8_);
-  cut.convert("日\xE6\x97", output);
-  cut.finish(output, error);
-  EXPECT_EQ(error, code(LX_E_INPUT_CUT));
-  EXPECT_EQ(output, convert(host_, utf8_, "日"));
+  for (const char* const next : {"", "\xA5"}) {
+    cut.convert("日\xE6\x97", output), cut.convert(next, output);
+    cut.finish(output, error);
+    EXPECT_EQ(error == code(LX_E_INPUT_CUT), *next == '\0');
+  }
+  EXPECT_EQ(output, convert(host_, utf8_, "日") + convert(host_, utf8_, "日日"));
+  const Conversion moved = std::move(cut);
+  cut.convert("a", output, error);
+  EXPECT_EQ(error, code(LX_E_INVALID));
 }
 
 TEST_F(CppTest, Streams) {
@@ -145,6 +155,7 @@ TEST_F(CppTest, Streams) {
   out.write(text);
   out.write(convert(host_, utf8_, "日"));
   out.close();
+  EXPECT_THROW(out.write("a"), std::system_error);
   EXPECT_EQ(convert(utf8_, host_, taken), "日本\n語\n\nend日");
   EXPECT_EQ(taken.back(), '\x0F');
 
