@@ -2,6 +2,7 @@
 #include "arguments.h"
 
 #include <CLI/CLI.hpp>
+#include <algorithm>
 #include <limits>
 #include <sstream>
 
@@ -35,7 +36,9 @@ std::vector<std::string> option_names(const CLI::App& app) {
 
 /// What is wrong with a command line, said by name: the parser alone names what it misses first, which hides the
 /// misspelt argument that was meant for it.
-std::string parse_fault(const CLI::App& app, const CLI::ParseError& error) {
+std::string parse_fault(const CLI::App& app, const CLI::ParseError& error,
+                        const std::vector<std::string>& arguments) {
+  const auto dashes = std::find(arguments.begin(), arguments.end(), "--");
   const std::vector<std::string> left = app.remaining(true);
   const std::string help = "'" + command_text(app) + " --help' shows those there are";
   std::vector<std::string> commands;
@@ -43,6 +46,8 @@ std::string parse_fault(const CLI::App& app, const CLI::ParseError& error) {
     commands.push_back(command->get_name());
   for (const std::string& argument : left) {
     const bool option = argument.size() > 1 && argument[0] == '-';
+    if (option && std::find(arguments.begin(), dashes, argument) == dashes)
+      return "unexpected argument '" + argument + "': behind -- nothing is an option";
     const bool command = !option && !commands.empty() && app.get_subcommands().empty();
     if (!option && !command) continue;
     const std::string name = argument.substr(0, argument.find('='));
@@ -99,7 +104,15 @@ Option Arguments::add_option(const char* name, std::optional<std::string>& value
   return Option(command_.add_option(name, value, help));
 }
 Option Arguments::add_option(const char* name, std::vector<std::string>& values, const char* help) {
-  return Option(command_.add_option(name, values, help));
+  CLI::Option* const option = command_.add_option(name, values, help);
+  // Where it allows more values than it expects, the parser takes a value in brackets apart: [a] would be a. So it
+  // expects as many as there can be, and takes those there are.
+  constexpr int kMost = CLI::detail::expected_max_vector_size;
+  if (option->get_positional())
+    option->expected(kMost, kMost)
+        ->allow_extra_args(false)
+        ->multi_option_policy(CLI::MultiOptionPolicy::TakeAll);
+  return Option(option);
 }
 Option Arguments::add_option(const char* name, int32_t& value, const char* help) {
   return Option(command_.add_option(name, value, help));
@@ -128,7 +141,8 @@ bool Arguments::given() const {
 CommandLine::CommandLine(const char* program, const char* summary, const char* version)
     : program_(std::make_unique<CLI::App>(summary, program)) {
   program_->set_version_flag("--version", std::string(program) + " " + version);
-  program_->add_flag("-q,--quiet", g_quiet, "say nothing on standard error but errors");
+  program_->add_flag("-q,--quiet", g_quiet,
+                     "say nothing on standard error but errors, and JSON that is asked for");
 }
 CommandLine::~CommandLine() = default;
 
@@ -153,7 +167,8 @@ bool CommandLine::parse(int argc, char** argv) {
     return true;
   } catch (const CLI::ParseError& error) {
     std::ostringstream out, err;
-    if (program_->exit(error, out, err) != 0) throw Failure(kUsageError, parse_fault(*program_, error));
+    if (program_->exit(error, out, err) != 0)
+      throw Failure(kUsageError, parse_fault(*program_, error, {argv + 1, argv + argc}));
     std::string text = out.str();
     if (!text.empty() && text.back() != '\n') text += '\n';
     Output().write(text);

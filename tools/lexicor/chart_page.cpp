@@ -73,10 +73,32 @@ class Codes {
   const std::vector<LXUChar> single_;
 };
 
-/// The leading bytes of all characters that can be written.
+/// Adds the leading bytes of the characters that begin with `lead` and have so many bytes behind it.
+void add_leads(const Codepage& codepage, LXWChar lead, int32_t bytes_behind, std::set<LXWChar>* leads) {
+  for (LXWChar byte = 0; byte < 256; ++byte) {
+    const LXWChar code = lead << 8 | byte;
+    if (bytes_behind > 1) {
+      add_leads(codepage, code, bytes_behind - 1, leads);
+    } else if (LXCpMbToUnicodeW(codepage.object(), code) != kReplacement) {
+      leads->insert(lead);
+      return;
+    }
+  }
+}
+
+/// The leading bytes of all characters. Those of UTF-8 are found by what can be written: a code that is ill-formed has a
+/// value as well.
 std::set<LXWChar> leads_of(const Codepage& codepage) {
-  const Substitution substitution(codepage);
   std::set<LXWChar> leads = {0};
+  if (!codepage.utf8()) {
+    for (LXWChar byte = 1; byte < 256; ++byte) {
+      const char lead = static_cast<char>(byte);
+      const int32_t bytes_behind = codepage.char_bytes(&lead, LX_SHIFT_DOUBLE) - 1;
+      if (bytes_behind > 0 && !codepage.is_shift(lead)) add_leads(codepage, byte, bytes_behind, &leads);
+    }
+    return leads;
+  }
+  const Substitution substitution(codepage);
   for (uint32_t unicode = 0; unicode <= 0xFFFF; ++unicode) {
     const auto unit = static_cast<LXUChar>(unicode);
     const LXWChar code = LXCpUnicodeToCharW(codepage.object(), unit);

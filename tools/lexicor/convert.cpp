@@ -35,7 +35,7 @@ struct ConvertOptions {
   bool strict = false, lossy = false, json = false;
   std::vector<std::string> files;
 
-  OnLoss on_loss() const { return strict ? OnLoss::kStop : lossy ? OnLoss::kIgnore : OnLoss::kReport; }
+  OnLoss on_loss() const { return strict ? OnLoss::kStop : lossy && !json ? OnLoss::kIgnore : OnLoss::kReport; }
 };
 
 /// The codepage of the input or the output. UTF-16 and UTF-32 are read and written as UTF-8 has them.
@@ -82,13 +82,16 @@ bool settle_marks(const ConvertOptions& options, const TextSide& target, Sink& s
   return options.marks != kKeep || target.marked();
 }
 
-Json json_of(const Losses& losses, const TextSide& source, const TextSide& target) {
+/// `cut`: how many records were cut; none where the input is a text.
+Json json_of(const Losses& losses, const TextSide& source, const TextSide& target,
+             const std::optional<uint64_t>& cut) {
   const std::pair<const char*, LossKind> kKinds[] = {{"malformed", LossKind::kMalformed},
                                                      {"unassigned", LossKind::kUnassigned},
                                                      {"lacking", LossKind::kLacking},
                                                      {"changed", LossKind::kChanged}};
   Json json = {{"from", source.name()}, {"to", target.name()}, {"lost", losses.total()}};
   for (const auto& [name, kind] : kKinds) json["kinds"][name] = losses.of_kind(kind);
+  if (cut) json["cut"] = *cut;
   json["first"] = Json::array();
   for (const Loss& loss : losses.first()) {
     Json row;
@@ -129,8 +132,9 @@ void convert_text(const ConvertOptions& options, const TextSide& source, const T
   output.commit();
 }
 
+/// Counts the records that are cut.
 void convert_records(const ConvertOptions& options, const RecordBytes& bytes, const TextSide& source,
-                     const TextSide& target, Losses& losses) {
+                     const TextSide& target, Losses& losses, uint64_t* cut) {
   if (source.wide || target.wide)
     throw Failure(kUsageError, "--records is for codepages, not for " + (source.wide ? source : target).name());
   Input input(options.files);
@@ -144,10 +148,12 @@ void convert_records(const ConvertOptions& options, const RecordBytes& bytes, co
   pieces.each(!output.is_terminal(), [&](const char* data, size_t size) { reader.take(data, size); });
   reader.finish();
   output.commit();
-  if (sink.cut() != 0 && !options.lossy)
-    throw Failure(kDataError, std::to_string(sink.cut()) + (sink.cut() == 1 ? " record" : " records") +
-                                  " cut to " + std::to_string(bytes.to) + " bytes" +
-                                  (losses.total() == 0 ? "" : "\n" + losses.report()));
+  *cut = sink.cut();
+}
+
+/// A message, and behind it what is lost.
+std::string with_losses(const std::string& text, const Losses& losses) {
+  return losses.total() == 0 ? text : text + "\n" + losses.report();
 }
 
 int convert(const ConvertOptions& options, const CommonOptions& common) {
@@ -156,18 +162,24 @@ int convert(const ConvertOptions& options, const CommonOptions& common) {
   const TextSide source(session, options.from);
   const TextSide target(session, options.to);
   Losses losses(source.name(), target.name(), options.on_loss());
+  std::optional<uint64_t> cut;
   try {
     if (options.records.empty())
       convert_text(options, source, target, losses);
     else
-      convert_records(options, records, source, target, losses);
+      convert_records(options, records, source, target, losses, &cut.emplace());
   } catch (const FirstLoss&) {
     if (!options.json) throw;
+  } catch (const Failure& failure) {
+    throw Failure(failure.code(), with_losses(failure.what(), losses));
   }
-  if (options.json) {
-    std::cerr << json_text(json_of(losses, source, target));
-    return losses.total() == 0 ? kDone : kDataError;
-  }
+  const bool keeps_all = losses.total() == 0 && cut.value_or(0) == 0;
+  if (options.json) std::cerr << json_text(json_of(losses, source, target, cut));
+  if (options.json || options.lossy) return keeps_all || options.lossy ? kDone : kDataError;
+  if (cut.value_or(0) != 0)
+    throw Failure(kDataError, with_losses(std::to_string(*cut) + (*cut == 1 ? " record" : " records") +
+                                              " cut to " + std::to_string(records.to) + " bytes",
+                                          losses));
   losses.throw_any();
   return kDone;
 }
@@ -184,22 +196,26 @@ Run declare_convert(Arguments& command, const CommonOptions& common) {
   command.add_option("-t,--to", options->to, "codepage of the output").required().type_name("CP");
   const Arguments::Option strict =
       command.add_flag("--strict", options->strict, "stop at the first loss and leave OUT as it was");
-  command.add_flag("--lossy", options->lossy, "say nothing of losses, and exit with 0").excludes(strict);
-  command
-      .add_option(
-          "--bom", options->marks,
-          "byte-order marks that files begin with: kept where the output has them, dropped, or one added")
-      .type_name("WHAT")
-      .one_of({kKeep, kAdd, kDrop});
+  command.add_flag("--lossy", options->lossy, "say losses only where --json asks for them, and exit with 0")
+      .excludes(strict);
+  const Arguments::Option marks =
+      command
+          .add_option(
+              "--bom", options->marks,
+              "byte-order marks that files begin with: kept where the output has them, dropped, or one added")
+          .type_name("WHAT")
+          .one_of({kKeep, kAdd, kDrop});
   const Arguments::Option records =
       command
           .add_option("--records", options->records,
                       "the input is records of so many bytes, each a text; written with M bytes, else as many")
-          .type_name("N[,M]");
+          .type_name("N[,M]")
+          .excludes(marks);
   command.add_flag("--cut", options->cut, "cut records that do not fit, which else ends the work")
-      .needs(records);
+      .needs(records)
+      .excludes(strict);
   command.add_flag("--json", options->json,
-                   "say on standard error as JSON what is lost, also where nothing is");
+                   "say on standard error as JSON what is lost or cut, also where nothing is");
   command.add_option("-o,--output", options->output, "output file, replaced when it is complete")
       .type_name("OUT");
   command.add_option("FILE", options->files, "input files, taken as one text; - is standard input")

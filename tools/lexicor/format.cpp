@@ -25,6 +25,7 @@ namespace {
 constexpr size_t kNumberUnits = 2048;
 constexpr char kNoNumber[] = "reading stopped: not a number as the locale writes it";
 constexpr char kTooLarge[] = "a number that a double cannot hold";
+constexpr char kTooLong[] = "a double cannot hold this number to the last digit before the point";
 constexpr char kNoAmount[] = "reading stopped: not an amount as the locale writes it";
 
 struct ValueOptions {
@@ -51,6 +52,22 @@ std::errc read_c_number(const std::string& text, Number* value, size_t* stop) {
   return result.ec;
 }
 
+/// Whether a C number has digits only, with a sign or without one.
+bool is_whole(const std::string& text) {
+  return text.find_first_not_of("0123456789", text[0] == '-' ? 1 : 0) == std::string::npos;
+}
+
+/// Whether the digits of a C number before its point are those of the double that was read from it; of a number with an
+/// exponent there is no telling.
+bool is_exact(const std::string& text, double value) {
+  const std::string whole = text.substr(0, text.find('.'));
+  if (!is_whole(whole) || text.find_first_of("eE") != std::string::npos) return true;
+  char digits[512];
+  std::snprintf(digits, sizeof digits, "%.0f", std::trunc(std::fabs(value)));
+  const size_t first = whole.find_first_not_of("-0");
+  return (first == std::string::npos ? "0" : whole.substr(first)) == digits;
+}
+
 double c_double(const TextLocale& locale, const std::string& text) {
   double value = 0;
   size_t stop;
@@ -60,19 +77,8 @@ double c_double(const TextLocale& locale, const std::string& text) {
     throw locale.pointing(kDataError, kTooLarge, units, 0);
   if (error != std::errc() || stop < text.size())
     throw locale.pointing(kDataError, "reading stopped: not a number like -1234.56", units, stop);
+  if (!is_exact(text, value)) throw locale.pointing(kDataError, kTooLong, units, 0);
   return value;
-}
-
-/// Whether a C number has digits only, with a sign or without one.
-bool is_whole(const std::string& text) {
-  return text.find_first_not_of("0123456789", text[0] == '-' ? 1 : 0) == std::string::npos;
-}
-
-/// Whether a whole number is what the double says that was read from it.
-bool is_exact(const std::string& text, double value) {
-  char digits[512];
-  std::snprintf(digits, sizeof digits, "%.0f", value < 0 ? -value : value);
-  return text.substr(std::min(text.find_first_not_of("-0"), text.size() - 1)) == digits;
 }
 
 std::string format_number(const TextLocale& locale, const ValueOptions& options) {
@@ -84,12 +90,7 @@ std::string format_number(const TextLocale& locale, const ValueOptions& options)
                         LXLongToStringU(locale.locale(), integer, units.data(), kNumberUnits, 0));
   const double value = c_double(locale, options.text);
   const bool whole = is_whole(options.text);
-  if (whole) {
-    if (!is_exact(options.text, value))
-      throw locale.pointing(kDataError, "a whole number that a double cannot hold to its last digit",
-                            locale.units(options.text), 0);
-    LXSetLocaleNumInfo(locale.locale(), LX_ITEM_DIGITS, 0);
-  }
+  if (whole) LXSetLocaleNumInfo(locale.locale(), LX_ITEM_DIGITS, 0);
   int32_t written = LXDoubleToStringU(locale.locale(), value, units.data(), kNumberUnits, 0);
   // The separator is written also where no digits follow.
   const Units separator = locale.units(text_item(locale.locale(), LX_ITEM_DECIMAL).value_or(""));
@@ -290,7 +291,8 @@ Run declare_format(Arguments& command, const CommonOptions& common) {
       "A VALUE is a number like -1234.56, or a time like 2026-11-21T14:05:09. A whole number is written "
       "without "
       "a\n"
-      "fraction; other digits are cut behind the locale's fraction digits, not rounded.\n"
+      "fraction; other digits are cut behind the locale's fraction digits, not rounded. A number\n"
+      "that a double cannot hold to the last digit before its point is refused.\n"
       "\n"
       "Examples:\n"
       "  lexicor format number 1234567.891 --locale German\n"

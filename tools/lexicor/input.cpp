@@ -67,8 +67,9 @@ uint64_t Input::total_bytes() const {
 }
 
 bool Input::begins_file(uint64_t offset) const {
-  return std::any_of(starts_.begin(), starts_.end(),
-                     [&](const Start& start) { return start.offset == offset; });
+  const auto found = std::lower_bound(starts_.begin(), starts_.end(), offset,
+                                      [](const Start& start, uint64_t at) { return start.offset < at; });
+  return found != starts_.end() && found->offset == offset;
 }
 
 Input::Start Input::start_before(uint64_t offset) const {

@@ -10,6 +10,7 @@
 #include "command.h"
 #include "input.h"
 #include "line_ends.h"
+#include "notices.h"
 #include "output.h"
 #include "pieces.h"
 #include "report.h"
@@ -46,7 +47,7 @@ void report(const LineEndRewriter& rewriter, bool json) {
     std::cerr << json_text({{"line_ends", all}, {"kinds", counts}, {"rewritten", rewriter.rewritten()}});
     return;
   }
-  std::cerr << "lexicor: " << all << (all == 1 ? " line end" : " line ends") << kinds
+  notices() << "lexicor: " << all << (all == 1 ? " line end" : " line ends") << kinds
             << (kinds.empty() ? "" : ")") << ", " << rewriter.rewritten() << " rewritten\n";
 }
 

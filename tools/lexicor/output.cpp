@@ -7,6 +7,7 @@
 
 #include <cerrno>
 #include <charconv>
+#include <climits>
 #include <csignal>
 #include <cstdio>
 #include <cstring>
@@ -81,10 +82,20 @@ Step follow(const std::string& path) {
   return step;
 }
 
+/// The pattern of a temporary name in the same directory.
+std::string temporary_beside(const Step& step) {
+  constexpr char kPattern[] = ".XXXXXX";
+  const std::string name = step.name.string();
+  // Else the name leaves no room.
+  const bool fits = name.size() + sizeof kPattern - 1 <= NAME_MAX;
+  return (step.directory / ((fits ? name : g_program) + kPattern)).string();
+}
+
 }  // namespace
 
 Output::Output(const std::string& path) : path_(path) {
-  if (path.empty() || path == "-") {
+  if (path.empty()) throw Failure(kUsageError, "the name of the output file is empty; - is standard output");
+  if (path == "-") {
     path_ = "standard output";
     fd_ = STDOUT_FILENO;
     return;
@@ -105,7 +116,7 @@ Output::Output(const std::string& path) : path_(path) {
     return;
   }
   if (exists && access(path.c_str(), W_OK) != 0) fail();
-  std::string name = target_ + ".XXXXXX";
+  std::string name = temporary_beside(step);
   fd_ = mkostemp(name.data(), O_CLOEXEC);
   if (fd_ < 0) fail();
   temporary_ = name;

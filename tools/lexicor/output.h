@@ -22,10 +22,10 @@ class Sink {
 
 class Output : public Sink {
  public:
-  /// An empty path or "-" is standard output. A regular file, and one that does not exist, is written beside
+  /// "-" is standard output. A regular file, and one that does not exist, is written beside
   /// under a temporary name; anything else (a device, a named pipe, an open descriptor such as /dev/stdout) is
   /// written directly. Symbolic links are followed, also to a file that does not exist yet. Throws a Failure.
-  explicit Output(const std::string& path = "");
+  explicit Output(const std::string& path = "-");
   /// Without commit() the temporary file is removed.
   ~Output() override;
 

@@ -64,19 +64,37 @@ void Recoder::take(const char* data, size_t bytes) {
   feed(data, bytes, false);
 }
 
+/// Goes on to the first character of a file, behind its signature. What the file before has begun has its place there, and
+/// takes as many bytes as it needs, a byte at a time.
 void Recoder::begin_file(const char** data, size_t* bytes) {
-  const bool at_char = text_.empty();
-  // A character that the file before has begun has its place there.
-  for (; !text_.empty() && *bytes > 0; --*bytes) feed((*data)++, 1, false);
-  if (!text_.empty()) return;
+  const uint64_t start = offset_ + text_.size();
+  while (offset_ < start) {
+    const size_t done = convert_next(text_.data(), text_.size(), false);
+    text_.erase(0, done);
+    if (done != 0) continue;
+    if (*bytes == 0) return;
+    text_ += *(*data)++;
+    --*bytes;
+  }
+  *data -= text_.size();
+  *bytes += text_.size();
+  text_.clear();
   place_.restart();
-  if (!at_char || output_ == nullptr || !source_.utf8() || rules_.unit_bytes != 0 ||
-      (repertoire_.has(kSignatureValue) && !rules_.drops_marks) || *bytes < kSignatureBytes ||
-      std::memcmp(*data, kSignature, kSignatureBytes) != 0)
-    return;
+  if (offset_ != start || !begins_with_dropped_mark(*data, *bytes)) return;
   *data += kSignatureBytes;
   *bytes -= kSignatureBytes;
   offset_ += kSignatureBytes;
+}
+
+/// Counts places anew at a character that a file begins with: behind one that is cut at a file's end there may be several.
+void Recoder::meet_file() {
+  if (input_.begins_file(offset_)) place_.restart();
+}
+
+bool Recoder::begins_with_dropped_mark(const char* data, size_t bytes) const {
+  return output_ != nullptr && source_.utf8() && rules_.unit_bytes == 0 &&
+         (rules_.drops_marks || !repertoire_.has(kSignatureValue)) && bytes >= kSignatureBytes &&
+         std::memcmp(data, kSignature, kSignatureBytes) == 0;
 }
 
 void Recoder::finish() {
@@ -95,6 +113,7 @@ void Recoder::end_record() {
 }
 
 void Recoder::take_malformed(uint32_t input_bytes, const std::string& what) {
+  meet_file();
   if (losses_.places_wanted())
     losses_.record(LossKind::kMalformed, where(offset_), what);
   else
@@ -121,17 +140,17 @@ void Recoder::feed(const char* data, size_t bytes, bool last) {
 /// Converts a text but for a cut character at its end, which waits for more; returns the bytes that it took.
 size_t Recoder::convert(const char* text, size_t bytes, bool last) {
   size_t at = 0;
-  while (at < bytes) {
-    if (source_.is_shift(text[at])) {
-      state_ = source_.state_after(text[at++]);
-      ++offset_;
-      continue;
-    }
-    const size_t done = convert_some(text + at, bytes - at, last);
-    if (done == 0) break;
-    at += done;
-  }
+  for (size_t done = 1; at < bytes && done != 0; at += done) done = convert_next(text + at, bytes - at, last);
   return at;
+}
+
+/// Converts the beginning of a text, or goes past a shift byte; 0 when it is a cut character, which waits for more.
+size_t Recoder::convert_next(const char* text, size_t bytes, bool last) {
+  meet_file();
+  if (!source_.is_shift(*text)) return convert_some(text, bytes, last);
+  state_ = source_.state_after(*text);
+  ++offset_;
+  return 1;
 }
 
 /// Converts the beginning of a text; 0 when it is a cut character, which waits for more.

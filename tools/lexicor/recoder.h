@@ -54,8 +54,11 @@ class Recoder {
   };
 
   void begin_file(const char** data, size_t* bytes);
+  void meet_file();
+  bool begins_with_dropped_mark(const char* data, size_t bytes) const;
   void feed(const char* data, size_t bytes, bool last);
   size_t convert(const char* text, size_t bytes, bool last);
+  size_t convert_next(const char* text, size_t bytes, bool last);
   size_t convert_some(const char* text, size_t bytes, bool last);
   size_t convert_clean(const char* text, size_t bytes);
   size_t own_bytes(const char* text, size_t bytes);

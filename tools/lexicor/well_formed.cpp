@@ -8,7 +8,15 @@
 namespace lexicor_cli {
 
 void WellFormed::take(const char* data, size_t bytes) {
-  if (text_.empty() && input_.begins_file(offset_)) place_.restart();
+  const uint64_t start = offset_ + text_.size();
+  if (input_.begins_file(start)) {
+    // A character that the file before has begun has its place there.
+    for (; offset_ < start && bytes > 0; --bytes) {
+      text_ += *data++;
+      look(false);
+    }
+    if (offset_ >= start) place_.restart();
+  }
   text_.append(data, bytes);
   look(false);
 }

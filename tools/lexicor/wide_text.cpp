@@ -131,22 +131,39 @@ WideReader::WideReader(const WideEncoding& encoding, const Input& input, Recoder
       little_(encoding.order == WideEncoding::Order::kLittle) {}
 
 void WideReader::take(const char* data, size_t bytes) {
-  if (input_.begins_file(offset_)) {
-    finish();
-    begins_ = true;
-    recoder_.begin_units();
-  }
+  const bool begins = input_.begins_file(offset_);
+  const size_t before = cut_.size();
   offset_ += bytes;
   cut_.append(data, bytes);
-  size_t at = begins_ ? take_mark(cut_.data(), cut_.size()) : 0;
-  while (!begins_) {
-    at += take_plain(cut_.data() + at, cut_.size() - at);
-    const size_t taken = take_char(cut_.data() + at, cut_.size() - at);
+  size_t at = 0;
+  if (begins) {
+    // What the file before has begun has its place there.
+    at = take_until(0, before);
+    flush();
+    if (at >= before) recoder_.begin_units();
+    begins_ |= at == before;
+  }
+  cut_.erase(0, take_until(at, cut_.size()));
+  flush();
+}
+
+/// Takes the characters of the text that begin from `at` to `end`, but for one that is cut; returns where it went on to.
+size_t WideReader::take_until(size_t at, size_t end) {
+  while (at < end) {
+    if (!begins_) at += take_plain(cut_.data() + at, end - at);
+    const size_t taken = at < end ? take_next(cut_.data() + at, cut_.size() - at) : 0;
     if (taken == 0) break;
     at += taken;
   }
-  cut_.erase(0, at);
-  flush();
+  return at;
+}
+
+/// Takes the mark that a file begins with, or a character; 0: it is cut.
+size_t WideReader::take_next(const char* p, size_t bytes) {
+  if (bytes < encoding_.unit_bytes) return 0;
+  const size_t mark = begins_ ? take_mark(p) : 0;
+  begins_ = false;
+  return mark != 0 ? mark : take_char(p, bytes);
 }
 
 /// Takes characters that are one unit each.
@@ -162,28 +179,26 @@ size_t WideReader::take_plain(const char* p, size_t bytes) {
 }
 
 void WideReader::finish() {
-  begins_ = false;
   if (!cut_.empty())
     refuse(cut_.data(), static_cast<uint32_t>(cut_.size()), "the text ends inside a character");
   cut_.clear();
 }
 
-uint32_t WideReader::unit_at(const char* p) const {
+uint32_t WideReader::unit_at(const char* p, bool little) const {
   uint32_t unit = 0;
   for (uint32_t i = 0; i < encoding_.unit_bytes; ++i)
-    unit = unit << 8 | static_cast<uint8_t>(p[little_ ? encoding_.unit_bytes - 1 - i : i]);
+    unit = unit << 8 | static_cast<uint8_t>(p[little ? encoding_.unit_bytes - 1 - i : i]);
   return unit;
 }
 
-/// Looks for a mark where a file begins, as soon as there is a unit; returns the bytes of the mark.
-size_t WideReader::take_mark(const char* data, size_t bytes) {
-  if (bytes < encoding_.unit_bytes) return 0;
-  begins_ = false;
+/// Looks for a mark where a file begins, and goes by its order from there on; returns the bytes of a mark that is no text.
+size_t WideReader::take_mark(const char* p) {
   if (encoding_.order == WideEncoding::Order::kMarked) {
-    little_ = true;
-    little_ = unit_at(data) == kMark;
+    for (const bool little : {false, true}) {
+      if (unit_at(p, little) == kMark) little_ = little;
+    }
   }
-  if (unit_at(data) != kMark || keeps_marks_) return 0;
+  if (unit_at(p) != kMark || keeps_marks_) return 0;
   recoder_.skip(encoding_.unit_bytes);
   return encoding_.unit_bytes;
 }
@@ -191,7 +206,6 @@ size_t WideReader::take_mark(const char* data, size_t bytes) {
 /// Takes the character at `p`; 0: it is cut.
 size_t WideReader::take_char(const char* p, size_t bytes) {
   const uint32_t unit_bytes = encoding_.unit_bytes;
-  if (bytes < unit_bytes) return 0;
   const uint32_t unit = unit_at(p);
   if (unit_bytes == 2 && is_high_half(unit)) {
     if (bytes < 2 * unit_bytes) return 0;

@@ -16,7 +16,7 @@ struct WideEncoding {
   enum class Order { kBig, kLittle, kMarked };
 
   uint32_t unit_bytes;  // 2 or 4
-  Order order;          // kMarked: as the mark says that the text begins with, else big
+  Order order;          // kMarked: as the last mark says that a file begins with, else big
 
   /// "UTF-16", "UTF-32LE".
   std::string name() const;
@@ -37,8 +37,11 @@ class WideReader {
   void finish();
 
  private:
-  uint32_t unit_at(const char* p) const;
-  size_t take_mark(const char* data, size_t bytes);
+  uint32_t unit_at(const char* p, bool little) const;
+  uint32_t unit_at(const char* p) const { return unit_at(p, little_); }
+  size_t take_until(size_t at, size_t end);
+  size_t take_next(const char* p, size_t bytes);
+  size_t take_mark(const char* p);
   size_t take_plain(const char* p, size_t bytes);
   size_t take_char(const char* p, size_t bytes);
   void refuse(const char* p, uint32_t bytes, const char* reason);
