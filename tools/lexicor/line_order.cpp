@@ -56,8 +56,9 @@ KeyMaker::KeyMaker(const LineOrder& order) : order_(order), codepage_(order.coll
 
 std::string_view KeyMaker::make(const Line& line, Arena* keys) {
   std::string_view text = line.counted();
-  if (codepage_.call_bytes(text.data(), text.size()) != text.size())
-    text = keep(without_idle_shifts(codepage_, text), keys);
+  // Shift bytes that change nothing do not count; most lines have none, or one that ends them.
+  const size_t bytes = bytes_before_idle_shift(codepage_, text);
+  text = bytes + 1 >= text.size() ? text.substr(0, bytes) : keep(without_idle_shifts(codepage_, text), keys);
   if (!order_.by_key()) return text;
   if (order_.fields_.size() == 1) return part(text, order_.fields_[0], keys);
   line_.clear();

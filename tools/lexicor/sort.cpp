@@ -133,14 +133,11 @@ void sort_lines(const SortJob& job) {
 void merge_files(const SortJob& job) {
   std::vector<std::string> files = job.options.files;
   if (files.empty()) files.push_back("-");
-  std::vector<std::unique_ptr<InputLines>> inputs;
-  std::vector<OrderedLines*> sources;
-  for (const std::string& file : files) {
-    inputs.push_back(std::make_unique<InputLines>(job.collation.codepage(), file, files.size() > 1,
-                                                  job.options.null_ended, Pieces::kBytes));
-    sources.push_back(inputs.back().get());
-  }
-  LineMerge merge(job.order, sources);
+  MergeSources sources(job.order, job.memory, job.options.temporary_directory);
+  for (const std::string& file : files)
+    sources.add(std::make_unique<InputLines>(job.collation.codepage(), file, files.size() > 1,
+                                             job.options.null_ended, Pieces::kBytes));
+  LineMerge merge = sources.merge();
   Output output(job.options.output);
   LineWriter writer(output, job.order, job.options.uniqueness());
   merge.each([&](const Line& line, const KeyEntry& entry) { writer.write(line, entry.view()); });

@@ -35,7 +35,8 @@ class FieldFinder {
   /// blanks in front of it. Throws a Failure when the codepage lacks it.
   FieldFinder(const Codepage& codepage, const std::string& separator);
 
-  /// The part of a text, which is in `text`, or in `room` where it begins in the double-byte state.
+  /// The part of a text without idle shift bytes, from its first character to its last one. It is in `text`, or in
+  /// `room` where it begins between double-byte characters.
   std::string_view find(std::string_view text, const SortField& field, std::string* room) const;
 
  private:

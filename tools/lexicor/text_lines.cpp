@@ -149,6 +149,22 @@ bool LineReader::ends_whole(std::string_view text) const {
   return true;
 }
 
+size_t bytes_before_idle_shift(const Codepage& codepage, std::string_view text) {
+  if (!codepage.shift_sensitive()) return text.size();
+  LXShiftState state = LX_SHIFT_SINGLE;
+  for (size_t at = 0; at < text.size();) {
+    if (!codepage.is_shift(text[at])) {
+      at += std::min<size_t>(static_cast<size_t>(codepage.char_bytes(&text[at], state)), text.size() - at);
+      continue;
+    }
+    const LXShiftState next = codepage.state_after(text[at]);
+    if (next == state || at + 1 == text.size() || codepage.is_shift(text[at + 1])) return at;
+    state = next;
+    ++at;
+  }
+  return text.size();
+}
+
 std::string without_idle_shifts(const Codepage& codepage, std::string_view text) {
   std::string result;
   LXShiftState state = LX_SHIFT_SINGLE, written = LX_SHIFT_SINGLE;

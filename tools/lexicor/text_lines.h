@@ -57,6 +57,9 @@ class LineReader {
   uint64_t offset_ = 0;      // of what is read next
 };
 
+/// How much of a text is in front of the first shift byte that changes nothing, as one that no character follows does
+/// not: all of it where there is none. In bytes.
+size_t bytes_before_idle_shift(const Codepage& codepage, std::string_view text);
 /// A text without the shift bytes that change nothing: the library takes the second of two for a character.
 std::string without_idle_shifts(const Codepage& codepage, std::string_view text);
 
