@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <cstring>
+#include <limits>
 #include <utility>
 
 namespace lexicor_cli {
@@ -24,8 +25,23 @@ LineOrder::LineOrder(Collation& collation, const FieldFinder& finder, const Sort
     if (collation_.binary() && field.ignore_case) by_key_ &= FoldedBytes(collation_.codepage()).possible();
   }
   if (fields_.size() > 1) by_text_ = false;
+  most_part_ = most_part();
   if (!by_key_) return;
   descending_ = fields_.size() == 1 && fields_[0].reverse;
+}
+
+/// Room for a key is told in 31 bits; the keys of all fields share it.
+size_t LineOrder::most_part() const {
+  if (by_text_) return std::numeric_limits<int32_t>::max();
+  const bool folded = collation_.binary() && by_key_;
+  return (folded ? FoldedBytes::kMostText : Collation::kMostText) / fields_.size();
+}
+
+bool LineOrder::orders_parts(std::string_view line) const {
+  std::string room;
+  return !whole_ && std::all_of(fields_.begin(), fields_.end(), [&](const SortField& field) {
+    return finder_.find(line, field, &room).size() <= most_part_;
+  });
 }
 
 int32_t LineOrder::compare(std::string_view key1, std::string_view key2) const {

@@ -126,10 +126,10 @@ struct FieldFinder::Walker {
   void next() { past = at += bytes(); }
 };
 
-FieldFinder::FieldFinder(const Codepage& codepage, const std::string& separator)
+FieldFinder::FieldFinder(const Codepage& codepage, const std::optional<std::string>& separator)
     : codepage_(codepage),
-      separated_(!separator.empty()),
-      separator_(separated_ ? separator_code(codepage, separator) : 0),
+      separated_(separator.has_value()),
+      separator_(separated_ ? separator_code(codepage, *separator) : 0),
       blank_(LXCpUnicodeToCharW(codepage.object(), ' ')),
       tab_(LXCpUnicodeToCharW(codepage.object(), '\t')),
       feed_(LXCpUnicodeToCharW(codepage.object(), '\n')) {}

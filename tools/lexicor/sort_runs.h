@@ -73,9 +73,10 @@ class SortedRun : public OrderedLines {
 /// The lines of an input that is in order.
 class InputLines : public OrderedLines {
  public:
-  InputLines(const Codepage& codepage, const std::string& name, bool one_of_several, bool null_ended,
+  InputLines(const LineOrder& order, const std::string& name, bool one_of_several, bool null_ended,
              size_t buffer_bytes)
-      : input_({name}, one_of_several), reader_(codepage, input_, null_ended, buffer_bytes) {}
+      : input_({name}, one_of_several),
+        reader_(order.codepage(), input_, null_ended, buffer_bytes, order.line_test()) {}
 
   const Line* next() override;
 
