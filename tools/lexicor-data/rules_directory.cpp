@@ -7,9 +7,7 @@
 #include <cstdio>
 #include <cstring>
 #include <filesystem>
-#include <fstream>
 #include <set>
-#include <sstream>
 
 #include "control_source.h"
 #include "core/lxformat.h"
@@ -25,14 +23,6 @@ namespace fs = std::filesystem;
 namespace format = lx::format;
 
 constexpr char kSortName[] = "Rules";
-
-std::string text_of(const std::string& file) {
-  std::ifstream in(file, std::ios::binary);
-  std::ostringstream text;
-  if (in) text << in.rdbuf();
-  if (!in && text.str().empty()) throw SourceError(file, 0, 0, std::strerror(errno));
-  return text.str();
-}
 
 /// Lists a further sort, under a name and an identifier that are free.
 ObjectName add_sort(Control& control) {
@@ -63,7 +53,7 @@ void write_section(const std::string& file, ByteVector section) {
 RulesDirectory::RulesDirectory(const std::string& base, const std::string& rules_file) {
   SortSources sources(base + '/' + kSortDirectory);
   SortNotes notes;
-  const ByteVector payload = pack_sort(sources.build({rules_file, text_of(rules_file)}, notes), rules_file);
+  const ByteVector payload = pack_sort(sources.build(read_rules(rules_file), notes), rules_file);
   const std::string control_file = base + '/' + format::kControlFile;
   Control control =
       unpack_control(read_object(read_file(control_file), control_file).sections[0], control_file);

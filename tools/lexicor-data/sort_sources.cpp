@@ -1,5 +1,7 @@
 #include "sort_sources.h"
 
+#include <cerrno>
+#include <cstring>
 #include <filesystem>
 #include <fstream>
 #include <sstream>
@@ -7,6 +9,14 @@
 #include "ucm.h"
 
 namespace lexicor_data {
+
+RuleFile read_rules(const std::string& file) {
+  std::ifstream in(file, std::ios::binary);
+  std::ostringstream text;
+  // A copy of nothing fails, also that of an empty file.
+  if (in && (in.peek() == EOF || text << in.rdbuf()) && !in.bad()) return {file, text.str()};
+  throw SourceError(file, 0, 0, std::strerror(errno));
+}
 
 const SortRoot& SortSources::root() {
   std::call_once(root_read_, [&] {
@@ -19,10 +29,8 @@ const SortRoot& SortSources::root() {
 
 RuleFile SortSources::find(const std::string& name) const {
   const std::string file = directory_ + '/' + name + kRulesExtension;
-  std::ifstream in(file, std::ios::binary);
-  std::ostringstream text;
-  if (!in || !(text << in.rdbuf() || in.peek() == EOF)) return {};
-  return {file, text.str()};
+  std::error_code error;
+  return std::filesystem::exists(file, error) ? read_rules(file) : RuleFile{};
 }
 
 SortSource SortSources::build(const RuleFile& rules, SortNotes& notes, std::vector<std::string>* used) {

@@ -15,6 +15,9 @@ inline constexpr char kSortDirectory[] = "sorts";
 inline constexpr char kRootFile[] = "root.txt";
 inline constexpr char kRulesExtension[] = ".rules";
 
+/// Reads a file of rules. Throws SourceError with the system's reason.
+RuleFile read_rules(const std::string& file);
+
 /// Several threads may use it.
 class SortSources {
  public:
@@ -22,7 +25,7 @@ class SortSources {
   explicit SortSources(std::string directory) : directory_(std::move(directory)) {}
 
   const SortRoot& root();
-  /// The rules of a name; without a file name when there are none.
+  /// The rules of a name; without a file name when there are none. Throws SourceError.
   RuleFile find(const std::string& name) const;
   /// Builds the sort that rules make. `used` receives the files that it is made of beside its own. Throws SourceError.
   SortSource build(const RuleFile& rules, SortNotes& notes, std::vector<std::string>* used = nullptr);

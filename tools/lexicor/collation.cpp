@@ -12,8 +12,7 @@ constexpr size_t kKeyBytesPerByte = 16;
 constexpr size_t kKeySeparators = 3;
 
 int32_t length_of(std::string_view text) {
-  constexpr size_t kMost = std::numeric_limits<int32_t>::max() / kKeyBytesPerByte - kKeySeparators;
-  if (text.size() > kMost)
+  if (text.size() > Collation::kMostText)
     throw Failure(kDataError, "a text of " + std::to_string(text.size()) + " bytes is too long to be ordered");
   return static_cast<int32_t>(text.size());
 }
@@ -23,6 +22,8 @@ int32_t length_of(std::string_view text) {
 }
 
 }  // namespace
+
+const size_t Collation::kMostText = std::numeric_limits<int32_t>::max() / kKeyBytesPerByte - kKeySeparators;
 
 Collation::Collation(RulesSession& session, const std::string& locale_name, const std::string& codepage)
     : Collation(session, open_chosen_locale(locale_name), codepage, session.sort_id()) {

@@ -20,6 +20,9 @@ namespace lexicor_cli {
 /// Texts begin in the single-byte state. `options` are those of LXStrxfrm.
 class Collation {
  public:
+  /// The longest text that is ordered, in bytes; in binary order without options any is.
+  static const size_t kMostText;
+
   /// `locale_name` empty: the user's locale. The sort of rules stands instead of the locale's. Throws a Failure that
   /// says what is not there.
   Collation(RulesSession& session, const std::string& locale_name, const std::string& codepage = "UTF-8");

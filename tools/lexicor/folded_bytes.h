@@ -13,7 +13,12 @@ namespace lexicor_cli {
 
 /// Keys whose order is that of the library's comparison in binary order without letter case. A thread has one.
 class FoldedBytes {
+  static constexpr size_t kMostGrowth = 8;
+
  public:
+  /// The longest text that has a key, in bytes.
+  static constexpr size_t kMostText = INT32_MAX / kMostGrowth;
+
   explicit FoldedBytes(const Codepage& codepage);
 
   /// Whether there are such keys. Where shift states count, the comparison follows no order of keys.
@@ -24,7 +29,6 @@ class FoldedBytes {
   size_t write_key(std::string_view text, char* room);
 
  private:
-  static constexpr size_t kMostGrowth = 8;
   static constexpr size_t kRemembered = 1024;  // characters, a power of two
 
   /// A character of several bytes, and what it is folded to.

@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <cstring>
+#include <limits>
 #include <utility>
 
 namespace lexicor_cli {
@@ -24,8 +25,23 @@ LineOrder::LineOrder(Collation& collation, const FieldFinder& finder, const Sort
     if (collation_.binary() && field.ignore_case) by_key_ &= FoldedBytes(collation_.codepage()).possible();
   }
   if (fields_.size() > 1) by_text_ = false;
+  most_part_ = most_part();
   if (!by_key_) return;
   descending_ = fields_.size() == 1 && fields_[0].reverse;
+}
+
+/// Room for a key is told in 31 bits; the keys of all fields share it.
+size_t LineOrder::most_part() const {
+  if (by_text_) return std::numeric_limits<int32_t>::max();
+  const bool folded = collation_.binary() && by_key_;
+  return (folded ? FoldedBytes::kMostText : Collation::kMostText) / fields_.size();
+}
+
+bool LineOrder::orders_parts(std::string_view line) const {
+  std::string room;
+  return !whole_ && std::all_of(fields_.begin(), fields_.end(), [&](const SortField& field) {
+    return finder_.find(line, field, &room).size() <= most_part_;
+  });
 }
 
 int32_t LineOrder::compare(std::string_view key1, std::string_view key2) const {
@@ -56,8 +72,9 @@ KeyMaker::KeyMaker(const LineOrder& order) : order_(order), codepage_(order.coll
 
 std::string_view KeyMaker::make(const Line& line, Arena* keys) {
   std::string_view text = line.counted();
-  if (codepage_.call_bytes(text.data(), text.size()) != text.size())
-    text = keep(without_idle_shifts(codepage_, text), keys);
+  // Shift bytes that change nothing do not count; most lines have none, or one that ends them.
+  const size_t bytes = bytes_before_idle_shift(codepage_, text);
+  text = bytes + 1 >= text.size() ? text.substr(0, bytes) : keep(without_idle_shifts(codepage_, text), keys);
   if (!order_.by_key()) return text;
   if (order_.fields_.size() == 1) return part(text, order_.fields_[0], keys);
   line_.clear();

@@ -2,6 +2,7 @@
 #pragma once
 
 #include <cstdint>
+#include <functional>
 #include <memory>
 #include <string>
 #include <string_view>
@@ -21,6 +22,11 @@ class LineOrder {
   LineOrder(Collation& collation, const FieldFinder& finder, const SortFieldDefaults& defaults,
             std::vector<SortField> fields);
 
+  const Codepage& codepage() const { return collation_.codepage(); }
+  /// Tells of a line whether it is short enough to be ordered.
+  std::function<bool(std::string_view)> line_test() const {
+    return [this](std::string_view line) { return line.size() <= most_part_ || orders_parts(line); };
+  }
   /// Whether the bytes of keys tell the order; else compare() alone tells it.
   bool by_key() const { return by_key_; }
   /// Whether keys are the texts of the lines, or parts of them.
@@ -34,12 +40,15 @@ class LineOrder {
  private:
   friend class KeyMaker;
 
+  size_t most_part() const;
+  bool orders_parts(std::string_view line) const;
   int32_t compare_texts(std::string_view text1, std::string_view text2) const;
   uint32_t options_of(const SortField& field) const { return field.ignore_case ? LX_CASE_INSENSITIVE : 0; }
 
   Collation& collation_;
   const FieldFinder& finder_;
   std::vector<SortField> fields_;
+  size_t most_part_;    // the longest part of a line that has a key, in bytes
   bool whole_ = false;  // the one field is the whole line
   bool by_key_ = true, by_text_ = true, descending_ = false;
 };

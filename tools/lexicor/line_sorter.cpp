@@ -16,8 +16,6 @@ namespace {
 
 constexpr uint64_t kMebibyte = 1024 * 1024;
 constexpr size_t kMostBlock = 2 * kMebibyte, kLeastBlock = 64;
-constexpr size_t kLeastRunBuffer = 4096;
-constexpr size_t kMostRuns = 64;        // that are merged at a time
 constexpr size_t kWorthThreads = 2048;  // keys
 
 /// Sorts so that lines of which none is before the other keep their places. Merging ends also with an order that
@@ -59,7 +57,7 @@ uint64_t usual_sort_memory() {
 }
 
 LineSorter::LineSorter(const LineOrder& order, uint64_t memory, std::string temporary_directory)
-    : order_(order), memory_(memory), temporary_directory_(std::move(temporary_directory)) {
+    : order_(order), memory_(memory), runs_(order, memory, std::move(temporary_directory)) {
   for (size_t i = 0; i < thread_count(); ++i) {
     makers_.push_back(std::make_unique<KeyMaker>(order));
     keys_.push_back(std::make_unique<Arena>());
@@ -104,9 +102,10 @@ void LineSorter::sort() {
 void LineSorter::spill() {
   if (lines_.size() == 0) return;
   sort();
-  runs_.push_back(std::make_unique<SortedRun>(temporary_directory_));
-  for (const KeyEntry& entry : entries_) runs_.back()->add(lines_[entry.line]);
-  runs_.back()->flush();
+  std::unique_ptr<SortedRun> run = runs_.new_run();
+  for (const KeyEntry& entry : entries_) run->add(lines_[entry.line]);
+  run->flush();
+  runs_.add(std::move(run));
   texts_.clear();
   lines_.clear();
   entries_.clear();
@@ -128,36 +127,10 @@ void LineSorter::write(LineWriter& writer, const std::function<void(uint64_t)>& 
     return;
   }
   spill();
-  while (runs_.size() > kMostRuns) {
-    std::vector<std::unique_ptr<SortedRun>> longer;
-    for (size_t first = 0; first < runs_.size(); first += kMostRuns)
-      longer.push_back(merged(first, std::min(kMostRuns, runs_.size() - first)));
-    runs_ = std::move(longer);
-  }
-  merge(0, runs_.size(), [&](const Line& line, const KeyEntry& entry) {
+  runs_.merge().each([&](const Line& line, const KeyEntry& entry) {
     writer.write(line, entry.view());
     wrote(line.bytes);
   });
-}
-
-/// One run of several, which are gone then.
-std::unique_ptr<SortedRun> LineSorter::merged(size_t first, size_t count) {
-  auto run = std::make_unique<SortedRun>(temporary_directory_);
-  merge(first, count, [&](const Line& line, const KeyEntry&) { run->add(line); });
-  run->flush();
-  for (size_t i = first; i < first + count; ++i) runs_[i].reset();
-  return run;
-}
-
-template <class Take>
-void LineSorter::merge(size_t first, size_t count, Take take) {
-  std::vector<OrderedLines*> sources;
-  for (size_t i = first; i < first + count; ++i) {
-    runs_[i]->rewind(
-        static_cast<size_t>(std::clamp<uint64_t>(memory_ / 2 / count, kLeastRunBuffer, kMebibyte)));
-    sources.push_back(runs_[i].get());
-  }
-  LineMerge(order_, sources).each(take);
 }
 
 }  // namespace lexicor_cli

@@ -33,20 +33,16 @@ class LineSorter {
   void make_entries(size_t first);
   void sort();
   void spill();
-  std::unique_ptr<SortedRun> merged(size_t first, size_t count);
-  template <class Take>
-  void merge(size_t first, size_t count, Take take);
 
   const LineOrder& order_;
   const uint64_t memory_;
-  const std::string temporary_directory_;
   Arena texts_;
   Rows<Line> lines_;
   Rows<KeyEntry> entries_;
   // Of each thread.
   std::vector<std::unique_ptr<KeyMaker>> makers_;
   std::vector<std::unique_ptr<Arena>> keys_;
-  std::vector<std::unique_ptr<SortedRun>> runs_;
+  MergeSources runs_;
 };
 
 /// The memory that sorting takes when nothing else is said: a part of what the machine has, in bytes.

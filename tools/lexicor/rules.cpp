@@ -14,6 +14,7 @@ void add_rules_option(Arguments& command, std::string& file) {
 RulesSession::RulesSession(const CommonOptions& common, const std::string& rules_file)
     : session_(std::make_unique<const Session>(common)) {
   if (rules_file.empty()) return;
+  if (rules_file == "-") throw Failure(kUsageError, "--rules takes a file, not standard input");
   if (session_->built_in_only()) throw Failure(kDataError, "--rules needs a locale directory");
   const std::string base = locale_directory();
   session_.reset();

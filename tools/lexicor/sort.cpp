@@ -5,6 +5,7 @@
 #include <iostream>
 #include <limits>
 #include <memory>
+#include <optional>
 #include <vector>
 
 #include "arguments.h"
@@ -31,7 +32,7 @@ struct SortOptions {
   std::string codepage = "UTF-8";
   std::string output = "-";
   std::vector<std::string> keys;
-  std::string separator;  // empty: blanks
+  std::optional<std::string> separator;  // none: blanks
   bool ignore_case = false, ignore_blanks = false, reverse = false;
   std::string unique;  // kUniqueBytes or kUniqueOrder; empty: every line is written
   bool null_ended = false, stable = false;
@@ -109,7 +110,8 @@ struct SortJob {
 void sort_lines(const SortJob& job) {
   Input input(job.options.files);
   LineSorter sorter(job.order, job.memory, job.options.temporary_directory);
-  LineReader reader(job.collation.codepage(), input, job.options.null_ended, sorter.block_bytes());
+  LineReader reader(job.collation.codepage(), input, job.options.null_ended, sorter.block_bytes(),
+                    job.order.line_test());
   bool more = sorter.take(reader);
   // Once something is read: a missing input leaves no trace.
   Output output(job.options.output);
@@ -133,14 +135,11 @@ void sort_lines(const SortJob& job) {
 void merge_files(const SortJob& job) {
   std::vector<std::string> files = job.options.files;
   if (files.empty()) files.push_back("-");
-  std::vector<std::unique_ptr<InputLines>> inputs;
-  std::vector<OrderedLines*> sources;
-  for (const std::string& file : files) {
-    inputs.push_back(std::make_unique<InputLines>(job.collation.codepage(), file, files.size() > 1,
-                                                  job.options.null_ended, Pieces::kBytes));
-    sources.push_back(inputs.back().get());
-  }
-  LineMerge merge(job.order, sources);
+  MergeSources sources(job.order, job.memory, job.options.temporary_directory);
+  for (const std::string& file : files)
+    sources.add(std::make_unique<InputLines>(job.order, file, files.size() > 1, job.options.null_ended,
+                                             Pieces::kBytes));
+  LineMerge merge = sources.merge();
   Output output(job.options.output);
   LineWriter writer(output, job.order, job.options.uniqueness());
   merge.each([&](const Line& line, const KeyEntry& entry) { writer.write(line, entry.view()); });
@@ -155,7 +154,7 @@ int check_order(const SortJob& job) {
   if (options.files.size() > 1)
     throw Failure(kUsageError, "-c looks at one file, not at " + std::to_string(options.files.size()));
   const std::string file = options.files.empty() ? "-" : options.files[0];
-  InputLines lines(job.collation.codepage(), file, false, options.null_ended, Pieces::kBytes);
+  InputLines lines(job.order, file, false, options.null_ended, Pieces::kBytes);
   const Unique unique = options.uniqueness();
   KeyMaker maker(job.order);
   Arena keys;
@@ -219,8 +218,9 @@ Run declare_sort(Arguments& command, const CommonOptions& common) {
   command.add_flag("-z,--zero-terminated", options->null_ended, "lines end with a null character");
   const Arguments::Option check =
       command.add_flag("-c,--check", options->check, "tell whether the lines are sorted, and which one is not");
-  const Arguments::Option quiet = command.add_flag("-C", options->check_quietly,
-                                                   "tell by the exit code alone whether the lines are sorted");
+  const Arguments::Option quiet =
+      command.add_flag("-C", options->check_quietly, "tell by the exit code alone whether the lines are sorted")
+          .excludes(check);
   command.add_flag("-m,--merge", options->merge, "merge files that are sorted").excludes(check).excludes(quiet);
   command
       .add_option("-S,--buffer-size", options->buffer_size,
@@ -233,7 +233,9 @@ Run declare_sort(Arguments& command, const CommonOptions& common) {
                   "directory for temporary files; else TMPDIR, else /tmp")
       .type_name("DIR");
   command.add_option("-o,--output", options->output, "output file, replaced when it is complete")
-      .type_name("OUT");
+      .type_name("OUT")
+      .excludes(check)
+      .excludes(quiet);
   command.add_option("FILE", options->files, "input files; - is standard input").type_name("");
   command.footer(
       "A line ends with a line feed, or with a carriage return and one, which do not count. Lines that the "

@@ -109,6 +109,7 @@ struct FieldFinder::Walker {
   const char* at;
   const char* end;
   LXShiftState state;
+  const char* past;  // the last character that was passed
 
   bool at_end() {
     while (at != end && codepage.is_shift(*at)) state = codepage.state_after(*at++);
@@ -122,13 +123,13 @@ struct FieldFinder::Walker {
     for (size_t i = 0; i < bytes(); ++i) code = code << 8 | static_cast<uint8_t>(at[i]);
     return code;
   }
-  void next() { at += bytes(); }
+  void next() { past = at += bytes(); }
 };
 
-FieldFinder::FieldFinder(const Codepage& codepage, const std::string& separator)
+FieldFinder::FieldFinder(const Codepage& codepage, const std::optional<std::string>& separator)
     : codepage_(codepage),
-      separated_(!separator.empty()),
-      separator_(separated_ ? separator_code(codepage, separator) : 0),
+      separated_(separator.has_value()),
+      separator_(separated_ ? separator_code(codepage, *separator) : 0),
       blank_(LXCpUnicodeToCharW(codepage.object(), ' ')),
       tab_(LXCpUnicodeToCharW(codepage.object(), '\t')),
       feed_(LXCpUnicodeToCharW(codepage.object(), '\n')) {}
@@ -159,23 +160,26 @@ std::string_view FieldFinder::find(std::string_view text, const SortField& field
     for (; count > 0 && !walker->at_end(); --count) walker->next();
   };
   const char* const text_end = text.data() + text.size();
-  Walker begin{codepage_, text.data(), text_end, LX_SHIFT_SINGLE};
+  Walker begin{codepage_, text.data(), text_end, LX_SHIFT_SINGLE, text.data()};
   Walker end = begin;
   skip_fields(&begin, field.first_field);
   if (field.skips_first_blanks) skip_blanks(&begin);
   skip_chars(&begin, field.first_char);
   if (field.last_field == 0) {
-    end.at = text_end;
+    end.past = text_end;
   } else {
     skip_fields(&end, field.last_field - 1);
     if (field.last_chars == 0) skip_field(&end);
     if (field.last_chars != 0 && field.skips_end_blanks) skip_blanks(&end);
     skip_chars(&end, field.last_chars);
   }
-  if (begin.at >= end.at) return {};
-  const std::string_view part(begin.at, static_cast<size_t>(end.at - begin.at));
+  // Shift bytes between two parts are of neither.
+  if (begin.at_end() || begin.at >= end.past) return {};
+  const std::string_view part(begin.at, static_cast<size_t>(end.past - begin.at));
   if (begin.state == LX_SHIFT_SINGLE) return part;
-  *room = codepage_.shift_byte(LX_SHIFT_DOUBLE);
+  const char shift_out = codepage_.shift_byte(LX_SHIFT_DOUBLE);
+  if (begin.at != text.data() && begin.at[-1] == shift_out) return {begin.at - 1, part.size() + 1};
+  *room = shift_out;
   return *room += part;
 }
 

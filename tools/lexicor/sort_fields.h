@@ -3,6 +3,7 @@
 #pragma once
 
 #include <cstdint>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -31,11 +32,12 @@ SortField parse_sort_field(const std::string& text, const SortFieldDefaults& def
 /// Finds the parts of lines.
 class FieldFinder {
  public:
-  /// `separator`: what stands between two fields, a character in UTF-8 or "\0"; empty: each field begins with the
+  /// `separator`: what stands between two fields, a character in UTF-8 or "\0"; none: each field begins with the
   /// blanks in front of it. Throws a Failure when the codepage lacks it.
-  FieldFinder(const Codepage& codepage, const std::string& separator);
+  FieldFinder(const Codepage& codepage, const std::optional<std::string>& separator);
 
-  /// The part of a text, which is in `text`, or in `room` where it begins in the double-byte state.
+  /// The part of a text without idle shift bytes, from its first character to its last one. It is in `text`, or in
+  /// `room` where it begins between double-byte characters.
   std::string_view find(std::string_view text, const SortField& field, std::string* room) const;
 
  private:

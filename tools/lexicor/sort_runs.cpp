@@ -3,18 +3,21 @@
 #include "sort_runs.h"
 
 #include <fcntl.h>
+#include <sys/resource.h>
 #include <unistd.h>
 
 #include <algorithm>
 #include <cerrno>
 #include <cstdlib>
 #include <cstring>
+#include <utility>
 
 namespace lexicor_cli {
 
 namespace {
 
 constexpr size_t kWriteBytes = 256 * 1024;
+constexpr size_t kLeastBuffer = 4096, kMostBuffer = 1024 * 1024;
 
 struct RunRecord {
   uint32_t bytes, end_bytes;
@@ -24,6 +27,15 @@ std::string temporary_directory(const std::string& named) {
   if (!named.empty()) return named;
   const char* const variable = std::getenv("TMPDIR");
   return variable != nullptr && *variable != '\0' ? variable : "/tmp";
+}
+
+/// How many sources are merged at a time: fewer where the system lets a process open few files.
+size_t most_sources() {
+  constexpr rlim_t kLeast = 2, kMost = 64;
+  constexpr rlim_t kOtherFiles = 16;  // that may be open beside them
+  rlimit files{};
+  if (getrlimit(RLIMIT_NOFILE, &files) != 0) return kMost;
+  return static_cast<size_t>(std::clamp(std::max(files.rlim_cur, kOtherFiles) - kOtherFiles, kLeast, kMost));
 }
 
 }  // namespace
@@ -99,7 +111,7 @@ bool SortedRun::fill(size_t wanted) {
             buffer_.begin());
   filled_ -= at_;
   at_ = 0;
-  if (buffer_.size() < wanted + Arena::kSlack) buffer_.resize(wanted + Arena::kSlack);
+  if (buffer_.size() < wanted + Arena::kSlack) buffer_.resize(std::max(buffer_bytes_, wanted + Arena::kSlack));
   while (filled_ < wanted) {
     const size_t got = file_.read(buffer_.data() + filled_, buffer_.size() - Arena::kSlack - filled_);
     if (got == 0) return false;
@@ -160,6 +172,39 @@ void LineMerge::sift(size_t at) {
     std::swap(heap_[at], heap_[first]);
     at = first;
   }
+}
+
+MergeSources::MergeSources(const LineOrder& order, uint64_t memory, std::string temporary_directory)
+    : order_(order),
+      temporary_directory_(std::move(temporary_directory)),
+      most_(most_sources()),
+      buffer_bytes_(static_cast<size_t>(std::clamp<uint64_t>(memory / 2 / most_, kLeastBuffer, kMostBuffer))) {}
+
+std::unique_ptr<SortedRun> MergeSources::new_run() const {
+  return std::make_unique<SortedRun>(temporary_directory_, buffer_bytes_);
+}
+
+void MergeSources::add(std::unique_ptr<OrderedLines> lines) {
+  if (sources_.size() == most_) merge_last();
+  sources_.push_back({std::move(lines), 0});
+}
+
+LineMerge MergeSources::merge_from(size_t first) const {
+  std::vector<OrderedLines*> lines;
+  for (size_t i = first; i < sources_.size(); ++i) lines.push_back(sources_[i].lines.get());
+  return {order_, lines};
+}
+
+/// Merges the last sources, two at least, that come from as many mergings: what has been merged often is long.
+void MergeSources::merge_last() {
+  size_t first = sources_.size() - 2;
+  const int mergings = sources_[first].mergings;
+  while (first > 0 && sources_[first - 1].mergings == mergings) --first;
+  std::unique_ptr<SortedRun> run = new_run();
+  merge_from(first).each([&](const Line& line, const KeyEntry&) { run->add(line); });
+  run->flush();
+  sources_.resize(first);
+  sources_.push_back({std::move(run), mergings + 1});
 }
 
 }  // namespace lexicor_cli

@@ -51,19 +51,20 @@ class OrderedLines {
 /// A run of lines in a temporary file.
 class SortedRun : public OrderedLines {
  public:
-  explicit SortedRun(const std::string& directory) : file_(directory) {}
+  /// Reading takes so much memory at least.
+  SortedRun(const std::string& directory, size_t buffer_bytes)
+      : file_(directory), buffer_bytes_(buffer_bytes) {}
 
   void add(const Line& line);
-  /// Writes what has been added, and frees its memory.
+  /// Writes what has been added, and frees its memory. Reading begins.
   void flush();
-  /// Begins the reading, which takes so much memory at least.
-  void rewind(size_t buffer_bytes) { buffer_.resize(buffer_bytes); }
   const Line* next() override;
 
  private:
   bool fill(size_t wanted);
 
   TemporaryFile file_;
+  const size_t buffer_bytes_;
   std::vector<char> buffer_;
   size_t at_ = 0, filled_ = 0;
   Line line_{};
@@ -72,9 +73,10 @@ class SortedRun : public OrderedLines {
 /// The lines of an input that is in order.
 class InputLines : public OrderedLines {
  public:
-  InputLines(const Codepage& codepage, const std::string& name, bool one_of_several, bool null_ended,
+  InputLines(const LineOrder& order, const std::string& name, bool one_of_several, bool null_ended,
              size_t buffer_bytes)
-      : input_({name}, one_of_several), reader_(codepage, input_, null_ended, buffer_bytes) {}
+      : input_({name}, one_of_several),
+        reader_(order.codepage(), input_, null_ended, buffer_bytes, order.line_test()) {}
 
   const Line* next() override;
 
@@ -123,6 +125,36 @@ class LineMerge {
   const LineOrder& order_;
   std::vector<std::unique_ptr<Head>> heads_;
   std::vector<Head*> heap_;  // the first one of all on top
+};
+
+/// Sources of lines, one behind the other in the input, and so few that all may be open: more are merged into runs.
+class MergeSources {
+ public:
+  /// `memory`: of merging, in bytes.
+  MergeSources(const LineOrder& order, uint64_t memory, std::string temporary_directory);
+
+  bool empty() const { return sources_.empty(); }
+  /// A run that is still to be written and added.
+  std::unique_ptr<SortedRun> new_run() const;
+  /// Adds a source behind the others. An input is opened when it is merged.
+  void add(std::unique_ptr<OrderedLines> lines);
+  /// All lines. The sources stay here.
+  LineMerge merge() const { return merge_from(0); }
+
+ private:
+  struct Source {
+    std::unique_ptr<OrderedLines> lines;
+    int mergings;  // from which its lines come
+  };
+
+  LineMerge merge_from(size_t first) const;
+  void merge_last();
+
+  const LineOrder& order_;
+  const std::string temporary_directory_;
+  const size_t most_;
+  const size_t buffer_bytes_;
+  std::vector<Source> sources_;  // the more mergings, the earlier
 };
 
 }  // namespace lexicor_cli

@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <cstring>
 #include <limits>
+#include <utility>
 
 #include "place.h"
 
@@ -23,11 +24,13 @@ char byte_of(const Codepage& codepage, LXUChar unicode) {
 
 }  // namespace
 
-LineReader::LineReader(const Codepage& codepage, Input& input, bool null_ended, size_t block_bytes)
+LineReader::LineReader(const Codepage& codepage, Input& input, bool null_ended, size_t block_bytes,
+                       std::function<bool(std::string_view)> fits)
     : codepage_(codepage),
       input_(input),
       most_block_bytes_(block_bytes),
       block_bytes_(std::min(kFirstBlock, block_bytes)),
+      fits_(std::move(fits)),
       end_(byte_of(codepage, null_ended ? 0 : '\n')),
       carriage_return_(byte_of(codepage, '\r')),
       null_ended_(null_ended) {}
@@ -83,11 +86,9 @@ const char* LineReader::find_end(const char* at, const char* end) const {
 
 void LineReader::add_line(const char* begin, const char* end, uint64_t offset, Rows<Line>* lines) {
   const auto bytes = static_cast<size_t>(end - begin);
-  if (bytes > kMostLine)
-    throw Failure(kDataError, "a line of " + std::to_string(bytes) +
-                                  " bytes is too long: the line that begins at " + input_.locate(offset));
   two_ = !null_ended_ && bytes > 1 && end[-2] == carriage_return_;
   const uint32_t end_bytes = two_ ? 2 : 1;
+  check_length({begin, bytes - end_bytes}, offset);
   if (!codepage_.single_byte()) check_whole({begin, bytes - end_bytes}, offset, true);
   lines->push_back({begin, static_cast<uint32_t>(bytes), end_bytes});
   ++file_lines_;
@@ -95,7 +96,7 @@ void LineReader::add_line(const char* begin, const char* end, uint64_t offset, R
 
 /// Adds a last line without an end: it gets that of the line before it. Its text is made at `text`.
 void LineReader::add_last(char* text, Rows<Line>* lines) {
-  if (begun_.size() > kMostLine) throw Failure(kDataError, "the last line is too long");
+  check_length(begun_, offset_ - begun_.size());
   const LXShiftState state = check_whole(begun_, offset_ - begun_.size(), false);
   std::memcpy(text, begun_.data(), begun_.size());
   char* end = text + begun_.size();
@@ -104,6 +105,15 @@ void LineReader::add_last(char* text, Rows<Line>* lines) {
   *end++ = end_;
   lines->push_back({text, static_cast<uint32_t>(end - text),
                     static_cast<uint32_t>(end - text) - static_cast<uint32_t>(begun_.size())});
+}
+
+void LineReader::check_length(std::string_view text, uint64_t offset) const {
+  if (text.size() <= kMostLine && fits_(text)) return;
+  InputPlace where = input_.place(offset);
+  where.line = file_lines_ + 1;
+  where.column = 1;
+  throw Failure(kDataError, "a line of " + std::to_string(text.size()) +
+                                " bytes is too long to be ordered: it begins at " + where.text());
 }
 
 LXShiftState LineReader::check_whole(std::string_view text, uint64_t offset, bool ended) const {
@@ -147,6 +157,22 @@ bool LineReader::ends_whole(std::string_view text) const {
     if (codepage_.char_bytes(at, LX_SHIFT_SINGLE) > static_cast<int32_t>(back)) return false;
   }
   return true;
+}
+
+size_t bytes_before_idle_shift(const Codepage& codepage, std::string_view text) {
+  if (!codepage.shift_sensitive()) return text.size();
+  LXShiftState state = LX_SHIFT_SINGLE;
+  for (size_t at = 0; at < text.size();) {
+    if (!codepage.is_shift(text[at])) {
+      at += std::min<size_t>(static_cast<size_t>(codepage.char_bytes(&text[at], state)), text.size() - at);
+      continue;
+    }
+    const LXShiftState next = codepage.state_after(text[at]);
+    if (next == state || at + 1 == text.size() || codepage.is_shift(text[at + 1])) return at;
+    state = next;
+    ++at;
+  }
+  return text.size();
 }
 
 std::string without_idle_shifts(const Codepage& codepage, std::string_view text) {

@@ -4,6 +4,7 @@
 #include <lx.h>
 
 #include <cstdint>
+#include <functional>
 #include <string>
 #include <string_view>
 
@@ -25,10 +26,12 @@ struct Line {
 };
 
 /// Reads lines that end with a line feed, or with a carriage return and one, or with a null character. Every file ends
-/// its last line. Throws a Failure for a line that ends inside a character.
+/// its last line. Throws a Failure for a line that ends inside a character, or is too long.
 class LineReader {
  public:
-  LineReader(const Codepage& codepage, Input& input, bool null_ended, size_t block_bytes);
+  /// `fits` is asked of each line without its end.
+  LineReader(const Codepage& codepage, Input& input, bool null_ended, size_t block_bytes,
+             std::function<bool(std::string_view)> fits);
 
   /// Adds the lines of the next block, whose text is kept in `texts`. False: the input has ended, with the lines that
   /// were added.
@@ -40,6 +43,7 @@ class LineReader {
   const char* find_end(const char* at, const char* end) const;
   void add_line(const char* begin, const char* end, uint64_t offset, Rows<Line>* lines);
   void add_last(char* text, Rows<Line>* lines);
+  void check_length(std::string_view text, uint64_t offset) const;
   LXShiftState check_whole(std::string_view text, uint64_t offset, bool ended) const;
   bool ends_whole(std::string_view text) const;
   size_t whole_bytes(std::string_view text, LXShiftState* state) const;
@@ -48,6 +52,7 @@ class LineReader {
   Input& input_;
   const size_t most_block_bytes_;
   size_t block_bytes_;
+  const std::function<bool(std::string_view)> fits_;
   const char end_;
   const char carriage_return_;
   const bool null_ended_;
@@ -57,6 +62,9 @@ class LineReader {
   uint64_t offset_ = 0;      // of what is read next
 };
 
+/// How much of a text is in front of the first shift byte that changes nothing, as one that no character follows does
+/// not: all of it where there is none. In bytes.
+size_t bytes_before_idle_shift(const Codepage& codepage, std::string_view text);
 /// A text without the shift bytes that change nothing: the library takes the second of two for a character.
 std::string without_idle_shifts(const Codepage& codepage, std::string_view text);
 
