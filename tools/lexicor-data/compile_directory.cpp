@@ -85,6 +85,17 @@ void add_rules(const std::string& source, const Control& control,
   }
 }
 
+/// Rules in the directory of sorts that have none in the source any more.
+void remove_stale_rules(const std::string& source, const std::string& out, const Control& control,
+                        std::ostream& log) {
+  for (const ObjectName& name : control.objects) {
+    const std::string file = std::string(kSortDirectory) + '/' + name.name + kRulesExtension;
+    if (name.type != ObjectType::kSort || fs::exists(source + '/' + file)) continue;
+    if (fs::remove(out + '/' + file))
+      log << out << '/' << file << ": removed, the sort has no rules any more\n";
+  }
+}
+
 void describe(std::ostream& out, const LeftOut& left_out) {
   out << "  <U" << lexicor_cli::hex_text(left_out.mapping.unicode, 4) << "> "
       << lexicor_cli::hex_text(left_out.mapping.code, 2 * left_out.mapping.bytes) << " |"
@@ -134,6 +145,7 @@ class DirectoryCompiler {
     say_notes();
     write();
     remove_unlisted(out_, control_, log_);
+    remove_stale_rules(source_, out_, control_, log_);
   }
 
  private:

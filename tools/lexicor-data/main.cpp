@@ -194,7 +194,7 @@ int main(int argc, char** argv) {
       .add_option("FROM", from,
                   "a sort: so_NNNNN.nls, NAME.txt, or NAME.rules where either lies beside root.txt")
       .required();
-  explain_command.add_option("TO", to, "the sort that the rules make of it").required();
+  explain_command.add_option("TO", to, "the sort that it is compared with").required();
 
   int status = kDone;
   try {

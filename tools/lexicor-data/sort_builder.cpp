@@ -3,6 +3,7 @@
 #include "sort_builder.h"
 
 #include <algorithm>
+#include <functional>
 #include <map>
 
 #include "sort_check.h"
@@ -12,11 +13,13 @@ namespace lexicor_data {
 namespace {
 
 using Text = std::u16string;
-using Weights = std::vector<uint32_t>;  ///< ordered as a dictionary orders words
+using Weights = std::vector<uint64_t>;  ///< ordered as a dictionary orders words
 
 constexpr unsigned kFirstPrimary = 0x0200;
 constexpr uint8_t kLowestWeight = 1;
 constexpr unsigned kFirstJamo = 0x1100, kLastJamo = 0x11FF;
+constexpr uint64_t kNoAccent =
+    1ULL << 32;  ///< with a weight that stands behind those of a letter and its accents
 
 /// A weight of the primary level before it has its number: one of the tailoring, a computed character, or two
 /// weights that became one.
@@ -42,23 +45,51 @@ struct Draft {
 };
 
 /// Values in order, each once.
-template <class Value>
+template <class Value, class Less = std::less<Value>>
 class Ranks {
  public:
+  explicit Ranks(Less less = {}) : less_(less) {}
+
   void add(Value value) { values_.push_back(std::move(value)); }
   /// Orders what was added.
   void settle() {
-    std::sort(values_.begin(), values_.end());
-    const auto same = [](const Value& a, const Value& b) { return !(a < b); };  // of two in order
+    std::sort(values_.begin(), values_.end(), less_);
+    const auto same = [&](const Value& a, const Value& b) { return !less_(a, b); };  // of two in order
     values_.erase(std::unique(values_.begin(), values_.end(), same), values_.end());
   }
   const std::vector<Value>& values() const { return values_; }
   size_t of(const Value& value) const {
-    return static_cast<size_t>(std::lower_bound(values_.begin(), values_.end(), value) - values_.begin());
+    const auto place = std::lower_bound(values_.begin(), values_.end(), value, less_);
+    return static_cast<size_t>(place - values_.begin());
   }
 
  private:
+  Less less_;
   std::vector<Value> values_;
+};
+
+using LevelWeights = std::pair<Primary, Weights>;
+
+/// The order of weights of a level, by primary weight. Behind the last accent stand common weights, as many as there
+/// may be accents: what is lower comes ahead of them.
+struct LevelOrder {
+  uint32_t common;
+
+  bool operator()(const LevelWeights& a, const LevelWeights& b) const {
+    if (a.first < b.first || b.first < a.first) return a.first < b.first;
+    const Weights &left = a.second, &right = b.second;
+    for (size_t i = 0; i < std::max(left.size(), right.size()); ++i) {
+      const uint32_t x = weight(left, right, i), y = weight(right, left, i);
+      if (x != y) return x < y;
+    }
+    return false;
+  }
+
+ private:
+  uint32_t weight(const Weights& of, const Weights& other, size_t i) const {
+    if (i < of.size()) return static_cast<uint32_t>(of[i]);
+    return (other[i] & kNoAccent) != 0 ? 0 : common;
+  }
 };
 
 /// Numbers of the secondary or tertiary level, by primary weight: such weights are compared only where the
@@ -66,6 +97,8 @@ class Ranks {
 /// a computed character has no weight there, which comes before the default one.
 class LevelNumbers {
  public:
+  explicit LevelNumbers(uint32_t common) : ranks_(LevelOrder{common}) {}
+
   void add(const Primary& primary, const Weights& weights) { ranks_.add({primary, weights}); }
   /// Returns how many there are. `marks_last`: the weights of marks by themselves come behind all others, as
   /// they do on the secondary level where one text has an accent and the other its next letter.
@@ -91,7 +124,7 @@ class LevelNumbers {
   }
 
  private:
-  Ranks<std::pair<Primary, Weights>> ranks_;
+  Ranks<LevelWeights, LevelOrder> ranks_;
   std::vector<unsigned> numbers_;
 };
 
@@ -220,7 +253,7 @@ class Builder {
     if (rest.empty()) return;
     Weights& tertiary = draft.elements.back().tertiary;
     if (tertiary.empty()) tertiary.push_back(common_tertiary());
-    tertiary.insert(tertiary.end(), rest.begin(), rest.end());
+    for (const uint64_t weight : rest) tertiary.push_back(weight | kNoAccent);
   }
 
   void draft_characters() {
@@ -457,7 +490,7 @@ class Builder {
   std::vector<unsigned> numbers_;  ///< of `primaries_`
   unsigned next_primary_ = kFirstPrimary;
   std::array<SortPage, 256> pages_{};
-  LevelNumbers secondaries_, tertiaries_;
+  LevelNumbers secondaries_{0}, tertiaries_{common_tertiary()};
   Ranks<Weights> specials_;
   std::map<std::string, std::vector<Text>> left_out_;  ///< by reason
 };

@@ -1,4 +1,5 @@
-// Where two sorts differ, said in rules: relations that make the first one order as the second.
+// Where two sorts differ, said in rules for a reader: what moved, and what it follows in the second sort. They do not
+// always make the second sort when they are compiled.
 #pragma once
 
 #include <iosfwd>

@@ -387,6 +387,9 @@ void SortTailoring::insert(const SortRule& rule) {
     return ahead ? order_.insert_before(context, weight, below) : order_.insert_after(context, weight);
   };
   const bool ignored = strength_of(last) > Strength::kSecondary;
+  if (ahead && rule.strength != Strength::kPrimary && order_.anchor(last.primary) >= kFirstIdeograph)
+    fail(rule.place,
+         "nothing stands ahead of an ideograph by an accent or by case, since its weight is computed");
   if (rule.strength == Strength::kPrimary) {
     if (last.primary == 0) fail(rule.place, "a letter cannot stand next to what is ignored on the first level");
     if (order_.anchor(last.primary) >= kFirstIdeograph)

@@ -169,8 +169,8 @@ void UcmHeader::take_from(const CodepageSource& base) {
   take("subchar", &CodepageSource::substitution);
   take("lexicor:line_ends", &CodepageSource::line_ends);
   take("lexicor:ascii", &CodepageSource::ascii);
-  if (source_.kind == CodepageClass::kMultiByte && states_.empty())
-    take("lexicor:leads", &CodepageSource::leads);
+  leads_of_base_ = source_.kind == CodepageClass::kMultiByte && states_.empty() && !has("lexicor:leads");
+  if (leads_of_base_) take("lexicor:leads", &CodepageSource::leads);
 }
 
 void UcmHeader::settle(SourceErrors& errors) {
@@ -201,16 +201,18 @@ void UcmHeader::settle_class() {
     source_.kind = CodepageClass::kSingleByte;
 }
 
-/// Leads follow from the state table, else from the first mapping of each.
+/// Leads follow from the state table, else from the first mapping of each. Those of a base hold, and bytes that begin
+/// nothing there follow from the mappings.
 void UcmHeader::settle_leads() {
-  if (source_.kind != CodepageClass::kMultiByte || has("lexicor:leads")) return;
+  if (source_.kind != CodepageClass::kMultiByte || (has("lexicor:leads") && !leads_of_base_)) return;
   std::array<uint8_t, 256> seen{};
   for (const Mapping& m : source_.mappings) {
     uint8_t& length = seen[m.code >> 8 * (m.bytes - 1)];
     if (length == 0) length = m.bytes;
   }
   for (unsigned byte = 0; byte < 256; ++byte) {
-    const uint8_t said = states_.empty() ? 0 : states_.length(static_cast<uint8_t>(byte));
+    uint8_t said = states_.empty() ? 0 : states_.length(static_cast<uint8_t>(byte));
+    if (leads_of_base_ && source_.leads[byte] > 1) said = source_.leads[byte];
     source_.leads[byte] = said != 0 ? said : std::max<uint8_t>(seen[byte], 1);
   }
   source_.width = *std::max_element(source_.leads.begin(), source_.leads.end());

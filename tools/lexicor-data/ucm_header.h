@@ -53,6 +53,7 @@ class UcmHeader {
   UcmStates states_;
   std::string family_;  ///< <icu:charsetFamily>
   size_t substitution_bytes_ = 1;
+  bool leads_of_base_ = false;
   int substitution_of_one_byte_ = -1;  ///< <subchar1>
 };
 

@@ -43,6 +43,7 @@ CatalogBuilder::CatalogBuilder(Catalog existing, Problems& problems)
 void CatalogBuilder::begin_source() {
   current_ = kDefaultSet;
   for (auto& [number, set] : sets_) {
+    set.named = false;
     for (auto& [message, entry] : set.messages) entry.place = {};
   }
 }
@@ -53,9 +54,12 @@ void CatalogBuilder::select_set(uint32_t number) {
 }
 
 void CatalogBuilder::select_named_set(const std::string& name, const Place& place) {
-  for (const auto& [number, set] : sets_) {
+  for (auto& [number, set] : sets_) {
     if (set.name != name) continue;
-    problems_.error(place, "set " + name + " is defined already, at " + place_text(set.name_place));
+    if (set.named)
+      problems_.error(place, "set " + name + " is defined already, at " + place_text(set.name_place));
+    set.named = true;
+    set.name_place = place;
     current_ = number;
     return;
   }
@@ -66,6 +70,7 @@ void CatalogBuilder::select_named_set(const std::string& name, const Place& plac
   select_set(last_set_ + 1);
   current().name = name;
   current().name_place = place;
+  current().named = true;
 }
 
 void CatalogBuilder::delete_set(uint32_t number) {
@@ -109,8 +114,11 @@ void CatalogBuilder::put_named(const std::string& name, std::string text, const 
   Set& set = current();
   const auto found = set.numbers.find(name);
   if (found != set.numbers.end()) {
-    problems_.error(place, "message " + name + " is defined already, at " +
-                               place_text(set.messages[found->second].name_place));
+    Message& message = set.messages[found->second];
+    if (message.place.line != 0)
+      problems_.error(place, "message " + name + " is defined already, at " + place_text(message.name_place));
+    else
+      message = {std::move(text), place, name, place};
     return;
   }
   if (set.last == UINT32_MAX)

@@ -76,6 +76,7 @@ class CatalogBuilder {
     uint32_t last = 0;                        // the highest number that sources use
     std::string name;
     Place name_place;
+    bool named = false;  // by the current source
   };
 
   Set& current() { return sets_[current_]; }
@@ -85,7 +86,7 @@ class CatalogBuilder {
   Catalog catalog_;  // locale and byte order
   std::map<uint32_t, Set> sets_;
   uint32_t current_ = kDefaultSet;
-  uint32_t last_set_ = 0;
+  uint32_t last_set_ = 0;  // the highest number that a $set gave
 };
 
 }  // namespace lexicor_gencat

@@ -4,6 +4,7 @@
 #include <sys/stat.h>
 
 #include <cstdio>
+#include <filesystem>
 #include <map>
 #include <memory>
 #include <optional>
@@ -157,8 +158,8 @@ ByteOrder choose_byte_order(const Options& options, const Catalog* existing,
   if (name.empty() && existing != nullptr) return existing->byte_order;
   const Source* const declaring = first_declaring(sources, &Declarations::byte_order);
   if (name.empty() && declaring != nullptr) name = declaring->declared.byte_order;
-  if (name == "big") return ByteOrder::kBig;
-  if (name == "little") return ByteOrder::kLittle;
+  if (lexicor_cli::same_name(name, "big")) return ByteOrder::kBig;
+  if (lexicor_cli::same_name(name, "little")) return ByteOrder::kLittle;
   return native_byte_order();
 }
 
@@ -183,13 +184,38 @@ const Encoding& encoding_of(const Source& source, const Options& options, const 
 
 std::string header_text(const std::vector<Symbol>& symbols) {
   std::string text;
+  std::map<std::string, Place> defined;
   char number[16];
   for (const Symbol& symbol : symbols) {
+    const auto [entry, is_new] = defined.emplace(symbol.name, symbol.place);
+    if (!is_new)
+      throw Failure(kDataError, place_text(symbol.place) + ": the header defines " + symbol.name +
+                                    " already, for " + place_text(entry->second) + "; expected other names");
     std::snprintf(number, sizeof number, "%#x", static_cast<unsigned>(symbol.number));
     text += "#define " + symbol.name + " " + number + "\t/* " + symbol.place.file + ":" +
             std::to_string(symbol.place.line) + " */\n";
   }
   return text;
+}
+
+bool same_file(const std::string& a, const std::string& b) {
+  struct stat first, second;
+  if (stat(a.c_str(), &first) != 0 || stat(b.c_str(), &second) != 0)
+    return std::filesystem::absolute(a).lexically_normal() == std::filesystem::absolute(b).lexically_normal();
+  return S_ISREG(first.st_mode) && first.st_dev == second.st_dev && first.st_ino == second.st_ino;
+}
+
+/// The header replaces neither the catalog nor a source, nor does the catalog a source.
+void check_outputs(const Options& options) {
+  const auto refuse = [](const std::string& output, const char* what, const std::string& other) {
+    if (output.empty() || output == kStandardStream || !same_file(output, other)) return;
+    throw Failure(kUsageError, output + ": is " + what + ", expected another file for the output");
+  };
+  refuse(options.header, "the catalog", options.catalog);
+  for (const std::string& source : options.sources) {
+    refuse(options.header, "a source", source);
+    refuse(options.catalog, "a source", source);
+  }
 }
 
 /// Both files appear, or neither does when one cannot be written.
@@ -208,6 +234,7 @@ void write_files(const Options& options, const std::string& catalog, const std::
 }  // namespace
 
 bool compile(const lexicor_cli::Session& session, const Options& options, std::ostream& log) {
+  check_outputs(options);
   Encodings encodings(session);
   std::optional<Catalog> existing;
   if (!options.fresh && options.catalog != kStandardStream && is_regular_file_with_content(options.catalog))
@@ -232,7 +259,7 @@ bool compile(const lexicor_cli::Session& session, const Options& options, std::o
   }
   for (const std::string& line : problems.lines()) log << line << '\n';
   if (problems.errors() > 0) return false;
-  const std::string header = header_text(builder.symbols());
+  const std::string header = options.header.empty() ? "" : header_text(builder.symbols());
   write_files(options, pack_catalog(builder.take()), header);
   return true;
 }

@@ -33,20 +33,23 @@ struct Number {
   uint32_t set, message;
 };
 
-/// "SET:NUMBER" or "SET.NUMBER".
+constexpr uint32_t kLastNumber = UINT32_MAX - kPluralForms;
+
+/// "SET:NUMBER" or "SET.NUMBER"; numbers that no message can have are 0.
 std::optional<Number> parse_context(const std::string& context) {
   uint64_t values[2] = {0, 0};
-  size_t part = 0;
+  size_t part = 0, digits[2] = {};
   for (const char c : context) {
     if ((c == ':' || c == '.') && part == 0)
       part = 1;
-    else if (c >= '0' && c <= '9')
+    else if (c >= '0' && c <= '9') {
       values[part] = std::min<uint64_t>(values[part] * 10 + static_cast<uint64_t>(c - '0'), 1ULL << 33);
-    else
+      ++digits[part];
+    } else
       return std::nullopt;
   }
-  if (part == 0 || values[0] == 0 || values[1] == 0) return std::nullopt;
-  if (values[0] > UINT32_MAX || values[1] > UINT32_MAX - kPluralForms) return std::nullopt;
+  if (digits[0] == 0 || digits[1] == 0) return std::nullopt;
+  if (values[0] > UINT32_MAX || values[1] > kLastNumber) return Number{0, 0};
   return Number{static_cast<uint32_t>(values[0]), static_cast<uint32_t>(values[1])};
 }
 
@@ -220,6 +223,13 @@ class PoReader : SourceParser {
     if (header) return;
     std::optional<Number> number;
     if (entry.has_context) number = parse_context(entry.context);
+    if (number.has_value() && (number->set == 0 || number->message == 0)) {
+      problems_.error(entry.place, "msgctxt \"" + entry.context +
+                                       "\" is out of range; expected a set from 1 to " +
+                                       std::to_string(UINT32_MAX) + " and a number from 1 to " +
+                                       std::to_string(kLastNumber));
+      return;
+    }
     if (!number.has_value()) {
       number = Number{1, next_number_};
       next_number_ += entry.plural ? kPluralForms : 1;
@@ -238,16 +248,42 @@ class PoReader : SourceParser {
   uint32_t next_number_ = 1;
 };
 
+/// The text of the entry with an empty msgid and no msgctxt, in ASCII, as it stands between the quotes.
+std::string header_entry(const std::string& source) {
+  std::string keyword, id, text;
+  bool context = false;
+  for (size_t at = 0, end = 0; at < source.size(); at = end + 1) {
+    end = std::min(source.find('\n', at), source.size());
+    const size_t begin = source.find_first_not_of(" \t", at);
+    const size_t quote = source.find('"', at), last = source.rfind('"', end);
+    if (begin >= end || source[begin] == '#' || quote >= end || last <= quote) continue;
+    if (begin < quote) {
+      const std::string word = source.substr(begin, source.find_first_of(" \t\"[", begin) - begin);
+      if (keyword == "msgstr" && id.empty() && !context) return text;
+      if (keyword == "msgstr") context = false;
+      if (word == "msgctxt") context = true;
+      if (word == "msgid") id.clear();
+      if (word == "msgstr") text.clear();
+      keyword = word;
+    }
+    const std::string piece = source.substr(quote + 1, last - quote - 1);
+    if (keyword == "msgid") id += piece;
+    if (keyword == "msgstr") text += piece;
+  }
+  return keyword == "msgstr" && id.empty() && !context ? text : "";
+}
+
 }  // namespace
 
 std::string po_charset(const std::string& source) {
-  const size_t header = source.find("Content-Type:");
-  if (header == std::string::npos) return {};
+  const std::string text = header_entry(source);
+  const size_t type = text.find("Content-Type:");
+  if (type == std::string::npos) return {};
   constexpr char kKey[] = "charset=";
-  const size_t at = source.find(kKey, header);
-  if (at == std::string::npos || at > source.find('\n', header)) return {};
+  const size_t at = text.find(kKey, type);
+  if (at == std::string::npos || at > text.find("\\n", type)) return {};
   const size_t begin = at + sizeof kKey - 1;
-  const std::string name = source.substr(begin, source.find_first_of("\\\"; \t\r\n", begin) - begin);
+  const std::string name = text.substr(begin, text.find_first_of("\\; \t", begin) - begin);
   // What a template has in place of a name.
   return name == "CHARSET" ? "" : name;
 }

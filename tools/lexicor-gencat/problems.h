@@ -22,24 +22,28 @@ class Problems {
   /// Without warnings only errors are kept.
   explicit Problems(bool warnings = true) : warnings_(warnings) {}
 
-  /// More of a file than this are counted, not listed.
+  /// More errors of a file than this are counted, not listed, and no more warnings than they leave room for.
   static constexpr size_t kListed = 20;
 
   void error(const Place& place, const std::string& text);
   void warning(const Place& place, const std::string& text);
 
   size_t errors() const { return errors_; }
-  /// The listed messages, a line each, in the order in which they were found.
+  /// The listed messages, a line each, in the order in which they were found; warnings make room for errors.
   std::vector<std::string> lines() const;
 
  private:
+  struct Message {
+    bool error;
+    std::string line;
+  };
   struct File {
     std::string name;
-    std::vector<std::string> listed;
+    std::vector<Message> listed;
     size_t unlisted = 0;
   };
 
-  void add(const Place& place, const std::string& text);
+  void add(const Place& place, bool error, const std::string& text);
 
   bool warnings_;
   std::vector<File> files_;
