@@ -71,24 +71,24 @@ class Ranks {
 using LevelWeights = std::pair<Primary, Weights>;
 
 /// The order of weights of a level, by primary weight. Behind the last accent stand common weights, as many as there
-/// may be accents: what is lower comes ahead of them.
+/// may be accents: what is lower comes ahead of them, and what is no accent behind them.
 struct LevelOrder {
   uint32_t common;
 
   bool operator()(const LevelWeights& a, const LevelWeights& b) const {
     if (a.first < b.first || b.first < a.first) return a.first < b.first;
-    const Weights &left = a.second, &right = b.second;
-    for (size_t i = 0; i < std::max(left.size(), right.size()); ++i) {
-      const uint32_t x = weight(left, right, i), y = weight(right, left, i);
+    for (size_t i = 0; i < std::max(a.second.size(), b.second.size()); ++i) {
+      const uint64_t x = rank(a.second, i), y = rank(b.second, i);
       if (x != y) return x < y;
     }
     return false;
   }
 
  private:
-  uint32_t weight(const Weights& of, const Weights& other, size_t i) const {
-    if (i < of.size()) return static_cast<uint32_t>(of[i]);
-    return (other[i] & kNoAccent) != 0 ? 0 : common;
+  uint64_t rank(const Weights& weights, size_t i) const {
+    const auto weight = i < weights.size() ? static_cast<uint32_t>(weights[i]) : common;
+    const bool accent = i >= weights.size() || (weights[i] & kNoAccent) == 0;
+    return accent ? uint64_t{weight} << 32 : uint64_t{std::max(weight, common)} << 32 | weight;
   }
 };
 
