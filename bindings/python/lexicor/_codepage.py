@@ -433,8 +433,8 @@ class _File(io.TextIOWrapper):
 def open_text(file: Any, mode: str = "r", encoding: str = "utf-8", errors: Optional[str] = None,
               newline: Optional[str] = None) -> IO[str]:
     """As the built-in open() for text. What is written ends in the single-byte state of a shift-sensitive codepage,
-    also without a line end, and before seek(): the built-in open() leaves files in the state of the last write(). Text with
-    shift states is not updated in place ("+"), and appended text has states of its own."""
+    also without a line end, and before seek(): the built-in open() leaves files in the state of the last write().
+    Text with shift states is not updated in place ("+"), and appended text has states of its own."""
     if "b" in mode:
         raise ValueError("binary mode has no encoding")
     page = getattr(codecs.lookup(encoding).incrementalencoder, "page", None)
