@@ -6,6 +6,8 @@
 #include <dlfcn.h>
 #include <sqlite3ext.h>
 
+#include <algorithm>
+#include <cctype>
 #include <cstring>
 #include <filesystem>
 #include <map>
@@ -98,18 +100,22 @@ std::string_view bytes_of(sqlite3_value* value) {
   return data == nullptr ? std::string_view() : std::string_view(static_cast<const char*>(data), bytes);
 }
 std::string text_of(sqlite3_value* value, const char* what) {
-  if (sqlite3_value_type(value) != SQLITE_TEXT) throw Refusal(std::string(what) + " must be a text");
-  return std::string(bytes_of(value));
+  const std::string_view text = bytes_of(value);
+  if (sqlite3_value_type(value) != SQLITE_TEXT || text.find('\0') != std::string_view::npos)
+    throw Refusal(std::string(what) + " must be a text, without nulls");
+  return std::string(text);
 }
 
-/// The locale of an argument; while a statement runs, one for each argument that stays the same.
-const Locale& locale_of(sqlite3_context* context, sqlite3_value** arguments, int at, bool codepage = false) {
-  if (auto* const kept = static_cast<Handle*>(sqlite3_get_auxdata(context, at))) return kept->locale;
+/// The locale of an argument. While a statement runs the database keeps one for each argument that stays the same; a
+/// planner that calls a function keeps none.
+std::shared_ptr<const Locale> locale_of(sqlite3_context* context, sqlite3_value** arguments, int at,
+                                        bool codepage = false) {
+  using Kept = std::shared_ptr<const Locale>;
+  if (const auto* const kept = static_cast<const Kept*>(sqlite3_get_auxdata(context, at))) return *kept;
   const std::string name = text_of(arguments[at], codepage ? "a codepage" : "a locale");
-  auto handle = std::make_unique<Handle>(codepage ? "English." + name : in_utf8(name), name);
-  const Locale& locale = handle->locale;
-  sqlite3_set_auxdata(context, at, handle.release(), [](void* kept) { delete static_cast<Handle*>(kept); });
-  if (sqlite3_get_auxdata(context, at) == nullptr) throw std::bad_alloc();
+  const auto handle = std::make_shared<Handle>(codepage ? "English." + name : in_utf8(name), name);
+  const Kept locale(handle, &handle->locale);
+  sqlite3_set_auxdata(context, at, new Kept(locale), [](void* kept) { delete static_cast<Kept*>(kept); });
   return locale;
 }
 
@@ -124,11 +130,13 @@ void give_blob(sqlite3_context* context, std::string_view bytes) {
 
 using Function = void (*)(sqlite3_context*, int, sqlite3_value**);
 
-/// A function of the database: null gives null, and what is thrown is what the database reports.
+/// A function of the database: a null among the arguments gives null, and what is thrown is what the database reports.
 template <Function Body>
 void guarded(sqlite3_context* context, int count, sqlite3_value** arguments) {
   try {
-    if (count > 0 && sqlite3_value_type(arguments[0]) == SQLITE_NULL) return;
+    for (int at = 0; at < count; ++at) {
+      if (sqlite3_value_type(arguments[at]) == SQLITE_NULL) return;
+    }
     Body(context, count, arguments);
   } catch (const std::bad_alloc&) {
     sqlite3_result_error_nomem(context);
@@ -157,6 +165,20 @@ struct Collation {
   Collation(const std::string& locale, uint32_t ignored) : handle(in_utf8(locale), locale), options(ignored) {}
 };
 
+/// The key of a text. In binary order, where the library's key of an empty text is three nulls, that text comes first too.
+std::string key_of(const Locale& locale, std::string_view text, uint32_t options) {
+  const bool none = text.empty() && locale.number(LX_ITEM_SORT_ID) == 0;
+  return none ? std::string() : locale.key(text, options);
+}
+
+/// Without regard to width the library's comparison of bytes is no order, since its result depends on which text is the
+/// first: with options keys are compared, which it makes anyway.
+int compare_keys_or_texts(const Collation& collation, std::string_view a, std::string_view b) {
+  const Locale& locale = collation.handle.locale;
+  if (collation.options == 0) return locale.compare(a, b);
+  return key_of(locale, a, collation.options).compare(key_of(locale, b, collation.options));
+}
+
 /// Characters beyond U+FFFF are one character to the library: where all else is equal their code points decide.
 int compare_long_characters(std::string_view a, std::string_view b) {
   const auto next = [](std::string_view text, size_t at) {
@@ -171,18 +193,24 @@ int compare_long_characters(std::string_view a, std::string_view b) {
 }
 
 int compare(void* user, int a_bytes, const void* a, int b_bytes, const void* b) {
-  const auto& collation = *static_cast<const Collation*>(user);
   const std::string_view a_text(static_cast<const char*>(a), static_cast<size_t>(a_bytes));
   const std::string_view b_text(static_cast<const char*>(b), static_cast<size_t>(b_bytes));
-  std::error_code error;
-  const int order = collation.handle.locale.compare(a_text, b_text, collation.options, error);
-  if (order != 0) return order;
-  return error ? a_text.compare(b_text) : compare_long_characters(a_text, b_text);
+  try {
+    const int order = compare_keys_or_texts(*static_cast<const Collation*>(user), a_text, b_text);
+    return order != 0 ? order : compare_long_characters(a_text, b_text);
+  } catch (const std::exception&) {  // there is no memory, and no way to say so
+    return a_text.compare(b_text);
+  }
 }
 
 /// What lexicor_collation made of a name in a connection. The database refuses to change a collation while a statement
-/// runs, and the one that calls is one: what is there already is left as it is.
-using Made = std::map<std::string, std::pair<std::string, uint32_t>>;
+/// runs, and the one that calls is one: what is there already is left as it is. To the database `german` is `GERMAN`.
+struct NameLess {
+  bool operator()(const std::string& a, const std::string& b) const {
+    return sqlite3_stricmp(a.c_str(), b.c_str()) < 0;
+  }
+};
+using Made = std::map<std::string, std::pair<std::string, uint32_t>, NameLess>;
 
 /// lexicor_collation(name, locale [, ignore]): makes an order of the connection, and gives the locale's whole name.
 void collation(sqlite3_context* context, int count, sqlite3_value** arguments) {
@@ -211,16 +239,16 @@ void collation(sqlite3_context* context, int count, sqlite3_value** arguments) {
 
 /// lexicor_key(text, locale [, ignore])
 void key(sqlite3_context* context, int count, sqlite3_value** arguments) {
-  const Locale& locale = locale_of(context, arguments, 1);
-  give_blob(context, locale.key(bytes_of(arguments[0]), options_of(count, arguments, 2)));
+  const auto locale = locale_of(context, arguments, 1);
+  give_blob(context, key_of(*locale, bytes_of(arguments[0]), options_of(count, arguments, 2)));
 }
 
 /// lexicor_digest(locale): of what orders, the sort and the codepage.
 void digest(sqlite3_context* context, int, sqlite3_value** arguments) {
-  const Locale& locale = locale_of(context, arguments, 0);
+  const auto locale = locale_of(context, arguments, 0);
   std::string text;
   for (const int32_t type : {LX_SORT, LX_CODEPAGE}) {
-    for (const uint8_t byte : locale.digest(type)) {
+    for (const uint8_t byte : locale->digest(type)) {
       text += "0123456789abcdef"[byte >> 4];
       text += "0123456789abcdef"[byte & 0xF];
     }
@@ -235,17 +263,29 @@ template <uint32_t Mode>
 void map(sqlite3_context* context, int, sqlite3_value** arguments) {
   const std::string_view text = bytes_of(arguments[0]);
   // What UTF-8 has beyond the library's 16 bits has no case, and stays.
-  const Locale& locale = locale_of(context, arguments, 1);
+  const auto locale = locale_of(context, arguments, 1);
   std::string result;
   for (size_t at = 0; at < text.size();) {
     const bool is_long = static_cast<unsigned char>(text[at]) >= 0xF0;
     size_t end = is_long ? std::min(at + 4, text.size()) : at;
     while (!is_long && end < text.size() && static_cast<unsigned char>(text[end]) < 0xF0) ++end;
     const std::string_view run = text.substr(at, end - at);
-    result += is_long ? std::string(run) : locale.map(run, Mode);
+    result += is_long ? std::string(run) : locale->map(run, Mode);
     at = end;
   }
   give(context, result);
+}
+
+/// Whether bytes, whose Unicode values are `units`, are characters of a codepage from end to end. UTF-8 has one form for
+/// each character and none for surrogates, where the library reads others too.
+bool all_characters(const Locale& source, std::string_view bytes, const std::u16string& units) {
+  if (source.number(LX_ITEM_CODEPAGE_ID) == LX_CODEPAGE_UTF8)
+    return source.from_unicode(units) == bytes &&
+           std::none_of(units.begin(), units.end(), [](char16_t unit) { return (unit & 0xF800) == 0xD800; });
+  LXShiftState state = LX_SHIFT_SINGLE;
+  const char* const end = LXMoveStringPointerEx(source.get(), bytes.data(), LX_SHIFT_SINGLE,
+                                                static_cast<int32_t>(bytes.size()), &state, 0);
+  return end == bytes.data() + bytes.size() && units.find(u'\uFFFD') == std::u16string::npos;
 }
 
 /// lexicor_convert(bytes, from, to [, 'strict']): a text where `to` is UTF-8, else a blob.
@@ -253,17 +293,16 @@ void convert(sqlite3_context* context, int count, sqlite3_value** arguments) {
   const bool strict = count > 3 && text_of(arguments[3], "what is lost") == "strict";
   if (count > 3 && !strict) throw Refusal("the fourth argument can be 'strict' only");
   const std::string_view bytes = bytes_of(arguments[0]);
-  const Locale& source = locale_of(context, arguments, 1, true);
-  const Locale& target = locale_of(context, arguments, 2, true);
-  const std::string result = lexicor::convert(target, source, bytes);
+  const auto source = locale_of(context, arguments, 1, true), target = locale_of(context, arguments, 2, true);
+  const std::string result = lexicor::convert(*target, *source, bytes);
   if (strict) {
-    const std::u16string before = source.to_unicode(bytes);
-    if (before.find(u'\uFFFD') != std::u16string::npos)
+    const std::u16string before = source->to_unicode(bytes);
+    if (!all_characters(*source, bytes, before))
       throw Refusal("not all of it is text in " + text_of(arguments[1], "a codepage"));
-    if (before != target.to_unicode(result))
+    if (before != target->to_unicode(result))
       throw Refusal("not all of the text is in " + text_of(arguments[2], "a codepage"));
   }
-  target.number(LX_ITEM_CODEPAGE_ID) == LX_CODEPAGE_UTF8 ? give(context, result) : give_blob(context, result);
+  target->number(LX_ITEM_CODEPAGE_ID) == LX_CODEPAGE_UTF8 ? give(context, result) : give_blob(context, result);
 }
 
 // Formats. Unicode, since separators like U+202F are left out of a text of bytes.
@@ -281,30 +320,42 @@ void give_units(sqlite3_context* context, const Locale& locale, Write write) {
   }
 }
 
-/// A moment as the database writes it: YYYY-MM-DD, then HH:MM or HH:MM:SS behind a blank or T.
+/// Whether a text is YYYY-MM-DD, and behind a blank or T HH:MM or HH:MM:SS, and then a fraction.
+bool has_shape_of_moment(const std::string& text) {
+  constexpr std::string_view kShape = "0000-00-00 00:00:00";
+  std::string shape = text;
+  for (char& c : shape) c = std::isdigit(static_cast<unsigned char>(c)) != 0 ? '0' : c;
+  if (shape.size() > 10 && shape[10] == 'T') shape[10] = ' ';
+  if (shape.size() > kShape.size() + 1 && shape[kShape.size()] == '.' &&
+      shape.find_first_not_of('0', kShape.size() + 1) == std::string::npos)
+    shape.resize(kShape.size());
+  return (shape.size() == 10 || shape.size() == 16 || shape.size() == 19) &&
+         kShape.substr(0, shape.size()) == shape;
+}
+
+/// A moment as the database writes it.
 LXTime moment_of(const std::string& text) {
-  LXTime time{};
-  int year = 0, month = 0, used = 0;
-  char between = 0;
-  const int fields = std::sscanf(text.c_str(), "%4d-%2d-%2d%n%c%2d:%2d:%2d", &year, &month, &time.day, &used,
-                                 &between, &time.hours, &time.minutes, &time.seconds);
-  const bool has_time = fields >= 6 && (between == ' ' || between == 'T');
-  if (fields < 3 || (!has_time && static_cast<size_t>(used) != text.size()) || month < 1 || month > 12)
+  std::tm given{};
+  if (has_shape_of_moment(text)) {
+    std::sscanf(text.c_str(), "%4d-%2d-%2d%*c%2d:%2d:%2d", &given.tm_year, &given.tm_mon, &given.tm_mday,
+                &given.tm_hour, &given.tm_min, &given.tm_sec);
+    given.tm_year -= 1900, given.tm_mon -= 1;
+  }
+  // What is out of range the calendar moves: the 31st of February is the 3rd of March.
+  std::tm there = given;
+  there.tm_wday = -1;
+  timegm(&there);
+  if (there.tm_wday < 0 || given.tm_mon != there.tm_mon || given.tm_mday != there.tm_mday ||
+      given.tm_hour != there.tm_hour || given.tm_min != there.tm_min || given.tm_sec != there.tm_sec)
     throw Refusal("'" + text + "' is no date; YYYY-MM-DD HH:MM:SS is one");
-  std::tm calendar{};
-  calendar.tm_year = time.year = year - 1900;
-  calendar.tm_mon = time.month = month - 1;
-  calendar.tm_mday = time.day;
-  calendar.tm_hour = 12;
-  timegm(&calendar);
-  time.weekday = calendar.tm_wday;
-  time.day_of_year = calendar.tm_yday;
-  return time;
+  return {there.tm_sec, there.tm_min,  there.tm_hour, there.tm_mday,
+          there.tm_mon, there.tm_year, there.tm_wday, there.tm_yday};
 }
 
 /// lexicor_format(number, locale [, 'currency' or 'international']), lexicor_format(moment, locale [, directives])
 void format(sqlite3_context* context, int count, sqlite3_value** arguments) {
-  const Locale& locale = locale_of(context, arguments, 1);
+  const auto kept = locale_of(context, arguments, 1);
+  const Locale& locale = *kept;
   const int type = sqlite3_value_type(arguments[0]);
   const std::string how = count > 2 ? text_of(arguments[2], "a format") : std::string();
   if (type == SQLITE_TEXT || type == SQLITE_BLOB) {
@@ -318,7 +369,10 @@ void format(sqlite3_context* context, int count, sqlite3_value** arguments) {
   }
   if (count > 2 && how != "currency" && how != "international")
     throw Refusal("a number's format is 'currency' or 'international', not '" + how + "'");
+  constexpr sqlite3_int64 kMostExact = sqlite3_int64{1} << 53;  // of a double
   const sqlite3_int64 whole = sqlite3_value_int64(arguments[0]);
+  if (type == SQLITE_INTEGER && (whole > kMostExact || whole < -kMostExact))
+    throw Refusal(std::to_string(whole) + " is beyond 2^53, up to which integers are written exactly");
   const bool integer = type == SQLITE_INTEGER && count < 3 && whole == static_cast<int32_t>(whole);
   const double value = sqlite3_value_double(arguments[0]);
   give_units(context, locale, [&](LXUChar* buffer, int32_t size) {

@@ -10,6 +10,7 @@ import json
 import os
 import pathlib
 import sys
+import uuid
 from typing import Any, Dict, Optional, Tuple
 
 import dask
@@ -45,7 +46,7 @@ def convert_file(source: pathlib.Path, target: pathlib.Path, codepages: Tuple[st
     codecs.register_error(handler, losses)
     decoder = codecs.getincrementaldecoder(codepages[0])(handler)
     encoder = codecs.getincrementalencoder(codepages[1])(handler)
-    unfinished = target.with_name(target.name + ".part")
+    unfinished = target.with_name(f".{uuid.uuid4().hex}")  # which is the name of no other file
     with source.open("rb") as read, unfinished.open("wb") as write:
         while True:
             piece = read.read(PIECE_BYTES)

@@ -53,6 +53,8 @@ def main() -> int:
     parser.add_argument("outputs", type=pathlib.Path)
     given = parser.parse_args()
     given.outputs.mkdir(exist_ok=True)
+    for old in given.outputs.glob("part-*"):  # of an order with more parts
+        old.unlink()
     with Client(given.scheduler):
         files = dask.persist(*(dask.delayed(keyed)(path, given.locale) for path in sorted(given.inputs.iterdir())))
         keys = sorted(key for some in dask.compute(*map(dask.delayed(sample), files)) for key in some)

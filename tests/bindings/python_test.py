@@ -1,6 +1,7 @@
 """The Python module: that its codecs give what the library gives for every codepage, whole and in any pieces; that
 they fit what Python does with codecs; that locales order, write and read as the library does."""
 import codecs
+import copy
 import ctypes
 import datetime
 import doctest
@@ -11,6 +12,7 @@ import random
 import subprocess
 import sys
 import threading
+import time
 import tomllib
 
 import pytest
@@ -115,6 +117,16 @@ def test_what_the_end_cuts(cut):
     assert b"\xc1\x0e".decode("ibm930") == "A"
 
 
+def test_malformed_text_takes_linear_time_and_utf8_has_one_form():
+    begin = time.process_time()
+    assert (b"\xff" * 20_000 + b"a" * 2_000_000).decode("lexicor-utf-8", "ignore") == "a" * 2_000_000
+    assert time.process_time() - begin < 5
+    for ill in b"\xe0\x80\x80", b"\xed\xa0\x80", b"\xed\xa0\xbd\xed\xb8\x80":
+        assert (b"a\xe3" + ill + b"b").decode("lexicor-utf-8", "replace") == "a" + "\ufffd" * (1 + len(ill) // 3) + "b"
+        with pytest.raises(UnicodeDecodeError):
+            ill.decode("lexicor-utf-8")
+
+
 def test_files(tmp_path):
     path, text = tmp_path / "host", "日本a\n語\r\n" * 3000 + "end語"
     with lexicor.open(path, "w", encoding="ibm-930", newline="") as file:
@@ -136,6 +148,11 @@ def test_files(tmp_path):
     with lexicor.open(path, "a", encoding="ibm-930") as file:
         file.write("本")
     assert path.read_bytes() == text.encode("ibm-930") + "本".encode("ibm-930")
+    with lexicor.open(path, "w", encoding="ibm-930") as file:
+        file.write("日本"), file.seek(0), file.write("本")
+    assert path.read_bytes() == "本".encode("ibm-930") + "日本".encode("ibm-930")[4:]
+    with pytest.raises(ValueError, match="shift states"):
+        lexicor.open(path, "r+", encoding="ibm-930")
     with codecs.open(path, "w", encoding="ibm-939") as file:
         file.write("日"), file.write("本\n語"), file.reset()
     assert path.read_bytes() == "日本\n語".encode("ibm-939")
@@ -148,6 +165,9 @@ def test_files(tmp_path):
 def test_names():
     for name in "IBM-930", "ibm930", "cp930", "lexicor_ibm-930", "Lexicor IBM930":
         assert codecs.lookup(name).name == "ibm930"
+    for codepage, alias in _native.aliases():
+        assert lexicor.Codepage(alias).name == codepage
+    assert codecs.lookup("IBM-932").name == "ibm942" and codecs.lookup("IBM932").name == "ms932"
     assert codecs.lookup("utf-8").name == "utf-8"
     assert codecs.lookup("lexicor-utf-8").decode(b"\xf0\x9f\x98\x80", "ignore")[0] == ""
     with pytest.raises(LookupError):
@@ -170,6 +190,27 @@ def test_order(name):
         compared = sorted(words, key=functools.cmp_to_key(lambda a, b: locale.compare(a, b, ignore)))
         keyed = sorted(words, key=lambda word: locale.key(word, ignore))
         assert [locale.key(word, ignore) for word in compared] == [locale.key(word, ignore) for word in keyed]
+
+
+def test_what_is_refused():
+    locale = lexicor.Locale("German.IBM930")
+    with pytest.raises(TypeError, match="neither copied"):
+        copy.copy(locale)
+    for name in "German\0Klingon", "\0":
+        with pytest.raises(ValueError, match="null"):
+            lexicor.Locale(name)
+    for item, value in ((1 << 32) + 1, None), (lexicor.Item.CURRENCY_DIGITS, 1 << 32):
+        with pytest.raises(OverflowError):
+            locale.item(item) if value is None else locale.set(item, value)
+    for text, base in ("2147483648", 10), ("-80000001", 16):
+        with pytest.raises(OverflowError):
+            locale.parse_integer(text, base)
+    assert locale.parse_integer("-80000000", 16) == -1 << 31
+    with pytest.raises(ValueError, match="ends before"):
+        locale.parse_time("3. Oktober", "%d. %B %Y")
+    with pytest.raises(TypeError):
+        lexicor.Codepage("UTF-8").decode(5)
+    assert locale.compare("a ", "a", lexicor.Option.BLANKS) == 0
 
 
 def test_numbers_and_times():
@@ -246,6 +287,8 @@ def test_the_version_is_the_library_s():
 
 def test_without_data_codecs_say_why():
     environment = {**os.environ, "LX_LOCALEDIR": "/nowhere"}
-    said = subprocess.run([sys.executable, "-c", "import lexicor; ''.encode('ibm930')"], env=environment,
-                          capture_output=True, text=True).stderr
-    assert "LookupError: unknown encoding: ibm930 (no codepages: /nowhere" in said
+    for name in "ibm930", "lexicor-ibm930":
+        said = subprocess.run([sys.executable, "-c", "import sys, lexicor; ''.encode(sys.argv[1])", name], env=environment,
+                              capture_output=True, text=True).stderr
+        assert "no codepages: /nowhere" in said
+        assert f"LookupError: unknown encoding: {name}" in said.replace("_", "-")

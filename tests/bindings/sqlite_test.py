@@ -79,6 +79,12 @@ def test_a_database_of_other_orders(tmp_path):
     value(database, "lexicor_collation('c', 'German', 'case')")
     assert value(database, "'APFEL' = 'apfel' COLLATE c") == 1
     assert value(database, "'\U0001f600' < '\U0001f601' COLLATE c") == 1
+    for locale in "German", "English@Binary":
+        for _ in range(2):
+            value(database, f"lexicor_collation('{random.choice('wW')}{locale[0]}', ?, 'width')", locale)
+        order = [row[0] for row in database.execute(f"SELECT w FROM word ORDER BY w COLLATE w{locale[0]}")]
+        keys = [value(database, "lexicor_key(?, ?, 'width')", word, locale) for word in order]
+        assert keys == sorted(keys) and value(database, f"'ab' = 'abc' COLLATE w{locale[0]}") == 0
 
 
 def test_values_and_errors():
@@ -88,6 +94,9 @@ def test_values_and_errors():
     assert value(database, "lexicor_format(2147483648, 'German')") == "2.147.483.648,00"
     assert value(database, "lexicor_format('2026-11-21T14:05', 'German', '%H:%M')") == "14:05"
     assert value(database, "lexicor_convert(?, 'MS932', 'UTF-8')", "日本".encode("cp932")) == "日本"
+    assert value(database, "lexicor_convert(x'C10E', 'IBM930', 'UTF-8', 'strict')") == "A"
+    assert value(database, "lexicor_key('a', NULL)") is None
+    assert value(database, "lexicor_key('', 'English@Binary')") == b""
     assert value(database, "lexicor_key(NULL, 'German') IS NULL AND lexicor_digest(NULL) IS NULL") == 1
     assert len(value(database, "lexicor_digest('German')")) == 128
     assert value(database, "lexicor_digest('German') = lexicor_digest('German_Austria.IBM273')") == 1
@@ -98,7 +107,13 @@ def test_values_and_errors():
             ("lexicor_key('x', 1)", "a locale must be a text"),
             ("lexicor_convert('x', 'UTF-8', 'no')", "no: codepage not found"),
             ("lexicor_convert(x'FF', 'UTF-8', 'Latin1', 'strict')", "not all of it is text in UTF-8"),
+            ("lexicor_convert(x'41E3', 'UTF-8', 'Latin1', 'strict')", "not all of it is text in UTF-8"),
+            ("lexicor_convert(x'EDA080', 'UTF-8', 'UTF-8', 'strict')", "not all of it is text in UTF-8"),
+            ("lexicor_convert(x'C10E45', 'IBM930', 'UTF-8', 'strict')", "not all of it is text in IBM930"),
             ("lexicor_format('soon', 'German')", "'soon' is no date"),
+            ("lexicor_format('2026-02-29', 'German')", "'2026-02-29' is no date"),
+            ("lexicor_format('2026-02-01 10:00 Uhr', 'German')", "is no date"),
+            ("lexicor_format(9007199254740993, 'German')", "9007199254740993 is beyond 2.53"),
             ("lexicor_format('2026-11-21', 'German', '%Q')", "the time format is not valid"),
             ("lexicor_format(1, 'German', 'long')", "not 'long'")]:
         with pytest.raises(sqlite3.OperationalError, match=words.replace("(", ".")):

@@ -10,6 +10,7 @@ import ctypes
 import io
 import re
 import threading
+import warnings
 import weakref
 from ctypes import c_int32, c_uint32
 from typing import IO, Any, NamedTuple, Optional, Tuple, Union
@@ -21,6 +22,9 @@ _SINGLE = 0
 _REPLACEMENT = "\ufffd"
 _PIECE = 1 << 24  # characters that are encoded at once
 _MOST = 0x7FFFFFF0  # bytes
+_WINDOW = 64  # bytes that are decoded behind something malformed; twice as many where there was nothing
+# Forms of UTF-8 that are no characters, and which the library reads: longer ones than need be, and surrogates.
+_ILL_FORMED = re.compile(rb"\xe0[\x80-\x9f][\x80-\xbf]|\xed[\xa0-\xbf][\x80-\xbf]")
 _PREFIX = "lexicor"
 _locales = threading.local()
 
@@ -37,14 +41,31 @@ class _Handle:
         weakref.finalize(self, library().LXReleaseLocale, self.value).atexit = False
 
 
+def _plain(name: str) -> str:
+    """A name as Python looks codecs up: other signs than letters and digits are alike."""
+    return re.sub(r"[^0-9a-z]+", "_", name.lower())
+
+
 def _simple(name: str) -> str:
-    """A name by its letters and digits: codecs are looked up with other signs changed."""
+    """A name by its letters and digits."""
     return re.sub(r"[^0-9a-z]", "", name.lower())
 
 
 def _in_class(unit: int) -> str:
     """A character in a class of a regular expression, where some of ASCII have a meaning."""
     return f"\\x{unit:02x}" if unit < 0x80 else chr(unit)
+
+
+def _codepages_by_name() -> dict[str, str]:
+    """Codepages by their names and aliases, and by those without signs where that leaves them apart: CP949 and CP-949
+    are not the same one."""
+    pairs = [(alias, codepage) for codepage, alias in reversed(_native.aliases())]
+    pairs += [(codepage, codepage) for codepage in _native.names(_native.CODEPAGE)]
+    simple: dict[str, set[str]] = {}
+    for name, codepage in pairs:
+        simple.setdefault(_simple(name), set()).add(codepage)
+    names = {name: next(iter(codepages)) for name, codepages in simple.items() if len(codepages) == 1}
+    return {**names, **{_plain(name): codepage for name, codepage in pairs}}
 
 
 class _Decoded(NamedTuple):
@@ -68,10 +89,8 @@ class Codepage:
     @classmethod
     def find(cls, name: str) -> Optional["Codepage"]:
         if not cls._names:
-            names = {_simple(alias): codepage for codepage, alias in reversed(_native.aliases())}
-            names.update({_simple(codepage): codepage for codepage in _native.names(_native.CODEPAGE)})
-            cls._names = names
-        codepage = cls._names.get(_simple(name))
+            cls._names = _codepages_by_name()
+        codepage = cls._names.get(_plain(name)) or cls._names.get(_simple(name))
         if codepage is None:
             return None
         if codepage not in cls._known:
@@ -100,6 +119,7 @@ class Codepage:
         wide = next(iter(self._wide), None)
         self._shifts: Tuple[bytes, ...] = () if wide is None else (self.close(1), self._convert(wide, _SINGLE)[0][:1])
         self._has_replacement = 0xFFFD in there
+        self._ill_formed = _ILL_FORMED if name == "UTF-8" else None
         ranges: list[list[int]] = []
         for unit in there:
             if ranges and ranges[-1][1] == unit - 1:
@@ -171,7 +191,7 @@ class Codepage:
 
     def decode(self, data: Union[bytes, bytearray, memoryview], errors: str = "strict") -> str:
         """A whole text. A character that its end cuts is an error."""
-        return self.decode_part(bytes(data), errors, _SINGLE, True).text
+        return self.decode_part(_bytes_of(data), errors, _SINGLE, True).text
 
     def decode_part(self, data: bytes, errors: str, state: int, final: bool) -> _Decoded:
         """The whole characters of a piece of a text, from a shift state on; how many bytes they are, and the state
@@ -179,17 +199,26 @@ class Codepage:
         if len(data) > _MOST:
             raise OverflowError(f"{len(data)} bytes at once")
         parts: list[str] = []
-        first_state, at = state, 0
+        first_state, at, window = state, 0, len(data)
         while at < len(data):
-            text, end, state_there = self._characters(data, at, state)
+            limit = min(at + window, len(data))
+            ill = self._ill_formed.search(data, at, limit) if self._ill_formed else None
+            limit = ill.start() if ill else limit
+            text, end, state_there = self._characters(data, at, limit, state)
             lost = self._first_lost(data, at, state, text)
+            if lost is None and end == at and ill:
+                lost = 0, at, limit if at < limit else ill.end(), state
             if lost is None:
                 parts.append(text)
                 at, state, stop, reason = end, state_there, len(data), "cut by the end"
+                window *= 2
+                if limit < len(data):
+                    continue
                 if not final or at == len(data) or self._only_shift(data[at:]):
                     break
             else:
                 index, at, stop, state = lost
+                window = _WINDOW
                 parts.append(text[:index])
                 reason = f"no character of {self.name}"
             instead, behind = codecs.lookup_error(errors)(
@@ -211,9 +240,9 @@ class Codepage:
         end = library().LXMoveStringPointerEx(self._locale(), base + at, state, length, ctypes.byref(there), flags)
         return min(end - base, len(data)), there.value
 
-    def _characters(self, data: bytes, at: int, state: int) -> Tuple[str, int, int]:
-        """The text of the whole characters from `at` on, and the place and the state behind them."""
-        end, state_there = self._moved(data, at, state, len(data) - at)
+    def _characters(self, data: bytes, at: int, limit: int, state: int) -> Tuple[str, int, int]:
+        """The text of the whole characters between two places, and the place and the state behind them."""
+        end, state_there = self._moved(data, at, state, limit - at)
         buffer = _native.unit_buffer(end - at)
         base = ctypes.cast(ctypes.c_char_p(data), ctypes.c_void_p).value or 0
         count = library().LXStringToUnicodeEx(buffer, end - at, self._locale(), base + at, state, end - at, 0)
@@ -242,6 +271,11 @@ class Codepage:
             if self._moved(data[at : at + length], 0, state, length)[0] == length:
                 return at + length
         return at + 1
+
+
+def _bytes_of(data: Any) -> bytes:
+    """The bytes of what has some: not so many as a number says."""
+    return bytes(memoryview(data))
 
 
 def _checked(place: int, length: int) -> int:
@@ -289,7 +323,7 @@ class _Decoder(codecs.IncrementalDecoder):
         self.pending, self.state = b"", _SINGLE
 
     def decode(self, input: Any, final: bool = False) -> str:  # noqa: A002
-        data = self.pending + bytes(input)
+        data = self.pending + _bytes_of(input)
         done = self.page.decode_part(data, self.errors, self.state, final)
         self.pending, self.state = (b"", _SINGLE) if final else (data[done.consumed :], done.state)
         return done.text
@@ -323,7 +357,7 @@ class _Reader(codecs.StreamReader):
     _state = _SINGLE
 
     def decode(self, input: bytes, errors: str = "strict") -> Tuple[str, int]:  # noqa: A002
-        done = self.page.decode_part(bytes(input), errors, self._state, False)
+        done = self.page.decode_part(_bytes_of(input), errors, self._state, False)
         self._state = done.state
         return done.text, done.consumed
 
@@ -353,11 +387,15 @@ def _codec_info(page: Codepage, name: str) -> codecs.CodecInfo:
 
 
 def _search(name: str) -> Optional[codecs.CodecInfo]:
-    """Names of codepages that Python has no codec for; with "lexicor-" before it, of every one."""
+    """Names of codepages that Python has no codec for; with "lexicor-" before it, of every one. Without codepages
+    names of others are left to the searches behind this one."""
     try:
         page = Codepage.find(re.sub(f"^{_PREFIX}[-_]", "", name))
     except Error as error:
-        raise LookupError(f"unknown encoding: {name} (no codepages: {error})") from None
+        if name.startswith(_PREFIX):
+            raise LookupError(f"unknown encoding: {name} (no codepages: {error})") from None
+        warnings.warn(f"no codepages: {error}", RuntimeWarning, stacklevel=2)
+        return None
     return None if page is None else _codec_info(page, page.codec_name)
 
 
@@ -375,19 +413,33 @@ class _File(io.TextIOWrapper):
         finally:
             _collecting.encoders = None
 
-    def close(self) -> None:
+    def _end(self) -> None:
+        """Ends what was written in the single-byte state."""
         if not self.closed and getattr(self, "_encoders", None):
             self.flush()
             self.buffer.write(b"".join(encoder.encode("", True) for encoder in self._encoders))
-        super().close()
+
+    def seek(self, cookie: int, whence: int = 0) -> int:
+        self._end()
+        return super().seek(cookie, whence)
+
+    def close(self) -> None:
+        try:
+            self._end()
+        finally:  # the file is closed whatever happens, and an error on the way is reported
+            super().close()
 
 
 def open_text(file: Any, mode: str = "r", encoding: str = "utf-8", errors: Optional[str] = None,
               newline: Optional[str] = None) -> IO[str]:
     """As the built-in open() for text. What is written ends in the single-byte state of a shift-sensitive codepage,
-    also without a line end: the built-in open() closes files in the state that the last write() left."""
+    also without a line end, and before seek(): the built-in open() leaves files in the state of the last write().
+    Text with shift states is not updated in place ("+"), and appended text has states of its own."""
     if "b" in mode:
         raise ValueError("binary mode has no encoding")
+    page = getattr(codecs.lookup(encoding).incrementalencoder, "page", None)
+    if "+" in mode and page is not None and page.shift:
+        raise ValueError(f"text in {page.name} has shift states, and cannot be updated in place")
     binary = io.open(file, mode.replace("t", "") + "b")
     try:
         return _File(binary, encoding=encoding, errors=errors, newline=newline)

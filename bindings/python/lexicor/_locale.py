@@ -57,18 +57,19 @@ class Map(enum.IntEnum):
 _NUMBERS = {1, 5, 9, 11, 58, 63, 69, 70, *range(73, 79), *range(82, 88)}
 _INTERNATIONAL, _MONETARY, _NATIONAL_DIGITS = 0x40, 0x20, 0x10
 _CATALOG_LOAD = 0x80000061
+_EXTREMES = (-(1 << 31), (1 << 31) - 1)
 _MOST = 1 << 24
 _KEY_BYTES = 512  # of a key that needs no buffer of its own
 Moment = Union[datetime.date, datetime.time]
 
 
-class Locale:
+class Locale(_native.Owner):
     """A locale by name: language, then optionally "_" and a territory, "." and a codepage, "@" and a sort. Without a
     name the user's, as LX_LANG or the operating system has it."""
 
     def __init__(self, name: Optional[str] = None) -> None:
         code = c_int32()
-        flags, text = (0x6, b"") if name is None else (0, name.encode("utf-8"))
+        flags, text = (0x6, b"") if name is None else (0, _native.name_of(name))
         self._take(library().LXGetLocale(text, flags, ctypes.byref(code)), code.value, name or "the user's locale")
 
     @classmethod
@@ -76,7 +77,7 @@ class Locale:
         """By the operating system's name: "de_DE.UTF-8"."""
         code = c_int32()
         made = cls.__new__(cls)
-        made._take(library().LXConvertNativeLocale(name.encode("utf-8"), 0, ctypes.byref(code)), code.value, name)
+        made._take(library().LXConvertNativeLocale(_native.name_of(name), 0, ctypes.byref(code)), code.value, name)
         return made
 
     def _take(self, handle: Optional[int], code: int, name: str) -> None:
@@ -94,6 +95,7 @@ class Locale:
     # A call, and what it leaves as the locale's last error.
 
     def _call(self, function: Callable[..., Any], *arguments: Any) -> Any:
+        _native.check_integers(function, (self._handle, *arguments))
         with self._lock:
             result = function(self._handle, *arguments)
             code = library().LXGetError(self._handle)
@@ -156,6 +158,8 @@ class Locale:
 
     def compare(self, a: str, b: str, ignore: int = 0) -> int:
         """Below 0, 0 or above 0, as `a` stands to `b` in the order of the locale's sort."""
+        if ignore & Option.BLANKS:  # which the library knows by their code in the codepage
+            a, b = a.rstrip(" "), b.rstrip(" ")
         return int(self._call(library().LXStrcollU, *_native.units(a), *_native.units(b), ignore))
 
     def key(self, text: str, ignore: int = 0) -> bytes:
@@ -207,8 +211,12 @@ class Locale:
 
     def parse_integer(self, text: str, base: int = 10) -> int:
         """The number that a text is; ValueError when it is none. Digits of any script count, and thousands separators
-        that are blanks, which end a number for the C functions."""
-        return int(self._parsed(library().LXStringToLongU, text, Item.THOUSANDS, base, _NATIONAL_DIGITS))
+        that are blanks, which end a number for the C functions. OverflowError when it has more than 32 bits."""
+        value = int(self._parsed(library().LXStringToLongU, text, Item.THOUSANDS, base, _NATIONAL_DIGITS))
+        # The library reads the nearest value in place of one that is out of range.
+        if value in _EXTREMES and value != (self.parse_number(text) if base == 10 else int(text, base)):
+            raise OverflowError(f"{text!r} has more than 32 bits")
+        return value
 
     def parse_number(self, text: str, monetary: bool = False) -> float:
         flags = _NATIONAL_DIGITS | (_MONETARY if monetary else 0)
@@ -236,12 +244,25 @@ class Locale:
 
     def parse_time(self, text: str, format: str) -> datetime.datetime:  # noqa: A002
         """The moment that a whole text is; fields that the format lacks are those of 1900-01-01 00:00:00."""
-        time = _native.Time(0, 0, 0, 1, 0, 0, 0, 0)
+        time = self._read_time(text, format, _native.Time(0, 0, 0, 1, 0, 0, 0, 0))
+        moment = datetime.datetime(time.year + 1900, time.month + 1, time.day, time.hours, time.minutes, time.seconds)
+        # The library reads a text that ends before its format: the fields that stay are more than those of a whole one.
+        if self._fields_of(text, format) != self._fields_of(self.format_time(moment, format), format):
+            raise ValueError(f"the time ends before its format {format!r}: {text!r}")
+        return moment
+
+    def _read_time(self, text: str, format: str, preset: _native.Time) -> _native.Time:  # noqa: A002
         units, count = _native.units(text)
-        read = self._call(library().LXStringToTimeU, ctypes.byref(time), units, count, *_native.units(format), 0)
+        read = self._call(library().LXStringToTimeU, ctypes.byref(preset), units, count, *_native.units(format), 0)
         if read != count:
             raise ValueError(f"behind the time stands {units[2 * read : -2].decode(_native.UTF16)!r}")
-        return datetime.datetime(time.year + 1900, time.month + 1, time.day, time.hours, time.minutes, time.seconds)
+        return preset
+
+    def _fields_of(self, text: str, format: str) -> list[str]:  # noqa: A002
+        """The fields that a text sets, whatever they were before."""
+        presets = (1, 1, 1, 2, 1, 1, 1, 1), (2, 2, 2, 3, 2, 2, 2, 2)
+        one, other = (self._read_time(text, format, _native.Time(*preset)) for preset in presets)
+        return [name for name, _ in _native.Time._fields_ if getattr(one, name) == getattr(other, name)]
 
     def _own_format(self, moment: Moment) -> str:
         date, time = str(self.item(Item.SHORT_DATE_FORMAT)), str(self.item(Item.TIME_FORMAT))
@@ -257,14 +278,14 @@ def _time_of(moment: Moment) -> _native.Time:
                         date.isoweekday() % 7, date.timetuple().tm_yday - 1)
 
 
-class Catalog:
+class Catalog(_native.Owner):
     """A message catalog: a path, or a template of one as LXOpenCatalog expands it."""
 
     def __init__(self, locale: Locale, name: str, directory: Optional[str] = None) -> None:
         self._locale = locale  # whose codepage the messages are in, and who must outlive the catalog
         with locale._lock:
-            handle = library().LXOpenCatalog(locale._handle, None if directory is None else directory.encode("utf-8"),
-                                             name.encode("utf-8"), _CATALOG_LOAD)
+            handle = library().LXOpenCatalog(locale._handle, None if directory is None else _native.name_of(directory),
+                                             _native.name_of(name), _CATALOG_LOAD)
             code = library().LXGetError(locale._handle)
         if not handle:
             raise Error(code, name)
@@ -280,6 +301,7 @@ class Catalog:
     def message(self, set: int, number: int, default: Optional[str] = None) -> str:  # noqa: A002
         """A message; without one `default`, or KeyError."""
         size = 512
+        _native.check_integers(library().LXGetMessageU, (self._handle, set, number))
         while True:  # a message that does not fit is cut, and nothing says so
             buffer = _native.unit_buffer(size)
             with self._locale._lock:

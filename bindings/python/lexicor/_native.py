@@ -27,6 +27,13 @@ class Error(Exception):
         self.code = code
 
 
+class Owner:
+    """What owns a handle of the library, which a copy would free too."""
+
+    def __reduce__(self) -> Any:
+        raise TypeError(f"a {type(self).__name__} can be neither copied nor pickled: open it again by its name")
+
+
 class Time(ctypes.Structure):
     """LXTime."""
 
@@ -140,6 +147,23 @@ def units(text: str) -> Tuple[bytes, int]:
     """A text as 16-bit Unicode with a null behind it, and its units."""
     data = text.encode(UTF16, "surrogatepass")
     return data + b"\0\0", len(data) // 2
+
+
+_RANGES = {c_int32: (-(1 << 31), 1 << 31), c_uint32: (0, 1 << 32)}
+
+
+def check_integers(function: Any, arguments: Tuple[Any, ...]) -> None:
+    """Integers that do not fit the parameters of a function, which ctypes would cut, are an OverflowError."""
+    for kind, argument in zip(function.argtypes, arguments):
+        if kind in _RANGES and not _RANGES[kind][0] <= argument < _RANGES[kind][1]:
+            raise OverflowError(f"{argument} does not fit 32 bits")
+
+
+def name_of(text: str) -> bytes:
+    """A name as the library takes it, which would end it at a null."""
+    if "\0" in text:
+        raise ValueError(f"a name with a null in it: {text!r}")
+    return text.encode("utf-8")
 
 
 def text_of(buffer: Any, count: int) -> str:
