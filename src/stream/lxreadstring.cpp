@@ -1,7 +1,6 @@
 // Reading strings and lines from a stream. Characters are read one by one; what ends a string and cannot be
 // stored goes back into the stream.
-#include <algorithm>
-#include <iterator>
+#include <cstring>
 
 #include "codepage/lxtext.h"
 #include "core/lxcall.h"
@@ -99,7 +98,7 @@ class Line {
     typename Sink::Unit aside[8];  // two line ends, or a character with its shift bytes
     Sink probe(out_);
     probe.p = aside;
-    probe.end = aside + std::min(room(out_.p, out_.end), std::size(aside));
+    probe.end = aside + least(room(out_.p, out_.end), sizeof(aside) / sizeof(*aside));
     return (probe.put(values) && ...);
   }
   bool pair_fits() const {

@@ -169,6 +169,7 @@ def test_names():
         assert lexicor.Codepage(alias).name == codepage
     assert codecs.lookup("IBM-932").name == "ibm942" and codecs.lookup("IBM932").name == "ms932"
     assert codecs.lookup("utf-8").name == "utf-8"
+    assert {lexicor.Locale.native(f"de_DE.{codeset}").name for codeset in ("UTF-8", "utf8")} == {"German_Germany.UTF-8@Default"}
     assert codecs.lookup("lexicor-utf-8").decode(b"\xf0\x9f\x98\x80", "ignore")[0] == ""
     with pytest.raises(LookupError):
         "".encode("ibm-no-such")

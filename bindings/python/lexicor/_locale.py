@@ -7,6 +7,7 @@ from __future__ import annotations
 import ctypes
 import datetime
 import enum
+import re
 import threading
 import weakref
 from ctypes import c_int32, c_void_p
@@ -74,10 +75,13 @@ class Locale(_native.Owner):
 
     @classmethod
     def native(cls, name: str) -> "Locale":
-        """By the operating system's name: "de_DE.UTF-8"."""
+        """By the operating system's name, its codeset in any spelling: "de_DE.UTF-8", "de_DE.utf8"."""
         code = c_int32()
         made = cls.__new__(cls)
-        made._take(library().LXConvertNativeLocale(_native.name_of(name), 0, ctypes.byref(code)), code.value, name)
+        plain = re.sub(r"\.[^@]*", lambda codeset: re.sub(r"[^.a-z0-9]", "", codeset[0].lower()), name)
+        convert = library().LXConvertNativeLocale
+        handle = convert(_native.name_of(name), 0, ctypes.byref(code))
+        made._take(handle or convert(_native.name_of(plain), 0, ctypes.byref(code)), code.value, name)
         return made
 
     def _take(self, handle: Optional[int], code: int, name: str) -> None:
