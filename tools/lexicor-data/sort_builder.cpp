@@ -345,9 +345,9 @@ class Builder {
     }
   };
   Place place_of(uint32_t number, uint32_t second = 0) const {
-    const uint32_t anchor = number >> WeightOrder::kPositionBits;
-    if (anchor >= kFirstBehind) return {root_.groups.size(), number, second};
-    return {tailoring_.group_rank(root_.group_of(anchor)), number, second};
+    const uint32_t weight = WeightOrder::in_group_of(number);
+    if (weight >= kFirstBehind) return {root_.groups.size(), number, second};
+    return {tailoring_.group_rank(root_.group_of(weight)), number, second};
   }
 
   /// The place behind the letters of Hangul.

@@ -8,7 +8,7 @@ uint32_t WeightOrder::insert(const Gap& gap, size_t at) {
   const auto list = gaps_.try_emplace(gap).first;
   const auto weight = static_cast<uint32_t>(kFirstTailored + places_.size());
   list->second.insert(list->second.begin() + static_cast<std::ptrdiff_t>(at), weight);
-  full_ = full_ || list->second.size() >> kPositionBits != 0;
+  full_ = full_ || list->second.size() >= kAheadOfNext;
   places_.push_back({list});
   return weight;
 }
@@ -34,8 +34,10 @@ uint32_t WeightOrder::anchor(uint32_t weight) const {
 }
 
 uint32_t WeightOrder::number(uint32_t weight) const {
-  const size_t behind = weight < kFirstTailored ? 0 : position(weight) + 1;
-  return anchor(weight) << kPositionBits | static_cast<uint32_t>(behind);
+  if (weight < kFirstTailored) return weight << kPositionBits;
+  const auto& [context, anchor] = places_[weight - kFirstTailored].list->first;
+  const auto behind = static_cast<uint32_t>(position(weight) + 1);
+  return anchor << kPositionBits | (context.next_group ? kAheadOfNext : 0) | behind;
 }
 
 }  // namespace lexicor_data

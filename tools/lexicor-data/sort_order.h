@@ -15,12 +15,15 @@ namespace lexicor_data {
 class WeightOrder {
  public:
   static constexpr unsigned kPositionBits = 13;  ///< of a number; its anchor takes the others
+  static constexpr uint32_t kAheadOfNext = 1u << (kPositionBits - 1);  ///< of a position: in the next group
 
   enum Level : uint8_t { kPrimary, kSecondary, kTertiary };
   struct Context {
     Level level = kPrimary;
     uint32_t primary = 0, secondary = 0;
-    auto key() const { return std::tie(level, primary, secondary); }
+    bool next_group =
+        false;  ///< ahead of the first letter of a group, and not behind the last one of the group before
+    auto key() const { return std::tie(level, primary, secondary, next_group); }
     bool operator<(const Context& other) const { return key() < other.key(); }
   };
 
@@ -33,6 +36,10 @@ class WeightOrder {
   uint32_t anchor(uint32_t weight) const;
   /// A number that orders weights of one context, and those of one level where anchors differ.
   uint32_t number(uint32_t weight) const;
+  /// The weight of the root in whose group a primary weight of this number stands.
+  static uint32_t in_group_of(uint32_t number) {
+    return (number >> kPositionBits) + ((number & kAheadOfNext) != 0 ? 1 : 0);
+  }
   /// Whether a list has more weights than numbers can tell apart.
   bool full() const { return full_; }
 

@@ -298,12 +298,26 @@ void SortTailoring::import(const SortRule& rule) {
 
 void SortTailoring::reset(const SortRule& rule) {
   before_ = rule.strength;
+  is_several_ = false;
   if (!rule.words.empty()) {
     place_ = special_place(rule);
     return;
   }
   check_known(rule, rule.text, false);
   place_ = elements(rule.text);
+  const std::u16string text = root_.decomposed(rule.text);
+  is_several_ = text.size() > 1 && root_.compositions(text).empty() && contractions_.count(text) == 0;
+}
+
+/// Whether elements end in those of the letters of a syllable.
+bool SortTailoring::is_syllable(const CollationElements& elements_of_text) const {
+  for (size_t letters = 2; letters <= std::min<size_t>(3, elements_of_text.size()); ++letters) {
+    uint32_t primaries[3];
+    for (size_t i = 0; i < letters; ++i)
+      primaries[i] = (elements_of_text.end() - static_cast<std::ptrdiff_t>(letters - i))->primary;
+    if (root_.syllable(primaries, letters) != 0) return true;
+  }
+  return false;
 }
 
 CollationElements SortTailoring::special_place(const SortRule& rule) const {
@@ -381,12 +395,20 @@ void SortTailoring::insert(const SortRule& rule) {
   CollationElement& last = place_.back();
   const bool ahead = before_ != Strength::kNone;
   auto next_to = [&](WeightOrder::Level level, uint32_t weight, uint32_t below) {
-    WeightOrder::Context context{level, 0, 0};
+    WeightOrder::Context context{level, 0, 0, false};
     if (level >= WeightOrder::kSecondary) context.primary = last.primary;
     if (level == WeightOrder::kTertiary) context.secondary = last.secondary;
+    if (level == WeightOrder::kPrimary && ahead)
+      context.next_group = root_.group_of(below) != root_.group_of(weight);
     return ahead ? order_.insert_before(context, weight, below) : order_.insert_after(context, weight);
   };
   const bool ignored = strength_of(last) > Strength::kSecondary;
+  if (is_syllable(place_))
+    fail(rule.place,
+         "nothing stands next to a syllable of Hangul, whose weight is computed, but what equals it");
+  if (ahead && last.primary == 0 && place_.size() > 1 && is_several_)
+    fail(rule.place,
+         "nothing stands ahead of a letter and an accent that are no character by an accent or by case");
   if (ahead && rule.strength != Strength::kPrimary && order_.anchor(last.primary) >= kFirstIdeograph)
     fail(rule.place,
          "nothing stands ahead of an ideograph by an accent or by case, since its weight is computed");
@@ -595,7 +617,7 @@ std::vector<std::u16string> SortTailoring::long_contractions() const {
 }
 
 bool SortTailoring::is_variable(uint32_t primary) const {
-  return shifted_ && primary != 0 && order_.anchor(primary) <= last_variable_;
+  return shifted_ && primary != 0 && WeightOrder::in_group_of(order_.number(primary)) <= last_variable_;
 }
 
 }  // namespace lexicor_data

@@ -107,6 +107,7 @@ class SortTailoring {
   void check_reordered() const;
 
   void reset(const SortRule& rule);
+  bool is_syllable(const CollationElements& elements) const;
   CollationElements special_place(const SortRule& rule) const;
   void relate(const SortRule& rule);
   void insert(const SortRule& rule);
@@ -135,6 +136,7 @@ class SortTailoring {
 
   CollationElements place_;            ///< where the next relation stands
   Strength before_ = Strength::kNone;  ///< of a reset whose relation comes
+  bool is_several_ = false;            ///< the reset's text: characters that do not become one
 
   std::map<char16_t, CollationElements> characters_;    ///< tailored
   std::map<std::u16string, Contraction> contractions_;  ///< by decomposed text, those of the root among them
