@@ -98,6 +98,20 @@ struct Source {
   Declarations declared;
 };
 
+/// The order that a name says, in any letter case; nothing for another name.
+std::optional<ByteOrder> byte_order_of(const std::string& name) {
+  if (lexicor_cli::same_name(name, "big")) return ByteOrder::kBig;
+  if (lexicor_cli::same_name(name, "little")) return ByteOrder::kLittle;
+  return std::nullopt;
+}
+
+void check_byte_order(const Source& source) {
+  const Declarations& declared = source.declared;
+  if (declared.byte_order.empty() || byte_order_of(declared.byte_order).has_value()) return;
+  throw Failure(kDataError, source.name + ":" + std::to_string(declared.byte_order_line) +
+                                ": byte-order=" + declared.byte_order + "; expected big or little");
+}
+
 std::vector<Source> read_sources(const Options& options, const Encoding* encoding) {
   std::vector<std::string> names = options.sources;
   if (names.empty()) names.push_back(kStandardStream);
@@ -111,6 +125,8 @@ std::vector<Source> read_sources(const Options& options, const Encoding* encodin
       source.declared.codeset = po_charset(source.text);
     else
       source.declared = read_declarations(source.text, encoding);
+    source.declared.locale = lexicor_cli::core_name(source.declared.locale);
+    check_byte_order(source);
     sources.push_back(std::move(source));
   }
   return sources;
@@ -158,9 +174,7 @@ ByteOrder choose_byte_order(const Options& options, const Catalog* existing,
   if (name.empty() && existing != nullptr) return existing->byte_order;
   const Source* const declaring = first_declaring(sources, &Declarations::byte_order);
   if (name.empty() && declaring != nullptr) name = declaring->declared.byte_order;
-  if (lexicor_cli::same_name(name, "big")) return ByteOrder::kBig;
-  if (lexicor_cli::same_name(name, "little")) return ByteOrder::kLittle;
-  return native_byte_order();
+  return byte_order_of(name).value_or(native_byte_order());
 }
 
 const Encoding& declared_encoding(const Source& source, const Options& options, const Encoding& target,

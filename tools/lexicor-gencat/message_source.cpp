@@ -242,7 +242,8 @@ Declarations read_declarations(const std::string& source, const Encoding* encodi
   size_t at = has_byte_order_mark(source) ? kByteOrderMarkBytes : 0;
   std::optional<LineReader> reader;
   if (encoding != nullptr) reader.emplace(*encoding, source);
-  for (std::string text;; text.clear()) {
+  int line_number = 1;
+  for (std::string text;; text.clear(), ++line_number) {
     if (reader.has_value()) {
       if (!reader->next(line)) return found;
       for (const Character& c : line) text += c.syntax < 0x7F ? static_cast<char>(c.syntax) : '?';
@@ -261,6 +262,7 @@ Declarations read_declarations(const std::string& source, const Encoding* encodi
     read_declaration(comment, "locale", found.locale);
     read_declaration(comment, "codeset", found.codeset);
     read_declaration(comment, "byte-order", found.byte_order);
+    if (found.byte_order_line == 0 && !found.byte_order.empty()) found.byte_order_line = line_number;
   }
 }
 

@@ -15,6 +15,7 @@ struct Declarations {
   std::string locale;      // of the texts in the catalog
   std::string codeset;     // of the source
   std::string byte_order;  // of the catalog
+  int byte_order_line = 0;
 };
 
 /// Reads the comments in front of the first message. Without an encoding the source is taken as ASCII bytes.
