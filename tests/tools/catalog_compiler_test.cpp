@@ -2,6 +2,8 @@
 // what is said of them stands in tests/cases/cli.
 #include <gtest/gtest.h>
 
+#include <csignal>
+#include <filesystem>
 #include <iterator>
 #include <random>
 #include <sstream>
@@ -9,6 +11,7 @@
 #include "catalog_file.h"
 #include "gencat.h"
 #include "lexicor/command.h"
+#include "lexicor/output.h"
 #include "support/damage.h"
 #include "support/object_files.h"
 
@@ -60,6 +63,16 @@ TEST(CatalogCompiler, DumpCompilesToTheSameBytes) {
       }
     }
   }
+}
+
+TEST(CatalogCompiler, SignalLeavesNoPartOfItsFiles) {
+  const lx::test::ScratchDirectory directory;
+  const auto stop = [&] {
+    const lexicor_cli::Output catalog(directory.file("a.cat")), header(directory.file("a.h"));
+    std::raise(SIGTERM);
+  };
+  EXPECT_EXIT(stop(), testing::KilledBySignal(SIGTERM), "");
+  EXPECT_TRUE(std::filesystem::is_empty(directory.path()));
 }
 
 TEST(CatalogCompiler, DamageIsNamedOrHarmless) {

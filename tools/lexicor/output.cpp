@@ -5,6 +5,7 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <atomic>
 #include <cerrno>
 #include <charconv>
 #include <climits>
@@ -19,21 +20,38 @@ namespace lexicor_cli {
 
 namespace {
 
-// The temporary file to remove when a signal ends the program; empty when there is none.
-char g_temporary[4096];
+/// A temporary file to remove when a signal ends the program.
+struct Guarded {
+  std::atomic<bool> used{false};
+  char path[4096];
+};
 
-void remove_temporary(int signal) {
-  if (g_temporary[0] != 0) unlink(g_temporary);
+constexpr int kMostGuarded = 4;  // no program has more outputs open
+Guarded g_guarded[kMostGuarded];
+
+void remove_temporaries(int signal) {
+  for (const Guarded& guarded : g_guarded) {
+    if (guarded.used) unlink(guarded.path);
+  }
   std::signal(signal, SIG_DFL);
   raise(signal);
 }
 
-void guard_temporary(const std::string& path) {
-  if (path.size() >= sizeof g_temporary) return;
-  std::memcpy(g_temporary, path.c_str(), path.size() + 1);
+/// The number of the guard, for release_temporary(); -1: there is none.
+int guard_temporary(const std::string& path) {
+  int number = 0;
+  while (number < kMostGuarded && g_guarded[number].used) ++number;
+  if (number == kMostGuarded || path.size() >= sizeof g_guarded[number].path) return -1;
+  std::memcpy(g_guarded[number].path, path.c_str(), path.size() + 1);
+  g_guarded[number].used = true;
   for (const int signal : {SIGINT, SIGTERM, SIGHUP, SIGQUIT}) {
-    if (std::signal(signal, remove_temporary) == SIG_IGN) std::signal(signal, SIG_IGN);
+    if (std::signal(signal, remove_temporaries) == SIG_IGN) std::signal(signal, SIG_IGN);
   }
+  return number;
+}
+
+void release_temporary(int number) {
+  if (number >= 0) g_guarded[number].used = false;
 }
 
 /// The mode of the file to be replaced, else that of a new file.
@@ -120,11 +138,12 @@ Output::Output(const std::string& path) : path_(path) {
   fd_ = mkostemp(name.data(), O_CLOEXEC);
   if (fd_ < 0) fail();
   temporary_ = name;
-  guard_temporary(temporary_);
+  guard_ = guard_temporary(temporary_);
   if (fchmod(fd_, mode_of(exists ? &status : nullptr)) != 0) {
     const int reason = errno;
     close(fd_);
     unlink(temporary_.c_str());
+    release_temporary(guard_);
     errno = reason;
     fail();
   }
@@ -133,7 +152,7 @@ Output::Output(const std::string& path) : path_(path) {
 Output::~Output() {
   if (fd_ > STDERR_FILENO) close(fd_);
   if (!temporary_.empty()) unlink(temporary_.c_str());
-  g_temporary[0] = 0;
+  release_temporary(guard_);
 }
 
 void Output::write(const char* data, size_t bytes) {

@@ -42,6 +42,7 @@ class Output : public Sink {
   std::string path_;       // for messages: the name as the user gave it
   std::string target_;     // the file to replace, symbolic links followed
   std::string temporary_;  // empty: written directly
+  int guard_ = -1;         // of the temporary file against signals
 };
 
 }  // namespace lexicor_cli
