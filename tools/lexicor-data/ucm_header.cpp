@@ -164,6 +164,7 @@ void UcmHeader::take_from(const CodepageSource& base) {
   const auto take = [&](const char* key, auto CodepageSource::*field) {
     if (!has(key)) source_.*field = base.*field, keys_.emplace(key, place_of("base"));
   };
+  says_width_ = has("mb_cur_max");
   take("uconv_class", &CodepageSource::kind);
   take("mb_cur_max", &CodepageSource::width);
   take("subchar", &CodepageSource::substitution);
@@ -215,7 +216,12 @@ void UcmHeader::settle_leads() {
     if (leads_of_base_ && source_.leads[byte] > 1) said = source_.leads[byte];
     source_.leads[byte] = said != 0 ? said : std::max<uint8_t>(seen[byte], 1);
   }
-  source_.width = *std::max_element(source_.leads.begin(), source_.leads.end());
+  const uint8_t longest = *std::max_element(source_.leads.begin(), source_.leads.end());
+  if (says_width_ && source_.width != longest)
+    warn(place_of("mb_cur_max"), "width " + std::to_string(source_.width) +
+                                     " is not that of the longest lead; " + std::to_string(longest) +
+                                     " is taken instead");
+  source_.width = longest;
 }
 
 /// A substitution of several bytes cannot be held.

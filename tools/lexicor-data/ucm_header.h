@@ -54,6 +54,7 @@ class UcmHeader {
   std::string family_;  ///< <icu:charsetFamily>
   size_t substitution_bytes_ = 1;
   bool leads_of_base_ = false;
+  bool says_width_ = true;             ///< itself, not its base
   int substitution_of_one_byte_ = -1;  ///< <subchar1>
 };
 
