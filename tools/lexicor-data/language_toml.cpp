@@ -1,6 +1,8 @@
 // Reading, writing, packing and unpacking of a language.
 #include "language_toml.h"
 
+#include <strings.h>
+
 #include <algorithm>
 #include <ostream>
 
@@ -44,7 +46,7 @@ uint16_t read_default(TomlTable& defaults, const std::string& key, ObjectType ty
     return id;
   }
   const std::string name = narrow(defaults.text(key));
-  if (may_be_none && name == kBinary) return 0;
+  if (may_be_none && strcasecmp(name.c_str(), kBinary) == 0) return 0;
   const ObjectName* object = control.find(type, name);
   if (object == nullptr) defaults.fail(at, "no " + key + " has the name " + name);
   return object->id;
