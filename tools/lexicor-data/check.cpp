@@ -1,6 +1,8 @@
 // Checks of whole directories. A fault in one file does not hide those of the others.
 #include "check.h"
 
+#include <cerrno>
+#include <cstring>
 #include <filesystem>
 #include <fstream>
 #include <functional>
@@ -106,7 +108,7 @@ void check_manifest(const std::string& directory, const Control& control, Source
 
 std::ifstream open(const std::string& path) {
   std::ifstream in(path, std::ios::binary);
-  if (!in) throw SourceError(path, 0, 0, "cannot be opened");
+  if (!in) throw SourceError(path, 0, 0, std::strerror(errno));
   return in;
 }
 

@@ -2,6 +2,8 @@
 #include "compile_directory.h"
 
 #include <algorithm>
+#include <cerrno>
+#include <cstring>
 #include <filesystem>
 #include <fstream>
 #include <iterator>
@@ -29,7 +31,7 @@ constexpr char kControlSource[] = "control.txt";
 
 std::ifstream open_source(const std::string& path) {
   std::ifstream in(path, std::ios::binary);
-  if (!in) throw SourceError(path, 0, 0, "cannot be opened");
+  if (!in) throw SourceError(path, 0, 0, std::strerror(errno));
   return in;
 }
 
@@ -285,6 +287,8 @@ class DirectoryCompiler {
   // -- files --------------------------------------------------------------------------------------------------
 
   void write() {
+    // Ahead of the directory: when it cannot be written nothing is.
+    if (!options_.report_file.empty()) write_file(options_.report_file, report());
     Manifest manifest;
     std::vector<std::pair<std::string, ByteVector>> files;
     for (Made& made : made_) {
@@ -294,7 +298,6 @@ class DirectoryCompiler {
     files.emplace_back(format::kAliasFile, plain_lines(alias_file()));
     add_rules(source_, control_, files);
     write_directory(out_, files, manifest, compile_control(control_, source_ + '/' + kControlSource));
-    if (!options_.report_file.empty()) write_file(options_.report_file, report());
   }
 
   const std::string& source_;

@@ -3,6 +3,8 @@
 #include "object_file.h"
 
 #include <algorithm>
+#include <cerrno>
+#include <cstring>
 #include <filesystem>
 #include <fstream>
 #include <iterator>
@@ -89,11 +91,11 @@ ObjectFile read_object(const ByteVector& bytes, const std::string& file_name) {
 
 ByteVector read_file(const std::string& path) {
   std::ifstream in(path, std::ios::binary);
-  if (!in) throw SourceError(path, 0, 0, "cannot be opened");
+  if (!in) throw SourceError(path, 0, 0, std::strerror(errno));
   ByteVector bytes;
   for (char block[1 << 16]; in.read(block, sizeof block), in.gcount() > 0;)
     bytes.insert(bytes.end(), block, block + in.gcount());
-  if (in.bad()) throw SourceError(path, 0, 0, "cannot be read");
+  if (in.bad()) throw SourceError(path, 0, 0, std::strerror(errno));
   return bytes;
 }
 
@@ -105,8 +107,9 @@ void write_file(const std::string& path, const ByteVector& bytes) {
     out.write(reinterpret_cast<const char*>(bytes.data()), static_cast<std::streamsize>(bytes.size()));
     out.close();
     if (!out) {
+      const std::string reason = std::strerror(errno);
       std::filesystem::remove(temporary, error);
-      throw SourceError(path, 0, 0, "cannot be written");
+      throw SourceError(path, 0, 0, "cannot be written: " + reason);
     }
   }
   std::filesystem::rename(temporary, path, error);

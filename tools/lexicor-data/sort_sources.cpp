@@ -21,7 +21,7 @@ RuleFile read_rules(const std::string& file) {
 const SortRoot& SortSources::root() {
   std::call_once(root_read_, [&] {
     std::ifstream in(root_file(), std::ios::binary);
-    if (!in) throw SourceError(root_file(), 0, 0, "cannot be opened");
+    if (!in) throw SourceError(root_file(), 0, 0, std::strerror(errno));
     root_.emplace(read_root(in, root_file()));
   });
   return *root_;

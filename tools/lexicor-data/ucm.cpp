@@ -4,6 +4,8 @@
 #include "ucm.h"
 
 #include <algorithm>
+#include <cerrno>
+#include <cstring>
 #include <fstream>
 #include <istream>
 #include <set>
@@ -222,7 +224,7 @@ class UcmReader {
       fail("the bases go round in a circle: " + circle + path);
     }
     std::ifstream in(path, std::ios::binary);
-    if (!in) fail("the base " + path + " cannot be opened");
+    if (!in) fail("the base " + path + ": " + std::strerror(errno));
     CodepageSource base = UcmReader(in, path, std::move(chain)).read();
     if (base.utf8) fail("the base " + header_.base() + " is computed and has no mappings");
     return base;
@@ -337,7 +339,7 @@ CodepageSource read_ucm(std::istream& in, const std::string& file_name) {
 
 CodepageSource read_ucm_file(const std::string& path) {
   std::ifstream in(path, std::ios::binary);
-  if (!in) throw SourceError(path, 0, 0, "cannot be opened");
+  if (!in) throw SourceError(path, 0, 0, std::strerror(errno));
   return read_ucm(in, path);
 }
 
