@@ -154,7 +154,8 @@ SourceErrors check_compiled_directory(const std::string& directory) {
     for (const ObjectName& name : control.objects) listed = listed || object_file_name(name) == file;
     if (!listed) errors.add(SourceError(entry.path().string(), 0, 0, "is not in the control file"));
   }
-  if (is_own) errors.attempt([&] { check_manifest(directory, control, errors); });
+  const bool has_manifest = std::filesystem::exists(directory + '/' + kManifestFile);
+  if (is_own || has_manifest) errors.attempt([&] { check_manifest(directory, control, errors); });
   return errors;
 }
 
