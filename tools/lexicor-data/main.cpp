@@ -156,10 +156,11 @@ int main(int argc, char** argv) {
   bool json = false;
 
   auto compile_command = line.add_subcommand("compile", "Compile a source directory into a locale directory");
-  compile_command.add_option("SRC", source, "the directory with control.txt").required();
-  compile_command.add_option("OUT", out, "the locale directory").required();
+  compile_command.add_option("SRC", source, "the directory with control.txt").required().not_empty();
+  compile_command.add_option("OUT", out, "the locale directory").required().not_empty();
   compile_command.add_flag("--verbose", options.verbose, "list section sizes and each character left out");
-  compile_command.add_option("--report", options.report_file, "a file for the list of characters left out");
+  compile_command.add_option("--report", options.report_file, "a file for the list of characters left out")
+      .not_empty();
   compile_command.add_flag("--all", options.all, "compile sources too that are unchanged since the last run");
   compile_command.footer(
       "Every error of every source is said, and then nothing is written. Objects whose sources are those of "
@@ -167,16 +168,18 @@ int main(int argc, char** argv) {
       "run into OUT stay as they are; with --all, --verbose or --report all are compiled.");
 
   auto dump_command = line.add_subcommand("dump", "Print the source of an object or of a control file");
-  dump_command.add_option("FILE", file, "an object, such as cp_00819.nls, or control.nls").required();
-  dump_command.add_option("--control", control_file, "the control file that names objects");
+  dump_command.add_option("FILE", file, "an object, such as cp_00819.nls, or control.nls")
+      .required()
+      .not_empty();
+  dump_command.add_option("--control", control_file, "the control file that names objects").not_empty();
 
   auto check_command = line.add_subcommand("check", "Check a compiled or a source directory");
-  check_command.add_option("DIR", directory, "the directory").required();
+  check_command.add_option("DIR", directory, "the directory").required().not_empty();
   check_command.add_flag("--json", json, "print what is wrong as JSON");
 
   auto subset_command = line.add_subcommand("subset", "Copy what some locales and codepages need");
-  subset_command.add_option("DIR", directory, "a compiled directory").required();
-  subset_command.add_option("OUT", out, "the smaller directory").required();
+  subset_command.add_option("DIR", directory, "a compiled directory").required().not_empty();
+  subset_command.add_option("OUT", out, "the smaller directory").required().not_empty();
   subset_command.add_option("--locale", subset.locales, "LANGUAGE[_TERRITORY][.CODEPAGE][@SORT] ...")
       .type_name("LOCALE");
   subset_command.add_option("--codepage", subset.codepages, "codepages beside those of the locales ...")
@@ -193,8 +196,9 @@ int main(int argc, char** argv) {
   explain_command
       .add_option("FROM", from,
                   "a sort: so_NNNNN.nls, NAME.txt, or NAME.rules where either lies beside root.txt")
-      .required();
-  explain_command.add_option("TO", to, "the sort that it is compared with").required();
+      .required()
+      .not_empty();
+  explain_command.add_option("TO", to, "the sort that it is compared with").required().not_empty();
 
   int status = kDone;
   try {

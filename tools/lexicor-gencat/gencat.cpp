@@ -212,10 +212,17 @@ std::string header_text(const std::vector<Symbol>& symbols) {
   return text;
 }
 
+/// A name in a working directory that is gone stays as it is.
+std::filesystem::path absolute_path(const std::string& name) {
+  std::error_code error;
+  const std::filesystem::path path = std::filesystem::absolute(name, error);
+  return (error ? std::filesystem::path(name) : path).lexically_normal();
+}
+
 bool same_file(const std::string& a, const std::string& b) {
   struct stat first, second;
   if (stat(a.c_str(), &first) != 0 || stat(b.c_str(), &second) != 0)
-    return std::filesystem::absolute(a).lexically_normal() == std::filesystem::absolute(b).lexically_normal();
+    return absolute_path(a) == absolute_path(b);
   return S_ISREG(first.st_mode) && first.st_dev == second.st_dev && first.st_ino == second.st_ino;
 }
 

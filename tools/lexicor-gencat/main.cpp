@@ -38,13 +38,15 @@ struct Asked {
 void declare(lexicor_cli::Arguments arguments, Asked& asked) {
   Options& options = asked.options;
   arguments.footer(kFooter);
-  arguments.add_option(
-      "FILES", asked.files,
-      "CATFILE [MSGFILE...]: the catalog to write or to merge into, and its sources; \"-\" is standard "
-      "output or input, and standard input is the source where none is named");
+  arguments
+      .add_option("FILES", asked.files,
+                  "CATFILE [MSGFILE...]: the catalog to write or to merge into, and its sources; \"-\" is "
+                  "standard output or input, and standard input is the source where none is named")
+      .not_empty();
   arguments
       .add_option("-o,--output", asked.output,
                   "the file to write; all FILES are then sources, or the catalog of --dump")
+      .not_empty()
       .type_name("FILE");
   arguments.add_option("--locale", options.locale, "locale whose codepage the texts of the catalog are in")
       .type_name("LOCALE");
@@ -55,6 +57,7 @@ void declare(lexicor_cli::Arguments arguments, Asked& asked) {
   arguments.add_option("--byte-order", options.byte_order, "byte order of the machine that reads the catalog")
       .one_of({"little", "big", "native"});
   arguments.add_option("-H,--header", options.header, "C header for the numbers of symbolic names")
+      .not_empty()
       .type_name("FILE");
   arguments.add_flag("--new", options.fresh, "replace an existing catalog instead of merging into it");
   arguments.add_flag("--po", options.po, "the sources are PO files, whatever their names");

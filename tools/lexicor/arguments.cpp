@@ -80,6 +80,10 @@ const Option& Option::at_least(int32_t least) const {
   option_->check(CLI::Range(least, std::numeric_limits<int32_t>::max()));
   return *this;
 }
+const Option& Option::not_empty() const {
+  option_->check([](const std::string& value) { return value.empty() ? "the name is empty" : ""; }, "");
+  return *this;
+}
 const Option& Option::divided_by(char delimiter) const {
   option_->delimiter(delimiter)->allow_extra_args(false);
   return *this;

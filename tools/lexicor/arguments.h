@@ -28,6 +28,8 @@ class Arguments {
     const Option& type_name(const char* name) const;
     const Option& one_of(const std::vector<std::string>& values) const;
     const Option& at_least(int32_t least) const;
+    /// For names of files: a variable of a script that is not set leaves an empty one.
+    const Option& not_empty() const;
     /// Several values in one argument.
     const Option& divided_by(char delimiter) const;
     /// One value each time that it is given.

@@ -219,6 +219,7 @@ Run declare_convert(Arguments& command, const CommonOptions& common) {
   command.add_option("-o,--output", options->output, "output file, replaced when it is complete")
       .type_name("OUT");
   command.add_option("FILE", options->files, "input files, taken as one text; - is standard input")
+      .not_empty()
       .type_name("");
   command.footer(
       "Nothing is lost silently: malformed input, and every character that would not come back when OUT is "

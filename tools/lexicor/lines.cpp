@@ -95,6 +95,7 @@ Run declare_lines(Arguments& command, const CommonOptions& common) {
   command.add_option("-o,--output", options->output, "output file, replaced when it is complete")
       .type_name("OUT");
   command.add_option("FILE", options->files, "input files, taken as one text; - is standard input")
+      .not_empty()
       .type_name("");
   command.footer(
       "The bytes of a line end are the codepage's own. In most codepages nl and other are the line feed; in "

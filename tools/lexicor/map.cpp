@@ -319,6 +319,7 @@ Run declare_map(Arguments& command, const CommonOptions& common) {
   command.add_option("-o,--output", options->output, "output file, replaced when it is complete")
       .type_name("OUT");
   command.add_option("FILE", options->files, "input files, taken as one text; - is standard input")
+      .not_empty()
       .type_name("");
   command.footer(
       "A character without a mapping stays as it is, and so do malformed bytes. Width is what the codepage has "

@@ -2,6 +2,7 @@
 #pragma once
 
 #include <csignal>
+#include <exception>
 #include <iostream>
 #include <new>
 
@@ -27,6 +28,9 @@ inline int run_program(const char* name, int (*run)(int, char**), int argc, char
     return 128 + SIGPIPE;
   } catch (const std::bad_alloc&) {
     std::cerr << name << ": out of memory\n";
+    return kDataError;
+  } catch (const std::exception& error) {
+    std::cerr << name << ": " << error.what() << '\n';
     return kDataError;
   }
 }

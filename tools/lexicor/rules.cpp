@@ -8,6 +8,7 @@ namespace lexicor_cli {
 
 void add_rules_option(Arguments& command, std::string& file) {
   command.add_option("--rules", file, "collation rules of your own, instead of the locale's sort")
+      .not_empty()
       .type_name("FILE");
 }
 

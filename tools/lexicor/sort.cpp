@@ -231,12 +231,13 @@ Run declare_sort(Arguments& command, const CommonOptions& common) {
   command
       .add_option("-T,--temporary-directory", options->temporary_directory,
                   "directory for temporary files; else TMPDIR, else /tmp")
+      .not_empty()
       .type_name("DIR");
   command.add_option("-o,--output", options->output, "output file, replaced when it is complete")
       .type_name("OUT")
       .excludes(check)
       .excludes(quiet);
-  command.add_option("FILE", options->files, "input files; - is standard input").type_name("");
+  command.add_option("FILE", options->files, "input files; - is standard input").not_empty().type_name("");
   command.footer(
       "A line ends with a line feed, or with a carriage return and one, which do not count. Lines that the "
       "order\n"

@@ -186,6 +186,7 @@ Run declare_translate(Arguments& command, const CommonOptions& common) {
   command.add_option("-o,--output", options->output, "output file, replaced when it is complete")
       .type_name("OUT");
   command.add_option("FILE", options->files, "input files, taken as one string; - is standard input")
+      .not_empty()
       .type_name("");
   command.footer(
       "The input is one string of up to 2 GB, line ends and all; 'lexicor convert' takes text of any length. "
