@@ -8,6 +8,7 @@
 #include <sstream>
 
 #include "core/lxformat.h"
+#include "files.h"
 #include "lx.h"
 #include "sort_pack.h"
 #include "sort_rules.h"

@@ -7,6 +7,7 @@
 
 #include "codepage_unpack.h"
 #include "compile_directory.h"
+#include "files.h"
 #include "support/slowness.h"
 
 namespace lx::test {

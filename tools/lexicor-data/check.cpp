@@ -1,10 +1,7 @@
 // Checks of whole directories. A fault in one file does not hide those of the others.
 #include "check.h"
 
-#include <cerrno>
-#include <cstring>
 #include <filesystem>
-#include <fstream>
 #include <functional>
 #include <mutex>
 #include <ostream>
@@ -16,6 +13,7 @@
 #include "control_source.h"
 #include "core/lxbytes.h"
 #include "core/lxformat.h"
+#include "files.h"
 #include "lexicor/hex.h"
 #include "line_text.h"
 #include "manifest.h"
@@ -106,12 +104,6 @@ void check_manifest(const std::string& directory, const Control& control, Source
       errors.add(SourceError(path, 0, 0, object.file + " is not in the control file"));
 }
 
-std::ifstream open(const std::string& path) {
-  std::ifstream in(path, std::ios::binary);
-  if (!in) throw SourceError(path, 0, 0, std::strerror(errno));
-  return in;
-}
-
 /// Runs a check of every object; its errors come in the order of the objects.
 void check_all(const Control& control, SourceErrors& errors,
                const std::function<void(const ObjectName&)>& check) {
@@ -141,7 +133,7 @@ SourceErrors check_compiled_directory(const std::string& directory) {
   });
   const std::string alias_file = directory + '/' + format::kAliasFile;
   errors.attempt([&] {
-    std::ifstream in = open(alias_file);
+    std::istringstream in = open_source(alias_file);
     if (in.peek() == static_cast<unsigned char>(kByteOrderMark[0]))
       throw SourceError(alias_file, 1, 1, "begins with a byte-order mark, which the library takes for a name");
     read_aliases(in, alias_file, control);
@@ -168,20 +160,20 @@ SourceErrors check_source_directory(const std::string& directory, std::ostream& 
   std::mutex used_lock;
   check_all(control, errors, [&](const ObjectName& name) {
     const std::string path = source_path(directory, name);
-    std::ifstream in = open(path);
+    std::istringstream in = open_source(path);
     const CompiledObject object = compile_object(in, path, name, control, &sorts);
     {
       const std::lock_guard<std::mutex> guard(used_lock);
       used.insert(path);
       used.insert(object.bases.begin(), object.bases.end());
     }
-    in = open(path);
+    in = open_source(path);
     if (name.type == ObjectType::kLanguage) check_language_sense(in, path);
     if (name.type == ObjectType::kTerritory) check_territory_sense(in, path);
   });
   const std::string alias_file = directory + '/' + format::kAliasFile;
   errors.attempt([&] {
-    std::ifstream in = open(alias_file);
+    std::istringstream in = open_source(alias_file);
     read_aliases(in, alias_file, control);
   });
   if (!errors.empty()) return errors;

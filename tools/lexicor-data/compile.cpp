@@ -134,7 +134,6 @@ std::string sort_directory(const std::string& directory) {
 CompiledObject compile_object(std::istream& stream, const std::string& file_name, const ObjectName& name,
                               const Control& control, SortSources* sorts) {
   const std::string text{std::istreambuf_iterator<char>(stream), std::istreambuf_iterator<char>()};
-  if (stream.bad()) throw SourceError(file_name, 0, 0, "cannot be read");
   std::istringstream in(text);
   CompiledObject result;
   ObjectFile object;

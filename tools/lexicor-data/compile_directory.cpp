@@ -2,10 +2,7 @@
 #include "compile_directory.h"
 
 #include <algorithm>
-#include <cerrno>
-#include <cstring>
 #include <filesystem>
-#include <fstream>
 #include <iterator>
 #include <map>
 #include <ostream>
@@ -15,6 +12,7 @@
 #include "alias_source.h"
 #include "control_source.h"
 #include "core/lxformat.h"
+#include "files.h"
 #include "lexicor/hex.h"
 #include "line_text.h"
 #include "object_check.h"
@@ -29,15 +27,9 @@ namespace format = lx::format;
 
 constexpr char kControlSource[] = "control.txt";
 
-std::ifstream open_source(const std::string& path) {
-  std::ifstream in(path, std::ios::binary);
-  if (!in) throw SourceError(path, 0, 0, std::strerror(errno));
-  return in;
-}
-
 /// A text file as the library reads it, without a byte-order mark and with line feeds as line ends.
 ByteVector plain_lines(const std::string& path) {
-  std::ifstream in = open_source(path);
+  std::istringstream in = open_source(path);
   std::string text, line;
   for (int number = 0; next_line(in, &line, &number);) text += line + '\n';
   return ByteVector(text.begin(), text.end());
@@ -139,7 +131,7 @@ class DirectoryCompiler {
     made_.resize(control_.objects.size());
     SourceErrors errors;
     errors.attempt([&] {
-      std::ifstream aliases = open_source(alias_file());
+      std::istringstream aliases = open_source(alias_file());
       read_aliases(aliases, alias_file(), control_);
     });
     make_objects(errors);
@@ -222,7 +214,7 @@ class DirectoryCompiler {
 
   CompiledObject compile(const ObjectName& name) {
     const std::string file = source_path(source_, name);
-    std::ifstream in = open_source(file);
+    std::istringstream in = open_source(file);
     return compile_object(in, file, name, control_, &sorts_);
   }
 
@@ -319,7 +311,7 @@ bool holds_bytes(const std::string& path, const ByteVector& bytes) {
 
 Control read_source_control(const std::string& directory) {
   const std::string file_name = directory + '/' + kControlSource;
-  std::ifstream in = open_source(file_name);
+  std::istringstream in = open_source(file_name);
   return read_control(in, file_name);
 }
 

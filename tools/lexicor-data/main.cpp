@@ -16,6 +16,7 @@
 #include "compile_directory.h"
 #include "control_source.h"
 #include "core/lxformat.h"
+#include "files.h"
 #include "lexicor/arguments.h"
 #include "lexicor/command.h"
 #include "lexicor/descriptors.h"

@@ -3,10 +3,6 @@
 #include "object_file.h"
 
 #include <algorithm>
-#include <cerrno>
-#include <cstring>
-#include <filesystem>
-#include <fstream>
 #include <iterator>
 #include <stdexcept>
 
@@ -87,37 +83,6 @@ ObjectFile read_object(const ByteVector& bytes, const std::string& file_name) {
   object.compiler = header.compiler;
   std::copy(std::begin(header.digest), std::end(header.digest), object.digest.begin());
   return object;
-}
-
-ByteVector read_file(const std::string& path) {
-  std::ifstream in(path, std::ios::binary);
-  if (!in) throw SourceError(path, 0, 0, std::strerror(errno));
-  ByteVector bytes;
-  for (char block[1 << 16]; in.read(block, sizeof block), in.gcount() > 0;)
-    bytes.insert(bytes.end(), block, block + in.gcount());
-  if (in.bad()) throw SourceError(path, 0, 0, std::strerror(errno));
-  return bytes;
-}
-
-void write_file(const std::string& path, const ByteVector& bytes) {
-  const std::string temporary = path + ".tmp";
-  std::error_code error;
-  {
-    std::ofstream out(temporary, std::ios::binary | std::ios::trunc);
-    out.write(reinterpret_cast<const char*>(bytes.data()), static_cast<std::streamsize>(bytes.size()));
-    out.close();
-    if (!out) {
-      const std::string reason = std::strerror(errno);
-      std::filesystem::remove(temporary, error);
-      throw SourceError(path, 0, 0, "cannot be written: " + reason);
-    }
-  }
-  std::filesystem::rename(temporary, path, error);
-  if (error) {
-    std::error_code ignored;
-    std::filesystem::remove(temporary, ignored);
-    throw SourceError(path, 0, 0, "cannot be written: " + error.message());
-  }
 }
 
 }  // namespace lexicor_data

@@ -28,11 +28,6 @@ ByteVector write_object(const ObjectFile& object);
 /// Reads the container; a bad header or a section outside the file is a SourceError.
 ObjectFile read_object(const ByteVector& bytes, const std::string& file_name);
 
-ByteVector read_file(const std::string& path);
-
-/// Writes under a temporary name and renames, so that an interrupted run leaves no half file.
-void write_file(const std::string& path, const ByteVector& bytes);
-
 /// A record of the format behind the others, and the one at an offset.
 template <class Record>
 void append_record(ByteVector& out, const Record& record) {

@@ -11,6 +11,7 @@
 
 #include "control_source.h"
 #include "core/lxformat.h"
+#include "files.h"
 #include "object_file.h"
 #include "sort_pack.h"
 #include "sort_sources.h"

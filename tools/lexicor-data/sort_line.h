@@ -145,7 +145,6 @@ void read_sort_lines(std::istream& in, const std::string& file, int* number, Dir
     else
       entry(line);
   }
-  if (in.bad()) throw SourceError(file, *number, 0, "the file cannot be read");
 }
 
 }  // namespace lexicor_data

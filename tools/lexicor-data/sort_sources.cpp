@@ -1,27 +1,20 @@
 #include "sort_sources.h"
 
-#include <cerrno>
-#include <cstring>
 #include <filesystem>
-#include <fstream>
 #include <sstream>
 
+#include "files.h"
 #include "ucm.h"
 
 namespace lexicor_data {
 
 RuleFile read_rules(const std::string& file) {
-  std::ifstream in(file, std::ios::binary);
-  std::ostringstream text;
-  // A copy of nothing fails, also that of an empty file.
-  if (in && (in.peek() == EOF || text << in.rdbuf()) && !in.bad()) return {file, text.str()};
-  throw SourceError(file, 0, 0, std::strerror(errno));
+  return {file, read_text(file)};
 }
 
 const SortRoot& SortSources::root() {
   std::call_once(root_read_, [&] {
-    std::ifstream in(root_file(), std::ios::binary);
-    if (!in) throw SourceError(root_file(), 0, 0, std::strerror(errno));
+    std::istringstream in = open_source(root_file());
     root_.emplace(read_root(in, root_file()));
   });
   return *root_;

@@ -3,7 +3,6 @@
 
 #include <algorithm>
 #include <filesystem>
-#include <fstream>
 #include <iomanip>
 #include <iterator>
 #include <ostream>
@@ -13,6 +12,7 @@
 #include "control_source.h"
 #include "core/lxbytes.h"
 #include "core/lxformat.h"
+#include "files.h"
 #include "lexicor/near_names.h"
 #include "lexicor/report.h"
 #include "line_text.h"
@@ -53,7 +53,7 @@ class Subset {
     control_ = unpack_control(read_object(read_file(control_file), control_file).sections[0], control_file);
     if (fs::exists(in_directory(kManifestFile)))
       manifest_ = read_manifest(read_file(in_directory(kManifestFile)), in_directory(kManifestFile));
-    std::ifstream in(in_directory(format::kAliasFile), std::ios::binary);
+    std::istringstream in(alias_text());
     aliases_ = read_aliases(in, in_directory(format::kAliasFile), control_);
     const ObjectName* common = control_.find(ObjectType::kCodepage, format::codepage::kCommonId);
     if (common != nullptr) keep(*common);
@@ -133,9 +133,15 @@ class Subset {
     if (kept_.find(object.type, object.id) == nullptr) kept_.objects.push_back(object);
   }
 
+  /// Empty where the directory has none.
+  std::string alias_text() const {
+    const std::string file = in_directory(format::kAliasFile);
+    return fs::exists(file) ? read_text(file) : "";
+  }
+
   /// The lines of codepages that are kept, and comments.
   ByteVector cut_aliases() const {
-    std::ifstream in(in_directory(format::kAliasFile), std::ios::binary);
+    std::istringstream in(alias_text());
     std::string line, text;
     bool is_kept = false;
     for (int number = 0; next_line(in, &line, &number);) {

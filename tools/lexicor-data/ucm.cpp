@@ -4,13 +4,11 @@
 #include "ucm.h"
 
 #include <algorithm>
-#include <cerrno>
-#include <cstring>
-#include <fstream>
 #include <istream>
 #include <set>
 #include <tuple>
 
+#include "files.h"
 #include "line_text.h"
 #include "ucm_header.h"
 #include "ucm_line.h"
@@ -70,7 +68,6 @@ class UcmReader {
       const bool in_header = place_ == Place::kHeader;
       if (!errors_.attempt([&] { read_line(line); }) && in_header) header_is_sound_ = false;
     }
-    if (in_.bad()) throw SourceError(file_, line_, 0, "the file cannot be read");
     if (place_ == Place::kHeader) header_.end({line_ + 1, 1});
   }
 
@@ -223,8 +220,12 @@ class UcmReader {
       for (auto at = std::find(chain.begin(), chain.end(), path); at != chain.end(); ++at) circle += *at + ", ";
       fail("the bases go round in a circle: " + circle + path);
     }
-    std::ifstream in(path, std::ios::binary);
-    if (!in) fail("the base " + path + ": " + std::strerror(errno));
+    std::istringstream in;
+    try {
+      in = open_source(path);
+    } catch (const SourceError& error) {
+      fail("the base " + path + ": " + error.fault);
+    }
     CodepageSource base = UcmReader(in, path, std::move(chain)).read();
     if (base.utf8) fail("the base " + header_.base() + " is computed and has no mappings");
     return base;
@@ -338,8 +339,7 @@ CodepageSource read_ucm(std::istream& in, const std::string& file_name) {
 }
 
 CodepageSource read_ucm_file(const std::string& path) {
-  std::ifstream in(path, std::ios::binary);
-  if (!in) throw SourceError(path, 0, 0, std::strerror(errno));
+  std::istringstream in = open_source(path);
   return read_ucm(in, path);
 }
 
