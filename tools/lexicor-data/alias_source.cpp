@@ -32,9 +32,9 @@ class AliasReader {
   void read_line(const std::string& text) {
     if (text.size() > kMaxLineBytes) fail(0, "the line is longer than 32,767 bytes");
     const size_t carriage_return = text.find('\r');
-    if (carriage_return != std::string::npos) fail(carriage_return, "a carriage return is no separator here");
+    if (carriage_return != std::string::npos) fail(carriage_return, "a carriage return, expected a blank");
     const size_t null = text.find('\0');
-    if (null != std::string::npos) fail(null, "a null byte is no separator here");
+    if (null != std::string::npos) fail(null, "a null byte, expected a blank");
     size_t at = text.find_first_not_of(" \t");
     if (at == std::string::npos || text[0] == '#') return;
     if (text[0] == '\t') fail(0, "a line begins with a name or with a blank, not with a tab");
