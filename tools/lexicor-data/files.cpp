@@ -10,12 +10,16 @@
 namespace lexicor_data {
 namespace {
 
+constexpr size_t kMostBytes = size_t{1} << 30;  // a device may have no end
+
 template <class Bytes>
 Bytes read(const std::string& path) {
   std::ifstream in(path, std::ios::binary);
   Bytes bytes;
-  for (char block[1 << 16]; in.read(block, sizeof block), in.gcount() > 0;)
+  for (char block[1 << 16]; in.read(block, sizeof block), in.gcount() > 0;) {
+    if (bytes.size() >= kMostBytes) throw SourceError(path, 0, 0, "is larger than 1 GB");
     bytes.insert(bytes.end(), block, block + in.gcount());
+  }
   // The end of a file fails too; a directory opens, and is bad when it is read.
   if (!in.eof()) throw SourceError(path, 0, 0, std::strerror(errno));
   return bytes;
