@@ -60,6 +60,9 @@ bool LineReader::read(Arena* texts, Rows<Line>* lines) {
     at = line_end;
   }
   begun_.assign(at, end);
+  // Ahead of its end, which may never come. The end's first byte may be there.
+  if (begun_.size() > kMostLine + 1)
+    refuse_length("more than " + std::to_string(kMostLine), offset_ + got - begun_.size());
   texts->take(static_cast<size_t>(at - block));
   offset_ += got;
   return got != 0;
@@ -108,12 +111,15 @@ void LineReader::add_last(char* text, Rows<Line>* lines) {
 }
 
 void LineReader::check_length(std::string_view text, uint64_t offset) const {
-  if (text.size() <= kMostLine && fits_(text)) return;
+  if (text.size() > kMostLine || !fits_(text)) refuse_length(std::to_string(text.size()), offset);
+}
+
+void LineReader::refuse_length(const std::string& bytes, uint64_t offset) const {
   InputPlace where = input_.place(offset);
   where.line = file_lines_ + 1;
   where.column = 1;
-  throw Failure(kDataError, "a line of " + std::to_string(text.size()) +
-                                " bytes is too long to be ordered: it begins at " + where.text());
+  throw Failure(kDataError,
+                "a line of " + bytes + " bytes is too long to be ordered: it begins at " + where.text());
 }
 
 LXShiftState LineReader::check_whole(std::string_view text, uint64_t offset, bool ended) const {

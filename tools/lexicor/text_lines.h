@@ -44,6 +44,7 @@ class LineReader {
   void add_line(const char* begin, const char* end, uint64_t offset, Rows<Line>* lines);
   void add_last(char* text, Rows<Line>* lines);
   void check_length(std::string_view text, uint64_t offset) const;
+  [[noreturn]] void refuse_length(const std::string& bytes, uint64_t offset) const;
   LXShiftState check_whole(std::string_view text, uint64_t offset, bool ended) const;
   bool ends_whole(std::string_view text) const;
   size_t whole_bytes(std::string_view text, LXShiftState* state) const;
