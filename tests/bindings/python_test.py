@@ -200,6 +200,11 @@ def test_what_is_refused():
     for item, value in ((1 << 32) + 1, None), (lexicor.Item.CURRENCY_DIGITS, 1 << 32):
         with pytest.raises(OverflowError):
             locale.item(item) if value is None else locale.set(item, value)
+    with pytest.raises(OverflowError):
+        locale.key("a", 1 << 32)
+    for wrong in (lambda: locale.compare("a", "b", "c"), lambda: locale.format_number("5"), lambda: locale.item(1.5)):
+        with pytest.raises(TypeError):
+            wrong()
     for text, base in ("2147483648", 10), ("-80000001", 16):
         with pytest.raises(OverflowError):
             locale.parse_integer(text, base)

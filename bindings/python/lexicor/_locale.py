@@ -101,7 +101,10 @@ class Locale(_native.Owner):
     def _call(self, function: Callable[..., Any], *arguments: Any) -> Any:
         _native.check_integers(function, (self._handle, *arguments))
         with self._lock:
-            result = function(self._handle, *arguments)
+            try:
+                result = function(self._handle, *arguments)
+            except ctypes.ArgumentError as error:
+                raise TypeError(str(error)) from None
             code = library().LXGetError(self._handle)
         if code != OK:
             raise Error(code)
@@ -170,6 +173,8 @@ class Locale(_native.Owner):
         """Bytes that order as compare() does: `sorted(words, key=locale.key)`."""
         units, count = _native.units(text)
         transform, buffer, size = library().LXStrxfrmU, self._buffer, _KEY_BYTES
+        if ignore != 0:
+            _native.check_integers(transform, (self._handle, buffer, size, units, count, ignore))
         with self._lock:
             while True:
                 length = transform(self._handle, buffer, size, units, count, ignore)

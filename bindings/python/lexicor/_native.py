@@ -2,6 +2,7 @@
 from __future__ import annotations
 
 import ctypes
+import operator
 import os
 import sys
 import threading
@@ -153,9 +154,10 @@ _RANGES = {c_int32: (-(1 << 31), 1 << 31), c_uint32: (0, 1 << 32)}
 
 
 def check_integers(function: Any, arguments: Tuple[Any, ...]) -> None:
-    """Integers that do not fit the parameters of a function, which ctypes would cut, are an OverflowError."""
+    """Integers that do not fit the parameters of a function, which ctypes would cut, are an OverflowError; what is no
+    integer is a TypeError."""
     for kind, argument in zip(function.argtypes, arguments):
-        if kind in _RANGES and not _RANGES[kind][0] <= argument < _RANGES[kind][1]:
+        if kind in _RANGES and not _RANGES[kind][0] <= operator.index(argument) < _RANGES[kind][1]:
             raise OverflowError(f"{argument} does not fit 32 bits")
 
 
