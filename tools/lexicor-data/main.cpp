@@ -219,6 +219,9 @@ int main(int argc, char** argv) {
     return failure.code();
   } catch (const lexicor_cli::BrokenPipe&) {  // where SIGPIPE was ignored from the start
     return 128 + SIGPIPE;
+  } catch (const fs::filesystem_error& error) {
+    say({error.path1().string(), 0, 0, error.code().message()});
+    return kDataError;
   } catch (const std::exception& error) {
     std::cerr << "lexicor-data: " << error.what() << '\n';
     return kDataError;
