@@ -22,6 +22,18 @@ void Arena::Freer::operator()(char* data) const {
   std::free(data);
 }
 
+/// Goes on to the next block. One that keeps nothing is given back: it was too small for a long text, and the texts
+/// behind it may be longer yet.
+void Arena::leave_block() {
+  if (used_ != 0) {
+    ++at_;
+    used_ = 0;
+  } else {
+    held_ -= blocks_[at_].size + kSlack;
+    blocks_.erase(blocks_.begin() + static_cast<std::ptrdiff_t>(at_));
+  }
+}
+
 void Arena::add_block(size_t bytes) {
   size_t size = std::max(bytes, std::clamp(held_, kFirstBlock, kLastBlock)) + kSlack;
   const bool large = size >= kLargePage;

@@ -18,7 +18,7 @@ class Arena {
 
   /// Room for so many bytes, which belong to the caller as far as take() says, and else to the next call.
   char* room(size_t bytes) {
-    while (at_ < blocks_.size() && blocks_[at_].size - used_ < bytes) next_block();
+    while (at_ < blocks_.size() && blocks_[at_].size - used_ < bytes) leave_block();
     if (at_ == blocks_.size()) add_block(bytes);
     return blocks_[at_].data.get() + used_;
   }
@@ -41,10 +41,7 @@ class Arena {
     size_t size;
   };
 
-  void next_block() {
-    ++at_;
-    used_ = 0;
-  }
+  void leave_block();
   void add_block(size_t bytes);
 
   std::vector<Block> blocks_;

@@ -14,6 +14,7 @@ namespace lexicor_cli {
 namespace {
 
 constexpr size_t kFirstBlock = 64 * 1024;
+constexpr size_t kMostGrowth = 256 * 1024 * 1024;  // at a time, of a long line
 // Of a last line: a shift byte, a carriage return and a line feed.
 constexpr size_t kMostEndBytes = 3;
 constexpr size_t kMostLine = std::numeric_limits<int32_t>::max() - kMostEndBytes;
@@ -37,12 +38,13 @@ LineReader::LineReader(const Codepage& codepage, Input& input, bool null_ended, 
 
 bool LineReader::read(Arena* texts, Rows<Line>* lines) {
   // A line that is longer than a block makes the blocks grow, so that its text is not moved too often.
-  const size_t room = std::max(block_bytes_, begun_.size());
+  const size_t room = std::max(block_bytes_, std::min(begun_.size(), kMostGrowth));
   block_bytes_ = std::min(4 * block_bytes_, most_block_bytes_);
   char* const block = texts->room(begun_.size() + kMostEndBytes + room);
   char* const text = block + begun_.size() + kMostEndBytes;
   const size_t got = input_.read(text, room);
   const char* at = text;
+  const size_t lines_before = lines->size();
   const bool begins_file = input_.begins_file(offset_);
   if (!begun_.empty()) {
     if (got == 0 || begins_file) {
@@ -59,11 +61,11 @@ bool LineReader::read(Arena* texts, Rows<Line>* lines) {
     add_line(at, line_end, offset_ + static_cast<uint64_t>(at - text), lines);
     at = line_end;
   }
-  begun_.assign(at, end);
+  const auto begun = static_cast<size_t>(end - at);
   // Ahead of its end, which may never come. The end's first byte may be there.
-  if (begun_.size() > kMostLine + 1)
-    refuse_length("more than " + std::to_string(kMostLine), offset_ + got - begun_.size());
-  texts->take(static_cast<size_t>(at - block));
+  if (begun > kMostLine + 1) refuse_length("more than " + std::to_string(kMostLine), offset_ + got - begun);
+  begun_.assign(at, end);
+  if (lines->size() != lines_before) texts->take(static_cast<size_t>(at - block));
   offset_ += got;
   return got != 0;
 }
