@@ -59,8 +59,10 @@ LXFile* find_control(LXObjManager* manager, const char* directory, int32_t* rc) 
   }
   char from_environment[sizeof(LXObjManager::directory)];
   const int32_t found = LXGetDataLocation(from_environment, sizeof(from_environment), 0);
-  if (found == 0) *rc = LX_E_FILE_IO;
-  if (found == 0) return nullptr;
+  if (found == 0) {
+    *rc = LX_E_FILE_IO;
+    return nullptr;
+  }
   if (found > 0) {
     LXFile* file = try_control(manager, from_environment, name, rc);
     if (file != nullptr || !search_goes_on(*rc)) return file;
