@@ -26,9 +26,12 @@ void same_character(const Place& at, const char* text, int32_t bytes, LXWChar co
   must(LXCpMbToUnicode(at.codepage, text) == LXCpMbToUnicodeW(at.codepage, code), "a code has a value");
   for (const uint32_t mask : {LX_C1_UPPER, LX_C1_LOWER}) {
     char other[8], state[8];
-    LXPutChar(at.locale, named, LXCpMbCaseConvW(at.codepage, code, mask));
+    const LXWChar other_code = LXCpMbCaseConvW(at.codepage, code, mask);
+    LXPutChar(at.locale, named, other_code);
     const int32_t cased = LXCpMbCaseConv(at.codepage, text, other, mask);
-    must(cased > 0 && memcmp(named, other, static_cast<size_t>(cased)) == 0, "a code has another case");
+    // Of bytes that are no character the other code may be longer than the width allows: they stay as they are.
+    const char* const expected = LXStrByteLength(other_code) <= at.width ? named : text;
+    must(cased > 0 && memcmp(expected, other, static_cast<size_t>(cased)) == 0, "a code has another case");
     if (bytes == at.width) LXCpMbCaseConvS(at.codepage, text, state, mask);
   }
   LXCpMbHalfToFullW(at.codepage, code), LXCpFullToHalfW(at.codepage, code);
